@@ -1,0 +1,11 @@
+# Every target of the project is built with these options.
+add_library(vesprun_options INTERFACE)
+target_compile_options(vesprun_options INTERFACE
+  -Wall -Wextra -Wpedantic -Wshadow -Wconversion -Wsign-conversion -Wold-style-cast -Wcast-qual
+  -Wnon-virtual-dtor -Woverloaded-virtual -Wformat=2 -Wimplicit-fallthrough -Wundef -Werror)
+
+if(VESPRUN_SANITIZERS)
+  target_compile_options(vesprun_options INTERFACE
+    -fsanitize=${VESPRUN_SANITIZERS} -fno-sanitize-recover=all -fno-omit-frame-pointer)
+  target_link_options(vesprun_options INTERFACE -fsanitize=${VESPRUN_SANITIZERS})
+endif()

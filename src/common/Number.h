@@ -1,0 +1,85 @@
+#pragma once
+
+#include <concepts>
+#include <cstdint>
+
+namespace vesprun {
+
+enum class NumberKind : std::uint8_t {
+  Int8,
+  Int16,
+  Int32,
+  Int64,
+  UInt8,
+  UInt16,
+  UInt32,
+  UInt64,
+  Float,
+  Double
+};
+
+/// A double as a signed 64-bit integer: truncated toward zero, saturating at the ends of the range,
+/// 0 for NaN.
+std::int64_t saturatingTruncate(double value);
+
+template <typename T>
+concept NumberType = std::same_as<T, std::int8_t> || std::same_as<T, std::int16_t> ||
+    std::same_as<T, std::int32_t> || std::same_as<T, std::int64_t> ||
+    std::same_as<T, std::uint8_t> || std::same_as<T, std::uint16_t> ||
+    std::same_as<T, std::uint32_t> || std::same_as<T, std::uint64_t> || std::same_as<T, float> ||
+    std::same_as<T, double>;
+
+/// A number that remembers which C type it was made from.
+///
+/// The readers convert as follows. An integer read as another integer type keeps its low bits
+/// (two's complement). A fraction read as an integer is truncated toward zero and saturates at the
+/// ends of the 64-bit type, and then keeps its low bits; NaN is 0. Any number can be read as a
+/// double.
+class Number {
+ public:
+  template <NumberType T>
+  constexpr explicit Number(T value) : _kind(kindOf<T>()) {
+    if constexpr (std::floating_point<T>) {
+      _real = value;
+    } else {
+      _bits = static_cast<std::uint64_t>(value);  // sign-extends signed types
+    }
+  }
+
+  constexpr NumberKind kind() const { return _kind; }
+  constexpr bool isFloatingPoint() const {
+    return _kind == NumberKind::Float || _kind == NumberKind::Double;
+  }
+  /// True for a signed integer kind; the floating-point kinds are neither signed nor unsigned.
+  constexpr bool isSigned() const { return _kind <= NumberKind::Int64; }
+
+  std::int64_t asInt64() const;
+  std::uint64_t asUInt64() const;
+  std::int32_t asInt32() const { return static_cast<std::int32_t>(asInt64()); }
+  std::uint32_t asUInt32() const { return static_cast<std::uint32_t>(asUInt64()); }
+  double asDouble() const;
+
+  /// True when both have the same mathematical value, whatever their kinds. NaN equals nothing.
+  friend bool operator==(const Number& left, const Number& right);
+
+ private:
+  template <NumberType T>
+  static constexpr NumberKind kindOf() {
+    if constexpr (std::same_as<T, float>) {
+      return NumberKind::Float;
+    } else if constexpr (std::same_as<T, double>) {
+      return NumberKind::Double;
+    } else {
+      constexpr int widthIndex = sizeof(T) == 1 ? 0 : sizeof(T) == 2 ? 1 : sizeof(T) == 4 ? 2 : 3;
+      return static_cast<NumberKind>(std::signed_integral<T> ? widthIndex : widthIndex + 4);
+    }
+  }
+
+  union {
+    std::uint64_t _bits;  ///< integers, sign- or zero-extended
+    double _real;         ///< fractions; a float widens exactly
+  };
+  NumberKind _kind;
+};
+
+}  // namespace vesprun

@@ -1,0 +1,85 @@
+#pragma once
+
+#include <tsl/ordered_map.h>
+
+#include <cstddef>
+#include <functional>
+#include <initializer_list>
+#include <memory>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+#include "common/PropertyValue.h"
+
+namespace vesprun {
+
+/// A dictionary of `PropertyValue` with string keys. Entries keep the order in which their keys
+/// were first set; setting a key again replaces its value in place. Look-up takes constant time.
+class PropertyDict {
+  struct KeyHash {
+    using is_transparent = void;
+    std::size_t operator()(std::string_view key) const {
+      return std::hash<std::string_view>{}(key);
+    }
+  };
+  // Entries lie in a vector: an empty dictionary, and there are many, allocates nothing.
+  using Entry = std::pair<std::string, PropertyValue>;
+  using Map = tsl::ordered_map<std::string, PropertyValue, KeyHash, std::equal_to<>,
+                               std::allocator<Entry>, std::vector<Entry>>;
+
+ public:
+  using const_iterator = Map::const_iterator;  ///< over pairs of key and value, in order
+
+  PropertyDict() = default;
+  PropertyDict(std::initializer_list<std::pair<std::string, PropertyValue>> entries) {
+    for (const auto& [key, value] : entries) {
+      set(key, value);
+    }
+  }
+
+  /// The value under `key`, or null. Valid until the dictionary is changed.
+  const PropertyValue* find(std::string_view key) const {
+    const auto entry = _entries.find(key);
+    return entry != _entries.end() ? &entry->second : nullptr;
+  }
+  bool contains(std::string_view key) const { return find(key) != nullptr; }
+
+  void set(std::string_view key, PropertyValue value) {
+    if (auto entry = _entries.find(key); entry != _entries.end()) {
+      entry.value() = std::move(value);
+    } else {
+      _entries.emplace(std::string(key), std::move(value));
+    }
+  }
+  /// Removes the entry, keeping the order of the others; false when there was none.
+  bool remove(std::string_view key) {
+    const auto entry = _entries.find(key);
+    if (entry == _entries.end()) {
+      return false;
+    }
+    _entries.erase(entry);
+    return true;
+  }
+  /// Sets every entry of `other`, in its order.
+  void merge(const PropertyDict& other) {
+    for (const auto& [key, value] : other) {
+      set(key, value);
+    }
+  }
+  void clear() { _entries.clear(); }
+  void reserve(std::size_t count) { _entries.reserve(count); }
+
+  std::size_t size() const { return _entries.size(); }
+  bool empty() const { return _entries.empty(); }
+  const_iterator begin() const { return _entries.begin(); }
+  const_iterator end() const { return _entries.end(); }
+
+  friend bool operator==(const PropertyDict& left, const PropertyDict& right);
+
+ private:
+  Map _entries;
+};
+
+}  // namespace vesprun

@@ -1,0 +1,21 @@
+#pragma once
+
+#include <string>
+
+#include "common/Date.h"
+
+namespace vesprun {
+
+/// The device's calendar clock.
+class Clock {
+ public:
+  virtual ~Clock() = default;
+
+  virtual Date now() = 0;
+
+  /// `date` in the device's time zone, as "yyyy-MM-dd HH:mm:ss Z": digits in the "en_US_POSIX"
+  /// locale, the zone as an offset such as +0100.
+  virtual std::string localDateText(const Date& date) = 0;
+};
+
+}  // namespace vesprun

@@ -1,0 +1,28 @@
+#pragma once
+
+#include <functional>
+#include <string_view>
+
+#include "common/PropertyDict.h"
+
+namespace vesprun {
+
+/// The platform's analytics event service.
+class EventHub {
+ public:
+  using PayloadBuilder = std::function<PropertyDict()>;
+
+  virtual ~EventHub() = default;
+
+  /// False on a system that lacks the send operation.
+  virtual bool sendEventLazyIsAvailable() = 0;
+
+  /// True when the service wants the event.
+  virtual bool EventHubIsEventUsed(std::string_view event) = 0;
+
+  /// Offers an event. `build` is called, before this returns, only when the service wants the event
+  /// and can send. True when the service took the offer (also when it does not want the event).
+  virtual bool EventHubSendEventLazy(std::string_view event, const PayloadBuilder& build) = 0;
+};
+
+}  // namespace vesprun

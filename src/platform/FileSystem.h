@@ -1,0 +1,21 @@
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+
+namespace vesprun {
+
+/// The device's files, by absolute path on the device.
+class FileSystem {
+ public:
+  virtual ~FileSystem() = default;
+
+  /// The whole content; nothing when the file is missing or cannot be read.
+  virtual std::optional<std::string> readFile(const std::string& path) = 0;
+
+  /// The size in bytes (`stat`); nothing when the file cannot be examined.
+  virtual std::optional<std::uint64_t> fileSize(const std::string& path) = 0;
+};
+
+}  // namespace vesprun

@@ -1,0 +1,24 @@
+#include <cstdio>
+
+#include "Command.h"
+
+int main(int argc, char** argv) {
+  CLI::App vespctl("Sets up a device directory, runs the daily job on it and shows what came out.",
+                   "vespctl");
+  vespctl.require_subcommand(1);
+  vesprun::addDeviceCommands(vespctl);
+  vesprun::addCounterCommands(vespctl);
+  vesprun::addPreferenceCommands(vespctl);
+  vesprun::addMessageCommands(vespctl);
+  vesprun::addOutboxCommands(vespctl);
+  vesprun::addPtreeCommands(vespctl);
+  try {
+    vespctl.parse(argc, argv);
+  } catch (const CLI::ParseError& error) {
+    return vespctl.exit(error) == 0 ? 0 : 2;
+  } catch (const vesprun::CommandFailure& failure) {
+    std::fprintf(stderr, "vespctl: %s\n", failure.what());
+    return 1;
+  }
+  return 0;
+}
