@@ -1,0 +1,25 @@
+#pragma once
+
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "common/PropertyValue.h"
+
+namespace vesprun {
+
+/// Reads a ptree document in its XML form. Nothing when the bytes are not one; `error` then says
+/// why, beginning with the line ("line 12: ...").
+///
+/// - UTF-8 only, with or without byte order mark and XML declaration; `<ptree version="1.0">` holds
+///   one value, dictionaries and arrays at most 200 deep.
+/// - `integer`: an optional minus and decimal digits, nothing else, from −2^63 to 2^64−1; a signed
+///   64-bit number when it fits, else an unsigned one.
+/// - `real`: a decimal number that a double can hold, "inf", "-inf" or "nan"; a double.
+/// - `data`: base64, white space ignored. `date`: what `dateText` writes.
+/// - A repeated key keeps its first place and its last value.
+/// - White space counts in keys and strings, also where there is nothing else; in numbers and dates
+///   it is refused, between elements it is skipped. `true` and `false` are empty.
+std::optional<PropertyValue> readPtree(std::string_view bytes, std::string& error);
+
+}  // namespace vesprun

@@ -1,0 +1,302 @@
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <limits>
+#include <random>
+
+#include "platform/host/PtreeReader.h"
+#include "platform/host/PtreeWriter.h"
+
+namespace vesprun {
+namespace {
+
+using ::testing::HasSubstr;
+using ::testing::StartsWith;
+
+std::string inPtree(const std::string& content) {
+  return "<ptree version=\"1.0\">" + content + "</ptree>";
+}
+
+PropertyValue readOf(const std::string& document) {
+  std::string error;
+  std::optional<PropertyValue> value = readPtree(document, error);
+  EXPECT_TRUE(value) << error << "\n" << document.substr(0, 300);
+  return value.value_or(PropertyValue("not read"));
+}
+
+std::string errorOf(const std::string& document) {
+  std::string error;
+  EXPECT_FALSE(readPtree(document, error)) << document.substr(0, 300);
+  return error;
+}
+
+std::string writtenOf(const PropertyValue& value) {
+  std::string document;
+  std::string error;
+  EXPECT_TRUE(writePtree(value, document, error)) << error;
+  return document;
+}
+
+std::string nestedArrays(std::size_t count) {
+  std::string text;
+  for (std::size_t level = 0; level < count; ++level) {
+    text += "<array>";
+  }
+  text += "<true/>";
+  for (std::size_t level = 0; level < count; ++level) {
+    text += "</array>";
+  }
+  return inPtree(text);
+}
+
+PropertyDict everything() {
+  return {{"name", "text"},
+          {"escaped <&>\"'", "a & b < c > d ]]> \"e\" 'f'"},
+          {"white", " \t\n\r \r\n"},
+          {"", ""},
+          {"unicode", "\xC3\xA4\xE2\x82\xAC\xF0\x9F\x98\x80"},
+          {"smallest", std::numeric_limits<std::int64_t>::min()},
+          {"largest", std::numeric_limits<std::uint64_t>::max()},
+          {"tiny", 5e-324},
+          {"third", 1.0 / 3},
+          {"huge", -1.7976931348623157e308},
+          {"single", 0.1F},
+          {"infinite", -std::numeric_limits<double>::infinity()},
+          {"yes", true},
+          {"no", false},
+          {"no bytes", Bytes{}},
+          {"bytes", Bytes{0, 255, 16, 128}},
+          {"date", Date{1709630102, 250'000'000}},
+          {"list", PropertyArray{PropertyDict{{"in", 1}}, PropertyArray{}, PropertyDict{}, "x"}}};
+}
+
+TEST(PtreeWriter, writesTabIndentedDocuments) {
+  EXPECT_EQ(writtenOf(PropertyDict{{"name", "text"},
+                                   {"list", PropertyArray{std::uint8_t{7}, 2.0, 0.25F, true}},
+                                   {"empty", PropertyDict{}},
+                                   {"data", Bytes{1, 2, 3, 4}},
+                                   {"date", Date{1709630102, 0}},
+                                   {"text", "a<b>&\r\n"}}),
+            R"(<?xml version="1.0" encoding="UTF-8"?>
+<ptree version="1.0">
+<dict>
+	<key>name</key>
+	<string>text</string>
+	<key>list</key>
+	<array>
+		<integer>7</integer>
+		<real>2</real>
+		<real>0.25</real>
+		<true/>
+	</array>
+	<key>empty</key>
+	<dict/>
+	<key>data</key>
+	<data>AQIDBA==</data>
+	<key>date</key>
+	<date>2024-03-05T09:15:02Z</date>
+	<key>text</key>
+	<string>a&lt;b&gt;&amp;&#13;
+</string>
+</dict>
+</ptree>
+)");
+}
+
+TEST(PtreeWriter, namesThePlaceOfWhatADocumentCannotCarry) {
+  std::string document = "before";
+  std::string error;
+  const auto refuses = [&](const PropertyValue& value) {
+    EXPECT_FALSE(writePtree(value, document, error));
+    EXPECT_EQ(document, "before");
+    return error;
+  };
+  EXPECT_EQ(refuses(PropertyDict{{"a", PropertyArray{1, PropertyDict{{"b", "x\x01"}}}}}),
+            "\"a\" > [1] > \"b\": the string \"x\\x01\" holds what XML cannot carry");
+  EXPECT_EQ(refuses(PropertyDict{{"bad\xFF", 1}}),
+            "\"bad\\xff\": the key \"bad\\xff\" holds what XML cannot carry");
+  EXPECT_THAT(refuses("\xEF\xBF\xBE"), HasSubstr("XML"));
+  EXPECT_THAT(refuses(PropertyArray{Date{std::numeric_limits<std::int64_t>::max(), 0}}),
+              StartsWith("[0]: a date"));
+  PropertyValue nested(1);
+  for (int level = 0; level < 200; ++level) {
+    nested = PropertyArray{std::move(nested)};
+  }
+  EXPECT_EQ(readOf(writtenOf(nested)), nested);
+  EXPECT_THAT(refuses(PropertyArray{nested}), HasSubstr("[0]: nested deeper than 200 levels"));
+}
+
+TEST(PtreeReader, readsBackEveryKindOfValue) {
+  const PropertyDict original = everything();
+  const PropertyValue read = readOf(writtenOf(original));
+  EXPECT_EQ(read, PropertyValue(original));
+  ASSERT_NE(read.dict(), nullptr);
+  auto entry = read.dict()->begin();
+  for (const auto& [key, value] : original) {
+    EXPECT_EQ((entry++)->first, key);  // in order
+  }
+  EXPECT_TRUE(std::isnan(readOf(writtenOf(std::nan(""))).number()->asDouble()));
+  EXPECT_TRUE(std::isnan(readOf(writtenOf(-std::nan(""))).number()->asDouble()));
+  EXPECT_EQ(readOf(inPtree("<integer>9223372036854775807</integer>")).number()->kind(),
+            NumberKind::Int64);
+  EXPECT_EQ(readOf(inPtree("<integer>9223372036854775808</integer>")).number()->kind(),
+            NumberKind::UInt64);
+  EXPECT_EQ(readOf(inPtree("<real>2</real>")).number()->kind(), NumberKind::Double);
+}
+
+TEST(PtreeReader, takesWhatOtherWritersMayWrite) {
+  const PropertyValue one(PropertyArray{1});
+  for (const std::string start :
+       {"", "\xEF\xBB\xBF", "\n", "<?xml version='1.0'?>",
+        "<?xml version = \"1.0\" encoding='utf-8' standalone=\"yes\" ?>\r\n"}) {
+    EXPECT_EQ(readOf(start + inPtree("<array><integer>1</integer></array>") + " \n"), one);
+  }
+  EXPECT_EQ(readOf("<ptree  version = '1.0' >\r\n<array >\r\n\t<integer >1</integer >\n</array>"
+                   "</ptree >"),
+            one);
+  EXPECT_EQ(readOf(inPtree("<string>&#x41;&#66;&lt;&gt;&amp;&quot;&apos;&#x1F600;&#10;</string>")),
+            PropertyValue("AB<>&\"'\xF0\x9F\x98\x80\n"));
+  EXPECT_EQ(readOf(inPtree("<string>a\r\nb\rc&#13;\n</string>")), PropertyValue("a\nb\nc\r\n"));
+  EXPECT_EQ(readOf(inPtree("<data>\n\tAQ\n ID\t</data>")), PropertyValue(Bytes{1, 2, 3}));
+  EXPECT_EQ(readOf(inPtree("<array><string/><string></string><true></true><data/></array>")),
+            PropertyValue(PropertyArray{"", "", true, Bytes{}}));
+  EXPECT_EQ(readOf(inPtree("<dict>\n</dict>")), PropertyValue(PropertyDict{}));
+  const PropertyValue repeated =
+      readOf(inPtree("<dict><key>a</key><true/><key> </key><string> </string>"
+                     "<key>a</key><string>\n</string></dict>"));
+  EXPECT_EQ(repeated, PropertyValue(PropertyDict{{"a", "\n"}, {" ", " "}}));
+  EXPECT_EQ(repeated.dict()->begin()->first, "a");
+}
+
+TEST(PtreeReader, refusesWhatTheGrammarDoesNotKnow) {
+  const std::pair<const char*, const char*> cases[] = {
+      {"<dict><key>a</key></dict>", "line 1: the key \"a\" has no value"},
+      {"<dict><key>a</key><key>b</key><true/></dict>", "the key \"a\" has no value"},
+      {"<dict><true/></dict>", "a value without a key"},
+      {"<array><key>a</key></array>", "a key where a value is expected"},
+      {"<dict>text</dict>", "text outside of a value"},
+      {"<array>&#32;</array>", "text outside of a value"},
+      {"", "a document without a value"},
+      {"<true/><true/>", "more than one value"},
+      {"<true/>text", "text outside"},
+      {"<string><true/></string>", "an element inside <string>"},
+      {"<string>a<!-- b --></string>", "comments"},
+      {"<!DOCTYPE ptree><true/>", "DOCTYPE"},
+      {"<string><![CDATA[a]]></string>", "CDATA"},
+      {"<?php ?><true/>", "processing instructions"},
+      {"<string id=\"1\">a</string>", "<string> cannot have attributes"},
+      {"<text>a</text>", "unknown element \"text\""},
+      {"<String>a</String>", "unknown element \"String\""},
+      {"< string>a</string>", "malformed tag"},
+      {"<ptree version=\"1.0\"><true/></ptree>", "unknown element \"ptree\""},
+      {"<string>a</array>", "<string> is not ended by \"</array>\""},
+      {"<dict></array>", "<dict> is not ended by \"</array>\""},
+      {"<true> </true>", "<true> is not empty"},
+      {"<string>a&nbsp;b</string>", "unknown entity"},
+      {"<string>a & b</string>", "unknown entity"},
+      {"<string>&#0;</string>", "XML does not allow"},
+      {"<string>&#xD800;</string>", "XML does not allow"},
+      {"<string>&#4294967361;</string>", "XML does not allow"},
+      {"<string>&#;</string>", "XML does not allow"},
+      {"<string>&#X41;</string>", "malformed character reference"},
+      {"<string>&#1a;</string>", "malformed character reference"},
+      {"<string>a]]>b</string>", "\"]]>\""},
+      {"<string>\x01</string>", "XML does not allow"},
+      {"<string>\xFF</string>", "not UTF-8"},
+      {"<integer></integer>", "\"\" is no integer"},
+      {"<integer>+1</integer>", "no integer"},
+      {"<integer> 1</integer>", "no integer"},
+      {"<integer>0x10</integer>", "no integer"},
+      {"<integer>-9223372036854775809</integer>", "no integer"},
+      {"<integer>18446744073709551616</integer>", "no integer"},
+      {"<real>1e999</real>", "no real number"},
+      {"<real>infinity</real>", "no real number"},
+      {"<real>0x1p3</real>", "no real number"},
+      {"<real>1.5 </real>", "no real number"},
+      {"<real/>", "no real number"},
+      {"<data>AQI</data>", "is not base64"},
+      {"<data>AQ==AQ==</data>", "is not base64"},
+      {"<data>A===</data>", "is not base64"},
+      {"<data>AR==</data>", "is not base64"},
+      {"<data>A*==</data>", "is not base64"},
+      {"<date>2024-02-30T00:00:00Z</date>", "\"2024-02-30T00:00:00Z\" is not a date"}};
+  for (const auto& [content, message] : cases) {
+    EXPECT_THAT(errorOf(inPtree(content)), HasSubstr(message)) << content;
+  }
+}
+
+TEST(PtreeReader, refusesWhatIsNoPtreeDocument) {
+  for (const char* document :
+       {"", "plain", "<", "<ptree>", "<ptree version=\"1.0\"/>", "<ptreeversion=\"1.0\"><true/>",
+        "<ptree><true/></ptree>", "<ptree version=\"2.0\"><true/></ptree>",
+        "<ptree version=\"1.0\" x=\"y\"><true/></ptree>", "<dict></dict>",
+        "<!-- a --><ptree version=\"1.0\"><true/></ptree>", "<?xml?><ptree version=\"1.0\">",
+        "<?xml version=\"1.1\"?><ptree version=\"1.0\"><true/></ptree>",
+        "<?xml version=\"1.0\" encoding=\"UTF-16\"?><ptree version=\"1.0\"><true/></ptree>",
+        "<?xml version=\"1.0\"encoding=\"UTF-8\"?><ptree version=\"1.0\"><true/></ptree>",
+        "<ptree version=\"1.0\"><true/></ptree><ptree version=\"1.0\"><true/></ptree>",
+        "<ptree version=\"1.0\"><true/></ptree>x", " <?xml version=\"1.0\"?>"}) {
+    EXPECT_THAT(errorOf(document), StartsWith("line 1: ")) << document;
+  }
+  EXPECT_THAT(errorOf(std::string("<\0p\0t\0", 6)), StartsWith("line 1: "));
+}
+
+TEST(PtreeReader, namesTheLine) {
+  const std::string start = "<?xml version=\"1.0\"?>\r\n<ptree version=\"1.0\">\n<dict>\n";
+  EXPECT_THAT(errorOf(start + "<key>a</key>\n<integer>1x</integer>\n</dict></ptree>"),
+              StartsWith("line 5: \"1x\" is no integer"));
+  EXPECT_THAT(errorOf(start + "<key>a&amp;\nb</key>\n<string>\n\n&bad;</string>"),
+              StartsWith("line 8: an unknown entity"));
+  EXPECT_THAT(errorOf(start + "<key>a</key>\n</dict>\n</ptree>"), StartsWith("line 4: the key"));
+  EXPECT_EQ(errorOf(start + "\n\n"), "line 6: the document ends early");
+}
+
+TEST(PtreeReader, refusesADocumentCutAtAnyByte) {
+  const std::string document = writtenOf(everything());
+  const std::size_t end = document.size() - 1;  // without the last line feed it is complete
+  for (std::size_t size = 0; size < end; ++size) {
+    EXPECT_THAT(errorOf(document.substr(0, size)), StartsWith("line ")) << size;
+  }
+  readOf(document.substr(0, end));
+}
+
+TEST(PtreeReader, readsOrRefusesWhateverBytesChange) {
+  const std::string document = writtenOf(everything());
+  std::mt19937 random(7);
+  int accepted = 0;
+  for (int round = 0; round < 5000; ++round) {
+    std::string changed = document;
+    for (auto count = 1 + random() % 3; count > 0; --count) {
+      const std::size_t at = random() % changed.size();
+      switch (random() % 3) {
+        case 0:
+          changed[at] = static_cast<char>(random());
+          break;
+        case 1:
+          changed.erase(at, random() % 20);
+          break;
+        default:
+          changed.insert(at, document, random() % document.size(), random() % 20);
+      }
+    }
+    std::string error;
+    if (const std::optional<PropertyValue> value = readPtree(changed, error)) {
+      const std::string again = writtenOf(*value);
+      EXPECT_EQ(writtenOf(readOf(again)), again);
+      ++accepted;
+    } else {
+      EXPECT_THAT(error, StartsWith("line "));
+    }
+  }
+  EXPECT_GT(accepted, 100);
+}
+
+TEST(PtreeReader, limitsNesting) {
+  readOf(nestedArrays(200));
+  EXPECT_EQ(errorOf(nestedArrays(201)), "line 1: nested deeper than 200 levels");
+  EXPECT_THAT(errorOf(nestedArrays(1'000'000)), HasSubstr("nested"));
+}
+
+}  // namespace
+}  // namespace vesprun
