@@ -58,16 +58,11 @@ class TreeReader {
   std::optional<PropertyValue> value(const pugi::xml_node& node) {
     const std::string_view text = node.value();
     const std::optional<PtreeElement> element = ptreeElement(node.name());
-    if (!element) {
-      return fault(node, "malformed document");
-    }
-    switch (*element) {
+    switch (element.value_or(PtreeElement::Key)) {
       case PtreeElement::Dict:
         return dict(node);
       case PtreeElement::Array:
         return array(node);
-      case PtreeElement::Key:
-        return fault(node, "a key where a value is expected");
       case PtreeElement::String:
         return PropertyValue(text);
       case PtreeElement::Integer:
@@ -82,8 +77,10 @@ class TreeReader {
         return scalar(node, parseBase64(text), "is not base64");
       case PtreeElement::Date:
         return scalar(node, parseDateText(text), "is not a date");
+      case PtreeElement::Key:
+        break;
     }
-    return std::nullopt;
+    return fault(node, "not a value");
   }
 
  private:
@@ -103,13 +100,7 @@ class TreeReader {
   std::optional<PropertyValue> dict(const pugi::xml_node& node) {
     PropertyDict dict;
     for (pugi::xml_node key = elementFrom(node.first_child()); key;) {
-      if (ptreeElement(key.name()) != PtreeElement::Key) {
-        return fault(key, "a value without a key");
-      }
       const pugi::xml_node entry = elementFrom(key.next_sibling());
-      if (!entry || ptreeElement(entry.name()) == PtreeElement::Key) {
-        return fault(key, "the key " + quotedText(key.value()) + " has no value");
-      }
       std::optional<PropertyValue> read = value(entry);
       if (!read) {
         return std::nullopt;

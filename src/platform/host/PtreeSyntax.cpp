@@ -32,6 +32,11 @@ constexpr bool isNameCharacter(char c) {
 }
 
 class SyntaxCheck {
+  struct Level {
+    bool isDict;
+    bool awaitsValue;  ///< a dictionary after a key
+  };
+
  public:
   SyntaxCheck(std::string_view document, PtreeFault& fault) : _document(document), _fault(fault) {}
 
@@ -257,10 +262,7 @@ class SyntaxCheck {
   bool takeEndTag(std::size_t start) {
     const std::string_view name = takeName();
     skipSpace();
-    const std::string_view expected = _inText              ? _textName
-                                      : _level == 0        ? std::string_view("ptree")
-                                      : isDict(_level - 1) ? "dict"
-                                                           : "array";
+    const std::string_view expected = expectedEnd();
     if (name != expected) {
       return failAt(start, '<' + std::string(expected) + "> is not ended by " +
                                quotedText("</" + std::string(name.substr(0, 64)) + '>'));
@@ -270,12 +272,46 @@ class SyntaxCheck {
     }
     if (_inText) {
       _inText = false;
+      _lastText = _document.substr(_textStart, start - _textStart);
     } else if (_level == 0) {
       _finished = true;
     } else {
       --_level;
+      return !_levels[_level].awaitsValue || failAtKey();
     }
     return true;
+  }
+
+  std::string_view expectedEnd() const {
+    if (_inText) {
+      return _textName;
+    }
+    return _level == 0 ? "ptree" : _levels[_level - 1].isDict ? "dict" : "array";
+  }
+
+  /// Whether an element may stand at this place of its dictionary, array or document.
+  bool takePlace(PtreeElement element, std::size_t start) {
+    if (_level == 0 && std::exchange(_hasValue, true)) {
+      return failAt(start, "more than one value");
+    }
+    const bool isKey = element == PtreeElement::Key;
+    if (_level == 0 || !_levels[_level - 1].isDict) {
+      return !isKey || failAt(start, "a key where a value is expected");
+    }
+    bool& awaitsValue = _levels[_level - 1].awaitsValue;
+    if (isKey == awaitsValue) {
+      return isKey ? failAtKey() : failAt(start, "a value without a key");
+    }
+    awaitsValue = isKey;
+    if (isKey) {
+      _keyStart = start;
+      _lastText = {};
+    }
+    return true;
+  }
+
+  bool failAtKey() {
+    return failAt(_keyStart, "the key " + quotedText(_lastText) + " has no value");
   }
 
   bool takeStartTag(std::size_t start) {
@@ -287,8 +323,8 @@ class SyntaxCheck {
     if (!element) {
       return failAt(start, name.empty() ? "malformed tag" : "unknown element " + quotedText(name));
     }
-    if (_level == 0 && std::exchange(_hasValue, true)) {
-      return failAt(start, "more than one value");
+    if (!takePlace(*element, start)) {
+      return false;
     }
     const bool spaced = skipSpace();
     const bool empty = take("/");
@@ -304,23 +340,25 @@ class SyntaxCheck {
       return true;
     }
     if (container) {
-      _isDict[_level++] = element == PtreeElement::Dict;
+      _levels[_level++] = {element == PtreeElement::Dict, false};
     } else {
       _inText = true;
       _textName = name;
+      _textStart = _at;
     }
     return true;
   }
 
-  bool isDict(std::size_t level) const { return _isDict[level]; }
-
   std::string_view _document;
   PtreeFault& _fault;
   std::size_t _at = 0;
-  std::array<bool, kMostPtreeLevels> _isDict{};  ///< of the containers around the current place
-  std::size_t _level = 0;                        ///< how many those are
-  bool _inText = false;                          ///< in an element that holds no others
-  std::string_view _textName;                    ///< the name of that element
+  std::array<Level, kMostPtreeLevels> _levels{};  ///< the containers around the current place
+  std::size_t _level = 0;                         ///< how many those are
+  bool _inText = false;                           ///< in an element that holds no others
+  std::string_view _textName;                     ///< the name of that element
+  std::size_t _textStart = 0;
+  std::string_view _lastText;  ///< after a key and before its value: the key as it is written
+  std::size_t _keyStart = 0;
   bool _hasValue = false;
   bool _finished = false;
 };
