@@ -1,0 +1,42 @@
+#pragma once
+
+#include <nlohmann/json_fwd.hpp>
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "common/PropertyValue.h"
+
+namespace vesprun {
+
+/// The JSON form of a value. Dictionary (in order), array, string, boolean and integer are what
+/// they are. A double always has a fraction or an exponent ("2.0"). What JSON has no form for is an
+/// object with one entry:
+///
+/// - `{"real":"inf"}`, `{"real":"-inf"}`, `{"real":"nan"}`: a double, or a single-precision float,
+///   that is no finite number;
+/// - `{"float":0.25}`: a single-precision float, with the fewest digits that read back to it;
+/// - `{"data":"AQID"}`: bytes, in base64;
+/// - `{"date":"2024-03-05T09:15:02Z"}`: a date.
+///
+/// Bytes of a string that are no UTF-8 become U+FFFD. `jsonText` is one line without white space,
+/// `indentedJsonText` has a line for each entry, two spaces for each level. Neither ends the line.
+std::string jsonText(const PropertyValue& value);
+std::string jsonText(const PropertyDict& dict);
+std::string indentedJsonText(const PropertyValue& value);
+
+/// The value of a JSON text in that form. Nothing, with a text in `error`, for what is no JSON, a
+/// null, an integer outside the 64-bit range (signed or unsigned), containers nested deeper than
+/// 200, and one of the four objects whose text is not of its kind.
+///
+/// An integer is a signed 64-bit number when it fits, else an unsigned one. An object with one
+/// entry is one of the four only when the entry is of the type that they have (a number for
+/// "float", a string for the others); any other object is a dictionary. A repeated name keeps its
+/// first place and its last value.
+std::optional<PropertyValue> valueFromJsonText(std::string_view text, std::string& error);
+
+/// The same for JSON that is parsed already. An integer too large for its type has become a
+/// fraction when it was parsed, and is one here.
+std::optional<PropertyValue> valueFromJson(const nlohmann::ordered_json& json, std::string& error);
+
+}  // namespace vesprun
