@@ -1,0 +1,118 @@
+#include <cstdio>
+#include <vector>
+
+#include "Command.h"
+#include "platform/host/HostPreferences.h"
+#include "platform/host/JsonForm.h"
+#include "platform/host/QuotedText.h"
+
+namespace vesprun {
+namespace {
+
+/// Takes the complaints of the preferences, which become the command's own.
+class Complaints final : public SystemLog {
+ public:
+  bool keeps(LogLevel level) const override { return level == LogLevel::Error; }
+  void write(LogLevel level, std::string_view message) override {
+    if (keeps(level)) {
+      _messages.emplace_back(message);
+    }
+  }
+
+  const std::vector<std::string>& messages() const { return _messages; }
+  void failIfAny() const {
+    if (!_messages.empty()) {
+      throw CommandFailure(_messages.front());
+    }
+  }
+
+ private:
+  std::vector<std::string> _messages;
+};
+
+struct PreferenceArguments {
+  std::string device;
+  std::string user = "mobile";
+  std::string domain;
+  std::string key;
+  std::string json;
+};
+
+DeviceDirectory openDirectory(const std::string& path) {
+  std::string error;
+  std::optional<DeviceDirectory> directory = DeviceDirectory::open(path, error);
+  if (!directory) {
+    throw CommandFailure(error);
+  }
+  return *std::move(directory);
+}
+
+void printPreferences(const PreferenceArguments& arguments, bool wholeDomain) {
+  const DeviceDirectory directory = openDirectory(arguments.device);
+  Complaints complaints;
+  HostPreferences preferences(directory, complaints, arguments.user);
+  const PropertyDict values = preferences.valuesOfDomain(arguments.domain);
+  complaints.failIfAny();
+  if (wholeDomain) {
+    printJson(values);
+    return;
+  }
+  const PropertyValue* value = values.find(arguments.key);
+  if (value == nullptr) {
+    throw CommandFailure("no key " + quotedText(arguments.key) + " in domain " +
+                         quotedText(arguments.domain));
+  }
+  printJson(*value);
+}
+
+void changePreference(const PreferenceArguments& arguments, std::optional<PropertyValue> value) {
+  const DeviceDirectory directory = openDirectory(arguments.device);
+  Complaints complaints;
+  HostPreferences preferences(directory, complaints, arguments.user);
+  preferences.LGSPreferencesSetValue(arguments.key, std::move(value), arguments.domain);
+  complaints.failIfAny();
+  if (!preferences.LGSPreferencesSynchronize(arguments.domain)) {
+    complaints.failIfAny();
+  }
+  for (const std::string& message : complaints.messages()) {
+    std::fprintf(stderr, "vespctl: %s\n", message.c_str());
+  }
+}
+
+void setPreference(const PreferenceArguments& arguments) {
+  std::string error;
+  std::optional<PropertyValue> value = valueFromJsonText(arguments.json, error);
+  if (!value) {
+    throw CommandFailure(quotedText(arguments.json) + ": " + error);
+  }
+  changePreference(arguments, std::move(value));
+}
+
+}  // namespace
+
+void addPreferenceCommands(CLI::App& vespctl) {
+  CLI::App* prefs = vespctl.add_subcommand("prefs", "Shows and changes preferences");
+  const auto arguments = std::make_shared<PreferenceArguments>();
+  prefs->add_option("DIR", arguments->device, "The device directory")->required();
+  prefs->add_option("--user", arguments->user, "Whose preferences, instead of mobile's");
+  prefs->require_subcommand(1);
+  prefs->fallthrough();
+
+  CLI::App* get = prefs->add_subcommand("get", "Prints a value, or all values of a domain");
+  get->add_option("DOMAIN", arguments->domain)->required();
+  const CLI::Option* key = get->add_option("KEY", arguments->key);
+  get->callback([arguments, key] { printPreferences(*arguments, key->count() == 0); });
+
+  CLI::App* set = prefs->add_subcommand("set", "Sets a value");
+  set->add_option("DOMAIN", arguments->domain)->required();
+  set->add_option("KEY", arguments->key)->required();
+  set->add_option("JSON", arguments->json, "The value in its JSON form")->required();
+  set->callback([arguments] { setPreference(*arguments); });
+
+  CLI::App* remove = prefs->add_subcommand("remove", "Removes a key");
+  remove->add_option("DOMAIN", arguments->domain)->required();
+  remove->add_option("KEY", arguments->key)->required();
+  remove->callback([arguments] { changePreference(*arguments, std::nullopt); });
+}
+
+}  // namespace vesprun
