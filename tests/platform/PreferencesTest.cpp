@@ -115,7 +115,7 @@ TEST_F(PreferencesTest, keepWhatOtherProcessesChanged) {
 
 TEST_F(PreferencesTest, loseNothingToProcessesAndThreadsThatWriteAtOnce) {
   constexpr int kKeys = 15;
-  const auto write = [this](HostPreferences& preferences, const std::string& writer) {
+  const auto write = [](HostPreferences& preferences, const std::string& writer) {
     bool good = true;
     for (int key = 0; key < kKeys; ++key) {
       preferences.LGSPreferencesSetValue(writer + std::to_string(key), key, "a");
