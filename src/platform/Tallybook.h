@@ -14,9 +14,9 @@ class TBHistoryDistributionEnumerator {
  public:
   virtual ~TBHistoryDistributionEnumerator() = default;
 
-  /// Writes the next value and its offset in seconds within the day and returns true, or returns
-  /// false, leaving both untouched, when the values are exhausted.
-  virtual bool getNextValueSecondsInDayOffset(double& value, std::int32_t& secondsInDay) = 0;
+  /// Writes the next value, and its offset in seconds within the day unless `secondsInDay` is null,
+  /// and returns true; or returns false, leaving both untouched, when the values are exhausted.
+  virtual bool getNextValueSecondsInDayOffset(double& value, std::int32_t* secondsInDay) = 0;
 };
 
 /// The recorded rows of the counter database. Both queries deliver the rows of every day from

@@ -1,0 +1,36 @@
+#include "platform/host/HostOrrery.h"
+
+#include "platform/host/LiveSystem.h"
+
+namespace vesprun {
+
+std::optional<PropertyValue> HostOrrery::OrreryCopyAnswer(std::string_view question) {
+  if (question == "InternalBuild") {
+    return _description.internalBuild;
+  }
+  if (question == "DiskUsage") {
+    return diskUsage();
+  }
+  if (question == "InverseDeviceID") {
+    return _description.inverseDeviceID;
+  }
+  return std::nullopt;
+}
+
+std::optional<PropertyValue> HostOrrery::diskUsage() const {
+  if (!_description.diskUsage.isLive()) {
+    return _description.diskUsage.value;
+  }
+  const std::optional<VolumeDescription> volume = live::volume(_directory.path());
+  if (!volume) {
+    return std::nullopt;
+  }
+  const auto bytes = [&](std::uint64_t blocks) {
+    return static_cast<std::int64_t>(blocks * volume->blockSize);
+  };
+  return PropertyDict{{"TotalDiskCapacity", bytes(volume->blocks)},
+                      {"TotalDataAvailable", bytes(volume->available)},
+                      {"AmountDataAvailable", bytes(volume->available)}};
+}
+
+}  // namespace vesprun

@@ -1,0 +1,116 @@
+#include "platform/host/Outbox.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <charconv>
+#include <cstdint>
+#include <cstdio>
+#include <filesystem>
+
+#include "platform/host/AtomicFile.h"
+#include "platform/host/JsonForm.h"
+
+namespace vesprun {
+namespace {
+
+constexpr std::string_view kLogFolder = "outbox/logs";
+constexpr std::string_view kPtreeLogType = "193";  // the other logs are text
+
+class OutboxLogFile : public LogFileHandle {
+ public:
+  explicit OutboxLogFile(AtomicFile& file) : _file(file) {}
+
+  bool write(std::string_view bytes) override { return _file.append(bytes); }
+
+ private:
+  AtomicFile& _file;
+};
+
+/// One more than the largest number that a file name in the folder begins with.
+std::uint64_t nextNumber(const std::string& folder) {
+  std::uint64_t largest = 0;
+  std::error_code error;
+  for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
+       entry.increment(error)) {
+    const std::string name = entry->path().filename();
+    std::uint64_t number = 0;
+    const auto [rest, problem] = std::from_chars(name.data(), name.data() + name.size(), number);
+    if (problem == std::errc() && *rest == '-') {
+      largest = std::max(largest, number);
+    }
+  }
+  return largest + 1;
+}
+
+std::string baseName(std::uint64_t number, std::string_view type, std::string_view name) {
+  char digits[24];
+  std::snprintf(digits, sizeof digits, "%04llu", static_cast<unsigned long long>(number));
+  return std::string(digits) + '-' + std::string(type) + '-' + std::string(name);
+}
+
+}  // namespace
+
+bool Outbox::append(const std::string& file, const PropertyDict& entries) {
+  PropertyDict line{{"time", dateText(_clock.now())}};
+  line.merge(entries);
+  const std::lock_guard lock(_mutex);
+  std::string error;
+  const auto lines = _files.try_emplace(file, _directory.hostPath("outbox/" + file)).first;
+  if (_directory.makeFolder("outbox", error) && lines->second.append(jsonText(line), error)) {
+    return true;
+  }
+  _log.write(LogLevel::Error, error);
+  return false;
+}
+
+bool Outbox::submitLog(std::string_view type, std::string_view name, const PropertyDict* header,
+                       const Logsmith::LogWriter& writer) {
+  std::string error;
+  if (writeLog(type, name, header, writer, error)) {
+    return true;
+  }
+  _log.write(LogLevel::Error, error);
+  return false;
+}
+
+bool Outbox::writeLog(std::string_view type, std::string_view name, const PropertyDict* header,
+                      const Logsmith::LogWriter& writer, std::string& error) const {
+  const std::optional<std::string> folder = _directory.makeFolder(kLogFolder, error);
+  if (!folder) {
+    return false;
+  }
+  std::optional<AtomicFile> file = AtomicFile::create(*folder, error);
+  if (!file) {
+    return false;
+  }
+  OutboxLogFile handle(*file);
+  writer(handle);
+  // Two submissions at once must not share a number: a header would stand beside the other's log.
+  const std::optional<FolderLock> lock = FolderLock::take(*folder, error);
+  if (!lock) {
+    return false;
+  }
+  const std::string base = baseName(nextNumber(*folder), type, name);
+  const std::string headerName = base + ".header.json";
+  if (header != nullptr) {
+    // First, so that a log which is there has its header beside it.
+    std::optional<AtomicFile> headerFile = AtomicFile::create(*folder, error);
+    if (!headerFile) {
+      return false;
+    }
+    headerFile->append(jsonText(*header) + '\n');  // a failure is told by `replace`
+    if (!headerFile->replace(headerName, error, &*lock)) {
+      return false;
+    }
+  }
+  if (file->replace(base + (type == kPtreeLogType ? ".ptree" : ".log"), error, &*lock)) {
+    return true;
+  }
+  if (header != nullptr) {
+    unlink((*folder + '/' + headerName).c_str());
+  }
+  return false;
+}
+
+}  // namespace vesprun

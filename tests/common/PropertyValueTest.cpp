@@ -1,0 +1,90 @@
+#include "common/PropertyValue.h"
+
+#include <cmath>
+#include <limits>
+
+#include "common/TextForm.h"
+
+namespace vesprun {
+namespace {
+
+constexpr std::int64_t kSmallest = std::numeric_limits<std::int64_t>::min();
+constexpr std::int64_t kLargest = std::numeric_limits<std::int64_t>::max();
+constexpr std::uint64_t kAllOnes = std::numeric_limits<std::uint64_t>::max();
+
+TEST(Number, TruncationSaturates) {
+  EXPECT_EQ(saturatingTruncate(-0.9), 0);
+  EXPECT_EQ(saturatingTruncate(2.9), 2);
+  EXPECT_EQ(saturatingTruncate(-2.9), -2);
+  EXPECT_EQ(saturatingTruncate(9223372036854775807.0), kLargest);
+  EXPECT_EQ(saturatingTruncate(std::nextafter(9223372036854775808.0, 0)), 9223372036854774784);
+  EXPECT_EQ(saturatingTruncate(-9223372036854775808.0), kSmallest);
+  EXPECT_EQ(saturatingTruncate(-1e300), kSmallest);
+  EXPECT_EQ(saturatingTruncate(std::nan("")), 0);
+}
+
+TEST(Number, ReadsAsOtherTypesByTheLowBits) {
+  EXPECT_EQ(Number(std::int8_t{-1}).asUInt64(), kAllOnes);
+  EXPECT_EQ(Number(std::uint32_t{0xFFFFFFFF}).asInt32(), -1);
+  EXPECT_EQ(Number(std::uint32_t{0xFFFFFFFF}).asInt64(), 4294967295);
+  EXPECT_EQ(Number(std::int64_t{0x100000002}).asInt32(), 2);
+  EXPECT_EQ(Number(kAllOnes).asDouble(), 18446744073709551616.0);
+  EXPECT_EQ(Number(1e19).asUInt64(), 10000000000000000000U);
+  EXPECT_EQ(Number(1e30).asUInt64(), kAllOnes);
+  EXPECT_EQ(Number(-1.5).asUInt64(), kAllOnes);
+  EXPECT_EQ(Number(-1e30).asInt32(), 0);
+}
+
+TEST(Number, EqualsByValue) {
+  EXPECT_EQ(Number(std::int8_t{5}), Number(5.0));
+  EXPECT_NE(Number(std::int64_t{-1}), Number(kAllOnes));
+  EXPECT_NE(Number(kLargest), Number(9223372036854775808.0));
+  EXPECT_EQ(Number(kSmallest), Number(-9223372036854775808.0));
+  EXPECT_NE(Number(kAllOnes), Number(18446744073709551616.0));
+  EXPECT_EQ(Number(0.25F), Number(0.25));
+  EXPECT_NE(Number(std::nan("")), Number(std::nan("")));
+  EXPECT_EQ(Number(std::int32_t{0}), Number(-0.0));
+}
+
+TEST(PropertyDict, KeepsThePlaceOfAKey) {
+  PropertyDict dict{{"b", 1}, {"a", 2}, {"c", 3}};
+  dict.set("b", "replaced");
+  dict.remove("a");
+  dict.merge({{"c", true}, {"a", 4}});
+  EXPECT_FALSE(dict.remove("absent"));
+  EXPECT_EQ(textForm(dict), "{b = replaced; c = 1; a = 4}");
+  EXPECT_EQ(dict, (PropertyDict{{"a", 4}, {"b", "replaced"}, {"c", true}}));
+  EXPECT_NE(dict, (PropertyDict{{"a", 4}, {"b", "replaced"}, {"c", 1}}));
+}
+
+TEST(PropertyValue, CopiesDeeply) {
+  PropertyValue original = PropertyDict{{"inner", PropertyDict{{"n", 1}}}};
+  PropertyValue copy = original;
+  copy.dict()->set("inner", "gone");
+  EXPECT_EQ(textForm(original), "{inner = {n = 1}}");
+  copy = original;
+  EXPECT_EQ(copy, original);
+}
+
+TEST(TextForm, WritesEachType) {
+  EXPECT_EQ(textForm(PropertyArray{"a", 7, -1.0, 0.25F, false}), "(a, 7, -1, 0.25, 0)");
+  EXPECT_EQ(textForm(Bytes{0x0A, 0xFF}), "<0aff>");
+  EXPECT_EQ(textForm(Date{1709630102, 500'000'000}), "2024-03-05 09:15:02 +0000");
+  EXPECT_EQ(textForm(kAllOnes), "18446744073709551615");
+  EXPECT_EQ(textForm(PropertyDict()), "{}");
+}
+
+TEST(TextForm, WritesFractionsShortAndPlain) {
+  EXPECT_EQ(textForm(100000.0), "100000");
+  EXPECT_EQ(textForm(0.1), "0.1");
+  EXPECT_EQ(textForm(0.1F), "0.1");
+  EXPECT_EQ(textForm(1e16), "10000000000000000");
+  EXPECT_EQ(textForm(1e22), "1e+22");
+  EXPECT_EQ(textForm(0.00001), "1e-05");
+  EXPECT_EQ(textForm(-std::numeric_limits<double>::infinity()), "-inf");
+  EXPECT_EQ(textForm(std::numeric_limits<double>::infinity()), "inf");
+  EXPECT_EQ(textForm(-std::nan("")), "nan");
+}
+
+}  // namespace
+}  // namespace vesprun
