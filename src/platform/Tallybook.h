@@ -22,8 +22,8 @@ class TBHistoryDistributionEnumerator {
 /// The recorded rows of the counter database. Both queries deliver the rows of every day from
 /// `minDay` to `maxDay`, both included, whose key begins with `keyPrefix` (the empty prefix: every
 /// key), by ascending day and then by ascending key (byte order). Setting `stop` ends the query
-/// after the row. A database that cannot be read delivers the rows before the damage; the service
-/// reports it in the system log.
+/// after the row. A database that cannot be read delivers the rows before the damage, and of the
+/// row with the damage the values before it; the service reports it in the system log.
 class TBHistory {
  public:
   using ScalarRowHandler =
@@ -46,8 +46,8 @@ class TBHistory {
 /// The device's counter database: named scalars and value distributions, stored per day.
 ///
 /// Writes are collected in memory and reach the database at a checkpoint, all or none. They may
-/// come from any thread. A key must be UTF-8 text that an XML 1.0 document can carry; the write of
-/// any other key is refused with a line in the system log.
+/// come from any thread. A key must be UTF-8 text that an XML 1.0 document can carry, 1 MiB at
+/// most; the write of any other key is refused with an error in the system log.
 class Tallybook {
  public:
   virtual ~Tallybook() = default;

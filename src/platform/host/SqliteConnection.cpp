@@ -3,9 +3,6 @@
 namespace vesprun {
 namespace {
 
-// Another process holds the database for the time of one batch of writes or one report.
-constexpr int kLongestWaitMilliseconds = 20'000;
-
 // No cell of ours is near this size; a damaged one may claim to be.
 constexpr int kLongestCell = 16 * 1024 * 1024;
 
@@ -25,7 +22,8 @@ bool SqliteFailure::isCorruption() const {
   }
 }
 
-SqliteConnection::SqliteConnection(const std::string& path) : _path(path) {
+SqliteConnection::SqliteConnection(const std::string& path, std::chrono::milliseconds longestWait)
+    : _path(path) {
   sqlite3* database = nullptr;
   const int result =
       sqlite3_open_v2(path.c_str(), &database,
@@ -34,7 +32,7 @@ SqliteConnection::SqliteConnection(const std::string& path) : _path(path) {
   if (result != SQLITE_OK) {
     fail(result);
   }
-  sqlite3_busy_timeout(database, kLongestWaitMilliseconds);
+  sqlite3_busy_timeout(database, static_cast<int>(longestWait.count()));
   sqlite3_db_config(database, SQLITE_DBCONFIG_DEFENSIVE, 1, nullptr);
   sqlite3_db_config(database, SQLITE_DBCONFIG_TRUSTED_SCHEMA, 0, nullptr);
   sqlite3_limit(database, SQLITE_LIMIT_LENGTH, kLongestCell);
@@ -54,7 +52,25 @@ std::int64_t SqliteConnection::queryInteger(const char* sql) {
   return statement.step() ? statement.integer(0) : 0;
 }
 
+// Through SQLite's own descriptor: closing another one would drop its locks.
+void SqliteConnection::readHeader(std::span<std::uint8_t> header) const {
+  sqlite3_file* file = nullptr;
+  int result = sqlite3_file_control(handle(), "main", SQLITE_FCNTL_FILE_POINTER, &file);
+  if (result == SQLITE_OK) {
+    result = file->pMethods->xRead(file, header.data(), static_cast<int>(header.size()), 0);
+  }
+  if (result == SQLITE_IOERR_SHORT_READ) {
+    failAsCorrupt("the file is too short");
+  }
+  if (result != SQLITE_OK) {
+    fail(result);
+  }
+}
+
 void SqliteConnection::fail(int code) const {
+  if ((code & 0xFF) == SQLITE_BUSY) {
+    throw SqliteFailure{code, _path + ": another process keeps it locked"};
+  }
   const bool ofThisCall = handle() != nullptr && sqlite3_extended_errcode(handle()) == code;
   throw SqliteFailure{
       code, _path + ": " + (ofThisCall ? sqlite3_errmsg(handle()) : sqlite3_errstr(code))};
@@ -144,8 +160,9 @@ void SqliteStatement::requireType(int column, int type) const {
   }
 }
 
-SqliteTransaction::SqliteTransaction(SqliteConnection& connection) : _connection(connection) {
-  _connection.execute("BEGIN IMMEDIATE");
+SqliteTransaction::SqliteTransaction(SqliteConnection& connection, Kind kind)
+    : _connection(connection) {
+  _connection.execute(kind == Kind::Writing ? "BEGIN IMMEDIATE" : "BEGIN");
 }
 
 SqliteTransaction::~SqliteTransaction() {

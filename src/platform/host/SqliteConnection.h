@@ -2,6 +2,7 @@
 
 #include <sqlite3.h>
 
+#include <chrono>
 #include <cstdint>
 #include <memory>
 #include <span>
@@ -24,14 +25,19 @@ struct SqliteFailure {
 /// An open SQLite database file, set up to distrust what it finds in it.
 class SqliteConnection {
  public:
-  /// Opens an existing file, for reading only when it cannot be written. Throws `SqliteFailure`.
-  explicit SqliteConnection(const std::string& path);
+  /// Opens an existing file, for reading only when it cannot be written, or a database in memory
+  /// (":memory:"). What another process has locked is waited for, `longestWait` at most. Throws
+  /// `SqliteFailure`.
+  SqliteConnection(const std::string& path, std::chrono::milliseconds longestWait);
 
   /// Runs statements that give no rows. Throws `SqliteFailure`.
   void execute(const char* sql);
 
   /// The integer that a one-row query gives.
   std::int64_t queryInteger(const char* sql);
+
+  /// The first bytes of the file, which must have as many.
+  void readHeader(std::span<std::uint8_t> header) const;
 
   sqlite3* handle() const { return _database.get(); }
 
@@ -81,10 +87,13 @@ class SqliteStatement {
   std::unique_ptr<sqlite3_stmt, Finalize> _statement;
 };
 
-/// A transaction that may write; rolled back unless it was committed.
+/// A transaction; rolled back unless it was committed.
 class SqliteTransaction {
  public:
-  explicit SqliteTransaction(SqliteConnection& connection);
+  enum class Kind { Reading, Writing };
+
+  /// One that writes is the only one of its kind from its start on.
+  SqliteTransaction(SqliteConnection& connection, Kind kind);
   ~SqliteTransaction();
   SqliteTransaction(const SqliteTransaction&) = delete;
   SqliteTransaction& operator=(const SqliteTransaction&) = delete;
