@@ -1,0 +1,50 @@
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <optional>
+#include <span>
+#include <vector>
+
+#include "common/PropertyDict.h"
+
+namespace vesprun {
+
+/// The boundaries of a histogram, made ready for many look-ups: n numbers, read as doubles, bound
+/// n + 1 buckets. What is no number counts as NaN.
+class HistogramBoundaries {
+ public:
+  explicit HistogramBoundaries(const PropertyArray& intervals);
+
+  std::size_t bucketCount() const { return _highest.size() + 1; }
+
+  /// The index of the first boundary, in array order, that is not below `value`; n when there is
+  /// none, as for NaN.
+  std::uint32_t bucketFor(double value) const {
+    // The first boundary that reaches a value is also the first place where the running maximum
+    // does, and that one is sorted. Written without jumps: values come in no order.
+    std::size_t bucket = 0;
+    for (std::size_t rest = _highest.size(); rest > 0;) {
+      const std::size_t half = (rest + 1) / 2;
+      bucket += _highest[bucket + half - 1] >= value ? 0 : half;
+      rest -= half;
+    }
+    return static_cast<std::uint32_t>(bucket);
+  }
+
+ private:
+  std::vector<double> _highest;  ///< of the boundaries up to each; NaN before the first number
+};
+
+/// The bucket of one value, by boundaries read afresh.
+std::uint32_t determineHistBucketForValueWithIntervals(double value,
+                                                       const PropertyArray& intervals);
+
+/// Label to count (unsigned 64-bit), in bucket order, for the buckets that are not empty; nothing
+/// when all are. Bucket i is "(lower, upper]", the last one "(lower, inf)", the first one's lower
+/// boundary "-inf"; boundaries are written as the numbers that they are (`textForm`). `counts` has
+/// one more element than `intervals`.
+std::optional<PropertyDict> histogramDictForIntervalsWithHistCounts(
+    const PropertyArray& intervals, std::span<const std::uint64_t> counts);
+
+}  // namespace vesprun

@@ -1,0 +1,129 @@
+#include "report/TBReport.h"
+
+#include <limits>
+#include <new>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "config/KeyOptions.h"
+#include "platform/Platform.h"
+#include "report/Histogram.h"
+#include "report/RoundScalar.h"
+#include "report/RunningStatistics.h"
+
+namespace vesprun {
+namespace {
+
+/// Boundaries and a counter for each bucket.
+struct HistogramCounters {
+  explicit HistogramCounters(const PropertyArray& intervals)
+      : boundaries(intervals), counts(boundaries.bucketCount()) {}
+
+  HistogramBoundaries boundaries;
+  std::vector<std::uint64_t> counts;
+};
+
+std::optional<HistogramCounters> allocateCounters(const PropertyArray& intervals,
+                                                  std::string_view key) {
+  logMessage(LogLevel::Debug, "Treating key %s as a histogram", std::string(key).c_str());
+  try {
+    return HistogramCounters(intervals);
+  } catch (const std::bad_alloc&) {
+    logMessage(LogLevel::Default,
+               "Couldn't allocate histCounts for key %s. Will not calculate histogram values",
+               std::string(key).c_str());
+    return std::nullopt;
+  }
+}
+
+}  // namespace
+
+TBReport::TBReport() : _config(TBConfig::init()) {}
+
+const PropertyDict* TBReport::optionsForScalarKey(std::string_view key) const {
+  return _config ? _config->configOptionsForScalarKey(key) : nullptr;
+}
+
+void TBReport::writeLogForYesterdayWithAppInfo(std::int32_t day, const AppInfoList* appInfo) {
+  logMessage(LogLevel::Info, "writing aggregated log. yesterday=%d", day);
+  readHistory(day);
+  serializeWithDateAndAppInfo(day, appInfo);
+}
+
+void TBReport::readHistory(std::int32_t day) {
+  const std::unique_ptr<TBHistory> history = platform().tallybook().openHistory();
+  if (!history) {
+    return;
+  }
+  const std::int32_t firstDay = day == std::numeric_limits<std::int32_t>::min() ? day : day - 1;
+  history->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+      "", firstDay, day,
+      [this](std::string_view key, std::int32_t /*day*/, std::int64_t value, bool& /*stop*/) {
+        if (const PropertyDict* options = optionsForScalarKey(key)) {
+          addScalarForKeyWithOptions(value, key, *options);
+        }
+      });
+  history->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+      "", firstDay, day,
+      [this](std::string_view key, std::int32_t /*day*/, TBHistoryDistributionEnumerator& values,
+             bool& /*stop*/) {
+        if (const PropertyDict* options =
+                _config ? _config->configOptionsForDistributionKey(key) : nullptr) {
+          computeAndAddDistributionForKeyWithOptions(values, key, *options);
+        }
+      });
+}
+
+std::optional<std::int64_t> TBReport::addScalarForKeyWithOptions(std::int64_t value,
+                                                                 std::string_view key,
+                                                                 const PropertyDict& options) {
+  const std::optional<ScalarOptions> read = readScalarOptions(options);
+  if (!read) {
+    return std::nullopt;
+  }
+  const std::int64_t rounded = roundScalar(value, *read);
+  _scalarsOutput.set(key, rounded);
+  return rounded;
+}
+
+void TBReport::addScalarForKeyByExecutingBlock(std::string_view key,
+                                               const ScalarProducer& producer) {
+  if (const PropertyDict* options = optionsForScalarKey(key)) {
+    addScalarForKeyWithOptions(producer(), key, *options);
+  }
+}
+
+void TBReport::computeAndAddDistributionForKeyWithOptions(TBHistoryDistributionEnumerator& values,
+                                                          std::string_view key,
+                                                          const PropertyDict& options) {
+  const std::optional<DistributionOptions> read = readDistributionOptions(options);
+  if (!read) {
+    return;
+  }
+  std::optional<HistogramCounters> histogram;
+  if (read->intervals != nullptr) {
+    histogram = allocateCounters(*read->intervals, key);
+  }
+  RunningStatistics statistics;
+  double value = 0.0;
+  if (histogram) {
+    while (values.getNextValueSecondsInDayOffset(value, nullptr)) {
+      ++histogram->counts[histogram->boundaries.bucketFor(value)];
+      statistics.add(value);
+    }
+    if (std::optional<PropertyDict> dict =
+            histogramDictForIntervalsWithHistCounts(*read->intervals, histogram->counts)) {
+      _histogramsOutput.set(key, *std::move(dict));
+    } else {
+      _histogramsOutput.remove(key);
+    }
+  } else {
+    while (values.getNextValueSecondsInDayOffset(value, nullptr)) {
+      statistics.add(value);
+    }
+  }
+  _distributionsOutput.set(key, statistics.stats());
+}
+
+}  // namespace vesprun

@@ -1,0 +1,94 @@
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <memory>
+#include <optional>
+#include <string_view>
+
+#include "common/AppInfoList.h"
+#include "common/PropertyDict.h"
+#include "config/TBConfig.h"
+#include "platform/Tallybook.h"
+
+namespace vesprun {
+
+/// One day's aggregated log: collects the whitelisted counters, adds its own sources, and submits
+/// the document. Made for one run and used once. Without a whitelist it stays empty and submits
+/// nothing.
+///
+/// A later value for a key replaces the earlier one. Nothing here fails: what a service does not
+/// answer is left out or stands in the log as the failure value that is stated below.
+class TBReport {
+ public:
+  using ScalarProducer = std::function<std::int64_t()>;
+
+  /// Reads the whitelist.
+  TBReport();
+
+  /// Reads the history of day `day` and the day before it, then `serializeWithDateAndAppInfo`.
+  /// `appInfo` may be null. (No day comes before the lowest number; it is then read alone.)
+  void writeLogForYesterdayWithAppInfo(std::int32_t day, const AppInfoList* appInfo);
+
+  /// Unless scalars, distributions and histograms are all empty: runs the sources, builds the
+  /// document of `day`, and submits it as log "log-aggregated" of type "193". The header names the
+  /// previous OS version on the first log after it changed. The outputs are moved into the
+  /// document.
+  void serializeWithDateAndAppInfo(std::int32_t day, const AppInfoList* appInfo);
+
+  /// Stores `value`, rounded as the options ask (`roundScalar`), and returns what was stored.
+  /// Nothing is stored or returned when the options cannot be read.
+  std::optional<std::int64_t> addScalarForKeyWithOptions(std::int64_t value, std::string_view key,
+                                                         const PropertyDict& options);
+
+  /// Runs the producer and adds what it yields, only when the key is whitelisted.
+  void addScalarForKeyByExecutingBlock(std::string_view key, const ScalarProducer& producer);
+
+  /// Goes once through the values and stores their statistics and, when the options name
+  /// "intervals", their histogram; an empty histogram removes the key's earlier one. Memory is one
+  /// counter and one boundary for each bucket. When there is none to be had, a log line says so and
+  /// the statistics are stored alone. Nothing is stored when the options cannot be read.
+  void computeAndAddDistributionForKeyWithOptions(TBHistoryDistributionEnumerator& values,
+                                                  std::string_view key,
+                                                  const PropertyDict& options);
+
+  // The sources, in the order in which they run, each in a file of its own.
+
+  /// "com.quill.homeshell.numAllInstalledApps" and ".numThirdPartyApps", also offered as the event
+  /// "com.quill.homeshell.appInstalls". Nothing is counted when nobody asks.
+  void addInstalledAppInfo();
+
+  /// Language and region, whitelisted or not.
+  void addMetadataKeys();
+
+  /// "com.quill.logsmith.tlyd.database.size": MiB of the counter database, −1 when it cannot be
+  /// examined. "com.quill.logsmith.tlyd.database.corruptions": the count since the last report,
+  /// which restarts from 0; 0 when the functions that read and reset it cannot be resolved.
+  void reportDatabaseSize();
+
+  /// "com.quill.usage.cur_boot_session_cpu_uptime": minutes awake since boot, −1 when the kernel
+  /// does not tell its tick ratio.
+  void reportCPUUptime();
+
+  /// 28 memory statistics of the kernel; see docs/daily-log.md.
+  void reportVMStats();
+
+  const PropertyDict& scalarsOutput() const { return _scalarsOutput; }
+  const PropertyDict& distributionsOutput() const { return _distributionsOutput; }
+  const PropertyDict& histogramsOutput() const { return _histogramsOutput; }
+  const PropertyDict& metadataOutput() const { return _metadataOutput; }
+
+ private:
+  const PropertyDict* optionsForScalarKey(std::string_view key) const;
+  void readHistory(std::int32_t day);
+  PropertyDict buildDocument(std::int32_t day, const AppInfoList* appInfo);
+  void submit(const PropertyDict& document);
+
+  std::unique_ptr<TBConfig> _config;  ///< null without a whitelist, and after its digest was taken
+  PropertyDict _scalarsOutput;
+  PropertyDict _distributionsOutput;
+  PropertyDict _histogramsOutput;
+  PropertyDict _metadataOutput;
+};
+
+}  // namespace vesprun
