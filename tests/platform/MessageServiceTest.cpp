@@ -1,0 +1,321 @@
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <sys/socket.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <cmath>
+#include <thread>
+
+#include "platform/host/HostPtreeSerialization.h"
+#include "platform/host/MessageFraming.h"
+#include "platform/host/ServiceSocket.h"
+#include "platform/host/UnixMessageService.h"
+#include "support/TemporaryFolder.h"
+
+namespace vesprun {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::HasSubstr;
+using ::testing::IsEmpty;
+using ::testing::SizeIs;
+
+using SliceResult = MainLoop::SliceResult;
+
+constexpr const char* kName = "com.quill.aggregated.vesprun";
+constexpr const char* kSocket = "run/com.quill.aggregated.vesprun";
+constexpr double kQuiet = 0.02;
+
+class MessageList final : public SystemLog {
+ public:
+  bool keeps(LogLevel /*level*/) const override { return true; }
+  void write(LogLevel /*level*/, std::string_view message) override {
+    messages.emplace_back(message);
+  }
+
+  std::vector<std::string> messages;
+};
+
+std::string text(const std::string& content) {
+  return "<ptree version=\"1.0\"><string>" + content + "</string></ptree>";
+}
+
+std::string frame(const std::string& document) { return messageFrame(document).value(); }
+
+double secondsOf(const std::function<void()>& step) {
+  const auto start = std::chrono::steady_clock::now();
+  step();
+  return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
+}
+
+class MessageServiceTest : public ::testing::Test {
+ protected:
+  std::unique_ptr<ServiceListener> listen() {
+    std::unique_ptr<ServiceListener> listener = service.createListener(kName);
+    if (listener) {
+      listener->setPeerHandler([this](PeerConnection& peer) {
+        peer.setMessageHandler([this](const PropertyValue& message) {
+          received.push_back(message.string() != nullptr ? *message.string() : "?");
+        });
+        peer.start();
+      });
+      listener->start();
+    }
+    return listener;
+  }
+
+  FileDescriptor peer() {
+    FileDescriptor socket = connectToService(device, kName, 5, error);
+    EXPECT_TRUE(socket.isOpen()) << error;
+    return socket;
+  }
+
+  static void send(const FileDescriptor& socket, std::string_view bytes) {
+    EXPECT_EQ(::send(socket.get(), bytes.data(), bytes.size(), MSG_NOSIGNAL),
+              static_cast<ssize_t>(bytes.size()));
+  }
+
+  /// Whether the service has closed the connection.
+  static bool isEnded(const FileDescriptor& socket) {
+    char byte = 0;
+    return recv(socket.get(), &byte, 1, MSG_DONTWAIT) == 0 ||
+           (errno != EAGAIN && errno != EWOULDBLOCK);
+  }
+
+  int eventsUntilQuiet() {
+    int events = 0;
+    while (loop.runMainLoopSlice(kQuiet) == SliceResult::HandledEvent) {
+      ++events;
+    }
+    return events;
+  }
+
+  TemporaryFolder folder;
+  std::string error;
+  DeviceDirectory device = DeviceDirectory::open(folder.path(), error).value();
+  MessageList log;
+  HostPtreeSerialization serialization;
+  PollMainLoop loop;
+  UnixMessageService service{device, serialization, log, loop};
+  std::vector<std::string> received;
+};
+
+TEST_F(MessageServiceTest, DeliversOneMessageForEachSlice) {
+  const std::unique_ptr<ServiceListener> listener = listen();
+  const std::string longText(150'000, 'x');
+  {
+    const FileDescriptor hasty = peer();
+    send(hasty,
+         frame(text("a")) + frame("<ptree version=\"1.0\"><array/></ptree>") + frame(text("c")));
+  }  // gone before anything is read
+  EXPECT_EQ(loop.runMainLoopSlice(1), SliceResult::HandledEvent);
+  EXPECT_THAT(received, IsEmpty());  // the peer itself was the event
+  EXPECT_EQ(loop.runMainLoopSlice(1), SliceResult::HandledEvent);
+  EXPECT_THAT(received, ElementsAre("a"));
+  EXPECT_EQ(eventsUntilQuiet(), 2);
+  const FileDescriptor slow = peer();
+  for (const char byte : frame(text("d"))) {
+    send(slow, {&byte, 1});
+    loop.runMainLoopSlice(0);
+  }
+  send(slow, frame(text(longText)));
+  EXPECT_EQ(eventsUntilQuiet(), 1);
+  EXPECT_THAT(received, ElementsAre("a", "?", "c", "d", longText));
+  EXPECT_THAT(log.messages, IsEmpty());
+}
+
+TEST_F(MessageServiceTest, DropsOnlyThePeerThatSendsNoMessage) {
+  const std::unique_ptr<ServiceListener> listener = listen();
+  const struct {
+    std::string bytes;
+    const char* reason;
+  } kCases[] = {
+      {frame("garbage"), "line 1"},
+      {std::string(4, '\0'), "line 1"},
+      {std::string("\x01\x00\x00\x01", 4), "a message is longer than 16777216 bytes"},
+      {std::string("\xFF\xFF\xFF\xFF", 4) + text("x"), "a message is longer than 16777216 bytes"},
+      {frame(text("half")).substr(0, 30), "it ended in the middle of a message"},
+      {std::string("\x10\x00", 2), "it ended in the middle of a message"},
+      {frame(text("good")) + frame("<ptree version=\"1.0\"/>"), "line 1"},
+      {std::string("\x00\x00\x00\x01", 4), "it ended in the middle of a message"},  // 16 MiB
+      {"", nullptr},
+  };
+  const FileDescriptor staller = peer();
+  send(staller, frame(text("late")).substr(0, 20));
+  eventsUntilQuiet();
+  for (const auto& [bytes, reason] : kCases) {
+    SCOPED_TRACE(::testing::PrintToString(bytes));
+    log.messages.clear();
+    const FileDescriptor bad = peer();
+    if (!bytes.empty()) {
+      send(bad, bytes);
+    }
+    shutdown(bad.get(), SHUT_WR);
+    eventsUntilQuiet();
+    EXPECT_TRUE(isEnded(bad));
+    if (reason == nullptr) {
+      EXPECT_THAT(log.messages, IsEmpty());
+    } else {
+      EXPECT_THAT(log.messages, ElementsAre(HasSubstr(reason)));
+    }
+  }
+  EXPECT_THAT(received, ElementsAre("good"));
+  send(staller, std::string_view(frame(text("late"))).substr(20));
+  eventsUntilQuiet();
+  EXPECT_THAT(received, ElementsAre("good", "late"));
+}
+
+TEST_F(MessageServiceTest, BytesOfNoMessageDoNotProlongASlice) {
+  const std::unique_ptr<ServiceListener> listener = listen();
+  const FileDescriptor dribbler = peer();
+  ASSERT_EQ(loop.runMainLoopSlice(1), SliceResult::HandledEvent);
+  std::jthread dribble([&dribbler](const std::stop_token& stop) {
+    const std::string bytes = frame(std::string(1'000'000, ' '));
+    for (std::size_t i = 0; i < bytes.size() && !stop.stop_requested(); ++i) {
+      send(dribbler, std::string_view(bytes).substr(i, 1));
+      std::this_thread::sleep_for(std::chrono::milliseconds(5));
+    }
+  });
+  SliceResult result = SliceResult::HandledEvent;
+  const double seconds = secondsOf([&] { result = loop.runMainLoopSlice(0.1); });
+  EXPECT_EQ(result, SliceResult::TimedOut);
+  EXPECT_GE(seconds, 0.1);
+  EXPECT_LT(seconds, 2);
+  const FileDescriptor other = peer();
+  send(other, frame(text("served")));
+  eventsUntilQuiet();
+  EXPECT_THAT(received, ElementsAre("served"));
+}
+
+TEST_F(MessageServiceTest, PeersBeyondTheLimitWaitForRoom) {
+  const std::unique_ptr<ServiceListener> listener = listen();
+  std::vector<FileDescriptor> stallers;
+  for (int i = 0; i < 16; ++i) {
+    stallers.push_back(peer());
+    eventsUntilQuiet();
+  }
+  const FileDescriptor waiting = peer();
+  send(waiting, frame(text("in the end")));
+  EXPECT_EQ(eventsUntilQuiet(), 0);
+  stallers.pop_back();
+  EXPECT_EQ(eventsUntilQuiet(), 2);
+  EXPECT_THAT(received, ElementsAre("in the end"));
+}
+
+TEST_F(MessageServiceTest, TurnsAwayWhoIsNotStartedOrIsAnotherUser) {
+  std::unique_ptr<ServiceListener> listener = listen();
+  listener->setPeerHandler([](PeerConnection&) {});
+  const FileDescriptor unstarted = peer();
+  send(unstarted, frame(text("unheard")));
+  eventsUntilQuiet();
+  EXPECT_TRUE(isEnded(unstarted));
+  if (geteuid() != 0) {
+    GTEST_SKIP() << "only root can become another user";
+  }
+  listener.reset();
+  listener = listen();
+  for (const std::string& path : {folder.path(), folder.path("run"), folder.path(kSocket)}) {
+    ASSERT_EQ(chmod(path.c_str(), 0777), 0);
+  }
+  const pid_t child = fork();
+  if (child == 0) {
+    std::string reason;
+    const bool connected =
+        setuid(65534) == 0 && connectToService(device, kName, 5, reason).isOpen();
+    _exit(connected ? 0 : 1);
+  }
+  int status = -1;
+  ASSERT_EQ(waitpid(child, &status, 0), child);
+  EXPECT_EQ(status, 0);
+  EXPECT_EQ(eventsUntilQuiet(), 0);
+  EXPECT_THAT(log.messages, ElementsAre(HasSubstr("a peer of another user is turned away")));
+}
+
+TEST_F(MessageServiceTest, TheSocketFileIsItsOwnersAndGoesWithTheListener) {
+  std::unique_ptr<ServiceListener> listener = listen();
+  struct stat status {};
+  ASSERT_EQ(lstat(folder.path(kSocket).c_str(), &status), 0);
+  EXPECT_EQ(status.st_mode, mode_t{S_IFSOCK | 0600});
+  // A live one: the second holder gets nothing and takes nothing.
+  EXPECT_EQ(listen(), nullptr);
+  EXPECT_THAT(log.messages, ElementsAre(HasSubstr("another process offers the service")));
+  {
+    const FileDescriptor client = peer();
+    send(client, frame(text("still here")));
+    loop.runMainLoopSlice(1);  // the message that is being received dies with the listener
+  }
+  listener.reset();
+  EXPECT_EQ(eventsUntilQuiet(), 0);
+  EXPECT_THAT(received, IsEmpty());
+  EXPECT_THAT(folder.names("run"), IsEmpty());
+  EXPECT_FALSE(connectToService(device, kName, 1, error).isOpen());
+  EXPECT_EQ(error, folder.path(kSocket) + ": nobody offers the service");
+  // What took its name meanwhile is left alone, and a file that is no socket stands in the way.
+  listener = listen();
+  unlink(folder.path(kSocket).c_str());
+  folder.write(kSocket, "mine");
+  listener.reset();
+  EXPECT_EQ(folder.read(kSocket), "mine");
+  log.messages.clear();
+  EXPECT_EQ(listen(), nullptr);
+  EXPECT_THAT(log.messages, ElementsAre(folder.path(kSocket) + ": Address already in use"));
+}
+
+TEST_F(MessageServiceTest, TakesOverFromAKilledProcess) {
+  const pid_t child = fork();
+  if (child == 0) {
+    const std::unique_ptr<ServiceListener> listener = listen();
+    _exit(listener ? 0 : 1);  // nothing is cleaned up
+  }
+  int status = -1;
+  ASSERT_EQ(waitpid(child, &status, 0), child);
+  EXPECT_EQ(status, 0);
+  EXPECT_THAT(folder.names("run"), ElementsAre(kName));
+  const std::unique_ptr<ServiceListener> listener = listen();
+  ASSERT_NE(listener, nullptr);
+  const FileDescriptor client = peer();
+  send(client, frame(text("a")));
+  eventsUntilQuiet();
+  EXPECT_THAT(received, ElementsAre("a"));
+}
+
+TEST_F(MessageServiceTest, WorksUnderAPathThatIsTooLongForASocketAddress) {
+  const std::string deep(120, 'd');
+  folder.write(deep + "/device.json", "{}");
+  device = DeviceDirectory::open(folder.path(deep), error).value();
+  std::unique_ptr<ServiceListener> listener = listen();
+  ASSERT_NE(listener, nullptr);
+  const FileDescriptor client = peer();
+  send(client, frame(text("a")));
+  eventsUntilQuiet();
+  EXPECT_THAT(received, ElementsAre("a"));
+  listener.reset();
+  EXPECT_THAT(folder.names(deep + "/run"), IsEmpty());
+}
+
+TEST(PollMainLoop, DoesOnePieceOfWorkForEachSlice) {
+  PollMainLoop loop;
+  std::vector<int> done;
+  loop.queueWork([&] {
+    done.push_back(1);
+    loop.queueWork([&] { done.push_back(3); });
+  });
+  loop.queueWork([&] { done.push_back(2); });
+  for (const double seconds : {0.0, -1.0, std::nan("")}) {
+    EXPECT_EQ(loop.runMainLoopSlice(seconds), SliceResult::HandledEvent);
+  }
+  EXPECT_THAT(done, ElementsAre(1, 2, 3));
+  for (const double seconds : {0.0, -1.0, std::nan(""), 0.05}) {
+    SliceResult result = SliceResult::HandledEvent;
+    const double taken = secondsOf([&] { result = loop.runMainLoopSlice(seconds); });
+    EXPECT_EQ(result, SliceResult::TimedOut);
+    EXPECT_GE(taken, seconds > 0 ? seconds : 0);
+    EXPECT_LT(taken, 2);
+  }
+}
+
+}  // namespace
+}  // namespace vesprun
