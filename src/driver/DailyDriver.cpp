@@ -1,0 +1,76 @@
+#include "driver/DailyDriver.h"
+
+#include <cstdint>
+#include <exception>
+#include <memory>
+#include <string_view>
+
+#include "driver/ActiveAppInfoListener.h"
+#include "driver/DailyTasks.h"
+#include "platform/Platform.h"
+
+namespace vesprun {
+namespace {
+
+constexpr std::string_view kServiceName = "com.quill.aggregated.vesprun";
+
+void runOption(const char* argument) {
+  const std::int32_t today = platform().tallybook().TBDaysSince1970();
+  const std::string_view option = argument;
+  if (option == "-d") {
+    runDayCheck(nullptr);
+  } else if (option == "-f") {
+    runDailyTasks(dayBefore(today), nullptr);
+  } else if (option == "-t") {
+    runDailyTasks(today, nullptr);
+  } else {
+    logMessage(LogLevel::Default, "Unknown arg: %s", argument);
+  }
+}
+
+void runCommandLine(std::span<const char* const> commandLine) {
+  if (commandLine.size() == 1) {
+    runListenerMode();
+  } else if (commandLine.size() > 1) {
+    runOption(commandLine[1]);
+  }
+}
+
+/// The last guard of a job that must end well whatever happens, such as memory running out.
+template <typename Step>
+void runGuarded(Step step) noexcept {
+  try {
+    try {
+      step();
+    } catch (const std::exception& failure) {
+      logMessage(LogLevel::Error, "unexpected failure: %s", failure.what());
+    }
+  } catch (...) {  // not even the log can be written
+  }
+}
+
+}  // namespace
+
+void runListenerMode(double quietSeconds) {
+  const std::unique_ptr<ServiceListener> listener =
+      platform().messageService().createListener(kServiceName);
+  if (listener) {
+    listener->setPeerHandler(handleNewPeer);
+    listener->start();
+  }
+  MainLoop& mainLoop = platform().mainLoop();
+  while (mainLoop.runMainLoopSlice(quietSeconds) == MainLoop::SliceResult::HandledEvent) {
+  }
+  if (aaiRequested) {
+    logMessage(LogLevel::Default, "never received requested AAI, so moving along without it");
+    runDayCheck(nullptr);
+  }
+}
+
+void runDailyDriver(std::span<const char* const> commandLine) noexcept {
+  runGuarded([] { logMessage(LogLevel::Default, "vesprun started"); });
+  runGuarded([commandLine] { runCommandLine(commandLine); });
+  runGuarded([] { logMessage(LogLevel::Default, "vesprun ended"); });
+}
+
+}  // namespace vesprun

@@ -1,0 +1,168 @@
+#include "platform/host/HostPlatform.h"
+
+#include <mutex>
+#include <optional>
+#include <utility>
+
+#include "platform/host/HostClock.h"
+#include "platform/host/HostEventHub.h"
+#include "platform/host/HostFileSystem.h"
+#include "platform/host/HostInstalledApplications.h"
+#include "platform/host/HostKernel.h"
+#include "platform/host/HostLanguages.h"
+#include "platform/host/HostLogsmith.h"
+#include "platform/host/HostMessageDigest.h"
+#include "platform/host/HostNotificationCenter.h"
+#include "platform/host/HostOrrery.h"
+#include "platform/host/HostPreferences.h"
+#include "platform/host/HostPtreeSerialization.h"
+#include "platform/host/HostSupportLibrary.h"
+#include "platform/host/HostSystemLog.h"
+#include "platform/host/PollMainLoop.h"
+#include "platform/host/SqliteTallybook.h"
+#include "platform/host/UnixMessageService.h"
+#include "platform/host/WholeFile.h"
+
+namespace vesprun {
+namespace {
+
+/// A service that is made when it is first asked for, from whichever thread.
+template <typename Service>
+class Lazy {
+ public:
+  template <typename... Arguments>
+  Service& get(Arguments&&... arguments) {
+    std::call_once(_once, [&] { _service.emplace(std::forward<Arguments>(arguments)...); });
+    return *_service;
+  }
+
+ private:
+  std::once_flag _once;
+  std::optional<Service> _service;
+};
+
+}  // namespace
+
+// Destroyed from the last to the first: what writes at its end stands below what it needs for that.
+struct HostPlatform::Services {
+  Services(DeviceDirectory deviceDirectory, DeviceDescription deviceDescription)
+      : directory(std::move(deviceDirectory)),
+        description(std::move(deviceDescription)),
+        clock(description.clock),
+        systemLog(directory, clock, description.logLevel),
+        outbox(directory, clock, systemLog) {}
+
+  DeviceDirectory directory;
+  DeviceDescription description;
+  HostClock clock;
+  HostSystemLog systemLog;
+  Outbox outbox;
+  Lazy<HostPreferences> preferences;
+  Lazy<SqliteTallybook> tallybook;
+  Lazy<HostEventHub> eventHub;
+  Lazy<HostFileSystem> fileSystem;
+  Lazy<HostInstalledApplications> installedApplications;
+  Lazy<HostKernel> kernel;
+  Lazy<HostLanguages> languages;
+  Lazy<HostLogsmith> logsmith;
+  Lazy<HostMessageDigest> messageDigest;
+  Lazy<HostNotificationCenter> notificationCenter;
+  Lazy<HostOrrery> orrery;
+  Lazy<HostPtreeSerialization> ptreeSerialization;
+  Lazy<HostSupportLibrary> supportLibrary;
+  Lazy<PollMainLoop> mainLoop;
+  Lazy<UnixMessageService> messageService;
+};
+
+HostPlatform::HostPlatform(std::unique_ptr<Services> services) : _services(std::move(services)) {}
+
+HostPlatform::~HostPlatform() = default;
+
+std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, std::string& error) {
+  std::optional<DeviceDirectory> directory = DeviceDirectory::open(path, error);
+  if (!directory) {
+    return nullptr;
+  }
+  DeviceDescription description;
+  const std::string file = directory->hostPath("device.json");
+  bool missing = false;
+  if (const std::optional<std::string> text = readWholeFile(file, error, &missing)) {
+    std::optional<DeviceDescription> read = readDeviceDescription(*text, error);
+    if (!read) {
+      error = file + ": " + error;
+      return nullptr;
+    }
+    description = *std::move(read);
+  } else if (!missing) {
+    return nullptr;
+  }
+  if (!useTimeZone(description.timeZone)) {
+    error = file + ": timeZone: unknown time zone \"" + *description.timeZone + '"';
+    return nullptr;
+  }
+  auto services = std::make_unique<Services>(*std::move(directory), std::move(description));
+  return std::unique_ptr<HostPlatform>(new HostPlatform(std::move(services)));
+}
+
+const DeviceDirectory& HostPlatform::directory() const { return _services->directory; }
+
+const DeviceDescription& HostPlatform::description() const { return _services->description; }
+
+Clock& HostPlatform::clock() { return _services->clock; }
+
+SystemLog& HostPlatform::systemLog() { return _services->systemLog; }
+
+SqliteTallybook& HostPlatform::counters() {
+  return _services->tallybook.get(directory(), clock(), preferences(), systemLog());
+}
+
+Tallybook& HostPlatform::tallybook() { return counters(); }
+
+EventHub& HostPlatform::eventHub() {
+  return _services->eventHub.get(description().events, _services->outbox);
+}
+
+FileSystem& HostPlatform::fileSystem() { return _services->fileSystem.get(directory()); }
+
+InstalledApplications& HostPlatform::installedApplications() {
+  return _services->installedApplications.get(description());
+}
+
+Kernel& HostPlatform::kernel() { return _services->kernel.get(description().kernel); }
+
+Languages& HostPlatform::languages() { return _services->languages.get(description().languages); }
+
+Logsmith& HostPlatform::logsmith() {
+  return _services->logsmith.get(description(), _services->outbox);
+}
+
+MainLoop& HostPlatform::mainLoop() { return _services->mainLoop.get(); }
+
+MessageDigest& HostPlatform::messageDigest() { return _services->messageDigest.get(); }
+
+MessageService& HostPlatform::messageService() {
+  return _services->messageService.get(directory(), ptreeSerialization(), systemLog(),
+                                       _services->mainLoop.get());
+}
+
+NotificationCenter& HostPlatform::notificationCenter() {
+  return _services->notificationCenter.get(_services->outbox);
+}
+
+Orrery& HostPlatform::orrery() {
+  return _services->orrery.get(description().properties, directory());
+}
+
+Preferences& HostPlatform::preferences() {
+  return _services->preferences.get(directory(), systemLog());
+}
+
+PtreeSerialization& HostPlatform::ptreeSerialization() {
+  return _services->ptreeSerialization.get();
+}
+
+SupportLibrary& HostPlatform::supportLibrary() {
+  return _services->supportLibrary.get(description().supportLibrary);
+}
+
+}  // namespace vesprun

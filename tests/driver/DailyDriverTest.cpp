@@ -1,0 +1,295 @@
+#include "driver/DailyDriver.h"
+
+#include <sys/socket.h>
+
+#include <limits>
+
+#include "common/TextForm.h"
+#include "driver/ActiveAppInfoListener.h"
+#include "driver/DailyTasks.h"
+#include "platform/host/MessageFraming.h"
+#include "platform/host/PollMainLoop.h"
+#include "platform/host/PtreeWriter.h"
+#include "platform/host/ServiceSocket.h"
+#include "support/TestDevice.h"
+
+namespace vesprun {
+namespace {
+
+using ::testing::ElementsAreArray;
+using ::testing::IsEmpty;
+using ::testing::SizeIs;
+
+constexpr const char* kService = "com.quill.aggregated.vesprun";
+constexpr const char* kStoredDayKey = "LastCrashLogSerializationDateInDaysSince1970";
+constexpr std::int32_t kYesterday = TestDevice::kToday - 1;
+constexpr double kQuiet = 0.05;
+
+// No report is built: what stands in the log is the driver's alone.
+constexpr std::string_view kNoSubmission =
+    R"({"clock": "2024-03-05T09:15:02Z", "submission": {"enabled": false}})";
+
+const std::string kStarted = "default: vesprun started";
+const std::string kEnded = "default: vesprun ended";
+const std::string kUnchanged = "default: Day unchanged since last run";
+const std::string kNotified = "default: notified of logging status, waiting for activate app info";
+const std::string kNeverReceived =
+    "default: never received requested AAI, so moving along without it";
+const std::string kTasks = "default: daily tasks for day ";
+const std::string kYesterdaysTasks = "default: daily tasks for day 19786";
+const std::string kRequested = "default: vesprun got requestedAAI:\n";
+const std::string kUnsolicited = "default: vesprun got (unsolicited -- so ignoring) AAI:\n";
+
+PropertyDict operation(std::int64_t number) { return {{"operation", number}}; }
+
+PropertyDict activeApps(PropertyArray apps) {
+  return {{"operation", 2}, {"app_data", std::move(apps)}};
+}
+
+PropertyDict sampleApp() {
+  Bytes uuid;
+  for (std::uint8_t i = 0; i < 16; ++i) {
+    uuid.push_back(static_cast<std::uint8_t>(i * 0x11));
+  }
+  return {{"bundle_id", "com.example.a"},
+          {"version", "1.2"},
+          {"adam_id", std::int64_t{1} << 40},
+          {"arch", -2},
+          {"uuid", uuid}};
+}
+
+const std::string kSampleText =
+    "({bundle = com.example.a; version = 1.2; adamID = 1099511627776; arch = -2; "
+    "uuid = 00112233-4455-6677-8899-AABBCCDDEEFF})";
+
+class DailyDriverTest : public ::testing::Test {
+ protected:
+  DailyDriverTest() { startActiveAppInfoAfresh(); }
+  ~DailyDriverTest() override { startActiveAppInfoAfresh(); }
+
+  static std::optional<PropertyValue> storedDay(TestDevice& device) {
+    return device.platform().preferences().LGSPreferencesGetValue(kStoredDayKey, kService);
+  }
+
+  /// The listener mode while one peer sends these messages at once.
+  static void runWithMessages(TestDevice& device, const std::vector<PropertyValue>& messages) {
+    FileDescriptor peer;
+    auto& loop = dynamic_cast<PollMainLoop&>(device.platform().mainLoop());
+    loop.queueWork([&] {
+      std::string error;
+      peer = connectToService(device.platform().directory(), kService, 5, error);
+      std::string bytes;
+      for (const PropertyValue& message : messages) {
+        std::string document;
+        EXPECT_TRUE(writePtree(message, document, error)) << error;
+        bytes += messageFrame(document).value();
+      }
+      EXPECT_EQ(send(peer.get(), bytes.data(), bytes.size(), MSG_NOSIGNAL),
+                static_cast<ssize_t>(bytes.size()));
+    });
+    runListenerMode(kQuiet);
+  }
+};
+
+TEST_F(DailyDriverTest, OnlyTheFirstArgumentCounts) {
+  const struct {
+    std::vector<const char*> commandLine;
+    std::int64_t storedBefore;
+    std::vector<std::string> between;
+    std::int64_t storedAfter;
+  } kCases[] = {
+      {{}, 5, {}, 5},
+      {{"vesprun", "-d"}, 5, {kYesterdaysTasks}, kYesterday},
+      {{"vesprun", "-d", "-f"}, kYesterday, {kUnchanged}, kYesterday},
+      {{"vesprun", "-f", "-d"}, 5, {kYesterdaysTasks}, 5},
+      {{"vesprun", "-f"}, kYesterday, {kYesterdaysTasks}, kYesterday},
+      {{"vesprun", "-t"}, 5, {kTasks + "19787"}, 5},
+      {{"vesprun", "-x", "-d"}, 5, {"default: Unknown arg: -x"}, 5},
+      {{"vesprun", "-D"}, 5, {"default: Unknown arg: -D"}, 5},
+      {{"vesprun", "-d "}, 5, {"default: Unknown arg: -d "}, 5},
+      {{"vesprun", ""}, 5, {"default: Unknown arg: "}, 5},
+      {{"vesprun", "%s%n"}, 5, {"default: Unknown arg: %s%n"}, 5},
+  };
+  for (const auto& [commandLine, before, between, after] : kCases) {
+    SCOPED_TRACE(::testing::PrintToString(commandLine));
+    TestDevice device(kNoSubmission);
+    device.platform().preferences().LGSPreferencesSetValue(kStoredDayKey, before, kService);
+    runDailyDriver(commandLine);
+    std::vector<std::string> expected{kStarted};
+    expected.insert(expected.end(), between.begin(), between.end());
+    expected.push_back(kEnded);
+    EXPECT_THAT(device.log(), ElementsAreArray(expected));
+    EXPECT_EQ(storedDay(device), PropertyValue(after));
+    EXPECT_THAT(device.list("run"), IsEmpty());
+  }
+}
+
+TEST_F(DailyDriverTest, TheDayCheckRunsTheTasksOncePerDay) {
+  const struct {
+    std::optional<PropertyValue> stored;
+    bool runs;
+  } kCases[] = {
+      {std::nullopt, true},
+      {kYesterday - 1, true},
+      {kYesterday - 30, true},
+      {"no number", true},
+      {std::numeric_limits<std::int64_t>::min(), true},
+      {(std::int64_t{1} << 32) * -1 + kYesterday, true},
+      {kYesterday, false},
+      {kYesterday + 1, false},
+      {std::numeric_limits<std::int64_t>::max(), false},
+  };
+  for (const auto& [stored, runs] : kCases) {
+    SCOPED_TRACE(stored ? textForm(*stored) : "absent");
+    TestDevice device(kNoSubmission);
+    device.platform().preferences().LGSPreferencesSetValue(kStoredDayKey, stored, kService);
+    runDayCheck(nullptr);
+    EXPECT_THAT(device.log(), ElementsAreArray({runs ? kYesterdaysTasks : kUnchanged}));
+    EXPECT_EQ(storedDay(device), runs ? PropertyValue(kYesterday) : stored);
+    device.endProcess();
+    device.platform();
+    runDayCheck(nullptr);
+    EXPECT_EQ(device.log().back(), kUnchanged);
+  }
+  EXPECT_EQ(dayBefore(std::numeric_limits<std::int32_t>::min()),
+            std::numeric_limits<std::int32_t>::max());
+}
+
+TEST_F(DailyDriverTest, MessagesLeadToWhatTheirStateAllows) {
+  const PropertyDict apps = activeApps({sampleApp()});
+  const PropertyDict noApps = activeApps({});
+  const PropertyDict dailyTasks{{"operation", 1}, {"value", (std::int64_t{7} << 32) + 4242}};
+  const PropertyDict farOperation{{"operation", (std::int64_t{1} << 32) * -1}};
+  const struct {
+    const char* what;
+    std::vector<PropertyValue> messages;
+    std::vector<std::string> log;
+    std::size_t notifications;
+    bool stores;
+  } kCases[] = {
+      {"nothing", {}, {}, 0, false},
+      {"a session",
+       {operation(0), apps},
+       {kNotified, kRequested + kSampleText, kYesterdaysTasks},
+       1,
+       true},
+      {"no apps",
+       {operation(0), noApps},
+       {kNotified, kRequested + "()", kYesterdaysTasks},
+       1,
+       true},
+      {"apps too early",
+       {apps, operation(0)},
+       {kUnsolicited + kSampleText, kNotified, kNeverReceived, kYesterdaysTasks},
+       1,
+       true},
+      {"apps twice",
+       {operation(0), noApps, apps},
+       {kNotified, kRequested + "()", kYesterdaysTasks, kUnsolicited + kSampleText},
+       1,
+       true},
+      {"status twice",
+       {operation(0), operation(0)},
+       {kNotified, kNeverReceived, kYesterdaysTasks},
+       1,
+       true},
+      {"daily tasks after status",
+       {operation(0), dailyTasks, noApps},
+       {kNotified, kRequested + "()", kYesterdaysTasks},
+       1,
+       true},
+      {"daily tasks", {dailyTasks, operation(0)}, {kTasks + "4242"}, 0, false},
+      {"a missing day is 0", {operation(1)}, {kTasks + "0"}, 0, false},
+      {"an unknown operation uses the gate up", {operation(3), operation(0)}, {}, 0, false},
+      {"a missing operation is 0",
+       {PropertyDict{}},
+       {kNotified, kNeverReceived, kYesterdaysTasks},
+       1,
+       true},
+      {"the low 32 bits of the operation count",
+       {farOperation, PropertyDict{{"operation", (std::int64_t{1} << 40) + 2}}},
+       {kNotified, kRequested + "()", kYesterdaysTasks},
+       1,
+       true},
+      {"what is no dictionary leaves the gate open",
+       {"text", PropertyArray{operation(3)}, operation(0), noApps},
+       {kNotified, kRequested + "()", kYesterdaysTasks},
+       1,
+       true},
+  };
+  for (const auto& [what, messages, log, notifications, stores] : kCases) {
+    SCOPED_TRACE(what);
+    startActiveAppInfoAfresh();
+    TestDevice device(kNoSubmission);
+    runWithMessages(device, messages);
+    EXPECT_THAT(device.log(), ElementsAreArray(log));
+    const std::vector<PropertyDict> posted = device.lines("notifications.jsonl");
+    EXPECT_THAT(posted, SizeIs(notifications));
+    for (const PropertyDict& line : posted) {
+      EXPECT_EQ(*line.find("name"), PropertyValue("com.quill.aggregated.vesprun.logging"));
+    }
+    EXPECT_EQ(storedDay(device).has_value(), stores);
+    EXPECT_THAT(device.list("run"), IsEmpty());
+  }
+}
+
+TEST_F(DailyDriverTest, AServiceThatIsTakenChangesNothingElse) {
+  TestDevice device(kNoSubmission);
+  const std::unique_ptr<ServiceListener> other =
+      device.platform().messageService().createListener(kService);
+  ASSERT_NE(other, nullptr);
+  aaiRequested = true;
+  runListenerMode(kQuiet);
+  const std::vector<std::string> log = device.log();
+  ASSERT_THAT(log, SizeIs(3));
+  EXPECT_THAT(log[0], ::testing::StartsWith("error: "));
+  EXPECT_EQ(log[1], kNeverReceived);
+  EXPECT_EQ(log[2], kYesterdaysTasks);
+  EXPECT_TRUE(device.exists(std::string("run/") + kService));
+}
+
+TEST_F(DailyDriverTest, AppsKeepFiveEntriesWhateverIsMissing) {
+  PropertyDict odd = sampleApp();
+  odd.set("bundle_id", 7);
+  odd.set("adam_id", "8");
+  odd.set("arch", 2.9);
+  odd.set("uuid", Bytes(15, 1));
+  const PropertyValue apps(PropertyArray{sampleApp(), "no app", PropertyDict{}, odd});
+  const AppInfoList list = appInfoListFromData(&apps);
+  ASSERT_THAT(list, SizeIs(3));
+  EXPECT_EQ(textForm(PropertyArray{list[0]}), kSampleText);
+  EXPECT_EQ(textForm(list[1]), "{bundle = ; version = ; adamID = 0; arch = 0; uuid = }");
+  EXPECT_EQ(textForm(list[2]), "{bundle = ; version = 1.2; adamID = 0; arch = 2; uuid = }");
+  for (const char* key : {"adamID", "arch"}) {
+    EXPECT_EQ(list[2].dict()->find(key)->number()->kind(), NumberKind::Int64);
+  }
+  const PropertyValue noArray(PropertyDict{{"0", sampleApp()}});
+  EXPECT_THAT(appInfoListFromData(&noArray), IsEmpty());
+  EXPECT_THAT(appInfoListFromData(nullptr), IsEmpty());
+}
+
+TEST_F(DailyDriverTest, TheRequestedAppsReachTheDailyLog) {
+  const struct {
+    PropertyArray apps;
+    std::size_t count;
+  } kCases[] = {{{}, 0}, {{sampleApp(), sampleApp()}, 2}};
+  for (const auto& [apps, count] : kCases) {
+    startActiveAppInfoAfresh();
+    TestDevice device(R"({"clock": "2024-03-04T23:59:00Z"})");
+    device.writeWhitelist(
+        "<key>Group</key><dict><key>ScalarKeys</key>"
+        "<dict><key>a.b</key><dict/></dict></dict>");
+    device.platform().tallybook().TBClientSetValueForScalarKey("a.b", 5);
+    device.endProcess();
+    device.write("device.json", R"({"clock": "2024-03-05T09:15:02Z"})");
+    runWithMessages(device, {operation(0), activeApps(apps)});
+    const std::vector<PropertyDict> documents = device.documents();
+    ASSERT_THAT(documents, SizeIs(1));
+    const PropertyValue* info = documents[0].find("TBActivatedAppInfo");
+    ASSERT_TRUE(info != nullptr && info->array() != nullptr);
+    EXPECT_THAT(*info->array(), SizeIs(count));
+  }
+}
+
+}  // namespace
+}  // namespace vesprun

@@ -1,0 +1,149 @@
+#include "platform/host/HostPlatform.h"
+
+#include <sys/stat.h>
+
+#include <cerrno>
+#include <thread>
+
+#include "support/TestDevice.h"
+
+namespace vesprun {
+namespace {
+
+TEST(HostPlatform, SaysWhyADeviceCannotBeOpened) {
+  std::string error;
+  EXPECT_EQ(HostPlatform::open("/nowhere/at/all", error), nullptr);
+  EXPECT_EQ(error, "/nowhere/at/all: No such file or directory");
+  const TestDevice badZone(R"({"timeZone": "Moon/Crater"})");
+  EXPECT_EQ(HostPlatform::open(badZone.path(), error), nullptr);
+  EXPECT_THAT(error, testing::EndsWith("device.json: timeZone: unknown time zone \"Moon/Crater\""));
+  const TestDevice badEntry(R"({"usage": 1})");
+  EXPECT_EQ(HostPlatform::open(badEntry.path(), error), nullptr);
+  EXPECT_THAT(error, testing::EndsWith("device.json: usage: not a dictionary"));
+}
+
+TEST(HostPlatform, LocalTimesFollowTheDevicesZone) {
+  TestDevice device(R"({"timeZone": "Asia/Kolkata", "clock": "2024-03-05T20:15:02Z"})");
+  Clock& clock = device.platform().clock();
+  EXPECT_EQ(clock.localDateText(clock.now()), "2024-03-06 01:45:02 +0530");
+  EXPECT_EQ(device.platform().tallybook().TBDaysSince1970(), 19787);
+}
+
+TEST(HostPlatform, LogKeepsLevelsDownToTheDescribedOne) {
+  TestDevice device(R"({"logLevel": "notice", "clock": "2024-03-05T09:15:02.5Z"})");
+  device.platform();
+  logMessage(LogLevel::Error, "first %d", 1);
+  logMessage(LogLevel::Info, "dropped");
+  logMessage(LogLevel::Notice, "a \"quoted\"\nline %s", "\xC3\xA9");
+  EXPECT_EQ(device.read("outbox/log.jsonl"),
+            "{\"time\":\"2024-03-05T09:15:02.5Z\",\"level\":\"error\",\"message\":\"first 1\"}\n"
+            "{\"time\":\"2024-03-05T09:15:02.5Z\",\"level\":\"notice\","
+            "\"message\":\"a \\\"quoted\\\"\\nline \xC3\xA9\"}\n");
+  struct stat status {};
+  ASSERT_EQ(stat(device.path("outbox/log.jsonl").c_str(), &status), 0);
+  EXPECT_EQ(status.st_mode & 07777, 0600U);
+}
+
+TEST(HostKernel, ReadsOnlyVariablesOfTheAskedWidth) {
+  TestDevice device(R"({"kernel": {"variables": {
+      "narrow": {"u32": 258}, "wide": {"u64": 1}, "text": "abc", "bytes": {"data": "AQID"}}}})");
+  Kernel& kernel = device.platform().kernel();
+  const auto read = [&](const char* name, std::size_t width) {
+    std::vector<std::uint8_t> buffer(width, 0xEE);
+    std::size_t length = 0;
+    const int error = kernel.sysctlbyname(name, buffer, length);
+    buffer.resize(error == 0 ? length : 0);
+    return std::pair(error, buffer);
+  };
+  using Result = std::pair<int, std::vector<std::uint8_t>>;
+  EXPECT_EQ(read("narrow", 4), (Result{0, {2, 1, 0, 0}}));
+  EXPECT_EQ(read("narrow", 8), (Result{EINVAL, {}}));
+  EXPECT_EQ(read("wide", 4).first, EINVAL);
+  EXPECT_EQ(read("text", 100), (Result{0, {'a', 'b', 'c', 0}}));
+  EXPECT_EQ(read("text", 3).first, ENOMEM);
+  EXPECT_EQ(read("bytes", 3), (Result{0, {1, 2, 3}}));
+  EXPECT_EQ(read("absent", 4).first, ENOENT);
+  EXPECT_EQ(read("kern.bootsessionuuid", 100).second.size(), 37U);
+}
+
+TEST(HostLanguages, MatchesTheNearestLocalization) {
+  TestDevice device;
+  Languages& languages = device.platform().languages();
+  const std::vector<std::string> available{"en", "en-US", "pt-BR", "zh-Hans", "fr"};
+  using Tags = std::vector<std::string>;
+  EXPECT_EQ(languages.bestLocalizations(available, {"en-GB", "fr", "en"}), (Tags{"en", "fr"}));
+  EXPECT_EQ(languages.bestLocalizations(available, {"zh-Hans-CN", "pt-PT"}),
+            (Tags{"zh-Hans", "pt-BR"}));
+  EXPECT_EQ(languages.bestLocalizations(available, {"xx"}), Tags{});
+}
+
+TEST(EventHub, BuildsOnlyWhatIsTaken) {
+  TestDevice device(R"({"clock": "2024-03-05T09:15:02Z",
+                        "events": {"used": ["wanted", "broken"], "fails": ["broken"]}})");
+  EventHub& hub = device.platform().eventHub();
+  int built = 0;
+  const auto build = [&built] { return PropertyDict{{"n", ++built}, {"half", 0.5}, {"one", 1.0}}; };
+  EXPECT_TRUE(hub.EventHubSendEventLazy("wanted", build));
+  EXPECT_TRUE(hub.EventHubSendEventLazy("unwanted", build));
+  EXPECT_FALSE(hub.EventHubSendEventLazy("broken", build));
+  EXPECT_EQ(built, 1);
+  EXPECT_EQ(device.read("outbox/events.jsonl"),
+            "{\"time\":\"2024-03-05T09:15:02Z\",\"event\":\"wanted\","
+            "\"payload\":{\"n\":1,\"half\":0.5,\"one\":1.0}}\n");
+}
+
+TEST(Outbox, NumbersLogsUpwardsAndKeepsHeadersBesideThem) {
+  TestDevice device;
+  device.write("outbox/logs/0041-165-StorageStatus.log", "earlier");
+  device.write("outbox/logs/note.txt", "not a log");
+  Logsmith& logsmith = device.platform().logsmith();
+  const auto writer = [](LogFileHandle& file) { file.write("text"); };
+  const PropertyDict header{{"previous_os_version", "1"}};
+  EXPECT_TRUE(logsmith.LGSWriteLogForSubmission("193", "log-aggregated", &header, writer));
+  EXPECT_TRUE(logsmith.LGSWriteLogForSubmission("165", "StorageStatus", nullptr, writer));
+  EXPECT_EQ(device.list("outbox/logs"),
+            (std::vector<std::string>{
+                "0041-165-StorageStatus.log", "0042-193-log-aggregated.header.json",
+                "0042-193-log-aggregated.ptree", "0043-165-StorageStatus.log", "note.txt"}));
+  EXPECT_EQ(device.read("outbox/logs/0042-193-log-aggregated.header.json"),
+            "{\"previous_os_version\":\"1\"}\n");
+  EXPECT_EQ(device.read("outbox/logs/0043-165-StorageStatus.log"), "text");
+}
+
+TEST(Outbox, SubmissionsAtOnceNeverShareANumber) {
+  TestDevice device;
+  Logsmith& logsmith = device.platform().logsmith();
+  const auto submit = [&] {
+    for (int i = 0; i < 20; ++i) {
+      const PropertyDict header{{"n", i}};
+      EXPECT_TRUE(logsmith.LGSWriteLogForSubmission(
+          "193", "log-aggregated", &header,
+          [i](LogFileHandle& file) { file.write(std::to_string(i)); }));
+    }
+  };
+  std::thread other(submit);
+  submit();
+  other.join();
+  int logs = 0;
+  for (const std::string& name : device.list("outbox/logs")) {
+    if (name.ends_with(".ptree")) {
+      ++logs;
+      const std::string base = "outbox/logs/" + name.substr(0, name.size() - 6);
+      EXPECT_EQ(device.read(base + ".header.json"),
+                "{\"n\":" + device.read(base + ".ptree") + "}\n");
+    }
+  }
+  EXPECT_EQ(logs, 40);
+}
+
+TEST(Outbox, AFailedSubmissionLeavesNothing) {
+  TestDevice device;
+  device.platform();
+  device.write("outbox/logs", "a file in the way");
+  const auto writer = [](LogFileHandle& file) { file.write("text"); };
+  EXPECT_FALSE(platform().logsmith().LGSWriteLogForSubmission("165", "S", nullptr, writer));
+  EXPECT_THAT(device.log(), testing::ElementsAre(testing::StartsWith("error: ")));
+}
+
+}  // namespace
+}  // namespace vesprun

@@ -1,0 +1,119 @@
+#include "common/TextForm.h"
+#include "platform/host/CounterStore.h"
+#include "platform/host/SqliteTallybook.h"
+#include "report/TBReport.h"
+#include "support/TestDevice.h"
+
+namespace vesprun {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+
+constexpr const char* kDomain = "com.quill.aggregated.vesprun";
+constexpr std::int32_t kYesterday = TestDevice::kToday - 1;
+/// A device that whitelists "s" (two digits) and "d" (intervals 10) and has counted both.
+class DailyLogTest : public ::testing::Test {
+ protected:
+  void start(const char* fails) {
+    std::string description = R"({
+        "clock": "2024-03-05T09:15:02Z", "events": {"used": []}, "apps": [],
+        "system": {"osVersion": "Vesper 2"}, "submission": {"fails": ?},
+        "languages": {"preferred": ["en"], "localizations": ["en"], "country": "IE"}})";
+    device.emplace(description.replace(description.find('?'), 1, fails));
+    device->writeWhitelistJson(R"({"G": {"ScalarKeys": {"s": {"sig_fig": 2}},
+                                         "DistributionKeys": {"d": {"intervals": [10]}}}})");
+    preferences = &device->platform().preferences();
+  }
+  void count() {
+    std::string error;
+    const auto work = [](CounterStore& store) {
+      for (std::int32_t day = kYesterday - 2; day <= kYesterday + 1; ++day) {
+        store.setScalar(day, "s", 12345 + 2000 * (day - kYesterday));
+        store.setScalar(day, "unlisted", 1);
+        const Sample sample{2.5 * (kYesterday + 2 - day), 0};
+        store.appendSamples(day, "d", {&sample, 1});
+      }
+      return true;
+    };
+    ASSERT_TRUE(device->platform().counters().write(work, error)) << error;
+  }
+  static void write(const AppInfoList* appInfo = nullptr, std::int32_t day = kYesterday) {
+    TBReport().writeLogForYesterdayWithAppInfo(day, appInfo);
+  }
+  std::optional<PropertyValue> lastOSVersion() {
+    return preferences->LGSPreferencesGetValue("LastOSVersion", kDomain);
+  }
+
+  Preferences* preferences = nullptr;
+  std::optional<TestDevice> device;
+};
+
+TEST_F(DailyLogTest, HoldsItsEntriesInOrder) {
+  start("false");
+  count();
+  write();
+  ASSERT_EQ(device->documents().size(), 1U);
+  EXPECT_EQ(textForm(device->documents()[0]),
+            "{TBCrashLogVersion = 1; TBStartDate = 2024-03-04 00:00:00 +0000; "
+            "TBLogCreationDate = 2024-03-05 09:15:02 +0000; "
+            "TBMetadata = {TBUserInterfaceLanguage = en; TBPreferredUserInterfaceLanguage = en; "
+            "TBUserSetRegionFormat = IE}; TBScalars = {s = 12000}; "
+            "TBDistributions = {d = (5, 5, 5, 0, 1)}; "
+            "TBDistributionsHistogram = {d = {(-inf, 10] = 1}}; TBTasking = (); "
+            "TBTaskID = (no tasking id); TBTaskDigest = (no tasking digest); "
+            "TBWhitelistDigest = " +
+                TBConfig::init()->configFileDigest() + "}");
+  EXPECT_THAT(device->log(), ElementsAre("info: writing aggregated log. yesterday=19786"));
+
+  preferences->LGSPreferencesSetValue("TaskingID", "id", kDomain);
+  preferences->LGSPreferencesSetValue("TaskingDigest", Bytes{1}, kDomain);
+  preferences->LGSPreferencesSetValue("TaskingPayload", PropertyArray{PropertyDict{{"a", 1}}},
+                                      kDomain);
+  const AppInfoList apps{PropertyDict{{"bundle", "b"}}};
+  write(&apps);
+  const PropertyDict second = device->documents().back();
+  EXPECT_EQ(textForm(*second.find("TBTaskID")), "id");
+  EXPECT_EQ(textForm(*second.find("TBTaskDigest")), "<01>");
+  EXPECT_EQ(textForm(*second.find("TBTasking")), "({a = 1})");
+  EXPECT_EQ((second.end() - 1)->first, "TBActivatedAppInfo");
+  EXPECT_EQ((second.end() - 1)->second, PropertyValue(apps));
+}
+
+TEST_F(DailyLogTest, NamesAPreviousOSVersionOnceThereIsALog) {
+  start("false");
+  write();
+  EXPECT_THAT(device->list("outbox/logs"), IsEmpty());
+  EXPECT_EQ(lastOSVersion(), std::nullopt);
+  count();
+  write(nullptr, std::numeric_limits<std::int32_t>::min());
+  EXPECT_THAT(device->list("outbox/logs"), IsEmpty());
+  write();
+  write();
+  preferences->LGSPreferencesSetValue("LastOSVersion", "Vesper 1", kDomain);
+  write();
+  const std::string first = "outbox/logs/0001-193-log-aggregated";
+  const std::string third = "outbox/logs/0003-193-log-aggregated";
+  EXPECT_EQ(device->read(first + ".header.json"), "{\"previous_os_version\":\"<unknown>\"}\n");
+  EXPECT_EQ(device->read(third + ".header.json"), "{\"previous_os_version\":\"Vesper 1\"}\n");
+  EXPECT_EQ(device->list("outbox/logs").size(), 5U);
+  EXPECT_THAT(device->read("var/mobile/Library/Preferences/com.quill.aggregated.vesprun.ptree"),
+              ::testing::HasSubstr("Vesper 2"));
+}
+
+TEST_F(DailyLogTest, SurvivesARefusedSubmissionAndDocument) {
+  start("true");
+  count();
+  const AppInfoList unwritable{PropertyDict{{"bundle", "\x01"}}};
+  write(&unwritable);
+  EXPECT_THAT(device->log().back(),
+              ::testing::StartsWith("error: Could not create aggregated ptree: "));
+  EXPECT_EQ(lastOSVersion(), std::nullopt);
+  write();
+  EXPECT_EQ(device->log().back(), "error: Failed to write aggregated log");
+  EXPECT_EQ(lastOSVersion(), PropertyValue("Vesper 2"));
+  EXPECT_THAT(device->documents(), IsEmpty());
+}
+
+}  // namespace
+}  // namespace vesprun

@@ -1,0 +1,199 @@
+#include <algorithm>
+
+#include "common/TextForm.h"
+#include "report/TBReport.h"
+#include "support/TestDevice.h"
+
+namespace vesprun {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+
+/// A started device that whitelists every scalar, unrounded, or none.
+class SourceDevice : public TestDevice {
+ public:
+  explicit SourceDevice(const std::string& entries, bool allKeys = true)
+      : TestDevice(R"({"clock": "2024-03-05T09:15:02Z", )" + entries + "}") {
+    writeWhitelistJson(allKeys ? R"({"G": {"ScalarKeyPrefixes": {"": {}}}})" : "{}");
+    platform();
+  }
+};
+
+std::string scalarsOf(void (TBReport::*source)()) {
+  TBReport report;
+  (report.*source)();
+  return textForm(report.scalarsOutput());
+}
+
+TEST(InstalledAppInfo, CountsForTheLogAndForTheEvent) {
+  const std::string apps =
+      R"("apps": [{"bundle": "a", "user": true}, {"bundle": "b", "user": false},
+                                       {"bundle": "c", "user": true}])";
+  {
+    SourceDevice device(apps + R"(, "events": {"used": []})");
+    EXPECT_EQ(scalarsOf(&TBReport::addInstalledAppInfo),
+              "{com.quill.homeshell.numAllInstalledApps = 3; "
+              "com.quill.homeshell.numThirdPartyApps = 2}");
+    EXPECT_THAT(device.lines("events.jsonl"), IsEmpty());
+  }
+  SourceDevice device(apps, false);
+  EXPECT_EQ(scalarsOf(&TBReport::addInstalledAppInfo), "{}");
+  EXPECT_EQ(device.read("outbox/events.jsonl"),
+            R"({"time":"2024-03-05T09:15:02Z","event":"com.quill.homeshell.appInstalls",)"
+            R"("payload":{"numThirdPartyApps":2,"numAllApps":3}})"
+            "\n");
+}
+
+TEST(Metadata, NamesLanguagesAndRegion) {
+  const std::pair<const char*, const char*> kCases[] = {
+      {R"({"preferred": ["en-GB", "fr"], "localizations": ["fr", "en"], "country": "GB"})",
+       "{TBUserInterfaceLanguage = en; TBPreferredUserInterfaceLanguage = en-GB; "
+       "TBUserSetRegionFormat = GB}"},
+      {R"({"preferred": ["xx"], "localizations": ["en"], "country": null})",
+       "{TBUserInterfaceLanguage = <unknown>; TBPreferredUserInterfaceLanguage = xx}"},
+      {R"({"preferred": [], "localizations": ["en"], "country": null})",
+       "{TBUserInterfaceLanguage = <unknown>; TBPreferredUserInterfaceLanguage = <unknown>}"},
+  };
+  for (const auto& [languages, expected] : kCases) {
+    SourceDevice device(std::string("\"languages\": ") + languages);
+    TBReport report;
+    report.addMetadataKeys();
+    EXPECT_EQ(textForm(report.metadataOutput()), expected);
+  }
+}
+
+TEST(DatabaseStatistics, TakeTheCorruptionCountOnce) {
+  const auto expected = [](int mebibytes, int count) {
+    return "{com.quill.logsmith.tlyd.database.size = " + std::to_string(mebibytes) +
+           "; com.quill.logsmith.tlyd.database.corruptions = " + std::to_string(count) + "}";
+  };
+  const std::pair<const char*, std::vector<std::string>> kCases[] = {
+      {"{}", {}},
+      {R"({"available": false})",
+       {"error: Failed to dynamically load the FaultlineSupport framework"}},
+      {R"({"missing": ["LGSPreferencesGetIntegerValue", "LGSPreferencesSetValue"]})",
+       {"error: Failed to dyanmically link LGSPreferencesGetIntegerValue",
+        "error: Failed to dynamically link LGSPreferencesSetValue"}}};
+  for (const auto& [library, log] : kCases) {
+    SourceDevice device(std::string("\"supportLibrary\": ") + library);
+    const auto count = [&] {
+      return device.platform().preferences().LGSPreferencesGetIntegerValue(
+          "DatabaseCorruptionCount", "com.quill.aggregated");
+    };
+    device.platform().preferences().LGSPreferencesSetValue("DatabaseCorruptionCount", 3,
+                                                           "com.quill.aggregated");
+    EXPECT_EQ(scalarsOf(&TBReport::reportDatabaseSize), expected(-1, log.empty() ? 3 : 0));
+    EXPECT_EQ(count(), log.empty() ? 0 : 3);
+    EXPECT_EQ(device.log(), log);
+    device.write("var/mobile/Library/Tallybook/TBDataStore.sqlitedb", std::string(3 << 20, 'x'));
+    EXPECT_EQ(scalarsOf(&TBReport::reportDatabaseSize), expected(3, 0));
+    EXPECT_EQ(device.log().size(), 2 * log.size());
+  }
+}
+
+TEST(CpuUptime, IsInMinutesAwake) {
+  const std::pair<const char*, const char*> kCases[] = {
+      {R"({"value": 600000000000, "numerator": 1, "denominator": 1})", "10"},
+      {R"({"value": 1439999999999, "numerator": 125, "denominator": 3})", "999"},
+      {R"({"value": 18446744073709551615, "numerator": 4294967295, "denominator": 1})",
+       "1320469374930293248"},
+      {R"({"value": 5, "numerator": 1, "denominator": 0})", "-1"},
+      {"null", "-1"}};
+  for (const auto& [ticks, expected] : kCases) {
+    SourceDevice device(std::string(R"("kernel": {"ticks": )") + ticks + "}");
+    EXPECT_EQ(scalarsOf(&TBReport::reportCPUUptime),
+              "{com.quill.usage.cur_boot_session_cpu_uptime = " + std::string(expected) + "}");
+    EXPECT_EQ(device.log().size(), std::string(expected) == "-1" ? 1U : 0U);
+  }
+}
+
+/// The rows of memory statistics with these kernel variables, keys without "com.quill.".
+std::vector<std::string> memoryStatistics(const std::string& variables) {
+  SourceDevice device(R"("kernel": {"pageSize": 16384, "variables": {)" + variables + "}}");
+  TBReport report;
+  report.reportVMStats();
+  std::vector<std::string> rows;
+  for (const auto& [key, value] : report.scalarsOutput()) {
+    rows.push_back(key.substr(std::string_view("com.quill.").size()) + ' ' + textForm(value));
+  }
+  return rows;
+}
+
+TEST(KernelMemoryStatistics, StandInTheLogOnceTheirGatesHold) {
+  const std::string swap = R"("vm.swapusage": {"u32": 1})";
+  const std::vector<std::string> always = memoryStatistics(swap);
+  EXPECT_THAT(always,
+              ElementsAre("kernel.memorystatus_freeze_count 4294967295",
+                          "kernel.memorystatus_freeze_budget_pages_remaining -1",
+                          "kernel.memorystatus_thaw_count 4294967295", "kernel.swapusage -1",
+                          "memorystatus_freezer_thaw_percentage -1"));
+  const std::string refreezes = R"("kern.memorystatus_freezer_refreeze_count": {"u64": )";
+  const std::string pageouts = R"("kern.memorystatus_freeze_pageouts": {"u64": )";
+  const std::pair<std::string, std::string> kCases[] = {
+      {R"("vm.vmtc_total": {"u32": 0})", ""},
+      {R"("vm.vmtc_total": {"u64": 1})", ""},
+      {refreezes + "9}", ""},
+      {refreezes + "18446744073709551615}", ""},
+      {refreezes + "10}", "memorystatus_freezer_refreeze_average 1844674407370955161 "},
+      {pageouts + "65535}", "kernel.memorystatus_freeze_pageouts 65535 "},
+      {pageouts + "65536}",
+       "kernel.memorystatus_freeze_pageouts 65536 "
+       "memorystatus_freezer_thaws_per_gb 9223372036854775807 "},
+      {R"("kern.memorystatus_freezer_below_threshold_count": {"u64": 0},
+          "kern.memorystatus_freezer_skipped_full_count": {"u64": 0})",
+       "memorystatus_freezer_skipped_full_count 0 "}};
+  for (const auto& [variables, expected] : kCases) {
+    std::string added;
+    for (const std::string& row : memoryStatistics(swap + ", " + variables)) {
+      added += std::find(always.begin(), always.end(), row) == always.end() ? row + ' ' : "";
+    }
+    EXPECT_EQ(added, expected) << variables;
+  }
+}
+
+TEST(KernelMemoryStatistics, StandInTheirOrder) {
+  std::string variables =
+      R"("vm.swapusage": {"data": "AAAAAAEAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAA="},
+         "kern.memorystatus_thaw_count_since_boot": {"u64": 10},
+         "kern.memorystatus_freezer_below_threshold_count": {"u64": 0},
+         "kern.memorystatus_freezer_refreeze_count": {"u64": 10},
+         "kern.memorystatus_freezer_bytes_refrozen": {"u64": 129})";
+  std::vector<std::string> expected;
+  const auto add = [&](const std::string& variable, const char* width, std::uint64_t value,
+                       const std::string& row) {
+    variables += ", \"" + variable + "\": {\"" + width + "\": " + std::to_string(value) + "}";
+    expected.push_back(row);
+  };
+  std::uint64_t next = 100;
+  for (const std::string name :
+       {"total", "one_bit_flip", "not_found", "1_byte", "2_byte", "4_byte", "8_byte", "16_byte",
+        "32_byte", "64_byte", "128_byte", "256_byte", "undiagnosed"}) {
+    add("vm.vmtc_" + name, "u32", next, "kernel.vmtc_" + name + ' ' + std::to_string(next));
+    ++next;
+  }
+  const std::string kernel = "kern.memorystatus_";
+  add(kernel + "freeze_count", "u32", 4294967294, "kernel.memorystatus_freeze_count 4294967294");
+  add(kernel + "freeze_pageouts", "u64", 98304, "kernel.memorystatus_freeze_pageouts 98304");
+  expected.emplace_back("memorystatus_freezer_thaws_per_gb 6");
+  add(kernel + "freeze_budget_pages_remaining", "u64", 9223372036854775808U,
+      "kernel.memorystatus_freeze_budget_pages_remaining -9223372036854775808");
+  add(kernel + "thaw_count", "u32", 18, "kernel.memorystatus_thaw_count 18");
+  expected.emplace_back("kernel.swapusage 4294967296");
+  for (const std::string name : {"no_compressor_space", "no_swap_space", "below_min_pages",
+                                 "low_probability_of_use", "other"}) {
+    const std::string row = "freezer_error_" + name + "_count";
+    add(kernel + row, "u64", next, "memorystatus_" + row + ' ' + std::to_string(next / 3));
+    ++next;
+  }
+  add(kernel + "freezer_process_considered_count", "u64", 300,
+      "memorystatus_freezer_process_considered_count 300");
+  add(kernel + "freezer_skipped_full_count", "u64", 1,
+      "memorystatus_freezer_skipped_full_count 9223372036854775807");
+  add(kernel + "freezer_thaw_percentage", "u64", 55, "memorystatus_freezer_thaw_percentage 55");
+  expected.emplace_back("memorystatus_freezer_refreeze_average 12");
+  EXPECT_EQ(memoryStatistics(variables), expected);
+}
+
+}  // namespace
+}  // namespace vesprun

@@ -1,0 +1,62 @@
+#pragma once
+
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "common/PropertyDict.h"
+#include "platform/host/HostPlatform.h"
+
+namespace vesprun {
+
+/// A real device directory in a temporary folder, and its platform, which is installed from the
+/// first `start` on. The folder goes with it.
+class TestDevice {
+ public:
+  /// A device whose clock stands at 2024-03-05 09:15:02 UTC, day 19787, unless `description`, the
+  /// text of its device.json, says otherwise.
+  explicit TestDevice(std::string_view description = kDescription);
+  ~TestDevice();
+  TestDevice(const TestDevice&) = delete;
+  TestDevice& operator=(const TestDevice&) = delete;
+
+  static constexpr std::string_view kDescription =
+      R"({"clock": "2024-03-05T09:15:02Z", "timeZone": "UTC", "logLevel": "debug"})";
+  static constexpr std::int32_t kToday = 19787;
+
+  const std::string& path() const { return _path; }
+  std::string path(std::string_view devicePath) const;
+
+  void write(std::string_view devicePath, std::string_view content) const;
+  /// The content of a file; empty when there is none.
+  std::string read(std::string_view devicePath) const;
+  bool exists(std::string_view devicePath) const;
+  /// The names in a folder, in order.
+  std::vector<std::string> list(std::string_view devicePath) const;
+
+  /// Writes the whitelist; `groups` is the inside of its root dictionary.
+  void writeWhitelist(std::string_view groups) const;
+  /// Writes the whitelist given as a JSON object of groups.
+  void writeWhitelistJson(std::string_view groups) const;
+
+  /// The platform; made and installed when it is first asked for. Fails the test when it cannot be.
+  HostPlatform& platform();
+  /// Ends the process: what services hold back is written, what the process remembers is forgotten.
+  /// The next `platform()` is a new one.
+  void endProcess();
+
+  /// The lines of an outbox file as dictionaries.
+  std::vector<PropertyDict> lines(std::string_view file) const;
+  /// "level: message" of each line of the system log.
+  std::vector<std::string> log() const;
+  /// The submitted logs that are ptree documents, in order.
+  std::vector<PropertyDict> documents() const;
+
+ private:
+  std::string _path;
+  std::unique_ptr<HostPlatform> _platform;
+  std::unique_ptr<InstalledPlatform> _installed;
+};
+
+}  // namespace vesprun

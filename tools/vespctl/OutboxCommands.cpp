@@ -1,0 +1,172 @@
+#include <algorithm>
+#include <filesystem>
+#include <iostream>
+#include <sstream>
+
+#include "Command.h"
+#include "DailyLogView.h"
+#include "common/TextForm.h"
+#include "platform/host/JsonForm.h"
+#include "platform/host/PtreeReader.h"
+#include "platform/host/WholeFile.h"
+
+namespace vesprun {
+namespace {
+
+std::string entryText(const PropertyDict& line, const char* key) {
+  const PropertyValue* value = line.find(key);
+  return value != nullptr ? textForm(*value) : "";
+}
+
+/// One shown line for each line of the file; what cannot be read is said where it stands.
+template <typename Show>
+void showLines(const std::string& file, Show show) {
+  std::string error;
+  bool missing = false;
+  const std::optional<std::string> content = readWholeFile(file, error, &missing);
+  if (!content) {
+    if (!missing) {
+      throw CommandFailure(error);
+    }
+    return;
+  }
+  std::istringstream lines(*content);
+  int number = 0;
+  for (std::string line; std::getline(lines, line);) {
+    ++number;
+    const std::optional<PropertyValue> value = valueFromJsonText(line, error);
+    if (value && value->dict() != nullptr) {
+      show(*value->dict());
+    } else {
+      std::cout << "(line " << number << " cannot be read)\n";
+    }
+  }
+}
+
+void showEvents(const DeviceDirectory& directory, bool inFull) {
+  showLines(directory.hostPath("outbox/events.jsonl"), [inFull](const PropertyDict& event) {
+    const PropertyValue* payload = event.find("payload");
+    const PropertyDict* fields = payload != nullptr ? payload->dict() : nullptr;
+    std::cout << entryText(event, "time") << "  " << entryText(event, "event") << "  "
+              << (fields != nullptr ? fields->size() : 0) << " fields\n";
+    if (inFull && fields != nullptr) {
+      for (const auto& [key, value] : *fields) {
+        std::cout << "    " << key << " = " << textForm(value) << '\n';
+      }
+    }
+  });
+}
+
+void showRecords(const DeviceDirectory& directory) {
+  showLines(directory.hostPath("outbox/records.jsonl"), [](const PropertyDict& line) {
+    std::cout << entryText(line, "time") << "  type " << entryText(line, "type") << "  "
+              << entryText(line, "record") << '\n';
+  });
+}
+
+void showNotifications(const DeviceDirectory& directory) {
+  showLines(directory.hostPath("outbox/notifications.jsonl"), [](const PropertyDict& line) {
+    std::cout << entryText(line, "time") << "  " << entryText(line, "name") << '\n';
+  });
+}
+
+void showSystemLog(const DeviceDirectory& directory) {
+  showLines(directory.hostPath("outbox/log.jsonl"), [](const PropertyDict& line) {
+    std::cout << entryText(line, "time") << "  " << entryText(line, "level") << "  "
+              << entryText(line, "message") << '\n';
+  });
+}
+
+void showLog(const std::filesystem::path& file) {
+  std::cout << file.filename().string() << '\n';
+  std::string error;
+  const std::optional<std::string> content = readWholeFile(file, error);
+  if (!content) {
+    throw CommandFailure(error);
+  }
+  const std::filesystem::path header =
+      std::filesystem::path(file).replace_extension(".header.json");
+  std::string headerError;
+  if (const std::optional<std::string> text = readWholeFile(header, headerError)) {
+    const std::optional<PropertyValue> value = valueFromJsonText(*text, headerError);
+    std::cout << "  header     " << (value ? textForm(*value) : headerError) << '\n';
+  }
+  if (file.extension() != ".ptree") {
+    std::cout << *content;
+    return;
+  }
+  const std::optional<PropertyValue> log = readPtree(*content, error);
+  if (log && log->dict() != nullptr) {
+    showDailyLog(std::cout, *log->dict());
+  } else {
+    std::cout << "  cannot be read: " << (log ? "not a dictionary" : error) << '\n';
+  }
+}
+
+void showLogs(const DeviceDirectory& directory) {
+  std::vector<std::filesystem::path> files;
+  std::error_code error;
+  for (std::filesystem::directory_iterator entry(directory.hostPath("outbox/logs"), error), end;
+       !error && entry != end; entry.increment(error)) {
+    const std::filesystem::path extension = entry->path().extension();
+    if (entry->path().filename().string().front() != '.' &&
+        (extension == ".ptree" || extension == ".log")) {
+      files.push_back(entry->path());
+    }
+  }
+  std::sort(files.begin(), files.end());
+  for (const std::filesystem::path& file : files) {
+    showLog(file);
+  }
+}
+
+void showTitle(const char* title) { std::cout << "\n== " << title << '\n'; }
+
+void showAll(const DeviceDirectory& directory) {
+  showTitle("system log");
+  showSystemLog(directory);
+  showTitle("notifications");
+  showNotifications(directory);
+  showTitle("events");
+  showEvents(directory, false);
+  showTitle("structured records");
+  showRecords(directory);
+  showTitle("submitted logs");
+  showLogs(directory);
+}
+
+}  // namespace
+
+void addOutboxCommands(CLI::App& vespctl) {
+  const auto path = std::make_shared<std::string>();
+  const auto directory = [path] {
+    std::string error;
+    std::optional<DeviceDirectory> opened = DeviceDirectory::open(*path, error);
+    if (!opened) {
+      throw CommandFailure(error);
+    }
+    return *std::move(opened);
+  };
+
+  CLI::App* show = vespctl.add_subcommand("show", "Shows what the runs left in the outbox");
+  show->add_option("DIR", *path, "The device directory")->required();
+  show->require_subcommand(0, 1);
+  show->callback([show, directory] {
+    if (show->get_subcommands().empty()) {
+      showAll(directory());
+    }
+  });
+  const auto addPart = [&](const char* name, const char* description, auto showPart) {
+    show->add_subcommand(name, description)->callback([directory, showPart] {
+      showPart(directory());
+    });
+  };
+  addPart("logs", "The submitted logs alone", showLogs);
+  addPart("events", "The analytics events alone, with their payloads",
+          [](const DeviceDirectory& device) { showEvents(device, true); });
+  addPart("records", "The structured records alone", showRecords);
+  addPart("notifications", "The posted notifications alone", showNotifications);
+  addPart("log", "The system log alone", showSystemLog);
+}
+
+}  // namespace vesprun
