@@ -2,7 +2,8 @@
 add_library(vesprun_options INTERFACE)
 target_compile_options(vesprun_options INTERFACE
   -Wall -Wextra -Wpedantic -Wshadow -Wconversion -Wsign-conversion -Wold-style-cast -Wcast-qual
-  -Wnon-virtual-dtor -Woverloaded-virtual -Wformat=2 -Wimplicit-fallthrough -Wundef -Werror)
+  -Wnon-virtual-dtor -Woverloaded-virtual -Wformat=2 -Wimplicit-fallthrough -Wundef -Werror
+  -ffp-contract=off)  # statistics are the same to the last bit on every processor
 
 if(VESPRUN_SANITIZERS)
   target_compile_options(vesprun_options INTERFACE
