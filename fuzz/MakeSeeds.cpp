@@ -1,0 +1,166 @@
+// Makes the inputs that the fuzz targets start from: MakeSeeds FOLDER writes FOLDER/TARGET/NAME.
+#include <cstdio>
+#include <filesystem>
+#include <fstream>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "NANDInfo/parsers/MSPRecord.h"
+#include "NANDInfo/parsers/ORUMSPKeyTable.h"
+#include "NANDInfo/parsers/ORUStatKeyTable.h"
+#include "NANDInfo/parsers/VendorCounterParsers.h"
+#include "common/LittleEndian.h"
+#include "platform/host/StatisticsBufferBuilder.h"
+
+using namespace vesprun;
+
+namespace {
+
+struct Seed {
+  const char* name;
+  Bytes bytes;
+};
+
+Bytes bytesOf(std::string_view text) { return {text.begin(), text.end()}; }
+
+std::vector<Seed> statisticsSeeds() {
+  StatisticsBufferBuilder all;
+  for (const ORUStatKey& key : ORUStatKeyTable) {
+    all.add(key.id, std::vector<std::uint64_t>(key.count, key.id));
+  }
+  return {
+      {"everything", all.bytes()},
+      {"lengths", StatisticsBufferBuilder()
+                      .add(11, {1, 2})
+                      .add(113, {1})
+                      .add(113, {})
+                      .add(90, {1, 2})
+                      .bytes()},
+      {"summary", StatisticsBufferBuilder().add(53, {1}).add(265, {1, 2, 3, 4, 5}).bytes()},
+      {"unknown", StatisticsBufferBuilder().add(900, {1}).add(0x30000000, {1, 2}).bytes()},
+      {"invalid", StatisticsBufferBuilder().add(4, {1}).add(0x30000001, {}).add(7, {1}).bytes()},
+      {"no id", StatisticsBufferBuilder().add(65535, {}).add(4, {1}).add(65535, {1}).bytes()},
+      {"cut", StatisticsBufferBuilder().add(4, {1}).addHeader(7, 2).addWord(1).bytes()},
+  };
+}
+
+std::vector<Seed> mspSeeds() {
+  MSPBufferBuilder all;
+  for (const ORUMSPKey& key : ORUMSPKeyTable) {
+    all.add(key.key, std::vector<std::uint64_t>(key.count, key.key));
+  }
+  return {
+      {"everything", all.bytes()},
+      {"lengths", MSPBufferBuilder().add(4120, {1, 2}).add(12303, {1}).add(4096, {1, 2}).bytes()},
+      {"marks", MSPBufferBuilder()
+                    .add(4096, {1})
+                    .addHeader(MSPRecordHeader::kFiller, 3)
+                    .addBytes(3)
+                    .addHeader(MSPRecordHeader::kEndMarker, 0)
+                    .add(16385, {1, 2, 3, 4, 5})
+                    .addHeader(MSPRecordHeader::kEndMarker, 4)
+                    .bytes()},
+      {"cut", MSPBufferBuilder().add(4096, {1}).addHeader(4121, 16).addBytes(15).bytes()},
+  };
+}
+
+std::vector<Seed> counterSeeds() {
+  Bytes region;
+  for (std::size_t word = 0; word < kCounterRegionWords; ++word) {
+    appendLittleEndian(region, word, sizeof(std::uint32_t));
+  }
+  return {{"counting", std::move(region)}};
+}
+
+/// Puts together a snapshot of the kernel, item by item.
+class Snapshot {
+ public:
+  Snapshot& add(std::uint32_t type, std::uint64_t flags, const Bytes& data) {
+    appendLittleEndian(_bytes, type, 4);
+    appendLittleEndian(_bytes, data.size(), 4);
+    appendLittleEndian(_bytes, flags, 8);
+    _bytes.insert(_bytes.end(), data.begin(), data.end());
+    return *this;
+  }
+  Snapshot& begin(std::uint64_t identifier) { return add(19, identifier, Bytes(4)); }
+  Snapshot& end(std::uint64_t identifier) { return add(20, identifier, {}); }
+  Snapshot& name(std::string_view text) { return add(2313, 0, bytesOf(text)); }
+  Snapshot& statistics() { return add(2305, 0, Bytes(96, 1)); }
+  const Bytes& bytes() const { return _bytes; }
+
+ private:
+  Bytes _bytes;
+};
+
+std::vector<Seed> snapshotSeeds() {
+  return {
+      {"thread", Snapshot().begin(1).name("VM_swapout").statistics().end(1).bytes()},
+      {"nested", Snapshot()
+                     .add(0x30, 0, Bytes(8))
+                     .begin(1)
+                     .name("task")
+                     .begin(2)
+                     .name("other")
+                     .statistics()
+                     .end(2)
+                     .begin(3)
+                     .statistics()
+                     .name("VM_swapout")
+                     .end(3)
+                     .end(1)
+                     .add(0xF19158ED, 0, {})
+                     .bytes()},
+      {"nameless", Snapshot().begin(1).begin(2).end(2).name("VM_swapout").end(1).bytes()},
+  };
+}
+
+std::vector<Seed> ptreeSeeds() {
+  const auto in = [](const std::string& value) {
+    return bytesOf("<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<ptree version=\"1.0\">" + value +
+                   "</ptree>\n");
+  };
+  return {
+      {"everything",
+       in("<dict><key>s</key><string>a &lt; b &#x20AC;</string><key>n</key><array><integer>-5"
+          "</integer><integer>18446744073709551615</integer><real>0.1</real><real>-inf</real>"
+          "<true/><false/></array><key>d</key><data>AQID</data><key>t</key>"
+          "<date>2024-03-05T09:15:02.25Z</date><key>e</key><dict/></dict>")},
+      {"string", in("<string> \t </string>")},
+      {"nan", in("<real>nan</real>")},
+      {"repeated", in("<dict><key>a</key><true/><key>a</key><false/></dict>")},
+  };
+}
+
+bool write(const std::filesystem::path& folder, const std::vector<Seed>& seeds) {
+  std::filesystem::create_directories(folder);
+  for (const Seed& seed : seeds) {
+    std::ofstream file(folder / seed.name, std::ios::binary);
+    file.write(reinterpret_cast<const char*>(seed.bytes.data()),
+               static_cast<std::streamsize>(seed.bytes.size()));
+    file.close();
+    if (!file) {
+      std::fprintf(stderr, "MakeSeeds: %s cannot be written\n", (folder / seed.name).c_str());
+      return false;
+    }
+  }
+  return true;
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  if (argc != 2) {
+    std::fprintf(stderr, "usage: MakeSeeds FOLDER\n");
+    return 2;
+  }
+  const std::filesystem::path folder = argv[1];
+  const bool written = write(folder / "BaseStatisticsFuzzer", statisticsSeeds()) &&
+                       write(folder / "FTLStatisticsFuzzer", statisticsSeeds()) &&
+                       write(folder / "FTLStatKeysFuzzer", statisticsSeeds()) &&
+                       write(folder / "MSPStatisticsFuzzer", mspSeeds()) &&
+                       write(folder / "CounterLayoutsFuzzer", counterSeeds()) &&
+                       write(folder / "KernelSnapshotFuzzer", snapshotSeeds()) &&
+                       write(folder / "PtreeReaderFuzzer", ptreeSeeds());
+  return written ? 0 : 1;
+}

@@ -1,0 +1,18 @@
+#pragma once
+
+#include <string>
+
+namespace vesprun {
+
+/// Records the first error text of the process, formatted in the manner of printf and cut to 1023
+/// bytes. By convention it begins with the name of the operation that failed. Once a text has been
+/// recorded, even an empty one, further calls do nothing and do not look at their arguments.
+[[gnu::format(printf, 1, 2)]] void SetAPIErrorMessage(const char* format, ...);
+
+/// The recorded text, or "NA" when none has been recorded.
+std::string GetAPIErrorMessage();
+
+/// Makes the process as new: nothing recorded. For tests; the job itself never forgets.
+void forgetAPIErrorMessage();
+
+}  // namespace vesprun

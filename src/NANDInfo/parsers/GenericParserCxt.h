@@ -1,0 +1,132 @@
+#pragma once
+
+#include <algorithm>
+#include <concepts>
+#include <cstddef>
+#include <cstdint>
+#include <iterator>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "common/PropertyDict.h"
+
+namespace vesprun {
+
+/// What the parsers of statistics buffers fill: an ordered list of named unsigned 64-bit fields.
+/// Names may repeat; nothing is looked up while fields are appended.
+///
+/// All names lie one behind the other in one text, so that a field costs no allocation of its own.
+/// Running out of memory is the one failure that is not reported: std::bad_alloc ends the process.
+class GenericParserCxt {
+ public:
+  static constexpr std::size_t kMaxNameLength = 98;  ///< longer names are cut
+
+  struct Field {
+    std::string_view name;  ///< valid until the context is changed
+    std::uint64_t value;
+
+    /// The value in decimal.
+    std::string text() const { return std::to_string(value); }
+  };
+
+  /// Walks the fields in the order in which they were appended.
+  class const_iterator {
+   public:
+    using iterator_category = std::input_iterator_tag;
+    using value_type = Field;
+    using difference_type = std::ptrdiff_t;
+    using pointer = const Field*;
+    using reference = Field;
+
+    const_iterator(const GenericParserCxt& ctx, std::size_t index) : _ctx(&ctx), _index(index) {}
+    Field operator*() const { return (*_ctx)[_index]; }
+    const_iterator& operator++() {
+      ++_index;
+      return *this;
+    }
+    const_iterator operator++(int) {
+      const_iterator before = *this;
+      ++_index;
+      return before;
+    }
+    friend bool operator==(const const_iterator&, const const_iterator&) = default;
+
+   private:
+    const GenericParserCxt* _ctx;
+    std::size_t _index;
+  };
+
+  std::size_t size() const { return _entries.size(); }
+  bool empty() const { return _entries.empty(); }
+  /// The field at `index`, which is below `size()`.
+  Field operator[](std::size_t index) const {
+    const std::size_t begin = index == 0 ? 0 : _entries[index - 1].nameEnd;
+    const Entry& entry = _entries[index];
+    return {std::string_view(_names).substr(begin, entry.nameEnd - begin), entry.value};
+  }
+  const_iterator begin() const { return {*this, 0}; }
+  const_iterator end() const { return {*this, size()}; }
+
+  /// Appends a field; `name` is cut to `kMaxNameLength`.
+  void append(std::string_view name, std::uint64_t value) {
+    _names.append(name.substr(0, kMaxNameLength));
+    _entries.push_back({_names.size(), value});
+  }
+  /// Appends `count` fields, each named `name` and its index in decimal, from 0, cut together: the
+  /// little-endian values of `width` bytes, 1 to 8, that lie end to end at `source`.
+  void appendArray(std::string_view name, const std::uint8_t* source, std::size_t width,
+                   std::size_t count);
+  /// Empties the context and gives its memory back.
+  void release() { *this = GenericParserCxt(); }
+
+ private:
+  struct Entry {
+    std::size_t nameEnd;  ///< in `_names`; the name begins where the one before it ends
+    std::uint64_t value;
+  };
+
+  std::string _names;
+  std::vector<Entry> _entries;
+};
+
+/// Appends one field, named by `prefix` and then `suffix`, cut to 98 characters together. Always
+/// true.
+bool AddSingleValueToGenericContext(GenericParserCxt& ctx, std::string_view prefix,
+                                    std::string_view suffix, std::uint64_t value);
+
+/// The most elements that one call of `AddMultipleFieldsToGenericContext` takes.
+inline constexpr std::uint32_t kMaxFieldsOfOneCall = 65'535;
+
+/// Appends the `count` little-endian elements of `width` bytes each that lie end to end at
+/// `source`, which holds at least as many bytes; it need not be aligned. One element is named
+/// `name`; of several, each is named `name` and its index in decimal, from 0. Names are cut to 98
+/// characters.
+///
+/// True, and nothing is appended, when `width` or `count` is 0. False, and nothing is appended,
+/// when `width` is above 8, or `count` above `kMaxFieldsOfOneCall`: such an array is refused as a
+/// whole, for a part of it would pass for all of it.
+bool AddMultipleFieldsToGenericContext(GenericParserCxt& ctx, std::string_view name,
+                                       const std::uint8_t* source, std::uint32_t width,
+                                       std::uint32_t count);
+
+/// Empties the context, which can be filled again.
+void ReleaseGenericParserCxt(GenericParserCxt& ctx);
+
+/// A dictionary from field name to value, an unsigned 64-bit number, of the fields whose name
+/// `keeps` accepts. A repeated name keeps its first place and its last value.
+template <std::predicate<std::string_view> Filter>
+PropertyDict CreateDictFromCxt(const GenericParserCxt& ctx, const Filter& keeps) {
+  PropertyDict dict;
+  for (const GenericParserCxt::Field field : ctx) {
+    if (keeps(field.name)) {
+      dict.set(field.name, field.value);
+    }
+  }
+  return dict;
+}
+
+/// The same for all fields.
+PropertyDict CreateDictFromCxt(const GenericParserCxt& ctx);
+
+}  // namespace vesprun

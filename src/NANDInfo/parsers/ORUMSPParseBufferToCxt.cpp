@@ -1,0 +1,61 @@
+#include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"
+
+#include <algorithm>
+
+#include "NANDInfo/APIErrorMessage.h"
+#include "NANDInfo/parsers/MSPRecord.h"
+#include "NANDInfo/parsers/ORUMSPKeyTable.h"
+
+namespace vesprun {
+namespace {
+
+/// Adds the elements that both the payload and the statistic have. False when the context takes
+/// none of them.
+bool take(GenericParserCxt& ctx, const ORUMSPKey& key, std::span<const std::uint8_t> payload,
+          std::uint32_t& total) {
+  const auto size = static_cast<std::uint32_t>(payload.size());
+  if (size != key.size()) {
+    SetAPIErrorMessage(
+        "ORUMSPParseBufferToCxt: %s(%d): cfg %d elements; (%d*%d) cfg bytes != (%d) buffer bytes",
+        key.name.data(), key.key, key.count, key.count, static_cast<int>(key.width()),
+        static_cast<int>(size));
+  }
+  const std::uint32_t count = std::min<std::uint32_t>(size / key.width(), key.count);
+  if (!AddMultipleFieldsToGenericContext(ctx, key.name, payload.data(), key.width(), count)) {
+    SetAPIErrorMessage("ORUMSPParseBufferToCxt: %s(%d): Error adding %d elements to context",
+                       key.name.data(), key.key, key.count);
+    return false;
+  }
+  total += count;
+  return true;
+}
+
+}  // namespace
+
+std::uint32_t ORUMSPParseBufferToCxt(GenericParserCxt& ctx, std::span<const std::uint8_t> buffer) {
+  if (buffer.empty()) {
+    SetAPIErrorMessage("ORUMSPParseBufferToCxt: Passed in invalid buffer or empty buffer");
+    return 0;
+  }
+  std::uint32_t total = 0;
+  std::span<const std::uint8_t> rest = buffer;
+  while (rest.size() >= MSPRecordHeader::kSize) {
+    const auto header = MSPRecordHeader::decodeFrom(rest.first<MSPRecordHeader::kSize>());
+    rest = rest.subspan(MSPRecordHeader::kSize);
+    // Without payload, even the end marker ends nothing.
+    if (header.length == 0) {
+      continue;
+    }
+    if (header.key == MSPRecordHeader::kEndMarker || header.length > rest.size()) {
+      break;
+    }
+    const ORUMSPKey* key = findORUMSPKey(header.key);
+    if (key != nullptr && !take(ctx, *key, rest.first(header.length), total)) {
+      break;
+    }
+    rest = rest.subspan(header.length);
+  }
+  return total;
+}
+
+}  // namespace vesprun

@@ -1,0 +1,115 @@
+#include "NANDInfo/parsers/ORUParseBufferToCxt.h"
+
+#include <algorithm>
+
+#include "NANDInfo/parsers/ORUStatKeyTable.h"
+#include "NANDInfo/parsers/StatisticsRecord.h"
+
+namespace vesprun {
+namespace {
+
+constexpr std::uint32_t kReadCountHisto = 265;
+
+void keepInSummary(ORUStatsContext& ctx, std::uint32_t id, std::uint64_t value) {
+  const auto lowBits = static_cast<std::uint32_t>(value);
+  switch (id) {
+    case 4:
+      ctx.hostWrites = value;
+      break;
+    case 7:
+      ctx.hostReads = value;
+      break;
+    case 12:
+      ctx.IND_pool_free = value;
+      break;
+    case 13:
+      ctx.IND_pool_count = value;
+      break;
+    case 17:
+      ctx.wearLevMoves = value;
+      break;
+    case 18:
+      ctx.nandWrites = value;
+      break;
+    case 19:
+      ctx.nandReads = value;
+      break;
+    case 20:
+      ctx.bandErases = value;
+      break;
+    case 28:
+      ctx.numSleepOps = value;
+      break;
+    case 45:
+      ctx.maxHighEnduranceBlockErases = value;
+      break;
+    case 48:
+      ctx.numFreeVirtualBlocks = value;
+      break;
+    case 49:
+      ctx.bytesPerPage = lowBits;
+      break;
+    case 50:
+      ctx.pagesPerVirtualBlock = lowBits;
+      break;
+    case 51:
+      ctx.blocksPerVirtualBlock = lowBits;
+      break;
+    case 52:
+      ctx.numVirtualBlocks = lowBits;
+      break;
+    case 53:
+      ctx.exportVersion = lowBits;
+      break;
+    case 56:
+      ctx.utilFormatTime = value;
+      break;
+    default:
+      break;
+  }
+}
+
+void appendStatistic(ORUStatsContext& ctx, const ORUStatKey& key,
+                     const StatisticsRecordReader& reader) {
+  const std::size_t present = std::min<std::size_t>(key.count, reader.remaining());
+  if (!key.isArray()) {
+    if (present != 0) {
+      keepInSummary(ctx, key.id, reader.word(0));
+      AddSingleValueToGenericContext(ctx.fields, "", key.name, reader.word(0));
+    }
+    return;
+  }
+  // Even a lone element that is left of an array keeps its index.
+  ctx.fields.appendArray(key.name, reader.data(), StatisticsRecordReader::kWordSize, present);
+  if (key.id == kReadCountHisto) {
+    for (std::size_t i = 0; i < present; ++i) {
+      ctx.readCountHisto[i] = reader.word(i);
+    }
+  }
+}
+
+}  // namespace
+
+bool ORUParseBufferToCxt(ORUStatsContext& ctx, std::span<const std::uint8_t> buffer) {
+  ctx.driverVersion = -1;
+  StatisticsRecordReader reader(buffer);
+  if (reader.remaining() == 0) {
+    return false;
+  }
+  do {
+    const StatisticsRecordHeader header = reader.readHeader();
+    if (!reader.holds(header)) {
+      ctx.exportVersion = 0;
+      return false;
+    }
+    if (const ORUStatKey* key = findORUStatKey(header.id)) {
+      appendStatistic(ctx, *key, reader);
+    }
+    reader.skip(header.count);
+  } while (reader.remaining() != 0);
+  return true;
+}
+
+void ORUReleaseContext(ORUStatsContext& ctx) { ctx = ORUStatsContext(); }
+
+}  // namespace vesprun

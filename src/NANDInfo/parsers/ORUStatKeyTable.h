@@ -1,0 +1,27 @@
+#pragma once
+
+#include <array>
+#include <cstddef>
+#include <cstdint>
+#include <string_view>
+
+namespace vesprun {
+
+/// A statistic that the storage controller exports in its base and FTL buffers.
+struct ORUStatKey {
+  std::uint16_t id;
+  std::string_view name;    ///< goes into reports letter for letter
+  std::uint16_t count = 1;  ///< 1 for a single value, else the number of elements of the array
+
+  constexpr bool isArray() const { return count > 1; }
+};
+
+inline constexpr std::size_t kORUStatKeyCount = 657;
+
+/// All known statistics, by ascending id.
+extern const std::array<ORUStatKey, kORUStatKeyCount> ORUStatKeyTable;
+
+/// The statistic with that id, or null. Takes constant time.
+const ORUStatKey* findORUStatKey(std::uint32_t id);
+
+}  // namespace vesprun

@@ -1,0 +1,40 @@
+#pragma once
+
+#include <bit>
+#include <concepts>
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
+#include <vector>
+
+namespace vesprun {
+
+/// The little-endian unsigned integer of `width` bytes, 0 to 8, at `bytes`, which need not be
+/// aligned.
+inline std::uint64_t loadLittleEndian(const std::uint8_t* bytes, std::size_t width) {
+  std::uint64_t value = 0;
+  if constexpr (std::endian::native == std::endian::little) {
+    std::memcpy(&value, bytes, width);
+  } else {
+    for (std::size_t at = width; at-- > 0;) {
+      value = value << 8 | bytes[at];
+    }
+  }
+  return value;
+}
+
+/// The same for a type of that width.
+template <std::unsigned_integral T>
+T loadLittleEndian(const std::uint8_t* bytes) {
+  return static_cast<T>(loadLittleEndian(bytes, sizeof(T)));
+}
+
+/// Appends the `width` low bytes of `value`, 0 to 8, the least significant first.
+inline void appendLittleEndian(std::vector<std::uint8_t>& bytes, std::uint64_t value,
+                               std::size_t width) {
+  for (std::size_t at = 0; at < width; ++at) {
+    bytes.push_back(static_cast<std::uint8_t>(value >> (8 * at)));
+  }
+}
+
+}  // namespace vesprun

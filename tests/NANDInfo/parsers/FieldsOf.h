@@ -1,0 +1,22 @@
+#pragma once
+
+#include <cstdint>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "NANDInfo/parsers/GenericParserCxt.h"
+
+namespace vesprun {
+
+using Fields = std::vector<std::pair<std::string, std::uint64_t>>;
+
+inline Fields fieldsOf(const GenericParserCxt& ctx) {
+  Fields fields;
+  for (const GenericParserCxt::Field field : ctx) {
+    fields.emplace_back(field.name, field.value);
+  }
+  return fields;
+}
+
+}  // namespace vesprun

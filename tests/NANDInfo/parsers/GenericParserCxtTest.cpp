@@ -1,0 +1,138 @@
+#include "NANDInfo/parsers/GenericParserCxt.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "FieldsOf.h"
+#include "NANDInfo/parsers/DictionaryHelpers.h"
+#include "NANDInfo/parsers/HexText.h"
+#include "support/TestDevice.h"
+
+namespace vesprun {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+
+constexpr std::uint8_t kBytes[] = {1, 0, 0, 0, 2, 0, 0, 0, 0xFF, 0xFF, 0xFF, 0xFF, 0x80};
+
+TEST(GenericParserCxt, namesElementsAndWidensThem) {
+  struct Case {
+    const char* name;
+    std::uint32_t width;
+    std::uint32_t count;
+    bool result;
+    Fields fields;
+  };
+  const Case cases[] = {
+      {"bin", 4, 3, true, {{"bin0", 1}, {"bin1", 2}, {"bin2", 4294967295}}},
+      {"x_", 4, 1, true, {{"x_", 1}}},
+      {"byte", 1, 2, true, {{"byte0", 1}, {"byte1", 0}}},
+      {"odd", 3, 2, true, {{"odd0", 1}, {"odd1", 0x200}}},
+      {"all", 8, 1, true, {{"all", 0x200000001}}},
+      {"wide", 9, 1, false, {}},
+      {"wide", 9, 2, false, {}},
+      {"none", 0, 70'000, true, {}},
+      {"none", 9, 0, true, {}},
+  };
+  for (const Case& each : cases) {
+    GenericParserCxt ctx;
+    EXPECT_EQ(AddMultipleFieldsToGenericContext(ctx, each.name, kBytes, each.width, each.count),
+              each.result)
+        << each.name << each.width << 'x' << each.count;
+    EXPECT_EQ(fieldsOf(ctx), each.fields) << each.name << each.width << 'x' << each.count;
+  }
+}
+
+TEST(GenericParserCxt, refusesWhatOneCallCannotTake) {
+  const Bytes bytes(65'536);
+  GenericParserCxt ctx;
+  EXPECT_FALSE(AddMultipleFieldsToGenericContext(ctx, "n", bytes.data(), 1, 65'536));
+  EXPECT_TRUE(ctx.empty());
+  EXPECT_TRUE(AddMultipleFieldsToGenericContext(ctx, "n", bytes.data(), 1, 65'535));
+  ASSERT_EQ(ctx.size(), 65'535U);
+  EXPECT_EQ(ctx[65'534].name, "n65534");
+}
+
+TEST(GenericParserCxt, cutsNamesAt98Characters) {
+  const std::string prefix(97, 'p');
+  GenericParserCxt ctx;
+  EXPECT_TRUE(AddSingleValueToGenericContext(ctx, prefix, "suffix", 1));
+  EXPECT_TRUE(AddMultipleFieldsToGenericContext(ctx, prefix, kBytes, 1, 12));
+  EXPECT_TRUE(AddMultipleFieldsToGenericContext(ctx, std::string(120, 'q'), kBytes, 1, 2));
+  EXPECT_EQ(ctx[0].name, prefix + "s");
+  EXPECT_EQ(ctx[12].name, prefix + "1");  // index 11
+  EXPECT_EQ(ctx[14].name, std::string(98, 'q'));
+}
+
+TEST(GenericParserCxt, keepsOrderAndRepeatsUntilReleased) {
+  GenericParserCxt ctx;
+  EXPECT_THAT(CreateDictFromCxt(ctx), IsEmpty());
+  AddSingleValueToGenericContext(ctx, "a", "1", 18446744073709551615U);
+  AddSingleValueToGenericContext(ctx, "", "b", 2);
+  AddSingleValueToGenericContext(ctx, "a1", "", 3);
+  EXPECT_EQ(fieldsOf(ctx), (Fields{{"a1", 18446744073709551615U}, {"b", 2}, {"a1", 3}}));
+  EXPECT_EQ(ctx[0].text(), "18446744073709551615");
+  const PropertyDict dict = CreateDictFromCxt(ctx);
+  EXPECT_EQ(dict, (PropertyDict{{"a1", 3}, {"b", 2}}));
+  EXPECT_EQ(dict.find("b")->number()->kind(), NumberKind::UInt64);
+  EXPECT_EQ(CreateDictFromCxt(ctx, [](std::string_view name) { return name == "b"; }),
+            (PropertyDict{{"b", 2}}));
+  EXPECT_THAT(CreateDictFromCxt(ctx, [](std::string_view) { return false; }), IsEmpty());
+  ReleaseGenericParserCxt(ctx);
+  ReleaseGenericParserCxt(ctx);
+  EXPECT_TRUE(ctx.empty());
+  AddSingleValueToGenericContext(ctx, "", "again", 4);
+  EXPECT_EQ(fieldsOf(ctx), (Fields{{"again", 4}}));
+}
+
+TEST(DictionaryHelpers, fallBackAndKeepTheirKinds) {
+  PropertyDict dict{{"n", 7}, {"s", "text"}};
+  EXPECT_EQ(GetNumberFromDictionarySafe(dict, "n"), PropertyValue(7));
+  EXPECT_EQ(GetNumberFromDictionarySafe(dict, "no"), PropertyValue(0));
+  EXPECT_EQ(GetStringFromDictionarySafe(dict, "s"), PropertyValue("text"));
+  EXPECT_EQ(GetStringFromDictionarySafe(dict, "no"), PropertyValue("empty"));
+
+  const std::int32_t minusTwo = -2;
+  const double half = 0.5;
+  PropertyArray array;
+  setNumberValueForType(dict, "n", &minusTwo, PVNumberType::Int8);
+  setNumberValueForType(dict, "int", &minusTwo, PVNumberType::Int);
+  appendNumberValueForType(array, &half, PVNumberType::Double);
+  appendNumberValueForType(array, &half, PVNumberType::Int64);
+  EXPECT_EQ(dict, (PropertyDict{{"n", -2}, {"s", "text"}, {"int", -2}}));
+  EXPECT_EQ(dict.find("n")->number()->kind(), NumberKind::Int8);
+  EXPECT_EQ(dict.find("int")->number()->kind(), NumberKind::Int32);
+  EXPECT_EQ(array, (PropertyArray{0.5, std::int64_t{0x3FE0000000000000}}));
+}
+
+TEST(DictionaryHelpers, leaveADictionaryAloneWhenThereIsNoNumber) {
+  TestDevice device;
+  device.platform();
+  PropertyDict dict;
+  setNumberValueForType(dict, "n", nullptr, PVNumberType::Int);
+  setNumberValueForType(dict, "n", kBytes, static_cast<PVNumberType>(2));
+  EXPECT_THAT(dict, IsEmpty());
+  EXPECT_THAT(device.log(), ElementsAre("error: Failed to create PVNumber from value: (nil)",
+                                        ::testing::StartsWith("error: Failed to create PVNumber "
+                                                              "from value: 0x")));
+}
+
+TEST(HexText, readsPairsFromTheLeft) {
+  EXPECT_EQ(hexStringToInt32("12345678", 8), 0x12345678U);
+  EXPECT_EQ(hexStringToInt32("a5", 2), 0xA5U);
+  EXPECT_EQ(hexStringToInt32("123", 3), 0x1203U);
+  EXPECT_EQ(hexStringToInt32("12345", 5), 0x123405U);
+  EXPECT_EQ(hexStringToInt32("0045", 4), 0x45U);
+  EXPECT_EQ(hexStringToInt32("FfeEdD0099", 10), 0xFFEEDD00U);
+  EXPECT_EQ(hexStringToInt32("12", 8), 0x12U);  // no further than the text
+  EXPECT_EQ(hexStringToInt32("12", 0), 0U);
+  EXPECT_EQ(hexStringToByte("ABC", 9), 0xAB);
+  EXPECT_EQ(hexStringToByte("9", 1), 9);
+  ::testing::internal::CaptureStdout();
+  EXPECT_EQ(hexStringToByte("g1", 2), 0x01);
+  EXPECT_EQ(::testing::internal::GetCapturedStdout(), "unrecognized hex character: g");
+}
+
+}  // namespace
+}  // namespace vesprun

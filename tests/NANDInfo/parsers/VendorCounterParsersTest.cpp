@@ -1,0 +1,76 @@
+#include "NANDInfo/parsers/VendorCounterParsers.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <map>
+#include <numeric>
+
+#include "common/LittleEndian.h"
+
+namespace vesprun {
+namespace {
+
+/// A region, at an odd address, whose word i holds i.
+class CountingRegion {
+ public:
+  CountingRegion() : _bytes(1) {
+    for (std::uint32_t word = 0; word < kCounterRegionWords; ++word) {
+      appendLittleEndian(_bytes, word, sizeof word);
+    }
+  }
+  CounterRegion region() const { return CounterRegion(_bytes.data() + 1, kCounterRegionSize); }
+
+ private:
+  std::vector<std::uint8_t> _bytes;
+};
+
+TEST(VendorCounterParsers, copyWhatTheirLayoutsSay) {
+  struct Case {
+    void (*parse)(CounterRegion, NandChannelCounters&);
+    std::map<std::size_t, std::uint32_t> words;
+    std::uint64_t sum;
+    std::size_t untouched;
+  };
+  const Case cases[] = {
+      {parseCountersAlgoGeneric,
+       {{19, 37}, {20, 117}, {41, 19}, {65, 104}, {122, 64}, {123, 0}, {125, 67}, {164, 113}},
+       6918,
+       61},
+      {parseCountersAlgoGenericKX4,
+       {{8, 0}, {29, 8}, {86, 123}, {102, 26}, {144, 74}, {167, 75}, {168, 76}, {176, 0}},
+       7324,
+       20},
+      {parseCounters1y,
+       {{7, 263}, {8, 265}, {9, 267}, {42, 290}, {65, 21}, {74, 15}, {76, 532}, {156, 384}},
+       34548,
+       69},
+      {parseCounters1xSandisk,
+       {{5, 261}, {6, 0}, {8, 265}, {19, 301}, {42, 288}, {63, 297}, {65, 16}, {74, 10}, {77, 0}},
+       11352,
+       121},
+      {parseCounters1xHynix,
+       {{3, 259}, {4, 0}, {8, 263}, {18, 274}, {42, 284}, {63, 293}, {72, 311}, {74, 10}, {77, 0}},
+       10168,
+       121},
+  };
+  const CountingRegion counting;
+  for (const Case& each : cases) {
+    const std::size_t number = static_cast<std::size_t>(&each - cases);
+    NandChannelCounters counters{};
+    each.parse(counting.region(), counters);
+    for (const auto& [word, value] : each.words) {
+      EXPECT_EQ(counters[word], value) << "layout " << number << ", word " << word;
+    }
+    EXPECT_EQ(std::accumulate(counters.begin(), counters.end(), std::uint64_t{0}), each.sum)
+        << "layout " << number;
+    counters.fill(0xFFFF);
+    each.parse(counting.region(), counters);
+    EXPECT_EQ(static_cast<std::size_t>(std::count(counters.begin(), counters.end(), 0xFFFFU)),
+              each.untouched)
+        << "layout " << number;
+  }
+}
+
+}  // namespace
+}  // namespace vesprun
