@@ -6,6 +6,13 @@
 
 namespace vesprun {
 
+/// The size of a file system in blocks, as `statfs` counts them.
+struct FileSystemStatistics {
+  std::uint32_t blockSize;        ///< bytes
+  std::uint64_t blocks;           ///< all of them
+  std::uint64_t availableBlocks;  ///< those that a user without privileges can still fill
+};
+
 /// The device's files, by absolute path on the device.
 class FileSystem {
  public:
@@ -16,6 +23,9 @@ class FileSystem {
 
   /// The size in bytes (`stat`); nothing when the file cannot be examined.
   virtual std::optional<std::uint64_t> fileSize(const std::string& path) = 0;
+
+  /// The file system that a path lies on; nothing when it cannot be measured.
+  virtual std::optional<FileSystemStatistics> statfs(const std::string& path) = 0;
 };
 
 }  // namespace vesprun

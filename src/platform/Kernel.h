@@ -5,6 +5,8 @@
 #include <span>
 #include <string>
 
+#include "common/PropertyValue.h"
+
 namespace vesprun {
 
 /// Nanoseconds per tick as a fraction.
@@ -22,6 +24,9 @@ class Kernel {
   /// written. Otherwise returns the system error number (never 0), and `buffer` is untouched. A
   /// variable whose size differs from the buffer's is not read, but for text, which must fit with
   /// its final NUL.
+  ///
+  /// "kern.next_ecc_event" (72 bytes) is a queue: each successful read takes one event out of it.
+  /// An empty queue is error 2.
   virtual int sysctlbyname(const std::string& name, std::span<std::uint8_t> buffer,
                            std::size_t& length) = 0;
 
@@ -33,6 +38,10 @@ class Kernel {
 
   /// Nothing when the kernel does not tell.
   virtual std::optional<TickRatio> tickRatio() = 0;
+
+  /// Captures a snapshot of the kernel: typed items, one behind the other. `captureFlags` says what
+  /// it is to hold. Nothing when it cannot be had.
+  virtual std::optional<Bytes> captureSnapshot(std::uint32_t captureFlags) = 0;
 };
 
 }  // namespace vesprun

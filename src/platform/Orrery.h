@@ -7,6 +7,11 @@
 
 namespace vesprun {
 
+// The entries of the answer to "DiskUsage", a dictionary: signed 64-bit byte counts.
+inline constexpr std::string_view kDiskUsageTotalDiskCapacity = "TotalDiskCapacity";
+inline constexpr std::string_view kDiskUsageTotalDataAvailable = "TotalDataAvailable";
+inline constexpr std::string_view kDiskUsageAmountDataAvailable = "AmountDataAvailable";
+
 /// The platform's device-property query.
 class Orrery {
  public:

@@ -1,6 +1,8 @@
 #pragma once
 
 #include "platform/Clock.h"
+#include "platform/DeviceRegistry.h"
+#include "platform/DiagnosticHeader.h"
 #include "platform/EventHub.h"
 #include "platform/FileSystem.h"
 #include "platform/InstalledApplications.h"
@@ -10,13 +12,18 @@
 #include "platform/MainLoop.h"
 #include "platform/MessageDigest.h"
 #include "platform/MessageService.h"
+#include "platform/Murmur.h"
 #include "platform/NotificationCenter.h"
 #include "platform/Orrery.h"
 #include "platform/Preferences.h"
+#include "platform/ProcessInformation.h"
 #include "platform/PtreeSerialization.h"
+#include "platform/Reclaimer.h"
 #include "platform/SupportLibrary.h"
 #include "platform/SystemLog.h"
 #include "platform/Tallybook.h"
+#include "platform/Tapline.h"
+#include "platform/UserDefaults.h"
 
 namespace vesprun {
 
@@ -27,6 +34,8 @@ class Platform {
   virtual ~Platform() = default;
 
   virtual Clock& clock() = 0;
+  virtual DeviceRegistry& deviceRegistry() = 0;
+  virtual DiagnosticHeader& diagnosticHeader() = 0;
   virtual EventHub& eventHub() = 0;
   virtual FileSystem& fileSystem() = 0;
   virtual InstalledApplications& installedApplications() = 0;
@@ -36,13 +45,18 @@ class Platform {
   virtual MainLoop& mainLoop() = 0;
   virtual MessageDigest& messageDigest() = 0;
   virtual MessageService& messageService() = 0;
+  virtual Murmur& murmur() = 0;
   virtual NotificationCenter& notificationCenter() = 0;
   virtual Orrery& orrery() = 0;
   virtual Preferences& preferences() = 0;
+  virtual ProcessInformation& processInformation() = 0;
   virtual PtreeSerialization& ptreeSerialization() = 0;
+  virtual Reclaimer& reclaimer() = 0;
   virtual SupportLibrary& supportLibrary() = 0;
   virtual SystemLog& systemLog() = 0;
   virtual Tallybook& tallybook() = 0;
+  virtual UserDefaults& userDefaults() = 0;
+  virtual Tapline& tapline() = 0;
 };
 
 /// The installed platform. There must be one.

@@ -10,7 +10,7 @@ namespace vesprun {
 
 /// The mobile user's preferences: one dictionary of values for each domain. A change is seen by
 /// this process at once and is written when its domain is synchronized, or at the latest when the
-/// process ends.
+/// process ends. May be called from any thread.
 class Preferences {
  public:
   virtual ~Preferences() = default;

@@ -8,7 +8,8 @@ namespace vesprun {
 /// From the gravest to the least; a log that keeps one level keeps all graver ones.
 enum class LogLevel : std::uint8_t { Error, Default, Notice, Info, Debug };
 
-/// The platform's system log. Writing never fails as far as the caller can tell.
+/// The platform's system log. Writing never fails as far as the caller can tell, and is possible
+/// from any thread.
 class SystemLog {
  public:
   virtual ~SystemLog() = default;

@@ -2,6 +2,7 @@
 
 #include <sys/stat.h>
 
+#include "platform/host/LiveSystem.h"
 #include "platform/host/WholeFile.h"
 
 namespace vesprun {
@@ -17,6 +18,19 @@ std::optional<std::uint64_t> HostFileSystem::fileSize(const std::string& path) {
     return std::nullopt;
   }
   return static_cast<std::uint64_t>(status.st_size);
+}
+
+std::optional<FileSystemStatistics> HostFileSystem::statfs(const std::string& path) {
+  std::optional<VolumeDescription> volume;
+  if (path != "/private/var") {
+    volume = live::volume(_directory.hostPath(path));
+  } else {
+    volume = _userVolume.isLive() ? live::volume(_directory.path()) : _userVolume.value;
+  }
+  if (!volume) {
+    return std::nullopt;
+  }
+  return FileSystemStatistics{volume->blockSize, volume->blocks, volume->available};
 }
 
 }  // namespace vesprun

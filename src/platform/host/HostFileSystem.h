@@ -1,20 +1,26 @@
 #pragma once
 
 #include "platform/FileSystem.h"
+#include "platform/host/DeviceDescription.h"
 #include "platform/host/DeviceDirectory.h"
 
 namespace vesprun {
 
-/// The files of the device directory.
+/// The files of the device directory. The user volume, at /private/var, is as large as described,
+/// or else as the file system that the directory lies on.
 class HostFileSystem : public FileSystem {
  public:
-  explicit HostFileSystem(const DeviceDirectory& directory) : _directory(directory) {}
+  HostFileSystem(const DeviceDirectory& directory,
+                 const AnswerDescription<VolumeDescription>& userVolume)
+      : _directory(directory), _userVolume(userVolume) {}
 
   std::optional<std::string> readFile(const std::string& path) override;
   std::optional<std::uint64_t> fileSize(const std::string& path) override;
+  std::optional<FileSystemStatistics> statfs(const std::string& path) override;
 
  private:
   const DeviceDirectory& _directory;
+  const AnswerDescription<VolumeDescription>& _userVolume;
 };
 
 }  // namespace vesprun

@@ -9,6 +9,7 @@
 #include <cstring>
 
 #include "platform/host/LiveSystem.h"
+#include "platform/host/WholeFile.h"
 
 namespace vesprun {
 namespace {
@@ -38,6 +39,10 @@ Bytes bytesOf(const KernelVariable& variable) {
 
 int HostKernel::sysctlbyname(const std::string& name, std::span<std::uint8_t> buffer,
                              std::size_t& length) {
+  if (name == "kern.next_ecc_event") {
+    const int described = _description.eccError.value_or(0);
+    return described != 0 ? described : _eccEvents.takeNext(buffer, length);
+  }
   const std::optional<KernelVariable> content = variable(name);
   if (!content) {
     return ENOENT;
@@ -86,6 +91,17 @@ std::optional<TickRatio> HostKernel::tickRatio() {
     return std::nullopt;
   }
   return _description.ticks.value ? _description.ticks.value->ratio : TickRatio{1, 1};
+}
+
+std::optional<Bytes> HostKernel::captureSnapshot(std::uint32_t /*captureFlags*/) {
+  if (!_description.snapshotFile) {
+    return std::nullopt;
+  }
+  std::string ignored;
+  const std::optional<std::string> content =
+      readWholeFile(_directory.hostPath(*_description.snapshotFile), ignored);
+  return content ? std::optional<Bytes>(std::in_place, content->begin(), content->end())
+                 : std::nullopt;
 }
 
 }  // namespace vesprun

@@ -2,6 +2,8 @@
 
 #include "platform/Kernel.h"
 #include "platform/host/DeviceDescription.h"
+#include "platform/host/DeviceDirectory.h"
+#include "platform/host/ECCEventQueue.h"
 
 namespace vesprun {
 
@@ -9,18 +11,23 @@ namespace vesprun {
 /// is silent.
 class HostKernel : public Kernel {
  public:
-  explicit HostKernel(const KernelDescription& description) : _description(description) {}
+  HostKernel(const KernelDescription& description, const DeviceDirectory& directory, SystemLog& log)
+      : _description(description), _directory(directory), _eccEvents(directory, log) {}
 
   int sysctlbyname(const std::string& name, std::span<std::uint8_t> buffer,
                    std::size_t& length) override;
   std::uint64_t pageSize() override;
   std::uint64_t monotonicTicks() override;
   std::optional<TickRatio> tickRatio() override;
+  /// The described snapshot, whatever the flags; Linux has none to offer.
+  std::optional<Bytes> captureSnapshot(std::uint32_t captureFlags) override;
 
  private:
   std::optional<KernelVariable> variable(const std::string& name) const;
 
   const KernelDescription& _description;
+  const DeviceDirectory& _directory;
+  ECCEventQueue _eccEvents;
 };
 
 }  // namespace vesprun

@@ -28,9 +28,9 @@ std::optional<PropertyValue> HostOrrery::diskUsage() const {
   const auto bytes = [&](std::uint64_t blocks) {
     return static_cast<std::int64_t>(blocks * volume->blockSize);
   };
-  return PropertyDict{{"TotalDiskCapacity", bytes(volume->blocks)},
-                      {"TotalDataAvailable", bytes(volume->available)},
-                      {"AmountDataAvailable", bytes(volume->available)}};
+  return PropertyDict{{std::string(kDiskUsageTotalDiskCapacity), bytes(volume->blocks)},
+                      {std::string(kDiskUsageTotalDataAvailable), bytes(volume->available)},
+                      {std::string(kDiskUsageAmountDataAvailable), bytes(volume->available)}};
 }
 
 }  // namespace vesprun

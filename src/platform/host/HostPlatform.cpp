@@ -5,6 +5,8 @@
 #include <utility>
 
 #include "platform/host/HostClock.h"
+#include "platform/host/HostDeviceRegistry.h"
+#include "platform/host/HostDiagnosticHeader.h"
 #include "platform/host/HostEventHub.h"
 #include "platform/host/HostFileSystem.h"
 #include "platform/host/HostInstalledApplications.h"
@@ -12,12 +14,17 @@
 #include "platform/host/HostLanguages.h"
 #include "platform/host/HostLogsmith.h"
 #include "platform/host/HostMessageDigest.h"
+#include "platform/host/HostMurmur.h"
 #include "platform/host/HostNotificationCenter.h"
 #include "platform/host/HostOrrery.h"
 #include "platform/host/HostPreferences.h"
+#include "platform/host/HostProcessInformation.h"
 #include "platform/host/HostPtreeSerialization.h"
+#include "platform/host/HostReclaimer.h"
 #include "platform/host/HostSupportLibrary.h"
 #include "platform/host/HostSystemLog.h"
+#include "platform/host/HostTapline.h"
+#include "platform/host/HostUserDefaults.h"
 #include "platform/host/PollMainLoop.h"
 #include "platform/host/SqliteTallybook.h"
 #include "platform/host/UnixMessageService.h"
@@ -59,6 +66,9 @@ struct HostPlatform::Services {
   Outbox outbox;
   Lazy<HostPreferences> preferences;
   Lazy<SqliteTallybook> tallybook;
+  Lazy<HostDeviceRegistry> describedRegistry;
+  DeviceRegistry* interposedRegistry = nullptr;
+  Lazy<HostDiagnosticHeader> diagnosticHeader;
   Lazy<HostEventHub> eventHub;
   Lazy<HostFileSystem> fileSystem;
   Lazy<HostInstalledApplications> installedApplications;
@@ -68,10 +78,15 @@ struct HostPlatform::Services {
   Lazy<HostMessageDigest> messageDigest;
   Lazy<HostNotificationCenter> notificationCenter;
   Lazy<HostOrrery> orrery;
+  Lazy<HostProcessInformation> processInformation;
   Lazy<HostPtreeSerialization> ptreeSerialization;
+  Lazy<HostReclaimer> reclaimer;
   Lazy<HostSupportLibrary> supportLibrary;
+  Lazy<HostUserDefaults> userDefaults;
   Lazy<PollMainLoop> mainLoop;
   Lazy<UnixMessageService> messageService;
+  Lazy<HostTapline> tapline;
+  Lazy<HostMurmur> murmur;  // last: until it has ended, a reply may use what stands above
 };
 
 HostPlatform::HostPlatform(std::unique_ptr<Services> services) : _services(std::move(services)) {}
@@ -118,17 +133,38 @@ SqliteTallybook& HostPlatform::counters() {
 
 Tallybook& HostPlatform::tallybook() { return counters(); }
 
+HostDeviceRegistry& HostPlatform::describedRegistry() {
+  return _services->describedRegistry.get(description().registry, directory(), systemLog());
+}
+
+void HostPlatform::interposeDeviceRegistry(DeviceRegistry* registry) {
+  _services->interposedRegistry = registry;
+}
+
+DeviceRegistry& HostPlatform::deviceRegistry() {
+  return _services->interposedRegistry != nullptr ? *_services->interposedRegistry
+                                                  : describedRegistry();
+}
+
+DiagnosticHeader& HostPlatform::diagnosticHeader() {
+  return _services->diagnosticHeader.get(description().system);
+}
+
 EventHub& HostPlatform::eventHub() {
   return _services->eventHub.get(description().events, _services->outbox);
 }
 
-FileSystem& HostPlatform::fileSystem() { return _services->fileSystem.get(directory()); }
+FileSystem& HostPlatform::fileSystem() {
+  return _services->fileSystem.get(directory(), description().userVolume);
+}
 
 InstalledApplications& HostPlatform::installedApplications() {
   return _services->installedApplications.get(description());
 }
 
-Kernel& HostPlatform::kernel() { return _services->kernel.get(description().kernel); }
+Kernel& HostPlatform::kernel() {
+  return _services->kernel.get(description().kernel, directory(), systemLog());
+}
 
 Languages& HostPlatform::languages() { return _services->languages.get(description().languages); }
 
@@ -145,6 +181,8 @@ MessageService& HostPlatform::messageService() {
                                        _services->mainLoop.get());
 }
 
+Murmur& HostPlatform::murmur() { return _services->murmur.get(description().usage, systemLog()); }
+
 NotificationCenter& HostPlatform::notificationCenter() {
   return _services->notificationCenter.get(_services->outbox);
 }
@@ -157,12 +195,22 @@ Preferences& HostPlatform::preferences() {
   return _services->preferences.get(directory(), systemLog());
 }
 
+ProcessInformation& HostPlatform::processInformation() {
+  return _services->processInformation.get();
+}
+
 PtreeSerialization& HostPlatform::ptreeSerialization() {
   return _services->ptreeSerialization.get();
 }
 
+Reclaimer& HostPlatform::reclaimer() { return _services->reclaimer.get(description()); }
+
 SupportLibrary& HostPlatform::supportLibrary() {
   return _services->supportLibrary.get(description().supportLibrary);
 }
+
+Tapline& HostPlatform::tapline() { return _services->tapline.get(description().channels); }
+
+UserDefaults& HostPlatform::userDefaults() { return _services->userDefaults.get(preferences()); }
 
 }  // namespace vesprun

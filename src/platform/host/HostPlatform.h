@@ -9,6 +9,7 @@
 
 namespace vesprun {
 
+class HostDeviceRegistry;
 class SqliteTallybook;
 
 /// The platform of one device directory on the running Linux system. What the services hold back is
@@ -25,8 +26,15 @@ class HostPlatform : public Platform {
   const DeviceDescription& description() const;
   /// The counter database with the operations that only tools need.
   SqliteTallybook& counters();
+  /// The described registry, which knows which handles are out.
+  HostDeviceRegistry& describedRegistry();
+  /// From now on `deviceRegistry` is this one, which outlives the platform: it stands between the
+  /// program and the described registry, to watch the calls or to make some fail. Null: none.
+  void interposeDeviceRegistry(DeviceRegistry* registry);
 
   Clock& clock() override;
+  DeviceRegistry& deviceRegistry() override;
+  DiagnosticHeader& diagnosticHeader() override;
   EventHub& eventHub() override;
   FileSystem& fileSystem() override;
   InstalledApplications& installedApplications() override;
@@ -36,13 +44,18 @@ class HostPlatform : public Platform {
   MainLoop& mainLoop() override;
   MessageDigest& messageDigest() override;
   MessageService& messageService() override;
+  Murmur& murmur() override;
   NotificationCenter& notificationCenter() override;
   Orrery& orrery() override;
   Preferences& preferences() override;
+  ProcessInformation& processInformation() override;
   PtreeSerialization& ptreeSerialization() override;
+  Reclaimer& reclaimer() override;
   SupportLibrary& supportLibrary() override;
   SystemLog& systemLog() override;
   Tallybook& tallybook() override;
+  UserDefaults& userDefaults() override;
+  Tapline& tapline() override;
 
  private:
   struct Services;

@@ -14,6 +14,7 @@
 #include <map>
 #include <sstream>
 #include <string_view>
+#include <utility>
 
 namespace vesprun::live {
 namespace {
@@ -41,6 +42,12 @@ std::string firstLineOf(const std::string& file) {
   std::string line;
   std::getline(stream, line);
   return line;
+}
+
+std::string upperCase(std::string text) {
+  std::transform(text.begin(), text.end(), text.begin(),
+                 [](unsigned char c) { return static_cast<char>(std::toupper(c)); });
+  return text;
 }
 
 template <typename T>
@@ -128,14 +135,18 @@ std::optional<Bytes> swapUsage() {
 }
 
 std::optional<std::string> bootSessionIdentifier() {
-  std::string identifier = firstLineOf("/proc/sys/kernel/random/boot_id");
-  if (identifier.empty()) {
-    return std::nullopt;
-  }
-  std::transform(identifier.begin(), identifier.end(), identifier.begin(),
-                 [](unsigned char c) { return static_cast<char>(std::toupper(c)); });
-  return identifier;
+  std::string identifier = upperCase(firstLineOf("/proc/sys/kernel/random/boot_id"));
+  return identifier.empty() ? std::nullopt : std::optional(std::move(identifier));
 }
+
+std::string machineIdentifier() { return firstLineOf("/etc/machine-id"); }
+
+std::string hardwareModel() {
+  utsname system{};
+  return uname(&system) == 0 ? system.machine : "";
+}
+
+std::string newIdentifier() { return upperCase(firstLineOf("/proc/sys/kernel/random/uuid")); }
 
 std::optional<VolumeDescription> volume(const std::string& path) {
   struct statvfs status {};

@@ -18,6 +18,10 @@ std::optional<Bytes> swapUsage();
 /// The boot identifier in upper case.
 std::optional<std::string> bootSessionIdentifier();
 
+std::string machineIdentifier();  ///< of this installation; empty when it has none
+std::string hardwareModel();      ///< the machine's architecture, for example "x86_64"
+std::string newIdentifier();      ///< a random UUID in upper case
+
 /// The file system that a path lies on; nothing when it cannot be measured.
 std::optional<VolumeDescription> volume(const std::string& path);
 

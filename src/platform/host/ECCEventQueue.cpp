@@ -1,0 +1,78 @@
+#include "platform/host/ECCEventQueue.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <filesystem>
+#include <optional>
+#include <vector>
+
+#include "platform/host/WholeFile.h"
+
+namespace vesprun {
+namespace {
+
+std::vector<std::string> eventFiles(const std::string& folder) {
+  std::vector<std::string> files;
+  std::error_code error;
+  for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
+       entry.increment(error)) {
+    if (entry->path().extension() == ".bin") {
+      files.push_back(entry->path());
+    }
+  }
+  std::sort(files.begin(), files.end());
+  return files;
+}
+
+}  // namespace
+
+int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length) {
+  for (const std::string& path : eventFiles(_directory.hostPath("kernel/ecc"))) {
+    std::string error;
+    bool missing = false;
+    const std::optional<std::string> event = readWholeFile(path, error, &missing);
+    if (missing) {
+      continue;  // another process took it
+    }
+    if (event && event->size() != kEventLength) {
+      error = path + ": " + std::to_string(event->size()) + " bytes are not an ECC event of " +
+              std::to_string(kEventLength);
+    }
+    if (!event || event->size() != kEventLength) {
+      if (!setAside(path, error)) {
+        return EIO;
+      }
+      continue;
+    }
+    if (buffer.size() != kEventLength) {
+      return EINVAL;
+    }
+    // Whoever deletes the file has the event: one that stays would be delivered for ever.
+    if (unlink(path.c_str()) != 0) {
+      if (errno == ENOENT) {
+        continue;
+      }
+      _log.write(LogLevel::Error, path + ": " + std::strerror(errno));
+      return EIO;
+    }
+    std::memcpy(buffer.data(), event->data(), kEventLength);
+    length = kEventLength;
+    return 0;
+  }
+  return ENOENT;
+}
+
+bool ECCEventQueue::setAside(const std::string& path, const std::string& why) {
+  _log.write(LogLevel::Error, why);
+  if (std::rename(path.c_str(), (path + ".unusable").c_str()) == 0 || errno == ENOENT) {
+    return true;
+  }
+  _log.write(LogLevel::Error, path + ": " + std::strerror(errno));
+  return false;
+}
+
+}  // namespace vesprun

@@ -1,0 +1,165 @@
+#include "platform/host/HostDeviceRegistry.h"
+
+#include "platform/RegistryObject.h"
+#include "support/ControllerTest.h"
+
+namespace vesprun {
+namespace {
+
+using testing::ElementsAre;
+using Direction = DeviceRegistry::SearchDirection;
+
+class HostDeviceRegistryTest : public ControllerTest {
+ protected:
+  DeviceRegistry& registry() { return device().platform().deviceRegistry(); }
+  RegistryObject matching(const std::string& className) {
+    return RegistryObject(registry().DevRegServiceGetMatchingService(className));
+  }
+  RegistryHandle opened(const std::string& className) {
+    RegistryHandle connection = 0;
+    EXPECT_EQ(registry().DevRegServiceOpen(matching(className).get(), connection), 0u);
+    return connection;
+  }
+};
+
+TEST_F(HostDeviceRegistryTest, WalksParentsBeforeChildren) {
+  start(R"({"class": "A", "properties": {"own": 1, "shared": "a"}, "children": [
+             {"class": "B", "matching": false, "conformsTo": ["Base"], "children": [
+               {"class": "C", "properties": {"deep": 3, "shared": "c"}}]},
+             {"class": "D", "conformsTo": ["Base"], "properties": {"deep": 4}}]},
+           {"class": "E"})");
+  const char* const classes[] = {"A", "B", "C", "D", "E"};
+  const auto below = [&](RegistryHandle entry) {
+    const RegistryObject iterator(registry().DevRegRegistryEntryCreateIterator(entry));
+    std::string names;
+    while (const RegistryObject object{registry().DevRegIteratorNext(iterator.get())}) {
+      for (const char* name : classes) {
+        names += registry().DevRegObjectConformsTo(object.get(), name) ? name : "";
+      }
+    }
+    return names;
+  };
+  EXPECT_EQ(below(RegistryObject(registry().DevRegRegistryGetRootEntry()).get()), "ABCDE");
+  EXPECT_EQ(below(matching("A").get()), "BCD");
+  EXPECT_EQ(below(matching("E").get()), "");
+  EXPECT_FALSE(matching("B"));
+  EXPECT_EQ(below(matching("Base").get()), "");  // D: B is hidden
+  EXPECT_EQ(registry().DevRegRegistryEntryCreateIterator(4711), 0u);
+
+  const auto search = [&](const char* from, const char* key, Direction direction) {
+    return registry().DevRegRegistryEntrySearchProperty(matching(from).get(), key, direction);
+  };
+  EXPECT_EQ(search("C", "own", Direction::Parents), PropertyValue(1));
+  EXPECT_EQ(search("C", "shared", Direction::Parents), PropertyValue("c"));
+  EXPECT_EQ(search("D", "shared", Direction::Parents), PropertyValue("a"));
+  EXPECT_EQ(search("A", "deep", Direction::Children), PropertyValue(3));
+  EXPECT_EQ(search("A", "deep", Direction::Parents), std::nullopt);
+  EXPECT_EQ(search("D", "shared", Direction::Children), std::nullopt);
+}
+
+TEST_F(HostDeviceRegistryTest, DriverChecksWhatItIsSent) {
+  const std::string answers =
+      R"({"opcode": 13, "argument": 2, "kind": 3, "file": "statistics.bin"})";
+  start(controller("ORUStorage", answers,
+                   R"(, "contentDeletion": {"value": 258, "length": 2},
+                       "scalarMethods": {"3": {"LPEM": 5}})") +
+        ',' + controller("QuillQNS3NVMeController", answers) + ',' +
+        controller("Own", answers, R"(, "contentDeletion": {"value": 1})"));
+  const RegistryHandle storage = opened("ORUStorage");
+  const RegistryHandle express = opened("QuillQNS3NVMeController");
+  const RegistryHandle own = opened("Own");
+  const auto request = [](std::uint8_t flags, std::uint8_t argument, std::uint8_t opcode = 13) {
+    Bytes bytes(24);
+    bytes[0] = opcode;
+    bytes[4] = flags;
+    bytes[8] = argument;
+    bytes[12] = bytes[16] = 0xAA;  // not looked at
+    return bytes;
+  };
+  constexpr std::uint8_t kKind = 3 << 2;
+  struct Case {
+    RegistryHandle connection;
+    std::uint32_t method;
+    Bytes input;
+    std::size_t capacity;
+    RegistryResult result;
+    std::uint64_t length;
+  };
+  constexpr RegistryResult kBad = 0xE00002C2;
+  const Case cases[] = {
+      {storage, 8, request(kKind | 1, 2), 4, 0, 4},
+      {storage, 8, request(kKind | 3, 2), 100, 0, 4},  // the flag in bit 1 selects nothing
+      {storage, 8, request(kKind, 2), 48, 0, 48},
+      {storage, 8, request(kKind, 2), 64, 0, 48},
+      {storage, 8, request(kKind | 1, 2), 3, kBad, 9},
+      {storage, 8, request(kKind, 2), 47, kBad, 9},
+      {storage, 8, request(1, 2), 4, kBad, 9},
+      {storage, 8, request(kKind | 1, 1), 4, kBad, 9},
+      {storage, 8, request(kKind | 1, 2, 14), 4, kBad, 9},
+      {storage, 8, Bytes(23), 4, kBad, 9},
+      {storage, 8, Bytes(25), 4, kBad, 9},
+      {storage, 9, request(kKind | 1, 2), 4, kBad, 9},
+      {express, 9, request(kKind | 1, 2), 4, 0, 4},
+      {express, 8, request(kKind | 1, 2), 4, kBad, 9},
+      {own, 8, request(kKind | 1, 2), 4, kBad, 9},
+      {storage, 5, {}, 4, 0, 2},
+      {storage, 5, {}, 3, kBad, 9},
+      {storage, 5, {1}, 4, kBad, 9},
+      {express, 5, {}, 4, kBad, 9},
+      {own, 5, {}, 4, kBad, 9},
+      {4711, 8, request(kKind | 1, 2), 4, kBad, 9},
+  };
+  for (const Case& call : cases) {
+    Bytes output(call.capacity);
+    std::uint64_t length = 9;
+    EXPECT_EQ(registry().DevRegConnectCallStructMethod(call.connection, call.method, call.input,
+                                                       output, length),
+              call.result);
+    EXPECT_EQ(length, call.length) << &call - cases;
+    if (call.result == 0 && call.input.empty()) {
+      EXPECT_THAT(output, ElementsAre(2, 1, 0, 0));
+    } else if (call.result == 0 && (call.input[4] & 1) != 0) {
+      EXPECT_EQ(Bytes(output.begin(), output.begin() + 4), (Bytes{48, 0, 0, 0}));
+    }
+  }
+  std::uint64_t answer = 0;
+  EXPECT_EQ(registry().DevRegConnectCallScalarMethod(storage, 3, 0x4C50454D, answer), 0u);
+  EXPECT_EQ(answer, 5u);
+  EXPECT_EQ(registry().DevRegConnectCallScalarMethod(storage, 3, 0x1'4C50454D, answer), 0xE00002BC);
+  EXPECT_EQ(registry().DevRegConnectCallScalarMethod(storage, 3, 1, answer), 0xE00002BC);
+  EXPECT_EQ(registry().DevRegConnectCallScalarMethod(storage, 7, 0x4C50454D, answer), kBad);
+  for (const RegistryHandle connection : {storage, express, own}) {
+    EXPECT_EQ(registry().DevRegServiceClose(connection), 0u);
+  }
+}
+
+TEST_F(HostDeviceRegistryTest, HandlesAreCounted) {
+  start(R"({"class": "Bare"}, )" + controller("ORUStorage", "", R"(, "closeError": 7)") + ", " +
+        controller("Refusing", "", R"(, "openError": 8)"));
+  HostDeviceRegistry& described = device().platform().describedRegistry();
+  RegistryHandle connection = 5;
+  EXPECT_EQ(registry().DevRegServiceOpen(matching("Bare").get(), connection), 0xE00002C2);
+  EXPECT_EQ(registry().DevRegServiceOpen(matching("Refusing").get(), connection), 8u);
+  EXPECT_EQ(connection, 0u);
+  connection = opened("ORUStorage");
+  EXPECT_EQ(described.openConnections(), 1u);
+  EXPECT_EQ(registry().DevRegServiceClose(connection), 7u);
+  EXPECT_EQ(described.openConnections(), 0u);
+  EXPECT_NE(registry().DevRegServiceClose(0), 0u);
+  {
+    const RegistryObject first = matching("Bare");
+    const RegistryObject second = matching("Bare");
+    EXPECT_NE(first.get(), second.get());
+    EXPECT_EQ(described.openObjects(), 2u);
+  }
+  registry().DevRegObjectRelease(0);
+  expectNothingHeld();
+
+  HostDeviceRegistry other({}, device().platform().directory(), device().platform().systemLog());
+  other.DevRegServiceClose(connection);
+  other.DevRegObjectRelease(connection);
+  EXPECT_EQ(other.falseReleases(), 2u);
+}
+
+}  // namespace
+}  // namespace vesprun

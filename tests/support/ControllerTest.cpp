@@ -1,0 +1,52 @@
+#include "support/ControllerTest.h"
+
+#include "NANDInfo/APIErrorMessage.h"
+#include "NANDInfo/NandExporter.h"
+#include "platform/host/HostDeviceRegistry.h"
+#include "platform/host/StatisticsBufferBuilder.h"
+
+namespace vesprun {
+
+ControllerTest::ControllerTest() {
+  forgetAPIErrorMessage();
+  forgetNandExporterHandles();
+}
+
+ControllerTest::~ControllerTest() {
+  if (_device) {
+    expectNothingHeld();
+  }
+}
+
+HostPlatform& ControllerTest::start(const std::string& registry, const std::string& others,
+                                    const std::string& clock) {
+  _device.reset();
+  _device.emplace(R"({"clock": ")" + clock + R"(", "logLevel": "debug", "registry": [)" + registry +
+                  ']' + others + '}');
+  StatisticsBufferBuilder statistics;
+  statistics.add(53, {17}).add(4, {1000}).add(11, {3});
+  const Bytes& bytes = statistics.bytes();
+  _device->write("statistics.bin", std::string(bytes.begin(), bytes.end()));
+  return _device->platform();
+}
+
+void ControllerTest::expectNothingHeld() {
+  const HostDeviceRegistry& registry = _device->platform().describedRegistry();
+  EXPECT_EQ(registry.openObjects(), 0u);
+  EXPECT_EQ(registry.openConnections(), 0u);
+  EXPECT_EQ(registry.falseReleases(), 0u);
+}
+
+std::string ControllerTest::errorsOf(const std::function<void()>& action) {
+  testing::internal::CaptureStderr();
+  action();
+  return testing::internal::GetCapturedStderr();
+}
+
+std::string controller(const std::string& className, const std::string& tunnel,
+                       const std::string& userClient) {
+  return R"({"class": ")" + className + R"(", "userClient": {"tunnel": [)" + tunnel + ']' +
+         userClient + "}}";
+}
+
+}  // namespace vesprun

@@ -1,0 +1,43 @@
+#pragma once
+
+#include <gmock/gmock.h>
+
+#include <functional>
+#include <optional>
+#include <string>
+
+#include "support/TestDevice.h"
+
+namespace vesprun {
+
+/// A test of what talks to the storage controller. When it ends, every handle has been given back.
+class ControllerTest : public ::testing::Test {
+ protected:
+  ControllerTest();
+  ~ControllerTest() override;
+
+  /// A device with this registry (the inside of the array) and these other entries (with a comma
+  /// before each), whose clock stands at `clock`, on the odd day 19787 unless told otherwise. In it
+  /// "statistics.bin" is a small buffer that both statistics parsers take.
+  HostPlatform& start(const std::string& registry, const std::string& others = "",
+                      const std::string& clock = "2024-03-05T09:15:02Z");
+
+  TestDevice& device() { return *_device; }
+  /// Expects that nothing is held that the registry gave out, and nothing was given back twice.
+  void expectNothingHeld();
+  /// What `action` writes to the standard error stream.
+  static std::string errorsOf(const std::function<void()>& action);
+
+ private:
+  std::optional<TestDevice> _device;
+};
+
+/// A registry entry of a class with these tunnel answers (the inside of the array) and other
+/// entries of its user client.
+std::string controller(const std::string& className, const std::string& tunnel = "",
+                       const std::string& userClient = "");
+
+/// The answer that "statistics.bin" is.
+inline const std::string kStatisticsAnswer = R"({"opcode": 13, "file": "statistics.bin"})";
+
+}  // namespace vesprun
