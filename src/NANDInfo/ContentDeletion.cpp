@@ -1,0 +1,42 @@
+#include "NANDInfo/ContentDeletion.h"
+
+#include <array>
+#include <cstdint>
+#include <cstdio>
+
+#include "NANDInfo/NandExporter.h"
+#include "common/LittleEndian.h"
+#include "platform/RegistryObject.h"
+
+namespace vesprun {
+
+bool NandRecommendsContentDeletion() {
+  DeviceRegistry& registry = platform().deviceRegistry();
+  nand_exporter_t* exporter = nullptr;
+  const RegistryObject service(findNandExporter(exporter));
+  if (exporter->contentDeletionMethod == kMethodNotOffered) {
+    return false;
+  }
+  if (!service) {
+    std::fputs("_load_nand_infoCould not get matching DevRegKit service for exporting classes\n",
+               stderr);
+    return false;
+  }
+  RegistryHandle connection = 0;
+  if (registry.DevRegServiceOpen(service.get(), connection) != kRegistrySuccess) {
+    std::fputs("Could not get connection to service\n", stderr);
+    return false;
+  }
+  std::array<std::uint8_t, 4> answer{};
+  std::uint64_t length = 0;
+  const bool recommends =
+      registry.DevRegConnectCallStructMethod(connection, exporter->contentDeletionMethod, {},
+                                             answer, length) == kRegistrySuccess &&
+      length >= answer.size() && loadLittleEndian<std::uint32_t>(answer.data()) != 0;
+  if (registry.DevRegServiceClose(connection) != kRegistrySuccess) {
+    std::fputs("Could not close connection to service\n", stderr);
+  }
+  return recommends;
+}
+
+}  // namespace vesprun

@@ -1,0 +1,24 @@
+#pragma once
+
+#include <cstdint>
+#include <span>
+#include <string_view>
+
+#include "common/PropertyValue.h"
+
+namespace vesprun {
+
+/// Logs a controller's telemetry list as one structured record of type 176 for each NAND bus, all
+/// numbers signed 32-bit: wear figures of the bus, then its decoded counters.
+///
+/// `characteristics` is the controller's dictionary: "chip-id" (at most 63 bytes) and
+/// "manufacturer-id" (hexadecimal digits; digits that are not there count as none) select the
+/// layout of the counters, "num-bus" the number of buses. With 0 buses, or fewer, there is nothing
+/// to log. `className` is not used.
+///
+/// False, with a line on the standard error stream and nothing logged, when a characteristic is
+/// missing or unusable or when the buffer does not hold all buses.
+bool LogNANDTelemetryList(std::span<const std::uint8_t> buffer,
+                          const PropertyValue* characteristics, std::string_view className);
+
+}  // namespace vesprun

@@ -1,0 +1,218 @@
+#include "NANDInfo/APIErrorMessage.h"
+#include "NANDInfo/EANQueries.h"
+#include "NANDInfo/NANDInfo.h"
+#include "support/ControllerTest.h"
+#include "support/WatchedRegistry.h"
+
+namespace vesprun {
+namespace {
+
+const std::string kUsable = controller("QuillQNS3NVMeController", kStatisticsAnswer);
+const PropertyDict kUnableToParse{{"com.quill.NANDInfo.Error", "1"},
+                                  {"com.quill.NANDInfo.ErrorMessage", "Unable to parse buffer"}};
+
+std::string session(const std::string& identifier) {
+  return R"(, "kernel": {"variables": {"kern.bootsessionuuid": )" + identifier + "}}";
+}
+
+class CopyNANDInfoTest : public ControllerTest {};
+
+TEST_F(CopyNANDInfoTest, DayParityFollowsTheBootSession) {
+  const std::pair<std::string, bool> onOddDay[] = {
+      {"\"7A\"", true},  {"\"0A\"", false},        {"\"9\"", true},
+      {"\"A1\"", false}, {"\"B1\"", true},         {"\"F0\"", true},
+      {"\"b1\"", false}, {"\"G\"", false},         {"\":\"", false},
+      {"\"\"", false},   {"{\"u32\": 55}", false}, {'"' + std::string(100, '7') + '"', false}};
+  for (const auto& [identifier, all] : onOddDay) {
+    start("", session(identifier));
+    EXPECT_EQ(NandInfoShouldLogAllToEH(), all) << identifier;
+  }
+}
+
+TEST_F(CopyNANDInfoTest, EvenDayTurnsTheParityRound) {
+  for (const auto& [identifier, all] :
+       {std::pair{"\"7\"", false}, std::pair{"\"A\"", true}, std::pair{"\"b\"", true}}) {
+    start("", session(identifier), "2022-01-08T12:00:00Z");  // day 19000
+    EXPECT_EQ(NandInfoShouldLogAllToEH(), all) << identifier;
+  }
+}
+
+TEST_F(CopyNANDInfoTest, PurgeableSpace) {
+  struct Case {
+    std::string others;
+    PropertyDict info;
+    std::string error = "NA";
+  };
+  const Case cases[] = {
+      {"", {}},
+      {R"(, "purgeable": null)",
+       {},
+       "getReclaimerInfo: unable to get output from ReclaimerCopyItemizedPurgeableSpaceWithInfo"},
+      {R"(, "purgeable": {}, "logBlacklist": [])", {}},
+      {R"(, "purgeable": {"RECLAIMER_TOTAL_AVAILABLE": 5, "Other": 1})",
+       {{"HLT_Reclaimer_totalPurgeable", 5}}},
+      {R"(, "purgeable": {"RECLAIMER_NONPURGEABLE_AMOUNT": 6, "RECLAIMER_TOTAL_AVAILABLE": 5})",
+       {{"HLT_Reclaimer_totalPurgeable", 5}, {"HLT_Reclaimer_totalNonPurgeable", 6}}},
+      {R"(, "purgeable": {"RECLAIMER_TOTAL_AVAILABLE": 5,
+                          "com.quill.NANDInfo.Reclaimer.Error": 1})",
+       {}},
+  };
+  for (const Case& given : cases) {
+    forgetAPIErrorMessage();
+    start(kUsable, given.others);
+    EXPECT_EQ(getReclaimerInfo(), given.info) << given.others;
+    EXPECT_EQ(GetAPIErrorMessage(), given.error);
+    const PropertyDict info = CopyNANDInfo();
+    const PropertyValue* purgeable = info.find("com.quill.NANDInfo.Reclaimer.TotalPurgeableBytes");
+    const PropertyValue* fixed = info.find("com.quill.NANDInfo.Reclaimer.TotalNonPurgeableBytes");
+    EXPECT_EQ(purgeable != nullptr, given.info.contains("HLT_Reclaimer_totalPurgeable"));
+    EXPECT_EQ(fixed != nullptr, given.info.contains("HLT_Reclaimer_totalNonPurgeable"));
+    EXPECT_EQ(info.find("com.quill.NANDInfo.ExportVersion")->number()->asUInt64(), 17u);
+  }
+}
+
+TEST_F(CopyNANDInfoTest, DailyLogHasItOnOtherDays) {
+  const auto defaultLines = [&] {
+    std::vector<std::string> lines;
+    for (const std::string& line : device().log()) {
+      if (line.starts_with("default: ")) {
+        lines.push_back(line);
+      }
+    }
+    return lines;
+  };
+  start(kUsable, session("\"7\""));
+  EXPECT_EQ(CopyNANDInfoWithOptions({}), PropertyDict());
+  EXPECT_TRUE(device().log().empty());
+
+  start(kUsable, session("\"8\""));
+  EXPECT_EQ(CopyNANDInfoWithOptions({}), CopyNANDInfo());
+  const std::vector<std::string> lines{
+      "default: NANDInfo: CopyNANDInfoWithOptions: obtaining FTL data for TLYD\n",
+      "default: NANDInfo: CopyNANDInfoWithOptions: returning TLYD dictionary\n"};
+  EXPECT_EQ(defaultLines(), lines);
+
+  start("", session("\"8\""));
+  EXPECT_EQ(CopyNANDInfoWithOptions({}), kUnableToParse);
+  EXPECT_EQ(GetAPIErrorMessage(), "NA");
+}
+
+TEST_F(CopyNANDInfoTest, DumpAddsToWhatIsThere) {
+  start(kUsable);
+  PropertyDict info{{"com.quill.NANDInfo.NumLogicalWrites", "old"}, {"mine", 1}};
+  DumpNANDInfo(info);
+  EXPECT_EQ(*info.find("com.quill.NANDInfo.NumLogicalWrites"), PropertyValue(1000));
+  EXPECT_EQ(*info.find("mine"), PropertyValue(1));
+  EXPECT_FALSE(info.contains("com.quill.NANDInfo.ExportVersion"));
+  EXPECT_FALSE(info.contains("com.quill.NANDInfo.DemoMode"));
+
+  start("");
+  PropertyDict untouched{{"mine", 1}};
+  DumpNANDInfo(untouched);
+  EXPECT_EQ(untouched, (PropertyDict{{"mine", 1}}));
+}
+
+TEST_F(CopyNANDInfoTest, RawFTLFields) {
+  start(kUsable);
+  EXPECT_EQ(CopyNANDFTLInfo(false, 0), std::nullopt);
+  EXPECT_EQ(GetAPIErrorMessage(), "NA");
+  const std::optional<PropertyDict> fields = CopyNANDFTLInfo(true, 1);
+  ASSERT_TRUE(fields);
+  EXPECT_EQ(*fields->find("Stat_11"), PropertyValue(3));
+  EXPECT_EQ(*fields->find("HLT_APIErrorMessage"), PropertyValue("Stat Magazine not supported"));
+
+  forgetAPIErrorMessage();
+  start("");
+  EXPECT_EQ(CopyNANDFTLInfo(false, 1), std::nullopt);
+  EXPECT_EQ(GetAPIErrorMessage(), "gatherORUFTLData: Could not get nand_exporter_t");
+}
+
+TEST_F(CopyNANDInfoTest, StoredImages) {
+  constexpr std::uint32_t kCode = 0x4C50454D;
+  struct Case {
+    std::string registry;
+    std::uint64_t size;
+    std::uint64_t updates;
+    std::vector<std::string> log;
+  };
+  const auto service = [](const std::string& userClient) {
+    return R"({"class": "QuillNVMeEAN", "userClient": {)" + userClient + "}}";
+  };
+  const std::string unable =
+      ": Unable to get EAN Io service connection for key (1280329037): LPEM\n";
+  const std::string none = "default: getEANConnection: Couldn't find QuillNVMeEAN object\n";
+  const std::string refused =
+      "default: getEANConnection: DevRegServiceOpen on QuillNVMeEAN failed kernResult:e00002c5\n";
+  const Case cases[] = {
+      {service(R"("scalarMethods": {"3": {"LPEM": 4294967297}, "7": {"LPEM": 8}})"),
+       0x1'0000'0001,
+       8,
+       {}},
+      {service(R"("closeError": 1, "scalarMethods": {"3": {"dBIC": 1}})"),
+       0,
+       0,
+       {"default: GetImageSize: DevRegConnectCallMethod failed (key (1280329037): LPEM) "
+        "kernResult:e00002bc\n",
+        "default: GetUpdateCount: DevRegConnectCallMethod failed (key (1280329037): LPEM) "
+        "kernResult:e00002c2\n"}},
+      {"",
+       0,
+       0,
+       {none, "default: GetEANImageSize" + unable, none, "default: GetEANUpdateCount" + unable}},
+      {service(R"("openError": 3758097093)"),
+       0,
+       0,
+       {refused, "default: GetEANImageSize" + unable, refused,
+        "default: GetEANUpdateCount" + unable}},
+  };
+  for (const Case& given : cases) {
+    start(given.registry);
+    EXPECT_EQ(GetEANImageSize(kCode), given.size);
+    EXPECT_EQ(GetEANUpdateCount(kCode), given.updates);
+    EXPECT_EQ(device().log(), given.log);
+    expectNothingHeld();
+  }
+}
+
+TEST_F(CopyNANDInfoTest, AnyFailingCallLeavesNothingOpen) {
+  const std::string registry =
+      R"({"class": "Bus", "children": [{"class": "QuillNVMeEAN", "userClient":
+          {"scalarMethods": {"3": {"LPEM": 1}}}}]},)" +
+      controller("QuillQNS3NVMeController",
+                 kStatisticsAnswer + R"(, {"opcode": 221, "file": "statistics.bin"})") +
+      R"(, {"matching": false, )" + controller("ORUStorage").substr(1);
+  const std::function<void()> operations[] = {
+      [] { CopyNANDInfo(); },
+      [] {
+        PropertyDict info;
+        DumpNANDInfo(info);
+      },
+      [] { CopyNANDFTLInfo(false, 1); },
+      [] { gatherORUFTLData(false, false, 4); },
+      [] { gatherORUMSPData(); },
+      [] { GetEANImageSize(0x4C50454D); },
+      [] {
+        ORUConnection connection;
+        openORUConnection(connection);
+        closeORUConnection(connection);
+      },
+      [] {
+        platform().deviceRegistry().DevRegObjectRelease(FindServiceUsingIterator("ORUStorage"));
+      },
+  };
+  WatchedRegistry watched(start(registry));
+  for (const std::function<void()>& operation : operations) {
+    std::size_t failing = 0;
+    errorsOf([&] {
+      do {
+        watched.failCall(++failing);
+        operation();
+        expectNothingHeld();
+      } while (watched.calls().size() >= failing);
+    });
+    EXPECT_GT(failing, 3u);
+  }
+}
+
+}  // namespace
+}  // namespace vesprun

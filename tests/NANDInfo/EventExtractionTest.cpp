@@ -1,0 +1,237 @@
+#include "NANDInfo/EventExtraction.h"
+
+#include <gmock/gmock.h>
+
+#include "NANDInfo/ContentDeletion.h"
+#include "NANDInfo/EventFields.h"
+#include "NANDInfo/MagazineDeltas.h"
+#include "NANDInfo/MagazineEvents.h"
+#include "NANDInfo/MagazineHistory.h"
+#include "NANDInfo/StatisticsDevice.h"
+#include "NANDInfo/WhitelistedFieldSets.h"
+#include "support/WatchedRegistry.h"
+
+namespace vesprun {
+namespace {
+
+using testing::ElementsAreArray;
+
+const std::string kPrefix = "com.quill.massStorage.NANDInfo.";
+const char* const kErrorMessage = "com.quill.NANDInfo.ErrorMessage";
+
+const std::string kOtherServices = R"(, {"class": "QuillNVMeEAN", "userClient": {"scalarMethods":
+    {"3": {"dBIC": 1, "dLTH": 1}, "7": {"ifw1": 2, "dBIC": 1, "dLTH": 1, "dCfg": 1, "fCfg": 1,
+     "nefw": 1, "LPEM": 1}}}},
+    {"class": "DevRegDTNVRAMDiags", "properties": {"Generation": 1234}})";
+
+class EventExtractionTest : public StatisticsDevice {
+ protected:
+  /// A controller with three MSPs, everything that the events are made from and a magazine.
+  void startWithMagazine(const std::string& others = "") {
+    const auto statistics = [](std::uint64_t hours) {
+      return StatisticsBufferBuilder()
+          .add(4, {9000 - hours})
+          .add(680, {1, 2, 3})
+          .add(235, {1, 0, 0, 0, 0, 0, 0, 0})
+          .add(677, {(2'000'000'000 - hours * 3600) << 24})
+          .bytes();
+    };
+    answer(13, 0, statistics(0));
+    for (const std::uint32_t hours : {0U, 4U, 8U, 12U, 16U, 20U, 24U, 168U, 720U}) {
+      answer(10, hours, statistics(hours));
+    }
+    for (std::uint32_t msp = 0; msp < 3; ++msp) {
+      answer(221, msp, MSPBufferBuilder().add(8202, {msp + 40}).bytes());
+    }
+    startController("QuillQNS3NVMeController", others, kOtherServices);
+  }
+
+  std::vector<std::string> events() {
+    std::vector<std::string> names;
+    for (const PropertyDict& line : device().lines("events.jsonl")) {
+      names.push_back(line.find("event")->string()->substr(kPrefix.size()));
+    }
+    return names;
+  }
+  /// The messages of default level, one behind the other.
+  std::string log() {
+    constexpr std::string_view kLevel = "default: ";
+    std::string text;
+    for (const std::string& line : device().log()) {
+      text += line.starts_with(kLevel) ? line.substr(kLevel.size()) : "";
+    }
+    return text;
+  }
+};
+
+const std::vector<std::string> kAllEvents{"FTLCounters_1",           "FTLHistograms_1",
+                                          "FTLHistograms_2",         "MSPCounters_1",
+                                          "MSPCounters_1",           "MSPCounters_1",
+                                          "StorageStats_1",          "NORWrites",
+                                          "SM.Daily.FTLCounters_1",  "SM.WeeklyMA.FTLCounters_1",
+                                          "SM.Monthly.FTLCounters_1"};
+
+TEST_F(EventExtractionTest, AllStepsSendTheirEvents) {
+  startWithMagazine();
+  const std::optional<PropertyDict> results = NandInfoExtractToEH_runAllSteps(7, true, 1, 0);
+  ASSERT_TRUE(results);
+  EXPECT_THAT(events(), ElementsAreArray(kAllEvents));
+
+  const std::vector<PropertyDict> lines = device().lines("events.jsonl");
+  const auto payload = [&](std::size_t i) { return *lines[i].find("payload")->dict(); };
+  for (std::size_t i = 0; i < lines.size(); ++i) {
+    const FieldTable* fields = fieldsOfEvent(*lines[i].find("event")->string());
+    for (const auto& [key, value] : payload(i)) {
+      EXPECT_TRUE(fields == nullptr || fields->contains(key) || key == "msp_index" ||
+                  key == "total_nof_msps")
+          << kAllEvents[i] << ' ' << key;
+    }
+  }
+  EXPECT_EQ(*payload(0).find("hostWrites"), PropertyValue(9000));
+  EXPECT_FALSE(payload(0).contains("HLT_APIErrorMessage"));
+  EXPECT_EQ(*payload(1).find("gracefulBootTimeLogMs_0"), PropertyValue(1));
+  EXPECT_EQ(*payload(5).find("fw_updates"), PropertyValue(42));
+  EXPECT_EQ(*payload(5).find("msp_index"), PropertyValue("2"));
+  EXPECT_EQ(*payload(5).find("total_nof_msps"), PropertyValue(3));
+  EXPECT_EQ(*payload(6).find("EAN_updateCount_FW"), PropertyValue(2));
+  EXPECT_EQ(*payload(8).find("hostWrites"), PropertyValue(24.0));
+  EXPECT_EQ(*payload(8).find("HLT_instantaneous_gc_wamp_5"), PropertyValue(0));
+  EXPECT_FALSE(payload(9).contains("HLT_instantaneous_gc_wamp_5"));
+  EXPECT_EQ(*payload(9).find("HLT_SM_deltaDays"), PropertyValue(7.0));
+  EXPECT_EQ(*payload(10).find("HLT_SM_deltaDays"), PropertyValue(30.0));
+
+  EXPECT_EQ(*results->find("hostWrites"), PropertyValue(720.0));
+  EXPECT_EQ(*results->find("norwrites"), PropertyValue(1234));
+  EXPECT_EQ(*results->find("msp_index"), PropertyValue(payload(5)));
+  EXPECT_EQ(*results->find(kErrorMessage),
+            PropertyValue("executeTunnelCommand: DevRegConnectCallStructMethod failed while "
+                          "retrieving data size"))
+      << "the count of MSPs ends at an error";
+}
+
+constexpr const char* kLog = R"(NANDInfo: NandInfoExtractToEH_runStep: logging FTL big view
+NANDInfo: createAndLogFTLStatFieldsToEventHubForEvent: @FTLCounters_1 enabled=0
+NANDInfo: createAndLogFTLStatFieldsToEventHubForEvent: SUCCESS in logging massStorage_NANDInfo_FTLCounters_1 using EventHubSendEventLazy
+NANDInfo: createAndLogFTLStatFieldsToEventHubForEvent: @FTLHistograms_1 enabled=0
+NANDInfo: createAndLogFTLStatFieldsToEventHubForEvent: FAILED to log massStorage_NANDInfo_FTLHistograms_1 using EventHubSendEventLazy
+NANDInfo: createAndLogFTLStatFieldsToEventHubForEvent: @FTLHistograms_2 enabled=0
+NANDInfo: NandInfoExtractToEH_runStep: successfully logged FTL big view
+NANDInfo: NandInfoExtractToEH_runStep: logging MSP stats
+NANDInfo: createAndLogMSPFieldsToEventHubForEvent: @MSPCounters_1 enabled=1
+NANDInfo: createAndLogMSPFieldsToEventHubForEvent: SUCCESS in logging massStorage_NANDInfo_MSPCounters_1 using EventHubSendEventLazy
+NANDInfo: createAndLogMSPFieldsToEventHubForEvent: SUCCESS in logging massStorage_NANDInfo_MSPCounters_1 using EventHubSendEventLazy
+NANDInfo: createAndLogMSPFieldsToEventHubForEvent: SUCCESS in logging massStorage_NANDInfo_MSPCounters_1 using EventHubSendEventLazy
+NANDInfo: createAndLogMSPFieldsToEventHubForEvent: @MSPCounters_1 completed (total_nof_msps:3)
+NANDInfo: NandInfoExtractToEH_runStep: successfully logged MSP stats
+NANDInfo: NandInfoExtractToEH_runStep: logging storage stats
+NANDInfo: createAndLogStorageStatsToEventHubForEvent: @StorageStats_1 enabled=0
+NANDInfo: createAndLogStorageStatsToEventHubForEvent: SUCCESS in logging massStorage_NANDInfo_StorageStats_1 using EventHubSendEventLazy
+NANDInfo: NandInfoExtractToEH_runStep: successfully logged storage stats
+NANDInfo: NandInfoExtractToEH_runStep: logging NVRAM stat
+NANDInfo: NandInfoExtractToEH_runStep: successfully logged NVRAM stat
+NANDInfo: NandInfoExtractToEH_runStep: logging FTL statsMag daily
+NANDInfo: createAndLogSMagFTLFieldsToEventHubForEvent: @SM.Daily.FTLCounters_1 enabled=0
+NANDInfo: createAndLogSMagFTLFieldsToEventHubForEvent: FAILED to log @SM.Daily.FTLCounters_1 using EventHubSendEventLazy
+NANDInfo: NandInfoExtractToEH_runStep: successfully logged FTL statsMag daily
+NANDInfo: NandInfoExtractToEH_runStep: logging FTL statsMag weekly
+NANDInfo: createAndLogSMagFTLFieldsToEventHubForEvent: @SM.WeeklyMA.FTLCounters_1 enabled=0
+NANDInfo: createAndLogSMagFTLFieldsToEventHubForEvent: SUCCESS in logging @SM.WeeklyMA.FTLCounters_1 using EventHubSendEventLazy
+NANDInfo: NandInfoExtractToEH_runStep: successfully logged FTL statsMag weekly
+Skipping Stats Mag Monthly Delta)";
+
+TEST_F(EventExtractionTest, LogsEveryStepWhateverIsTaken) {
+  startWithMagazine(R"(, "events": {"used": [")" + kPrefix + R"(MSPCounters_1"], "fails": [")" +
+                    kPrefix + R"(FTLHistograms_1", ")" + kPrefix + R"(SM.Daily.FTLCounters_1"]})");
+  const std::optional<PropertyDict> results = NandInfoExtractToEH_runAllSteps(0, false, 1, 0);
+  std::string expected = kLog;
+  for (std::size_t at = 0; (at = expected.find('@', at)) != std::string::npos;) {
+    expected.replace(at, 1, kPrefix);
+  }
+  EXPECT_EQ(log(), expected);
+  EXPECT_EQ(events().size(), 3u);
+  EXPECT_FALSE(results->contains("gracefulBootTimeLogMs_0"));
+  EXPECT_EQ(*results->find("hostWrites"), PropertyValue(168.0));
+}
+
+TEST_F(EventExtractionTest, StepsThatCannotSend) {
+  struct Case {
+    std::string others;
+    std::uint32_t firstStep;
+    std::string error;
+    std::string log;
+  };
+  const std::string skipping = "Skipping Stats Mag Monthly Delta";
+  const std::string step = "NANDInfo: NandInfoExtractToEH_runStep: ";
+  const Case cases[] = {
+      {R"(, "events": {"available": false})", 0, "NA", skipping},
+      {"", 6, "NA", skipping},
+      {"", 7, "NANDInfo: unable to log FTL counters to EH",
+       step + "logging FTL counters\n" + step + "unable to log FTL counters\n"},
+      {"", 8, "NA", ""},
+      {"", 0xFFFF'FFFF, "NA", ""},
+  };
+  for (const Case& given : cases) {
+    startWithMagazine(given.others);
+    EXPECT_EQ(NandInfoExtractToEH_runAllSteps(0, false, 1, given.firstStep),
+              (PropertyDict{{kErrorMessage, given.error}}));
+    EXPECT_EQ(log(), given.log);
+    EXPECT_TRUE(events().empty());
+  }
+  startWithMagazine();
+  EXPECT_EQ(NandInfoExtractToEH_runAllSteps(0, true, 0, 0), std::nullopt);
+  EXPECT_THAT(events(), ElementsAreArray(kAllEvents));
+}
+
+TEST_F(EventExtractionTest, FailedMSPEventIsRecorded) {
+  for (std::uint32_t msp = 0; msp < 10; ++msp) {
+    answer(221, msp, MSPBufferBuilder().add(8202, {msp}).bytes());
+  }
+  answer(13, 0, StatisticsBufferBuilder().add(680, {1, 2, 3}).bytes());
+  startController("QuillQNS3NVMeController",
+                  R"(, "events": {"fails": [")" + kPrefix + R"(MSPCounters_1"]})");
+  EXPECT_FALSE(NandInfoExtractToEH_runAllSteps(0, false, 1, 1)->contains("msp_index"));
+  EXPECT_EQ(GetAPIErrorMessage(),
+            "createAndLogMSPFieldsToEventHubForEvent: EventHubSendEventLazy failed to log to EH");
+}
+
+TEST_F(EventExtractionTest, WithoutAController) {
+  start("");
+  EXPECT_EQ(createAndLogSMagFTLFieldsToEventHubForEvent(2),
+            (PropertyDict{{kErrorMessage, "Stats Magazine not supported"}}));
+  EXPECT_EQ(createAndLogSMagFTLFieldsToEventHubForEvent(3),
+            (PropertyDict{{kErrorMessage, "Wrong SM delta type"}}));
+  EXPECT_EQ(log(), "Unexpected SM delta type 3");
+  EXPECT_EQ(*NandInfoExtractToEH_runAllSteps(0, true, 1, 0)->find(kErrorMessage),
+            PropertyValue("gatherORUFTLData: Could not get nand_exporter_t"));
+  const std::vector<std::string> sent{"FTLCounters_1", "FTLHistograms_1", "FTLHistograms_2",
+                                      "StorageStats_1"};
+  EXPECT_THAT(events(), ElementsAreArray(sent));
+}
+
+TEST_F(EventExtractionTest, AnyFailingCallLeavesNothingOpen) {
+  const std::function<void()> operations[] = {
+      [] { CopyWhitelistedNANDMSPInfo(true); }, [] { CopyWhitelistedStorageStats(true); },
+      [] { CopySMagNANDFTLInfo(24, 1, 2); },    [] { CopySMagNANDFTLCustomHistoryInfo(0); },
+      [] { NandRecommendsContentDeletion(); },
+  };
+  for (const std::function<void()>& operation : operations) {
+    if (&operation == &operations[4]) {
+      start(controller("ORUStorage", "", R"(, "contentDeletion": {"value": 1})"));
+    } else {
+      startWithMagazine();
+    }
+    WatchedRegistry watched(device().platform());
+    std::size_t failing = 0;
+    errorsOf([&] {
+      do {
+        watched.failCall(++failing);
+        operation();
+        expectNothingHeld();
+      } while (watched.calls().size() >= failing);
+    });
+    EXPECT_GT(failing, 5u);
+  }
+}
+
+}  // namespace
+}  // namespace vesprun

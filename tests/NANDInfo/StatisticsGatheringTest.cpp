@@ -1,0 +1,177 @@
+#include <algorithm>
+
+#include "NANDInfo/APIErrorMessage.h"
+#include "NANDInfo/NANDInfo.h"
+#include "NANDInfo/parsers/ORUStatsContext.h"
+#include "platform/host/StatisticsBufferBuilder.h"
+#include "support/ControllerTest.h"
+#include "support/WatchedRegistry.h"
+
+namespace vesprun {
+namespace {
+
+const std::string kQNS3 = "QuillQNS3NVMeController";
+
+std::string textOf(const Bytes& bytes) { return {bytes.begin(), bytes.end()}; }
+
+class StatisticsGatheringTest : public ControllerTest {
+ protected:
+  /// The table entry of a class, which is as before when the test ends.
+  nand_exporter_t& entryForNow(std::size_t index) {
+    _saved.push_back({index, nand_exporters_tunnel[index]});
+    return nand_exporters_tunnel[index];
+  }
+  void TearDown() override {
+    for (const auto& [index, entry] : _saved) {
+      nand_exporters_tunnel[index] = entry;
+    }
+  }
+
+ private:
+  std::vector<std::pair<std::size_t, nand_exporter_t>> _saved;
+};
+
+TEST_F(StatisticsGatheringTest, FTLFieldsByParserSelectorAndController) {
+  StatisticsBufferBuilder magazine;
+  magazine.add(680, {1, 2, 3}).add(11, {9});
+  const std::string tunnel =
+      kStatisticsAnswer + R"(, {"opcode": 10, "argument": 24, "file": "magazine.bin"})";
+  const auto gather = [&](const std::string& className, bool byId, bool now) {
+    forgetAPIErrorMessage();
+    start(controller(className, tunnel));
+    device().write("magazine.bin", textOf(magazine.bytes()));
+    std::optional<PropertyDict> fields = gatherORUFTLData(byId, now, 24);
+    expectNothingHeld();
+    return fields;
+  };
+  const auto flags = [](std::int32_t isQNS1, std::int32_t hasMagazine) {
+    return PropertyDict{{"com.quill.NANDInfo.IsQNS1Controller", isQNS1},
+                        {"com.quill.NANDInfo.IsStatMagSupported", hasMagazine}};
+  };
+  PropertyDict expected{{"exportVersion", 17}, {"hostWrites", 1000}, {"uncleanBoots", 3}};
+  expected.merge(flags(0, 0));
+  EXPECT_EQ(gather(kQNS3, false, true), expected);
+  EXPECT_EQ(GetAPIErrorMessage(), "Stat Magazine not supported");
+
+  expected = {{"Stat_53", 17}, {"Stat_4", 1000}, {"Stat_11", 3}};
+  expected.merge(flags(1, 0));
+  EXPECT_EQ(gather("ORUStorage", true, true), expected);
+
+  expected = {{"magazineFWVersion_0", 1},
+              {"magazineFWVersion_1", 2},
+              {"magazineFWVersion_2", 3},
+              {"uncleanBoots", 9}};
+  expected.merge(flags(0, 1));
+  const std::optional<PropertyDict> snapshot = gather("QuillEmbeddedNVMeController", false, false);
+  EXPECT_EQ(snapshot, expected);
+  EXPECT_EQ(snapshot->find("uncleanBoots")->number()->kind(), NumberKind::UInt64);
+  EXPECT_EQ(GetAPIErrorMessage(), "NA");
+}
+
+TEST_F(StatisticsGatheringTest, FTLFailures) {
+  const auto expectFailure = [&](const std::string& registry, bool now, const std::string& error) {
+    forgetAPIErrorMessage();
+    WatchedRegistry watched(start(registry));
+    EXPECT_EQ(gatherORUFTLData(false, now, 0), std::nullopt);
+    EXPECT_EQ(GetAPIErrorMessage(), error);
+    expectNothingHeld();
+    const std::vector<std::string> operations = watched.operations();
+    const auto commands = std::count(operations.begin(), operations.end(), "struct");
+    return commands;
+  };
+  EXPECT_EQ(expectFailure("", true, "gatherORUFTLData: Could not get nand_exporter_t"), 0);
+  EXPECT_EQ(expectFailure(controller(kQNS3, R"({"opcode": 13, "size": 4})"), true,
+                          "gatherORUFTLData: parseFTL failed"),
+            2);
+  EXPECT_EQ(expectFailure(controller(kQNS3), true,
+                          "executeTunnelCommand: DevRegConnectCallStructMethod failed while "
+                          "retrieving data size"),
+            1);
+  nand_exporter_t& entry = entryForNow(0);
+  entry.getStatsSelectors = nullptr;
+  entry.getReadStatsSelectors = nullptr;
+  const std::string usable = controller(kQNS3, kStatisticsAnswer);
+  EXPECT_EQ(expectFailure(usable, true, "gatherORUFTLData: No getStatsSelectors exist"), 0);
+  EXPECT_EQ(expectFailure(usable, false, "gatherORUFTLData: No getReadStatsSelectors exist"), 0);
+}
+
+TEST_F(StatisticsGatheringTest, MSPsAreCountedThenFetched) {
+  const auto describeMSPs = [](std::uint32_t count, const std::string& last) {
+    std::string answers;
+    for (std::uint32_t index = 0; index < count; ++index) {
+      answers +=
+          R"({"opcode": 221, "argument": )" + std::to_string(index) + R"(, "file": "msp.bin"}, )";
+    }
+    return controller(kQNS3, answers + last);
+  };
+  struct Case {
+    std::string registry;
+    std::size_t expected;  ///< MSPs in the result; `kNothing`: no result
+    std::string error;
+  };
+  constexpr std::size_t kNothing = 99;
+  const std::string ending = R"({"opcode": 221, "argument": 3, "file": "msp.bin", "sizeError": 5})";
+  const std::string unreadable = R"({"opcode": 221, "argument": 9, "size": 4, "length": 4})";
+  const std::string noSize =
+      "executeTunnelCommand: DevRegConnectCallStructMethod failed while retrieving data size";
+  const Case cases[] = {
+      {describeMSPs(3, ending), 3, noSize},
+      {describeMSPs(12, kStatisticsAnswer), 10, "NA"},
+      {describeMSPs(9, unreadable), 9,
+       "ORUMSPParseBufferToCxt: Passed in invalid buffer or empty buffer"},
+      {describeMSPs(0, kStatisticsAnswer), kNothing, noSize},
+      {controller("ORUStorage"), kNothing,
+       "gatherORUMSPData: Controller does not support MSP data"},
+      {"", kNothing, "gatherORUMSPData: Could not get nand_exporter_t"},
+  };
+  for (const Case& given : cases) {
+    forgetAPIErrorMessage();
+    start(given.registry);
+    MSPBufferBuilder msp;
+    msp.add(4096, {7});
+    device().write("msp.bin", textOf(msp.bytes()));
+    const std::optional<PropertyDict> fields = gatherORUMSPData();
+    EXPECT_EQ(fields ? fields->size() : kNothing, given.expected) << given.registry;
+    EXPECT_EQ(GetAPIErrorMessage(), given.error);
+    if (fields) {
+      EXPECT_EQ(*fields->find("0"), PropertyValue(PropertyDict{{"passWithTmodeHard", 7}}));
+      EXPECT_TRUE(fields->contains(std::to_string(given.expected - 1)));
+    }
+    expectNothingHeld();
+  }
+}
+
+TEST_F(StatisticsGatheringTest, BaseStatistics) {
+  struct Case {
+    std::string registry;
+    bool filled;
+    std::size_t entry;
+    std::string errors;
+  };
+  const std::string walks =
+      "Failed to find matching service with DevRegServiceGetMatchingService, trying iterator...\n";
+  const Case cases[] = {
+      {controller(kQNS3, kStatisticsAnswer), true, 0, ""},
+      {controller("ORUStorage", kStatisticsAnswer), true, 2, ""},
+      {controller(kQNS3, kStatisticsAnswer, R"(, "closeError": 1)"), false, 0,
+       "Could not close connection to service\n"},
+      {controller(kQNS3, kStatisticsAnswer, R"(, "openError": 1)"), false, 0,
+       "Could not get connection to service\n"},
+      {controller(kQNS3, R"({"opcode": 13, "size": 4})"), false, 0, ""},
+      {controller(kQNS3), false, 0, ""},
+      {"", false, 3, walks + "Could not get matching DevRegKit service for exporting classes\n"},
+  };
+  for (const Case& given : cases) {
+    start(given.registry);
+    nand_exporter_t* exporter = nullptr;
+    ORUStatsContext context;
+    EXPECT_EQ(errorsOf([&] { EXPECT_EQ(GatherNANDStats(exporter, context), given.filled); }),
+              given.errors);
+    EXPECT_EQ(exporter, &nand_exporters_tunnel[given.entry]);
+    EXPECT_EQ(!given.filled || context.hostWrites == 1000, true);
+    expectNothingHeld();
+  }
+}
+
+}  // namespace
+}  // namespace vesprun
