@@ -1,0 +1,66 @@
+#include "telemetry/DiskInfo.h"
+
+#include <cstdint>
+#include <optional>
+
+#include "NANDInfo/UserCapacity.h"
+#include "platform/Platform.h"
+#include "telemetry/DiskUsage.h"
+
+namespace vesprun {
+namespace {
+
+constexpr const char* kUserVolume = "/private/var";
+
+/// Arithmetic is modulo 2^64, as everywhere with byte counts of a file system.
+PropertyDict measureFileSystem() {
+  std::uint64_t available = 0;
+  std::uint64_t fullness = 0;
+  std::uint64_t total = 0;
+  std::uint64_t capacity = 0;
+  if (const auto volume = platform().fileSystem().statfs(kUserVolume)) {
+    total = volume->blocks * volume->blockSize;
+    available = volume->availableBlocks * volume->blockSize;
+    fullness = total != 0 ? (total - available) * 10'000 / total : 0;
+    capacity = GetUserCapacityInGB(static_cast<std::uint32_t>(total / 1'000'000));
+  }
+  return {{"HLT_OR_AmountDataAvailable_MB", available >> 20},
+          {"HLT_OR_Diskfullness_BP", fullness},
+          {"HLT_OR_Capacity_GB", capacity},
+          {"HLT_Capacity_GB", capacity},
+          {"HLT_Diskfullness_BP", fullness},
+          {"HLT_UserCapacity_MB", total >> 20}};
+}
+
+bool isPlausible(const PropertyDict& info) {
+  return info.find("HLT_OR_Capacity_GB")->number()->asInt32() > 0 &&
+         info.find("HLT_OR_Diskfullness_BP")->number()->asInt32() >= 1;
+}
+
+PropertyDict askForDiskUsage() {
+  const std::optional<PropertyValue> answer = platform().orrery().OrreryCopyAnswer("DiskUsage");
+  const auto mebibytes = [&answer](std::string_view name) {
+    return diskUsageInMebibytes(answer, name).value_or(0);
+  };
+  const std::int64_t total = mebibytes(kDiskUsageTotalDiskCapacity);
+  const std::int64_t totalAvailable = mebibytes(kDiskUsageTotalDataAvailable);
+  const std::int64_t available = mebibytes(kDiskUsageAmountDataAvailable);
+  const std::uint32_t capacity = GetUserCapacityInGB(static_cast<std::uint32_t>(total));
+  // Counts of 44 bits leave room for the factor.
+  const std::int64_t fullness = total >= 1 ? (total - totalAvailable) * 10'000 / total : 0;
+  return {{"HLT_OR_Capacity_GB", capacity},
+          {"HLT_Capacity_GB", capacity},
+          {"HLT_UserCapacity_MB", total >= 1 ? total : std::int64_t{0}},
+          {"HLT_OR_Diskfullness_BP", fullness},
+          {"HLT_OR_AmountDataAvailable_MB", available},
+          {"HLT_Diskfullness_BP", fullness}};
+}
+
+}  // namespace
+
+PropertyDict GetDiskInfo() {
+  PropertyDict measured = measureFileSystem();
+  return isPlausible(measured) ? measured : askForDiskUsage();
+}
+
+}  // namespace vesprun

@@ -1,0 +1,60 @@
+#include "telemetry/KernelECCEvents.h"
+
+#include <algorithm>
+#include <array>
+#include <bit>
+#include <cstdint>
+#include <cstring>
+#include <span>
+#include <string>
+
+#include "platform/Platform.h"
+
+namespace vesprun {
+namespace {
+
+constexpr const char* kNextEvent = "kern.next_ecc_event";
+constexpr std::int32_t kECCEventRecordType = 172;
+constexpr int kMostEventsOfARun = 10;
+
+constexpr int kNoSuchEntry = 2;
+constexpr int kBusy = 16;
+
+constexpr std::size_t kMostRegisters = 8;
+constexpr std::size_t kFirstRegister = 8;  ///< offset in the record
+using ECCEventRecord = std::array<std::uint8_t, kFirstRegister + kMostRegisters * 8>;
+static_assert(sizeof(ECCEventRecord) == 72);
+static_assert(std::endian::native == std::endian::little, "the record is little-endian");
+
+PropertyDict describe(const ECCEventRecord& event) {
+  const std::uint8_t count = event[1];
+  PropertyDict record{{"id", event[0]}, {"count", count}};
+  for (std::size_t i = 0; i < std::min<std::size_t>(count, kMostRegisters); ++i) {
+    std::int64_t content = 0;
+    std::memcpy(&content, event.data() + kFirstRegister + i * sizeof content, sizeof content);
+    record.set("reg" + std::to_string(i), content);
+  }
+  return record;
+}
+
+}  // namespace
+
+void LogKernelECCEvents() {
+  Kernel& kernel = platform().kernel();
+  ECCEventRecord event{};
+  std::size_t length = event.size();  // not reset between reads
+  const auto takeNext = [&] {
+    return kernel.sysctlbyname(kNextEvent, std::span(event).first(length), length);
+  };
+  int systemError = takeNext();
+  for (int logged = 0; systemError == 0 && logged < kMostEventsOfARun; ++logged) {
+    platform().logsmith().FLLogStructuredData(kECCEventRecordType, describe(event));
+    systemError = takeNext();
+  }
+  if (systemError != kNoSuchEntry && systemError != kBusy) {
+    logMessage(LogLevel::Default, "Unexpected errno (%d) reading ECC events from kernel",
+               systemError);
+  }
+}
+
+}  // namespace vesprun

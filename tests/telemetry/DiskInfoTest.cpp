@@ -1,0 +1,74 @@
+#include "telemetry/DiskInfo.h"
+
+#include "telemetry/TodaysScalars.h"
+
+namespace vesprun {
+namespace {
+
+struct Case {
+  const char* volume;
+  const char* usage;  ///< answer to "DiskUsage"
+  std::int64_t available;
+  std::int64_t fullness;
+  std::int64_t capacity;
+  std::int64_t size;
+};
+
+constexpr const char* kNull = "null";
+
+TEST(DiskInfo, MeasuresTheVolumeOrAsksForDiskUsage) {
+  const Case cases[] = {
+      // Measured: capacity by decimal megabytes.
+      {R"({"blockSize": 4096, "blocks": 15625000, "available": 3906250})", kNull,  //
+       15258, 7500, 64, 61035},
+      {R"({"blockSize": 1000, "blocks": 1500000000, "available": 0})", kNull,  //
+       0, 10000, 1536, 1430511},
+      {R"({"blockSize": 1000, "blocks": 65536000, "available": 32768000})", kNull,  //
+       31250, 5000, 128, 62500},
+      // A nearly empty volume, one without a size and one too small for a gigabyte are not
+      // believed.
+      {R"({"blockSize": 4096, "blocks": 10000000, "available": 9999001})",
+       R"({"TotalDiskCapacity": 137438953472})", 0, 10000, 256, 131072},
+      {R"({"blockSize": 4096, "blocks": 0, "available": 0})", kNull, 0, 0, 0, 0},
+      {R"({"blockSize": 1000, "blocks": 511000, "available": 1})",
+       R"({"AmountDataAvailable": 3145727})", 2, 0, 0, 0},
+      // Asked: capacity by binary megabytes, two figures of what is available.
+      {kNull,
+       R"({"TotalDiskCapacity": 137438953472, "TotalDataAvailable": 34359738368,
+           "AmountDataAvailable": 1048576000})",
+       1000, 7500, 256, 131072},
+      {kNull, R"({"TotalDiskCapacity": 1048576, "TotalDataAvailable": 2097152})",  //
+       0, -10000, 0, 1},
+      {kNull, R"({"TotalDataAvailable": -1, "AmountDataAvailable": -1})", -1, 0, 0, 0},
+      {kNull, kNull, 0, 0, 0, 0},
+  };
+  for (const Case& c : cases) {
+    TestDevice device(deviceWith(std::string(R"("userVolume": )") + c.volume +
+                                 R"(, "properties": {"DiskUsage": )" + c.usage + "}"));
+    device.platform();
+    EXPECT_EQ(GetDiskInfo(), (PropertyDict{{"HLT_OR_AmountDataAvailable_MB", c.available},
+                                           {"HLT_OR_Diskfullness_BP", c.fullness},
+                                           {"HLT_OR_Capacity_GB", c.capacity},
+                                           {"HLT_Capacity_GB", c.capacity},
+                                           {"HLT_Diskfullness_BP", c.fullness},
+                                           {"HLT_UserCapacity_MB", c.size}}))
+        << c.volume << c.usage;
+  }
+}
+
+TEST(DiskInfo, KeepsTheKindsOfItsSource) {
+  for (const bool measured : {true, false}) {
+    TestDevice device(deviceWith(
+        std::string(R"("properties": {"DiskUsage": {"TotalDiskCapacity": 4096000000}},)") +
+        R"("userVolume": {"blockSize": 4096, "blocks": )" + (measured ? "1000000" : "0") +
+        R"(, "available": 0})"));
+    device.platform();
+    for (const auto& [key, value] : GetDiskInfo()) {
+      const NumberKind asked = key.ends_with("_GB") ? NumberKind::UInt32 : NumberKind::Int64;
+      EXPECT_EQ(value.number()->kind(), measured ? NumberKind::UInt64 : asked) << key;
+    }
+  }
+}
+
+}  // namespace
+}  // namespace vesprun

@@ -1,0 +1,31 @@
+#pragma once
+
+#include <cstdint>
+#include <map>
+#include <string>
+
+#include "support/TestDevice.h"
+
+namespace vesprun {
+
+using Scalars = std::map<std::string, std::int64_t>;
+
+/// Today's scalars whose keys begin with `prefix`.
+inline Scalars todaysScalars(TestDevice& device, std::string_view prefix = "") {
+  Tallybook& tallybook = device.platform().tallybook();
+  tallybook.TBClientCheckpoint();
+  Scalars scalars;
+  tallybook.openHistory()->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+      prefix, TestDevice::kToday, TestDevice::kToday,
+      [&](std::string_view key, std::int32_t, std::int64_t value, bool&) {
+        scalars[std::string(key)] = value;
+      });
+  return scalars;
+}
+
+/// The text of a device.json: the clock of `TestDevice` and further entries.
+inline std::string deviceWith(std::string_view entries) {
+  return R"({"clock": "2024-03-05T09:15:02Z", "timeZone": "UTC", )" + std::string(entries) + "}";
+}
+
+}  // namespace vesprun
