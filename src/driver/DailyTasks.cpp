@@ -4,6 +4,7 @@
 
 #include "platform/Platform.h"
 #include "report/TBReport.h"
+#include "telemetry/DailyStorageAndDeviceStats.h"
 
 namespace vesprun {
 namespace {
@@ -38,6 +39,7 @@ void runDailyTasks(std::int32_t day, const AppInfoList* appInfo) {
   if (logsmith.DiagnosticLogSubmissionEnabled()) {
     TBReport().writeLogForYesterdayWithAppInfo(day, appInfo);
   }
+  LogDailyStorageAndDeviceStats();
   logsmith.FLDumpAllOldStructuredDataLogs();
   logsmith.rollTendmarkLogs();
   // Before the day is stored: a run that is killed must not lose what the tasks counted.
