@@ -30,7 +30,10 @@ void addDeviceCommands(CLI::App& vespctl);
 void addCounterCommands(CLI::App& vespctl);
 void addPreferenceCommands(CLI::App& vespctl);
 void addMessageCommands(CLI::App& vespctl);
+void addNandCommands(CLI::App& vespctl);
 void addOutboxCommands(CLI::App& vespctl);
 void addPtreeCommands(CLI::App& vespctl);
+void addFieldsCommand(CLI::App& vespctl);
+void addDecodeCommand(CLI::App& vespctl);
 
 }  // namespace vesprun

@@ -5,6 +5,7 @@
 
 #include "Command.h"
 #include "SampleCounters.h"
+#include "SampleDescription.h"
 #include "platform/host/AtomicFile.h"
 #include "platform/host/PtreeWriter.h"
 #include "platform/host/SqliteTallybook.h"
@@ -120,6 +121,7 @@ void fillSampleDevice(const std::string& directory) {
   const std::unique_ptr<HostPlatform> device = openDevice(directory);
   writeWhitelist(device->directory());
   recordCounters(*device);
+  describeSampleDevice(device->directory(), device->clock().now());
 }
 
 }  // namespace vesprun

@@ -10,8 +10,11 @@ int main(int argc, char** argv) {
   vesprun::addCounterCommands(vespctl);
   vesprun::addPreferenceCommands(vespctl);
   vesprun::addMessageCommands(vespctl);
+  vesprun::addNandCommands(vespctl);
   vesprun::addOutboxCommands(vespctl);
   vesprun::addPtreeCommands(vespctl);
+  vesprun::addFieldsCommand(vespctl);
+  vesprun::addDecodeCommand(vespctl);
   try {
     vespctl.parse(argc, argv);
   } catch (const CLI::ParseError& error) {

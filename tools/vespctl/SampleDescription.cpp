@@ -1,0 +1,83 @@
+#include "SampleDescription.h"
+
+#include <nlohmann/json.hpp>
+#include <string>
+#include <string_view>
+
+#include "Command.h"
+#include "SampleController.h"
+#include "SampleTelemetry.h"
+#include "common/LittleEndian.h"
+#include "platform/host/AtomicFile.h"
+#include "platform/host/JsonForm.h"
+
+namespace vesprun {
+namespace {
+
+using Json = nlohmann::ordered_json;
+
+constexpr std::string_view kSnapshotFile = "kernel/snapshot.bin";
+
+void writeFile(const DeviceDirectory& directory, std::string_view devicePath,
+               const std::string& content) {
+  std::string error;
+  if (!replaceFile(directory.hostPath(devicePath), content, error)) {
+    throw CommandFailure(error);
+  }
+}
+
+void appendItem(Bytes& snapshot, std::uint32_t type, std::uint64_t flags, const Bytes& data) {
+  appendLittleEndian(snapshot, type, 4);
+  appendLittleEndian(snapshot, data.size(), 4);
+  appendLittleEndian(snapshot, flags, 8);
+  snapshot.insert(snapshot.end(), data.begin(), data.end());
+}
+
+/// A kernel task whose one thread has swapped out 3 GiB.
+std::string kernelSnapshot() {
+  constexpr std::uint32_t kContainerBegin = 19;
+  constexpr std::uint32_t kContainerEnd = 20;
+  constexpr std::uint32_t kThreadIOStatistics = 2305;
+  constexpr std::uint32_t kThreadName = 2313;
+  constexpr std::uint32_t kBufferEnd = 0xF19158ED;
+  constexpr std::uint64_t kTask = 1;
+  constexpr std::uint64_t kThread = 2;
+  constexpr std::string_view kName = "VM_swapout";
+
+  Bytes name(kName.begin(), kName.end());
+  name.resize(64);
+  Bytes counters;
+  for (const std::uint64_t counter : {0ULL, 0ULL, 49'152ULL, 3ULL << 30}) {
+    appendLittleEndian(counters, counter, 8);
+  }
+  Bytes snapshot;
+  appendItem(snapshot, kContainerBegin, kTask, Bytes(4));
+  appendItem(snapshot, kContainerBegin, kThread, Bytes(4));
+  appendItem(snapshot, kThreadName, 0, name);
+  appendItem(snapshot, kThreadIOStatistics, 0, counters);
+  appendItem(snapshot, kContainerEnd, kThread, {});
+  appendItem(snapshot, kContainerEnd, kTask, {});
+  appendItem(snapshot, kBufferEnd, 0, {});
+  return {snapshot.begin(), snapshot.end()};
+}
+
+}  // namespace
+
+void describeSampleDevice(const DeviceDirectory& directory, const Date& now) {
+  const PropertyValue controller(writeSampleController(directory, now));
+  writeFile(directory, kSnapshotFile, kernelSnapshot());
+  for (const SampleFile& file : sampleECCEvents()) {
+    writeFile(directory, file.devicePath, file.content);
+  }
+  const Json description{
+      {"kernel", {{"snapshot", kSnapshotFile}}},
+      {"purgeable",
+       {{"RECLAIMER_TOTAL_AVAILABLE", 4'310'708'224},
+        {"RECLAIMER_NONPURGEABLE_AMOUNT", 31'138'512'896}}},
+      {"registry", Json::array({Json::parse(jsonText(controller)), sampleNVRAMEntry()})},
+      {"channels", sampleChannels()},
+      {"usage", sampleUsage()}};
+  writeFile(directory, "device.json", description.dump(2) + '\n');
+}
+
+}  // namespace vesprun
