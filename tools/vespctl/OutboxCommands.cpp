@@ -57,10 +57,25 @@ void showEvents(const DeviceDirectory& directory, bool inFull) {
   });
 }
 
-void showRecords(const DeviceDirectory& directory) {
-  showLines(directory.hostPath("outbox/records.jsonl"), [](const PropertyDict& line) {
+/// The text form of a record, or of its first entries and the number of the others.
+std::string recordText(const PropertyDict& record, bool inFull) {
+  constexpr std::size_t kShownEntries = 8;
+  if (inFull || record.size() <= kShownEntries) {
+    return textForm(record);
+  }
+  PropertyDict first;
+  for (auto entry = record.begin(); first.size() < kShownEntries; ++entry) {
+    first.set(entry->first, entry->second);
+  }
+  return textForm(first) + " and " + std::to_string(record.size() - kShownEntries) + " more";
+}
+
+void showRecords(const DeviceDirectory& directory, bool inFull) {
+  showLines(directory.hostPath("outbox/records.jsonl"), [inFull](const PropertyDict& line) {
+    const PropertyValue* value = line.find("record");
+    const PropertyDict* record = value != nullptr ? value->dict() : nullptr;
     std::cout << entryText(line, "time") << "  type " << entryText(line, "type") << "  "
-              << entryText(line, "record") << '\n';
+              << (record != nullptr ? recordText(*record, inFull) : "") << '\n';
   });
 }
 
@@ -72,8 +87,10 @@ void showNotifications(const DeviceDirectory& directory) {
 
 void showSystemLog(const DeviceDirectory& directory) {
   showLines(directory.hostPath("outbox/log.jsonl"), [](const PropertyDict& line) {
-    std::cout << entryText(line, "time") << "  " << entryText(line, "level") << "  "
-              << entryText(line, "message") << '\n';
+    std::string message = entryText(line, "message");
+    message.erase(message.find_last_not_of('\n') + 1);  // some messages end their own line
+    std::cout << entryText(line, "time") << "  " << entryText(line, "level") << "  " << message
+              << '\n';
   });
 }
 
@@ -130,7 +147,7 @@ void showAll(const DeviceDirectory& directory) {
   showTitle("events");
   showEvents(directory, false);
   showTitle("structured records");
-  showRecords(directory);
+  showRecords(directory, false);
   showTitle("submitted logs");
   showLogs(directory);
 }
@@ -164,7 +181,8 @@ void addOutboxCommands(CLI::App& vespctl) {
   addPart("logs", "The submitted logs alone", showLogs);
   addPart("events", "The analytics events alone, with their payloads",
           [](const DeviceDirectory& device) { showEvents(device, true); });
-  addPart("records", "The structured records alone", showRecords);
+  addPart("records", "The structured records alone, in full",
+          [](const DeviceDirectory& device) { showRecords(device, true); });
   addPart("notifications", "The posted notifications alone", showNotifications);
   addPart("log", "The system log alone", showSystemLog);
 }

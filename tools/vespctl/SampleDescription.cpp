@@ -61,6 +61,13 @@ std::string kernelSnapshot() {
   return {snapshot.begin(), snapshot.end()};
 }
 
+/// A boot session with which the storage counters go into the daily log on the day of `now`, and on
+/// every second day before and after it.
+std::string bootSession(const Date& now) {
+  const bool isOddDay = daysSince1970(now) % 2 != 0;
+  return std::string(isOddDay ? "2" : "1") + "0F6D8A4-5B0C-4E4D-9D3A-6E2B7C1F0A55";
+}
+
 }  // namespace
 
 void describeSampleDevice(const DeviceDirectory& directory, const Date& now) {
@@ -70,7 +77,8 @@ void describeSampleDevice(const DeviceDirectory& directory, const Date& now) {
     writeFile(directory, file.devicePath, file.content);
   }
   const Json description{
-      {"kernel", {{"snapshot", kSnapshotFile}}},
+      {"kernel",
+       {{"snapshot", kSnapshotFile}, {"variables", {{"kern.bootsessionuuid", bootSession(now)}}}}},
       {"purgeable",
        {{"RECLAIMER_TOTAL_AVAILABLE", 4'310'708'224},
         {"RECLAIMER_NONPURGEABLE_AMOUNT", 31'138'512'896}}},

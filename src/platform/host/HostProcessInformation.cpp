@@ -1,11 +1,10 @@
 #include "platform/host/HostProcessInformation.h"
 
-#include <errno.h>
 #include <unistd.h>
 
 namespace vesprun {
 
-std::string HostProcessInformation::processName() { return program_invocation_short_name; }
+std::string HostProcessInformation::processName() { return "vesprun"; }
 
 std::int32_t HostProcessInformation::processIdentifier() { return getpid(); }
 

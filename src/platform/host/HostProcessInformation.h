@@ -4,7 +4,7 @@
 
 namespace vesprun {
 
-/// The running Linux process.
+/// The job's process on the device: it is vesprun there, whichever program runs it here.
 class HostProcessInformation : public ProcessInformation {
  public:
   std::string processName() override;
