@@ -4,7 +4,6 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
-#include <tuple>
 
 #include "platform/host/JsonForm.h"
 #include "platform/host/PtreeReader.h"
@@ -22,13 +21,15 @@ const std::string kOwn = kMobile + "com.quill.aggregated.vesprun.ptree";
 const std::string kSchedule = "Library/Logsmith/com.quill.Ferrywell.ptree";
 const std::string kChanged[] = {kMobile + "com.a.ptree", "Library/Logsmith/com.b.ptree",
                                 "var/root/Library/Preferences/com.c.ptree"};
-const std::string kSameBuild = "{'LastOSUpdate': {'version': '2B'}}";
-
 /// The value of a text with single quotes.
 PropertyValue json(std::string text) {
   std::replace(text.begin(), text.end(), '\'', '"');
   std::string error;
   return valueFromJsonText(text, error).value_or(error);
+}
+
+PropertyValue sameBuildAnd(const std::string& entries) {
+  return json("{'LastOSUpdate': {'version': '2B'}" + (entries.empty() ? "" : ", " + entries) + '}');
 }
 
 std::string payload(const std::string& change) {
@@ -59,60 +60,52 @@ struct TaskingDevice : TestDevice {
 };
 
 TEST(TaskingSync, AppliesUndoesAndKeepsByWhatIsStoredAndScheduled) {
-  enum Effect { kNothing, kNotified, kUndone, kApplied, kReplaced };
   const std::string old = payload("'old', 'Value': 0");
   const std::string next = payload("'new', 'Value': ['x', 2.5]");
-  const std::tuple<std::string, std::string, Effect, std::string> kCases[] = {
-      {"", "", kNothing, ""},
-      {"'TaskingID': 1" + old, "'x': 1" + next, kNothing, ""},
-      {"", "'TaskingID': 'n'" + next, kApplied, ""},
-      {"'TaskingID': 1, 'TaskingOS': '2B'" + old, "'TaskingID': 1.0" + next, kNothing, ""},
+  const struct {
+    std::string stored, scheduled, storedAfter, changedAfter, log;
+    std::size_t notifications;
+  } kCases[] = {
+      {"", "", "", "'old': 0", "", 0},
+      {"'TaskingID': 1" + old, "'x': 1" + next, "'TaskingID': 1" + old, "'old': 0", "", 0},
+      {"", "'TaskingID': 'n'" + next, "'TaskingOS': '2B', 'TaskingID': 'n'" + next,
+       "'old': 0, 'new': ['x', 2.5]", "", 1},
+      {"'TaskingID': 1, 'TaskingOS': '2B'" + old, "'TaskingID': 1.0" + next,
+       "'TaskingID': 1, 'TaskingOS': '2B'" + old, "'old': 0", "", 0},
       {"'TaskingID': 'n', 'TaskingOS': '2A'" + old, "'TaskingID': 'n', 'TaskingDigest': 'd'" + next,
-       kReplaced, "n -> n, 2A -> 2B"},
+       "'TaskingOS': '2B', 'TaskingID': 'n', 'TaskingDigest': 'd'" + next, "'new': ['x', 2.5]",
+       "n -> n, 2A -> 2B", 1},
       {"'TaskingID': 'o', 'TaskingDigest': 7, 'TaskingOS': '2B'" + old, "'TaskingID': ['n']" + next,
-       kReplaced, "o -> (n), 2B -> 2B"},
-      {"", "'TaskingID': 'n'", kNotified, ""},
-      {"'TaskingID': 'o', 'TaskingDigest': 7, 'TaskingOS': '2A'" + old, "'TaskingID': 'n'", kUndone,
-       "o -> n, 2A -> 2B"},
-      {"'TaskingID': 'n'", "'TaskingID': 'n'", kNotified, "n -> n, (null) -> 2B"},
+       "'TaskingOS': '2B', 'TaskingID': ['n']" + next, "'new': ['x', 2.5]", "o -> (n), 2B -> 2B",
+       1},
+      {"", "'TaskingID': 'n'", "", "'old': 0", "", 1},
+      {"'TaskingID': 'o', 'TaskingDigest': 7, 'TaskingOS': '2A'" + old, "'TaskingID': 'n'",
+       "'TaskingOS': '2A'", "", "o -> n, 2A -> 2B", 1},
+      {"'TaskingID': 'n'", "'TaskingID': 'n'", "'TaskingID': 'n'", "'old': 0",
+       "n -> n, (null) -> 2B", 1},
   };
-  for (const auto& [storedText, scheduledText, effect, update] : kCases) {
-    SCOPED_TRACE(storedText + " / " + scheduledText);
+  for (const auto& [stored, scheduled, storedAfter, changedAfter, log, notifications] : kCases) {
+    SCOPED_TRACE(stored + " / " + scheduled);
     TaskingDevice device;
-    PropertyDict stored = *json('{' + storedText + '}').dict();
-    stored.merge(*json(kSameBuild).dict());
-    device.store(kOwn, stored);
-    const PropertyValue scheduled = json('{' + scheduledText + '}');
-    device.store(kSchedule, PropertyDict{{"ScheduledTasking", scheduled}});
-    PropertyDict values{{"old", 0}, {"kept", true}};
+    device.store(kOwn, sameBuildAnd(stored));
+    device.store(kSchedule, json("{'ScheduledTasking': {" + scheduled + "}}"));
     for (const std::string& file : kChanged) {
-      device.store(file, values);
+      device.store(file, json("{'old': 0}"));
     }
     device.sync();
-    if (effect == kUndone || effect == kReplaced) {
-      values.remove("old");
-      for (const char* key : {"TaskingID", "TaskingDigest", "TaskingPayload"}) {
-        stored.remove(key);
-      }
-    }
-    if (effect == kApplied || effect == kReplaced) {
-      values.set("new", json("['x', 2.5]"));
-      stored.merge(*scheduled.dict());
-      stored.set("TaskingOS", "2B");
-    }
-    EXPECT_EQ(device.stored(kOwn), PropertyValue(stored));
+    EXPECT_EQ(device.stored(kOwn), sameBuildAnd(storedAfter));
     for (const std::string& file : kChanged) {
-      EXPECT_EQ(device.stored(file), PropertyValue(values)) << file;
+      EXPECT_EQ(device.stored(file), json('{' + changedAfter + '}')) << file;
     }
     EXPECT_EQ(::testing::PrintToString(device.log()),
-              update.empty() ? "{}" : "{ \"default: Tasking update (" + update + ")\" }");
-    EXPECT_THAT(device.lines("notifications.jsonl"), SizeIs(effect == kNothing ? 0 : 1));
+              log.empty() ? "{}" : "{ \"default: Tasking update (" + log + ")\" }");
+    EXPECT_THAT(device.lines("notifications.jsonl"), SizeIs(notifications));
   }
 }
 
 TEST(TaskingSync, RecordsThatNameNothingChangeNothing) {
   TaskingDevice device;
-  device.store(kOwn, json(kSameBuild));
+  device.store(kOwn, sameBuildAnd(""));
   device.store(kSchedule, json(R"({'ScheduledTasking': {'TaskingID': 'n', 'TaskingPayload': [
       'no record', {'User': 5, 'Domain': 'a', 'Key': 'k', 'Value': 1},
       {'User': 'mobile', 'Key': 'k', 'Value': 1}, {'User': 'mobile', 'Domain': '../a', 'Key': 'k'},
