@@ -97,4 +97,8 @@ std::string textForm(const PropertyValue& value) {
   return '{' + text + '}';
 }
 
+std::string textFormOrNull(const std::optional<PropertyValue>& value) {
+  return value ? textForm(*value) : "(null)";
+}
+
 }  // namespace vesprun

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <optional>
 #include <string>
 
 #include "common/PropertyValue.h"
@@ -17,5 +18,8 @@ namespace vesprun {
 std::string textForm(const PropertyValue& value);
 
 std::string textForm(const Number& number);
+
+/// The text form of a value that may be missing, which is "(null)" then.
+std::string textFormOrNull(const std::optional<PropertyValue>& value);
 
 }  // namespace vesprun

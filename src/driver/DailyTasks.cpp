@@ -2,6 +2,7 @@
 
 #include <string_view>
 
+#include "driver/TaskingSync.h"
 #include "platform/Platform.h"
 #include "report/TBReport.h"
 #include "telemetry/DailyStorageAndDeviceStats.h"
@@ -41,6 +42,7 @@ void runDailyTasks(std::int32_t day, const AppInfoList* appInfo) {
   }
   LogDailyStorageAndDeviceStats();
   logsmith.FLDumpAllOldStructuredDataLogs();
+  syncTaskingAndOSChange();
   logsmith.rollTendmarkLogs();
   // Before the day is stored: a run that is killed must not lose what the tasks counted.
   tallybook.TBClientCheckpoint();

@@ -36,6 +36,9 @@ class Logsmith {
   /// The text that names the running OS version.
   virtual std::string LGSOSVersion() = 0;
 
+  /// Tells of the running OS; "ProductBuildVersion", a string, identifies its build.
+  virtual PropertyDict CopySystemVersionDictionary() = 0;
+
   /// Records one structured-data log record under a type code.
   virtual void FLLogStructuredData(std::int32_t type, const PropertyDict& record) = 0;
 

@@ -19,7 +19,9 @@
 #include "platform/ProcessInformation.h"
 #include "platform/PtreeSerialization.h"
 #include "platform/Reclaimer.h"
+#include "platform/ServicesClient.h"
 #include "platform/SupportLibrary.h"
+#include "platform/SystemConfiguration.h"
 #include "platform/SystemLog.h"
 #include "platform/Tallybook.h"
 #include "platform/Tapline.h"
@@ -52,7 +54,9 @@ class Platform {
   virtual ProcessInformation& processInformation() = 0;
   virtual PtreeSerialization& ptreeSerialization() = 0;
   virtual Reclaimer& reclaimer() = 0;
+  virtual LGSServicesClient& servicesClient() = 0;
   virtual SupportLibrary& supportLibrary() = 0;
+  virtual LGSSystemConfiguration& systemConfiguration() = 0;
   virtual SystemLog& systemLog() = 0;
   virtual Tallybook& tallybook() = 0;
   virtual UserDefaults& userDefaults() = 0;

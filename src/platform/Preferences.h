@@ -18,8 +18,11 @@ class Preferences {
   virtual std::optional<PropertyValue> LGSPreferencesGetValue(std::string_view key,
                                                               std::string_view domain) = 0;
 
-  /// Sets `value`, or removes the key when there is none.
-  virtual void LGSPreferencesSetValue(std::string_view key, std::optional<PropertyValue> value,
+  /// Sets `value`, or removes the key when there is none. Key and domain may come from somebody
+  /// else's data: a missing key, the empty domain, which also stands for a missing one, and a name
+  /// that cannot be a domain's are refused with an error in the system log.
+  virtual void LGSPreferencesSetValue(std::optional<std::string_view> key,
+                                      std::optional<PropertyValue> value,
                                       std::string_view domain) = 0;
 
   /// Writes the domain's changes durably, keeping what other processes changed meanwhile. False

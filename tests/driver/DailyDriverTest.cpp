@@ -30,7 +30,16 @@ constexpr double kQuiet = 0.05;
 
 // No report is built: what stands in the log is the driver's alone.
 constexpr std::string_view kNoSubmission =
-    R"({"clock": "2024-03-05T09:15:02Z", "submission": {"enabled": false}})";
+    R"({"clock": "2024-03-05T09:15:02Z", "submission": {"enabled": false},
+        "system": {"buildVersion": "2B"}})";
+
+/// A device on which the driver has nothing to say about the OS build.
+struct DriverDevice : TestDevice {
+  DriverDevice() : TestDevice(kNoSubmission) {
+    platform().preferences().LGSPreferencesSetValue("LastOSUpdate", PropertyDict{{"version", "2B"}},
+                                                    kService);
+  }
+};
 
 const std::string kUnchanged = "default: Day unchanged since last run";
 const std::string kNotified = "default: notified of logging status, waiting for activate app info";
@@ -108,7 +117,7 @@ TEST_F(DailyDriverTest, OnlyTheFirstArgumentCounts) {
   };
   for (const auto& [commandLine, before, between, after] : kCases) {
     SCOPED_TRACE(::testing::PrintToString(commandLine));
-    TestDevice device(kNoSubmission);
+    DriverDevice device;
     device.platform().preferences().LGSPreferencesSetValue(kStoredDayKey, before, kService);
     runDailyDriver(commandLine);
     std::vector<std::string> expected = between;
@@ -131,7 +140,7 @@ TEST_F(DailyDriverTest, TheDayCheckRunsTheTasksOncePerDay) {
   };
   for (const auto& [stored, runs] : kCases) {
     SCOPED_TRACE(stored ? textForm(*stored) : "absent");
-    TestDevice device(kNoSubmission);
+    DriverDevice device;
     device.platform().preferences().LGSPreferencesSetValue(kStoredDayKey, stored, kService);
     runDayCheck(nullptr);
     EXPECT_THAT(device.log(), ElementsAreArray({runs ? kYesterdaysTasks : kUnchanged}));
@@ -175,7 +184,7 @@ TEST_F(DailyDriverTest, MessagesLeadToWhatTheirStateAllows) {
   for (const auto& [messages, log] : kCases) {
     SCOPED_TRACE(textForm(PropertyArray(messages)));
     startActiveAppInfoAfresh();
-    TestDevice device(kNoSubmission);
+    DriverDevice device;
     runWithMessages(device, messages);
     EXPECT_THAT(device.log(), ElementsAreArray(log));
     const bool notified = std::count(log.begin(), log.end(), kNotified) != 0;
@@ -187,7 +196,7 @@ TEST_F(DailyDriverTest, MessagesLeadToWhatTheirStateAllows) {
 }
 
 TEST_F(DailyDriverTest, AServiceThatIsTakenChangesNothingElse) {
-  TestDevice device(kNoSubmission);
+  DriverDevice device;
   const std::unique_ptr<ServiceListener> other =
       device.platform().messageService().createListener(kService);
   ASSERT_NE(other, nullptr);

@@ -14,6 +14,11 @@ std::string HostLogsmith::LGSOSVersion() {
   return described ? *described : live::osVersion();
 }
 
+PropertyDict HostLogsmith::CopySystemVersionDictionary() {
+  const auto& described = _description.system.buildVersion;
+  return {{"ProductBuildVersion", described ? *described : live::osBuild()}};
+}
+
 void HostLogsmith::FLLogStructuredData(std::int32_t type, const PropertyDict& record) {
   _outbox.append("records.jsonl", {{"type", type}, {"record", record}});
 }

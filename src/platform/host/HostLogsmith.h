@@ -17,6 +17,7 @@ class HostLogsmith : public Logsmith {
   bool LGSWriteLogForSubmission(std::string_view logType, std::string_view logName,
                                 const PropertyDict* header, const LogWriter& writer) override;
   std::string LGSOSVersion() override;
+  PropertyDict CopySystemVersionDictionary() override;
   void FLLogStructuredData(std::int32_t type, const PropertyDict& record) override;
   void FLDumpAllOldStructuredDataLogs() override {}
   void rollTendmarkLogs() override {}

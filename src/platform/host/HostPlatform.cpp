@@ -21,7 +21,9 @@
 #include "platform/host/HostProcessInformation.h"
 #include "platform/host/HostPtreeSerialization.h"
 #include "platform/host/HostReclaimer.h"
+#include "platform/host/HostServicesClient.h"
 #include "platform/host/HostSupportLibrary.h"
+#include "platform/host/HostSystemConfiguration.h"
 #include "platform/host/HostSystemLog.h"
 #include "platform/host/HostTapline.h"
 #include "platform/host/HostUserDefaults.h"
@@ -81,7 +83,9 @@ struct HostPlatform::Services {
   Lazy<HostProcessInformation> processInformation;
   Lazy<HostPtreeSerialization> ptreeSerialization;
   Lazy<HostReclaimer> reclaimer;
+  Lazy<HostServicesClient> servicesClient;
   Lazy<HostSupportLibrary> supportLibrary;
+  Lazy<HostSystemConfiguration> systemConfiguration;
   Lazy<HostUserDefaults> userDefaults;
   Lazy<PollMainLoop> mainLoop;
   Lazy<UnixMessageService> messageService;
@@ -205,8 +209,16 @@ PtreeSerialization& HostPlatform::ptreeSerialization() {
 
 Reclaimer& HostPlatform::reclaimer() { return _services->reclaimer.get(description()); }
 
+LGSServicesClient& HostPlatform::servicesClient() {
+  return _services->servicesClient.get(directory(), systemLog());
+}
+
 SupportLibrary& HostPlatform::supportLibrary() {
   return _services->supportLibrary.get(description().supportLibrary);
+}
+
+LGSSystemConfiguration& HostPlatform::systemConfiguration() {
+  return _services->systemConfiguration.get(description(), directory(), systemLog());
 }
 
 Tapline& HostPlatform::tapline() { return _services->tapline.get(description().channels); }

@@ -51,7 +51,9 @@ class HostPlatform : public Platform {
   ProcessInformation& processInformation() override;
   PtreeSerialization& ptreeSerialization() override;
   Reclaimer& reclaimer() override;
+  LGSServicesClient& servicesClient() override;
   SupportLibrary& supportLibrary() override;
+  LGSSystemConfiguration& systemConfiguration() override;
   SystemLog& systemLog() override;
   Tallybook& tallybook() override;
   UserDefaults& userDefaults() override;

@@ -42,7 +42,9 @@ PreferenceFile* HostPreferences::file(std::string_view domain) {
     return nullptr;
   }
   if (!isPartOfPath(domain)) {
-    _log.write(LogLevel::Error, quotedText(domain) + " cannot be the name of a domain");
+    if (_refused.emplace(domain).second) {
+      _log.write(LogLevel::Error, quotedText(domain) + " cannot be the name of a domain");
+    }
     return nullptr;
   }
   const auto added = _files.try_emplace(std::string(domain), _device, _log, _folder, domain);
@@ -56,13 +58,19 @@ std::optional<PropertyValue> HostPreferences::LGSPreferencesGetValue(std::string
   return preferences != nullptr ? preferences->get(key) : std::nullopt;
 }
 
-void HostPreferences::LGSPreferencesSetValue(std::string_view key,
+void HostPreferences::LGSPreferencesSetValue(std::optional<std::string_view> key,
                                              std::optional<PropertyValue> value,
                                              std::string_view domain) {
   const std::scoped_lock guard(_mutex);
-  if (PreferenceFile* preferences = file(domain)) {
-    preferences->set(key, std::move(value));
+  PreferenceFile* preferences = file(domain);
+  if (preferences == nullptr) {
+    return;
   }
+  if (!key) {
+    _log.write(LogLevel::Error, "no key to change in domain " + quotedText(domain));
+    return;
+  }
+  preferences->set(*key, std::move(value));
 }
 
 bool HostPreferences::LGSPreferencesSynchronize(std::string_view domain) {

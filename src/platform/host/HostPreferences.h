@@ -3,6 +3,8 @@
 #include <functional>
 #include <map>
 #include <mutex>
+#include <optional>
+#include <set>
 #include <string>
 #include <string_view>
 
@@ -24,7 +26,7 @@ struct PreferenceFolder {
 ///
 /// The names of users and domains are parts of paths: an empty one, one that begins with a dot and
 /// one with a slash or NUL in it are refused with an error in the system log. There is then no
-/// value, and nothing can be written.
+/// value, and nothing can be written. A refused domain is told once.
 class HostPreferences final : public Preferences {
  public:
   /// The preferences of a user: var/USER/Library/Preferences. `device` and `log` must outlive the
@@ -42,8 +44,8 @@ class HostPreferences final : public Preferences {
 
   std::optional<PropertyValue> LGSPreferencesGetValue(std::string_view key,
                                                       std::string_view domain) override;
-  void LGSPreferencesSetValue(std::string_view key, std::optional<PropertyValue> value,
-                              std::string_view domain) override;
+  void LGSPreferencesSetValue(std::optional<std::string_view> key,
+                              std::optional<PropertyValue> value, std::string_view domain) override;
   /// When nothing changed, nothing is written; what was read is let go, so that the next look-up
   /// sees what others wrote.
   bool LGSPreferencesSynchronize(std::string_view domain) override;
@@ -59,6 +61,7 @@ class HostPreferences final : public Preferences {
   std::string _folder;  ///< empty when the user's name was refused
   std::mutex _mutex;
   std::map<std::string, PreferenceFile, std::less<>> _files;
+  std::set<std::string, std::less<>> _refused;  ///< domains
 };
 
 }  // namespace vesprun

@@ -116,6 +116,17 @@ std::string osVersion() {
   return uname(&system) == 0 ? std::string(system.sysname) + ' ' + system.release : "Linux";
 }
 
+std::string osBuild() {
+  const auto entries = readEntries("/etc/os-release", '=');
+  for (const char* name : {"BUILD_ID", "VERSION_ID"}) {
+    if (const auto entry = entries.find(name); entry != entries.end()) {
+      return entry->second;
+    }
+  }
+  utsname system{};
+  return uname(&system) == 0 ? system.release : "";
+}
+
 std::optional<Bytes> swapUsage() {
   const auto entries = readEntries("/proc/meminfo", ':');
   const auto total = entries.find("SwapTotal");

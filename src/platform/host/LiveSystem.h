@@ -12,6 +12,9 @@ namespace vesprun::live {
 
 std::string osVersion();  ///< as /etc/os-release names it, for example "Debian GNU/Linux 12"
 
+/// The OS's build: BUILD_ID of /etc/os-release, else its VERSION_ID, else the kernel's release.
+std::string osBuild();
+
 /// The record "vm.swapusage": total, free and used bytes (u64), page size and a flag (u32).
 std::optional<Bytes> swapUsage();
 
