@@ -47,10 +47,10 @@ class PropertyDict {
   bool contains(std::string_view key) const { return find(key) != nullptr; }
 
   void set(std::string_view key, PropertyValue value) {
-    if (auto entry = _entries.find(key); entry != _entries.end()) {
-      entry.value() = std::move(value);
-    } else {
-      _entries.emplace(std::string(key), std::move(value));
+    // Most keys are new: one search finds that out and where they go.
+    auto [entry, isNew] = _entries.try_emplace(std::string(key), std::move(value));
+    if (!isNew) {
+      entry.value() = std::move(value);  // which was not taken
     }
   }
   /// Removes the entry, keeping the order of the others; false when there was none.

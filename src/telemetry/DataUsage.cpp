@@ -103,6 +103,8 @@ class UsageReply {
         }
       }
     }
+    // Before the baseline: a process that is killed in between counts growth again, and loses none.
+    _tallybook.TBClientCheckpoint();
     _preferences.LGSPreferencesSetValue(kBaselineKey, std::move(_newBaseline), kBaselineDomain);
     _preferences.LGSPreferencesSynchronize(kBaselineDomain);
   }

@@ -180,19 +180,21 @@ TEST_F(MessageServiceTest, BytesOfNoMessageDoNotProlongASlice) {
   EXPECT_THAT(received, ElementsAre("served"));
 }
 
-TEST_F(MessageServiceTest, PeersBeyondTheLimitWaitForRoom) {
+TEST_F(MessageServiceTest, APeerBeyondTheLimitTakesThePlaceOfTheQuietest) {
   const std::unique_ptr<ServiceListener> listener = listen();
   std::vector<FileDescriptor> stallers;
   for (int i = 0; i < 16; ++i) {
     stallers.push_back(peer());
     eventsUntilQuiet();
   }
-  const FileDescriptor waiting = peer();
-  send(waiting, frame(text("in the end")));
-  EXPECT_EQ(eventsUntilQuiet(), 0);
-  stallers.pop_back();
-  EXPECT_EQ(eventsUntilQuiet(), 2);
-  EXPECT_THAT(received, ElementsAre("in the end"));
+  send(stallers.front(), "\x01");
+  eventsUntilQuiet();
+  const FileDescriptor last = peer();
+  send(last, frame(text("served")));
+  eventsUntilQuiet();
+  EXPECT_THAT(received, ElementsAre("served"));
+  EXPECT_TRUE(isEnded(stallers[1]));
+  EXPECT_FALSE(isEnded(stallers[0]));
 }
 
 TEST_F(MessageServiceTest, TurnsAwayWhoIsNotStartedOrIsAnotherUser) {

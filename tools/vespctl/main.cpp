@@ -1,4 +1,5 @@
 #include <cstdio>
+#include <iostream>
 
 #include "Command.h"
 
@@ -21,6 +22,10 @@ int main(int argc, char** argv) {
     return vespctl.exit(error) == 0 ? 0 : 2;
   } catch (const vesprun::CommandFailure& failure) {
     std::fprintf(stderr, "vespctl: %s\n", failure.what());
+    return 1;
+  }
+  if (!std::cout.flush() || std::fflush(stdout) != 0) {
+    std::fprintf(stderr, "vespctl: standard output cannot be written\n");
     return 1;
   }
   return 0;

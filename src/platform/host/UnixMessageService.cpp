@@ -2,8 +2,10 @@
 
 #include <sys/socket.h>
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
+#include <chrono>
 #include <cstring>
 #include <map>
 #include <utility>
@@ -24,6 +26,10 @@ class UnixPeer final : public PeerConnection {
   void setMessageHandler(MessageHandler handler) override { _handler = std::move(handler); }
   void start() override { _started = true; }
 
+  /// When it came, or last sent anything.
+  std::chrono::steady_clock::time_point lastHeard() const { return _lastHeard; }
+  void noteHeard() { _lastHeard = std::chrono::steady_clock::now(); }
+
   int descriptor() const { return _socket.get(); }
   bool isStarted() const { return _started; }
   MessageAssembler& assembler() { return _assembler; }
@@ -37,6 +43,7 @@ class UnixPeer final : public PeerConnection {
   FileDescriptor _socket;
   MessageHandler _handler;
   MessageAssembler _assembler;
+  std::chrono::steady_clock::time_point _lastHeard = std::chrono::steady_clock::now();
   bool _started = false;
 };
 
@@ -77,7 +84,7 @@ class UnixServiceListener final : public ServiceListener {
   }
 
   void watchForPeers() {
-    if (_started && _peers.size() < kMostPeers) {
+    if (_started) {
       _mainLoop.watch(_socket.descriptor(), [this] { acceptPeer(); });
     }
   }
@@ -97,11 +104,15 @@ class UnixServiceListener final : public ServiceListener {
       tell("a peer of another user is turned away");
       return;
     }
+    if (_peers.size() == kMostPeers) {
+      const auto quietest =
+          std::min_element(_peers.begin(), _peers.end(), [](const auto& left, const auto& right) {
+            return left.second->lastHeard() < right.second->lastHeard();
+          });
+      drop(*PeerPointer(quietest->second), "others wait, and it has been silent longest");
+    }
     const auto peer = std::make_shared<UnixPeer>(std::move(socket));
     _peers.emplace(peer->descriptor(), peer);
-    if (_peers.size() == kMostPeers) {
-      _mainLoop.unwatch(_socket.descriptor());
-    }
     queueWork([this, peer] { introduce(peer); });
   }
 
@@ -124,6 +135,7 @@ class UnixServiceListener final : public ServiceListener {
       }
       return;
     }
+    peer->noteHeard();
     MessageAssembler& assembler = peer->assembler();
     if (count == 0) {
       drop(*peer, assembler.isInsideMessage() ? "it ended in the middle of a message" : "");

@@ -1,0 +1,57 @@
+// A look-up among 10,000 prefixes against one among 10.
+
+#include <benchmark/benchmark.h>
+
+#include <algorithm>
+#include <random>
+#include <string>
+#include <vector>
+
+#include "config/PrefixTable.h"
+
+namespace vesprun {
+namespace {
+
+/// Prefixes as whitelists have them: a domain, a subsystem and the beginning of a name.
+std::string prefix(int number) {
+  return "com.quill.subsystem" + std::to_string(number % 100) + ".group" +
+         std::to_string(number / 100) + '.';
+}
+
+/// Two of three keys begin with one of the prefixes. Of the others, one half differs from a prefix
+/// only near its end, the other half has nothing in common with any.
+std::vector<std::string> keys(int prefixCount) {
+  constexpr int kKeys = 1024;
+  std::vector<std::string> keys;
+  for (int i = 0; i < kKeys; ++i) {
+    std::string key = prefix(i * 7919 % prefixCount);
+    if (i % 6 == 4) {
+      key.back() = '_';
+    } else if (i % 6 == 5) {
+      key.replace(0, 3, "org");
+    }
+    keys.push_back(key + "counter" + std::to_string(i));
+  }
+  std::shuffle(keys.begin(), keys.end(), std::mt19937(20240305));
+  return keys;
+}
+
+void lookUp(benchmark::State& state) {
+  const int prefixCount = static_cast<int>(state.range(0));
+  PropertyDict prefixes;
+  for (int i = 0; i < prefixCount; ++i) {
+    prefixes.set(prefix(i), PropertyDict());
+  }
+  const PrefixTable table(prefixes);
+  const std::vector<std::string> searched = keys(prefixCount);
+  for (auto _ : state) {
+    for (const std::string& key : searched) {
+      benchmark::DoNotOptimize(table.find(key));
+    }
+  }
+}
+
+BENCHMARK(lookUp)->Arg(10)->Arg(10'000);
+
+}  // namespace
+}  // namespace vesprun
