@@ -1,6 +1,6 @@
 #pragma once
 
-#include <string>
+#include "vesprun.h"
 
 namespace vesprun {
 
@@ -8,9 +8,6 @@ namespace vesprun {
 /// bytes. By convention it begins with the name of the operation that failed. Once a text has been
 /// recorded, even an empty one, further calls do nothing and do not look at their arguments.
 [[gnu::format(printf, 1, 2)]] void SetAPIErrorMessage(const char* format, ...);
-
-/// The recorded text, or "NA" when none has been recorded.
-std::string GetAPIErrorMessage();
 
 /// Makes the process as new: nothing recorded. For tests; the job itself never forgets.
 void forgetAPIErrorMessage();

@@ -1,4 +1,4 @@
-#include "NANDInfo/ContentDeletion.h"
+#include "vesprun.h"
 
 #include <array>
 #include <cstdint>

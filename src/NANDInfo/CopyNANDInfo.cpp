@@ -7,6 +7,7 @@
 #include "NANDInfo/APIErrorMessage.h"
 #include "NANDInfo/NANDInfo.h"
 #include "NANDInfo/parsers/ORUStatsContext.h"
+#include "common/Date.h"
 #include "platform/Platform.h"
 
 namespace vesprun {

@@ -1,4 +1,4 @@
-#include "NANDInfo/MagazineDeltas.h"
+#include "vesprun.h"
 
 #include <optional>
 #include <string>
@@ -10,6 +10,7 @@
 #include "NANDInfo/MagazineSnapshot.h"
 #include "NANDInfo/NANDInfo.h"
 #include "NANDInfo/StorageHealthFields.h"
+#include "common/Date.h"
 
 namespace vesprun {
 namespace {

@@ -7,10 +7,10 @@
 #include "NANDInfo/EventFields.h"
 #include "NANDInfo/FieldNumber.h"
 #include "NANDInfo/FilteredDict.h"
-#include "NANDInfo/MagazineDeltas.h"
 #include "NANDInfo/MagazineHistory.h"
 #include "NANDInfo/MagazineSnapshot.h"
 #include "platform/Platform.h"
+#include "vesprun.h"
 
 namespace vesprun {
 namespace {

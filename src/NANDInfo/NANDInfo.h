@@ -4,7 +4,7 @@
 #include <optional>
 
 #include "NANDInfo/NandExporter.h"
-#include "common/PropertyValue.h"
+#include "vesprun.h"
 
 namespace vesprun {
 
@@ -42,21 +42,5 @@ PropertyDict CreateNANDInfoDict(const ORUStatsContext& context, bool omitVersion
 /// "HLT_Reclaimer_totalPurgeable" and "HLT_Reclaimer_totalNonPurgeable", each only when the
 /// purgeable-space service gives it, as it gives it.
 PropertyDict getReclaimerInfo();
-
-/// The legacy NAND info with its version fields and the purgeable space. On failure a dictionary
-/// with "com.quill.NANDInfo.Error" and "com.quill.NANDInfo.ErrorMessage" instead.
-PropertyDict CopyNANDInfo();
-
-/// `CopyNANDInfo` for the daily log; empty on a day of `NandInfoShouldLogAllToEH`. `options` is not
-/// consulted. Nothing when there is nothing to log.
-std::optional<PropertyDict> CopyNANDInfoWithOptions(const PropertyDict& options);
-
-/// Sets the legacy NAND info without its version fields in `info`, replacing what has the same
-/// keys. Nothing happens on failure.
-void DumpNANDInfo(PropertyDict& info);
-
-/// The FTL fields of now with "HLT_APIErrorMessage", unfiltered. Nothing when `enabled` is 0 or on
-/// failure.
-std::optional<PropertyDict> CopyNANDFTLInfo(bool useStatKeyParser, std::uint32_t enabled);
 
 }  // namespace vesprun

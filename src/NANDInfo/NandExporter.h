@@ -6,6 +6,7 @@
 #include <string>
 
 #include "platform/DeviceRegistry.h"
+#include "vesprun.h"
 
 namespace vesprun {
 
@@ -87,21 +88,5 @@ bool findNandExporterNew(nand_exporter_t*& exporter);
 
 /// Closes the entry's connection and releases its service, if any, and forgets them.
 void ReleaseIOInterfaces(nand_exporter_t& exporter);
-
-/// A connection to the storage controller for other programs; theirs to keep between
-/// `openORUConnection` and `closeORUConnection`.
-struct ORUConnection {
-  RegistryHandle service = 0;
-  RegistryHandle connection = 0;
-  nand_exporter_t* exporter = nullptr;
-};
-
-/// Opens the storage controller. False, with lines on the standard error stream and nothing left
-/// open, when there is none, when it refuses, or when it offers no base statistics. The
-/// connection's handle is written into the table entry, too, and stays there when it is closed.
-bool openORUConnection(ORUConnection& connection);
-
-/// Closes the record's connection and releases its service, if any, and forgets them.
-void closeORUConnection(ORUConnection& connection);
 
 }  // namespace vesprun

@@ -7,8 +7,8 @@
 #include "NANDInfo/EventExtraction.h"
 #include "NANDInfo/EventFields.h"
 #include "NANDInfo/FilteredDict.h"
-#include "NANDInfo/WhitelistedFieldSets.h"
 #include "platform/Platform.h"
+#include "vesprun.h"
 
 namespace vesprun {
 namespace {

@@ -10,9 +10,9 @@
 #include "NANDInfo/FieldNumber.h"
 #include "NANDInfo/FieldSets.h"
 #include "NANDInfo/NANDInfo.h"
-#include "NANDInfo/VMFreezer.h"
 #include "platform/Platform.h"
 #include "telemetry/DiskInfo.h"
+#include "vesprun.h"
 
 namespace vesprun {
 namespace {

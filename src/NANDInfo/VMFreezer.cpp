@@ -1,4 +1,4 @@
-#include "NANDInfo/VMFreezer.h"
+#include "vesprun.h"
 
 #include <cstddef>
 #include <optional>

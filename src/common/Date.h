@@ -1,21 +1,13 @@
 #pragma once
 
-#include <compare>
 #include <cstdint>
 #include <optional>
 #include <string>
 #include <string_view>
 
+#include "common/Instant.h"
+
 namespace vesprun {
-
-/// An instant, in seconds since 1970-01-01 00:00 UTC (leap seconds not counted) and nanoseconds
-/// after that second. `nanoseconds` is always 0 to 999,999,999, also before 1970.
-struct Date {
-  std::int64_t seconds = 0;
-  std::uint32_t nanoseconds = 0;
-
-  auto operator<=>(const Date&) const = default;
-};
 
 inline constexpr std::int64_t kSecondsPerDay = 86400;
 

@@ -6,6 +6,8 @@
 #include <cstdlib>
 #include <string_view>
 
+#include "common/Date.h"
+
 namespace vesprun {
 namespace {
 

@@ -6,13 +6,9 @@
 #include <string>
 
 #include "common/PropertyValue.h"
+#include "common/RegistryHandle.h"
 
 namespace vesprun {
-
-/// A handle of a registry object (an entry or an iterator) or of a user-client connection; 0 is
-/// none. Whoever is given a handle gives it back: objects with `DevRegObjectRelease`, connections
-/// with `DevRegServiceClose`. `RegistryObject` does so by itself.
-using RegistryHandle = std::uint32_t;
 
 /// The result of a registry operation: 0 is success, anything else the driver's error code.
 using RegistryResult = std::uint32_t;
@@ -20,7 +16,9 @@ using RegistryResult = std::uint32_t;
 inline constexpr RegistryResult kRegistrySuccess = 0;
 
 /// The device registry: a tree of driver objects, and the user-client connections to them. Every
-/// look-up of an object gives a handle of its own, even when the object was found before.
+/// look-up of an object gives a handle of its own, even when the object was found before. Whoever
+/// is given a handle gives it back: objects with `DevRegObjectRelease`, connections with
+/// `DevRegServiceClose`. `RegistryObject` does so by itself.
 class DeviceRegistry {
  public:
   enum class SearchDirection { Parents, Children };

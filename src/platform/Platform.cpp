@@ -1,6 +1,8 @@
 #include "platform/Platform.h"
 
 #include <cassert>
+#include <cstdio>
+#include <cstdlib>
 
 namespace vesprun {
 namespace {
@@ -9,8 +11,13 @@ Platform* gInstalledPlatform = nullptr;
 
 }  // namespace
 
+bool platformIsInstalled() { return gInstalledPlatform != nullptr; }
+
 Platform& platform() {
-  assert(gInstalledPlatform != nullptr);
+  if (gInstalledPlatform == nullptr) {
+    std::fputs("vesprun: no device is open\n", stderr);
+    std::abort();
+  }
   return *gInstalledPlatform;
 }
 

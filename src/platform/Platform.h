@@ -63,7 +63,9 @@ class Platform {
   virtual Tapline& tapline() = 0;
 };
 
-/// The installed platform. There must be one.
+bool platformIsInstalled();
+
+/// The installed platform. Without one the process ends, with a line on the standard error stream.
 Platform& platform();
 
 /// Installs a platform for as long as it lives; a process has exactly one at a time.

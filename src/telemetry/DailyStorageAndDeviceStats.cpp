@@ -4,13 +4,13 @@
 
 #include "NANDInfo/NANDInfo.h"
 #include "NANDInfo/StructuredLog.h"
-#include "NANDInfo/VMFreezer.h"
 #include "platform/Platform.h"
 #include "telemetry/DataUsage.h"
 #include "telemetry/DiskUsage.h"
 #include "telemetry/KernelECCEvents.h"
 #include "telemetry/NANDInfoScalars.h"
 #include "telemetry/ReportingChannels.h"
+#include "vesprun.h"
 
 namespace vesprun {
 namespace {

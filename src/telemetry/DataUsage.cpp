@@ -7,6 +7,7 @@
 #include <string>
 #include <utility>
 
+#include "common/Date.h"
 #include "platform/Platform.h"
 
 namespace vesprun {

@@ -10,6 +10,7 @@
 
 #include "NANDInfo/NANDInfo.h"
 #include "NANDInfo/StructuredLogState.h"
+#include "common/Date.h"
 #include "common/LittleEndian.h"
 #include "common/TextForm.h"
 #include "platform/Platform.h"

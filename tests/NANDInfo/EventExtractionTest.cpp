@@ -2,14 +2,12 @@
 
 #include <gmock/gmock.h>
 
-#include "NANDInfo/ContentDeletion.h"
 #include "NANDInfo/EventFields.h"
-#include "NANDInfo/MagazineDeltas.h"
 #include "NANDInfo/MagazineEvents.h"
 #include "NANDInfo/MagazineHistory.h"
 #include "NANDInfo/StatisticsDevice.h"
-#include "NANDInfo/WhitelistedFieldSets.h"
 #include "support/WatchedRegistry.h"
+#include "vesprun.h"
 
 namespace vesprun {
 namespace {

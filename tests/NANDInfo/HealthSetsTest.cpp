@@ -2,10 +2,10 @@
 
 #include <gmock/gmock.h>
 
-#include "NANDInfo/ContentDeletion.h"
 #include "NANDInfo/StatisticsDevice.h"
 #include "common/TextForm.h"
 #include "support/WatchedRegistry.h"
+#include "vesprun.h"
 
 namespace vesprun {
 namespace {

@@ -1,6 +1,6 @@
-#include "NANDInfo/MagazineDeltas.h"
 #include "NANDInfo/MagazineHistory.h"
 #include "NANDInfo/StatisticsDevice.h"
+#include "vesprun.h"
 
 namespace vesprun {
 namespace {

@@ -1,8 +1,8 @@
 #include "NANDInfo/StorageHealthFields.h"
 
 #include "NANDInfo/StatisticsDevice.h"
-#include "NANDInfo/VMFreezer.h"
 #include "support/SnapshotBuilder.h"
+#include "vesprun.h"
 
 namespace vesprun {
 namespace {

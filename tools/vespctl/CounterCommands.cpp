@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "Command.h"
+#include "common/Date.h"
 #include "platform/host/CounterLines.h"
 #include "platform/host/QuotedText.h"
 #include "platform/host/SqliteTallybook.h"

@@ -6,6 +6,7 @@
 #include <iomanip>
 #include <string>
 
+#include "common/Date.h"
 #include "common/TextForm.h"
 
 namespace vesprun {

@@ -2,20 +2,17 @@
 
 #include "Command.h"
 #include "NANDInfo/APIErrorMessage.h"
-#include "NANDInfo/ContentDeletion.h"
 #include "NANDInfo/EventExtraction.h"
 #include "NANDInfo/HealthSets.h"
-#include "NANDInfo/MagazineDeltas.h"
 #include "NANDInfo/MagazineHistory.h"
 #include "NANDInfo/NANDInfo.h"
 #include "NANDInfo/NandExporter.h"
 #include "NANDInfo/StructuredLog.h"
 #include "NANDInfo/StructuredLogState.h"
-#include "NANDInfo/VMFreezer.h"
-#include "NANDInfo/WhitelistedFieldSets.h"
 #include "platform/host/JsonForm.h"
 #include "telemetry/DiskInfo.h"
 #include "telemetry/NVRAMStatistics.h"
+#include "vesprun.h"
 
 namespace vesprun {
 namespace {

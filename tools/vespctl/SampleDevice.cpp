@@ -6,6 +6,7 @@
 #include "Command.h"
 #include "SampleCounters.h"
 #include "SampleDescription.h"
+#include "common/Date.h"
 #include "platform/host/AtomicFile.h"
 #include "platform/host/PtreeWriter.h"
 #include "platform/host/SqliteTallybook.h"

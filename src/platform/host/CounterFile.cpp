@@ -12,6 +12,7 @@
 #include <string_view>
 #include <thread>
 
+#include "common/Date.h"
 #include "platform/host/AtomicFile.h"
 #include "platform/host/FileDescriptor.h"
 

@@ -6,6 +6,7 @@
 #include <nlohmann/json.hpp>
 #include <string_view>
 
+#include "common/Date.h"
 #include "platform/host/JsonForm.h"
 
 namespace vesprun {

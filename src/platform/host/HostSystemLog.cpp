@@ -3,6 +3,7 @@
 #include <cstdio>
 #include <string>
 
+#include "common/Date.h"
 #include "platform/host/JsonForm.h"
 
 namespace vesprun {

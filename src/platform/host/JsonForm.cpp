@@ -9,6 +9,7 @@
 #include <utility>
 #include <vector>
 
+#include "common/Date.h"
 #include "platform/host/Base64.h"
 #include "platform/host/QuotedText.h"
 

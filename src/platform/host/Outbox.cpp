@@ -8,6 +8,7 @@
 #include <cstdio>
 #include <filesystem>
 
+#include "common/Date.h"
 #include "platform/host/AtomicFile.h"
 #include "platform/host/JsonForm.h"
 

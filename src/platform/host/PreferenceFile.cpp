@@ -8,6 +8,7 @@
 #include <ctime>
 #include <utility>
 
+#include "common/Date.h"
 #include "platform/host/AtomicFile.h"
 #include "platform/host/PtreeReader.h"
 #include "platform/host/PtreeWriter.h"

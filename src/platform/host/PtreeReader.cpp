@@ -8,6 +8,7 @@
 #include <pugixml.hpp>
 #include <utility>
 
+#include "common/Date.h"
 #include "platform/host/Base64.h"
 #include "platform/host/PtreeSyntax.h"
 #include "platform/host/QuotedText.h"

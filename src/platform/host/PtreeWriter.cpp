@@ -5,6 +5,7 @@
 #include <cstddef>
 #include <string_view>
 
+#include "common/Date.h"
 #include "platform/host/Base64.h"
 #include "platform/host/PtreeSyntax.h"
 #include "platform/host/QuotedText.h"

@@ -2,6 +2,8 @@
 
 #include <optional>
 
+#include "common/Date.h"
+
 namespace vesprun {
 namespace {
 

@@ -1,7 +1,9 @@
 #pragma once
 
+#include <cmath>
 #include <concepts>
 #include <cstdint>
+#include <limits>
 
 namespace vesprun {
 
@@ -18,9 +20,27 @@ enum class NumberKind : std::uint8_t {
   Double
 };
 
+namespace detail {
+
+inline constexpr double kTwoTo63 = 9223372036854775808.0;
+inline constexpr double kTwoTo64 = 18446744073709551616.0;
+
+}  // namespace detail
+
 /// A double as a signed 64-bit integer: truncated toward zero, saturating at the ends of the range,
 /// 0 for NaN.
-std::int64_t saturatingTruncate(double value);
+inline std::int64_t saturatingTruncate(double value) {
+  if (std::isnan(value)) {
+    return 0;
+  }
+  if (value >= detail::kTwoTo63) {
+    return std::numeric_limits<std::int64_t>::max();
+  }
+  if (value < -detail::kTwoTo63) {
+    return std::numeric_limits<std::int64_t>::min();
+  }
+  return static_cast<std::int64_t>(value);
+}
 
 template <typename T>
 concept NumberType = std::same_as<T, std::int8_t> || std::same_as<T, std::int16_t> ||
@@ -75,11 +95,62 @@ class Number {
     }
   }
 
+  static bool equalsInteger(double real, const Number& integer) {
+    if (real != std::trunc(real)) {
+      return false;
+    }
+    if (integer.isSigned() && integer.asInt64() < 0) {
+      return real >= -detail::kTwoTo63 && real < 0 &&
+             static_cast<std::int64_t>(real) == integer.asInt64();
+    }
+    return real >= 0 && real < detail::kTwoTo64 &&
+           static_cast<std::uint64_t>(real) == integer.asUInt64();
+  }
+
   union {
     std::uint64_t _bits;  ///< integers, sign- or zero-extended
     double _real;         ///< fractions; a float widens exactly
   };
   NumberKind _kind;
 };
+
+inline std::int64_t Number::asInt64() const {
+  return isFloatingPoint() ? saturatingTruncate(_real) : static_cast<std::int64_t>(_bits);
+}
+
+inline std::uint64_t Number::asUInt64() const {
+  if (!isFloatingPoint()) {
+    return _bits;
+  }
+  if (_real >= detail::kTwoTo64) {
+    return std::numeric_limits<std::uint64_t>::max();
+  }
+  // A negative fraction takes the bits of its signed reading, as a negative integer does.
+  return _real >= 0 ? static_cast<std::uint64_t>(_real)
+                    : static_cast<std::uint64_t>(saturatingTruncate(_real));
+}
+
+inline double Number::asDouble() const {
+  if (isFloatingPoint()) {
+    return _real;
+  }
+  return isSigned() ? static_cast<double>(static_cast<std::int64_t>(_bits))
+                    : static_cast<double>(_bits);
+}
+
+inline bool operator==(const Number& left, const Number& right) {
+  if (left.isFloatingPoint() && right.isFloatingPoint()) {
+    return left._real == right._real;
+  }
+  if (left.isFloatingPoint()) {
+    return Number::equalsInteger(left._real, right);
+  }
+  if (right.isFloatingPoint()) {
+    return Number::equalsInteger(right._real, left);
+  }
+  const bool leftNegative = left.isSigned() && left.asInt64() < 0;
+  const bool rightNegative = right.isSigned() && right.asInt64() < 0;
+  return leftNegative == rightNegative && left._bits == right._bits;
+}
 
 }  // namespace vesprun

@@ -2,6 +2,7 @@
 
 #include <tsl/ordered_map.h>
 
+#include <algorithm>
 #include <cstddef>
 #include <functional>
 #include <initializer_list>
@@ -11,7 +12,7 @@
 #include <utility>
 #include <vector>
 
-#include "common/PropertyValue.h"
+#include "PropertyValue.h"
 
 namespace vesprun {
 
@@ -81,5 +82,51 @@ class PropertyDict {
  private:
   Map _entries;
 };
+
+// What a value can only do where a dictionary is complete.
+
+inline PropertyValue::PropertyValue(PropertyDict dict)
+    : _value(std::make_unique<PropertyDict>(std::move(dict))) {}
+
+inline PropertyValue::PropertyValue(const PropertyValue& other) : _value(copyOf(other._value)) {}
+
+inline PropertyValue& PropertyValue::operator=(const PropertyValue& other) {
+  if (this != &other) {
+    _value = copyOf(other._value);
+  }
+  return *this;
+}
+
+inline PropertyValue::~PropertyValue() = default;
+
+inline PropertyValue::Value PropertyValue::copyOf(const Value& value) {
+  return std::visit(
+      [](const auto& held) -> Value {
+        if constexpr (std::same_as<std::decay_t<decltype(held)>, DictBox>) {
+          return std::make_unique<PropertyDict>(*held);
+        } else {
+          return held;
+        }
+      },
+      value);
+}
+
+inline bool operator==(const PropertyValue& left, const PropertyValue& right) {
+  if (left._value.index() != right._value.index()) {
+    return false;
+  }
+  if (const PropertyDict* dict = left.dict()) {
+    return *dict == *right.dict();
+  }
+  return left._value == right._value;
+}
+
+inline bool operator==(const PropertyDict& left, const PropertyDict& right) {
+  return left.size() == right.size() &&
+         std::all_of(left.begin(), left.end(), [&right](const auto& entry) {
+           const PropertyValue* value = right.find(entry.first);
+           return value != nullptr && *value == entry.second;
+         });
+}
 
 }  // namespace vesprun

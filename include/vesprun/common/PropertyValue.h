@@ -8,8 +8,8 @@
 #include <variant>
 #include <vector>
 
-#include "common/Date.h"
-#include "common/Number.h"
+#include "Instant.h"
+#include "Number.h"
 
 namespace vesprun {
 
@@ -73,4 +73,4 @@ class PropertyValue {
 
 }  // namespace vesprun
 
-#include "common/PropertyDict.h"  // IWYU pragma: export: a value is complete only with it
+#include "PropertyDict.h"  // IWYU pragma: export: a value is complete only with it
