@@ -87,8 +87,7 @@ VESPRUN_EXPORT std::optional<PropertyDict> CopyWhitelistedNANDFTLCountersInfo();
 
 /// The set of each MSP under its index ("0", "1" and so on), beside the error text. A set goes with
 /// the fields derived for the storage as a whole and the 16-bit parts of the firmware's version,
-/// "fw_version_identifier_0" (the lowest) to "fw_version_identifier_3", none of them rounded. There
-/// are neither when the derived fields cannot be had.
+/// "fw_version_identifier_0" (the lowest) to "fw_version_identifier_3", none of them rounded.
 VESPRUN_EXPORT PropertyDict CopyWhitelistedNANDMSPInfo(bool round);
 
 /// Six derived fields, each when it can be had, and the sizes and update counts of the stored

@@ -88,10 +88,12 @@ void logDefect(const DefectRecord& defect, bool modeAdjustsReason) {
 
 bool LogFactoryDefectList(std::span<const std::uint8_t> buffer, const PropertyValue* properties,
                           std::string_view className) {
+  if (buffer.size() >= kRecordCountOffset) {
+    logHeader(loadLittleEndian<std::uint32_t>(buffer.data() + kFactoryCountOffset), properties);
+  }
   if (buffer.size() < kHeaderSize) {
     return true;
   }
-  logHeader(loadLittleEndian<std::uint32_t>(buffer.data() + kFactoryCountOffset), properties);
   const std::size_t stated = loadLittleEndian<std::uint32_t>(buffer.data() + kRecordCountOffset);
   const std::size_t count = std::min(stated, (buffer.size() - kHeaderSize) / kRecordSize);
   for (std::size_t i = 0; i < count; ++i) {

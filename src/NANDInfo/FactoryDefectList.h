@@ -14,7 +14,8 @@ namespace vesprun {
 /// "Temperature", which is signed 8-bit.
 ///
 /// `properties` (may be null or anything but a dictionary) and `className` are the controller's.
-/// Always true. A buffer too short for its header of 12 bytes has nothing to log.
+/// Always true. A buffer too short for the factory count has nothing to log, one too short for the
+/// record count no records.
 bool LogFactoryDefectList(std::span<const std::uint8_t> buffer, const PropertyValue* properties,
                           std::string_view className);
 

@@ -84,17 +84,12 @@ PropertyDict CopyWhitelistedNANDMSPInfo(bool round) {
   PropertyDict sets;
   if (const std::optional<PropertyDict> fieldsByIndex = gatherORUMSPData()) {
     const PropertyDict derived = gatherORUOtherData();
-    if (derived.empty()) {
-      SetAPIErrorMessage("CopyWhitelistedNANDMSPInfo: Unable to gather HLT MSP fields");
-    }
     for (const auto& [index, fields] : *fieldsByIndex) {
       const PropertyDict& msp = *fields.dict();
       PropertyDict set =
           CreateFilteredDict_SigDig(msp, &WhitelistedRawNANDMSPCounters_SigDigDict, round);
-      if (!derived.empty()) {
-        set.merge(derived);
-        addFirmwareVersionParts(msp, set);
-      }
+      set.merge(derived);
+      addFirmwareVersionParts(msp, set);
       sets.set(index, std::move(set));
     }
   } else {

@@ -1,3 +1,6 @@
+#include <unistd.h>
+
+#include <cstdio>
 #include <iostream>
 
 #include "Command.h"
@@ -9,6 +12,7 @@
 #include "NANDInfo/NandExporter.h"
 #include "NANDInfo/StructuredLog.h"
 #include "NANDInfo/StructuredLogState.h"
+#include "platform/host/FileDescriptor.h"
 #include "platform/host/JsonForm.h"
 #include "telemetry/DiskInfo.h"
 #include "telemetry/NVRAMStatistics.h"
@@ -135,10 +139,31 @@ constexpr NandVerb kVerbs[] = {
      [](const NandArguments&) { return std::optional<PropertyValue>(connectsToController()); }},
 };
 
+/// Sends what is printed to standard output to standard error as long as it lives: entry points
+/// print there, and would come between a reader and the result.
+class StandardOutputAside {
+ public:
+  StandardOutputAside() : _kept(dup(STDOUT_FILENO)) { dup2(STDERR_FILENO, STDOUT_FILENO); }
+  ~StandardOutputAside() {
+    std::fflush(stdout);
+    dup2(_kept.get(), STDOUT_FILENO);
+  }
+  StandardOutputAside(const StandardOutputAside&) = delete;
+  StandardOutputAside& operator=(const StandardOutputAside&) = delete;
+
+ private:
+  FileDescriptor _kept;
+};
+
+std::optional<PropertyValue> callAside(const NandVerb& verb, const NandArguments& arguments) {
+  const StandardOutputAside aside;
+  return verb.call(arguments);
+}
+
 void callVerb(const NandVerb& verb, const NandArguments& arguments) {
   const std::unique_ptr<HostPlatform> device = openDevice(arguments.device);
   const InstalledPlatform installed(*device);
-  const std::optional<PropertyValue> result = verb.call(arguments);
+  const std::optional<PropertyValue> result = callAside(verb, arguments);
   std::cout << "{\"result\":" << (result ? jsonText(*result) : "null")
             << ",\"error\":" << jsonText(PropertyValue(GetAPIErrorMessage())) << "}\n";
 }
