@@ -1,7 +1,5 @@
 #include "NANDInfo/APIErrorMessage.h"
 
-#include <gtest/gtest.h>
-
 namespace vesprun {
 namespace {
 

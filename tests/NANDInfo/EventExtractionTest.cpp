@@ -85,19 +85,17 @@ TEST_F(EventExtractionTest, AllStepsSendTheirEvents) {
           << kAllEvents[i] << ' ' << key;
     }
   }
-  EXPECT_EQ(*payload(0).find("hostWrites"), PropertyValue(9000));
+  const std::tuple<std::size_t, const char*, PropertyValue> figures[] = {
+      {0, "hostWrites", 9000},      {1, "gracefulBootTimeLogMs_0", 1},
+      {5, "fw_updates", 42},        {5, "msp_index", "2"},
+      {5, "total_nof_msps", 3},     {6, "EAN_updateCount_FW", 2},
+      {8, "hostWrites", 24.0},      {8, "HLT_instantaneous_gc_wamp_5", 0},
+      {9, "HLT_SM_deltaDays", 7.0}, {10, "HLT_SM_deltaDays", 30.0}};
+  for (const auto& [i, key, value] : figures) {
+    EXPECT_EQ(*payload(i).find(key), value) << key;
+  }
   EXPECT_FALSE(payload(0).contains("HLT_APIErrorMessage"));
-  EXPECT_EQ(*payload(1).find("gracefulBootTimeLogMs_0"), PropertyValue(1));
-  EXPECT_EQ(*payload(5).find("fw_updates"), PropertyValue(42));
-  EXPECT_EQ(*payload(5).find("msp_index"), PropertyValue("2"));
-  EXPECT_EQ(*payload(5).find("total_nof_msps"), PropertyValue(3));
-  EXPECT_EQ(*payload(6).find("EAN_updateCount_FW"), PropertyValue(2));
-  EXPECT_EQ(*payload(8).find("hostWrites"), PropertyValue(24.0));
-  EXPECT_EQ(*payload(8).find("HLT_instantaneous_gc_wamp_5"), PropertyValue(0));
   EXPECT_FALSE(payload(9).contains("HLT_instantaneous_gc_wamp_5"));
-  EXPECT_EQ(*payload(9).find("HLT_SM_deltaDays"), PropertyValue(7.0));
-  EXPECT_EQ(*payload(10).find("HLT_SM_deltaDays"), PropertyValue(30.0));
-
   EXPECT_EQ(*results->find("hostWrites"), PropertyValue(720.0));
   EXPECT_EQ(*results->find("norwrites"), PropertyValue(1234));
   EXPECT_EQ(*results->find("msp_index"), PropertyValue(payload(5)));
@@ -155,19 +153,15 @@ TEST_F(EventExtractionTest, StepsThatCannotSend) {
   struct Case {
     std::string others;
     std::uint32_t firstStep;
-    std::string error;
-    std::string log;
+    std::string error, log;
   };
   const std::string skipping = "Skipping Stats Mag Monthly Delta";
   const std::string step = "NANDInfo: NandInfoExtractToEH_runStep: ";
-  const Case cases[] = {
-      {R"(, "events": {"available": false})", 0, "NA", skipping},
-      {"", 6, "NA", skipping},
-      {"", 7, "NANDInfo: unable to log FTL counters to EH",
-       step + "logging FTL counters\n" + step + "unable to log FTL counters\n"},
-      {"", 8, "NA", ""},
-      {"", 0xFFFF'FFFF, "NA", ""},
-  };
+  const Case cases[] = {{R"(, "events": {"available": false})", 0, "NA", skipping},
+                        {"", 6, "NA", skipping},
+                        {"", 7, "NANDInfo: unable to log FTL counters to EH",
+                         step + "logging FTL counters\n" + step + "unable to log FTL counters\n"},
+                        {"", 0xFFFF'FFFF, "NA", ""}};
   for (const Case& given : cases) {
     startWithMagazine(given.others);
     EXPECT_EQ(NandInfoExtractToEH_runAllSteps(0, false, 1, given.firstStep),
@@ -207,28 +201,13 @@ TEST_F(EventExtractionTest, WithoutAController) {
 }
 
 TEST_F(EventExtractionTest, AnyFailingCallLeavesNothingOpen) {
-  const std::function<void()> operations[] = {
-      [] { CopyWhitelistedNANDMSPInfo(true); }, [] { CopyWhitelistedStorageStats(true); },
-      [] { CopySMagNANDFTLInfo(24, 1, 2); },    [] { CopySMagNANDFTLCustomHistoryInfo(0); },
-      [] { NandRecommendsContentDeletion(); },
-  };
-  for (const std::function<void()>& operation : operations) {
-    if (&operation == &operations[4]) {
-      start(controller("ORUStorage", "", R"(, "contentDeletion": {"value": 1})"));
-    } else {
-      startWithMagazine();
-    }
-    WatchedRegistry watched(device().platform());
-    std::size_t failing = 0;
-    errorsOf([&] {
-      do {
-        watched.failCall(++failing);
-        operation();
-        expectNothingHeld();
-      } while (watched.calls().size() >= failing);
-    });
-    EXPECT_GT(failing, 5u);
-  }
+  startWithMagazine();
+  failEveryCall([] { CopyWhitelistedNANDMSPInfo(true); }, 5);
+  failEveryCall([] { CopyWhitelistedStorageStats(true); }, 5);
+  failEveryCall([] { CopySMagNANDFTLInfo(24, 1, 2); }, 5);
+  failEveryCall([] { CopySMagNANDFTLCustomHistoryInfo(0); }, 5);
+  start(controller("ORUStorage", "", R"(, "contentDeletion": {"value": 1})"));
+  failEveryCall([] { NandRecommendsContentDeletion(); }, 5);
 }
 
 }  // namespace

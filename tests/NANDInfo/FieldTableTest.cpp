@@ -1,8 +1,5 @@
 #include "NANDInfo/FieldTable.h"
 
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
 #include <set>
 
 #include "NANDInfo/EventFields.h"
@@ -25,48 +22,29 @@ constexpr FieldTable kTable(kRanges, kIndex);
 static_assert(kTable.size() == 11);
 
 TEST(FieldTable, tellsNumbersAndTheirSpellingApart) {
-  struct Case {
-    const char* name;
-    int digits;  ///< 0: not in the table
-  };
-  const Case cases[] = {
-      {"step10", 1},
-      {"step11", 0},
-      {"step12", 2},
-      {"step14", 2},
-      {"step15", 0},
-      {"step", 4},
-      {"step0", 5},
-      {"step00", 0},
-      {"step3", 5},
-      {"step03", 0},
-      {"step1", 5},
-      {"step_2b", 3},
-      {"step_2", 0},
-      {"step4294967295", 0},
-      {"7", 6},
-      {"77", 0},
-      {"", 0},
-      {"Step", 0},
-      {"step18446744073709551616", 0},
-      {"step 1", 0},
-      {"step_2b0", 0},
-      {"ste", 0},
-      {"step4294967297", 0},
-  };
-  for (const Case& each : cases) {
-    const FieldRange* range = kTable.find(each.name);
-    EXPECT_EQ(range != nullptr ? range->digits : 0, each.digits) << each.name;
+  const std::pair<int, std::vector<const char*>> cases[] = {
+      {1, {"step10"}}, {2, {"step12", "step14"}},        {3, {"step_2b"}},
+      {4, {"step"}},   {5, {"step0", "step1", "step3"}}, {6, {"7"}}};
+  for (const auto& [digits, names] : cases) {
+    for (const char* name : names) {
+      ASSERT_NE(kTable.find(name), nullptr) << name;
+      EXPECT_EQ(kTable.find(name)->digits, digits) << name;
+    }
+  }
+  for (const char* name :
+       {"step11", "step15", "step00", "step03", "step_2", "step_2b0", "step 1", "Step", "ste", "77",
+        "", "step4294967295", "step4294967297", "step18446744073709551616"}) {
+    EXPECT_EQ(kTable.find(name), nullptr) << name;
   }
 }
 
 TEST(FieldTable, findsEveryNameOfEveryTableInItsOwnRange) {
   std::vector<const FieldTable*> tables = {&WhitelistedRawNANDFTLCounters_SigDigDict,
                                            &WhitelistedRawNANDMSPCounters_SigDigDict,
-                                           &WhitelistedStorageStats_SigDigDict,
-                                           &FTLStats4MSPStats,
                                            &PrivacyApprovedSMagNANDFTLCounters_Accum,
                                            &PrivacyApprovedSMagNANDFTLCounters_Dynamic,
+                                           &WhitelistedStorageStats_SigDigDict,
+                                           &FTLStats4MSPStats,
                                            &keyMap};
   for (const EventFields& event : EventHubConfigDetails) {
     tables.push_back(fieldsOfEvent(event.event));
@@ -120,11 +98,7 @@ TEST(FieldTable, namesOnlyFieldsThatTheDecodersMake) {
 }
 
 TEST(LegacyKeyMap, putsTheSuffixOfTheFieldBehindThePrefix) {
-  struct Case {
-    const char* field;
-    std::optional<std::string> key;
-  };
-  const Case cases[] = {
+  const std::pair<const char*, std::optional<std::string>> cases[] = {
       {"numMemChoke", "com.quill.NANDInfo.numMemChoke"},
       {"CacheDepthVsThroughput255", "com.quill.NANDInfo.CacheDepthVsThroughput255"},
       {"CacheDepthVsThroughput256", std::nullopt},
@@ -134,10 +108,9 @@ TEST(LegacyKeyMap, putsTheSuffixOfTheFieldBehindThePrefix) {
       {"coldestCycle1", "com.quill.NANDInfo.IntermediateColdestCycle"},
       {"raidReconstructFailPartition0", "com.quill.NANDInfo.raidReconstructFailPartition"},
       {"raidReconstructFailPartition1", "com.quill.NANDInfo.raidReconstructFailPartition1"},
-      {"", std::nullopt},
-  };
-  for (const Case& each : cases) {
-    EXPECT_EQ(legacyKeyOf(each.field), each.key) << each.field;
+      {"", std::nullopt}};
+  for (const auto& [field, key] : cases) {
+    EXPECT_EQ(legacyKeyOf(field), key) << field;
   }
 }
 

@@ -1,7 +1,5 @@
 #include "NANDInfo/FilteredDict.h"
 
-#include <gtest/gtest.h>
-
 #include <limits>
 
 #include "NANDInfo/SignificantDigits.h"
@@ -12,34 +10,21 @@ namespace {
 
 TEST(RoundSig, roundsHalfUpOnTheDigitThatIsCutOff) {
   constexpr std::uint64_t kMax = std::numeric_limits<std::uint64_t>::max();
-  struct Case {
-    std::uint64_t x, sig, rounded;
-  };
-  const Case cases[] = {
-      {0, 3, 0},
-      {123, 3, 123},
-      {12345, 2, 12000},
-      {12499, 2, 12000},
-      {12500, 2, 13000},
-      {999, 2, 1000},
-      {4, 0, 0},
-      {5, 0, 10},
-      {50, 0, 100},
-      {1'000, 3, 1'000},
-      {99'995, 4, 100'000},
-      {4'999'999'999'999'999, 1, 5'000'000'000'000'000},
-      {10'000'000'000'000'000'000U, 1, 0},
-      {10'000'000'000'000'000'000U, 2, 10'000'000'000'000'000'000U},
-      {kMax, 20, kMax},
-      {kMax, kMax, kMax},
-      {kMax, 19, 4},  // 18446744073709551620 wraps
-      {kMax, 2, 18'000'000'000'000'000'000U},
-      {999'999'999'999'999'999, 18, 1'000'000'000'000'000'000},
-      {999'999'999'999'999'999, 0, 0},  // counts as 19 digits
-      {600'000'000'000'000'000, 0, 1'000'000'000'000'000'000},
-  };
-  for (const Case& each : cases) {
-    EXPECT_EQ(roundSig(each.x, each.sig), each.rounded) << each.x << " to " << each.sig;
+  constexpr std::uint64_t kE17 = 100'000'000'000'000'000;
+  constexpr std::uint64_t kE18 = 10 * kE17;
+  constexpr std::uint64_t kBelow = kE18 - 1;
+  constexpr std::uint64_t kE19 = 10 * kE18;
+  // A sum may wrap, and what is just below 10^18 counts as 19 digits.
+  const std::array<std::uint64_t, 3> cases[] = {
+      {0, 3, 0},          {4, 0, 0},         {5, 0, 10},           {50, 0, 100},
+      {123, 3, 123},      {999, 2, 1000},    {1000, 3, 1000},      {12345, 2, 12000},
+      {12499, 2, 12000},  {12500, 2, 13000}, {99'995, 4, 100'000}, {kE19, 1, 0},
+      {kE19, 2, kE19},    {kMax, 19, 4},     {kMax, 20, kMax},     {kMax, kMax, kMax},
+      {kBelow, 18, kE18}, {kBelow, 0, 0},    {6 * kE17, 0, kE18}};
+  EXPECT_EQ(roundSig(kMax, 2), 18 * kE18);
+  EXPECT_EQ(roundSig(5 * kE17 - 1, 1), 5 * kE17);
+  for (const auto& [x, sig, rounded] : cases) {
+    EXPECT_EQ(roundSig(x, sig), rounded) << x << " to " << sig;
   }
 }
 
@@ -69,10 +54,7 @@ TEST(FilteredDict, keepsListedEntriesInTheOrderOfTheSource) {
 }
 
 TEST(FilteredDict, roundsNumbersOfEveryKindAndNothingElse) {
-  struct Case {
-    PropertyValue value, rounded;
-  };
-  const Case cases[] = {
+  const std::pair<PropertyValue, PropertyValue> cases[] = {
       {std::int8_t{-1}, std::uint64_t{18'000'000'000'000'000'000U}},
       {std::uint32_t{4'294'967'295}, std::uint64_t{4'300'000'000}},
       {12567.9, std::uint64_t{13'000}},
@@ -81,12 +63,11 @@ TEST(FilteredDict, roundsNumbersOfEveryKindAndNothingElse) {
       {Bytes{1, 2, 3}, Bytes{1, 2, 3}},
       {Date{12345, 0}, Date{12345, 0}},
       {PropertyDict{{"a", 12345}}, PropertyDict{{"a", 12345}}},
-      {PropertyArray{12345}, PropertyArray{12345}},
-  };
-  for (const Case& each : cases) {
-    const PropertyDict filtered = CreateFilteredDict_SigDig({{"a", each.value}}, &kTable, true);
+      {PropertyArray{12345}, PropertyArray{12345}}};
+  for (const auto& [value, rounded] : cases) {
+    const PropertyDict filtered = CreateFilteredDict_SigDig({{"a", value}}, &kTable, true);
     ASSERT_NE(filtered.find("a"), nullptr);
-    EXPECT_EQ(*filtered.find("a"), each.rounded);
+    EXPECT_EQ(*filtered.find("a"), rounded);
     if (const Number* number = filtered.find("a")->number()) {
       EXPECT_EQ(number->kind(), NumberKind::UInt64);
     }
@@ -94,25 +75,14 @@ TEST(FilteredDict, roundsNumbersOfEveryKindAndNothingElse) {
 }
 
 TEST(UserCapacity, isThePowerOfTwoAboveButFor1536) {
-  struct Case {
-    std::uint64_t megabytes;
-    std::uint32_t gigabytes;
-  };
-  const Case cases[] = {
-      {0, 0},
-      {500, 0},
-      {1000, 1},
-      {1024, 2},
-      {121'856, 128},
-      {1'376'255, 2048},
-      {1'376'256, 1536},
-      {1'770'495, 1536},
-      {1'770'496, 2048},
-      {0x7'0000'0400, 2},
-      {0xFFFF'FFFF, 4'194'304},
-  };
-  for (const Case& each : cases) {
-    EXPECT_EQ(GetUserCapacityInGB(each.megabytes), each.gigabytes) << each.megabytes;
+  const std::pair<std::uint64_t, std::uint32_t> cases[] = {
+      {500, 0},          {1000, 1},         {1024, 2},
+      {121'856, 128},    {1'376'255, 2048}, {1'376'256, 1536},
+      {1'770'495, 1536}, {1'770'496, 2048}, {0xFFFF'FFFF, 4'194'304},
+      {0x7'0000'0400, 2}};
+  EXPECT_EQ(GetUserCapacityInGB(0), 0U);
+  for (const auto& [megabytes, gigabytes] : cases) {
+    EXPECT_EQ(GetUserCapacityInGB(megabytes), gigabytes) << megabytes;
   }
 }
 

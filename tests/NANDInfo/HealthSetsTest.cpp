@@ -42,28 +42,19 @@ TEST_F(HealthSetsTest, FiguresAreReadAsSigned) {
     std::string health;
   };
   const std::string unknown = "NumGrownBadBlocks=-1 SpareAvailablePercent=-1 NumDieFailures=-1 ";
+  const std::vector<std::uint64_t> endToEnd{0, 5, 0x1'0000'0003, 0, 0, 0, 0, 0, 0, 0, 0, 6};
+  const B used = B().add(47, {12}).add(531, {3}).add(kSpare, {98}).add(kE2EErrors, endToEnd);
+  const B worn = B().add(429, {7}).add(430, {30}).add(kPercentUsed, {0xFFFF'FFFF});
   const Case cases[] = {
       {"QuillQNS3NVMeController", B().add(4, {1}),
        "MaxPercentageNANDUsed=0 MaxE2EErrors=0 HostReadErrors=0 " + unknown},
-      {"ORUStorage",
-       B().add(429, {7})
-           .add(430, {30})
-           .add(kPercentUsed, {0xFFFF'FFFF})
-           .add(kRaidSmartErrors, {9})
-           .add(kUeccReads, {4}),
+      {"ORUStorage", B(worn).add(kRaidSmartErrors, {9}).add(kUeccReads, {4}),
        "MaxPercentageNANDUsed=30 MaxE2EErrors=0 HostReadErrors=4 " + unknown},
       {"ORUStorage", B().add(kRaidSmartErrors, {9}).add(kUeccReads, {~std::uint64_t{2}}),
        "MaxPercentageNANDUsed=0 MaxE2EErrors=0 HostReadErrors=0 " + unknown},
-      {"QuillEmbeddedNVMeController",
-       B().add(kRaidSmartErrors, {9})
-           .add(kUeccReads, {4})
-           .add(47, {12})
-           .add(531, {3})
-           .add(kSpare, {98})
-           .add(kE2EErrors, {0, 5, 0x1'0000'0003, 0, 0, 0, 0, 0, 0, 0, 0, 6}),
+      {"QuillEmbeddedNVMeController", B(used).add(kRaidSmartErrors, {9}).add(kUeccReads, {4}),
        "MaxPercentageNANDUsed=0 MaxE2EErrors=6 HostReadErrors=9 NumGrownBadBlocks=12 "
-       "SpareAvailablePercent=98 NumDieFailures=3 "},
-  };
+       "SpareAvailablePercent=98 NumDieFailures=3 "}};
   for (const Case& given : cases) {
     startWith(given.className, given.statistics);
     EXPECT_EQ(textOf(gatherNANDHealthInfo()), given.health);
@@ -106,17 +97,12 @@ TEST_F(ContentDeletionTest, AsksControllersThatCanTell) {
   };
   const std::string trying =
       "Failed to find matching service with DevRegServiceGetMatchingService, trying iterator...\n";
-  struct Case {
-    std::string registry;
-    bool recommends;
-    std::string errors = "";
-  };
-  const Case cases[] = {
-      {withAnswer(R"({"value": 256})"), true},
-      {withAnswer(R"({"value": 1, "length": 5})"), true},
-      {withAnswer(R"({"value": 0})"), false},
-      {withAnswer(R"({"value": 1, "length": 3})"), false},
-      {withAnswer(R"({"value": 1, "error": 5})"), false},
+  const std::tuple<std::string, bool, std::string> cases[] = {
+      {withAnswer(R"({"value": 256})"), true, ""},
+      {withAnswer(R"({"value": 1, "length": 5})"), true, ""},
+      {withAnswer(R"({"value": 0})"), false, ""},
+      {withAnswer(R"({"value": 1, "length": 3})"), false, ""},
+      {withAnswer(R"({"value": 1, "error": 5})"), false, ""},
       {withAnswer(R"({"value": 1})", R"(, "closeError": 6)"), true,
        "Could not close connection to service\n"},
       {withAnswer(R"({"value": 1})", R"(, "openError": 6)"), false,
@@ -124,11 +110,11 @@ TEST_F(ContentDeletionTest, AsksControllersThatCanTell) {
       {"", false,
        trying + "_load_nand_infoCould not get matching DevRegKit service for exporting classes\n"},
   };
-  for (const Case& given : cases) {
-    start(given.registry);
-    bool recommends = !given.recommends;
-    EXPECT_EQ(errorsOf([&] { recommends = NandRecommendsContentDeletion(); }), given.errors);
-    EXPECT_EQ(recommends, given.recommends) << given.registry;
+  for (const auto& [registry, recommends, errors] : cases) {
+    start(registry);
+    bool result = !recommends;
+    EXPECT_EQ(errorsOf([&] { result = NandRecommendsContentDeletion(); }), errors);
+    EXPECT_EQ(result, recommends) << registry;
     expectNothingHeld();
   }
 }

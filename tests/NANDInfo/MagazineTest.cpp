@@ -46,15 +46,13 @@ TEST_F(MagazineTest, FieldsByModeAndPeriod) {
     std::uint32_t mode;
     std::string fields;
   };
-  const Case cases[] = {
-      {kStamp - kDay, 1, 2, R"(1.0,"IND_pool_free":7,"hostWrites":-40.0})"},
-      {kStamp - kDay, 1, 0, R"(1.0,"hostWrites":-40.0})"},
-      {kStamp - kDay, 1, 1, R"(1.0,"IND_pool_free":7})"},
-      {kStamp - kDay, 1, 3, "1.0}"},
-      {kStamp - kDay, 0, 2, R"(1.0,"IND_pool_free":7,"hostWrites":90.0})"},
-      {kStamp, 1, 2, R"(0.0,"IND_pool_free":7,"hostWrites":90.0})"},
-      {kStamp + kDay / 2, 1, 0, R"(-0.5,"hostWrites":90.0})"},
-  };
+  const Case cases[] = {{kStamp - kDay, 1, 2, R"(1.0,"IND_pool_free":7,"hostWrites":-40.0})"},
+                        {kStamp - kDay, 1, 0, R"(1.0,"hostWrites":-40.0})"},
+                        {kStamp - kDay, 1, 1, R"(1.0,"IND_pool_free":7})"},
+                        {kStamp - kDay, 1, 3, "1.0}"},
+                        {kStamp - kDay, 0, 2, R"(1.0,"IND_pool_free":7,"hostWrites":90.0})"},
+                        {kStamp, 1, 2, R"(0.0,"IND_pool_free":7,"hostWrites":90.0})"},
+                        {kStamp + kDay / 2, 1, 0, R"(-0.5,"hostWrites":90.0})"}};
   for (const Case& given : cases) {
     snapshotAt(0, snapshot(kStamp).add(kHostWrites, {50}).add(kIndirectionFree, {9}));
     snapshotAt(
@@ -95,8 +93,7 @@ TEST_F(MagazineTest, AverageCyclesOfThePeriod) {
        R"(,"averageTLCPECycles":0.0,"averageSLCPECycles":0.0})"},
       {Statistics().add(kVirtualBlocks, {5}).add(kUserStart, {10}),
        R"(,"averageTLCPECycles":-10.0})"},
-      {Statistics().add(kVirtualBlocks, {5}), "}"},
-  };
+      {Statistics().add(kVirtualBlocks, {5}), "}"}};
   for (const auto& [now, averages] : cases) {
     answer(13, 0, now.bytes());
     snapshotAt(0, snapshot(kStamp).add(20, {150}).add(84, {300}));

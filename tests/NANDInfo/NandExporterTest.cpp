@@ -25,15 +25,9 @@ nand_exporter_t& endOfTable() { return nand_exporters_tunnel.back(); }
 class NandExporterTest : public ControllerTest {};
 
 TEST_F(NandExporterTest, LookUpGoesByTableThenByIterator) {
-  struct Case {
-    std::string registry;
-    std::size_t entry;
-    std::string log;
-    bool walks;
-  };
   const std::string found = "notice: NANDInfo: findNandExporter: Controller found: ";
   const std::string walked = "notice: Find service for class ";
-  const Case cases[] = {
+  const std::tuple<std::string, std::size_t, std::string, bool> cases[] = {
       {controller(kThird), 2, found + kThird, false},
       {controller(kThird) + ',' + controller(kSecond), 1, found + kSecond, false},
       {R"({"class": "Own", "conformsTo": ["ORUStorage"]})", 2, found + kThird, false},
@@ -42,16 +36,14 @@ TEST_F(NandExporterTest, LookUpGoesByTableThenByIterator) {
       {R"({"class": "Other"})", 3, "", true},
       {"", 3, "", true},
   };
-  for (const Case& lookUp : cases) {
-    HostPlatform& platform = start(lookUp.registry);
+  for (const auto& [registry, entry, line, walks] : cases) {
+    HostPlatform& platform = start(registry);
     nand_exporter_t* exporter = nullptr;
     RegistryHandle service = 0;
-    EXPECT_EQ(errorsOf([&] { service = findNandExporter(exporter); }), lookUp.walks ? kNoMatch : "")
-        << lookUp.registry;
-    EXPECT_EQ(exporter, &nand_exporters_tunnel[lookUp.entry]) << lookUp.registry;
-    EXPECT_EQ(service != 0, lookUp.entry < 3);
-    EXPECT_EQ(device().log(),
-              lookUp.log.empty() ? std::vector<std::string>() : std::vector{lookUp.log + '\n'});
+    EXPECT_EQ(errorsOf([&] { service = findNandExporter(exporter); }), walks ? kNoMatch : "");
+    EXPECT_EQ(exporter, &nand_exporters_tunnel[entry]) << registry;
+    EXPECT_EQ(service != 0, entry < 3);
+    EXPECT_EQ(device().log(), line.empty() ? std::vector<std::string>() : std::vector{line + '\n'});
     EXPECT_EQ(platform.describedRegistry().openObjects(), service != 0 ? 1u : 0u);
     platform.deviceRegistry().DevRegObjectRelease(service);
     expectNothingHeld();

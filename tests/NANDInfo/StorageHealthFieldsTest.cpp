@@ -62,35 +62,33 @@ TEST_F(StorageHealthFieldsTest, DeviceTellsWithoutFTLFields) {
 }
 
 TEST_F(StorageHealthFieldsTest, FieldsOfTheFTL) {
+  using Entry = std::pair<PropertyDict, std::string>;
   const auto weeks = [](std::uint64_t formatTime, const std::string& expected) {
-    return std::pair<PropertyDict, std::string>(
-        {{"utilFormatTime", formatTime}},
-        R"("HLT_formatWeeksSince2000":)" + expected + ',' + kNoRefreshes);
+    return Entry({{"utilFormatTime", formatTime}},
+                 R"("HLT_formatWeeksSince2000":)" + expected + ',' + kNoRefreshes);
   };
-  const auto size = [](std::uint64_t user, std::uint64_t intermediate,
-                       const std::string& expected) {
-    return std::pair<PropertyDict, std::string>(
-        {{"userPartitionStart", user}, {"intermediatePartitionStart", intermediate}},
-        R"("HLT_intermediatePartitionSize":)" + expected + ',' + kNoRefreshes);
+  const auto size = [](std::uint64_t user, std::uint64_t start, const std::string& expected) {
+    return Entry({{"userPartitionStart", user}, {"intermediatePartitionStart", start}},
+                 R"("HLT_intermediatePartitionSize":)" + expected + ',' + kNoRefreshes);
   };
   PropertyDict failures{{"mspBootBlockProgFails_5", std::uint64_t{0xFFFF'FFFF}}};
   for (std::uint64_t block = 0; block < 40; ++block) {
     failures.set("mspBootBlockReadFails_" + std::to_string(block), block + 1);
   }
-  const auto sums = [&](std::uint64_t blocksPerMSP, const std::string& main,
-                        const std::string& backup, const std::string& program,
-                        const std::string& programBackup) {
-    PropertyDict ftl = failures;
-    ftl.set("mspBootBlockCountPerMsp", blocksPerMSP);
-    return std::pair<PropertyDict, std::string>(
-        ftl, R"("HLT_numBootBlockRefreshes_max":0,"HLT_mspBootBlockReadFails_main":)" + main +
-                 R"(,"HLT_mspBootBlockProgFails_main":)" + program +
-                 R"(,"HLT_mspBootBlockEraseFails_main":0,)"
-                 R"("HLT_mspBootBlockReadFails_backup":)" +
-                 backup + R"(,"HLT_mspBootBlockProgFails_backup":)" + programBackup +
-                 R"(,"HLT_mspBootBlockEraseFails_backup":0})");
+  /// `main` and `backup` are the failures to read and to program.
+  const auto sums = [&](std::uint64_t blocksPerMSP, std::array<std::string, 2> main,
+                        std::array<std::string, 2> backup) {
+    Entry entry(failures, R"("HLT_numBootBlockRefreshes_max":0)");
+    entry.first.set("mspBootBlockCountPerMsp", blocksPerMSP);
+    for (const auto& [part, sum] : {std::pair("main", main), std::pair("backup", backup)}) {
+      entry.second += R"(,"HLT_mspBootBlockReadFails_)" + std::string(part) + R"(":)" + sum[0] +
+                      R"(,"HLT_mspBootBlockProgFails_)" + part + R"(":)" + sum[1] +
+                      R"(,"HLT_mspBootBlockEraseFails_)" + part + R"(":0)";
+    }
+    entry.second += '}';
+    return entry;
   };
-  const std::pair<PropertyDict, std::string> cases[] = {
+  const Entry cases[] = {
       {{{"userPartitionStart", 9}}, kNoRefreshes},
       {{{"powerOnSeconds", 5},
         {"powerOnHours", 4},
@@ -104,7 +102,6 @@ TEST_F(StorageHealthFieldsTest, FieldsOfTheFTL) {
       size(1, 3, "18446744073709551614"),
       size(0x1'0000'0005, 0xFFFF'FFFF, "6"),
       size(0x7FFF'FFFF, 0x8000'0000, "4294967295"),
-      weeks(946'684'800, "0"),
       weeks(946'684'800 + 604'799, "0"),
       weeks(946'684'800 + 604'800, "1"),
       weeks(0xFFFF'FFFF, "5536"),
@@ -115,10 +112,10 @@ TEST_F(StorageHealthFieldsTest, FieldsOfTheFTL) {
         {"numBootBlockRefreshFail_8", 100}},
        R"("HLT_numBootBlockRefreshes_max":9})"},
       {failures, kNoRefreshes},
-      sums(4, "120", "408", "0", "18446744073709551615"),
-      sums(0, "8", "72", "0", "0"),
-      sums(1, "36", "156", "18446744073709551615", "18446744073709551613"),
-      sums(std::uint64_t{1} << 63, "4", "36", "0", "0"),
+      sums(4, {"120", "0"}, {"408", "18446744073709551615"}),
+      sums(0, {"8", "0"}, {"72", "0"}),
+      sums(1, {"36", "18446744073709551615"}, {"156", "18446744073709551613"}),
+      sums(std::uint64_t{1} << 63, {"4", "0"}, {"36", "0"}),
   };
   start("", kVolume);
   for (const auto& [ftl, expected] : cases) {

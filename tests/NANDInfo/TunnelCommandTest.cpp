@@ -66,12 +66,10 @@ TEST_F(TunnelCommandTest, NothingIsSentWithoutConnectionMethodOrSelector) {
     const TunnelSelector* selector;
     std::string error;
   };
-  const Case cases[] = {
-      {0, 0, 8, nullptr, "executeTunnelCommand: Invalid connection"},
-      {1, 0, 8, nullptr, "executeTunnelCommand: Invalid exporter"},
-      {1, 8, 0, nullptr, "executeTunnelCommand: Invalid exporter"},
-      {1, 8, 8, nullptr, "executeTunnelCommand: Invalid opType Selector"},
-  };
+  const Case cases[] = {{0, 0, 8, nullptr, "executeTunnelCommand: Invalid connection"},
+                        {1, 0, 8, nullptr, "executeTunnelCommand: Invalid exporter"},
+                        {1, 8, 0, nullptr, "executeTunnelCommand: Invalid exporter"},
+                        {1, 8, 8, nullptr, "executeTunnelCommand: Invalid opType Selector"}};
   for (const Case& call : cases) {
     forgetAPIErrorMessage();
     exporter.tunnelSizeMethod = call.sizeMethod;
@@ -109,8 +107,7 @@ TEST_F(TunnelCommandTest, AnswersOfEveryShape) {
       {R"({"opcode": 14, "file": "statistics.bin"})", kSizeFailed},
       {R"({"opcode": 13, "argument": 1, "file": "statistics.bin"})", kSizeFailed},
       {R"({"opcode": 13, "kind": 1, "file": "statistics.bin"})", kSizeFailed},
-      {R"({"opcode": 13, "file": "missing.bin"})", kSizeFailed},
-  };
+      {R"({"opcode": 13, "file": "missing.bin"})", kSizeFailed}};
   for (const Case& given : cases) {
     forgetAPIErrorMessage();
     start(controller("QuillEmbeddedNVMeController", given.answer));

@@ -1,52 +1,20 @@
 #include "platform/host/AtomicFile.h"
 
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-#include <signal.h>
-#include <sys/resource.h>
-#include <sys/stat.h>
-#include <sys/wait.h>
-#include <unistd.h>
-
+#include <sstream>
 #include <thread>
 
 #include "platform/host/JsonLines.h"
-#include "support/TemporaryFolder.h"
+#include "support/HostServiceTest.h"
 
 namespace vesprun {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
-using ::testing::IsEmpty;
+using ::testing::ElementsAre, ::testing::HasSubstr;
 
-mode_t modeOf(const std::string& path) {
-  struct stat status {};
-  EXPECT_EQ(stat(path.c_str(), &status), 0) << path;
-  return status.st_mode & 07777;
-}
+using AtomicFileTest = HostServiceTest;
+using JsonLinesTest = HostServiceTest;
 
-/// Lets no file of this process grow beyond a size, as a full disk would.
-class FileSizeLimit {
- public:
-  explicit FileSizeLimit(rlim_t bytes) : _handler(signal(SIGXFSZ, SIG_IGN)) {
-    getrlimit(RLIMIT_FSIZE, &_before);
-    const rlimit limited{bytes, _before.rlim_max};
-    setrlimit(RLIMIT_FSIZE, &limited);
-  }
-  ~FileSizeLimit() {
-    setrlimit(RLIMIT_FSIZE, &_before);
-    signal(SIGXFSZ, _handler);
-  }
-
- private:
-  rlimit _before{};
-  sighandler_t _handler;
-};
-
-TEST(AtomicFile, showsTheDocumentOnlyWhenItIsComplete) {
-  const TemporaryFolder folder;
-  std::string error;
+TEST_F(AtomicFileTest, showsTheDocumentOnlyWhenItIsComplete) {
   const std::string large(200'000, 'x');
   for (const std::string& content : {large, std::string("second")}) {
     const auto before = folder.names();
@@ -58,21 +26,12 @@ TEST(AtomicFile, showsTheDocumentOnlyWhenItIsComplete) {
     ASSERT_TRUE(file->replace("document", error)) << error;
     EXPECT_THAT(folder.names(), ElementsAre("document"));
     EXPECT_EQ(folder.read("document"), content + "!");
-    EXPECT_EQ(modeOf(folder.path("document")), 0600U);
+    EXPECT_EQ(modeOf("document"), mode_t{S_IFREG | 0600});
   }
 }
 
-TEST(AtomicFile, leavesNothingWhenItIsDropped) {
-  const TemporaryFolder folder;
-  std::string error;
-  { AtomicFile::create(folder.path(), error)->append("half"); }
-  EXPECT_THAT(folder.names(), IsEmpty());
-}
-
-TEST(AtomicFile, addsOnlyUnderANameThatIsFree) {
-  const TemporaryFolder folder;
+TEST_F(AtomicFileTest, addsOnlyUnderANameThatIsFree) {
   folder.write("0001", "earlier");
-  std::string error;
   std::optional<AtomicFile> file = AtomicFile::create(folder.path(), error);
   file->append("new");
   EXPECT_EQ(file->addNew("0001", error), AtomicFile::Added::NameTaken);
@@ -82,12 +41,14 @@ TEST(AtomicFile, addsOnlyUnderANameThatIsFree) {
   EXPECT_THAT(error, HasSubstr("missing/0003: No such file"));
   EXPECT_EQ(folder.read("0001"), "earlier");
   EXPECT_EQ(folder.read("0002"), "new");
+  AtomicFile::create(folder.path(), error)->append("dropped");
+  EXPECT_THAT(folder.names(), ElementsAre("0001", "0002"));
+  EXPECT_FALSE(AtomicFile::create(folder.path("none"), error));
+  EXPECT_EQ(error, folder.path("none") + ": No such file or directory");
 }
 
-TEST(AtomicFile, keepsTheEarlierDocumentWhenTheDiskIsFull) {
-  const TemporaryFolder folder;
+TEST_F(AtomicFileTest, keepsTheEarlierDocumentUntilTheNewOneIsComplete) {
   folder.write("document", "earlier");
-  std::string error;
   {
     const FileSizeLimit limit(100'000);
     EXPECT_FALSE(replaceFile(folder.path("document"), std::string(150'000, 'x'), error));
@@ -95,30 +56,19 @@ TEST(AtomicFile, keepsTheEarlierDocumentWhenTheDiskIsFull) {
   EXPECT_THAT(error, HasSubstr(folder.path("document") + ": File too large"));
   EXPECT_EQ(folder.read("document"), "earlier");
   EXPECT_THAT(folder.names(), ElementsAre("document"));
-}
-
-TEST(AtomicFile, replacesThroughWhatAKilledProcessLeft) {
-  const TemporaryFolder folder;
-  folder.write("document", "earlier");
-  folder.write(".replacement", "complete, but never renamed");
-  std::string error;
+  folder.write(".replacement", "complete, but never renamed by a process that was killed");
   EXPECT_TRUE(replaceFile(folder.path("document"), "new", error)) << error;
   EXPECT_EQ(folder.read("document"), "new");
   EXPECT_THAT(folder.names(), ElementsAre("document"));
 }
 
-TEST(AtomicFile, isCompleteOrAbsentWhereverItsWriterIsKilled) {
-  const TemporaryFolder folder;
+TEST_F(AtomicFileTest, isCompleteOrAbsentWhereverItsWriterIsKilled) {
   const std::string content(300'000, 'x');
   for (int delay = 0; delay < 20; ++delay) {
-    const pid_t child = fork();
-    ASSERT_GE(child, 0);
-    if (child == 0) {
-      std::string error;
+    const pid_t child = startProcess([&] {
       while (replaceFile(folder.path("document"), content, error)) {
       }
-      _exit(1);
-    }
+    });
     usleep(static_cast<useconds_t>(delay * 700));
     kill(child, SIGKILL);
     int status = 0;
@@ -131,22 +81,14 @@ TEST(AtomicFile, isCompleteOrAbsentWhereverItsWriterIsKilled) {
   EXPECT_THAT(folder.names(), ::testing::Contains("document"));
 }
 
-TEST(AtomicFile, namesAFolderThatIsMissing) {
-  const TemporaryFolder folder;
-  std::string error;
-  EXPECT_FALSE(AtomicFile::create(folder.path("none"), error));
-  EXPECT_EQ(error, folder.path("none") + ": No such file or directory");
-}
-
-TEST(JsonLines, appendsWholeLinesFromManyWriters) {
-  const TemporaryFolder folder;
+TEST_F(JsonLinesTest, appendsWholeLinesFromManyWriters) {
   JsonLines first(folder.path("events.jsonl"));
   JsonLines second(folder.path("events.jsonl"));
   const std::string line(500, 'x');
   const auto write = [&line](JsonLines& lines) {
-    std::string error;
+    std::string reason;
     for (int count = 0; count < 200; ++count) {
-      EXPECT_TRUE(lines.append(line, error)) << error;
+      EXPECT_TRUE(lines.append(line, reason)) << reason;
     }
   };
   std::thread shared(write, std::ref(first));
@@ -154,19 +96,18 @@ TEST(JsonLines, appendsWholeLinesFromManyWriters) {
   write(first);
   shared.join();
   other.join();
-  std::string expected;
-  for (int count = 0; count < 600; ++count) {
-    expected += line + '\n';
+  std::istringstream written(folder.read("events.jsonl"));
+  int count = 0;
+  for (std::string text; std::getline(written, text); ++count) {
+    EXPECT_EQ(text, line);
   }
-  EXPECT_EQ(folder.read("events.jsonl"), expected);
-  EXPECT_EQ(modeOf(folder.path("events.jsonl")), 0600U);
+  EXPECT_EQ(count, 600);
+  EXPECT_EQ(modeOf("events.jsonl"), mode_t{S_IFREG | 0600});
 }
 
-TEST(JsonLines, endsATornLineAndMakesADeletedFileAnew) {
-  const TemporaryFolder folder;
+TEST_F(JsonLinesTest, endsATornLineAndMakesADeletedFileAnew) {
   folder.write("log.jsonl", "{\"whole\":1}\n{\"to");
   JsonLines lines(folder.path("log.jsonl"));
-  std::string error;
   EXPECT_TRUE(lines.append("{}", error)) << error;
   EXPECT_EQ(folder.read("log.jsonl"), "{\"whole\":1}\n{\"to\n{}\n");
   EXPECT_FALSE(lines.append("two\nlines", error));
@@ -175,10 +116,8 @@ TEST(JsonLines, endsATornLineAndMakesADeletedFileAnew) {
   EXPECT_EQ(folder.read("log.jsonl"), "{}\n");
 }
 
-TEST(JsonLines, takesBackALineThatDidNotFit) {
-  const TemporaryFolder folder;
+TEST_F(JsonLinesTest, takesBackALineThatDidNotFit) {
   JsonLines lines(folder.path("log.jsonl"));
-  std::string error;
   EXPECT_TRUE(lines.append("{}", error)) << error;
   {
     const FileSizeLimit limit(100);

@@ -55,17 +55,6 @@ TEST(DeviceDescription, ReadsEveryEntry) {
   EXPECT_EQ(device->usage.value->delaySeconds, 2.0);
 }
 
-TEST(DeviceDescription, AbsentEntriesAreLive) {
-  std::string error;
-  const auto device = readDeviceDescription("{}", error);
-  ASSERT_TRUE(device) << error;
-  EXPECT_FALSE(device->clock);
-  EXPECT_TRUE(device->properties.diskUsage.isLive());
-  EXPECT_TRUE(device->submission.enabled);
-  EXPECT_FALSE(device->events.used);
-  EXPECT_FALSE(device->purgeableServiceAvailable);
-}
-
 TEST(DeviceDescription, NamesTheEntryThatIsWrong) {
   const std::pair<const char*, const char*> cases[] = {
       {R"([])", "not a dictionary"},

@@ -1,8 +1,5 @@
 #include "platform/host/JsonForm.h"
 
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
 #include <cmath>
 #include <limits>
 #include <nlohmann/json.hpp>

@@ -1,94 +1,58 @@
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-#include <sys/stat.h>
-#include <sys/wait.h>
-#include <unistd.h>
-
 #include <thread>
 
 #include "platform/host/HostPreferences.h"
-#include "support/TemporaryFolder.h"
+#include "support/HostServiceTest.h"
 
 namespace vesprun {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::HasSubstr;
-using ::testing::IsEmpty;
-using ::testing::StartsWith;
+using namespace std::string_literals;
+using ::testing::ElementsAre, ::testing::HasSubstr, ::testing::IsEmpty, ::testing::StartsWith;
 
 constexpr const char* kFolder = "var/mobile/Library/Preferences";
 constexpr const char* kFile = "var/mobile/Library/Preferences/a.ptree";
 constexpr const char* kOneKey =
     "<ptree version=\"1.0\"><dict><key>first</key><integer>1</integer></dict></ptree>";
 
-class MessageList final : public SystemLog {
- public:
-  bool keeps(LogLevel /*level*/) const override { return true; }
-  void write(LogLevel level, std::string_view message) override {
-    EXPECT_EQ(level, LogLevel::Error);
-    messages.emplace_back(message);
-  }
-
-  std::vector<std::string> messages;
-};
-
-class PreferencesTest : public ::testing::Test {
+class PreferencesTest : public HostServiceTest {
  protected:
-  ino_t fileNumber() const {
-    struct stat status {};
-    return stat(folder.path(kFile).c_str(), &status) == 0 ? status.st_ino : 0;
-  }
-
   /// What a process that starts now finds.
-  PropertyDict found() {
-    HostPreferences preferences(device, log);
-    return preferences.valuesOfDomain("a");
-  }
-
-  TemporaryFolder folder;
-  std::string error;
-  DeviceDirectory device = DeviceDirectory::open(folder.path(), error).value();
-  MessageList log;
+  PropertyDict found() { return HostPreferences(device, log).valuesOfDomain("a"); }
+  HostPreferences preferences{device, log};
 };
 
 TEST_F(PreferencesTest, areThereForTheNextProcess) {
   {
-    HostPreferences preferences(device, log);
-    preferences.LGSPreferencesSetValue("first", 1, "a");
-    preferences.LGSPreferencesSetValue("gone", 1, "a");
-    preferences.LGSPreferencesSetValue("gone", std::nullopt, "a");
-    EXPECT_EQ(preferences.LGSPreferencesGetValue("first", "a"), PropertyValue(1));
-    EXPECT_EQ(preferences.LGSPreferencesGetValue("gone", "a"), std::nullopt);
+    HostPreferences here(device, log);
+    here.LGSPreferencesSetValue("first", 1, "a");
+    here.LGSPreferencesSetValue("gone", 1, "a");
+    here.LGSPreferencesSetValue("gone", std::nullopt, "a");
+    EXPECT_EQ(here.LGSPreferencesGetValue("first", "a"), PropertyValue(1));
+    EXPECT_EQ(here.LGSPreferencesGetValue("gone", "a"), std::nullopt);
     EXPECT_THAT(folder.names(kFolder), IsEmpty());
-    EXPECT_TRUE(preferences.LGSPreferencesSynchronize("a"));
+    EXPECT_TRUE(here.LGSPreferencesSynchronize("a"));
     EXPECT_THAT(folder.names(kFolder), ElementsAre("a.ptree"));
-    preferences.LGSPreferencesSetValue("second", "text", "a");
-    preferences.LGSPreferencesSetValue("other", true, "b");
+    here.LGSPreferencesSetValue("second", "text", "a");
+    here.LGSPreferencesSetValue("other", true, "b");
   }
   EXPECT_EQ(found(), (PropertyDict{{"first", 1}, {"second", "text"}}));
   EXPECT_THAT(folder.names(kFolder), ElementsAre("a.ptree", "b.ptree"));
-  { HostPreferences(device, log, "root").LGSPreferencesSetValue("k", 1, "a"); }
+  HostPreferences(device, log, "root").LGSPreferencesSetValue("k", 1, "a");
   EXPECT_THAT(folder.names("var/root/Library/Preferences"), ElementsAre("a.ptree"));
-  {
-    HostPreferences(device, log, PreferenceFolder{"Library/Logsmith"})
-        .LGSPreferencesSetValue("k", 1, "com.x");
-  }
+  HostPreferences(device, log, PreferenceFolder{"Library/Logsmith"})
+      .LGSPreferencesSetValue("k", 1, "com.x");
   EXPECT_THAT(folder.names("Library/Logsmith"), ElementsAre("com.x.ptree"));
   EXPECT_THAT(log.messages, IsEmpty());
 }
 
 TEST_F(PreferencesTest, areNotWrittenWithoutADifference) {
-  HostPreferences preferences(device, log);
   preferences.LGSPreferencesSetValue("absent", std::nullopt, "a");
   EXPECT_TRUE(preferences.LGSPreferencesSynchronize("a"));
   EXPECT_THAT(folder.names(kFolder), IsEmpty());
   folder.write(kFile, kOneKey);
-  const ino_t before = fileNumber();
   preferences.LGSPreferencesSetValue("first", 1, "a");
   EXPECT_TRUE(preferences.LGSPreferencesSynchronize("a"));
   EXPECT_EQ(preferences.LGSPreferencesGetValue("first", "a"), PropertyValue(1));
-  EXPECT_EQ(fileNumber(), before);
   EXPECT_EQ(folder.read(kFile), kOneKey);
   preferences.LGSPreferencesSetValue("first", 1.0, "a");  // another kind of number
   EXPECT_TRUE(preferences.LGSPreferencesSynchronize("a"));
@@ -96,17 +60,16 @@ TEST_F(PreferencesTest, areNotWrittenWithoutADifference) {
 }
 
 TEST_F(PreferencesTest, keepWhatOtherProcessesChanged) {
-  HostPreferences here(device, log);
   HostPreferences there(device, log);
-  EXPECT_EQ(here.LGSPreferencesGetValue("x", "a"), std::nullopt);
+  EXPECT_EQ(preferences.LGSPreferencesGetValue("x", "a"), std::nullopt);
   there.LGSPreferencesSetValue("x", 1, "a");
   there.LGSPreferencesSetValue("y", 1, "a");
   EXPECT_TRUE(there.LGSPreferencesSynchronize("a"));
   EXPECT_EQ(there.LGSPreferencesGetValue("z", "a"), std::nullopt);
-  here.LGSPreferencesSetValue("y", 2, "a");
-  here.LGSPreferencesSetValue("z", 2, "a");
-  EXPECT_TRUE(here.LGSPreferencesSynchronize("a"));
-  EXPECT_EQ(here.LGSPreferencesGetValue("x", "a"), PropertyValue(1));
+  preferences.LGSPreferencesSetValue("y", 2, "a");
+  preferences.LGSPreferencesSetValue("z", 2, "a");
+  EXPECT_TRUE(preferences.LGSPreferencesSynchronize("a"));
+  EXPECT_EQ(preferences.LGSPreferencesGetValue("x", "a"), PropertyValue(1));
   EXPECT_EQ(there.LGSPreferencesGetValue("z", "a"), std::nullopt);
   EXPECT_TRUE(there.LGSPreferencesSynchronize("a"));
   EXPECT_EQ(there.LGSPreferencesGetValue("z", "a"), PropertyValue(2));
@@ -115,30 +78,20 @@ TEST_F(PreferencesTest, keepWhatOtherProcessesChanged) {
 
 TEST_F(PreferencesTest, loseNothingToProcessesAndThreadsThatWriteAtOnce) {
   constexpr int kKeys = 15;
-  const auto write = [](HostPreferences& preferences, const std::string& writer) {
-    bool good = true;
+  const auto write = [](HostPreferences& here, const std::string& writer) {
     for (int key = 0; key < kKeys; ++key) {
-      preferences.LGSPreferencesSetValue(writer + std::to_string(key), key, "a");
-      good = preferences.LGSPreferencesSynchronize("a") && good;
+      here.LGSPreferencesSetValue(writer + std::to_string(key), key, "a");
+      EXPECT_TRUE(here.LGSPreferencesSynchronize("a"));
     }
-    return good;
   };
-  const pid_t child = fork();
-  ASSERT_GE(child, 0);
-  if (child == 0) {
-    HostPreferences preferences(device, log);
-    _exit(write(preferences, "child") ? 0 : 1);
-  }
-  HostPreferences preferences(device, log);
+  const pid_t child = startProcess([&] { write(preferences, "child"); });
   HostPreferences others(device, log);
-  std::thread shared([&] { EXPECT_TRUE(write(preferences, "shared")); });
-  std::thread own([&] { EXPECT_TRUE(write(others, "own")); });
-  EXPECT_TRUE(write(preferences, "main"));
+  std::thread shared([&] { write(preferences, "shared"); });
+  std::thread own([&] { write(others, "own"); });
+  write(preferences, "main");
   shared.join();
   own.join();
-  int status = -1;
-  waitpid(child, &status, 0);
-  EXPECT_EQ(status, 0);
+  EXPECT_TRUE(hasSucceeded(child));
   EXPECT_EQ(found().size(), 4U * kKeys);
 }
 
@@ -147,14 +100,14 @@ TEST_F(PreferencesTest, keepADocumentThatIsNoneBesideTheNewOne) {
        {"<ptree version=\"1.0\">\n<dict>\n<key>first", "<ptree version=\"1.0\"><true/></ptree>"}) {
     log.messages.clear();
     folder.write(kFile, malformed);
-    HostPreferences preferences(device, log);
-    EXPECT_EQ(preferences.LGSPreferencesGetValue("first", "a"), std::nullopt);
-    EXPECT_EQ(preferences.LGSPreferencesGetValue("other", "a"), std::nullopt);
+    HostPreferences here(device, log);
+    EXPECT_EQ(here.LGSPreferencesGetValue("first", "a"), std::nullopt);
+    EXPECT_EQ(here.LGSPreferencesGetValue("other", "a"), std::nullopt);
     EXPECT_THAT(log.messages, ElementsAre(StartsWith(folder.path(kFile) + ": line ")));
-    EXPECT_TRUE(preferences.LGSPreferencesSynchronize("a"));
+    EXPECT_TRUE(here.LGSPreferencesSynchronize("a"));
     EXPECT_EQ(folder.read(kFile), malformed);
-    preferences.LGSPreferencesSetValue("first", 2, "a");
-    EXPECT_TRUE(preferences.LGSPreferencesSynchronize("a"));
+    here.LGSPreferencesSetValue("first", 2, "a");
+    EXPECT_TRUE(here.LGSPreferencesSynchronize("a"));
     EXPECT_EQ(found(), (PropertyDict{{"first", 2}}));
     EXPECT_THAT(log.messages.back(), HasSubstr(": kept as "));
   }
@@ -166,7 +119,6 @@ TEST_F(PreferencesTest, keepADocumentThatIsNoneBesideTheNewOne) {
 
 TEST_F(PreferencesTest, neverWriteOverWhatCannotBeRead) {
   folder.write(std::string(kFile) + "/inside", "a folder in place of the document");
-  HostPreferences preferences(device, log);
   EXPECT_EQ(preferences.LGSPreferencesGetValue("first", "a"), std::nullopt);
   preferences.LGSPreferencesSetValue("first", 1, "a");
   EXPECT_FALSE(preferences.LGSPreferencesSynchronize("a"));
@@ -179,10 +131,7 @@ TEST_F(PreferencesTest, neverWriteOverWhatCannotBeRead) {
 }
 
 TEST_F(PreferencesTest, refuseNamesThatLeadElsewhereAndValuesThatNoDocumentCarries) {
-  HostPreferences preferences(device, log);
-  for (const std::string& domain :
-       {std::string(), std::string("../a"), std::string("."), std::string(".a"), std::string("a/b"),
-        std::string("a\0b", 3)}) {
+  for (const std::string& domain : {""s, "../a"s, "."s, ".a"s, "a/b"s, "a\0b"s}) {
     log.messages.clear();
     preferences.LGSPreferencesSetValue("k", 1, domain);
     EXPECT_EQ(log.messages.size(), 1U) << domain;

@@ -4,6 +4,7 @@
 #include "NANDInfo/NandExporter.h"
 #include "platform/host/HostDeviceRegistry.h"
 #include "platform/host/StatisticsBufferBuilder.h"
+#include "support/WatchedRegistry.h"
 
 namespace vesprun {
 
@@ -35,6 +36,19 @@ void ControllerTest::expectNothingHeld() {
   EXPECT_EQ(registry.openObjects(), 0u);
   EXPECT_EQ(registry.openConnections(), 0u);
   EXPECT_EQ(registry.falseReleases(), 0u);
+}
+
+void ControllerTest::failEveryCall(const std::function<void()>& operation, std::size_t least) {
+  WatchedRegistry watched(_device->platform());
+  std::size_t failing = 0;
+  errorsOf([&] {
+    do {
+      watched.failCall(++failing);
+      operation();
+      expectNothingHeld();
+    } while (watched.calls().size() >= failing);
+  });
+  EXPECT_GT(failing, least);
 }
 
 std::string ControllerTest::errorsOf(const std::function<void()>& action) {

@@ -25,6 +25,9 @@ class ControllerTest : public ::testing::Test {
   TestDevice& device() { return *_device; }
   /// Expects that nothing is held that the registry gave out, and nothing was given back twice.
   void expectNothingHeld();
+  /// Runs `operation` with its n-th call to the registry failing, for every n there is and no less
+  /// than `least`; nothing stays held.
+  void failEveryCall(const std::function<void()>& operation, std::size_t least);
   /// What `action` writes to the standard error stream.
   static std::string errorsOf(const std::function<void()>& action);
 

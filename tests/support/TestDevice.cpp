@@ -1,10 +1,6 @@
 #include "support/TestDevice.h"
 
-#include <stdlib.h>
-
-#include <algorithm>
 #include <filesystem>
-#include <fstream>
 #include <sstream>
 
 #include "common/TextForm.h"
@@ -17,27 +13,25 @@
 
 namespace vesprun {
 
-TestDevice::TestDevice(std::string_view description) {
-  std::string pattern = std::filesystem::temp_directory_path() / "vesprun-test-XXXXXX";
-  EXPECT_NE(mkdtemp(pattern.data()), nullptr);
-  _path = pattern;
-  write("device.json", description);
+namespace {
+
+template <typename Parse>
+PropertyDict dictionaryOf(const Parse& parse, const std::string& text) {
+  std::string error;
+  const std::optional<PropertyValue> value = parse(text, error);
+  const bool isDictionary = value && value->dict() != nullptr;
+  EXPECT_TRUE(isDictionary) << text << ": " << error;
+  return isDictionary ? *value->dict() : PropertyDict();
 }
+
+}  // namespace
+
+TestDevice::TestDevice(std::string_view description) { write("device.json", description); }
 
 TestDevice::~TestDevice() {
   endProcess();
   std::error_code ignored;
-  std::filesystem::permissions(_path, std::filesystem::perms::owner_all, ignored);
-  std::filesystem::remove_all(_path, ignored);
-}
-
-std::string TestDevice::path(std::string_view devicePath) const {
-  return _path + '/' + std::string(devicePath);
-}
-
-void TestDevice::write(std::string_view devicePath, std::string_view content) const {
-  std::filesystem::create_directories(std::filesystem::path(path(devicePath)).parent_path());
-  std::ofstream(path(devicePath), std::ios::binary) << content;
+  std::filesystem::permissions(path(), std::filesystem::perms::owner_all, ignored);
 }
 
 std::string TestDevice::read(std::string_view devicePath) const {
@@ -49,16 +43,6 @@ bool TestDevice::exists(std::string_view devicePath) const {
   return std::filesystem::exists(path(devicePath));
 }
 
-std::vector<std::string> TestDevice::list(std::string_view devicePath) const {
-  std::vector<std::string> names;
-  std::error_code error;
-  for (const auto& entry : std::filesystem::directory_iterator(path(devicePath), error)) {
-    names.push_back(entry.path().filename());
-  }
-  std::sort(names.begin(), names.end());
-  return names;
-}
-
 void TestDevice::writeWhitelist(std::string_view groups) const {
   write("Library/Application Support/Tallybook/Whitelist_Stagebox.ptree",
         "<ptree version=\"1.0\"><dict>" + std::string(groups) + "</dict></ptree>");
@@ -67,15 +51,15 @@ void TestDevice::writeWhitelist(std::string_view groups) const {
 void TestDevice::writeWhitelistJson(std::string_view groups) const {
   std::string error;
   std::string document;
-  const std::optional<PropertyValue> root = valueFromJsonText(std::string(groups), error);
-  EXPECT_TRUE(root && writePtree(*root->dict(), document, error)) << error;
+  const PropertyDict root = dictionaryOf(valueFromJsonText, std::string(groups));
+  EXPECT_TRUE(writePtree(root, document, error)) << error;
   write("Library/Application Support/Tallybook/Whitelist_Stagebox.ptree", document);
 }
 
 HostPlatform& TestDevice::platform() {
   if (!_platform) {
     std::string error;
-    _platform = HostPlatform::open(_path, error);
+    _platform = HostPlatform::open(path(), error);
     if (!_platform) {
       throw std::runtime_error(error);
     }
@@ -95,10 +79,7 @@ std::vector<PropertyDict> TestDevice::lines(std::string_view file) const {
   std::vector<PropertyDict> lines;
   std::istringstream stream(read("outbox/" + std::string(file)));
   for (std::string line; std::getline(stream, line);) {
-    std::string error;
-    const std::optional<PropertyValue> value = valueFromJsonText(line, error);
-    EXPECT_TRUE(value && value->dict() != nullptr) << line << ": " << error;
-    lines.push_back(value && value->dict() != nullptr ? *value->dict() : PropertyDict());
+    lines.push_back(dictionaryOf(valueFromJsonText, line));
   }
   return lines;
 }
@@ -115,10 +96,7 @@ std::vector<PropertyDict> TestDevice::documents() const {
   std::vector<PropertyDict> documents;
   for (const std::string& name : list("outbox/logs")) {
     if (name.ends_with(".ptree")) {
-      std::string error;
-      const std::optional<PropertyValue> value = readPtree(read("outbox/logs/" + name), error);
-      EXPECT_TRUE(value && value->dict() != nullptr) << name << ": " << error;
-      documents.push_back(value && value->dict() != nullptr ? *value->dict() : PropertyDict());
+      documents.push_back(dictionaryOf(readPtree, read("outbox/logs/" + name)));
     }
   }
   return documents;

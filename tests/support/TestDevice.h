@@ -7,33 +7,28 @@
 
 #include "common/PropertyDict.h"
 #include "platform/host/HostPlatform.h"
+#include "support/TemporaryFolder.h"
 
 namespace vesprun {
 
 /// A real device directory in a temporary folder, and its platform, which is installed from the
 /// first `start` on. The folder goes with it.
-class TestDevice {
+class TestDevice : public TemporaryFolder {
  public:
   /// A device whose clock stands at 2024-03-05 09:15:02 UTC, day 19787, unless `description`, the
   /// text of its device.json, says otherwise.
   explicit TestDevice(std::string_view description = kDescription);
   ~TestDevice();
-  TestDevice(const TestDevice&) = delete;
-  TestDevice& operator=(const TestDevice&) = delete;
 
   static constexpr std::string_view kDescription =
       R"({"clock": "2024-03-05T09:15:02Z", "timeZone": "UTC", "logLevel": "debug"})";
   static constexpr std::int32_t kToday = 19787;
 
-  const std::string& path() const { return _path; }
-  std::string path(std::string_view devicePath) const;
-
-  void write(std::string_view devicePath, std::string_view content) const;
   /// The content of a file; empty when there is none.
   std::string read(std::string_view devicePath) const;
   bool exists(std::string_view devicePath) const;
   /// The names in a folder, in order.
-  std::vector<std::string> list(std::string_view devicePath) const;
+  std::vector<std::string> list(std::string_view devicePath) const { return names(devicePath); }
 
   /// Writes the whitelist; `groups` is the inside of its root dictionary.
   void writeWhitelist(std::string_view groups) const;
@@ -54,7 +49,6 @@ class TestDevice {
   std::vector<PropertyDict> documents() const;
 
  private:
-  std::string _path;
   std::unique_ptr<HostPlatform> _platform;
   std::unique_ptr<InstalledPlatform> _installed;
 };

@@ -14,9 +14,9 @@ class WatchedRegistry : public DeviceRegistry {
  public:
   struct Call {
     std::string operation;
-    std::uint32_t method = 0;   ///< of a call to a driver
-    Bytes input{};              ///< the structure that went into it
-    RegistryHandle handle = 0;  ///< what it was called for
+    std::uint32_t method;   ///< of a call to a driver
+    Bytes input;            ///< the structure that went into it
+    RegistryHandle handle;  ///< what it was called for
   };
 
   static constexpr RegistryResult kFailure = 0xE00002D8;
@@ -42,45 +42,42 @@ class WatchedRegistry : public DeviceRegistry {
   }
 
   RegistryHandle DevRegServiceGetMatchingService(const std::string& className) override {
-    return fails({"match " + className}) ? 0 : _registry.DevRegServiceGetMatchingService(className);
+    return fails("match " + className) ? 0 : _registry.DevRegServiceGetMatchingService(className);
   }
   RegistryHandle DevRegRegistryGetRootEntry() override {
-    return fails({"root"}) ? 0 : _registry.DevRegRegistryGetRootEntry();
+    return fails("root") ? 0 : _registry.DevRegRegistryGetRootEntry();
   }
   RegistryHandle DevRegRegistryEntryCreateIterator(RegistryHandle entry) override {
-    return fails({"iterate", 0, {}, entry}) ? 0
-                                            : _registry.DevRegRegistryEntryCreateIterator(entry);
+    return fails("iterate", entry) ? 0 : _registry.DevRegRegistryEntryCreateIterator(entry);
   }
   RegistryHandle DevRegIteratorNext(RegistryHandle iterator) override {
-    return fails({"next", 0, {}, iterator}) ? 0 : _registry.DevRegIteratorNext(iterator);
+    return fails("next", iterator) ? 0 : _registry.DevRegIteratorNext(iterator);
   }
   bool DevRegObjectConformsTo(RegistryHandle object, const std::string& className) override {
-    return !fails({"conforms", 0, {}, object}) &&
-           _registry.DevRegObjectConformsTo(object, className);
+    return !fails("conforms", object) && _registry.DevRegObjectConformsTo(object, className);
   }
   void DevRegObjectRelease(RegistryHandle object) override {
     _registry.DevRegObjectRelease(object);
   }
   std::optional<PropertyValue> DevRegRegistryEntrySearchProperty(
       RegistryHandle entry, const std::string& key, SearchDirection direction) override {
-    return fails({"search " + key, 0, {}, entry})
+    return fails("search " + key, entry)
                ? std::nullopt
                : _registry.DevRegRegistryEntrySearchProperty(entry, key, direction);
   }
   RegistryResult DevRegServiceOpen(RegistryHandle service, RegistryHandle& connection) override {
     connection = 0;
-    return fails({"open", 0, {}, service}) ? kFailure
-                                           : _registry.DevRegServiceOpen(service, connection);
+    return fails("open", service) ? kFailure : _registry.DevRegServiceOpen(service, connection);
   }
   RegistryResult DevRegServiceClose(RegistryHandle connection) override {
     const RegistryResult result = _registry.DevRegServiceClose(connection);
-    return fails({"close", 0, {}, connection}) ? kFailure : result;
+    return fails("close", connection) ? kFailure : result;
   }
   RegistryResult DevRegConnectCallStructMethod(RegistryHandle connection, std::uint32_t method,
                                                std::span<const std::uint8_t> input,
                                                std::span<std::uint8_t> output,
                                                std::uint64_t& outputLength) override {
-    return fails({"struct", method, Bytes(input.begin(), input.end()), connection})
+    return fails("struct", connection, method, input)
                ? kFailure
                : _registry.DevRegConnectCallStructMethod(connection, method, input, output,
                                                          outputLength);
@@ -88,15 +85,16 @@ class WatchedRegistry : public DeviceRegistry {
   RegistryResult DevRegConnectCallScalarMethod(RegistryHandle connection, std::uint32_t method,
                                                std::uint64_t input,
                                                std::uint64_t& output) override {
-    return fails({"scalar", method, {}, connection})
+    return fails("scalar", connection, method)
                ? kFailure
                : _registry.DevRegConnectCallScalarMethod(connection, method, input, output);
   }
 
  private:
   /// Notes the call; true when it is the one to fail.
-  bool fails(Call call) {
-    _calls.push_back(std::move(call));
+  bool fails(std::string operation, RegistryHandle handle = 0, std::uint32_t method = 0,
+             std::span<const std::uint8_t> input = {}) {
+    _calls.push_back({std::move(operation), method, Bytes(input.begin(), input.end()), handle});
     return _calls.size() == _failing;
   }
 

@@ -7,9 +7,7 @@
 namespace vesprun {
 namespace {
 
-using testing::Contains;
-using testing::HasSubstr;
-using testing::Pair;
+using testing::Contains, testing::HasSubstr, testing::Pair;
 
 constexpr const char* kTotal = "com.quill.homeshell.DiskUsageUserTotalBlocks";
 constexpr const char* kFree = "com.quill.homeshell.DiskUsageUserBlocksFree";

@@ -121,18 +121,6 @@ TEST(DataUsage, AddsTheGrowthSinceTheBaseline) {
   }
 }
 
-TEST(DataUsage, ASecondRunFindsWhatTheFirstLeft) {
-  TestDevice device(usage(record(kApp, kLongAgo, counters(4096, 0, 0, 0))));
-  device.platform();
-  CollectDataUsage();
-  device.endProcess();
-  device.write("device.json", usage(record(kApp, kLongAgo, counters(6144, 0, 0, 0))));
-  device.platform();
-  CollectDataUsage();
-  EXPECT_EQ(todaysScalars(device),
-            (Scalars{{"datausage.olddata.app", 1}, {"datausage.wifiInKB.app", 2}}));
-}
-
 TEST(DataUsage, ALateReplyIsHandledWhileTheStepGoesOn) {
   TestDevice device(deviceWith(R"("channels": [{"name": "a", "value": 1}],
       "usage": {"records": [)" +

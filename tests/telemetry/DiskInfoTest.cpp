@@ -8,10 +8,7 @@ namespace {
 struct Case {
   const char* volume;
   const char* usage;  ///< answer to "DiskUsage"
-  std::int64_t available;
-  std::int64_t fullness;
-  std::int64_t capacity;
-  std::int64_t size;
+  std::int64_t available, fullness, capacity, size;
 };
 
 constexpr const char* kNull = "null";
@@ -19,14 +16,13 @@ constexpr const char* kNull = "null";
 TEST(DiskInfo, MeasuresTheVolumeOrAsksForDiskUsage) {
   const Case cases[] = {
       // Measured: capacity by decimal megabytes.
-      {R"({"blockSize": 4096, "blocks": 15625000, "available": 3906250})", kNull,  //
-       15258, 7500, 64, 61035},
-      {R"({"blockSize": 1000, "blocks": 1500000000, "available": 0})", kNull,  //
-       0, 10000, 1536, 1430511},
-      {R"({"blockSize": 1000, "blocks": 65536000, "available": 32768000})", kNull,  //
-       31250, 5000, 128, 62500},
-      // A nearly empty volume, one without a size and one too small for a gigabyte are not
-      // believed.
+      {R"({"blockSize": 4096, "blocks": 15625000, "available": 3906250})", kNull, 15258, 7500, 64,
+       61035},
+      {R"({"blockSize": 1000, "blocks": 1500000000, "available": 0})", kNull, 0, 10000, 1536,
+       1430511},
+      {R"({"blockSize": 1000, "blocks": 65536000, "available": 32768000})", kNull, 31250, 5000, 128,
+       62500},
+      // Nearly empty, without a size and too small for a gigabyte: not believed.
       {R"({"blockSize": 4096, "blocks": 10000000, "available": 9999001})",
        R"({"TotalDiskCapacity": 137438953472})", 0, 10000, 256, 131072},
       {R"({"blockSize": 4096, "blocks": 0, "available": 0})", kNull, 0, 0, 0, 0},
@@ -37,8 +33,7 @@ TEST(DiskInfo, MeasuresTheVolumeOrAsksForDiskUsage) {
        R"({"TotalDiskCapacity": 137438953472, "TotalDataAvailable": 34359738368,
            "AmountDataAvailable": 1048576000})",
        1000, 7500, 256, 131072},
-      {kNull, R"({"TotalDiskCapacity": 1048576, "TotalDataAvailable": 2097152})",  //
-       0, -10000, 0, 1},
+      {kNull, R"({"TotalDiskCapacity": 1048576, "TotalDataAvailable": 2097152})", 0, -10000, 0, 1},
       {kNull, R"({"TotalDataAvailable": -1, "AmountDataAvailable": -1})", -1, 0, 0, 0},
       {kNull, kNull, 0, 0, 0, 0},
   };

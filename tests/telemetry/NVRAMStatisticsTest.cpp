@@ -25,8 +25,7 @@ TEST(NVRAMStatistics, AreWhatTheRegistryHoldsWhateverTheEventServiceDoes) {
       {R"("registry": [{"class": "DevRegDTNVRAMDiags", "properties": {"Version": 1}}],
           "events": {"available": false})",
        {{"version", 1}},
-       false},
-  };
+       false}};
   for (const auto& c : cases) {
     TestDevice device(deviceWith(c.entries));
     device.platform();

@@ -1,8 +1,5 @@
 #include "NANDInfo/parsers/GenericParserCxt.h"
 
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
 #include "FieldsOf.h"
 #include "NANDInfo/parsers/DictionaryHelpers.h"
 #include "NANDInfo/parsers/HexText.h"
@@ -11,36 +8,24 @@
 namespace vesprun {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
+using ::testing::ElementsAre, ::testing::IsEmpty;
 
 constexpr std::uint8_t kBytes[] = {1, 0, 0, 0, 2, 0, 0, 0, 0xFF, 0xFF, 0xFF, 0xFF, 0x80};
 
 TEST(GenericParserCxt, namesElementsAndWidensThem) {
-  struct Case {
-    const char* name;
-    std::uint32_t width;
-    std::uint32_t count;
-    bool result;
-    Fields fields;
-  };
-  const Case cases[] = {
+  const std::tuple<const char*, std::uint32_t, std::uint32_t, bool, Fields> cases[] = {
       {"bin", 4, 3, true, {{"bin0", 1}, {"bin1", 2}, {"bin2", 4294967295}}},
       {"x_", 4, 1, true, {{"x_", 1}}},
-      {"byte", 1, 2, true, {{"byte0", 1}, {"byte1", 0}}},
       {"odd", 3, 2, true, {{"odd0", 1}, {"odd1", 0x200}}},
       {"all", 8, 1, true, {{"all", 0x200000001}}},
       {"wide", 9, 1, false, {}},
       {"wide", 9, 2, false, {}},
       {"none", 0, 70'000, true, {}},
-      {"none", 9, 0, true, {}},
-  };
-  for (const Case& each : cases) {
+      {"none", 9, 0, true, {}}};
+  for (const auto& [name, width, count, result, fields] : cases) {
     GenericParserCxt ctx;
-    EXPECT_EQ(AddMultipleFieldsToGenericContext(ctx, each.name, kBytes, each.width, each.count),
-              each.result)
-        << each.name << each.width << 'x' << each.count;
-    EXPECT_EQ(fieldsOf(ctx), each.fields) << each.name << each.width << 'x' << each.count;
+    EXPECT_EQ(AddMultipleFieldsToGenericContext(ctx, name, kBytes, width, count), result) << name;
+    EXPECT_EQ(fieldsOf(ctx), fields) << name;
   }
 }
 

@@ -1,8 +1,5 @@
 #include "NANDInfo/parsers/VendorCounterParsers.h"
 
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
 #include <map>
 #include <numeric>
 
@@ -28,31 +25,31 @@ class CountingRegion {
 TEST(VendorCounterParsers, copyWhatTheirLayoutsSay) {
   struct Case {
     void (*parse)(CounterRegion, NandChannelCounters&);
-    std::map<std::size_t, std::uint32_t> words;
     std::uint64_t sum;
     std::size_t untouched;
+    std::map<std::size_t, std::uint32_t> words;
   };
   const Case cases[] = {
       {parseCountersAlgoGeneric,
-       {{19, 37}, {20, 117}, {41, 19}, {65, 104}, {122, 64}, {123, 0}, {125, 67}, {164, 113}},
        6918,
-       61},
+       61,
+       {{19, 37}, {20, 117}, {41, 19}, {65, 104}, {122, 64}, {123, 0}, {125, 67}, {164, 113}}},
       {parseCountersAlgoGenericKX4,
-       {{8, 0}, {29, 8}, {86, 123}, {102, 26}, {144, 74}, {167, 75}, {168, 76}, {176, 0}},
        7324,
-       20},
+       20,
+       {{8, 0}, {29, 8}, {86, 123}, {102, 26}, {144, 74}, {167, 75}, {168, 76}, {176, 0}}},
       {parseCounters1y,
-       {{7, 263}, {8, 265}, {9, 267}, {42, 290}, {65, 21}, {74, 15}, {76, 532}, {156, 384}},
        34548,
-       69},
+       69,
+       {{7, 263}, {8, 265}, {9, 267}, {42, 290}, {65, 21}, {74, 15}, {76, 532}, {156, 384}}},
       {parseCounters1xSandisk,
-       {{5, 261}, {6, 0}, {8, 265}, {19, 301}, {42, 288}, {63, 297}, {65, 16}, {74, 10}, {77, 0}},
        11352,
-       121},
+       121,
+       {{5, 261}, {6, 0}, {8, 265}, {19, 301}, {42, 288}, {63, 297}, {65, 16}, {74, 10}, {77, 0}}},
       {parseCounters1xHynix,
-       {{3, 259}, {4, 0}, {8, 263}, {18, 274}, {42, 284}, {63, 293}, {72, 311}, {74, 10}, {77, 0}},
        10168,
-       121},
+       121,
+       {{3, 259}, {4, 0}, {8, 263}, {18, 274}, {42, 284}, {63, 293}, {72, 311}, {74, 10}, {77, 0}}},
   };
   const CountingRegion counting;
   for (const Case& each : cases) {
