@@ -6,8 +6,6 @@
 namespace vesprun {
 namespace {
 
-using Direction = DeviceRegistry::SearchDirection;
-
 class HostDeviceRegistryTest : public ControllerTest {
  protected:
   DeviceRegistry& registry() { return device().platform().deviceRegistry(); }
@@ -20,41 +18,6 @@ class HostDeviceRegistryTest : public ControllerTest {
     return connection;
   }
 };
-
-TEST_F(HostDeviceRegistryTest, WalksParentsBeforeChildren) {
-  start(R"({"class": "A", "properties": {"own": 1, "shared": "a"}, "children": [
-             {"class": "B", "matching": false, "conformsTo": ["Base"], "children": [
-               {"class": "C", "properties": {"deep": 3, "shared": "c"}}]},
-             {"class": "D", "conformsTo": ["Base"], "properties": {"deep": 4}}]},
-           {"class": "E"})");
-  const char* const classes[] = {"A", "B", "C", "D", "E"};
-  const auto below = [&](RegistryHandle entry) {
-    const RegistryObject iterator(registry().DevRegRegistryEntryCreateIterator(entry));
-    std::string names;
-    while (const RegistryObject object{registry().DevRegIteratorNext(iterator.get())}) {
-      for (const char* name : classes) {
-        names += registry().DevRegObjectConformsTo(object.get(), name) ? name : "";
-      }
-    }
-    return names;
-  };
-  EXPECT_EQ(below(RegistryObject(registry().DevRegRegistryGetRootEntry()).get()), "ABCDE");
-  EXPECT_EQ(below(matching("A").get()), "BCD");
-  EXPECT_EQ(below(matching("E").get()), "");
-  EXPECT_FALSE(matching("B"));
-  EXPECT_EQ(below(matching("Base").get()), "");  // D: B is hidden
-  EXPECT_EQ(registry().DevRegRegistryEntryCreateIterator(4711), 0u);
-
-  const auto search = [&](const char* from, const char* key, Direction direction) {
-    return registry().DevRegRegistryEntrySearchProperty(matching(from).get(), key, direction);
-  };
-  EXPECT_EQ(search("C", "own", Direction::Parents), PropertyValue(1));
-  EXPECT_EQ(search("C", "shared", Direction::Parents), PropertyValue("c"));
-  EXPECT_EQ(search("D", "shared", Direction::Parents), PropertyValue("a"));
-  EXPECT_EQ(search("A", "deep", Direction::Children), PropertyValue(3));
-  EXPECT_EQ(search("A", "deep", Direction::Parents), std::nullopt);
-  EXPECT_EQ(search("D", "shared", Direction::Children), std::nullopt);
-}
 
 TEST_F(HostDeviceRegistryTest, DriverChecksWhatItIsSent) {
   const std::string answers =

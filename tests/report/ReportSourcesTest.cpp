@@ -152,48 +152,5 @@ TEST(KernelMemoryStatistics, StandInTheLogOnceTheirGatesHold) {
   }
 }
 
-TEST(KernelMemoryStatistics, StandInTheirOrder) {
-  std::string variables =
-      R"("vm.swapusage": {"data": "AAAAAAEAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAA="},
-         "kern.memorystatus_thaw_count_since_boot": {"u64": 10},
-         "kern.memorystatus_freezer_below_threshold_count": {"u64": 0},
-         "kern.memorystatus_freezer_refreeze_count": {"u64": 10},
-         "kern.memorystatus_freezer_bytes_refrozen": {"u64": 129})";
-  std::vector<std::string> expected;
-  const auto add = [&](const std::string& variable, const char* width, std::uint64_t value,
-                       const std::string& row) {
-    variables += ", \"" + variable + "\": {\"" + width + "\": " + std::to_string(value) + "}";
-    expected.push_back(row);
-  };
-  std::uint64_t next = 100;
-  for (const std::string name :
-       {"total", "one_bit_flip", "not_found", "1_byte", "2_byte", "4_byte", "8_byte", "16_byte",
-        "32_byte", "64_byte", "128_byte", "256_byte", "undiagnosed"}) {
-    add("vm.vmtc_" + name, "u32", next, "kernel.vmtc_" + name + ' ' + std::to_string(next));
-    ++next;
-  }
-  const std::string kernel = "kern.memorystatus_";
-  add(kernel + "freeze_count", "u32", 4294967294, "kernel.memorystatus_freeze_count 4294967294");
-  add(kernel + "freeze_pageouts", "u64", 98304, "kernel.memorystatus_freeze_pageouts 98304");
-  expected.emplace_back("memorystatus_freezer_thaws_per_gb 6");
-  add(kernel + "freeze_budget_pages_remaining", "u64", 9223372036854775808U,
-      "kernel.memorystatus_freeze_budget_pages_remaining -9223372036854775808");
-  add(kernel + "thaw_count", "u32", 18, "kernel.memorystatus_thaw_count 18");
-  expected.emplace_back("kernel.swapusage 4294967296");
-  for (const std::string name : {"no_compressor_space", "no_swap_space", "below_min_pages",
-                                 "low_probability_of_use", "other"}) {
-    const std::string row = "freezer_error_" + name + "_count";
-    add(kernel + row, "u64", next, "memorystatus_" + row + ' ' + std::to_string(next / 3));
-    ++next;
-  }
-  add(kernel + "freezer_process_considered_count", "u64", 300,
-      "memorystatus_freezer_process_considered_count 300");
-  add(kernel + "freezer_skipped_full_count", "u64", 1,
-      "memorystatus_freezer_skipped_full_count 9223372036854775807");
-  add(kernel + "freezer_thaw_percentage", "u64", 55, "memorystatus_freezer_thaw_percentage 55");
-  expected.emplace_back("memorystatus_freezer_refreeze_average 12");
-  EXPECT_EQ(memoryStatistics(variables), expected);
-}
-
 }  // namespace
 }  // namespace vesprun
