@@ -45,7 +45,7 @@ TEST(FactoryDefectList, StaysWithinTheBufferWhereverItEnds) {
   for (std::size_t length = 0; length <= list.size(); ++length) {
     const Bytes cut(list.begin(), list.begin() + static_cast<std::ptrdiff_t>(length));
     EXPECT_TRUE(LogFactoryDefectList(cut, nullptr, ""));
-    records += length < 12 ? 0U : length < 44 ? 1U : length < 76 ? 2U : 3U;
+    records += length < 8 ? 0U : length < 44 ? 1U : length < 76 ? 2U : 3U;
     EXPECT_EQ(device.lines("records.jsonl").size(), records) << length;
   }
 }

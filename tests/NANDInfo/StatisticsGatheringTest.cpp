@@ -101,8 +101,7 @@ TEST_F(StatisticsGatheringTest, MSPsAreCountedThenFetched) {
       "executeTunnelCommand: DevRegConnectCallStructMethod failed while retrieving data size";
   const Case cases[] = {{describeMSPs(3, ending), 3, noSize},
                         {describeMSPs(12, kStatisticsAnswer), 10, "NA"},
-                        {describeMSPs(9, unreadable), 9,
-                         "ORUMSPParseBufferToCxt: Passed in invalid buffer or empty buffer"},
+                        {describeMSPs(9, unreadable), 9, "gatherORUMSPData: parseMSP failed !"},
                         {describeMSPs(0, kStatisticsAnswer), kNothing, noSize},
                         {controller("ORUStorage"), kNothing,
                          "gatherORUMSPData: Controller does not support MSP data"},

@@ -28,10 +28,12 @@ constexpr const char* kStoredDayKey = "LastCrashLogSerializationDateInDaysSince1
 constexpr std::int32_t kYesterday = TestDevice::kToday - 1;
 constexpr double kQuiet = 0.05;
 
-// No report is built: what stands in the log is the driver's alone.
+// No report is built, and the day is one without legacy NAND info: what stands in the log is the
+// driver's alone.
 constexpr std::string_view kNoSubmission =
     R"({"clock": "2024-03-05T09:15:02Z", "submission": {"enabled": false},
-        "system": {"buildVersion": "2B"}})";
+        "system": {"buildVersion": "2B"},
+        "kernel": {"variables": {"kern.bootsessionuuid": "1"}}})";
 
 /// A device on which the driver has nothing to say about the OS build.
 struct DriverDevice : TestDevice {

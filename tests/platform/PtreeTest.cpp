@@ -250,7 +250,7 @@ TEST(PtreeReader, readsOrRefusesWhateverBytesChange) {
   const std::string document = writtenOf(everything());
   std::mt19937 random(7);
   int accepted = 0;
-  for (int round = 0; round < 5000; ++round) {
+  for (int round = 0; round < 10000; ++round) {
     std::string changed = document;
     for (auto count = 1 + random() % 3; count > 0; --count) {
       const std::size_t at = random() % changed.size();

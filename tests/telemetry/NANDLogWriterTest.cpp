@@ -1,6 +1,5 @@
 #include "telemetry/NANDLogWriter.h"
 
-#include <errno.h>
 #include <unistd.h>
 
 #include <limits>
@@ -42,7 +41,7 @@ TEST_F(NANDLogWriter, WritesTheHeaderAndOneLine) {
   EXPECT_EQ(log(),
             "System ID: S1\nHardware Model: M2\nOS Version: V3\nDate: 2024-03-05 10:15:02 +0100\n"
             "Incident ID: I4\nFaultline Key: F5\n\n2024-03-05 10:15:02 +0100 " +
-                "vesprun[" + std::to_string(getpid()) +
+                std::string("vesprun[") + std::to_string(getpid()) +
                 "]: IntermediateWamp:1.07;UserWamp:2.35;ValidityList[0]:12,7,3\n");
   device.endProcess();
   EXPECT_THAT(device.read("var/mobile/Library/Preferences/vesprun.ptree"),

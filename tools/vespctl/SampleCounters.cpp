@@ -105,7 +105,7 @@ std::vector<ScalarReading> readKernelCounters() {
 }
 
 std::vector<DistributionReadings> takeReadingBurst() {
-  using Clock = std::chrono::steady_clock;
+  using SteadyClock = std::chrono::steady_clock;
   constexpr auto kPause = std::chrono::milliseconds(1);
   constexpr int kReadings = 200;
   DistributionReadings wakeUps{"host.latency.wakeUpMicroseconds", {}};
@@ -113,9 +113,9 @@ std::vector<DistributionReadings> takeReadingBurst() {
   DistributionReadings switches{"host.scheduler.contextSwitchesPerReading", {}};
   std::int64_t lastSwitches = readSchedulerFigure("ctxt");
   for (int i = 0; i < kReadings; ++i) {
-    const auto start = Clock::now();
+    const auto start = SteadyClock::now();
     std::this_thread::sleep_for(kPause);
-    const std::chrono::duration<double, std::micro> late = Clock::now() - start - kPause;
+    const std::chrono::duration<double, std::micro> late = SteadyClock::now() - start - kPause;
     wakeUps.values.push_back(late.count());
     memory.values.push_back(static_cast<double>(availableMemory()));
     const std::int64_t nowSwitches = readSchedulerFigure("ctxt");
