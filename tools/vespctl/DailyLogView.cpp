@@ -63,10 +63,11 @@ void showHistogram(std::ostream& out, const PropertyDict& histogram) {
   const auto width = static_cast<int>(longestKey(histogram));
   for (const auto& [label, count] : histogram) {
     const double value = count.number() != nullptr ? count.number()->asDouble() : 0.0;
-    const auto length = static_cast<std::size_t>(std::ceil(value / largest * kLongestBar));
-    out << "      " << std::right << std::setw(width) << label << "  "
-        << std::string(std::min<std::size_t>(length, kLongestBar), '#') << ' ' << textForm(count)
-        << '\n';
+    // Also a log that is not ours is shown: its counts may be anything.
+    const double share = value > 0 ? value / largest : 0.0;
+    const auto length = share <= 1 ? static_cast<std::size_t>(std::ceil(share * kLongestBar)) : 0;
+    out << "      " << std::right << std::setw(width) << label << "  " << std::string(length, '#')
+        << ' ' << textForm(count) << '\n';
   }
 }
 
