@@ -1,12 +1,12 @@
 #include "driver/DailyDriver.h"
 
 #include <cstdint>
-#include <exception>
 #include <memory>
 #include <string_view>
 
 #include "driver/ActiveAppInfoListener.h"
 #include "driver/DailyTasks.h"
+#include "driver/Guarded.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
@@ -33,19 +33,6 @@ void runCommandLine(std::span<const char* const> commandLine) {
     runListenerMode();
   } else if (commandLine.size() > 1) {
     runOption(commandLine[1]);
-  }
-}
-
-/// The last guard of a job that must end well whatever happens, such as memory running out.
-template <typename Step>
-void runGuarded(Step step) noexcept {
-  try {
-    try {
-      step();
-    } catch (const std::exception& failure) {
-      logMessage(LogLevel::Error, "unexpected failure: %s", failure.what());
-    }
-  } catch (...) {  // not even the log can be written
   }
 }
 

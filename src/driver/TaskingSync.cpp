@@ -12,16 +12,13 @@
 #include "common/PropertyDict.h"
 #include "common/TextForm.h"
 #include "platform/Platform.h"
+#include "platform/PreferenceNames.h"
 
 namespace vesprun {
 namespace {
 
-constexpr std::string_view kDomain = "com.quill.aggregated.vesprun";
 constexpr std::string_view kLastUpdateKey = "LastOSUpdate";
-constexpr std::string_view kIdentifierKey = "TaskingID";
 constexpr std::string_view kSystemKey = "TaskingOS";
-constexpr std::string_view kDigestKey = "TaskingDigest";
-constexpr std::string_view kPayloadKey = "TaskingPayload";
 
 constexpr std::string_view kMobileUser = "mobile";
 constexpr std::string_view kDiagnosticsUser = "__logsmith__";
@@ -30,11 +27,11 @@ using OptionalValue = std::optional<PropertyValue>;
 using DomainSet = std::set<std::string, std::less<>>;
 
 OptionalValue storedValue(std::string_view key) {
-  return platform().preferences().LGSPreferencesGetValue(key, kDomain);
+  return platform().preferences().LGSPreferencesGetValue(key, kOwnDomain);
 }
 
 void storeValue(std::string_view key, OptionalValue value) {
-  platform().preferences().LGSPreferencesSetValue(key, std::move(value), kDomain);
+  platform().preferences().LGSPreferencesSetValue(key, std::move(value), kOwnDomain);
 }
 
 /// None when there is no such entry, or no dictionary to hold it.
@@ -100,37 +97,37 @@ void forEachRecord(const PropertyValue& payload, DomainSet& changed,
 }
 
 void undoStoredTasking(DomainSet& changed) {
-  const OptionalValue payload = storedValue(kPayloadKey);
+  const OptionalValue payload = storedValue(kTaskingPayloadKey);
   if (!payload) {
     return;
   }
   forEachRecord(*payload, changed, undoRecord);
-  for (const std::string_view key : {kIdentifierKey, kDigestKey, kPayloadKey}) {
+  for (const std::string_view key : {kTaskingIDKey, kTaskingDigestKey, kTaskingPayloadKey}) {
     storeValue(key, std::nullopt);
   }
-  changed.emplace(kDomain);
+  changed.emplace(kOwnDomain);
 }
 
 void applyTasking(const OptionalValue& tasking, const OptionalValue& build, DomainSet& changed) {
-  OptionalValue payload = entryOf(tasking, kPayloadKey);
+  OptionalValue payload = entryOf(tasking, kTaskingPayloadKey);
   if (!payload) {
     return;
   }
   forEachRecord(*payload, changed, applyRecord);
-  storeValue(kIdentifierKey, entryOf(tasking, kIdentifierKey));
+  storeValue(kTaskingIDKey, entryOf(tasking, kTaskingIDKey));
   storeValue(kSystemKey, build);
-  storeValue(kDigestKey, entryOf(tasking, kDigestKey));
-  storeValue(kPayloadKey, std::move(payload));
-  changed.emplace(kDomain);
+  storeValue(kTaskingDigestKey, entryOf(tasking, kTaskingDigestKey));
+  storeValue(kTaskingPayloadKey, std::move(payload));
+  changed.emplace(kOwnDomain);
 }
 
 void synchronize(DomainSet changed) {
-  const bool own = changed.erase(std::string(kDomain)) != 0;
+  const bool own = changed.erase(std::string(kOwnDomain)) != 0;
   for (const std::string& domain : changed) {
     platform().preferences().LGSPreferencesSynchronize(domain);
   }
   if (own) {
-    platform().preferences().LGSPreferencesSynchronize(kDomain);
+    platform().preferences().LGSPreferencesSynchronize(kOwnDomain);
   }
 }
 
@@ -148,11 +145,11 @@ void noteOSChange(const OptionalValue& build) {
 void syncTasking(const OptionalValue& build) {
   const OptionalValue scheduled = platform().systemConfiguration().getPrefsKeyForDomainWithOptions(
       "ScheduledTasking", "com.quill.Ferrywell", 0);
-  const OptionalValue identifier = entryOf(scheduled, kIdentifierKey);
+  const OptionalValue identifier = entryOf(scheduled, kTaskingIDKey);
   if (!identifier) {
     return;
   }
-  const OptionalValue storedIdentifier = storedValue(kIdentifierKey);
+  const OptionalValue storedIdentifier = storedValue(kTaskingIDKey);
   const OptionalValue storedBuild = storedValue(kSystemKey);
   DomainSet changed;
   if (storedIdentifier) {

@@ -5,16 +5,17 @@
 
 #include "common/TextForm.h"
 #include "platform/Platform.h"
+#include "platform/PreferenceNames.h"
 #include "report/TBReport.h"
 
 namespace vesprun {
 namespace {
 
-constexpr std::string_view kDomain = "com.quill.aggregated.vesprun";
+constexpr std::string_view kLastOSVersionKey = "LastOSVersion";
 
 PropertyValue preferenceOr(std::string_view key, PropertyValue fallback) {
   std::optional<PropertyValue> value =
-      platform().preferences().LGSPreferencesGetValue(key, kDomain);
+      platform().preferences().LGSPreferencesGetValue(key, kOwnDomain);
   return value ? *std::move(value) : std::move(fallback);
 }
 
@@ -22,13 +23,13 @@ PropertyValue preferenceOr(std::string_view key, PropertyValue fallback) {
 PropertyDict headerOfOSVersionChange() {
   Preferences& preferences = platform().preferences();
   const std::optional<PropertyValue> last =
-      preferences.LGSPreferencesGetValue("LastOSVersion", kDomain);
+      preferences.LGSPreferencesGetValue(kLastOSVersionKey, kOwnDomain);
   const PropertyValue current = platform().logsmith().LGSOSVersion();
   if (last == current) {
     return {};
   }
-  preferences.LGSPreferencesSetValue("LastOSVersion", current, kDomain);
-  preferences.LGSPreferencesSynchronize(kDomain);
+  preferences.LGSPreferencesSetValue(kLastOSVersionKey, current, kOwnDomain);
+  preferences.LGSPreferencesSynchronize(kOwnDomain);
   return {{"previous_os_version", last ? textForm(*last) : "<unknown>"}};
 }
 
@@ -49,9 +50,9 @@ void TBReport::serializeWithDateAndAppInfo(std::int32_t day, const AppInfoList* 
 PropertyDict TBReport::buildDocument(std::int32_t day, const AppInfoList* appInfo) {
   const std::string whitelistDigest = _config ? _config->configFileDigest() : "";
   _config.reset();
-  PropertyValue taskID = preferenceOr("TaskingID", "(no tasking id)");
-  PropertyValue taskDigest = preferenceOr("TaskingDigest", "(no tasking digest)");
-  PropertyValue tasking = preferenceOr("TaskingPayload", PropertyArray());
+  PropertyValue taskID = preferenceOr(kTaskingIDKey, "(no tasking id)");
+  PropertyValue taskDigest = preferenceOr(kTaskingDigestKey, "(no tasking digest)");
+  PropertyValue tasking = preferenceOr(kTaskingPayloadKey, PropertyArray());
 
   PropertyDict document;
   document.set("TBCrashLogVersion", 1);

@@ -1,6 +1,7 @@
 #include <string>
 
 #include "platform/Platform.h"
+#include "platform/PreferenceNames.h"
 #include "report/SupportLibraryFunctions.h"
 #include "report/TBReport.h"
 
@@ -8,13 +9,10 @@ namespace vesprun {
 namespace {
 
 constexpr std::uint64_t kBytesPerMebibyte = 1048576;
-constexpr std::string_view kCorruptionDomain = "com.quill.aggregated";
-constexpr std::string_view kCorruptionCount = "DatabaseCorruptionCount";
+constexpr const char* kDatabasePath = "/var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
 
 std::int64_t databaseMebibytes() {
-  static const std::string path =
-      std::string("/var/mobile") + "/Library/Tallybook/TBDataStore.sqlitedb";
-  const std::optional<std::uint64_t> bytes = platform().fileSystem().fileSize(path);
+  const std::optional<std::uint64_t> bytes = platform().fileSystem().fileSize(kDatabasePath);
   return bytes ? static_cast<std::int64_t>(*bytes / kBytesPerMebibyte) : -1;
 }
 
@@ -24,8 +22,8 @@ std::int64_t takeCorruptionCount() {
   }
   Preferences& preferences = platform().preferences();
   const std::int64_t count =
-      preferences.LGSPreferencesGetIntegerValue(kCorruptionCount, kCorruptionDomain);
-  preferences.LGSPreferencesSetValue(kCorruptionCount, 0, kCorruptionDomain);
+      preferences.LGSPreferencesGetIntegerValue(kCorruptionCountKey, kAggregatedDomain);
+  preferences.LGSPreferencesSetValue(kCorruptionCountKey, 0, kAggregatedDomain);
   return count;
 }
 

@@ -3,12 +3,10 @@
 #include <optional>
 
 #include "common/Date.h"
+#include "platform/PreferenceNames.h"
 
 namespace vesprun {
 namespace {
-
-constexpr std::string_view kCorruptionCountDomain = "com.quill.aggregated";
-constexpr std::string_view kCorruptionCountKey = "DatabaseCorruptionCount";
 
 std::int64_t wrappingSum(std::int64_t left, std::int64_t right) {
   return static_cast<std::int64_t>(static_cast<std::uint64_t>(left) +
@@ -168,12 +166,12 @@ bool SqliteTallybook::recover(const CounterFile::Damage& damage, std::string& er
     _log.write(LogLevel::Error,
                damage.text + "; kept as " + *aside + ", an empty database takes its place");
     // The first synchronization lets go of a count that another process may have changed.
-    _preferences.LGSPreferencesSynchronize(kCorruptionCountDomain);
+    _preferences.LGSPreferencesSynchronize(kAggregatedDomain);
     const std::int64_t count =
-        _preferences.LGSPreferencesGetIntegerValue(kCorruptionCountKey, kCorruptionCountDomain);
+        _preferences.LGSPreferencesGetIntegerValue(kCorruptionCountKey, kAggregatedDomain);
     _preferences.LGSPreferencesSetValue(kCorruptionCountKey, wrappingSum(count, 1),
-                                        kCorruptionCountDomain);
-    _preferences.LGSPreferencesSynchronize(kCorruptionCountDomain);
+                                        kAggregatedDomain);
+    _preferences.LGSPreferencesSynchronize(kAggregatedDomain);
   }
   return true;
 }
