@@ -95,8 +95,8 @@ VESPRUN_EXPORT PropertyDict CopyWhitelistedNANDMSPInfo(bool round);
 VESPRUN_EXPORT PropertyDict CopyWhitelistedStorageStats(bool round);
 
 // A few figures on the storage's health, made from the FTL fields of now. Every key begins with
-// "com.quill.NANDInfo.Health.", every value is a signed number: "MaxPercentageNANDUsed",
-// "MaxE2EErrors" and "HostReadErrors" of 32 bits, at least 0; "NumGrownBadBlocks",
+// "com.quill.NANDInfo.Health.", every value is a signed number: "MaxPercentageNANDUsed" and
+// "MaxE2EErrors" of 32 bits and "HostReadErrors" of 64, at least 0; "NumGrownBadBlocks",
 // "SpareAvailablePercent" and "NumDieFailures" of 64 bits, -1 when not known. None of them, with
 // the error recorded, when the fields cannot be had.
 

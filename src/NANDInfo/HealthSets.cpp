@@ -61,12 +61,13 @@ std::int32_t maxE2EErrors(const PropertyDict& ftl) {
   return most;
 }
 
-std::int32_t hostReadErrors(const PropertyDict& ftl) {
+std::int64_t hostReadErrors(const PropertyDict& ftl) {
   const Number* isQNS1 = numberUnder(ftl, "com.quill.NANDInfo.IsQNS1Controller");
   if (isQNS1 == nullptr) {
     return 0;
   }
-  return atLeastZero(ftl, isQNS1->asInt64() != 0 ? "ueccReads" : "raidSmartErrors");
+  const Number* errors = numberUnder(ftl, isQNS1->asInt64() != 0 ? "ueccReads" : "raidSmartErrors");
+  return errors != nullptr ? std::max<std::int64_t>(errors->asInt64(), 0) : 0;
 }
 
 std::int64_t numberOrMinusOne(const PropertyDict& fields, std::string_view name) {
