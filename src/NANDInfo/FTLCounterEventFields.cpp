@@ -3,7 +3,7 @@
 namespace vesprun {
 namespace {
 
-constexpr auto kRanges = std::to_array<FieldRange>({
+constexpr auto kFTLEventRanges = std::to_array<FieldRange>({
     // clang-format off
     "kx3FwVer", "nandDesc", "hostWrites", "hostWritesDyn", "hostWritesStatic", "hostReads",
     "uncleanBoots", "IND_pool_free", "IND_pool_count", "gcWrites", "wearLevMoves", "nandWrites",
@@ -111,11 +111,11 @@ constexpr auto kRanges = std::to_array<FieldRange>({
     "HLT_VMStats_swapins", "HLT_VMStats_swapouts", "numDipFailures", "bdrBackupThreshHrs", "Count",
     // clang-format on
 });
-constexpr FieldIndex kIndex(kRanges);
-static_assert(kIndex.fieldCount == 443);
+constexpr FieldIndex kFTLEventIndex(kFTLEventRanges);
+static_assert(kFTLEventIndex.fieldCount == 443);
 
 }  // namespace
 
-constinit const FieldTable massStorage_NANDInfo_FTLCounters_1(kRanges, kIndex);
+constinit const FieldTable massStorage_NANDInfo_FTLCounters_1(kFTLEventRanges, kFTLEventIndex);
 
 }  // namespace vesprun

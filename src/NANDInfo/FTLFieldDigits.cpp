@@ -3,7 +3,7 @@
 namespace vesprun {
 namespace {
 
-constexpr auto kRanges = std::to_array<FieldRange>({
+constexpr auto kFTLDigitRanges = std::to_array<FieldRange>({
     // clang-format off
     {0, "HLT_APIErrorMessage"}, {0, "bdrBackupThreshHrs"}, {0, "maxQosPerCmdQ_", 0, 9},
     {1, "HLT_storeDemoMode"}, {1, "TurboRaidIsEnabled"}, {2, "chipIdTemperatureSample"},
@@ -158,11 +158,12 @@ constexpr auto kRanges = std::to_array<FieldRange>({
     {8, "wcacheDirtyAtFlush_", 0, 15}, {8, "wcacheWaitLogMs_", 0, 9}, {8, "wearLevMoves"},
     // clang-format on
 });
-constexpr FieldIndex kIndex(kRanges);
-static_assert(kIndex.fieldCount == 1447);
+constexpr FieldIndex kFTLDigitIndex(kFTLDigitRanges);
+static_assert(kFTLDigitIndex.fieldCount == 1447);
 
 }  // namespace
 
-constinit const FieldTable WhitelistedRawNANDFTLCounters_SigDigDict(kRanges, kIndex);
+constinit const FieldTable WhitelistedRawNANDFTLCounters_SigDigDict(kFTLDigitRanges,
+                                                                    kFTLDigitIndex);
 
 }  // namespace vesprun

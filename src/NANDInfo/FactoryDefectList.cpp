@@ -14,7 +14,7 @@ constexpr std::int32_t kRecordType = 176;
 // The header: a word that is not read, the factory count, the number of records.
 constexpr std::size_t kFactoryCountOffset = 4;
 constexpr std::size_t kRecordCountOffset = 8;
-constexpr std::size_t kHeaderSize = 12;
+constexpr std::size_t kListHeaderSize = 12;
 constexpr std::size_t kRecordSize = 32;
 
 /// A defect as it lies in the buffer, 32 bytes.
@@ -91,13 +91,13 @@ bool LogFactoryDefectList(std::span<const std::uint8_t> buffer, const PropertyVa
   if (buffer.size() >= kRecordCountOffset) {
     logHeader(loadLittleEndian<std::uint32_t>(buffer.data() + kFactoryCountOffset), properties);
   }
-  if (buffer.size() < kHeaderSize) {
+  if (buffer.size() < kListHeaderSize) {
     return true;
   }
   const std::size_t stated = loadLittleEndian<std::uint32_t>(buffer.data() + kRecordCountOffset);
-  const std::size_t count = std::min(stated, (buffer.size() - kHeaderSize) / kRecordSize);
+  const std::size_t count = std::min(stated, (buffer.size() - kListHeaderSize) / kRecordSize);
   for (std::size_t i = 0; i < count; ++i) {
-    const std::uint8_t* bytes = buffer.data() + kHeaderSize + i * kRecordSize;
+    const std::uint8_t* bytes = buffer.data() + kListHeaderSize + i * kRecordSize;
     logDefect(DefectRecord(bytes), className != "ORUStorage");
   }
   return true;

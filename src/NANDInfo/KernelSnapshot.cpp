@@ -19,7 +19,7 @@ enum ItemType : std::uint32_t {
   kBufferEnd = 0xF19158ED,
 };
 
-constexpr std::size_t kHeaderSize = 16;
+constexpr std::size_t kItemHeaderSize = 16;
 constexpr std::size_t kNameSize = 64;
 
 struct Item {
@@ -28,21 +28,21 @@ struct Item {
   Items data;
 
   bool beginsContainer() const { return type == kContainerBegin && data.size() >= 4; }
-  std::size_t size() const { return kHeaderSize + data.size(); }
+  std::size_t size() const { return kItemHeaderSize + data.size(); }
 };
 
 /// The item at the front, unless it ends the snapshot or does not lie wholly within it.
 std::optional<Item> frontItem(Items items) {
-  if (items.size() < kHeaderSize) {
+  if (items.size() < kItemHeaderSize) {
     return std::nullopt;
   }
   const auto type = loadLittleEndian<std::uint32_t>(items.data());
   const auto size = loadLittleEndian<std::uint32_t>(items.data() + 4);
-  if (type == kBufferEnd || size > items.size() - kHeaderSize) {
+  if (type == kBufferEnd || size > items.size() - kItemHeaderSize) {
     return std::nullopt;
   }
   return Item{type, loadLittleEndian<std::uint64_t>(items.data() + 8),
-              items.subspan(kHeaderSize, size)};
+              items.subspan(kItemHeaderSize, size)};
 }
 
 struct Container {

@@ -127,19 +127,19 @@ constexpr auto kRows = std::to_array<KeyRange>({
     // clang-format on
 });
 
-constexpr auto kFields = []<std::size_t... Row>(std::index_sequence<Row...>) {
+constexpr auto kLegacyFields = []<std::size_t... Row>(std::index_sequence<Row...>) {
   return std::array{kRows[Row].fields...};
 }
 (std::make_index_sequence<kRows.size()>());
-constexpr FieldIndex kIndex(kFields);
-static_assert(kIndex.fieldCount == 709);
-static_assert(std::ranges::all_of(kFields, [](const FieldRange& fields) {
+constexpr FieldIndex kLegacyIndex(kLegacyFields);
+static_assert(kLegacyIndex.fieldCount == 709);
+static_assert(std::ranges::all_of(kLegacyFields, [](const FieldRange& fields) {
   return fields.stem.size() + 9 < 100;
 }));
 
 }  // namespace
 
-constinit const FieldTable keyMap(kFields, kIndex);
+constinit const FieldTable keyMap(kLegacyFields, kLegacyIndex);
 
 std::optional<std::string> legacyKeyOf(std::string_view field) {
   const FieldName name = splitFieldName(field);
@@ -147,7 +147,8 @@ std::optional<std::string> legacyKeyOf(std::string_view field) {
   if (fields == nullptr) {
     return std::nullopt;
   }
-  const FieldRange& suffixes = kRows[static_cast<std::size_t>(fields - kFields.data())].suffixes;
+  const FieldRange& suffixes =
+      kRows[static_cast<std::size_t>(fields - kLegacyFields.data())].suffixes;
   std::string suffix;
   assignFieldName(suffix, suffixes.stem, suffixes.first + (name.number - fields->first));
   return "com.quill.NANDInfo." + suffix;

@@ -3,7 +3,7 @@
 namespace vesprun {
 namespace {
 
-constexpr auto kRanges = std::to_array<FieldRange>({
+constexpr auto kMSPEventRanges = std::to_array<FieldRange>({
     // clang-format off
     "msp_index", {"active_time_hist", 0, 7}, {"avg_rd_window_size", 0, 4},
     "bdbDefaultMoveFastToNormal", "bdbDefaultMoveNormalToFast", "bdbDynamicMovedToEOL_LSB",
@@ -82,11 +82,11 @@ constexpr auto kRanges = std::to_array<FieldRange>({
     {"rd_window_dist", 0, 8}, "Count",
     // clang-format on
 });
-constexpr FieldIndex kIndex(kRanges);
-static_assert(kIndex.fieldCount == 822);
+constexpr FieldIndex kMSPEventIndex(kMSPEventRanges);
+static_assert(kMSPEventIndex.fieldCount == 822);
 
 }  // namespace
 
-constinit const FieldTable massStorage_NANDInfo_MSPCounters_1(kRanges, kIndex);
+constinit const FieldTable massStorage_NANDInfo_MSPCounters_1(kMSPEventRanges, kMSPEventIndex);
 
 }  // namespace vesprun

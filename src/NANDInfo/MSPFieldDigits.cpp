@@ -3,7 +3,7 @@
 namespace vesprun {
 namespace {
 
-constexpr auto kRanges = std::to_array<FieldRange>({
+constexpr auto kMSPDigitRanges = std::to_array<FieldRange>({
     // clang-format off
     {0, "HLT_APIErrorMessage"}, {2, "DYCE1_Decoded_Bitflips", 0, 14},
     {2, "DYCE1_Target_Bitflips", 0, 19}, {2, "DYCE2_Decoded_Bitflips", 0, 14},
@@ -93,11 +93,12 @@ constexpr auto kRanges = std::to_array<FieldRange>({
     {6, "num_pg_events"}, {8, "HLT_hostWrites"}, {20, "fw_version_identifier"},
     // clang-format on
 });
-constexpr FieldIndex kIndex(kRanges);
-static_assert(kIndex.fieldCount == 825);
+constexpr FieldIndex kMSPDigitIndex(kMSPDigitRanges);
+static_assert(kMSPDigitIndex.fieldCount == 825);
 
 }  // namespace
 
-constinit const FieldTable WhitelistedRawNANDMSPCounters_SigDigDict(kRanges, kIndex);
+constinit const FieldTable WhitelistedRawNANDMSPCounters_SigDigDict(kMSPDigitRanges,
+                                                                    kMSPDigitIndex);
 
 }  // namespace vesprun

@@ -3,7 +3,7 @@
 namespace vesprun {
 namespace {
 
-constexpr auto kRanges = std::to_array<FieldRange>({
+constexpr auto kStorageEventRanges = std::to_array<FieldRange>({
     // clang-format off
     "EAN_updateCount_FW", "EAN_updateCount_LowPowerEM", "EAN_updateCount_NonEssentialFW",
     "EAN_updateCount_LTH", "EAN_updateCount_fConfig", "EAN_updateCount_dConfig",
@@ -12,11 +12,12 @@ constexpr auto kRanges = std::to_array<FieldRange>({
     "HLT_hostWrites", "HLT_OR_Capacity_GB", "HLT_OR_Diskfullness_BP", "Count",
     // clang-format on
 });
-constexpr FieldIndex kIndex(kRanges);
-static_assert(kIndex.fieldCount == 17);
+constexpr FieldIndex kStorageEventIndex(kStorageEventRanges);
+static_assert(kStorageEventIndex.fieldCount == 17);
 
 }  // namespace
 
-constinit const FieldTable massStorage_NANDInfo_StorageStats_1(kRanges, kIndex);
+constinit const FieldTable massStorage_NANDInfo_StorageStats_1(kStorageEventRanges,
+                                                               kStorageEventIndex);
 
 }  // namespace vesprun

@@ -1,5 +1,7 @@
 #include "NANDInfo/APIErrorMessage.h"
 
+#include <gtest/gtest.h>
+
 namespace vesprun {
 namespace {
 

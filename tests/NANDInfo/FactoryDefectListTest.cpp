@@ -14,7 +14,6 @@ TEST(FactoryDefectList, LogsTheCountAndEveryDefect) {
                0xFFFF8000, 0,          0x80000000, 0, 5,          0, 128,        2,  //
                0,          0,          0,          0, 0xFFFFFFFF, 0, 127,        0xBAD});
   TestDevice device;
-  device.platform();
   const PropertyValue properties = PropertyDict{{"nand-device-desc", 0xFFFFFFFF}};
   testing::internal::CaptureStderr();
   EXPECT_TRUE(LogFactoryDefectList(list, &properties, "QuillQNS3NVMeController"));
@@ -40,7 +39,6 @@ TEST(FactoryDefectList, LogsTheCountAndEveryDefect) {
 TEST(FactoryDefectList, StaysWithinTheBufferWhereverItEnds) {
   const Bytes list = bytesOf({0, 1, 0xFFFFFFFF, 1, 0, 0, 0, 0, 0, 0, 0, 2, 0, 0, 0, 0, 0, 0, 0});
   TestDevice device;
-  device.platform();
   std::size_t records = 0;
   for (std::size_t length = 0; length <= list.size(); ++length) {
     const Bytes cut(list.begin(), list.begin() + static_cast<std::ptrdiff_t>(length));

@@ -1,5 +1,6 @@
 #include "NANDInfo/FieldTable.h"
 
+#include <gmock/gmock.h>
 #include <set>
 
 #include "NANDInfo/EventFields.h"

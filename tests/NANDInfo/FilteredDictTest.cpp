@@ -1,5 +1,6 @@
 #include "NANDInfo/FilteredDict.h"
 
+#include <gtest/gtest.h>
 #include <limits>
 
 #include "NANDInfo/SignificantDigits.h"
@@ -28,9 +29,9 @@ TEST(RoundSig, roundsHalfUpOnTheDigitThatIsCutOff) {
   }
 }
 
-constexpr auto kRanges = std::to_array<FieldRange>({{2, "a"}, {1, "b"}, {3, "bin", 9, 11}});
-constexpr FieldIndex kIndex(kRanges);
-constexpr FieldTable kTable(kRanges, kIndex);
+constexpr auto kListedRanges = std::to_array<FieldRange>({{2, "a"}, {1, "b"}, {3, "bin", 9, 11}});
+constexpr FieldIndex kListedIndex(kListedRanges);
+constexpr FieldTable kListed(kListedRanges, kListedIndex);
 
 std::vector<std::string> keysOf(const PropertyDict& dict) {
   std::vector<std::string> keys;
@@ -43,11 +44,11 @@ std::vector<std::string> keysOf(const PropertyDict& dict) {
 TEST(FilteredDict, keepsListedEntriesInTheOrderOfTheSource) {
   const PropertyDict source = {{"bin10", 12345}, {"c", 7}, {"b", "x"}, {"bin12", 1}, {"a", 12345}};
   const PropertyDict kept = {{"bin10", 12345}, {"b", "x"}, {"a", 12345}};
-  EXPECT_EQ(CreateFilteredDict(source, &kTable), kept);
-  EXPECT_EQ(CreateFilteredDict_SigDig(source, &kTable, false), kept);
-  EXPECT_EQ(keysOf(CreateFilteredDict(source, &kTable)), keysOf(kept));
+  EXPECT_EQ(CreateFilteredDict(source, &kListed), kept);
+  EXPECT_EQ(CreateFilteredDict_SigDig(source, &kListed, false), kept);
+  EXPECT_EQ(keysOf(CreateFilteredDict(source, &kListed)), keysOf(kept));
   const PropertyDict rounded = {{"bin10", 12300}, {"b", "x"}, {"a", 12000}};
-  EXPECT_EQ(CreateFilteredDict_SigDig(source, &kTable, true), rounded);
+  EXPECT_EQ(CreateFilteredDict_SigDig(source, &kListed, true), rounded);
 
   EXPECT_EQ(CreateFilteredDict(source, nullptr), source);
   EXPECT_EQ(CreateFilteredDict_SigDig(source, nullptr, true), source);
@@ -65,7 +66,7 @@ TEST(FilteredDict, roundsNumbersOfEveryKindAndNothingElse) {
       {PropertyDict{{"a", 12345}}, PropertyDict{{"a", 12345}}},
       {PropertyArray{12345}, PropertyArray{12345}}};
   for (const auto& [value, rounded] : cases) {
-    const PropertyDict filtered = CreateFilteredDict_SigDig({{"a", value}}, &kTable, true);
+    const PropertyDict filtered = CreateFilteredDict_SigDig({{"a", value}}, &kListed, true);
     ASSERT_NE(filtered.find("a"), nullptr);
     EXPECT_EQ(*filtered.find("a"), rounded);
     if (const Number* number = filtered.find("a")->number()) {

@@ -2,7 +2,6 @@
 
 #include <string>
 
-#include "NANDInfo/APIErrorMessage.h"
 #include "platform/host/JsonForm.h"
 #include "platform/host/StatisticsBufferBuilder.h"
 #include "support/ControllerTest.h"
@@ -22,12 +21,11 @@ class StatisticsDevice : public ControllerTest {
     const std::string file = std::to_string(opcode) + '-' + std::to_string(argument);
     _tunnel += (_tunnel.empty() ? R"({"opcode": )" : R"(, {"opcode": )") + numbers +
                std::to_string(argument) + R"(, "file": ")" + file + "\"}";
-    _files.emplace_back(file, std::string(bytes.begin(), bytes.end()));
+    _files.emplace_back(file, bytes);
   }
   /// `others` are further entries of the description, `registry` further ones of the registry.
   void startController(const std::string& className = "QuillQNS3NVMeController",
                        const std::string& others = "", const std::string& registry = "") {
-    forgetAPIErrorMessage();
     start(controller(className, std::exchange(_tunnel, {})) + registry, kVolume + others);
     for (const auto& [file, content] : std::exchange(_files, {})) {
       device().write(file, content);
@@ -36,7 +34,7 @@ class StatisticsDevice : public ControllerTest {
 
  private:
   std::string _tunnel;
-  std::vector<std::pair<std::string, std::string>> _files;
+  std::vector<std::pair<std::string, Bytes>> _files;
 };
 
 }  // namespace vesprun

@@ -13,12 +13,7 @@ const std::string kDisk =
     R"("HLT_Capacity_GB":64,"HLT_Diskfullness_BP":7500,"HLT_UserCapacity_MB":61035,)";
 const std::string kNoRefreshes = R"("HLT_numBootBlockRefreshes_max":0})";
 
-class StorageHealthFieldsTest : public StatisticsDevice {
- protected:
-  void writeSnapshot(const Bytes& bytes) {
-    device().write("snapshot.bin", std::string(bytes.begin(), bytes.end()));
-  }
-};
+class StorageHealthFieldsTest : public StatisticsDevice {};
 
 TEST_F(StorageHealthFieldsTest, FreezerFigureIsTheSwapOutThreadsFourthCounter) {
   using B = SnapshotBuilder;
@@ -34,7 +29,7 @@ TEST_F(StorageHealthFieldsTest, FreezerFigureIsTheSwapOutThreadsFourthCounter) {
   };
   start("", kSnapshot);
   for (const auto& [snapshot, written] : cases) {
-    writeSnapshot(snapshot);
+    device().write("snapshot.bin", snapshot);
     const std::string text = R"({"HLT_VMFreezer_bytesWritten":)" + written +
                              R"(,"com.quill.NANDInfo.VMFreezer.NumPhysicalWrites":)" + written +
                              '}';
@@ -47,7 +42,7 @@ TEST_F(StorageHealthFieldsTest, FreezerFigureIsTheSwapOutThreadsFourthCounter) {
 TEST_F(StorageHealthFieldsTest, DeviceTellsWithoutFTLFields) {
   HostPlatform& platform =
       start("", kVolume + kSnapshot + R"(, "purgeable": {"RECLAIMER_TOTAL_AVAILABLE": 5})");
-  writeSnapshot(SnapshotBuilder().thread(1, "VM_swapout", 7).bytes);
+  device().write("snapshot.bin", SnapshotBuilder().thread(1, "VM_swapout", 7).bytes);
   const std::pair<std::optional<PropertyValue>, char> modes[] = {
       {std::nullopt, '0'}, {true, '1'}, {false, '0'}, {"yes", '0'}};
   for (const auto& [preference, mode] : modes) {

@@ -29,7 +29,6 @@ TEST(TelemetryList, PicksTheLayoutByChipAndManufacturer) {
                                   {"other", "45", other},
                                   {"other", "", other}};
   TestDevice device;
-  device.platform();
   std::size_t number = 0;
   for (const auto& [chip, manufacturer, expected] : cases) {
     const PropertyValue dictionary = characteristics(chip, manufacturer, 1);
@@ -45,7 +44,6 @@ TEST(TelemetryList, PicksTheLayoutByChipAndManufacturer) {
 
 TEST(TelemetryList, LogsOneRecordForEachBus) {
   TestDevice device;
-  device.platform();
   const PropertyValue dictionary = characteristics("KX4", "0", 2);
   EXPECT_TRUE(LogNANDTelemetryList(telemetryList(2), &dictionary, ""));
   const auto lines = device.lines("records.jsonl");
@@ -94,7 +92,6 @@ TEST(TelemetryList, SaysWhatCannotBeUsed) {
       {characteristics("KX3", "0", -1), "", 0},
   };
   TestDevice device;
-  device.platform();
   for (const Case& each : cases) {
     Bytes buffer = telemetryList(2);
     buffer.resize(each.length);

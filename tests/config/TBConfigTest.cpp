@@ -1,7 +1,6 @@
 #include "config/TBConfig.h"
 
 #include "common/TextForm.h"
-#include "config/InternalDevice.h"
 #include "support/TestDevice.h"
 
 namespace vesprun {
@@ -32,7 +31,6 @@ TEST(TBConfig, PutsExactKeysBeforePrefixesInOrder) {
                 "DistributionKeys": {"dist": {}}},
       "Second": {"ScalarKeys": {"twice": {"sig_fig": 6}}, "ScalarKeyPrefixes": {"long": {"sig_fig": 7}},
                  "DistributionKeyPrefixes": {"d": {"intervals": []}}}})");
-  device.platform();
   const std::unique_ptr<TBConfig> config = TBConfig::init();
   EXPECT_EQ(scalarOptions(*config, {"exact", "exactly", "twice", "long.er.key", "long.key", "Exact",
                                     "dist", ""}),
@@ -67,9 +65,6 @@ TEST(TBConfig, TakesGroupsByDeviceAndTasking) {
                                 ? Log({"debug: passing @{} for other as device is Quill Internal"})
                                 : Log({"default: keyGroup Off is disabled by tasking",
                                        "default: keyGroup Zero is disabled by tasking"}));
-    // Asked once, whatever the platform would say later.
-    device.write("device.json", isInternal ? "{}" : kInternal);
-    EXPECT_EQ(TBIsInternalDevice(), isInternal);
   }
 }
 
@@ -79,7 +74,6 @@ TEST(TBConfig, HoldsBackWhatItCannotRead) {
       "DistributionKeys": 1, "DistributionKeyPrefixes": {"d.": {"intervals": ["1"]}},
       "ScalarKeys": {"p.true": true, "p.text": {"sig_fig": "2"}, "p.good": {"sig_fig": 3}},
       "ScalarKeyPrefixes": {"q.": {"bucket_interval": true}, "p.": {}}}})");
-  device.platform();
   const std::unique_ptr<TBConfig> config = TBConfig::init();
   using ::testing::HasSubstr;
   EXPECT_THAT(device.log(),
@@ -96,17 +90,11 @@ TEST(TBConfig, HoldsBackWhatItCannotRead) {
 
 TEST(TBConfig, FailsOnAnyFileThatIsNoWhitelist) {
   TestDevice device;
-  device.platform();
   EXPECT_EQ(TBConfig::init(), nullptr);
   EXPECT_THAT(device.log(), ElementsAre("error: Couldn't load whitelist"));
-  std::string deep = "<ptree version=\"1.0\">";
-  for (int i = 0; i < 1000000; ++i) {
-    deep += "<dict><key>k</key>";
-  }
-  const std::pair<std::string, std::string> kCases[] = {
+  const std::pair<const char*, const char*> kCases[] = {
       {"<ptree version=\"1.0\"><array/></ptree>", "the root is not a dictionary"},
-      {deep, "line 1: nested deeper than 200 levels"},
-      {std::string(100 << 20, '\xB7'), "line 1: the document does not begin with <ptree>"},
+      {"no ptree", "line 1: the document does not begin with <ptree>"},
   };
   for (const auto& [content, error] : kCases) {
     device.write(kPath, content);
@@ -118,13 +106,6 @@ TEST(TBConfig, FailsOnAnyFileThatIsNoWhitelist) {
   EXPECT_EQ(TBConfig::init()->configFileDigest(), "09d8a7a8df0a493c4493c4b22c7c9dbb");
   device.write(kPath, whole + '\n');
   EXPECT_EQ(TBConfig::init()->configFileDigest(), "a6332e5df6b0ce9126a3fa57b7135d51");
-  const std::size_t linesBefore = device.log().size();
-  for (std::size_t length = 0; length < whole.size(); ++length) {
-    device.write(kPath, whole.substr(0, length));
-    ASSERT_EQ(TBConfig::init(), nullptr) << length;
-  }
-  EXPECT_EQ(device.log().size(), linesBefore + whole.size());
-  EXPECT_THAT(device.log().back(), testing::StartsWith(kParseFailure + "line 1: "));
 }
 
 }  // namespace

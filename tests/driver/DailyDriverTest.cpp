@@ -19,9 +19,7 @@
 namespace vesprun {
 namespace {
 
-using ::testing::ElementsAreArray;
-using ::testing::IsEmpty;
-using ::testing::SizeIs;
+using ::testing::ElementsAreArray, ::testing::IsEmpty, ::testing::SizeIs;
 
 constexpr const char* kService = "com.quill.aggregated.vesprun";
 constexpr const char* kStoredDayKey = "LastCrashLogSerializationDateInDaysSince1970";
@@ -29,9 +27,10 @@ constexpr std::int32_t kYesterday = TestDevice::kToday - 1;
 constexpr double kQuiet = 0.05;
 
 // No report is built, and the day is one without legacy NAND info: what stands in the log is the
-// driver's alone.
+// driver's alone. In the device's zone it is still the day before.
 constexpr std::string_view kNoSubmission =
-    R"({"clock": "2024-03-05T09:15:02Z", "submission": {"enabled": false},
+    R"({"clock": "2024-03-05T09:15:02Z", "timeZone": "Pacific/Honolulu",
+        "submission": {"enabled": false},
         "system": {"buildVersion": "2B"},
         "kernel": {"variables": {"kern.bootsessionuuid": "1"}}})";
 
@@ -127,7 +126,7 @@ TEST_F(DailyDriverTest, OnlyTheFirstArgumentCounts) {
     expected.emplace_back("default: vesprun ended");
     EXPECT_THAT(device.log(), ElementsAreArray(expected));
     EXPECT_EQ(storedDay(device), PropertyValue(after));
-    EXPECT_THAT(device.list("run"), IsEmpty());
+    EXPECT_THAT(device.names("run"), IsEmpty());
   }
 }
 
@@ -193,7 +192,7 @@ TEST_F(DailyDriverTest, MessagesLeadToWhatTheirStateAllows) {
     EXPECT_THAT(device.lines("notifications.jsonl"), SizeIs(notified ? 1 : 0));
     const bool dayChecked = std::count(log.begin(), log.end(), kYesterdaysTasks) != 0;
     EXPECT_EQ(storedDay(device).has_value(), dayChecked);
-    EXPECT_THAT(device.list("run"), IsEmpty());
+    EXPECT_THAT(device.names("run"), IsEmpty());
   }
 }
 

@@ -13,8 +13,7 @@
 namespace vesprun {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::SizeIs;
+using ::testing::ElementsAre, ::testing::SizeIs;
 
 const std::string kMobile = "var/mobile/Library/Preferences/";
 const std::string kOwn = kMobile + "com.quill.aggregated.vesprun.ptree";
@@ -53,7 +52,6 @@ struct TaskingDevice : TestDevice {
     return readPtree(read(file), error).value_or(error);
   }
   void sync() {
-    platform();
     syncTaskingAndOSChange();
     endProcess();
   }
@@ -117,8 +115,8 @@ TEST(TaskingSync, RecordsThatNameNothingChangeNothing) {
   device.sync();
   EXPECT_THAT(device.log(), SizeIs(8));
   EXPECT_EQ(device.stored(kChanged[1]), json("{}"));
-  EXPECT_THAT(device.list("var"), ElementsAre("mobile"));
-  EXPECT_THAT(device.list(kMobile), ElementsAre("com.quill.aggregated.vesprun.ptree"));
+  EXPECT_THAT(device.names("var"), ElementsAre("mobile"));
+  EXPECT_THAT(device.names(kMobile), ElementsAre("com.quill.aggregated.vesprun.ptree"));
 }
 
 TEST(TaskingSync, OSChangesAndDisabledLogsAreToldWithoutATasking) {

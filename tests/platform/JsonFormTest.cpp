@@ -1,5 +1,6 @@
 #include "platform/host/JsonForm.h"
 
+#include <gmock/gmock.h>
 #include <cmath>
 #include <limits>
 #include <nlohmann/json.hpp>

@@ -1,7 +1,6 @@
 #include <sys/socket.h>
 
 #include <chrono>
-#include <cmath>
 #include <thread>
 
 #include "platform/host/HostPtreeSerialization.h"
@@ -237,21 +236,6 @@ TEST_F(MessageServiceTest, TakesOverFromAKilledProcessUnderAPathTooLongForASocke
   EXPECT_THAT(received, ElementsAre("a"));
   listener.reset();
   EXPECT_THAT(folder.names(deep + "/run"), IsEmpty());
-}
-
-TEST(PollMainLoop, DoesOnePieceOfWorkForEachSlice) {
-  PollMainLoop loop;
-  std::vector<int> done;
-  loop.queueWork([&] {
-    done.push_back(1);
-    loop.queueWork([&] { done.push_back(3); });
-  });
-  loop.queueWork([&] { done.push_back(2); });
-  for (const double seconds : {0.0, -1.0, std::nan(""), 0.0, -1.0, std::nan("")}) {
-    EXPECT_EQ(loop.runMainLoopSlice(seconds),
-              done.size() < 3 ? SliceResult::HandledEvent : SliceResult::TimedOut);
-  }
-  EXPECT_THAT(done, ElementsAre(1, 2, 3));
 }
 
 }  // namespace

@@ -7,8 +7,7 @@
 namespace vesprun {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
+using ::testing::ElementsAre, ::testing::IsEmpty;
 
 constexpr const char* kDomain = "com.quill.aggregated.vesprun";
 constexpr std::int32_t kYesterday = TestDevice::kToday - 1;
@@ -83,11 +82,11 @@ TEST_F(DailyLogTest, HoldsItsEntriesInOrder) {
 TEST_F(DailyLogTest, NamesAPreviousOSVersionOnceThereIsALog) {
   start("false");
   write();
-  EXPECT_THAT(device->list("outbox/logs"), IsEmpty());
+  EXPECT_THAT(device->names("outbox/logs"), IsEmpty());
   EXPECT_EQ(lastOSVersion(), std::nullopt);
   count();
   write(nullptr, std::numeric_limits<std::int32_t>::min());
-  EXPECT_THAT(device->list("outbox/logs"), IsEmpty());
+  EXPECT_THAT(device->names("outbox/logs"), IsEmpty());
   write();
   write();
   preferences->LGSPreferencesSetValue("LastOSVersion", "Vesper 1", kDomain);
@@ -96,7 +95,7 @@ TEST_F(DailyLogTest, NamesAPreviousOSVersionOnceThereIsALog) {
   const std::string third = "outbox/logs/0003-193-log-aggregated";
   EXPECT_EQ(device->read(first + ".header.json"), "{\"previous_os_version\":\"<unknown>\"}\n");
   EXPECT_EQ(device->read(third + ".header.json"), "{\"previous_os_version\":\"Vesper 1\"}\n");
-  EXPECT_EQ(device->list("outbox/logs").size(), 5U);
+  EXPECT_EQ(device->names("outbox/logs").size(), 5U);
   EXPECT_THAT(device->read("var/mobile/Library/Preferences/com.quill.aggregated.vesprun.ptree"),
               ::testing::HasSubstr("Vesper 2"));
 }

@@ -7,8 +7,7 @@
 namespace vesprun {
 namespace {
 
-using ::testing::ElementsAre;
-using ::testing::IsEmpty;
+using ::testing::ElementsAre, ::testing::IsEmpty;
 
 /// A started device that whitelists every scalar, unrounded, or none.
 class SourceDevice : public TestDevice {
@@ -16,7 +15,6 @@ class SourceDevice : public TestDevice {
   explicit SourceDevice(const std::string& entries, bool allKeys = true)
       : TestDevice(R"({"clock": "2024-03-05T09:15:02Z", )" + entries + "}") {
     writeWhitelistJson(allKeys ? R"({"G": {"ScalarKeyPrefixes": {"": {}}}})" : "{}");
-    platform();
   }
 };
 

@@ -30,7 +30,6 @@ struct ListedValues final : TBHistoryDistributionEnumerator {
 
 TEST(Distributions, AreSummarizedAndCounted) {
   TestDevice device;
-  device.platform();
   const auto intervals = [](PropertyArray array) { return PropertyDict{{"intervals", array}}; };
   const struct {
     std::vector<double> values;

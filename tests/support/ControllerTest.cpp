@@ -8,27 +8,28 @@
 
 namespace vesprun {
 
-ControllerTest::ControllerTest() {
-  forgetAPIErrorMessage();
-  forgetNandExporterHandles();
-}
+ControllerTest::ControllerTest() { endDevice(); }
 
-ControllerTest::~ControllerTest() {
-  if (_device) {
-    expectNothingHeld();
-  }
-}
+ControllerTest::~ControllerTest() { endDevice(); }
 
 HostPlatform& ControllerTest::start(const std::string& registry, const std::string& others,
                                     const std::string& clock) {
-  _device.reset();
+  endDevice();
   _device.emplace(R"({"clock": ")" + clock + R"(", "logLevel": "debug", "registry": [)" + registry +
                   ']' + others + '}');
   StatisticsBufferBuilder statistics;
   statistics.add(53, {17}).add(4, {1000}).add(11, {3});
-  const Bytes& bytes = statistics.bytes();
-  _device->write("statistics.bin", std::string(bytes.begin(), bytes.end()));
+  _device->write("statistics.bin", statistics.bytes());
   return _device->platform();
+}
+
+void ControllerTest::endDevice() {
+  if (_device) {
+    expectNothingHeld();
+    _device.reset();
+  }
+  forgetAPIErrorMessage();
+  forgetNandExporterHandles();
 }
 
 void ControllerTest::expectNothingHeld() {

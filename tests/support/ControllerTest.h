@@ -10,7 +10,8 @@
 
 namespace vesprun {
 
-/// A test of what talks to the storage controller. When it ends, every handle has been given back.
+/// A test of what talks to the storage controller. When a device ends, because the test does or
+/// starts another, every handle has been given back.
 class ControllerTest : public ::testing::Test {
  protected:
   ControllerTest();
@@ -18,7 +19,7 @@ class ControllerTest : public ::testing::Test {
 
   /// A device with this registry (the inside of the array) and these other entries (with a comma
   /// before each), whose clock stands at `clock`, on the odd day 19787 unless told otherwise. In it
-  /// "statistics.bin" is a small buffer that both statistics parsers take.
+  /// "statistics.bin" is a small buffer that both statistics parsers take. No error is recorded.
   HostPlatform& start(const std::string& registry, const std::string& others = "",
                       const std::string& clock = "2024-03-05T09:15:02Z");
 
@@ -32,6 +33,8 @@ class ControllerTest : public ::testing::Test {
   static std::string errorsOf(const std::function<void()>& action);
 
  private:
+  void endDevice();
+
   std::optional<TestDevice> _device;
 };
 
@@ -42,5 +45,11 @@ std::string controller(const std::string& className, const std::string& tunnel =
 
 /// The answer that "statistics.bin" is.
 inline const std::string kStatisticsAnswer = R"({"opcode": 13, "file": "statistics.bin"})";
+
+/// What is said when no controller can be matched, and recorded when one tells no size.
+inline const std::string kNoMatch =
+    "Failed to find matching service with DevRegServiceGetMatchingService, trying iterator...\n";
+inline const std::string kSizeFailed =
+    "executeTunnelCommand: DevRegConnectCallStructMethod failed while retrieving data size";
 
 }  // namespace vesprun

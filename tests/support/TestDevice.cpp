@@ -26,13 +26,12 @@ PropertyDict dictionaryOf(const Parse& parse, const std::string& text) {
 
 }  // namespace
 
-TestDevice::TestDevice(std::string_view description) { write("device.json", description); }
-
-TestDevice::~TestDevice() {
-  endProcess();
-  std::error_code ignored;
-  std::filesystem::permissions(path(), std::filesystem::perms::owner_all, ignored);
+TestDevice::TestDevice(std::string_view description) {
+  write("device.json", description);
+  platform();
 }
+
+TestDevice::~TestDevice() { endProcess(); }
 
 std::string TestDevice::read(std::string_view devicePath) const {
   std::string error;
@@ -41,11 +40,6 @@ std::string TestDevice::read(std::string_view devicePath) const {
 
 bool TestDevice::exists(std::string_view devicePath) const {
   return std::filesystem::exists(path(devicePath));
-}
-
-void TestDevice::writeWhitelist(std::string_view groups) const {
-  write("Library/Application Support/Tallybook/Whitelist_Stagebox.ptree",
-        "<ptree version=\"1.0\"><dict>" + std::string(groups) + "</dict></ptree>");
 }
 
 void TestDevice::writeWhitelistJson(std::string_view groups) const {
@@ -94,7 +88,7 @@ std::vector<std::string> TestDevice::log() const {
 
 std::vector<PropertyDict> TestDevice::documents() const {
   std::vector<PropertyDict> documents;
-  for (const std::string& name : list("outbox/logs")) {
+  for (const std::string& name : names("outbox/logs")) {
     if (name.ends_with(".ptree")) {
       documents.push_back(dictionaryOf(readPtree, read("outbox/logs/" + name)));
     }

@@ -1,5 +1,7 @@
 #pragma once
 
+#include <gmock/gmock.h>
+
 #include <memory>
 #include <string>
 #include <string_view>
@@ -11,8 +13,8 @@
 
 namespace vesprun {
 
-/// A real device directory in a temporary folder, and its platform, which is installed from the
-/// first `start` on. The folder goes with it.
+/// A real device directory in a temporary folder, and its platform, which is installed. The folder
+/// goes with it.
 class TestDevice : public TemporaryFolder {
  public:
   /// A device whose clock stands at 2024-03-05 09:15:02 UTC, day 19787, unless `description`, the
@@ -24,18 +26,18 @@ class TestDevice : public TemporaryFolder {
       R"({"clock": "2024-03-05T09:15:02Z", "timeZone": "UTC", "logLevel": "debug"})";
   static constexpr std::int32_t kToday = 19787;
 
+  using TemporaryFolder::write;
+  void write(std::string_view name, const Bytes& content) const {
+    write(name, std::string(content.begin(), content.end()));
+  }
   /// The content of a file; empty when there is none.
   std::string read(std::string_view devicePath) const;
   bool exists(std::string_view devicePath) const;
-  /// The names in a folder, in order.
-  std::vector<std::string> list(std::string_view devicePath) const { return names(devicePath); }
 
-  /// Writes the whitelist; `groups` is the inside of its root dictionary.
-  void writeWhitelist(std::string_view groups) const;
   /// Writes the whitelist given as a JSON object of groups.
   void writeWhitelistJson(std::string_view groups) const;
 
-  /// The platform; made and installed when it is first asked for. Fails the test when it cannot be.
+  /// The platform; after `endProcess` a new one. Fails the test when there can be none.
   HostPlatform& platform();
   /// Ends the process: what services hold back is written, what the process remembers is forgotten.
   /// The next `platform()` is a new one.

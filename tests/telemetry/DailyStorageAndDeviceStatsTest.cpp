@@ -31,13 +31,13 @@ TEST_F(DailyStorageAndDeviceStatsTest, RecordsEverythingOfTheDay) {
                                     "wifiInBytes": 2048}]},
              "channels": [{"name": "c", "value": 3}])");
   device().write("kernel/ecc/1.bin", std::string(72, '\0'));
-  const Bytes snapshot = SnapshotBuilder().thread(1, "VM_swapout", 7).bytes;
-  device().write("snapshot.bin", std::string(snapshot.begin(), snapshot.end()));
+  device().write("snapshot.bin", SnapshotBuilder().thread(1, "VM_swapout", 7).bytes);
   errorsOf(LogDailyStorageAndDeviceStats);
   const Scalars scalars = todaysScalars(device());
   for (const auto& [key, value] : Scalars{{kTotal, 61035},
                                           {kFree, -1},
                                           {kExportVersion, 17},
+                                          {"com.quill.NANDInfo.DemoMode", 0},
                                           {"com.quill.NANDInfo.Reclaimer.TotalPurgeableBytes", 5},
                                           {"HLT_VMFreezer_bytesWritten", 7},
                                           {kFreezerWrites, 7},

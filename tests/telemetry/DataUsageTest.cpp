@@ -126,7 +126,6 @@ TEST(DataUsage, ALateReplyIsHandledWhileTheStepGoesOn) {
       "usage": {"records": [)" +
                                record(kApp, kToday, counters(2048, 0, 0, 0)) +
                                R"(], "delaySeconds": 0.05})"));
-  device.platform();
   CollectDataUsage(1ms);
   EXPECT_THAT(device.log(), ElementsAre("default: Murmur timed out, no datausage available"));
   for (int i = 0; i < 2000 && !baseline(device); ++i) {
@@ -158,7 +157,6 @@ TEST(DataUsage, AReplyAtTheEndIsHandledWholeOrNotAtAll) {
   for (int i = 0; i < 20; ++i) {
     TestDevice device(
         usage(record(kApp, kToday, counters(2048, 0, 0, 0)), i % 2 == 0 ? "0" : "1e-4"));
-    device.platform();
     CollectDataUsage(0ns);
     device.endProcess();
     const bool handled = baseline(device).has_value();

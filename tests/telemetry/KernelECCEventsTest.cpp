@@ -22,7 +22,6 @@ std::string event(char id, unsigned char count) {
 }
 
 std::vector<PropertyDict> run(TestDevice& device) {
-  device.platform();
   LogKernelECCEvents();
   return device.lines("records.jsonl");
 }
@@ -40,7 +39,7 @@ TEST(KernelECCEvents, RecordHoldsTheCountedRegisters) {
             start + "1,\"count\":0}}\n" + start + "2,\"count\":3," + three + "}}\n" + start +
                 "255,\"count\":9," + three + R"(,"reg3":259,"reg4":260,"reg5":261,"reg6":262,)" +
                 "\"reg7\":-9223372036854775545}}\n");
-  EXPECT_THAT(device.list("kernel/ecc"), ElementsAre("0000.tmp"));
+  EXPECT_THAT(device.names("kernel/ecc"), ElementsAre("0000.tmp"));
   EXPECT_THAT(device.log(), ElementsAre());
 }
 
@@ -50,7 +49,7 @@ TEST(KernelECCEvents, ARunLogsTenAndTakesOneMore) {
     device.write("kernel/ecc/" + std::to_string(100 + id) + ".bin", event(id, 0));
   }
   EXPECT_THAT(run(device), testing::SizeIs(10));
-  EXPECT_THAT(device.list("kernel/ecc"), ElementsAre("112.bin"));
+  EXPECT_THAT(device.names("kernel/ecc"), ElementsAre("112.bin"));
   EXPECT_THAT(device.log(),
               ElementsAre("default: Unexpected errno (0) reading ECC events from kernel"));
   const std::vector<PropertyDict> records = run(device);
@@ -66,7 +65,7 @@ TEST(KernelECCEvents, OnlyUnexpectedErrorsAreTold) {
     device.write("kernel/ecc/1.bin", event(1, 0));
     EXPECT_THAT(run(device), ElementsAre());
     EXPECT_EQ(device.log(), messages);
-    EXPECT_THAT(device.list("kernel/ecc"), ElementsAre("1.bin"));
+    EXPECT_THAT(device.names("kernel/ecc"), ElementsAre("1.bin"));
   }
 }
 
@@ -76,7 +75,7 @@ TEST(ECCEventQueue, SetsAsideWhatIsNoEvent) {
   device.write("kernel/ecc/2.bin/file", "");
   device.write("kernel/ecc/3.bin", event(3, 0));
   EXPECT_THAT(run(device), testing::SizeIs(1));
-  EXPECT_THAT(device.list("kernel/ecc"), ElementsAre("1.bin.unusable", "2.bin.unusable"));
+  EXPECT_THAT(device.names("kernel/ecc"), ElementsAre("1.bin.unusable", "2.bin.unusable"));
   EXPECT_THAT(device.log(), ElementsAre(EndsWith("1.bin: 71 bytes are not an ECC event of 72"),
                                         EndsWith("2.bin: Is a directory")));
 }

@@ -7,7 +7,6 @@ namespace {
 
 TEST(NANDInfoScalars, WritesNumbersAndBooleansUnlessThereIsAnError) {
   TestDevice device;
-  device.platform();
   PropertyDict info{{"number", 7U},
                     {"wide", ~std::uint64_t{0}},
                     {"fraction", -2.9},

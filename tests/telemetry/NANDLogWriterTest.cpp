@@ -15,7 +15,6 @@ constexpr const char* kDateKey = "SSLastLoggedAt";
 
 class NANDLogWriter : public testing::Test {
  protected:
-  NANDLogWriter() { device.platform(); }
   ~NANDLogWriter() override { forgetStructuredLogState(); }
 
   std::string log() const { return device.read("outbox/logs/0001-165-StorageStatus.log"); }
@@ -26,7 +25,7 @@ class NANDLogWriter : public testing::Test {
     return start == std::string::npos ? "no log" : text.substr(start + 3);
   }
 
-  TestDevice device{R"({"clock": "2024-03-05T09:15:02Z", "timeZone": "Europe/Berlin",
+  TestDevice device{R"({"clock": "2024-03-05T09:15:02Z", "timeZone": "Asia/Kolkata",
     "system": {"systemID": "S1", "hardwareModel": "M2", "systemVersion": "V3", "incidentID": "I4"},
     "properties": {"InverseDeviceID": "F5"}})"};
 };
@@ -39,8 +38,8 @@ TEST_F(NANDLogWriter, WritesTheHeaderAndOneLine) {
                             {"ValidityList[0]", PropertyArray{12, 7, 3}}};
   NLW_WriteLog("165", &fields);
   EXPECT_EQ(log(),
-            "System ID: S1\nHardware Model: M2\nOS Version: V3\nDate: 2024-03-05 10:15:02 +0100\n"
-            "Incident ID: I4\nFaultline Key: F5\n\n2024-03-05 10:15:02 +0100 " +
+            "System ID: S1\nHardware Model: M2\nOS Version: V3\nDate: 2024-03-05 14:45:02 +0530\n"
+            "Incident ID: I4\nFaultline Key: F5\n\n2024-03-05 14:45:02 +0530 " +
                 std::string("vesprun[") + std::to_string(getpid()) +
                 "]: IntermediateWamp:1.07;UserWamp:2.35;ValidityList[0]:12,7,3\n");
   device.endProcess();
@@ -83,7 +82,7 @@ TEST_F(NANDLogWriter, WritesOnceInSevenDays) {
     platform().userDefaults().setValueForKey(last, kDateKey);
     NLW_WriteLog("165", &fields);
     logs += writes ? 1U : 0U;
-    EXPECT_EQ(device.list("outbox/logs").size(), logs);
+    EXPECT_EQ(device.names("outbox/logs").size(), logs);
     EXPECT_EQ(platform().userDefaults().valueForKey(kDateKey), writes ? now : last);
   }
   EXPECT_EQ(items(), "\n");
@@ -94,7 +93,6 @@ TEST_F(NANDLogWriter, WritesOnceInSevenDays) {
 
 TEST(NANDLogSubmission, KeepsTheDateWhenItFails) {
   TestDevice device(R"({"clock": "2024-03-05T09:15:02Z", "submission": {"fails": true}})");
-  device.platform();
   const PropertyDict fields{{"n", 1}};
   NLW_WriteLog("165", &fields);
   EXPECT_FALSE(device.exists("outbox/logs"));

@@ -28,7 +28,6 @@ TEST(NVRAMStatistics, AreWhatTheRegistryHoldsWhateverTheEventServiceDoes) {
        false}};
   for (const auto& c : cases) {
     TestDevice device(deviceWith(c.entries));
-    device.platform();
     EXPECT_EQ(gatherNVRAMStats(), c.statistics) << c.entries;
     const std::vector<PropertyDict> events = device.lines("events.jsonl");
     ASSERT_EQ(events.size(), c.sendsEvent ? 1U : 0U) << c.entries;

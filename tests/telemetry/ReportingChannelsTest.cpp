@@ -12,7 +12,6 @@ TEST(ReportingChannels, OnlySimpleChannelsOfTheCategoryAreWritten) {
         {"name": "Histogram", "value": 9, "format": 3},
         {"name": "OfAnotherCategory", "value": 9, "categories": 255})") +
                                  others + "]"));
-    device.platform();
     LogTaplineChannelScalars();
     const Scalars written{{"com.quill.tapline.Low", -7}, {"com.quill.tapline.TempMax", 41}};
     EXPECT_EQ(todaysScalars(device), *others == '\0' ? Scalars{} : written);

@@ -182,10 +182,10 @@ Bytes sampleValidity() {
 }
 
 Bytes sampleDefects() {
-  constexpr std::uint32_t kDefects = 12;
+  constexpr std::uint32_t kDefectCount = 12;
   Words list;
-  list.add(1).add(kDefects).add(kDefects);
-  for (std::uint32_t defect = 0; defect < kDefects; ++defect) {
+  list.add(1).add(kDefectCount).add(kDefectCount);
+  for (std::uint32_t defect = 0; defect < kDefectCount; ++defect) {
     const std::uint32_t bus = defect % kSampleBuses;
     const std::uint32_t chipEnable = defect % 2;
     const std::uint32_t mode = defect % 3;

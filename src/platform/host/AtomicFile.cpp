@@ -10,6 +10,8 @@
 #include <cstring>
 #include <utility>
 
+#include "platform/host/SystemError.h"
+
 namespace vesprun {
 namespace {
 
@@ -18,8 +20,6 @@ constexpr std::size_t kPieceSize = 64 * 1024;
 // A document that replaces another stands here, complete, for the moment between its two steps.
 constexpr const char* kReplacementName = ".replacement";
 constexpr int kMostUnfinished = 100;
-
-std::string reason(const std::string& path) { return path + ": " + std::strerror(errno); }
 
 FileDescriptor openFolder(const std::string& folder) {
   return FileDescriptor(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
@@ -41,7 +41,7 @@ std::string procPath(int descriptor) { return "/proc/self/fd/" + std::to_string(
 std::optional<FolderLock> FolderLock::take(const std::string& folder, std::string& error) {
   FileDescriptor descriptor = openFolder(folder);
   if (!descriptor.isOpen() || !lock(descriptor.get(), LOCK_EX)) {
-    error = reason(folder);
+    error = systemError(folder);
     return std::nullopt;
   }
   return FolderLock(std::move(descriptor));
@@ -67,14 +67,14 @@ AtomicFile::~AtomicFile() {
 std::optional<AtomicFile> AtomicFile::create(const std::string& folder, std::string& error) {
   AtomicFile file(folder, openFolder(folder));
   if (!file._folderDescriptor.isOpen()) {
-    error = reason(folder);
+    error = systemError(folder);
     return std::nullopt;
   }
   if (!file.openUnnamed() && !file.openUnfinished(error)) {
     return std::nullopt;
   }
   if (fchmod(file._file.get(), kOwnerOnly) != 0) {  // whatever the process's file mode mask says
-    error = reason(folder);
+    error = systemError(folder);
     return std::nullopt;
   }
   return file;
@@ -97,7 +97,7 @@ bool AtomicFile::openUnfinished(std::string& error) {
     FileDescriptor file(openat(_folderDescriptor.get(), name.c_str(),
                                O_CREAT | O_WRONLY | O_CLOEXEC | O_NOFOLLOW, kOwnerOnly));
     if (!file.isOpen()) {
-      error = reason(pathOf(name));
+      error = systemError(pathOf(name));
       return false;
     }
     // Its writer holds the lock while it lives; what a killed one left is written over. The name
@@ -114,7 +114,7 @@ bool AtomicFile::openUnfinished(std::string& error) {
       continue;
     }
     if (ftruncate(file.get(), 0) != 0) {
-      error = reason(pathOf(name));
+      error = systemError(pathOf(name));
       return false;
     }
     _file = std::move(file);
@@ -171,7 +171,7 @@ bool AtomicFile::link(const std::string& name) const {
 
 bool AtomicFile::syncFolder(std::string& error) const {
   if (fsync(_folderDescriptor.get()) != 0) {
-    error = reason(_folder);
+    error = systemError(_folder);
     return false;
   }
   return true;
@@ -184,14 +184,14 @@ bool AtomicFile::replace(const std::string& name, std::string& error, const Fold
   const int folder = _folderDescriptor.get();
   if (!_unfinishedName.empty()) {
     if (renameat(folder, _unfinishedName.c_str(), folder, name.c_str()) != 0) {
-      error = reason(pathOf(name));
+      error = systemError(pathOf(name));
       return false;
     }
     _unfinishedName.clear();
     return syncFolder(error);
   }
   if (held == nullptr && !lock(folder, LOCK_EX)) {
-    error = reason(_folder);
+    error = systemError(_folder);
     return false;
   }
   const bool replaced = replaceThroughHiddenName(name, error);
@@ -207,16 +207,16 @@ bool AtomicFile::replaceThroughHiddenName(const std::string& name, std::string& 
     return true;
   }
   if (errno != EEXIST) {
-    error = reason(pathOf(name));
+    error = systemError(pathOf(name));
     return false;
   }
   // Under the folder's lock such a name can only be what a killed process left.
   if ((unlinkat(folder, kReplacementName, 0) != 0 && errno != ENOENT) || !link(kReplacementName)) {
-    error = reason(pathOf(kReplacementName));
+    error = systemError(pathOf(kReplacementName));
     return false;
   }
   if (renameat(folder, kReplacementName, folder, name.c_str()) != 0) {
-    error = reason(pathOf(name));
+    error = systemError(pathOf(name));
     unlinkat(folder, kReplacementName, 0);
     return false;
   }
@@ -231,7 +231,7 @@ AtomicFile::Added AtomicFile::addNew(const std::string& name, std::string& error
     if (errno == EEXIST) {
       return Added::NameTaken;
     }
-    error = reason(pathOf(name));
+    error = systemError(pathOf(name));
     return Added::Failed;
   }
   if (!syncFolder(error)) {

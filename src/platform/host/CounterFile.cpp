@@ -8,13 +8,13 @@
 #include <array>
 #include <cerrno>
 #include <cstdio>
-#include <cstring>
 #include <string_view>
 #include <thread>
 
 #include "common/Date.h"
 #include "platform/host/AtomicFile.h"
 #include "platform/host/FileDescriptor.h"
+#include "platform/host/SystemError.h"
 
 namespace vesprun {
 namespace {
@@ -26,8 +26,6 @@ constexpr const char* kName = "TBDataStore.sqlitedb";
 constexpr std::array kCompanions{"-journal", "-wal", "-shm"};
 
 constexpr int kMostAttempts = 3;
-
-std::string reason(const std::string& path) { return path + ": " + std::strerror(errno); }
 
 bool exists(const std::string& path) {
   struct stat status {};
@@ -43,13 +41,13 @@ class FolderUse {
     constexpr std::chrono::milliseconds kPause(5);
     FileDescriptor descriptor(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     if (!descriptor.isOpen()) {
-      error = reason(folder);
+      error = systemError(folder);
       return std::nullopt;
     }
     const auto end = std::chrono::steady_clock::now() + longestWait;
     while (flock(descriptor.get(), operation | LOCK_NB) != 0) {
       if (errno != EWOULDBLOCK && errno != EINTR) {
-        error = reason(folder);
+        error = systemError(folder);
         return std::nullopt;
       }
       if (std::chrono::steady_clock::now() >= end) {
@@ -106,7 +104,7 @@ bool CounterFile::use(SqliteTransaction::Kind kind, const std::function<bool(Cou
     }
     if (stat(path.c_str(), &status) != 0) {
       if (errno != ENOENT || attempt == kMostAttempts) {
-        error = reason(path);
+        error = systemError(path);
         return false;
       }
       shared.reset();
@@ -156,7 +154,7 @@ bool CounterFile::makeLocked(std::string& error) {
   for (const char* companion : kCompanions) {
     if (std::rename((path + companion).c_str(), (aside + companion).c_str()) != 0 &&
         errno != ENOENT) {
-      error = reason(path + companion);
+      error = systemError(path + companion);
       return false;
     }
   }
@@ -189,7 +187,7 @@ std::optional<std::string> CounterFile::replace(const Damage& damage, std::strin
     aside = unusedNameAside();
     // The file first: without it, a journal left by a kill at this point is moved later, too.
     if (std::rename(path.c_str(), aside.c_str()) != 0) {
-      error = reason(path);
+      error = systemError(path);
       return std::nullopt;
     }
     for (const char* companion : kCompanions) {

@@ -13,7 +13,7 @@
 namespace vesprun {
 namespace {
 
-constexpr std::size_t kPieceSize = 256 * 1024;
+constexpr std::size_t kReadSize = 256 * 1024;
 constexpr std::size_t kLongestLine = 2 * 1024 * 1024;  // the longest key fits
 constexpr std::size_t kMostBufferedBytes = 32 * 1024 * 1024;
 
@@ -52,8 +52,8 @@ class LineReader {
   bool readMore(std::string& error) {
     std::memmove(_buffer.data(), _buffer.data() + _begin, _end - _begin);
     _end -= std::exchange(_begin, 0);
-    if (_buffer.size() < _end + kPieceSize) {
-      _buffer.resize(_end + kPieceSize);
+    if (_buffer.size() < _end + kReadSize) {
+      _buffer.resize(_end + kReadSize);
     }
     errno = 0;
     _stream.read(_buffer.data() + _end, static_cast<std::streamsize>(_buffer.size() - _end));
@@ -227,7 +227,7 @@ class LineWriter {
 
   void end() {
     _text += '\n';
-    if (_text.size() >= kPieceSize) {
+    if (_text.size() >= kReadSize) {
       flush();
     }
   }

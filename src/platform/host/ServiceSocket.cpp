@@ -12,14 +12,14 @@
 #include <cstring>
 #include <utility>
 
+#include "platform/host/SystemError.h"
+
 namespace vesprun {
 namespace {
 
 constexpr const char* kFolder = "run";
 constexpr int kWaitingPeers = 16;
 constexpr mode_t kOwnerOnly = 0600;
-
-std::string reason(const std::string& path) { return path + ": " + std::strerror(errno); }
 
 FileDescriptor openFolder(const std::string& path) {
   return FileDescriptor(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
@@ -73,11 +73,12 @@ std::optional<ServiceSocket> ServiceSocket::listen(const DeviceDirectory& direct
   const int folder = service._folder.get();
   const int socket = service._socket.get();
   if (folder < 0 || socket < 0) {
-    error = reason(folder < 0 ? *folderPath : path);
+    error = systemError(folder < 0 ? *folderPath : path);
     return std::nullopt;
   }
   if (flock(folder, LOCK_EX | LOCK_NB) != 0) {
-    error = errno == EWOULDBLOCK ? path + ": another process offers the service" : reason(path);
+    error =
+        errno == EWOULDBLOCK ? path + ": another process offers the service" : systemError(path);
     return std::nullopt;
   }
   const std::optional<sockaddr_un> address = addressOf(path, folder, service._name);
@@ -86,14 +87,14 @@ std::optional<ServiceSocket> ServiceSocket::listen(const DeviceDirectory& direct
   if (!address || !removeDeadSocket(folder, service._name) ||
       bind(socket, generic(*address), sizeof *address) != 0 ||
       fstatat(folder, service._name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) {
-    error = reason(path);
+    error = systemError(path);
     return std::nullopt;
   }
   service._device = status.st_dev;
   service._file = status.st_ino;
   if (fchmodat(folder, service._name.c_str(), kOwnerOnly, 0) != 0 ||
       ::listen(socket, kWaitingPeers) != 0) {
-    error = reason(path);
+    error = systemError(path);
     return std::nullopt;
   }
   return service;
@@ -134,7 +135,7 @@ FileDescriptor connectToService(const DeviceDirectory& directory, std::string_vi
   }
   error = errno == ENOENT || errno == ECONNREFUSED ? path + ": nobody offers the service"
           : errno == EAGAIN                        ? path + ": the service is too busy"
-                                                   : reason(path);
+                                                   : systemError(path);
   return {};
 }
 

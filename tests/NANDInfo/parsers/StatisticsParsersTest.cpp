@@ -1,5 +1,6 @@
-#include <memory>
 #include <numeric>
+
+#include <gmock/gmock.h>
 
 #include "FieldsOf.h"
 #include "NANDInfo/APIErrorMessage.h"
@@ -29,21 +30,6 @@ std::string numbered(const std::string& name, std::size_t count, std::uint64_t f
   }
   return text;
 }
-
-/// The first `size` bytes of a buffer at an odd address and with nothing behind them, so that a
-/// read outside is seen.
-class ExactCopy {
- public:
-  ExactCopy(const Bytes& bytes, std::size_t size)
-      : _bytes(new std::uint8_t[size + 1]), _size(size) {
-    std::copy_n(bytes.begin(), size, _bytes.get() + 1);
-  }
-  std::span<const std::uint8_t> span() const { return {_bytes.get() + 1, _size}; }
-
- private:
-  std::unique_ptr<std::uint8_t[]> _bytes;
-  std::size_t _size;
-};
 
 struct Outcome {
   std::uint32_t result = 0;
@@ -75,8 +61,8 @@ using MSP = MSPBufferBuilder;
 /// The result, " name=value" of each field, and the error if there is one.
 template <typename Builder>
 std::string textOf(Outcome (*parse)(std::span<const std::uint8_t>), const Builder& builder) {
-  const Bytes& bytes = builder.bytes();
-  const Outcome outcome = parse(ExactCopy(bytes, bytes.size()).span());
+  const Bytes exact = builder.bytes();  // a copy with nothing behind it: a read outside is seen
+  const Outcome outcome = parse(exact);
   std::string text = std::to_string(outcome.result);
   for (const auto& [name, value] : outcome.fields) {
     text += ' ' + name + '=' + std::to_string(value);
@@ -139,10 +125,6 @@ TEST(BaseParser, fillsTheSummary) {
   EXPECT_EQ(ctx.hostWrites, 8U);
   EXPECT_EQ(ctx.hostReads, 0x500000007U);
   EXPECT_EQ(ctx.fields.size(), std::size(ids) + 6);
-  ORUReleaseContext(ctx);
-  EXPECT_TRUE(ctx.fields.empty());
-  EXPECT_EQ(ctx.driverVersion, 0);
-  EXPECT_EQ(ctx.readCountHisto[4], 0U);
 }
 
 TEST(FTLParser, walksRecords) {
@@ -239,26 +221,6 @@ TEST(StatisticsParsers, decodeEveryKnownStatistic) {
   EXPECT_EQ(ftlStatKey(allStatistics()).result, 540U + 1956U);
   EXPECT_EQ(msp(allMSPStatistics()).result, 857U);
   EXPECT_EQ(msp(allMSPStatistics()).error, "NA");
-}
-
-/// What is decoded of a buffer's beginning is the beginning of what is decoded of the buffer; the
-/// base parser may leave out the elements that the cut takes from an array.
-TEST(StatisticsParsers, readNothingBehindACut) {
-  const Bytes records = Statistics().add(4, {1}).add(14, countingUp(10)).add(900, {1, 2}).bytes();
-  const Bytes elements = MSP().add(4096, {1}).add(4121, {1, 2, 3, 4}).bytes();
-  for (const auto& [parse, buffer] : {std::pair(&base, records), std::pair(ftl, records),
-                                      std::pair(ftlStatKey, records), std::pair(msp, elements)}) {
-    const Fields all = parse(buffer).fields;
-    std::size_t before = 0;
-    for (std::size_t size = 1; size <= buffer.size(); ++size) {
-      const Fields some = parse(ExactCopy(buffer, size).span()).fields;
-      ASSERT_LE(some.size(), all.size()) << size;
-      EXPECT_TRUE(std::equal(some.begin(), some.end(), all.begin())) << size;
-      EXPECT_GE(some.size(), before) << size;
-      before = some.size();
-    }
-    EXPECT_EQ(before, all.size());
-  }
 }
 
 }  // namespace

@@ -3,24 +3,10 @@
 #include <map>
 #include <numeric>
 
-#include "common/LittleEndian.h"
+#include "support/ListBuffers.h"
 
 namespace vesprun {
 namespace {
-
-/// A region, at an odd address, whose word i holds i.
-class CountingRegion {
- public:
-  CountingRegion() : _bytes(1) {
-    for (std::uint32_t word = 0; word < kCounterRegionWords; ++word) {
-      appendLittleEndian(_bytes, word, sizeof word);
-    }
-  }
-  CounterRegion region() const { return CounterRegion(_bytes.data() + 1, kCounterRegionSize); }
-
- private:
-  std::vector<std::uint8_t> _bytes;
-};
 
 TEST(VendorCounterParsers, copyWhatTheirLayoutsSay) {
   struct Case {
@@ -51,18 +37,19 @@ TEST(VendorCounterParsers, copyWhatTheirLayoutsSay) {
        121,
        {{3, 259}, {4, 0}, {8, 263}, {18, 274}, {42, 284}, {63, 293}, {72, 311}, {74, 10}, {77, 0}}},
   };
-  const CountingRegion counting;
+  const Bytes list = telemetryList(1);  // word i of its region holds i
+  const CounterRegion region = std::span(list).first<kCounterRegionSize>();
   for (const Case& each : cases) {
     const std::size_t number = static_cast<std::size_t>(&each - cases);
     NandChannelCounters counters{};
-    each.parse(counting.region(), counters);
+    each.parse(region, counters);
     for (const auto& [word, value] : each.words) {
       EXPECT_EQ(counters[word], value) << "layout " << number << ", word " << word;
     }
     EXPECT_EQ(std::accumulate(counters.begin(), counters.end(), std::uint64_t{0}), each.sum)
         << "layout " << number;
     counters.fill(0xFFFF);
-    each.parse(counting.region(), counters);
+    each.parse(region, counters);
     EXPECT_EQ(static_cast<std::size_t>(std::count(counters.begin(), counters.end(), 0xFFFFU)),
               each.untouched)
         << "layout " << number;
