@@ -17,7 +17,8 @@ namespace vesprun {
 /// Names may repeat; nothing is looked up while fields are appended.
 ///
 /// All names lie one behind the other in one text, so that a field costs no allocation of its own.
-/// Running out of memory is the one failure that is not reported: std::bad_alloc ends the process.
+/// Running out of memory is the one failure that no result tells of: std::bad_alloc goes on to the
+/// caller.
 class GenericParserCxt {
  public:
   static constexpr std::size_t kMaxNameLength = 98;  ///< longer names are cut

@@ -10,6 +10,10 @@ namespace {
 
 constexpr std::uint32_t kReadCountHisto = 265;
 
+// Headers of arrays that overlap make far more fields than a buffer has words. All keys there are
+// make some 2,500.
+constexpr std::size_t kMostFields = 1'000'000;
+
 void keepInSummary(ORUStatsContext& ctx, std::uint32_t id, std::uint64_t value) {
   const auto lowBits = static_cast<std::uint32_t>(value);
   switch (id) {
@@ -98,7 +102,7 @@ bool ORUParseBufferToCxt(ORUStatsContext& ctx, std::span<const std::uint8_t> buf
   }
   do {
     const StatisticsRecordHeader header = reader.readHeader();
-    if (!reader.holds(header)) {
+    if (!reader.holds(header) || ctx.fields.size() > kMostFields) {
       ctx.exportVersion = 0;
       return false;
     }

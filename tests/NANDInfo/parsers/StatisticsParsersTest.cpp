@@ -94,6 +94,17 @@ TEST(BaseParser, walksRecords) {
   EXPECT_EQ(base(trailing).result, 1U);
 }
 
+TEST(BaseParser, givesUpWhenFieldsMultiply) {
+  constexpr std::uint32_t kCacheDepthVsThroughput = 460;
+  Statistics buffer;
+  for (int record = 0; record < 100'000; ++record) {
+    buffer.addHeader(kCacheDepthVsThroughput, 0);
+  }
+  ORUStatsContext ctx;
+  EXPECT_FALSE(ORUParseBufferToCxt(ctx, buffer.bytes()));
+  EXPECT_LT(ctx.fields.size(), 1'001'000U);
+}
+
 TEST(BaseParser, fillsTheSummary) {
   Statistics buffer;
   const std::uint32_t ids[] = {52, 53, 49, 7, 51, 4, 17, 18, 50, 19, 20, 12, 48, 13, 56, 28, 45};
