@@ -92,7 +92,7 @@ class UsageReply {
       : _tallybook(tallybook), _preferences(preferences) {}
 
   void handle(const PropertyArray* records) {
-    _yesterday = _tallybook.TBDaysSince1970() - 1;
+    _yesterday = std::int64_t{_tallybook.TBDaysSince1970()} - 1;
     const auto stored = _preferences.LGSPreferencesGetValue(kBaselineKey, kBaselineDomain);
     if (stored && stored->dict() != nullptr) {
       _baseline = *stored->dict();
@@ -166,7 +166,7 @@ class UsageReply {
 
   Tallybook& _tallybook;
   Preferences& _preferences;
-  std::int32_t _yesterday = 0;
+  std::int64_t _yesterday = 0;
   PropertyDict _baseline;
   PropertyDict _newBaseline;
 };

@@ -2,12 +2,11 @@
 
 #include <algorithm>
 #include <array>
-#include <bit>
 #include <cstdint>
-#include <cstring>
 #include <span>
 #include <string>
 
+#include "common/LittleEndian.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
@@ -24,15 +23,14 @@ constexpr std::size_t kMostRegisters = 8;
 constexpr std::size_t kFirstRegister = 8;  ///< offset in the record
 using ECCEventRecord = std::array<std::uint8_t, kFirstRegister + kMostRegisters * 8>;
 static_assert(sizeof(ECCEventRecord) == 72);
-static_assert(std::endian::native == std::endian::little, "the record is little-endian");
 
 PropertyDict describe(const ECCEventRecord& event) {
   const std::uint8_t count = event[1];
   PropertyDict record{{"id", event[0]}, {"count", count}};
   for (std::size_t i = 0; i < std::min<std::size_t>(count, kMostRegisters); ++i) {
-    std::int64_t content = 0;
-    std::memcpy(&content, event.data() + kFirstRegister + i * sizeof content, sizeof content);
-    record.set("reg" + std::to_string(i), content);
+    const std::uint8_t* content = event.data() + kFirstRegister + i * sizeof(std::uint64_t);
+    record.set("reg" + std::to_string(i),
+               static_cast<std::int64_t>(loadLittleEndian<std::uint64_t>(content)));
   }
   return record;
 }

@@ -3,6 +3,7 @@
 #include <string>
 #include <string_view>
 
+#include "NANDInfo/APIErrorMessage.h"
 #include "common/TextForm.h"
 #include "platform/Platform.h"
 
@@ -10,7 +11,6 @@ namespace vesprun {
 namespace {
 
 constexpr std::string_view kNANDInfoErrorKey = "com.quill.NANDInfo.Error";
-constexpr std::string_view kNANDInfoErrorMessageKey = "com.quill.NANDInfo.ErrorMessage";
 
 }  // namespace
 

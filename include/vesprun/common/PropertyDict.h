@@ -103,7 +103,7 @@ inline PropertyValue::Value PropertyValue::copyOf(const Value& value) {
   return std::visit(
       [](const auto& held) -> Value {
         if constexpr (std::same_as<std::decay_t<decltype(held)>, DictBox>) {
-          return std::make_unique<PropertyDict>(*held);
+          return held ? std::make_unique<PropertyDict>(*held) : nullptr;
         } else {
           return held;
         }
@@ -115,8 +115,10 @@ inline bool operator==(const PropertyValue& left, const PropertyValue& right) {
   if (left._value.index() != right._value.index()) {
     return false;
   }
-  if (const PropertyDict* dict = left.dict()) {
-    return *dict == *right.dict();
+  const PropertyDict* leftDict = left.dict();
+  const PropertyDict* rightDict = right.dict();
+  if (leftDict != nullptr && rightDict != nullptr) {
+    return *leftDict == *rightDict;
   }
   return left._value == right._value;
 }
