@@ -1,8 +1,15 @@
 #pragma once
 
+#include <string_view>
+
 #include "vesprun.h"
 
 namespace vesprun {
+
+/// Sets of fields carry the first error text of the process under this key.
+inline constexpr std::string_view kAPIErrorMessageKey = "HLT_APIErrorMessage";
+/// What cannot be had at all is a dictionary with the reason under this key.
+inline constexpr std::string_view kNANDInfoErrorMessageKey = "com.quill.NANDInfo.ErrorMessage";
 
 /// Records the first error text of the process, formatted in the manner of printf and cut to 1023
 /// bytes. By convention it begins with the name of the operation that failed. Once a text has been

@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <cstdio>
 
+#include "NANDInfo/ControllerConnection.h"
 #include "NANDInfo/NandExporter.h"
 #include "common/LittleEndian.h"
 #include "platform/RegistryObject.h"
@@ -11,7 +12,6 @@
 namespace vesprun {
 
 bool NandRecommendsContentDeletion() {
-  DeviceRegistry& registry = platform().deviceRegistry();
   nand_exporter_t* exporter = nullptr;
   const RegistryObject service(findNandExporter(exporter));
   if (exporter->contentDeletionMethod == kMethodNotOffered) {
@@ -22,21 +22,17 @@ bool NandRecommendsContentDeletion() {
                stderr);
     return false;
   }
-  RegistryHandle connection = 0;
-  if (registry.DevRegServiceOpen(service.get(), connection) != kRegistrySuccess) {
+  const ControllerConnection connection(service.get());
+  if (!connection) {
     std::fputs("Could not get connection to service\n", stderr);
     return false;
   }
   std::array<std::uint8_t, 4> answer{};
   std::uint64_t length = 0;
-  const bool recommends =
-      registry.DevRegConnectCallStructMethod(connection, exporter->contentDeletionMethod, {},
-                                             answer, length) == kRegistrySuccess &&
-      length >= answer.size() && loadLittleEndian<std::uint32_t>(answer.data()) != 0;
-  if (registry.DevRegServiceClose(connection) != kRegistrySuccess) {
-    std::fputs("Could not close connection to service\n", stderr);
-  }
-  return recommends;
+  return platform().deviceRegistry().DevRegConnectCallStructMethod(
+             connection.get(), exporter->contentDeletionMethod, {}, answer, length) ==
+             kRegistrySuccess &&
+         length >= answer.size() && loadLittleEndian<std::uint32_t>(answer.data()) != 0;
 }
 
 }  // namespace vesprun

@@ -66,7 +66,7 @@ PropertyDict CopyNANDInfo() {
   ORUStatsContext context;
   if (!GatherNANDStats(exporter, context)) {
     return {{"com.quill.NANDInfo.Error", "1"},
-            {"com.quill.NANDInfo.ErrorMessage", "Unable to parse buffer"}};
+            {std::string(kNANDInfoErrorMessageKey), "Unable to parse buffer"}};
   }
   PropertyDict info = CreateNANDInfoDict(context, false);
   const PropertyDict purgeable = getReclaimerInfo();
@@ -112,7 +112,7 @@ std::optional<PropertyDict> CopyNANDFTLInfo(bool useStatKeyParser, std::uint32_t
     SetAPIErrorMessage("CopyWhitelistedNANDFTLInfo: Unable to gather other stats magazine deltas");
   }
   if (fields) {
-    fields->set("HLT_APIErrorMessage", GetAPIErrorMessage());
+    fields->set(kAPIErrorMessageKey, GetAPIErrorMessage());
   }
   return fields;
 }

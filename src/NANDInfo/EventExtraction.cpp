@@ -11,7 +11,6 @@
 namespace vesprun {
 namespace {
 
-constexpr const char* kErrorMessageKey = "com.quill.NANDInfo.ErrorMessage";
 constexpr std::uint32_t kMonthlyStep = 6;
 
 /// Nothing for a step that is only a name.
@@ -36,7 +35,8 @@ std::optional<PropertyDict> resultOfStep(std::uint32_t step) {
 
 std::optional<PropertyDict> runStep(std::uint32_t step) {
   if (!platform().eventHub().sendEventLazyIsAvailable()) {
-    return PropertyDict{{kErrorMessageKey, "Unable call EH API EventHubSendEventLazy"}};
+    return PropertyDict{
+        {std::string(kNANDInfoErrorMessageKey), "Unable call EH API EventHubSendEventLazy"}};
   }
   const char* name = kEH_Extraction_Step_Names[step].data();
   logMessage(LogLevel::Default, "NANDInfo: NandInfoExtractToEH_runStep: logging %s\n", name);
@@ -55,7 +55,7 @@ std::optional<PropertyDict> runStep(std::uint32_t step) {
 }  // namespace
 
 bool EventHubSendEventLazyWrapper(std::string_view event, const EventHub::PayloadBuilder& build) {
-  return platform().eventHub().EventHubSendEventLazy(event, [&build] { return build(); });
+  return platform().eventHub().EventHubSendEventLazy(event, build);
 }
 
 std::optional<PropertyDict> NandInfoExtractToEH_runAllSteps(std::uint64_t /*context*/,
@@ -79,7 +79,7 @@ std::optional<PropertyDict> NandInfoExtractToEH_runAllSteps(std::uint64_t /*cont
   if (collectResults == 0) {
     return std::nullopt;
   }
-  results.set(kErrorMessageKey, GetAPIErrorMessage());
+  results.set(kNANDInfoErrorMessageKey, GetAPIErrorMessage());
   return results;
 }
 

@@ -18,9 +18,12 @@ constinit const std::array<EventFields, 8> EventHubConfigDetails = {{
      &massStorage_NANDInfo_SM_Monthly_FTLCounters_1},
 }};
 
-const FieldTable* fieldsOfEvent(std::string_view event) {
+const FieldTable& fieldsOfEvent(std::string_view event) {
+  static constexpr std::array<FieldRange, 0> kNoRanges{};
+  static constexpr FieldIndex kNoIndex(kNoRanges);
+  static constexpr FieldTable kNothing(kNoRanges, kNoIndex);
   const auto* found = std::ranges::find(EventHubConfigDetails, event, &EventFields::event);
-  return found != EventHubConfigDetails.end() ? found->fields : nullptr;
+  return found != EventHubConfigDetails.end() ? *found->fields : kNothing;
 }
 
 }  // namespace vesprun

@@ -25,7 +25,7 @@ struct EventFields {
 /// Every storage event with its fields, in the order in which the events are sent.
 extern const std::array<EventFields, 8> EventHubConfigDetails;
 
-/// The fields of the event of that name, or null when there is no such event.
-const FieldTable* fieldsOfEvent(std::string_view event);
+/// The fields of the event of that name; an event that is not known may carry nothing.
+const FieldTable& fieldsOfEvent(std::string_view event);
 
 }  // namespace vesprun

@@ -22,7 +22,6 @@ constexpr const char* kNumGrownBadBlocks = "com.quill.NANDInfo.Health.NumGrownBa
 constexpr const char* kSpareAvailablePercent = "com.quill.NANDInfo.Health.SpareAvailablePercent";
 constexpr const char* kNumDieFailures = "com.quill.NANDInfo.Health.NumDieFailures";
 constexpr const char* kIsNANDRetirable = "com.quill.NANDInfo.Health.IsNANDRetirable";
-constexpr const char* kErrorMessageKey = "HLT_APIErrorMessage";
 
 constexpr unsigned kE2EErrorCounters = 12;
 
@@ -100,7 +99,7 @@ PropertyDict gatherNANDHealthInfo() {
 
 PropertyDict CopyTendmarkNANDInfo() {
   PropertyDict set = CreateFilteredDict(gatherNANDHealthInfo(), &kTendmarkFields);
-  set.set(kErrorMessageKey, GetAPIErrorMessage());
+  set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
   return set;
 }
 
@@ -109,7 +108,7 @@ PropertyDict CopyOTANANDInfo() { return CreateFilteredDict(gatherNANDHealthInfo(
 PropertyDict CopyInternalLabNANDInfo() {
   PropertyDict set = CreateFilteredDict(gatherNANDHealthInfo(), &kInternalLabFields);
   set.set(kIsNANDRetirable, std::int32_t{isRetirable(set)});
-  set.set(kErrorMessageKey, GetAPIErrorMessage());
+  set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
   return set;
 }
 

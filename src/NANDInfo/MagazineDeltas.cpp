@@ -107,7 +107,7 @@ PropertyDict CopySMagNANDFTLInfo(std::uint64_t hours, std::uint32_t deltaWanted,
   }
   result.merge(derived);
   addAverageCycles(result);
-  result.set("HLT_APIErrorMessage", GetAPIErrorMessage());
+  result.set(kAPIErrorMessageKey, GetAPIErrorMessage());
   return result;
 }
 

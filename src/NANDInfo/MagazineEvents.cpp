@@ -3,11 +3,11 @@
 #include <iterator>
 #include <string>
 
+#include "NANDInfo/APIErrorMessage.h"
 #include "NANDInfo/EventExtraction.h"
 #include "NANDInfo/EventFields.h"
 #include "NANDInfo/FieldNumber.h"
 #include "NANDInfo/FilteredDict.h"
-#include "NANDInfo/MagazineHistory.h"
 #include "NANDInfo/MagazineSnapshot.h"
 #include "platform/Platform.h"
 #include "vesprun.h"
@@ -15,7 +15,6 @@
 namespace vesprun {
 namespace {
 
-constexpr const char* kErrorMessageKey = "com.quill.NANDInfo.ErrorMessage";
 constexpr const char* kOperation = "createAndLogSMagFTLFieldsToEventHubForEvent";
 
 struct MagazineView {
@@ -35,20 +34,20 @@ constexpr MagazineView kMagazineViews[] = {
 PropertyDict createAndLogSMagFTLFieldsToEventHubForEvent(std::uint32_t view) {
   if (view >= std::size(kMagazineViews)) {
     logMessage(LogLevel::Default, "Unexpected SM delta type %d", static_cast<std::int32_t>(view));
-    return {{kErrorMessageKey, "Wrong SM delta type"}};
+    return {{std::string(kNANDInfoErrorMessageKey), "Wrong SM delta type"}};
   }
   const auto& [event, hours, withHistory] = kMagazineViews[view];
   const PropertyDict fields = CopySMagNANDFTLInfo(hours, 1, 2);
   if (fields.empty()) {
-    return {{kErrorMessageKey, "Unable gather FTL fields to log to EH"}};
+    return {{std::string(kNANDInfoErrorMessageKey), "Unable gather FTL fields to log to EH"}};
   }
   const Number* isSupported = numberUnder(fields, kIsStatMagSupportedKey);
   if (isSupported == nullptr || isSupported->asInt32() == 0) {
-    return {{kErrorMessageKey, "Stats Magazine not supported"}};
+    return {{std::string(kNANDInfoErrorMessageKey), "Stats Magazine not supported"}};
   }
   logMessage(LogLevel::Default, "NANDInfo: %s: %s enabled=%d\n", kOperation, event,
              platform().eventHub().EventHubIsEventUsed(event) ? 1 : 0);
-  PropertyDict payload = CreateFilteredDict(fields, fieldsOfEvent(event));
+  PropertyDict payload = CreateFilteredDict(fields, &fieldsOfEvent(event));
   if (withHistory) {
     payload.merge(CopySMagNANDFTLCustomHistoryInfo(0));
   }

@@ -1,16 +1,21 @@
-#include "NANDInfo/MagazineHistory.h"
-
+#include <array>
 #include <optional>
 #include <string>
+#include <string_view>
 
 #include "NANDInfo/APIErrorMessage.h"
 #include "NANDInfo/FieldNumber.h"
 #include "NANDInfo/MagazineSnapshot.h"
+#include "vesprun.h"
 
 namespace vesprun {
 namespace {
 
 constexpr std::uint64_t kHoursPerPeriod = 4;
+
+constexpr std::array<std::string_view, 6> kHLT_instantaneous_gc_wamp_array{
+    "HLT_instantaneous_gc_wamp_0", "HLT_instantaneous_gc_wamp_1", "HLT_instantaneous_gc_wamp_2",
+    "HLT_instantaneous_gc_wamp_3", "HLT_instantaneous_gc_wamp_4", "HLT_instantaneous_gc_wamp_5"};
 
 /// Did garbage collection write anything from `older` to `newer`? Only time stamps that say that
 /// time has passed make the difference of the counters count.
@@ -50,7 +55,7 @@ PropertyDict CopySMagNANDFTLCustomHistoryInfo(std::uint32_t skipHistory) {
   std::optional<PropertyDict> newer = copyMagazineSnapshot(0);
   const Number* isSupported = newer ? numberUnder(*newer, kIsStatMagSupportedKey) : nullptr;
   if (isSupported != nullptr && isSupported->asInt32() == 0) {
-    return {{"com.quill.NANDInfo.ErrorMessage", GetAPIErrorMessage()}};
+    return {{std::string(kNANDInfoErrorMessageKey), GetAPIErrorMessage()}};
   }
   PropertyDict history;
   if (skipHistory != 0) {

@@ -34,15 +34,14 @@ inline constexpr TunnelSelector bandStatsSelector{11, 11};
 /// does not offer is null. Only `connection` and `service` change at run time.
 struct nand_exporter_t {
   using SelectorGetter = const TunnelSelector* (*)();
-  /// Fills a context from a buffer; a result other than 0 (or true) is success. It never reads
-  /// outside the buffer.
+  /// Fills a context from a buffer, outside of which it never reads. False or 0 is failure.
   using StatsParser = bool (*)(ORUStatsContext&, std::span<const std::uint8_t>);
   using FieldParser = std::uint32_t (*)(GenericParserCxt&, std::span<const std::uint8_t>);
 
   const char* name;                     ///< registry class of the driver
   const char* propertyKey;              ///< registry property with the controller's characteristics
-  RegistryHandle connection;            ///< open user client; written by `findNandExporterNew`
-  RegistryHandle service;               ///< its service; written by `findNandExporterNew`
+  RegistryHandle connection;            ///< user client, see `findNandExporterNew`
+  RegistryHandle service;               ///< its service, see `findNandExporterNew`
   std::uint32_t contentDeletionMethod;  ///< `kMethodNotOffered` when there is none
   std::uint32_t tunnelSizeMethod;
   std::uint32_t tunnelDataMethod;

@@ -13,8 +13,6 @@
 namespace vesprun {
 namespace {
 
-constexpr const char* kErrorMessageKey = "com.quill.NANDInfo.ErrorMessage";
-
 /// An event, the operation that sends it and the name of its view, for the log. Without a view the
 /// outcome is not logged.
 struct StatisticsEvent {
@@ -44,7 +42,7 @@ void logWhetherUsed(const StatisticsEvent& event) {
 }
 
 PropertyDict payloadOf(const StatisticsEvent& event, const PropertyDict& set) {
-  return CreateFilteredDict(set, fieldsOfEvent(event.event));
+  return CreateFilteredDict(set, &fieldsOfEvent(event.event));
 }
 
 bool sendAndLog(const StatisticsEvent& event, const PropertyDict& payload) {
@@ -61,7 +59,7 @@ bool sendAndLog(const StatisticsEvent& event, const PropertyDict& payload) {
 PropertyDict createAndLogFTLStatFieldsToEventHubForEvent() {
   const PropertyDict set = CopyWhitelistedNANDFTLInfo(false);
   if (set.empty()) {
-    return {{kErrorMessageKey, "Unable gather FTL fields to log to EH"}};
+    return {{std::string(kNANDInfoErrorMessageKey), "Unable gather FTL fields to log to EH"}};
   }
   PropertyDict result;
   for (const StatisticsEvent& event : kFTLEvents) {
@@ -77,9 +75,9 @@ PropertyDict createAndLogFTLStatFieldsToEventHubForEvent() {
 PropertyDict createAndLogMSPFieldsToEventHubForEvent() {
   PropertyDict sets = CopyWhitelistedNANDMSPInfo(false);
   if (sets.empty()) {
-    return {{kErrorMessageKey, "Unable gather MSP fields to log to EH"}};
+    return {{std::string(kNANDInfoErrorMessageKey), "Unable gather MSP fields to log to EH"}};
   }
-  sets.remove("HLT_APIErrorMessage");
+  sets.remove(kAPIErrorMessageKey);
   logWhetherUsed(kMSPEvent);
   const std::size_t total = sets.size();
   PropertyDict result;
@@ -102,7 +100,7 @@ PropertyDict createAndLogMSPFieldsToEventHubForEvent() {
 PropertyDict createAndLogStorageStatsToEventHubForEvent() {
   const PropertyDict set = CopyWhitelistedStorageStats(false);
   if (set.empty()) {
-    return {{kErrorMessageKey, "Unable gather Storage fields to log to EH"}};
+    return {{std::string(kNANDInfoErrorMessageKey), "Unable gather Storage fields to log to EH"}};
   }
   logWhetherUsed(kStorageStatsEvent);
   PropertyDict payload = payloadOf(kStorageStatsEvent, set);

@@ -7,6 +7,8 @@
 #include <string>
 
 #include "NANDInfo/APIErrorMessage.h"
+#include "NANDInfo/ControllerConnection.h"
+#include "NANDInfo/MagazineSnapshot.h"
 #include "NANDInfo/NANDInfo.h"
 #include "NANDInfo/TunnelCommand.h"
 #include "NANDInfo/parsers/GenericParserCxt.h"
@@ -60,10 +62,12 @@ bool fetch(RegistryHandle connection, const nand_exporter_t& exporter,
 std::uint32_t countMSPs(const nand_exporter_t& exporter) {
   constexpr std::uint32_t kMostMSPs = 10;
   std::uint32_t count = 0;
-  for (Answer answer; count < kMostMSPs; ++count, answer = Answer()) {
-    if (!fetch(exporter.connection, exporter, exporter.getMspStatsSelectors, count, answer)) {
-      break;
-    }
+  const auto answers = [&] {
+    Answer answer;
+    return fetch(exporter.connection, exporter, exporter.getMspStatsSelectors, count, answer);
+  };
+  while (count < kMostMSPs && answers()) {
+    ++count;
   }
   return count;
 }
@@ -109,7 +113,7 @@ std::optional<PropertyDict> gatherORUFTLData(bool useStatKeyParser, bool useStat
   const bool isQNS1 = std::strcmp(exporter->name, "ORUStorage") == 0;
   fields.set("com.quill.NANDInfo.IsQNS1Controller", std::int32_t{isQNS1});
   const bool hasMagazine = fields.contains("magazineFWVersion_1");
-  fields.set("com.quill.NANDInfo.IsStatMagSupported", std::int32_t{hasMagazine});
+  fields.set(kIsStatMagSupportedKey, std::int32_t{hasMagazine});
   if (!hasMagazine) {
     SetAPIErrorMessage("Stat Magazine not supported");
   }
@@ -158,26 +162,21 @@ std::optional<PropertyDict> gatherORUMSPData() {
 }
 
 bool GatherNANDStats(nand_exporter_t*& exporter, ORUStatsContext& context) {
-  DeviceRegistry& registry = platform().deviceRegistry();
   const RegistryObject service(findNandExporter(exporter));
   if (!service) {
     std::fputs("Could not get matching DevRegKit service for exporting classes\n", stderr);
     return false;
   }
-  RegistryHandle connection = 0;
-  if (registry.DevRegServiceOpen(service.get(), connection) != kRegistrySuccess) {
+  ControllerConnection connection(service.get());
+  if (!connection) {
     std::fputs("Could not get connection to service\n", stderr);
     return false;
   }
   Answer answer;
-  const bool parsed = fetch(connection, *exporter, exporter->getStatsSelectors, 0, answer) &&
+  const bool parsed = fetch(connection.get(), *exporter, exporter->getStatsSelectors, 0, answer) &&
                       exporter->parseStats != nullptr &&
                       exporter->parseStats(context, answer.bytes());
-  if (registry.DevRegServiceClose(connection) != kRegistrySuccess) {
-    std::fputs("Could not close connection to service\n", stderr);
-    return false;
-  }
-  return parsed;
+  return connection.close() && parsed;
 }
 
 }  // namespace vesprun

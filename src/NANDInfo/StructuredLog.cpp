@@ -10,6 +10,7 @@
 #include <string_view>
 #include <vector>
 
+#include "NANDInfo/ControllerConnection.h"
 #include "NANDInfo/ControllerListReader.h"
 #include "NANDInfo/FactoryDefectList.h"
 #include "NANDInfo/NANDInfo.h"
@@ -28,15 +29,15 @@ namespace {
 /// when the list could not be handled.
 using ListHandler = bool (*)(std::span<const std::uint8_t>, const PropertyValue*, std::string_view);
 
-/// A sort of list, of which a controller may have several kinds.
-struct ListSort {
+/// A type of list, of which a controller may have several kinds.
+struct ListType {
   nand_exporter_t::SelectorGetter nand_exporter_t::*getter;
   ListHandler handler;
   std::uint32_t kindCount;
   const char* whenNotOffered;
 };
 
-constexpr std::array<ListSort, 3> kListSorts{{
+constexpr std::array<ListType, 3> kListTypes{{
     {&nand_exporter_t::getBandStatsSelectors, WriteValidityListNANDLog, 1,
      "Validity list retrieval is not supported\n"},
     {&nand_exporter_t::getTelemetryListSelectors, LogNANDTelemetryList, 3,
@@ -54,42 +55,18 @@ struct HandlerEntry {
 
 std::vector<HandlerEntry> handlerList(const nand_exporter_t& exporter) {
   std::vector<HandlerEntry> entries;
-  for (const ListSort& sort : kListSorts) {
-    const nand_exporter_t::SelectorGetter getter = exporter.*sort.getter;
+  for (const ListType& type : kListTypes) {
+    const nand_exporter_t::SelectorGetter getter = exporter.*type.getter;
     if (getter == nullptr) {
-      std::fputs(sort.whenNotOffered, stderr);
+      std::fputs(type.whenNotOffered, stderr);
       continue;
     }
-    for (std::uint32_t kind = 0; kind < sort.kindCount; ++kind) {
-      entries.push_back({getter, sort.handler, kind});
+    for (std::uint32_t kind = 0; kind < type.kindCount; ++kind) {
+      entries.push_back({getter, type.handler, kind});
     }
   }
   return entries;
 }
-
-/// A connection to the controller that says so when it cannot be closed.
-class ControllerConnection {
- public:
-  explicit ControllerConnection(RegistryHandle service) {
-    if (platform().deviceRegistry().DevRegServiceOpen(service, _handle) != kRegistrySuccess) {
-      _handle = 0;
-    }
-  }
-  ~ControllerConnection() {
-    if (_handle != 0 &&
-        platform().deviceRegistry().DevRegServiceClose(_handle) != kRegistrySuccess) {
-      std::fputs("Could not close connection to service\n", stderr);
-    }
-  }
-  ControllerConnection(const ControllerConnection&) = delete;
-  ControllerConnection& operator=(const ControllerConnection&) = delete;
-
-  explicit operator bool() const { return _handle != 0; }
-  RegistryHandle get() const { return _handle; }
-
- private:
-  RegistryHandle _handle = 0;
-};
 
 void decideOnValidityList() {
   gCurrentUserWamp = 0.0;

@@ -5,6 +5,7 @@
 #include <cstring>
 
 #include "NANDInfo/APIErrorMessage.h"
+#include "common/LittleEndian.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
@@ -67,8 +68,7 @@ bool executeTunnelCommand(RegistryHandle connection, const nand_exporter_t& expo
     length = 0;
     return false;
   }
-  std::uint32_t size = 0;
-  std::memcpy(&size, answer.data(), sizeof size);
+  const auto size = loadLittleEndian<std::uint32_t>(answer.data());
 
   TunnelBuffer block(size);
   if (!block) {

@@ -15,7 +15,6 @@
 namespace vesprun {
 namespace {
 
-constexpr std::string_view kErrorMessageKey = "HLT_APIErrorMessage";
 constexpr std::string_view kFirmwareVersionKey = "fw_version_identifier";
 
 constexpr std::string_view kHealthFieldsOfStorageStats[] = {
@@ -74,7 +73,7 @@ PropertyDict CopyWhitelistedNANDFTLInfo(bool round) {
   } else {
     SetAPIErrorMessage("CopyWhitelistedNANDFTLInfo: Unable to gather other FTL fields");
   }
-  set.set(kErrorMessageKey, GetAPIErrorMessage());
+  set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
   return set;
 }
 
@@ -95,7 +94,7 @@ PropertyDict CopyWhitelistedNANDMSPInfo(bool round) {
   } else {
     SetAPIErrorMessage("CopyWhitelistedNANDMSPInfo: Unable to gather MSP fields");
   }
-  sets.set(kErrorMessageKey, GetAPIErrorMessage());
+  sets.set(kAPIErrorMessageKey, GetAPIErrorMessage());
   return sets;
 }
 
@@ -111,7 +110,7 @@ PropertyDict CopyWhitelistedStorageStats(bool round) {
     fields.set(figure.field, figure.query(fourCharacterCode(figure.code)));
   }
   PropertyDict set = CreateFilteredDict_SigDig(fields, &WhitelistedStorageStats_SigDigDict, round);
-  set.set(kErrorMessageKey, GetAPIErrorMessage());
+  set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
   return set;
 }
 

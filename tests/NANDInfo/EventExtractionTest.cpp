@@ -1,7 +1,6 @@
 #include "NANDInfo/EventExtraction.h"
 
 #include "NANDInfo/MagazineEvents.h"
-#include "NANDInfo/MagazineHistory.h"
 #include "NANDInfo/StatisticsDevice.h"
 #include "vesprun.h"
 

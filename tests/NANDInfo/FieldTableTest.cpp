@@ -48,7 +48,7 @@ TEST(FieldTable, findsEveryNameOfEveryTableInItsOwnRange) {
                                            &FTLStats4MSPStats,
                                            &keyMap};
   for (const EventFields& event : EventHubConfigDetails) {
-    tables.push_back(fieldsOfEvent(event.event));
+    tables.push_back(&fieldsOfEvent(event.event));
     ASSERT_EQ(tables.back(), event.fields);
   }
   for (const FieldTable* table : tables) {
@@ -60,7 +60,7 @@ TEST(FieldTable, findsEveryNameOfEveryTableInItsOwnRange) {
     });
     EXPECT_EQ(names.size(), table->size());
   }
-  EXPECT_EQ(fieldsOfEvent("com.quill.massStorage.NANDInfo.FTLCounters_2"), nullptr);
+  EXPECT_EQ(fieldsOfEvent("com.quill.massStorage.NANDInfo.FTLCounters_2").size(), 0U);
 }
 
 template <typename Key>

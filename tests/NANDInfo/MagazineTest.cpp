@@ -1,4 +1,3 @@
-#include "NANDInfo/MagazineHistory.h"
 #include "NANDInfo/StatisticsDevice.h"
 #include "vesprun.h"
 

@@ -7,7 +7,6 @@
 #include "NANDInfo/APIErrorMessage.h"
 #include "NANDInfo/EventExtraction.h"
 #include "NANDInfo/HealthSets.h"
-#include "NANDInfo/MagazineHistory.h"
 #include "NANDInfo/NANDInfo.h"
 #include "NANDInfo/NandExporter.h"
 #include "NANDInfo/StructuredLog.h"
