@@ -121,14 +121,14 @@ namespace {
 
 constexpr std::size_t kGroups = 5;             // group 0 holds none
 constexpr std::size_t kIndexesOfAGroup = 165;  // no index of any group is larger
-constexpr std::uint8_t kNoRow = 0xFF;
+constexpr std::uint8_t kNoMSPRow = 0xFF;
 
 using Rows = std::array<std::array<std::uint8_t, kIndexesOfAGroup>, kGroups>;
 
 constexpr Rows kRowOfKey = [] {
   Rows rows{};
   for (auto& group : rows) {
-    group.fill(kNoRow);
+    group.fill(kNoMSPRow);
   }
   for (std::size_t row = 0; row < ORUMSPKeyTable.size(); ++row) {
     const std::uint16_t key = ORUMSPKeyTable[row].key;
@@ -145,7 +145,7 @@ constexpr std::array<std::size_t, kGroups> kKeysOfGroup = [] {
   return keys;
 }();
 
-constexpr bool kAscending = [] {
+constexpr bool kAscendingMSPKeys = [] {
   for (std::size_t row = 1; row < ORUMSPKeyTable.size(); ++row) {
     if (ORUMSPKeyTable[row - 1].key >= ORUMSPKeyTable[row].key) {
       return false;
@@ -155,7 +155,7 @@ constexpr bool kAscending = [] {
 }();
 
 static_assert(kKeysOfGroup == std::array<std::size_t, kGroups>{0, 138, 57, 34, 5});
-static_assert(kAscending && ORUMSPKeyTable.size() < kNoRow);
+static_assert(kAscendingMSPKeys && ORUMSPKeyTable.size() < kNoMSPRow);
 
 }  // namespace
 
@@ -166,7 +166,7 @@ const ORUMSPKey* findORUMSPKey(std::uint16_t key) {
     return nullptr;
   }
   const std::uint8_t row = kRowOfKey[group][index];
-  return row != kNoRow ? &ORUMSPKeyTable[row] : nullptr;
+  return row != kNoMSPRow ? &ORUMSPKeyTable[row] : nullptr;
 }
 
 }  // namespace vesprun

@@ -100,9 +100,10 @@ bool ORUParseBufferToCxt(ORUStatsContext& ctx, std::span<const std::uint8_t> buf
   if (reader.remaining() == 0) {
     return false;
   }
+  const std::size_t mostFields = ctx.fields.size() + kMostFields;
   do {
     const StatisticsRecordHeader header = reader.readHeader();
-    if (!reader.holds(header) || ctx.fields.size() > kMostFields) {
+    if (!reader.holds(header) || ctx.fields.size() > mostFields) {
       ctx.exportVersion = 0;
       return false;
     }
