@@ -125,6 +125,7 @@ TEST(Outbox, AFailedSubmissionLeavesNothing) {
   const auto writer = [](LogFileHandle& file) { file.write("text"); };
   EXPECT_FALSE(platform().logsmith().LGSWriteLogForSubmission("165", "S", nullptr, writer));
   EXPECT_THAT(device.log(), testing::ElementsAre(testing::StartsWith("error: ")));
+  EXPECT_EQ(device.read("outbox/logs"), "a file in the way");
 }
 
 TEST(DiagnosticHeader, IsLiveWhenItIsNotDescribed) {

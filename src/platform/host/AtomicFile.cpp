@@ -25,27 +25,10 @@ FileDescriptor openFolder(const std::string& folder) {
   return FileDescriptor(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
 }
 
-bool lock(int descriptor, int operation) {
-  int result = 0;
-  do {
-    result = flock(descriptor, operation);
-  } while (result != 0 && errno == EINTR);
-  return result == 0;
-}
-
 /// The path under which a nameless file of this process can be linked into a folder.
 std::string procPath(int descriptor) { return "/proc/self/fd/" + std::to_string(descriptor); }
 
 }  // namespace
-
-std::optional<FolderLock> FolderLock::take(const std::string& folder, std::string& error) {
-  FileDescriptor descriptor = openFolder(folder);
-  if (!descriptor.isOpen() || !lock(descriptor.get(), LOCK_EX)) {
-    error = systemError(folder);
-    return std::nullopt;
-  }
-  return FolderLock(std::move(descriptor));
-}
 
 AtomicFile::AtomicFile(std::string folder, FileDescriptor folderDescriptor)
     : _folder(std::move(folder)), _folderDescriptor(std::move(folderDescriptor)) {}
@@ -104,7 +87,7 @@ bool AtomicFile::openUnfinished(std::string& error) {
     // may have gone to another file while this one was being opened.
     struct stat opened {};
     struct stat named {};
-    if (!lock(file.get(), LOCK_EX | LOCK_NB) || fstat(file.get(), &opened) != 0 ||
+    if (flock(file.get(), LOCK_EX | LOCK_NB) != 0 || fstat(file.get(), &opened) != 0 ||
         fstatat(_folderDescriptor.get(), name.c_str(), &named, AT_SYMLINK_NOFOLLOW) != 0 ||
         opened.st_ino != named.st_ino) {
       continue;
@@ -190,13 +173,12 @@ bool AtomicFile::replace(const std::string& name, std::string& error, const Fold
     _unfinishedName.clear();
     return syncFolder(error);
   }
-  if (held == nullptr && !lock(folder, LOCK_EX)) {
-    error = systemError(_folder);
+  if (held == nullptr && !lockFile(_folderDescriptor, LOCK_EX, kLongestLockWait, _folder, error)) {
     return false;
   }
   const bool replaced = replaceThroughHiddenName(name, error);
   if (held == nullptr) {
-    lock(folder, LOCK_UN);
+    flock(folder, LOCK_UN);
   }
   return replaced && syncFolder(error);
 }

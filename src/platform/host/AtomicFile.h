@@ -5,21 +5,9 @@
 #include <string_view>
 
 #include "platform/host/FileDescriptor.h"
+#include "platform/host/FileLock.h"
 
 namespace vesprun {
-
-/// Keeps other processes, and other holders in this one, from replacing files in a folder.
-class FolderLock {
- public:
-  /// Waits for the lock and holds it as long as the object lives. Nothing, with a text in `error`
-  /// that names the folder, when it cannot be had.
-  static std::optional<FolderLock> take(const std::string& folder, std::string& error);
-
- private:
-  explicit FolderLock(FileDescriptor folder) : _folder(std::move(folder)) {}
-
-  FileDescriptor _folder;  ///< closing it releases the lock
-};
 
 /// A whole document on its way into a folder. It appears under its name complete and durable, or
 /// not at all: a process killed at any moment leaves no part of it under any name where the file

@@ -1,6 +1,5 @@
 #include "platform/host/CounterFile.h"
 
-#include <fcntl.h>
 #include <sys/file.h>
 #include <sys/stat.h>
 
@@ -9,11 +8,10 @@
 #include <cerrno>
 #include <cstdio>
 #include <string_view>
-#include <thread>
 
 #include "common/Date.h"
 #include "platform/host/AtomicFile.h"
-#include "platform/host/FileDescriptor.h"
+#include "platform/host/FileLock.h"
 #include "platform/host/SystemError.h"
 
 namespace vesprun {
@@ -31,39 +29,6 @@ bool exists(const std::string& path) {
   struct stat status {};
   return lstat(path.c_str(), &status) == 0;
 }
-
-/// A lock on a folder that is held as long as the object lives.
-class FolderUse {
- public:
-  /// `operation` is LOCK_SH or LOCK_EX.
-  static std::optional<FolderUse> take(const std::string& folder, int operation,
-                                       std::chrono::milliseconds longestWait, std::string& error) {
-    constexpr std::chrono::milliseconds kPause(5);
-    FileDescriptor descriptor(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-    if (!descriptor.isOpen()) {
-      error = systemError(folder);
-      return std::nullopt;
-    }
-    const auto end = std::chrono::steady_clock::now() + longestWait;
-    while (flock(descriptor.get(), operation | LOCK_NB) != 0) {
-      if (errno != EWOULDBLOCK && errno != EINTR) {
-        error = systemError(folder);
-        return std::nullopt;
-      }
-      if (std::chrono::steady_clock::now() >= end) {
-        error = folder + ": another process keeps it locked";
-        return std::nullopt;
-      }
-      std::this_thread::sleep_for(kPause);
-    }
-    return FolderUse(std::move(descriptor));
-  }
-
- private:
-  explicit FolderUse(FileDescriptor folder) : _folder(std::move(folder)) {}
-
-  FileDescriptor _folder;  ///< closing it releases the lock
-};
 
 }  // namespace
 
@@ -87,7 +52,7 @@ bool CounterFile::use(SqliteTransaction::Kind kind, const std::function<bool(Cou
   const std::string folder = _directory.hostPath(kFolder);
   const std::string path = folder + '/' + kName;
   struct stat status {};
-  std::optional<FolderUse> shared;
+  std::optional<FolderLock> shared;
   // Between making and locking, another process may move the new file away.
   for (int attempt = 1; !shared; ++attempt) {
     if (stat(path.c_str(), &status) != 0 && errno == ENOENT) {
@@ -98,7 +63,7 @@ bool CounterFile::use(SqliteTransaction::Kind kind, const std::function<bool(Cou
         return false;
       }
     }
-    shared = FolderUse::take(folder, LOCK_SH, _longestWait, error);
+    shared = FolderLock::take(folder, LOCK_SH, _longestWait, error);
     if (!shared) {
       return false;
     }
@@ -138,7 +103,7 @@ bool CounterFile::make(std::string& error) {
   if (!folder) {
     return false;
   }
-  const auto exclusive = FolderUse::take(*folder, LOCK_EX, _longestWait, error);
+  const auto exclusive = FolderLock::take(*folder, LOCK_EX, _longestWait, error);
   return exclusive && makeLocked(error);
 }
 
@@ -176,7 +141,7 @@ bool CounterFile::makeLocked(std::string& error) {
 std::optional<std::string> CounterFile::replace(const Damage& damage, std::string& error) {
   const std::string folder = _directory.hostPath(kFolder);
   const std::string path = folder + '/' + kName;
-  const auto exclusive = FolderUse::take(folder, LOCK_EX, _longestWait, error);
+  const auto exclusive = FolderLock::take(folder, LOCK_EX, _longestWait, error);
   if (!exclusive) {
     return std::nullopt;
   }

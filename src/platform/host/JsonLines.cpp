@@ -9,18 +9,10 @@
 #include <cstring>
 #include <utility>
 
+#include "platform/host/FileLock.h"
+#include "platform/host/SystemError.h"
+
 namespace vesprun {
-namespace {
-
-bool takeLock(int descriptor) {
-  int result = 0;
-  do {
-    result = flock(descriptor, LOCK_EX);
-  } while (result != 0 && errno == EINTR);
-  return result == 0;
-}
-
-}  // namespace
 
 bool JsonLines::open() {
   // Reading, to see how the last line ends; not blocking, in case it is no file.
@@ -38,8 +30,12 @@ bool JsonLines::append(std::string_view line, std::string& error) {
   struct stat status {};
   // A file that was deleted meanwhile would take the line with it.
   const bool usable = _file.isOpen() && fstat(_file.get(), &status) == 0 && status.st_nlink != 0;
-  if ((!usable && !open()) || !takeLock(_file.get())) {
-    error = _path + ": " + std::strerror(errno);
+  if (!usable && !open()) {
+    error = systemError(_path);
+    return false;
+  }
+  if (!lockFile(_file, LOCK_EX, _longestWait, _path, error)) {
+    _longestWait = {};  // a run has many lines, and must not wait for each
     return false;
   }
   const bool appended = appendLocked(line, error);
@@ -50,7 +46,7 @@ bool JsonLines::append(std::string_view line, std::string& error) {
 bool JsonLines::appendLocked(std::string_view line, std::string& error) {
   struct stat before {};
   if (fstat(_file.get(), &before) != 0) {
-    error = _path + ": " + std::strerror(errno);
+    error = systemError(_path);
     return false;
   }
   char last = '\n';

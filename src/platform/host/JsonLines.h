@@ -5,6 +5,7 @@
 #include <string_view>
 
 #include "platform/host/FileDescriptor.h"
+#include "platform/host/FileLock.h"
 
 namespace vesprun {
 
@@ -17,10 +18,9 @@ class JsonLines {
 
   /// Appends `line`, which holds no line feed, and ends it. A line of which only a part could be
   /// written is taken back; a part that was left by someone else is ended first, so that it spoils
-  /// no other line. False, with a text in `error` that names the file, when the line is not there.
+  /// no other line. False, with a text in `error` that names the file, when the line is not there;
+  /// also when another process keeps the file locked for long, which is waited for once.
   bool append(std::string_view line, std::string& error);
-
-  const std::string& path() const { return _path; }
 
  private:
   bool open();
@@ -29,6 +29,7 @@ class JsonLines {
   std::string _path;
   std::mutex _mutex;  ///< the file's lock does not hold back the threads that share it
   FileDescriptor _file;
+  std::chrono::milliseconds _longestWait = kLongestLockWait;
 };
 
 }  // namespace vesprun

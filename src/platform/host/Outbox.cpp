@@ -29,17 +29,21 @@ class OutboxLogFile : public LogFileHandle {
 };
 
 /// One more than the largest number that a file name in the folder begins with.
-std::uint64_t nextNumber(const std::string& folder) {
+std::optional<std::uint64_t> nextNumber(const std::string& folder, std::string& error) {
   std::uint64_t largest = 0;
-  std::error_code error;
-  for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
-       entry.increment(error)) {
+  std::error_code failure;
+  for (std::filesystem::directory_iterator entry(folder, failure), end; !failure && entry != end;
+       entry.increment(failure)) {
     const std::string name = entry->path().filename();
     std::uint64_t number = 0;
     const auto [rest, problem] = std::from_chars(name.data(), name.data() + name.size(), number);
     if (problem == std::errc() && *rest == '-') {
       largest = std::max(largest, number);
     }
+  }
+  if (failure) {
+    error = folder + ": " + failure.message();
+    return std::nullopt;
   }
   return largest + 1;
 }
@@ -48,6 +52,16 @@ std::string baseName(std::uint64_t number, std::string_view type, std::string_vi
   char digits[24];
   std::snprintf(digits, sizeof digits, "%04llu", static_cast<unsigned long long>(number));
   return std::string(digits) + '-' + std::string(type) + '-' + std::string(name);
+}
+
+/// What was submitted is never written over.
+bool addNew(AtomicFile& file, const std::string& folder, const std::string& name,
+            std::string& error) {
+  const AtomicFile::Added added = file.addNew(name, error);
+  if (added == AtomicFile::Added::NameTaken) {
+    error = folder + '/' + name + ": there already";
+  }
+  return added == AtomicFile::Added::Done;
 }
 
 }  // namespace
@@ -92,7 +106,11 @@ bool Outbox::writeLog(std::string_view type, std::string_view name, const Proper
   if (!lock) {
     return false;
   }
-  const std::string base = baseName(nextNumber(*folder), type, name);
+  const std::optional<std::uint64_t> number = nextNumber(*folder, error);
+  if (!number) {
+    return false;
+  }
+  const std::string base = baseName(*number, type, name);
   const std::string headerName = base + ".header.json";
   if (header != nullptr) {
     // First, so that a log which is there has its header beside it.
@@ -100,12 +118,12 @@ bool Outbox::writeLog(std::string_view type, std::string_view name, const Proper
     if (!headerFile) {
       return false;
     }
-    headerFile->append(jsonText(*header) + '\n');  // a failure is told by `replace`
-    if (!headerFile->replace(headerName, error, &*lock)) {
+    headerFile->append(jsonText(*header) + '\n');  // a failure is told by `addNew`
+    if (!addNew(*headerFile, *folder, headerName, error)) {
       return false;
     }
   }
-  if (file->replace(base + (type == kPtreeLogType ? ".ptree" : ".log"), error, &*lock)) {
+  if (addNew(*file, *folder, base + (type == kPtreeLogType ? ".ptree" : ".log"), error)) {
     return true;
   }
   if (header != nullptr) {

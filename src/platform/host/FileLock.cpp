@@ -1,0 +1,49 @@
+#include "platform/host/FileLock.h"
+
+#include <fcntl.h>
+#include <sys/file.h>
+
+#include <thread>
+#include <utility>
+
+#include "platform/host/SystemError.h"
+
+namespace vesprun {
+
+bool lockFile(const FileDescriptor& file, int operation, std::chrono::milliseconds longestWait,
+              const std::string& path, std::string& error) {
+  constexpr std::chrono::milliseconds kPause(2);
+  const auto end = std::chrono::steady_clock::now() + longestWait;
+  while (flock(file.get(), operation | LOCK_NB) != 0) {
+    if (errno != EWOULDBLOCK && errno != EINTR) {
+      error = systemError(path);
+      return false;
+    }
+    if (std::chrono::steady_clock::now() >= end) {
+      error = path + ": another process keeps it locked";
+      return false;
+    }
+    std::this_thread::sleep_for(kPause);
+  }
+  return true;
+}
+
+std::optional<FolderLock> FolderLock::take(const std::string& folder, std::string& error) {
+  return take(folder, LOCK_EX, kLongestLockWait, error);
+}
+
+std::optional<FolderLock> FolderLock::take(const std::string& folder, int operation,
+                                           std::chrono::milliseconds longestWait,
+                                           std::string& error) {
+  FileDescriptor descriptor(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+  if (!descriptor.isOpen()) {
+    error = systemError(folder);
+    return std::nullopt;
+  }
+  if (!lockFile(descriptor, operation, longestWait, folder, error)) {
+    return std::nullopt;
+  }
+  return FolderLock(std::move(descriptor));
+}
+
+}  // namespace vesprun
