@@ -13,6 +13,13 @@ std::string errorOf(const std::string& text) {
 TEST(DeviceDescription, NamesTheEntryThatIsWrong) {
   const std::pair<const char*, const char*> cases[] = {
       {R"([])", "not a dictionary"},
+      {R"({"kernel": {"a": 1)",
+       "parse error at line 1, column 19: syntax error while parsing object - unexpected end of "
+       "input; expected '}'"},
+      {R"({"system": {}, "kernel": {}, "system": {}})", "system: given twice"},
+      {R"({"registry": {"properties": {"a": 18446744073709551616}}})",
+       "registry.properties.a: the integer 18446744073709551616 does not fit 64 bits"},
+      {R"({"usage": {"delaySeconds": 1e999}})", "number overflow parsing '1e999'"},
       {R"({"colour": 1})", "colour: unknown entry"},
       {R"({"clock": "today"})", "clock: not a date such as 2024-03-05T09:15:02Z"},
       {R"({"logLevel": "loud"})",

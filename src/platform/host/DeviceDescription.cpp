@@ -8,6 +8,7 @@
 
 #include "common/Date.h"
 #include "platform/host/JsonForm.h"
+#include "platform/host/StrictJson.h"
 
 namespace vesprun {
 namespace {
@@ -484,11 +485,12 @@ DeviceDescription readDevice(const Entry& root) {
 
 std::optional<DeviceDescription> readDeviceDescription(const std::string& text,
                                                        std::string& error) {
+  const std::optional<Json> root = parseStrictJson(text, error);
+  if (!root) {
+    return std::nullopt;
+  }
   try {
-    const Json root = Json::parse(text);
-    return readDevice(Entry(&root, ""));
-  } catch (const Json::parse_error& parseError) {
-    error = parseError.what();
+    return readDevice(Entry(&*root, ""));
   } catch (const DescriptionError& descriptionError) {
     error = descriptionError.text;
   }

@@ -12,6 +12,7 @@
 #include "common/Date.h"
 #include "platform/host/Base64.h"
 #include "platform/host/QuotedText.h"
+#include "platform/host/StrictJson.h"
 
 namespace vesprun {
 namespace {
@@ -188,9 +189,7 @@ class ValueBuilder final : public nlohmann::json_sax<Json> {
   }
   bool parse_error(std::size_t /*position*/, const std::string& /*token*/,
                    const nlohmann::detail::exception& exception) override {
-    const std::string_view message = exception.what();
-    const auto prefixEnd = message.find("] ");  // "[json.exception....] parse error at line ..."
-    _error = message.substr(prefixEnd == std::string_view::npos ? 0 : prefixEnd + 2);
+    _error = parseErrorText(exception);
     return false;
   }
 

@@ -35,8 +35,7 @@ std::string indentedJsonText(const PropertyValue& value);
 /// first place and its last value.
 std::optional<PropertyValue> valueFromJsonText(std::string_view text, std::string& error);
 
-/// The same for JSON that is parsed already. An integer too large for its type has become a
-/// fraction when it was parsed, and is one here.
+/// The same for JSON that is parsed already, by `parseStrictJson`.
 std::optional<PropertyValue> valueFromJson(const nlohmann::ordered_json& json, std::string& error);
 
 }  // namespace vesprun
