@@ -1,9 +1,13 @@
 #include <cstdio>
+#include <exception>
 #include <iostream>
+#include <new>
 
 #include "Command.h"
+#include "platform/host/StandardStreams.h"
 
 int main(int argc, char** argv) {
+  vesprun::openStandardStreams();
   CLI::App vespctl("Sets up a device directory, runs the daily job on it and shows what came out.",
                    "vespctl");
   vespctl.require_subcommand(1);
@@ -18,9 +22,15 @@ int main(int argc, char** argv) {
   vesprun::addDecodeCommand(vespctl);
   try {
     vespctl.parse(argc, argv);
+  } catch (const CLI::Success& help) {
+    vespctl.exit(help);
   } catch (const CLI::ParseError& error) {
-    return vespctl.exit(error) == 0 ? 0 : 2;
-  } catch (const vesprun::CommandFailure& failure) {
+    vespctl.exit(error);
+    return 2;
+  } catch (const std::bad_alloc&) {
+    std::fputs("vespctl: out of memory\n", stderr);
+    return 1;
+  } catch (const std::exception& failure) {  // most are a `CommandFailure`
     std::fprintf(stderr, "vespctl: %s\n", failure.what());
     return 1;
   }

@@ -3,6 +3,7 @@
 
 #include "driver/DailyDriver.h"
 #include "platform/host/HostPlatform.h"
+#include "platform/host/StandardStreams.h"
 
 namespace vesprun {
 namespace {
@@ -23,6 +24,7 @@ void runOnDevice(std::span<const char* const> commandLine) {
 
 // The exit status is always 0: the system that starts the job does not look at it.
 int main(int argc, char** argv) {
+  vesprun::openStandardStreams();
   try {
     vesprun::runOnDevice({argv, argc > 0 ? static_cast<std::size_t>(argc) : 0});
   } catch (const std::exception& failure) {
