@@ -31,7 +31,8 @@ namespace vesprun {
 class Device {
  public:
   /// Reads the description of the device. Nothing, with a text in `error` that names the place,
-  /// when the folder or its `device.json` cannot be used, or when another device is open.
+  /// when the folder or its `device.json` cannot be used, or when another device is open. The
+  /// device's time zone becomes that of the process, in the environment variable TZ.
   VESPRUN_EXPORT static std::unique_ptr<Device> open(const std::string& path, std::string& error);
 
   /// Writes what the device's services held back.

@@ -1,7 +1,6 @@
 #include "common/Date.h"
 
 #include <algorithm>
-#include <charconv>
 #include <cstdio>
 #include <limits>
 

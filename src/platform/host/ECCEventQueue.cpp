@@ -10,19 +10,23 @@
 #include <optional>
 #include <vector>
 
+#include "platform/host/SystemError.h"
 #include "platform/host/WholeFile.h"
 
 namespace vesprun {
 namespace {
 
-std::vector<std::string> eventFiles(const std::string& folder) {
+/// In the order of their names. A folder that is not there holds none.
+std::vector<std::string> eventFiles(const std::string& folder, std::error_code& error) {
   std::vector<std::string> files;
-  std::error_code error;
   for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
        entry.increment(error)) {
     if (entry->path().extension() == ".bin") {
       files.push_back(entry->path());
     }
+  }
+  if (error == std::errc::no_such_file_or_directory) {
+    error.clear();
   }
   std::sort(files.begin(), files.end());
   return files;
@@ -31,7 +35,14 @@ std::vector<std::string> eventFiles(const std::string& folder) {
 }  // namespace
 
 int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length) {
-  for (const std::string& path : eventFiles(_directory.hostPath("kernel/ecc"))) {
+  const std::string folder = _directory.hostPath("kernel/ecc");
+  std::error_code failure;
+  const std::vector<std::string> files = eventFiles(folder, failure);
+  if (failure) {
+    _log.write(LogLevel::Error, folder + ": " + failure.message());
+    return EIO;
+  }
+  for (const std::string& path : files) {
     std::string error;
     bool missing = false;
     const std::optional<std::string> event = readWholeFile(path, error, &missing);
@@ -56,7 +67,7 @@ int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length)
       if (errno == ENOENT) {
         continue;
       }
-      _log.write(LogLevel::Error, path + ": " + std::strerror(errno));
+      _log.write(LogLevel::Error, systemError(path));
       return EIO;
     }
     std::memcpy(buffer.data(), event->data(), kEventLength);
@@ -71,7 +82,7 @@ bool ECCEventQueue::setAside(const std::string& path, const std::string& why) {
   if (std::rename(path.c_str(), (path + ".unusable").c_str()) == 0 || errno == ENOENT) {
     return true;
   }
-  _log.write(LogLevel::Error, path + ": " + std::strerror(errno));
+  _log.write(LogLevel::Error, systemError(path));
   return false;
 }
 

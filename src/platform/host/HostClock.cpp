@@ -2,7 +2,8 @@
 
 #include <stdlib.h>
 #include <time.h>
-#include <unistd.h>
+
+#include "platform/host/WholeFile.h"
 
 namespace vesprun {
 
@@ -23,14 +24,26 @@ std::string HostClock::localDateText(const Date& date) {
   return {text, strftime(text, sizeof text, "%Y-%m-%d %H:%M:%S %z", &local)};
 }
 
+namespace {
+
+/// Is there a zone of that name in the time-zone database, which has other files and folders, too?
+bool isTimeZone(const std::string& name) {
+  const bool isPath = name.empty() || name.front() == '/' || name.front() == '.' ||
+                      name.find("..") != std::string::npos;
+  std::string error;
+  const std::optional<std::string> zone =
+      isPath ? std::nullopt : readWholeFile("/usr/share/zoneinfo/" + name, error);
+  return zone && zone->starts_with("TZif");
+}
+
+}  // namespace
+
 bool useTimeZone(const std::optional<std::string>& name) {
   if (!name) {
     unsetenv("TZ");
   } else {
     // The C library takes an unknown zone for UTC without a word.
-    const bool isPath = name->empty() || name->front() == '/' || name->front() == '.' ||
-                        name->find("..") != std::string::npos;
-    if (isPath || (*name != "UTC" && access(("/usr/share/zoneinfo/" + *name).c_str(), R_OK) != 0)) {
+    if (*name != "UTC" && !isTimeZone(*name)) {
       return false;
     }
     setenv("TZ", name->c_str(), 1);

@@ -20,7 +20,8 @@ class HostClock : public Clock {
 };
 
 /// Makes `name`, of the time-zone database, the time zone of the whole process, or the machine's
-/// own when there is none. False when the database has no such zone.
+/// own when there is none: it sets, or removes, the environment variable TZ. False when the
+/// database has no such zone.
 bool useTimeZone(const std::optional<std::string>& name);
 
 }  // namespace vesprun

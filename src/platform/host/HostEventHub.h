@@ -1,8 +1,6 @@
 #pragma once
 
-#include "platform/Clock.h"
 #include "platform/EventHub.h"
-#include "platform/SystemLog.h"
 #include "platform/host/DeviceDescription.h"
 #include "platform/host/Outbox.h"
 

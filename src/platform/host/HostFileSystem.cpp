@@ -9,7 +9,12 @@ namespace vesprun {
 
 std::optional<std::string> HostFileSystem::readFile(const std::string& path) {
   std::string error;
-  return readWholeFile(_directory.hostPath(path), error);
+  bool missing = false;
+  std::optional<std::string> content = readWholeFile(_directory.hostPath(path), error, &missing);
+  if (!content && !missing) {
+    _log.write(LogLevel::Error, error);
+  }
+  return content;
 }
 
 std::optional<std::uint64_t> HostFileSystem::fileSize(const std::string& path) {

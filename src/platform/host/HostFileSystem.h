@@ -1,6 +1,7 @@
 #pragma once
 
 #include "platform/FileSystem.h"
+#include "platform/SystemLog.h"
 #include "platform/host/DeviceDescription.h"
 #include "platform/host/DeviceDirectory.h"
 
@@ -11,8 +12,8 @@ namespace vesprun {
 class HostFileSystem : public FileSystem {
  public:
   HostFileSystem(const DeviceDirectory& directory,
-                 const AnswerDescription<VolumeDescription>& userVolume)
-      : _directory(directory), _userVolume(userVolume) {}
+                 const AnswerDescription<VolumeDescription>& userVolume, SystemLog& log)
+      : _directory(directory), _userVolume(userVolume), _log(log) {}
 
   std::optional<std::string> readFile(const std::string& path) override;
   std::optional<std::uint64_t> fileSize(const std::string& path) override;
@@ -21,6 +22,7 @@ class HostFileSystem : public FileSystem {
  private:
   const DeviceDirectory& _directory;
   const AnswerDescription<VolumeDescription>& _userVolume;
+  SystemLog& _log;
 };
 
 }  // namespace vesprun

@@ -97,11 +97,14 @@ std::optional<Bytes> HostKernel::captureSnapshot(std::uint32_t /*captureFlags*/)
   if (!_description.snapshotFile) {
     return std::nullopt;
   }
-  std::string ignored;
+  std::string error;
   const std::optional<std::string> content =
-      readWholeFile(_directory.hostPath(*_description.snapshotFile), ignored);
-  return content ? std::optional<Bytes>(std::in_place, content->begin(), content->end())
-                 : std::nullopt;
+      readWholeFile(_directory.hostPath(*_description.snapshotFile), error);
+  if (!content) {
+    _log.write(LogLevel::Error, error);
+    return std::nullopt;
+  }
+  return Bytes(content->begin(), content->end());
 }
 
 }  // namespace vesprun

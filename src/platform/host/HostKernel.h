@@ -12,7 +12,7 @@ namespace vesprun {
 class HostKernel : public Kernel {
  public:
   HostKernel(const KernelDescription& description, const DeviceDirectory& directory, SystemLog& log)
-      : _description(description), _directory(directory), _eccEvents(directory, log) {}
+      : _description(description), _directory(directory), _log(log), _eccEvents(directory, log) {}
 
   int sysctlbyname(const std::string& name, std::span<std::uint8_t> buffer,
                    std::size_t& length) override;
@@ -27,6 +27,7 @@ class HostKernel : public Kernel {
 
   const KernelDescription& _description;
   const DeviceDirectory& _directory;
+  SystemLog& _log;
   ECCEventQueue _eccEvents;
 };
 

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <chrono>
 #include <condition_variable>
+#include <exception>
 #include <mutex>
 #include <system_error>
 #include <thread>
@@ -55,7 +56,11 @@ class HostMurmur::Replies {
         return;
       }
     }
-    handler(&usage.records);
+    try {
+      handler(&usage.records);
+    } catch (const std::exception& failure) {  // nobody else is on this thread to catch it
+      _log.write(LogLevel::Error, std::string("the usage feed's reply: ") + failure.what());
+    }
   }
 
   const AnswerDescription<UsageDescription>& _description;

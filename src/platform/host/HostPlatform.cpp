@@ -159,7 +159,7 @@ EventHub& HostPlatform::eventHub() {
 }
 
 FileSystem& HostPlatform::fileSystem() {
-  return _services->fileSystem.get(directory(), description().userVolume);
+  return _services->fileSystem.get(directory(), description().userVolume, systemLog());
 }
 
 InstalledApplications& HostPlatform::installedApplications() {

@@ -37,10 +37,11 @@ std::optional<std::string> readWholeFile(const std::string& path, std::string& e
   const int file = open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
   struct stat status {};
   std::optional<std::string> content;
+  const char* wrongKind = nullptr;
   errno = file < 0 ? errno : 0;
   if (file >= 0 && fstat(file, &status) == 0) {
     if (!S_ISREG(status.st_mode)) {
-      errno = S_ISDIR(status.st_mode) ? EISDIR : EINVAL;
+      wrongKind = S_ISDIR(status.st_mode) ? "Is a directory" : "not a regular file";
     } else {
       content.emplace(static_cast<std::size_t>(status.st_size) + 1, '\0');
       if (!readAll(file, *content)) {
@@ -56,7 +57,7 @@ std::optional<std::string> readWholeFile(const std::string& path, std::string& e
     *missing = !content && cause == ENOENT;
   }
   if (!content) {
-    error = path + ": " + std::strerror(cause);
+    error = path + ": " + (wrongKind != nullptr ? wrongKind : std::strerror(cause));
   }
   return content;
 }
