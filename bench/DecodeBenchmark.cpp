@@ -15,8 +15,8 @@
 #include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
+#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
 #include "NANDInfo/parsers/StatisticsRecord.h"
-#include "platform/host/StatisticsBufferBuilder.h"
 
 namespace vesprun {
 namespace {

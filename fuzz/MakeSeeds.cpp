@@ -9,9 +9,9 @@
 #include "NANDInfo/parsers/MSPRecord.h"
 #include "NANDInfo/parsers/ORUMSPKeyTable.h"
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
+#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
 #include "NANDInfo/parsers/VendorCounterParsers.h"
 #include "common/LittleEndian.h"
-#include "platform/host/StatisticsBufferBuilder.h"
 
 using namespace vesprun;
 

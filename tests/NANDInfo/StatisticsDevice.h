@@ -2,8 +2,8 @@
 
 #include <string>
 
+#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
 #include "platform/host/JsonForm.h"
-#include "platform/host/StatisticsBufferBuilder.h"
 #include "support/ControllerTest.h"
 
 namespace vesprun {

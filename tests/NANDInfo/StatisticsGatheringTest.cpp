@@ -2,7 +2,7 @@
 
 #include "NANDInfo/NANDInfo.h"
 #include "NANDInfo/parsers/ORUStatsContext.h"
-#include "platform/host/StatisticsBufferBuilder.h"
+#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
 #include "support/ControllerTest.h"
 #include "support/WatchedRegistry.h"
 

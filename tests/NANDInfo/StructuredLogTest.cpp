@@ -2,8 +2,8 @@
 
 #include "NANDInfo/NandExporter.h"
 #include "NANDInfo/StructuredLogState.h"
+#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
 #include "common/TextForm.h"
-#include "platform/host/StatisticsBufferBuilder.h"
 #include "support/ControllerTest.h"
 #include "support/ListBuffers.h"
 #include "support/WatchedRegistry.h"

@@ -2,8 +2,8 @@
 
 #include "NANDInfo/APIErrorMessage.h"
 #include "NANDInfo/NandExporter.h"
+#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
 #include "platform/host/HostDeviceRegistry.h"
-#include "platform/host/StatisticsBufferBuilder.h"
 #include "support/WatchedRegistry.h"
 
 namespace vesprun {

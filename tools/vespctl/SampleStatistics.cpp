@@ -6,7 +6,8 @@
 
 #include "NANDInfo/parsers/ORUMSPKeyTable.h"
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
-#include "platform/host/StatisticsBufferBuilder.h"
+#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
+#include "common/LittleEndian.h"
 
 namespace vesprun {
 namespace {
@@ -20,8 +21,7 @@ constexpr std::uint64_t kBytesPerPage = 16384;
 constexpr std::uint64_t kPagesPerBand = 4608;
 constexpr std::uint64_t kPagesPerSlcBand = kPagesPerBand / 3;
 constexpr std::uint64_t kSectorsPerPage = kBytesPerPage / 4096;
-constexpr std::uint64_t kHoursInUse =
-    10'000;  // of power, in the 12,000 hours since it was formatted
+constexpr std::uint64_t kHoursInUse = 10'000;  // with power
 constexpr std::uint64_t kHoursSinceFormat = 12'000;
 constexpr std::uint64_t kSecondsPerHour = 3600;
 
@@ -108,9 +108,7 @@ Figures figuresAt(const Date& now, std::uint64_t hoursBack) {
 class Words {
  public:
   Words& add(std::uint32_t word) {
-    for (unsigned shift = 0; shift < 32; shift += 8) {
-      bytes.push_back(static_cast<std::uint8_t>(word >> shift));
-    }
+    appendLittleEndian(bytes, word, sizeof word);
     return *this;
   }
 

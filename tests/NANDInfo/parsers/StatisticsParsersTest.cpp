@@ -9,7 +9,7 @@
 #include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
-#include "platform/host/StatisticsBufferBuilder.h"
+#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
 
 namespace vesprun {
 namespace {

@@ -1,4 +1,4 @@
-#include "platform/host/StatisticsBufferBuilder.h"
+#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
 
 #include "NANDInfo/parsers/MSPRecord.h"
 #include "NANDInfo/parsers/ORUMSPKeyTable.h"
