@@ -4,11 +4,13 @@
 #include <cstdint>
 #include <functional>
 #include <istream>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <system_error>
 
 #include "platform/host/CounterStore.h"
+#include "platform/host/RealText.h"
 
 namespace vesprun {
 
@@ -26,6 +28,13 @@ template <typename T>
 bool parseWholeText(std::string_view text, T& value) {
   const auto [end, failure] = std::from_chars(text.data(), text.data() + text.size(), value);
   return failure == std::errc() && end == text.data() + text.size();
+}
+
+/// The same for the forms that a sample may have.
+inline bool parseWholeText(std::string_view text, double& value) {
+  const std::optional<double> real = parseReal(text);
+  value = real.value_or(value);
+  return real.has_value();
 }
 
 /// Sets scalars and appends samples, which keep their order for each key. The lines are read as a

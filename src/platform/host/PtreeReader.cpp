@@ -2,9 +2,7 @@
 
 #include <algorithm>
 #include <charconv>
-#include <cmath>
 #include <cstdint>
-#include <limits>
 #include <pugixml.hpp>
 #include <utility>
 
@@ -12,6 +10,7 @@
 #include "platform/host/Base64.h"
 #include "platform/host/PtreeSyntax.h"
 #include "platform/host/QuotedText.h"
+#include "platform/host/RealText.h"
 
 namespace vesprun {
 namespace {
@@ -29,24 +28,6 @@ std::optional<Number> parseInteger(std::string_view text) {
     return Number(large);
   }
   return std::nullopt;
-}
-
-std::optional<Number> parseReal(std::string_view text) {
-  if (text == "inf" || text == "-inf") {
-    const double infinity = std::numeric_limits<double>::infinity();
-    return Number(text.front() == '-' ? -infinity : infinity);
-  }
-  if (text == "nan") {
-    return Number(std::numeric_limits<double>::quiet_NaN());
-  }
-  // from_chars also knows names of its own ("infinity", "nan(...)").
-  if (text.find_first_not_of("0123456789.eE+-") != std::string_view::npos) {
-    return std::nullopt;
-  }
-  double real = 0;
-  const char* end = text.data() + text.size();
-  const auto [stop, failure] = std::from_chars(text.data(), end, real);
-  return failure == std::errc() && stop == end ? std::optional(Number(real)) : std::nullopt;
 }
 
 /// Turns the elements, whose syntax has been checked, into values. Offsets count from the root
