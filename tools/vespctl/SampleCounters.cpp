@@ -48,39 +48,6 @@ void readDisks(std::vector<ScalarReading>& readings) {
   }
 }
 
-/// /proc/net/dev: "  eth0: bytes packets ..." with eight figures received, then those sent.
-void readNetwork(std::vector<ScalarReading>& readings) {
-  std::ifstream stream("/proc/net/dev");
-  for (std::string line; std::getline(stream, line);) {
-    const auto colon = line.find(':');
-    if (colon == std::string::npos) {
-      continue;
-    }
-    const std::string name =
-        line.substr(line.find_first_not_of(' '), colon - line.find_first_not_of(' '));
-    std::istringstream fields(line.substr(colon + 1));
-    std::int64_t figures[9] = {};
-    for (std::int64_t& figure : figures) {
-      fields >> figure;
-    }
-    readings.push_back({"host.network." + name + ".bytesReceived", figures[0]});
-    readings.push_back({"host.network." + name + ".bytesSent", figures[8]});
-  }
-}
-
-/// A line of /proc/stat such as "ctxt 123456"; 0 when there is none.
-std::int64_t readSchedulerFigure(const std::string& wanted) {
-  std::ifstream stream("/proc/stat");
-  std::string name;
-  std::int64_t value = 0;
-  for (std::string line; std::getline(stream, line);) {
-    if (std::istringstream(line) >> name >> value && name == wanted) {
-      return value;
-    }
-  }
-  return 0;
-}
-
 std::int64_t availableMemory() {
   std::vector<ScalarReading> readings;
   readMemory(readings);
@@ -92,15 +59,57 @@ std::int64_t availableMemory() {
   return 0;
 }
 
+std::int64_t contextSwitches() { return readSchedulerFigure("ctxt").value_or(0); }
+
 }  // namespace
+
+// /proc/net/dev: "  eth0: bytes packets ..." with eight figures received, then those sent.
+std::vector<InterfaceReading> readInterfaces() {
+  std::vector<InterfaceReading> interfaces;
+  std::ifstream stream("/proc/net/dev");
+  for (std::string line; std::getline(stream, line);) {
+    const auto colon = line.find(':');
+    if (colon == std::string::npos) {
+      continue;  // the headings
+    }
+    std::istringstream words(line.substr(0, colon) + ' ' + line.substr(colon + 1));
+    std::string name;
+    std::int64_t figures[9] = {};
+    words >> name;
+    for (std::int64_t& figure : figures) {
+      words >> figure;
+    }
+    if (words) {
+      interfaces.push_back({name, figures[0], figures[8]});
+    }
+  }
+  return interfaces;
+}
+
+// A line of /proc/stat such as "ctxt 123456".
+std::optional<std::int64_t> readSchedulerFigure(std::string_view name) {
+  std::ifstream stream("/proc/stat");
+  std::string found;
+  std::int64_t value = 0;
+  for (std::string line; std::getline(stream, line);) {
+    if (std::istringstream(line) >> found >> value && found == name) {
+      return value;
+    }
+  }
+  return std::nullopt;
+}
 
 std::vector<ScalarReading> readKernelCounters() {
   std::vector<ScalarReading> readings;
   readMemory(readings);
   readDisks(readings);
-  readNetwork(readings);
-  readings.push_back({"host.scheduler.contextSwitches", readSchedulerFigure("ctxt")});
-  readings.push_back({"host.scheduler.forks", readSchedulerFigure("processes")});
+  for (const InterfaceReading& interface : readInterfaces()) {
+    const std::string key = "host.network." + interface.name;
+    readings.push_back({key + ".bytesReceived", interface.bytesReceived});
+    readings.push_back({key + ".bytesSent", interface.bytesSent});
+  }
+  readings.push_back({"host.scheduler.contextSwitches", contextSwitches()});
+  readings.push_back({"host.scheduler.forks", readSchedulerFigure("processes").value_or(0)});
   return readings;
 }
 
@@ -111,14 +120,14 @@ std::vector<DistributionReadings> takeReadingBurst() {
   DistributionReadings wakeUps{"host.latency.wakeUpMicroseconds", {}};
   DistributionReadings memory{"host.memory.availableKB", {}};
   DistributionReadings switches{"host.scheduler.contextSwitchesPerReading", {}};
-  std::int64_t lastSwitches = readSchedulerFigure("ctxt");
+  std::int64_t lastSwitches = contextSwitches();
   for (int i = 0; i < kReadings; ++i) {
     const auto start = SteadyClock::now();
     std::this_thread::sleep_for(kPause);
     const std::chrono::duration<double, std::micro> late = SteadyClock::now() - start - kPause;
     wakeUps.values.push_back(late.count());
     memory.values.push_back(static_cast<double>(availableMemory()));
-    const std::int64_t nowSwitches = readSchedulerFigure("ctxt");
+    const std::int64_t nowSwitches = contextSwitches();
     switches.values.push_back(static_cast<double>(nowSwitches - lastSwitches));
     lastSwitches = nowSwitches;
   }

@@ -1,7 +1,9 @@
 #pragma once
 
 #include <cstdint>
+#include <optional>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace vesprun {
@@ -17,6 +19,19 @@ struct DistributionReadings {
   std::string key;
   std::vector<double> values;
 };
+
+/// What a network interface has carried since it is there.
+struct InterfaceReading {
+  std::string name;
+  std::int64_t bytesReceived = 0;
+  std::int64_t bytesSent = 0;
+};
+
+std::vector<InterfaceReading> readInterfaces();
+
+/// A figure of the kernel's scheduler: "ctxt" (context switches), "processes" (forks), "btime"
+/// (when the machine started, in seconds since 1970).
+std::optional<std::int64_t> readSchedulerFigure(std::string_view name);
 
 /// Counters of the running kernel, as they stand now: memory, disks, network interfaces and the
 /// scheduler. What the kernel does not offer is left out.

@@ -1,6 +1,5 @@
 #include "SampleDescription.h"
 
-#include <nlohmann/json.hpp>
 #include <string>
 #include <string_view>
 
@@ -14,16 +13,19 @@
 namespace vesprun {
 namespace {
 
-using Json = nlohmann::ordered_json;
-
 constexpr std::string_view kSnapshotFile = "kernel/snapshot.bin";
 
 void writeFile(const DeviceDirectory& directory, std::string_view devicePath,
-               const std::string& content) {
+               std::string_view content) {
   std::string error;
   if (!replaceFile(directory.hostPath(devicePath), content, error)) {
     throw CommandFailure(error);
   }
+}
+
+void writeFile(const DeviceDirectory& directory, std::string_view devicePath,
+               const Bytes& content) {
+  writeFile(directory, devicePath, std::string(content.begin(), content.end()));
 }
 
 void appendItem(Bytes& snapshot, std::uint32_t type, std::uint64_t flags, const Bytes& data) {
@@ -34,7 +36,7 @@ void appendItem(Bytes& snapshot, std::uint32_t type, std::uint64_t flags, const 
 }
 
 /// A kernel task whose one thread has swapped out 3 GiB.
-std::string kernelSnapshot() {
+Bytes kernelSnapshot() {
   constexpr std::uint32_t kContainerBegin = 19;
   constexpr std::uint32_t kContainerEnd = 20;
   constexpr std::uint32_t kThreadIOStatistics = 2305;
@@ -58,7 +60,7 @@ std::string kernelSnapshot() {
   appendItem(snapshot, kContainerEnd, kThread, {});
   appendItem(snapshot, kContainerEnd, kTask, {});
   appendItem(snapshot, kBufferEnd, 0, {});
-  return {snapshot.begin(), snapshot.end()};
+  return snapshot;
 }
 
 /// A boot session with which the storage counters go into the daily log on the day of `now`, and on
@@ -71,21 +73,20 @@ std::string bootSession(const Date& now) {
 }  // namespace
 
 void describeSampleDevice(const DeviceDirectory& directory, const Date& now) {
-  const PropertyValue controller(writeSampleController(directory, now));
+  const PropertyDict controller = writeSampleController(directory, now);
   writeFile(directory, kSnapshotFile, kernelSnapshot());
   for (const SampleFile& file : sampleECCEvents()) {
     writeFile(directory, file.devicePath, file.content);
   }
-  const Json description{
-      {"kernel",
-       {{"snapshot", kSnapshotFile}, {"variables", {{"kern.bootsessionuuid", bootSession(now)}}}}},
-      {"purgeable",
-       {{"RECLAIMER_TOTAL_AVAILABLE", 4'310'708'224},
-        {"RECLAIMER_NONPURGEABLE_AMOUNT", 31'138'512'896}}},
-      {"registry", Json::array({Json::parse(jsonText(controller)), sampleNVRAMEntry()})},
+  const PropertyDict variables{{"kern.bootsessionuuid", bootSession(now)}};
+  const PropertyDict description{
+      {"kernel", PropertyDict{{"snapshot", kSnapshotFile}, {"variables", variables}}},
+      {"purgeable", PropertyDict{{"RECLAIMER_TOTAL_AVAILABLE", 4'310'708'224},
+                                 {"RECLAIMER_NONPURGEABLE_AMOUNT", 31'138'512'896}}},
+      {"registry", PropertyArray{controller, sampleNVRAMEntry()}},
       {"channels", sampleChannels()},
-      {"usage", sampleUsage()}};
-  writeFile(directory, "device.json", description.dump(2) + '\n');
+      {"usage", sampleUsage(now)}};
+  writeFile(directory, "device.json", indentedJsonText(description) + '\n');
 }
 
 }  // namespace vesprun
