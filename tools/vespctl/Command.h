@@ -19,11 +19,23 @@ class CommandFailure : public std::runtime_error {
 /// The platform of a device directory. Throws `CommandFailure` when there is none.
 std::unique_ptr<HostPlatform> openDevice(const std::string& directory);
 
-/// The whole of a file, "-" for standard input. Throws `CommandFailure` when it cannot be read.
+/// A device directory without what stands in its description. Throws `CommandFailure` when there is
+/// none.
+DeviceDirectory openDirectory(const std::string& directory);
+
+/// The whole of a file or pipe, "-" for standard input. Throws `CommandFailure` when it cannot be
+/// read.
 std::string readInput(const std::string& file);
+
+/// How a file that was given is called in a message: "-" is "standard input".
+std::string inputName(const std::string& file);
 
 /// Prints a value in its JSON form and ends the line.
 void printJson(const PropertyValue& value);
+
+/// Allows one command of those that `subject` has by now, and refuses any other word by naming
+/// them. That none is given is refused, too, when one is `needed`.
+void allowOneCommand(CLI::App& subject, bool needed = true);
 
 // Each subject adds its commands to vespctl in a file of its own.
 void addDeviceCommands(CLI::App& vespctl);

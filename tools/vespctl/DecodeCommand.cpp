@@ -132,7 +132,7 @@ void decode(const Arguments& arguments) {
   }
   const std::string content = readInput(arguments.file);
   if (content.empty()) {
-    throw CommandFailure(arguments.file + ": is empty");
+    throw CommandFailure(inputName(arguments.file) + ": is empty");
   }
   const Buffer buffer(reinterpret_cast<const std::uint8_t*>(content.data()), content.size());
   if (isSnapshot) {
@@ -140,7 +140,7 @@ void decode(const Arguments& arguments) {
     return;
   }
   if (layout->size != 0 && buffer.size() != layout->size) {
-    throw CommandFailure(arguments.file + ": has " + std::to_string(buffer.size()) +
+    throw CommandFailure(inputName(arguments.file) + ": has " + std::to_string(buffer.size()) +
                          " bytes, not " + std::to_string(layout->size));
   }
   printJson(layout->decode(buffer));

@@ -1,15 +1,10 @@
 #include <filesystem>
-#include <fstream>
-#include <iostream>
-#include <iterator>
 #include <vector>
 
 #include "Command.h"
 #include "SampleDevice.h"
 #include "driver/DailyDriver.h"
 #include "platform/host/AtomicFile.h"
-#include "platform/host/JsonForm.h"
-#include "platform/host/WholeFile.h"
 
 namespace vesprun {
 namespace {
@@ -24,6 +19,9 @@ void initDevice(const std::string& path, bool sample) {
     throw CommandFailure(path + (failure ? ": " + failure.message() : ": is not empty"));
   }
   std::filesystem::permissions(path, std::filesystem::perms::owner_all, failure);
+  if (failure) {
+    throw CommandFailure(path + ": " + failure.message());
+  }
   std::string error;
   const std::optional<DeviceDirectory> directory = DeviceDirectory::open(path, error);
   if (!directory) {
@@ -56,29 +54,6 @@ void runJob(const std::string& path, const std::vector<std::string>& arguments) 
 
 }  // namespace
 
-std::unique_ptr<HostPlatform> openDevice(const std::string& directory) {
-  std::string error;
-  std::unique_ptr<HostPlatform> device = HostPlatform::open(directory, error);
-  if (!device) {
-    throw CommandFailure(error);
-  }
-  return device;
-}
-
-std::string readInput(const std::string& file) {
-  if (file == "-") {
-    return {std::istreambuf_iterator<char>(std::cin), {}};
-  }
-  std::string error;
-  std::optional<std::string> content = readWholeFile(file, error);
-  if (!content) {
-    throw CommandFailure(error);
-  }
-  return *std::move(content);
-}
-
-void printJson(const PropertyValue& value) { std::cout << jsonText(value) << '\n'; }
-
 void addDeviceCommands(CLI::App& vespctl) {
   struct Arguments {
     std::string directory;
@@ -90,7 +65,7 @@ void addDeviceCommands(CLI::App& vespctl) {
   CLI::App* init = vespctl.add_subcommand("init", "Makes a device directory");
   init->add_option("DIR", arguments->directory, "A folder that is missing or empty")->required();
   init->add_flag("--sample", arguments->sample,
-                 "Fills it with a whitelist and counters of this machine");
+                 "Fills it with a whitelist, counters of this machine and a storage controller");
   init->callback([arguments] { initDevice(arguments->directory, arguments->sample); });
 
   CLI::App* run = vespctl.add_subcommand("run", "Does what vesprun does, on that device");

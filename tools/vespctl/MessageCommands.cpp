@@ -44,18 +44,9 @@ std::string appsDocument(const std::string& file) {
   std::string error;
   std::optional<PropertyArray> apps = appDataFromJson(readInput(file), error);
   if (!apps) {
-    throw CommandFailure(file + ": " + error);
+    throw CommandFailure(inputName(file) + ": " + error);
   }
   return document({{"operation", std::int64_t{2}}, {"app_data", *std::move(apps)}});
-}
-
-DeviceDirectory openDirectory(const std::string& path) {
-  std::string error;
-  std::optional<DeviceDirectory> directory = DeviceDirectory::open(path, error);
-  if (!directory) {
-    throw CommandFailure(error);
-  }
-  return *std::move(directory);
 }
 
 /// A connection to the message service of a device.
@@ -187,7 +178,6 @@ void addMessageCommands(CLI::App& vespctl) {
 
   CLI::App* send = vespctl.add_subcommand("send", "Sends messages to a running vesprun");
   send->add_option("DIR", arguments->device, "The device directory")->required();
-  send->require_subcommand(1);
 
   send->add_subcommand("logging", "Notifies the logging status")->callback([arguments] {
     sendDocument(arguments->device, operationDocument(0));
@@ -213,6 +203,7 @@ void addMessageCommands(CLI::App& vespctl) {
   CLI::App* raw = send->add_subcommand("raw", "Sends a ptree document as it is");
   raw->add_option("FILE", arguments->file, "The document; - for standard input")->required();
   raw->callback([arguments] { sendDocument(arguments->device, readInput(arguments->file)); });
+  allowOneCommand(*send);
 }
 
 }  // namespace vesprun

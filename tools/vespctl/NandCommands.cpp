@@ -13,6 +13,7 @@
 #include "NANDInfo/StructuredLogState.h"
 #include "platform/host/FileDescriptor.h"
 #include "platform/host/JsonForm.h"
+#include "platform/host/SystemError.h"
 #include "telemetry/DiskInfo.h"
 #include "telemetry/NVRAMStatistics.h"
 #include "vesprun.h"
@@ -142,7 +143,11 @@ constexpr NandVerb kVerbs[] = {
 /// print there, and would come between a reader and the result.
 class StandardOutputAside {
  public:
-  StandardOutputAside() : _kept(dup(STDOUT_FILENO)) { dup2(STDERR_FILENO, STDOUT_FILENO); }
+  StandardOutputAside() : _kept(dup(STDOUT_FILENO)) {
+    if (!_kept.isOpen() || dup2(STDERR_FILENO, STDOUT_FILENO) < 0) {
+      throw CommandFailure(systemError("standard output"));
+    }
+  }
   ~StandardOutputAside() {
     std::fflush(stdout);
     dup2(_kept.get(), STDOUT_FILENO);
@@ -173,7 +178,6 @@ void addNandCommands(CLI::App& vespctl) {
   CLI::App* nand = vespctl.add_subcommand("nand", "Asks a device for its storage statistics");
   const auto arguments = std::make_shared<NandArguments>();
   nand->add_option("DIR", arguments->device, "The device directory")->required();
-  nand->require_subcommand(1);
   for (const NandVerb& verb : kVerbs) {
     CLI::App* command = nand->add_subcommand(verb.name, verb.help);
     if (verb.addOptions != nullptr) {
@@ -181,6 +185,7 @@ void addNandCommands(CLI::App& vespctl) {
     }
     command->callback([arguments, &verb] { callVerb(verb, *arguments); });
   }
+  allowOneCommand(*nand);
 }
 
 }  // namespace vesprun

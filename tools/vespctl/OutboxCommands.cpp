@@ -2,6 +2,8 @@
 #include <filesystem>
 #include <iostream>
 #include <sstream>
+#include <system_error>
+#include <utility>
 
 #include "Command.h"
 #include "DailyLogView.h"
@@ -94,7 +96,28 @@ void showSystemLog(const DeviceDirectory& directory) {
   });
 }
 
-void showLog(const std::filesystem::path& file) {
+/// A text log: the lines, those with fields parted by semicolons as a line for each field.
+void showText(const std::string& content, bool inFull) {
+  constexpr std::size_t kShownFields = 24;
+  std::vector<std::string> fields;
+  std::istringstream lines(content);
+  for (std::string line; std::getline(lines, line);) {
+    std::istringstream parts(line);
+    const char* indentation = "  ";
+    for (std::string part; std::getline(parts, part, ';');) {
+      fields.push_back(std::exchange(indentation, "    ") + part);
+    }
+  }
+  const std::size_t shown = inFull ? fields.size() : std::min(fields.size(), kShownFields);
+  for (std::size_t i = 0; i < shown; ++i) {
+    std::cout << fields[i] << '\n';
+  }
+  if (shown < fields.size()) {
+    std::cout << "    … " << fields.size() - shown << " more; vespctl show DIR logs has all\n";
+  }
+}
+
+void showLog(const std::filesystem::path& file, bool inFull) {
   std::cout << file.filename().string() << '\n';
   std::string error;
   const std::optional<std::string> content = readWholeFile(file, error);
@@ -109,7 +132,7 @@ void showLog(const std::filesystem::path& file) {
     std::cout << "  header     " << (value ? textForm(*value) : headerError) << '\n';
   }
   if (file.extension() != ".ptree") {
-    std::cout << *content;
+    showText(*content, inFull);
     return;
   }
   const std::optional<PropertyValue> log = readPtree(*content, error);
@@ -120,20 +143,24 @@ void showLog(const std::filesystem::path& file) {
   }
 }
 
-void showLogs(const DeviceDirectory& directory) {
+void showLogs(const DeviceDirectory& directory, bool inFull) {
+  const std::string folder = directory.hostPath("outbox/logs");
   std::vector<std::filesystem::path> files;
   std::error_code error;
-  for (std::filesystem::directory_iterator entry(directory.hostPath("outbox/logs"), error), end;
-       !error && entry != end; entry.increment(error)) {
+  for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
+       entry.increment(error)) {
     const std::filesystem::path extension = entry->path().extension();
     if (entry->path().filename().string().front() != '.' &&
         (extension == ".ptree" || extension == ".log")) {
       files.push_back(entry->path());
     }
   }
+  if (error && error != std::errc::no_such_file_or_directory) {
+    throw CommandFailure(folder + ": " + error.message());
+  }
   std::sort(files.begin(), files.end());
   for (const std::filesystem::path& file : files) {
-    showLog(file);
+    showLog(file, inFull);
   }
 }
 
@@ -149,42 +176,34 @@ void showAll(const DeviceDirectory& directory) {
   showTitle("structured records");
   showRecords(directory, false);
   showTitle("submitted logs");
-  showLogs(directory);
+  showLogs(directory, false);
 }
 
 }  // namespace
 
 void addOutboxCommands(CLI::App& vespctl) {
   const auto path = std::make_shared<std::string>();
-  const auto directory = [path] {
-    std::string error;
-    std::optional<DeviceDirectory> opened = DeviceDirectory::open(*path, error);
-    if (!opened) {
-      throw CommandFailure(error);
-    }
-    return *std::move(opened);
-  };
-
   CLI::App* show = vespctl.add_subcommand("show", "Shows what the runs left in the outbox");
   show->add_option("DIR", *path, "The device directory")->required();
-  show->require_subcommand(0, 1);
-  show->callback([show, directory] {
+  show->callback([show, path] {
     if (show->get_subcommands().empty()) {
-      showAll(directory());
+      showAll(openDirectory(*path));
     }
   });
   const auto addPart = [&](const char* name, const char* description, auto showPart) {
-    show->add_subcommand(name, description)->callback([directory, showPart] {
-      showPart(directory());
+    show->add_subcommand(name, description)->callback([path, showPart] {
+      showPart(openDirectory(*path));
     });
   };
-  addPart("logs", "The submitted logs alone", showLogs);
+  addPart("logs", "The submitted logs alone, in full",
+          [](const DeviceDirectory& device) { showLogs(device, true); });
   addPart("events", "The analytics events alone, with their payloads",
           [](const DeviceDirectory& device) { showEvents(device, true); });
   addPart("records", "The structured records alone, in full",
           [](const DeviceDirectory& device) { showRecords(device, true); });
   addPart("notifications", "The posted notifications alone", showNotifications);
   addPart("log", "The system log alone", showSystemLog);
+  allowOneCommand(*show, false);
 }
 
 }  // namespace vesprun

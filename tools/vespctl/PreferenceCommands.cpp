@@ -1,34 +1,11 @@
-#include <cstdio>
-#include <vector>
-
 #include "Command.h"
+#include "Complaints.h"
 #include "platform/host/HostPreferences.h"
 #include "platform/host/JsonForm.h"
 #include "platform/host/QuotedText.h"
 
 namespace vesprun {
 namespace {
-
-/// Takes the complaints of the preferences, which become the command's own.
-class Complaints final : public SystemLog {
- public:
-  bool keeps(LogLevel level) const override { return level == LogLevel::Error; }
-  void write(LogLevel level, std::string_view message) override {
-    if (keeps(level)) {
-      _messages.emplace_back(message);
-    }
-  }
-
-  const std::vector<std::string>& messages() const { return _messages; }
-  void failIfAny() const {
-    if (!_messages.empty()) {
-      throw CommandFailure(_messages.front());
-    }
-  }
-
- private:
-  std::vector<std::string> _messages;
-};
 
 struct PreferenceArguments {
   std::string device;
@@ -37,15 +14,6 @@ struct PreferenceArguments {
   std::string key;
   std::string json;
 };
-
-DeviceDirectory openDirectory(const std::string& path) {
-  std::string error;
-  std::optional<DeviceDirectory> directory = DeviceDirectory::open(path, error);
-  if (!directory) {
-    throw CommandFailure(error);
-  }
-  return *std::move(directory);
-}
 
 void printPreferences(const PreferenceArguments& arguments, bool wholeDomain) {
   const DeviceDirectory directory = openDirectory(arguments.device);
@@ -74,16 +42,14 @@ void changePreference(const PreferenceArguments& arguments, std::optional<Proper
   if (!preferences.LGSPreferencesSynchronize(arguments.domain)) {
     complaints.failIfAny();
   }
-  for (const std::string& message : complaints.messages()) {
-    std::fprintf(stderr, "vespctl: %s\n", message.c_str());
-  }
+  complaints.print();
 }
 
 void setPreference(const PreferenceArguments& arguments) {
   std::string error;
   std::optional<PropertyValue> value = valueFromJsonText(arguments.json, error);
   if (!value) {
-    throw CommandFailure(quotedText(arguments.json) + ": " + error);
+    throw CLI::ValidationError("JSON", quotedText(arguments.json) + ": " + error);
   }
   changePreference(arguments, std::move(value));
 }
@@ -95,8 +61,6 @@ void addPreferenceCommands(CLI::App& vespctl) {
   const auto arguments = std::make_shared<PreferenceArguments>();
   prefs->add_option("DIR", arguments->device, "The device directory")->required();
   prefs->add_option("--user", arguments->user, "Whose preferences, instead of mobile's");
-  prefs->require_subcommand(1);
-  prefs->fallthrough();
 
   CLI::App* get = prefs->add_subcommand("get", "Prints a value, or all values of a domain");
   get->add_option("DOMAIN", arguments->domain)->required();
@@ -113,6 +77,11 @@ void addPreferenceCommands(CLI::App& vespctl) {
   remove->add_option("DOMAIN", arguments->domain)->required();
   remove->add_option("KEY", arguments->key)->required();
   remove->callback([arguments] { changePreference(*arguments, std::nullopt); });
+
+  for (CLI::App* command : {get, set, remove}) {
+    command->fallthrough();  // --user may stand behind the command, too
+  }
+  allowOneCommand(*prefs);
 }
 
 }  // namespace vesprun

@@ -8,7 +8,7 @@ void printPtree(const std::string& file) {
   std::string error;
   const std::optional<PropertyValue> value = readPtree(readInput(file), error);
   if (!value) {
-    throw CommandFailure(file + ": " + error);
+    throw CommandFailure(inputName(file) + ": " + error);
   }
   printJson(*value);
 }

@@ -10,7 +10,6 @@ int main(int argc, char** argv) {
   vesprun::openStandardStreams();
   CLI::App vespctl("Sets up a device directory, runs the daily job on it and shows what came out.",
                    "vespctl");
-  vespctl.require_subcommand(1);
   vesprun::addDeviceCommands(vespctl);
   vesprun::addCounterCommands(vespctl);
   vesprun::addPreferenceCommands(vespctl);
@@ -20,6 +19,7 @@ int main(int argc, char** argv) {
   vesprun::addPtreeCommands(vespctl);
   vesprun::addFieldsCommand(vespctl);
   vesprun::addDecodeCommand(vespctl);
+  vesprun::allowOneCommand(vespctl);
   try {
     vespctl.parse(argc, argv);
   } catch (const CLI::Success& help) {

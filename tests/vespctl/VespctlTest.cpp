@@ -1,0 +1,140 @@
+#include <gmock/gmock.h>
+#include <sys/wait.h>
+
+#include <cstdlib>
+
+#include "support/TemporaryFolder.h"
+
+namespace vesprun {
+namespace {
+
+using ::testing::AllOf;
+using ::testing::HasSubstr;
+using ::testing::IsEmpty;
+using ::testing::Not;
+using ::testing::StartsWith;
+
+/// The program itself, on the device directory "$D", which `init` has made.
+class VespctlTest : public ::testing::Test {
+ protected:
+  VespctlTest() { EXPECT_EQ(run("init \"$D\""), 0) << error; }
+
+  /// What follows `vespctl` in a shell; the exit status, with what was printed in `output` and
+  /// `error`.
+  int run(const std::string& arguments) {
+    const std::string script = "D='" + folder.path("device") + "'; cd '" + folder.path() +
+                               "'; '" VESPCTL_PROGRAM "' " + arguments;
+    folder.write("script", script);
+    const int status = std::system(("bash '" + folder.path("script") + "' >'" +
+                                    folder.path("output") + "' 2>'" + folder.path("error") + '\'')
+                                       .c_str());
+    output = folder.read("output");
+    error = folder.read("error");
+    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+  }
+
+  TemporaryFolder folder;
+  std::string output;
+  std::string error;
+};
+
+TEST_F(VespctlTest, SaysWhatIsWrongWithItsArguments) {
+  const struct {
+    const char* arguments;
+    const char* complaint;
+  } cases[] = {
+      {"frob", "unknown command \"frob\"; one of init, run,"},
+      {"", "a command is missing; one of init, run,"},
+      {"counters \"$D\" frob 1", "unknown command \"frob\"; one of set, add, sample, import, dump"},
+      {"counters \"$D\"", "a command is missing; one of set"},
+      {"counters \"$D\" set k 1 2", "VALUE: At Most 1"},
+      {"ptree a b", "not expected"},
+      {"show \"$D\" frob", "unknown command \"frob\"; one of logs"},
+      {"prefs \"$D\" get d k --frob", "not expected"},
+      {"counters \"$D\" set k abc", "\"abc\" is not a signed 64-bit integer"},
+      {"counters \"$D\" set k 1 --day x", "\"x\" is not a day number"},
+      {"counters \"$D\" sample k 1 infinity", "\"infinity\" is not a double"},
+      {"counters \"$D\" dump --from a", "\"a\" is not a day number"},
+      {"prefs \"$D\" set d k '{'", "JSON: \"{\""},
+      {"fields frob", "there is no list \"frob\""},
+  };
+  for (const auto& [arguments, complaint] : cases) {
+    EXPECT_EQ(run(arguments), 2) << arguments;
+    EXPECT_THAT(error, HasSubstr(complaint)) << arguments;
+  }
+  EXPECT_EQ(run("counters \"$D\" dump"), 0);
+  EXPECT_EQ(output, "") << "nothing was changed";
+}
+
+TEST_F(VespctlTest, SaysWhyItFailed) {
+  folder.write("apps", R"([{"version": "1"}, {"uuid": "0011223-34455-6677-8899-AABBCCDDEEFF"}])");
+  folder.write("bad", "sample\t1\tk\tnan(x)\t0\n");
+  folder.write("file/outbox/logs", "");
+  const struct {
+    const char* arguments;
+    const char* complaint;
+  } cases[] = {
+      {"show nowhere", "nowhere: No such file"},
+      {"show file logs", "file/outbox/logs: Not a directory"},
+      {"init file", "file: is not empty"},
+      {"ptree - </tmp", "standard input: Is a directory"},
+      {"ptree nowhere", "nowhere: No such file"},
+      {"ptree <(echo '<dict>')", "line 1: "},
+      {"prefs \"$D\" get d k", "no key \"k\" in domain \"d\""},
+      {"counters \"$D\" import bad", "bad: line 1: \"nan(x)\" is not a double"},
+      {"send \"$D\" apps apps", "apps: app 2: \"uuid\": not a UUID text"},
+      {"send \"$D\" apps - <<<'[7]'", "standard input: app 1: not a dictionary"},
+      {"send \"$D\" apps - <<<'[{\"arch\": true}]'", "app 1: \"arch\": not a signed 64-bit"},
+      {"nand \"$D\" disk >&-", "standard output: "},
+  };
+  for (const auto& [arguments, complaint] : cases) {
+    EXPECT_EQ(run(arguments), 1) << arguments;
+    EXPECT_THAT(error, AllOf(StartsWith("vespctl: "), HasSubstr(complaint))) << arguments;
+    EXPECT_EQ(std::count(error.begin(), error.end(), '\n'), 1) << error;
+  }
+}
+
+TEST_F(VespctlTest, TellsOfADamagedDatabase) {
+  const char* const database = "device/var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
+  const char* const kept = "is not a database; kept as ";
+  folder.write(database, "no database");
+  EXPECT_EQ(run("counters \"$D\" set k 1"), 0);
+  EXPECT_THAT(error, HasSubstr(kept));
+  EXPECT_EQ(run("counters \"$D\" set k 2 --day 5"), 0);
+  EXPECT_THAT(error, IsEmpty());
+  folder.write(database, "no database");
+  EXPECT_EQ(run("counters \"$D\" dump"), 1);
+  EXPECT_THAT(error, HasSubstr(kept));
+  EXPECT_EQ(std::count(error.begin(), error.end(), '\n'), 1) << error;
+}
+
+TEST_F(VespctlTest, ShowsSubmittedLogs) {
+  std::string text = "Date: today\n\nvesprun: a:0";
+  for (int i = 1; i < 50; ++i) {
+    text += ";a:" + std::to_string(i);
+  }
+  folder.write("device/outbox/logs/0001-165-Storage.log", text);
+  folder.write("device/outbox/logs/0002-193-log.ptree", R"(<?xml version="1.0" encoding="UTF-8"?>
+<ptree version="1.0"><dict>
+<key>TBStartDate</key><date>2024-03-05T00:00:00Z</date>
+<key>TBScalars</key><dict><key>k</key><integer>7</integer></dict>
+<key>TBDistributions</key><dict><key>d</key><array>
+<real>1</real><real>3</real><real>2</real><real>2</real><integer>2</integer></array></dict>
+<key>TBDistributionsHistogram</key><dict><key>d</key><dict>
+<key>(-inf, 2]</key><integer>1</integer><key>(2, inf)</key><integer>-4</integer></dict></dict>
+</dict></ptree>)");
+  EXPECT_EQ(run("show \"$D\""), 0);
+  EXPECT_THAT(output,
+              AllOf(HasSubstr("\n  vesprun: a:0\n    a:1\n"), HasSubstr("\n    … "),
+                    HasSubstr(" more; "), Not(HasSubstr("a:49")), HasSubstr("\n0002-193-log")));
+  EXPECT_EQ(run("show \"$D\" logs"), 0);
+  EXPECT_THAT(output, AllOf(HasSubstr("\n    a:49\n0002-193-log.ptree\n"),
+                            HasSubstr("  day        2024-03-05T00:00:00Z\n"),
+                            HasSubstr("  created    (absent)\n"), HasSubstr("    k  7\n"),
+                            HasSubstr("count 2, min 1, mean 2, max 3, standard deviation 1\n"),
+                            HasSubstr("  (-inf, 2]  " + std::string(40, '#') + " 1\n"),
+                            HasSubstr("   (2, inf)   -4\n")));
+}
+
+}  // namespace
+}  // namespace vesprun
