@@ -33,27 +33,23 @@
 #include "platform/host/WholeFile.h"
 
 namespace vesprun {
-namespace {
-
-/// A service that is made when it is first asked for, from whichever thread.
-template <typename Service>
-class Lazy {
- public:
-  template <typename... Arguments>
-  Service& get(Arguments&&... arguments) {
-    std::call_once(_once, [&] { _service.emplace(std::forward<Arguments>(arguments)...); });
-    return *_service;
-  }
-
- private:
-  std::once_flag _once;
-  std::optional<Service> _service;
-};
-
-}  // namespace
-
 // Destroyed from the last to the first: what writes at its end stands below what it needs for that.
 struct HostPlatform::Services {
+  /// A service that is made when it is first asked for, from whichever thread.
+  template <typename Service>
+  class Lazy {
+   public:
+    template <typename... Arguments>
+    Service& get(Arguments&&... arguments) {
+      std::call_once(_once, [&] { _service.emplace(std::forward<Arguments>(arguments)...); });
+      return *_service;
+    }
+
+   private:
+    std::once_flag _once;
+    std::optional<Service> _service;
+  };
+
   Services(DeviceDirectory deviceDirectory, DeviceDescription deviceDescription)
       : directory(std::move(deviceDirectory)),
         description(std::move(deviceDescription)),
