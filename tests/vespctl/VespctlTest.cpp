@@ -85,7 +85,7 @@ TEST_F(VespctlTest, SaysWhyItFailed) {
       {"send \"$D\" apps apps", "apps: app 2: \"uuid\": not a UUID text"},
       {"send \"$D\" apps - <<<'[7]'", "standard input: app 1: not a dictionary"},
       {"send \"$D\" apps - <<<'[{\"arch\": true}]'", "app 1: \"arch\": not a signed 64-bit"},
-      {"nand \"$D\" disk >&-", "standard output: "},
+      {"nand \"$D\" disk >&-", "standard output cannot be written"},
   };
   for (const auto& [arguments, complaint] : cases) {
     EXPECT_EQ(run(arguments), 1) << arguments;

@@ -7,7 +7,7 @@
 #include "platform/host/StandardStreams.h"
 
 int main(int argc, char** argv) {
-  vesprun::openStandardStreams();
+  vesprun::holdStandardStreams();
   CLI::App vespctl("Sets up a device directory, runs the daily job on it and shows what came out.",
                    "vespctl");
   vesprun::addDeviceCommands(vespctl);

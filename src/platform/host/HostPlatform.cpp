@@ -33,6 +33,7 @@
 #include "platform/host/WholeFile.h"
 
 namespace vesprun {
+
 // Destroyed from the last to the first: what writes at its end stands below what it needs for that.
 struct HostPlatform::Services {
   /// A service that is made when it is first asked for, from whichever thread.

@@ -5,13 +5,12 @@
 
 namespace vesprun {
 
-void openStandardStreams() {
-  int file = 0;
-  do {
-    file = open("/dev/null", O_RDWR);  // takes the lowest number that is free
-  } while (file >= 0 && file <= STDERR_FILENO);
-  if (file >= 0) {
-    close(file);
+void holdStandardStreams() {
+  for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
+    if (fcntl(stream, F_GETFD) == -1) {
+      // The lowest free number is taken: the streams below are there already.
+      open("/dev/null", stream == STDIN_FILENO ? O_WRONLY : O_RDONLY);
+    }
   }
 }
 

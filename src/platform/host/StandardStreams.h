@@ -2,8 +2,9 @@
 
 namespace vesprun {
 
-/// Opens "/dev/null" for each standard stream that the process was started without. A file that was
-/// opened in its place would take what is printed. To be called before anything is opened.
-void openStandardStreams();
+/// Takes the place of each standard stream that the process was started without, so that no file of
+/// the device gets it and with it all that is printed. Using the stream fails as if it were closed.
+/// To be called before anything is opened.
+void holdStandardStreams();
 
 }  // namespace vesprun
