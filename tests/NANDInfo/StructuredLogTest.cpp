@@ -16,16 +16,19 @@ class StructuredLog : public ControllerTest {
   ~StructuredLog() override { forgetStructuredLogState(); }
 
   /// A controller that delivers every list, with a write amplification of 1.25. Of several answers
-  /// to a request the first counts: `tunnel` stands before its own.
-  void startController(
-      const std::string& tunnel = "",
-      const std::string& properties =
-          R"({"Controller Characteristics": {"chip-id": "KX3", "manufacturer-id": "", "num-bus": 1}})") {
-    start(R"({"class": "QuillQNS3NVMeController", "properties": )" + properties +
-          R"(, "userClient": {"tunnel": [)" + tunnel + (tunnel.empty() ? "" : ",") +
+  /// to a request the first counts: `tunnel` stands before its own. Its characteristics are its
+  /// parent's, unless it has some; those of its sibling and its child are no concern of its.
+  void startController(const std::string& tunnel = "", const std::string& properties = "{}") {
+    const std::string unusable = R"("properties": {"Controller Characteristics": 5}})";
+    start(R"({"class": "Bus", "properties": {"Controller Characteristics":
+                  {"chip-id": "KX3", "manufacturer-id": "", "num-bus": 1}}, "children": [
+              {"class": "Sibling", )" +
+          unusable + R"(, {"class": "QuillQNS3NVMeController", "properties": )" + properties +
+          R"(, "children": [{"class": "Child", )" + unusable + R"(], "userClient": {"tunnel": [)" +
+          tunnel + (tunnel.empty() ? "" : ",") +
           R"({"opcode": 13, "file": "13.bin"}, {"opcode": 11, "file": "11.bin"},
              {"opcode": 17, "kind": 0, "file": "17.bin"}, {"opcode": 17, "kind": 1, "file": "17.bin"},
-             {"opcode": 17, "kind": 2, "file": "17.bin"}, {"opcode": 15, "file": "15.bin"}]}})");
+             {"opcode": 17, "kind": 2, "file": "17.bin"}, {"opcode": 15, "file": "15.bin"}]}}]})");
     StatisticsBufferBuilder statistics;
     statistics.add(20, {100}).add(50, {256}).add(49, {16384}).add(4, {81920});
     device().write("13.bin", statistics.add(129, {128}).add(84, {80}).bytes());

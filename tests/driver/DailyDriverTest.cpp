@@ -14,12 +14,13 @@
 #include "platform/host/PollMainLoop.h"
 #include "platform/host/PtreeWriter.h"
 #include "platform/host/ServiceSocket.h"
-#include "support/TestDevice.h"
+#include "support/WatchedRegistry.h"
+#include "telemetry/TodaysScalars.h"
 
 namespace vesprun {
 namespace {
 
-using ::testing::ElementsAreArray, ::testing::IsEmpty, ::testing::SizeIs;
+using ::testing::Contains, ::testing::ElementsAreArray, ::testing::IsEmpty, ::testing::SizeIs;
 
 constexpr const char* kService = "com.quill.aggregated.vesprun";
 constexpr const char* kStoredDayKey = "LastCrashLogSerializationDateInDaysSince1970";
@@ -153,6 +154,41 @@ TEST_F(DailyDriverTest, TheDayCheckRunsTheTasksOncePerDay) {
   }
   EXPECT_EQ(dayBefore(std::numeric_limits<std::int32_t>::min()),
             std::numeric_limits<std::int32_t>::max());
+}
+
+constexpr std::string_view kTaskDevice =
+    R"({"clock": "2024-03-05T09:15:02Z", "system": {"buildVersion": "2B"},
+        "channels": [{"name": "c", "value": 3}]})";
+const std::string kOSChange = "default: OS change since last run ((null) -> 2B)";
+
+TEST_F(DailyDriverTest, TheTasksReportCountAndSynchronize) {
+  TestDevice device(kTaskDevice);
+  device.writeWhitelistJson(R"({"G": {"ScalarKeyPrefixes": {"": {}}}})");
+  device.platform().tallybook().TBClientAddValueForScalarKey("k", 1);
+  const AppInfoList apps{PropertyDict{{"bundle", "b"}}};
+  runDailyTasks(TestDevice::kToday, &apps);
+  ASSERT_THAT(device.documents(), SizeIs(1));
+  const PropertyDict document = device.documents()[0];
+  EXPECT_EQ(*document.find("TBScalars")->dict()->find("k"), PropertyValue(1));
+  EXPECT_TRUE(document.contains("TBActivatedAppInfo"));
+  EXPECT_EQ(writtenScalars(device, "com.quill.tapline."), (Scalars{{"com.quill.tapline.c", 3}}));
+  EXPECT_THAT(device.log(), Contains(kOSChange));
+}
+
+TEST_F(DailyDriverTest, ATaskThatThrowsStopsNoOther) {
+  struct Exhausted : WatchedRegistry {
+    using WatchedRegistry::WatchedRegistry;
+    RegistryHandle DevRegServiceGetMatchingService(const std::string& /*className*/) override {
+      throw std::bad_alloc();
+    }
+  };
+  TestDevice device(kTaskDevice);
+  const Exhausted registry(device.platform());
+  runDayCheck(nullptr);
+  EXPECT_THAT(device.log(), Contains("error: unexpected failure: std::bad_alloc"));
+  EXPECT_EQ(device.log().back(), kOSChange);
+  EXPECT_THAT(writtenScalars(device, "com.quill.homeshell."), SizeIs(2));
+  EXPECT_EQ(storedDay(device), PropertyValue(kYesterday));
 }
 
 TEST_F(DailyDriverTest, MessagesLeadToWhatTheirStateAllows) {
