@@ -17,7 +17,10 @@ class PeerConnection {
 
   virtual ~PeerConnection() = default;
 
+  /// To be called before `start`; a message without a handler is dropped.
   virtual void setMessageHandler(MessageHandler handler) = 0;
+
+  /// From now on messages are taken.
   virtual void start() = 0;
 };
 
@@ -30,10 +33,14 @@ class ServiceListener {
 
   virtual ~ServiceListener() = default;
 
+  /// To be called before `start`; without a handler every peer is turned away.
   virtual void setPeerHandler(PeerHandler handler) = 0;
+
+  /// From now on peers are accepted.
   virtual void start() = 0;
 };
 
+/// The platform's services by which processes reach each other.
 class MessageService {
  public:
   virtual ~MessageService() = default;

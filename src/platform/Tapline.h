@@ -41,6 +41,7 @@ class TaplineChannels {
   virtual void TaplineIterate(const Visitor& visitor) const = 0;
 };
 
+/// Reads the channels that were subscribed to.
 class TaplineSubscription {
  public:
   virtual ~TaplineSubscription() = default;

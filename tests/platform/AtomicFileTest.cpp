@@ -1,5 +1,8 @@
 #include "platform/host/AtomicFile.h"
 
+#include <fcntl.h>
+#include <sys/file.h>
+
 #include <sstream>
 #include <thread>
 
@@ -127,6 +130,20 @@ TEST_F(JsonLinesTest, takesBackALineThatDidNotFit) {
   EXPECT_EQ(folder.read("log.jsonl"), "{}\n");
   EXPECT_TRUE(lines.append("{}", error)) << error;
   EXPECT_EQ(folder.read("log.jsonl"), "{}\n{}\n");
+}
+
+TEST_F(JsonLinesTest, waitOnceForALockThatNobodyReleases) {
+  folder.write("log.jsonl", "");
+  JsonLines lines(folder.path("log.jsonl"), std::chrono::milliseconds(50));
+  {
+    const FileDescriptor stopped(open(folder.path("log.jsonl").c_str(), O_RDONLY));
+    flock(stopped.get(), LOCK_EX);
+    for (int line = 0; line < 1000; ++line) {
+      EXPECT_FALSE(lines.append("{}", error));
+    }
+    EXPECT_EQ(error, folder.path("log.jsonl") + ": another process keeps it locked");
+  }
+  EXPECT_TRUE(lines.append("{}", error)) << error;
 }
 
 }  // namespace

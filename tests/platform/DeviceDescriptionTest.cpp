@@ -13,13 +13,6 @@ std::string errorOf(const std::string& text) {
 TEST(DeviceDescription, NamesTheEntryThatIsWrong) {
   const std::pair<const char*, const char*> cases[] = {
       {R"([])", "not a dictionary"},
-      {R"({"kernel": {"a": 1)",
-       "parse error at line 1, column 19: syntax error while parsing object - unexpected end of "
-       "input; expected '}'"},
-      {R"({"system": {}, "kernel": {}, "system": {}})", "system: given twice"},
-      {R"({"registry": {"properties": {"a": 18446744073709551616}}})",
-       "registry.properties.a: the integer 18446744073709551616 does not fit 64 bits"},
-      {R"({"usage": {"delaySeconds": 1e999}})", "number overflow parsing '1e999'"},
       {R"({"colour": 1})", "colour: unknown entry"},
       {R"({"clock": "today"})", "clock: not a date such as 2024-03-05T09:15:02Z"},
       {R"({"logLevel": "loud"})",
@@ -38,6 +31,11 @@ TEST(DeviceDescription, NamesTheEntryThatIsWrong) {
       {R"({"registry": [{"class": "C", "userClient": {"scalarMethods": {"3": {"LP": 1}}}}]})",
        "registry[0].userClient.scalarMethods.3.LP: not a four-character code"},
       {R"({"usage": {"delaySeconds": -1}})", "usage.delaySeconds: negative"},
+      {R"({"usage": {"delaySeconds": 1e999}})",
+       "\"usage\" > \"delaySeconds\": number overflow parsing '1e999'"},
+      {R"({"channels": [{"value": 18446744073709551616}]})",
+       "\"channels\" > [0] > \"value\": the integer 18446744073709551616 does not fit 64 bits"},
+      {R"({"clock": "today", "clock": "today"})", "\"clock\": there twice"},
   };
   for (const auto& [text, expected] : cases) {
     EXPECT_EQ(errorOf(text), expected) << text;
@@ -45,7 +43,8 @@ TEST(DeviceDescription, NamesTheEntryThatIsWrong) {
   EXPECT_EQ(errorOf(R"({"logBlacklist": ["a", 5], "userVolume": {"blockSize": 4294967295,
                         "blocks": 18446744073709551615, "available": 0}})"),
             "accepted");
-  EXPECT_THAT(errorOf("{\n\"clock\": }"), testing::HasSubstr("line 2"));
+  EXPECT_THAT(errorOf("{\n\"clock\": }"),
+              testing::StartsWith("parse error at line 2, column 10: "));
   EXPECT_NE(errorOf(std::string(100'000, '[')), "accepted");
 }
 

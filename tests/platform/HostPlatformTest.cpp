@@ -1,8 +1,11 @@
 #include "platform/host/HostPlatform.h"
 
 #include <cerrno>
+#include <future>
+#include <stdexcept>
 #include <thread>
 
+#include "support/HostServiceTest.h"
 #include "support/TestDevice.h"
 
 namespace vesprun {
@@ -13,9 +16,12 @@ TEST(HostPlatform, SaysWhyADeviceCannotBeOpened) {
   EXPECT_EQ(HostPlatform::open("/nowhere/at/all", error), nullptr);
   EXPECT_EQ(error, "/nowhere/at/all: No such file or directory");
   const TemporaryFolder folder;
-  folder.write("device.json", R"({"timeZone": "Moon/Crater"})");
-  EXPECT_EQ(HostPlatform::open(folder.path(), error), nullptr);
-  EXPECT_THAT(error, testing::EndsWith("device.json: timeZone: unknown time zone \"Moon/Crater\""));
+  for (const std::string zone : {"Moon/Crater", "Europe", "zone.tab"}) {
+    folder.write("device.json", R"({"timeZone": ")" + zone + "\"}");
+    EXPECT_EQ(HostPlatform::open(folder.path(), error), nullptr);
+    EXPECT_THAT(error,
+                testing::EndsWith("device.json: timeZone: unknown time zone \"" + zone + '"'));
+  }
   folder.write("device.json", R"({"usage": 1})");
   EXPECT_EQ(HostPlatform::open(folder.path(), error), nullptr);
   EXPECT_THAT(error, testing::EndsWith("device.json: usage: not a dictionary"));
@@ -119,13 +125,63 @@ TEST(Outbox, SubmissionsAtOnceNeverShareANumber) {
   }
 }
 
-TEST(Outbox, AFailedSubmissionLeavesNothing) {
+TEST(Outbox, AFailedSubmissionLeavesWhatWasThereAndNothingElse) {
   TestDevice device;
-  device.write("outbox/logs", "a file in the way");
-  const auto writer = [](LogFileHandle& file) { file.write("text"); };
-  EXPECT_FALSE(platform().logsmith().LGSWriteLogForSubmission("165", "S", nullptr, writer));
-  EXPECT_THAT(device.log(), testing::ElementsAre(testing::StartsWith("error: ")));
-  EXPECT_EQ(device.read("outbox/logs"), "a file in the way");
+  device.write("outbox/logs/0001-165-S.log", "earlier");
+  const PropertyDict header{{"n", 1}};
+  const auto submit = [&] {
+    return platform().logsmith().LGSWriteLogForSubmission(
+        "165", "S", &header, [](LogFileHandle& file) { file.write(std::string(200'000, 'x')); });
+  };
+  {
+    const FileSizeLimit limit(100'000);
+    EXPECT_FALSE(submit());
+  }
+  rlimit before{};
+  getrlimit(RLIMIT_NOFILE, &before);
+  const int lowestFree = dup(0);
+  close(lowestFree);
+  for (int allowed = 0; allowed < 4; ++allowed) {
+    const rlimit limited{static_cast<rlim_t>(lowestFree + allowed), before.rlim_max};
+    setrlimit(RLIMIT_NOFILE, &limited);
+    EXPECT_FALSE(submit()) << allowed;
+    setrlimit(RLIMIT_NOFILE, &before);
+  }
+  EXPECT_THAT(device.log(), testing::SizeIs(5));
+  EXPECT_THAT(device.log(), testing::Each(testing::StartsWith("error: ")));
+  EXPECT_EQ(device.names("outbox/logs"), std::vector<std::string>{"0001-165-S.log"});
+  EXPECT_EQ(device.read("outbox/logs/0001-165-S.log"), "earlier");
+}
+
+TEST(HostServices, SayWhichFileCannotBeRead) {
+  TestDevice device(R"({"kernel": {"snapshot": "absent"}})");
+  device.write("kernel/ecc", "a file in the way of the queue");
+  device.write("whitelist/note", "a folder in the way of a file");
+  std::array<std::uint8_t, 72> event{};
+  std::size_t length = 0;
+  EXPECT_EQ(platform().kernel().sysctlbyname("kern.next_ecc_event", event, length), EIO);
+  EXPECT_EQ(platform().kernel().captureSnapshot(0), std::nullopt);
+  EXPECT_EQ(platform().fileSystem().readFile("/none"), std::nullopt);
+  EXPECT_EQ(platform().fileSystem().readFile("/whitelist"), std::nullopt);
+  EXPECT_THAT(device.log(),
+              testing::ElementsAre(testing::EndsWith("kernel/ecc: Not a directory"),
+                                   testing::EndsWith("absent: No such file or directory"),
+                                   testing::EndsWith("whitelist: Is a directory")));
+}
+
+TEST(HostMurmur, OutlivesAHandlerThatThrows) {
+  TestDevice device;
+  std::promise<void> called;
+  const auto feed = platform().murmur().createUsageFeed(nullptr);
+  feed->usageToDateForNameKindReply({}, {}, [&](const auto*) {
+    called.set_value();
+    throw std::runtime_error("no room");
+  });
+  called.get_future().wait();
+  while (device.log().empty()) {
+    std::this_thread::yield();
+  }
+  EXPECT_THAT(device.log(), testing::ElementsAre("error: usage feed: no room"));
 }
 
 TEST(DiagnosticHeader, IsLiveWhenItIsNotDescribed) {

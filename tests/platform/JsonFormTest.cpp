@@ -3,7 +3,6 @@
 #include <gmock/gmock.h>
 #include <cmath>
 #include <limits>
-#include <nlohmann/json.hpp>
 
 namespace vesprun {
 namespace {
@@ -47,15 +46,10 @@ TEST(JsonForm, readsBackWhatItWrites) {
   const std::optional<PropertyValue> value = valueFromJsonText(text, error);
   ASSERT_TRUE(value) << error;
   EXPECT_EQ(jsonText(*value), text);  // also the order, and that a float is one
-  const std::optional<PropertyValue> parsed =
-      valueFromJson(nlohmann::ordered_json::parse(text), error);
-  ASSERT_TRUE(parsed) << error;
-  EXPECT_EQ(jsonText(*parsed), text);
   EXPECT_EQ(valueOf("18446744073709551615")->number()->kind(), NumberKind::UInt64);
   EXPECT_EQ(valueOf("7")->number()->kind(), NumberKind::Int64);
   EXPECT_EQ(valueOf("7.0")->number()->kind(), NumberKind::Double);
   EXPECT_EQ(valueOf(R"({"float":1})")->number()->kind(), NumberKind::Float);
-  EXPECT_EQ(jsonText(*valueOf(R"({"a":1,"b":2,"a":3})")), R"({"a":3,"b":2})");
 }
 
 TEST(JsonForm, takesObjectsForDictionariesUnlessTheyAreOneOfTheFour) {
@@ -77,12 +71,14 @@ TEST(JsonForm, namesWhatItRefuses) {
       {"{\"a\":[1,null]}", "\"a\" > [1]: null"},
       {"[18446744073709551616]", "[0]: the integer 18446744073709551616 does not fit"},
       {"-9223372036854775809", "does not fit"},
-      {"1e999", "number overflow"},
+      {"{\"a\":[1e999]}", "\"a\" > [0]: number overflow"},
+      {R"([{"a":1,"b":2,"a":3}])", "[0] > \"a\": there twice"},
       {R"({"a":{"real":"Inf"}})", "\"a\": a \"real\" of \"Inf\""},
       {R"([{"data":"A"}])", "[0]: \"A\" is not base64"},
       {R"({"date":"today"})", "\"today\" is not a date"},
       {R"({"float":1e39})", "single precision"},
-      {std::string(201, '[') + std::string(201, ']'), "nested deeper than 200"},
+      {std::string(201, '[') + std::string(201, ']'),
+       "[0] > [0] > [0] > [0] > [0] > [0] > [0] > [0] > \xE2\x80\xA6: nested deeper than 200"},
       {std::string(1'000'000, '['), "nested deeper than 200"}};
   for (const auto& [text, message] : cases) {
     std::string error;
@@ -90,8 +86,6 @@ TEST(JsonForm, namesWhatItRefuses) {
     EXPECT_THAT(error, HasSubstr(message));
   }
   std::string error;
-  EXPECT_FALSE(valueFromJson(nlohmann::ordered_json::parse(R"({"a":[{"b":null}]})"), error));
-  EXPECT_EQ(error, "\"a\": [0]: \"b\": null is no value");
   EXPECT_TRUE(valueFromJsonText(std::string(200, '[') + std::string(200, ']'), error)) << error;
 }
 

@@ -1,5 +1,6 @@
 #include <thread>
 
+#include "platform/host/HostClock.h"
 #include "platform/host/HostPreferences.h"
 #include "support/HostServiceTest.h"
 
@@ -17,13 +18,14 @@ constexpr const char* kOneKey =
 class PreferencesTest : public HostServiceTest {
  protected:
   /// What a process that starts now finds.
-  PropertyDict found() { return HostPreferences(device, log).valuesOfDomain("a"); }
-  HostPreferences preferences{device, log};
+  PropertyDict found() { return HostPreferences(device, clock, log).valuesOfDomain("a"); }
+  HostClock clock{Date{1709630102, 0}};  // 2024-03-05 09:15:02
+  HostPreferences preferences{device, clock, log};
 };
 
 TEST_F(PreferencesTest, areThereForTheNextProcess) {
   {
-    HostPreferences here(device, log);
+    HostPreferences here(device, clock, log);
     here.LGSPreferencesSetValue("first", 1, "a");
     here.LGSPreferencesSetValue("gone", 1, "a");
     here.LGSPreferencesSetValue("gone", std::nullopt, "a");
@@ -37,9 +39,9 @@ TEST_F(PreferencesTest, areThereForTheNextProcess) {
   }
   EXPECT_EQ(found(), (PropertyDict{{"first", 1}, {"second", "text"}}));
   EXPECT_THAT(folder.names(kFolder), ElementsAre("a.ptree", "b.ptree"));
-  HostPreferences(device, log, "root").LGSPreferencesSetValue("k", 1, "a");
+  HostPreferences(device, clock, log, "root").LGSPreferencesSetValue("k", 1, "a");
   EXPECT_THAT(folder.names("var/root/Library/Preferences"), ElementsAre("a.ptree"));
-  HostPreferences(device, log, PreferenceFolder{"Library/Logsmith"})
+  HostPreferences(device, clock, log, PreferenceFolder{"Library/Logsmith"})
       .LGSPreferencesSetValue("k", 1, "com.x");
   EXPECT_THAT(folder.names("Library/Logsmith"), ElementsAre("com.x.ptree"));
   EXPECT_THAT(log.messages, IsEmpty());
@@ -60,7 +62,7 @@ TEST_F(PreferencesTest, areNotWrittenWithoutADifference) {
 }
 
 TEST_F(PreferencesTest, keepWhatOtherProcessesChanged) {
-  HostPreferences there(device, log);
+  HostPreferences there(device, clock, log);
   EXPECT_EQ(preferences.LGSPreferencesGetValue("x", "a"), std::nullopt);
   there.LGSPreferencesSetValue("x", 1, "a");
   there.LGSPreferencesSetValue("y", 1, "a");
@@ -85,7 +87,7 @@ TEST_F(PreferencesTest, loseNothingToProcessesAndThreadsThatWriteAtOnce) {
     }
   };
   const pid_t child = startProcess([&] { write(preferences, "child"); });
-  HostPreferences others(device, log);
+  HostPreferences others(device, clock, log);
   std::thread shared([&] { write(preferences, "shared"); });
   std::thread own([&] { write(others, "own"); });
   write(preferences, "main");
@@ -100,7 +102,7 @@ TEST_F(PreferencesTest, keepADocumentThatIsNoneBesideTheNewOne) {
        {"<ptree version=\"1.0\">\n<dict>\n<key>first", "<ptree version=\"1.0\"><true/></ptree>"}) {
     log.messages.clear();
     folder.write(kFile, malformed);
-    HostPreferences here(device, log);
+    HostPreferences here(device, clock, log);
     EXPECT_EQ(here.LGSPreferencesGetValue("first", "a"), std::nullopt);
     EXPECT_EQ(here.LGSPreferencesGetValue("other", "a"), std::nullopt);
     EXPECT_THAT(log.messages, ElementsAre(StartsWith(folder.path(kFile) + ": line ")));
@@ -113,7 +115,7 @@ TEST_F(PreferencesTest, keepADocumentThatIsNoneBesideTheNewOne) {
   }
   const std::vector<std::string> names = folder.names(kFolder);
   ASSERT_EQ(names.size(), 3U);
-  EXPECT_THAT(names[1], StartsWith("a.ptree.unreadable-20"));
+  EXPECT_THAT(names[1], StartsWith("a.ptree.unreadable-20240305T091502Z"));
   EXPECT_THAT(folder.read(std::string(kFolder) + '/' + names[1]), StartsWith("<ptree"));
 }
 
@@ -138,7 +140,7 @@ TEST_F(PreferencesTest, refuseNamesThatLeadElsewhereAndValuesThatNoDocumentCarri
     EXPECT_FALSE(preferences.LGSPreferencesSynchronize(domain));
     EXPECT_EQ(preferences.LGSPreferencesGetValue("k", domain), std::nullopt);
   }
-  HostPreferences other(device, log, "../mobile");
+  HostPreferences other(device, clock, log, "../mobile");
   EXPECT_EQ(log.messages.back(), "\"../mobile\" cannot be the name of a user");
   other.LGSPreferencesSetValue("k", 1, "a");
   EXPECT_FALSE(other.LGSPreferencesSynchronize("a"));

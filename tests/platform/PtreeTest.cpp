@@ -118,7 +118,8 @@ TEST(PtreeWriter, namesThePlaceOfWhatADocumentCannotCarry) {
     nested = PropertyArray{std::move(nested)};
   }
   EXPECT_EQ(readOf(writtenOf(nested)), nested);
-  EXPECT_THAT(refuses(PropertyArray{nested}), HasSubstr("[0]: nested deeper than 200 levels"));
+  EXPECT_THAT(refuses(PropertyArray{nested}),
+              HasSubstr("\xE2\x80\xA6: nested deeper than 200 levels"));
 }
 
 TEST(PtreeReader, readsBackEveryKindOfValue) {

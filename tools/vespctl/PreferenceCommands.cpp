@@ -1,5 +1,6 @@
 #include "Command.h"
 #include "Complaints.h"
+#include "platform/host/HostClock.h"
 #include "platform/host/HostPreferences.h"
 #include "platform/host/JsonForm.h"
 #include "platform/host/QuotedText.h"
@@ -18,7 +19,8 @@ struct PreferenceArguments {
 void printPreferences(const PreferenceArguments& arguments, bool wholeDomain) {
   const DeviceDirectory directory = openDirectory(arguments.device);
   Complaints complaints;
-  HostPreferences preferences(directory, complaints, arguments.user);
+  HostClock clock(std::nullopt);
+  HostPreferences preferences(directory, clock, complaints, arguments.user);
   const PropertyDict values = preferences.valuesOfDomain(arguments.domain);
   complaints.failIfAny();
   if (wholeDomain) {
@@ -36,7 +38,8 @@ void printPreferences(const PreferenceArguments& arguments, bool wholeDomain) {
 void changePreference(const PreferenceArguments& arguments, std::optional<PropertyValue> value) {
   const DeviceDirectory directory = openDirectory(arguments.device);
   Complaints complaints;
-  HostPreferences preferences(directory, complaints, arguments.user);
+  HostClock clock(std::nullopt);
+  HostPreferences preferences(directory, clock, complaints, arguments.user);
   preferences.LGSPreferencesSetValue(arguments.key, std::move(value), arguments.domain);
   complaints.failIfAny();
   if (!preferences.LGSPreferencesSynchronize(arguments.domain)) {

@@ -173,7 +173,7 @@ bool AtomicFile::replace(const std::string& name, std::string& error, const Fold
     _unfinishedName.clear();
     return syncFolder(error);
   }
-  if (held == nullptr && !lockFile(_folderDescriptor, LOCK_EX, kLongestLockWait, _folder, error)) {
+  if (held == nullptr && !takeLock(folder, LOCK_EX, kLongestLockWait, _folder, error)) {
     return false;
   }
   const bool replaced = replaceThroughHiddenName(name, error);

@@ -1,6 +1,5 @@
 #include "platform/host/CounterFile.h"
 
-#include <sys/file.h>
 #include <sys/stat.h>
 
 #include <algorithm>
@@ -9,9 +8,9 @@
 #include <cstdio>
 #include <string_view>
 
-#include "common/Date.h"
 #include "platform/host/AtomicFile.h"
 #include "platform/host/FileLock.h"
+#include "platform/host/NameAside.h"
 #include "platform/host/SystemError.h"
 
 namespace vesprun {
@@ -63,7 +62,7 @@ bool CounterFile::use(SqliteTransaction::Kind kind, const std::function<bool(Cou
         return false;
       }
     }
-    shared = FolderLock::take(folder, LOCK_SH, _longestWait, error);
+    shared = FolderLock::take(folder, error, FolderLock::Kind::Shared, _longestWait);
     if (!shared) {
       return false;
     }
@@ -103,7 +102,8 @@ bool CounterFile::make(std::string& error) {
   if (!folder) {
     return false;
   }
-  const auto exclusive = FolderLock::take(*folder, LOCK_EX, _longestWait, error);
+  const auto exclusive =
+      FolderLock::take(*folder, error, FolderLock::Kind::Exclusive, _longestWait);
   return exclusive && makeLocked(error);
 }
 
@@ -141,7 +141,7 @@ bool CounterFile::makeLocked(std::string& error) {
 std::optional<std::string> CounterFile::replace(const Damage& damage, std::string& error) {
   const std::string folder = _directory.hostPath(kFolder);
   const std::string path = folder + '/' + kName;
-  const auto exclusive = FolderLock::take(folder, LOCK_EX, _longestWait, error);
+  const auto exclusive = FolderLock::take(folder, error, FolderLock::Kind::Exclusive, _longestWait);
   if (!exclusive) {
     return std::nullopt;
   }
@@ -166,9 +166,8 @@ std::optional<std::string> CounterFile::replace(const Damage& damage, std::strin
 }
 
 std::string CounterFile::unusedNameAside() const {
-  std::string time = dateText({_clock.now().seconds, 0});
-  std::erase_if(time, [](char c) { return c == '-' || c == ':'; });
-  const std::string aside = _directory.hostPath(kFolder) + '/' + kName + ".corrupt-" + time;
+  const std::string aside =
+      nameAside(_directory.hostPath(kFolder) + '/' + kName, "corrupt", _clock);
   std::string name = aside;
   const auto isTaken = [&name] {
     return exists(name) || std::any_of(kCompanions.begin(), kCompanions.end(),

@@ -42,29 +42,34 @@ constexpr const char* kSchema = R"(
   PRAGMA user_version = 1;
 )";
 
-/// Sees to it that rows come in order and with keys that can have been written.
-class RowCheck {
- public:
-  explicit RowCheck(const SqliteConnection& connection) : _connection(connection) {}
-
-  void check(std::int64_t day, std::string_view key) {
+/// Gives `deliver` the rows of day, key and a third column, which `statement` selects between two
+/// days in the order of days and keys, for which the key begins with `keyPrefix`; until it sets its
+/// last argument. Sees to it that all rows come in order and with keys that can have been written.
+template <typename Deliver>
+void forEachRow(const SqliteConnection& connection, const char* statement,
+                std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
+                const Deliver& deliver) {
+  SqliteStatement rows(connection, statement);
+  rows.bind(1, minDay).bind(2, maxDay);
+  std::int64_t lastDay = std::numeric_limits<std::int64_t>::min();
+  std::string lastKey;
+  bool stop = false;
+  while (!stop && rows.step()) {
+    const std::int64_t day = rows.integer(0);
+    const std::string_view key = rows.text(1);
     if (!isXmlText(key)) {
-      _connection.failAsCorrupt("a key is no text");
+      connection.failAsCorrupt("a key is no text");
     }
-    if (!_first && (day < _day || (day == _day && key <= _key))) {
-      _connection.failAsCorrupt("rows are out of order");
+    if (day < lastDay || (day == lastDay && key <= lastKey)) {
+      connection.failAsCorrupt("rows are out of order");
     }
-    _first = false;
-    _day = day;
-    _key = key;
+    lastDay = day;
+    lastKey = key;
+    if (key.starts_with(keyPrefix)) {
+      deliver(key, static_cast<std::int32_t>(day), rows.integer(2), stop);
+    }
   }
-
- private:
-  const SqliteConnection& _connection;
-  bool _first = true;
-  std::int64_t _day = 0;
-  std::string _key;
-};
+}
 
 void appendBytes(Bytes& bytes, const void* value, std::size_t size) {
   const std::size_t end = bytes.size();
@@ -153,9 +158,7 @@ void CounterStore::addToScalar(std::int32_t day, std::string_view key, std::int6
   SqliteStatement& read = writer().readScalar.bind(1, day).bind(2, key);
   const std::int64_t stored = read.step() ? read.integer(0) : 0;
   read.reset();
-  setScalar(day, key,
-            static_cast<std::int64_t>(static_cast<std::uint64_t>(stored) +
-                                      static_cast<std::uint64_t>(value)));
+  setScalar(day, key, wrappingSum(stored, value));
 }
 
 std::int64_t CounterStore::distributionForWriting(std::int32_t day, std::string_view key) {
@@ -215,40 +218,23 @@ void CounterStore::appendSamples(std::int32_t day, std::string_view key,
 
 void CounterStore::readScalars(std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
                                const TBHistory::ScalarRowHandler& handler) {
-  SqliteStatement rows(
-      _connection,
-      "SELECT day, key, value FROM scalar WHERE day BETWEEN ? AND ? ORDER BY day, key");
-  rows.bind(1, minDay).bind(2, maxDay);
-  RowCheck row(_connection);
-  bool stop = false;
-  while (!stop && rows.step()) {
-    const std::string_view key = rows.text(1);
-    row.check(rows.integer(0), key);
-    if (key.starts_with(keyPrefix)) {
-      handler(key, static_cast<std::int32_t>(rows.integer(0)), rows.integer(2), stop);
-    }
-  }
+  forEachRow(_connection,
+             "SELECT day, key, value FROM scalar WHERE day BETWEEN ? AND ? ORDER BY day, key",
+             keyPrefix, minDay, maxDay, handler);
 }
 
 void CounterStore::readDistributions(std::string_view keyPrefix, std::int32_t minDay,
                                      std::int32_t maxDay,
                                      const TBHistory::DistributionRowHandler& handler) {
-  SqliteStatement rows(
-      _connection,
-      "SELECT day, key, id FROM distribution WHERE day BETWEEN ? AND ? ORDER BY day, key");
-  rows.bind(1, minDay).bind(2, maxDay);
   ChunkEnumerator values(_connection);
-  RowCheck row(_connection);
-  bool stop = false;
-  while (!stop && rows.step()) {
-    const std::string_view key = rows.text(1);
-    row.check(rows.integer(0), key);
-    if (key.starts_with(keyPrefix)) {
-      values.start(rows.integer(2));
-      handler(key, static_cast<std::int32_t>(rows.integer(0)), values, stop);
-      values.rethrowFailure();
-    }
-  }
+  forEachRow(_connection,
+             "SELECT day, key, id FROM distribution WHERE day BETWEEN ? AND ? ORDER BY day, key",
+             keyPrefix, minDay, maxDay,
+             [&](std::string_view key, std::int32_t day, std::int64_t id, bool& stop) {
+               values.start(id);
+               handler(key, day, values, stop);
+               values.rethrowFailure();
+             });
 }
 
 std::optional<std::int32_t> CounterStore::nextDay(std::int64_t day) {

@@ -18,6 +18,12 @@ namespace vesprun {
 /// most. Otherwise `error` says what is wrong with it.
 bool isCounterKey(std::string_view key, std::string& error);
 
+/// The sum of two counts, which wraps around.
+inline std::int64_t wrappingSum(std::int64_t left, std::int64_t right) {
+  return static_cast<std::int64_t>(static_cast<std::uint64_t>(left) +
+                                   static_cast<std::uint64_t>(right));
+}
+
 /// One recorded value of a distribution.
 struct Sample {
   double value;

@@ -8,7 +8,6 @@
 
 #include "common/Date.h"
 #include "platform/host/JsonForm.h"
-#include "platform/host/StrictJson.h"
 
 namespace vesprun {
 namespace {
@@ -227,7 +226,7 @@ DevicePropertyDescription readProperties(const Entry& entry) {
   return properties;
 }
 
-VolumeDescription readVolume(const Entry& entry) {
+FileSystemStatistics readVolume(const Entry& entry) {
   entry.dictionaryOf({"blockSize", "blocks", "available"});
   return {entry.required("blockSize").integer<std::uint32_t>(),
           entry.required("blocks").integer<std::uint64_t>(),
@@ -391,11 +390,7 @@ UserClientDescription readUserClient(const Entry& entry) {
   return client;
 }
 
-std::vector<RegistryEntryDescription> readRegistry(const Entry& entry, int depth = 0) {
-  constexpr int kDeepest = 100;
-  if (depth > kDeepest) {
-    entry.fail("nested too deeply");
-  }
+std::vector<RegistryEntryDescription> readRegistry(const Entry& entry) {
   std::vector<RegistryEntryDescription> entries;
   for (const Entry& element : entry.elements()) {
     element.dictionaryOf(
@@ -410,7 +405,7 @@ std::vector<RegistryEntryDescription> readRegistry(const Entry& entry, int depth
       described.properties = properties.propertyDict();
     }
     if (const Entry children = element["children"]) {
-      described.children = readRegistry(children, depth + 1);
+      described.children = readRegistry(children);
     }
     if (const Entry userClient = element["userClient"]) {
       described.userClient = readUserClient(userClient);
@@ -485,7 +480,7 @@ DeviceDescription readDevice(const Entry& root) {
 
 std::optional<DeviceDescription> readDeviceDescription(const std::string& text,
                                                        std::string& error) {
-  const std::optional<Json> root = parseStrictJson(text, error);
+  const std::optional<Json> root = jsonFromText(text, error);
   if (!root) {
     return std::nullopt;
   }
@@ -493,8 +488,8 @@ std::optional<DeviceDescription> readDeviceDescription(const std::string& text,
     return readDevice(Entry(&*root, ""));
   } catch (const DescriptionError& descriptionError) {
     error = descriptionError.text;
+    return std::nullopt;
   }
-  return std::nullopt;
 }
 
 }  // namespace vesprun

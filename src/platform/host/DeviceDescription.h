@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "common/PropertyDict.h"
+#include "platform/FileSystem.h"
 #include "platform/Kernel.h"
 #include "platform/SystemLog.h"
 
@@ -42,12 +43,6 @@ struct DevicePropertyDescription {
 };
 
 /// Blocks of a file system, as `statfs` counts them.
-struct VolumeDescription {
-  std::uint32_t blockSize;
-  std::uint64_t blocks;
-  std::uint64_t available;
-};
-
 struct SubmissionDescription {
   bool enabled = true;
   bool fails = false;
@@ -145,7 +140,7 @@ struct DeviceDescription {
   LogLevel logLevel = LogLevel::Info;
   SystemDescription system;
   DevicePropertyDescription properties;
-  AnswerDescription<VolumeDescription> userVolume;
+  AnswerDescription<FileSystemStatistics> userVolume;
   SubmissionDescription submission;
   PropertyArray logBlacklist;
   EventHubDescription events;

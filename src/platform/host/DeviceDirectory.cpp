@@ -3,8 +3,9 @@
 #include <sys/stat.h>
 
 #include <cerrno>
-#include <cstring>
 #include <utility>
+
+#include "platform/host/SystemError.h"
 
 namespace vesprun {
 namespace {
@@ -19,7 +20,7 @@ bool isFolder(const std::string& path) {
 std::optional<DeviceDirectory> DeviceDirectory::open(const std::string& path, std::string& error) {
   struct stat status {};
   if (stat(path.c_str(), &status) != 0) {
-    error = path + ": " + std::strerror(errno);
+    error = systemError(path);
     return std::nullopt;
   }
   if (!S_ISDIR(status.st_mode)) {
@@ -47,7 +48,7 @@ std::optional<std::string> DeviceDirectory::makeFolder(std::string_view devicePa
     end = folder.find('/', end + 1);
     const std::string part = folder.substr(0, end);
     if (mkdir(part.c_str(), 0700) != 0 && (errno != EEXIST || !isFolder(part))) {
-      error = part + ": " + std::strerror(errno);
+      error = systemError(part);
       return std::nullopt;
     }
   }

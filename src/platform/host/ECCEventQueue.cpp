@@ -8,6 +8,7 @@
 #include <cstring>
 #include <filesystem>
 #include <optional>
+#include <system_error>
 #include <vector>
 
 #include "platform/host/SystemError.h"
@@ -16,7 +17,6 @@
 namespace vesprun {
 namespace {
 
-/// In the order of their names. A folder that is not there holds none.
 std::vector<std::string> eventFiles(const std::string& folder, std::error_code& error) {
   std::vector<std::string> files;
   for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
@@ -24,9 +24,6 @@ std::vector<std::string> eventFiles(const std::string& folder, std::error_code& 
     if (entry->path().extension() == ".bin") {
       files.push_back(entry->path());
     }
-  }
-  if (error == std::errc::no_such_file_or_directory) {
-    error.clear();
   }
   std::sort(files.begin(), files.end());
   return files;
@@ -38,7 +35,7 @@ int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length)
   const std::string folder = _directory.hostPath("kernel/ecc");
   std::error_code failure;
   const std::vector<std::string> files = eventFiles(folder, failure);
-  if (failure) {
+  if (failure && failure != std::errc::no_such_file_or_directory) {
     _log.write(LogLevel::Error, folder + ": " + failure.message());
     return EIO;
   }

@@ -21,7 +21,8 @@ class ECCEventQueue {
 
   /// Takes the oldest event out of the queue. 0, and the bytes in `buffer`; otherwise an error
   /// number: ENOENT when the queue is empty, EINVAL when the buffer is not of an event's length,
-  /// EIO when a file is in the way that cannot be removed.
+  /// EIO, and an error in the system log, when the folder cannot be read or a file is in the way
+  /// that cannot be removed.
   ///
   /// A file that is not an event (of another length, or not to be read) is renamed to
   /// NAME.bin.unusable, an error in the system log says why, and the next one is taken.

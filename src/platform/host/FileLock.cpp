@@ -3,18 +3,18 @@
 #include <fcntl.h>
 #include <sys/file.h>
 
+#include <cerrno>
 #include <thread>
-#include <utility>
 
 #include "platform/host/SystemError.h"
 
 namespace vesprun {
 
-bool lockFile(const FileDescriptor& file, int operation, std::chrono::milliseconds longestWait,
+bool takeLock(int descriptor, int operation, std::chrono::milliseconds longestWait,
               const std::string& path, std::string& error) {
-  constexpr std::chrono::milliseconds kPause(2);
+  constexpr std::chrono::milliseconds kPause(1);
   const auto end = std::chrono::steady_clock::now() + longestWait;
-  while (flock(file.get(), operation | LOCK_NB) != 0) {
+  while (flock(descriptor, operation | LOCK_NB) != 0) {
     if (errno != EWOULDBLOCK && errno != EINTR) {
       error = systemError(path);
       return false;
@@ -28,19 +28,15 @@ bool lockFile(const FileDescriptor& file, int operation, std::chrono::millisecon
   return true;
 }
 
-std::optional<FolderLock> FolderLock::take(const std::string& folder, std::string& error) {
-  return take(folder, LOCK_EX, kLongestLockWait, error);
-}
-
-std::optional<FolderLock> FolderLock::take(const std::string& folder, int operation,
-                                           std::chrono::milliseconds longestWait,
-                                           std::string& error) {
+std::optional<FolderLock> FolderLock::take(const std::string& folder, std::string& error, Kind kind,
+                                           std::chrono::milliseconds longestWait) {
   FileDescriptor descriptor(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
   if (!descriptor.isOpen()) {
     error = systemError(folder);
     return std::nullopt;
   }
-  if (!lockFile(descriptor, operation, longestWait, folder, error)) {
+  if (!takeLock(descriptor.get(), kind == Kind::Shared ? LOCK_SH : LOCK_EX, longestWait, folder,
+                error)) {
     return std::nullopt;
   }
   return FolderLock(std::move(descriptor));

@@ -3,29 +3,31 @@
 #include <chrono>
 #include <optional>
 #include <string>
+#include <utility>
 
 #include "platform/host/FileDescriptor.h"
 
 namespace vesprun {
 
-/// How long a lock is waited for that others hold for a moment only: a process that was stopped
-/// while it held one must not stop every later run.
-inline constexpr std::chrono::milliseconds kLongestLockWait{5000};
+/// How long a lock of another process is waited for: long enough for any of ours that is running,
+/// not for one that is stopped.
+inline constexpr std::chrono::milliseconds kLongestLockWait(20'000);
 
-/// Locks an open file or folder, `operation` being LOCK_SH or LOCK_EX, until it is closed or
-/// unlocked. False, with a text in `error` that names `path`, when it cannot be had within
-/// `longestWait`.
-bool lockFile(const FileDescriptor& file, int operation, std::chrono::milliseconds longestWait,
+/// Takes the lock (LOCK_SH or LOCK_EX) of the open file or folder at `path`, waiting `longestWait`
+/// at most. False, with a text in `error` that names the path, when it cannot be had.
+bool takeLock(int descriptor, int operation, std::chrono::milliseconds longestWait,
               const std::string& path, std::string& error);
 
-/// A lock on a folder that is held as long as the object lives.
+/// Keeps other processes, and other holders in this one, from replacing files in a folder.
 class FolderLock {
  public:
-  /// Keeps other processes, and other holders in this one, from replacing files in the folder.
-  static std::optional<FolderLock> take(const std::string& folder, std::string& error);
-  /// The same as `lockFile`.
-  static std::optional<FolderLock> take(const std::string& folder, int operation,
-                                        std::chrono::milliseconds longestWait, std::string& error);
+  enum class Kind { Shared, Exclusive };
+
+  /// Waits for the lock and holds it as long as the object lives. Nothing, with a text in `error`
+  /// that names the folder, when it cannot be had.
+  static std::optional<FolderLock> take(const std::string& folder, std::string& error,
+                                        Kind kind = Kind::Exclusive,
+                                        std::chrono::milliseconds longestWait = kLongestLockWait);
 
  private:
   explicit FolderLock(FileDescriptor folder) : _folder(std::move(folder)) {}

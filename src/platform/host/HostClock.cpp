@@ -3,6 +3,9 @@
 #include <stdlib.h>
 #include <time.h>
 
+#include <cstdlib>
+#include <utility>
+
 #include "platform/host/WholeFile.h"
 
 namespace vesprun {
@@ -24,30 +27,32 @@ std::string HostClock::localDateText(const Date& date) {
   return {text, strftime(text, sizeof text, "%Y-%m-%d %H:%M:%S %z", &local)};
 }
 
-namespace {
+ProcessTimeZone::ProcessTimeZone(ProcessTimeZone&& other) noexcept
+    : _isSet(std::exchange(other._isSet, false)), _before(std::move(other._before)) {}
 
-/// Is there a zone of that name in the time-zone database, which has other files and folders, too?
-bool isTimeZone(const std::string& name) {
-  const bool isPath = name.empty() || name.front() == '/' || name.front() == '.' ||
-                      name.find("..") != std::string::npos;
-  std::string error;
-  const std::optional<std::string> zone =
-      isPath ? std::nullopt : readWholeFile("/usr/share/zoneinfo/" + name, error);
-  return zone && zone->starts_with("TZif");
+ProcessTimeZone::~ProcessTimeZone() {
+  if (_isSet) {
+    _before ? setenv("TZ", _before->c_str(), 1) : unsetenv("TZ");
+    tzset();
+  }
 }
 
-}  // namespace
-
-bool useTimeZone(const std::optional<std::string>& name) {
-  if (!name) {
-    unsetenv("TZ");
-  } else {
-    // The C library takes an unknown zone for UTC without a word.
-    if (*name != "UTC" && !isTimeZone(*name)) {
-      return false;
-    }
-    setenv("TZ", name->c_str(), 1);
+bool ProcessTimeZone::set(const std::string& name) {
+  // The C library takes an unknown zone for UTC without a word.
+  const bool isPath = name.empty() || name.front() == '/' || name.front() == '.' ||
+                      name.find("..") != std::string::npos || name.find('\0') != std::string::npos;
+  std::string error;
+  if (isPath ||
+      (name != "UTC" &&
+       !readWholeFile("/usr/share/zoneinfo/" + name, error).value_or("").starts_with("TZif"))) {
+    return false;
   }
+  if (!_isSet) {
+    const char* before = std::getenv("TZ");
+    _before = before != nullptr ? std::optional<std::string>(before) : std::nullopt;
+    _isSet = true;
+  }
+  setenv("TZ", name.c_str(), 1);
   tzset();
   return true;
 }

@@ -26,16 +26,10 @@ std::optional<std::uint64_t> HostFileSystem::fileSize(const std::string& path) {
 }
 
 std::optional<FileSystemStatistics> HostFileSystem::statfs(const std::string& path) {
-  std::optional<VolumeDescription> volume;
   if (path != "/private/var") {
-    volume = live::volume(_directory.hostPath(path));
-  } else {
-    volume = _userVolume.isLive() ? live::volume(_directory.path()) : _userVolume.value;
+    return live::volume(_directory.hostPath(path));
   }
-  if (!volume) {
-    return std::nullopt;
-  }
-  return FileSystemStatistics{volume->blockSize, volume->blocks, volume->available};
+  return _userVolume.isLive() ? live::volume(_directory.path()) : _userVolume.value;
 }
 
 }  // namespace vesprun

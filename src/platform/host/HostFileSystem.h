@@ -8,11 +8,12 @@
 namespace vesprun {
 
 /// The files of the device directory. The user volume, at /private/var, is as large as described,
-/// or else as the file system that the directory lies on.
+/// or else as the file system that the directory lies on. A file
+/// that is there but cannot be read leaves an error in the system log.
 class HostFileSystem : public FileSystem {
  public:
   HostFileSystem(const DeviceDirectory& directory,
-                 const AnswerDescription<VolumeDescription>& userVolume, SystemLog& log)
+                 const AnswerDescription<FileSystemStatistics>& userVolume, SystemLog& log)
       : _directory(directory), _userVolume(userVolume), _log(log) {}
 
   std::optional<std::string> readFile(const std::string& path) override;
@@ -21,7 +22,7 @@ class HostFileSystem : public FileSystem {
 
  private:
   const DeviceDirectory& _directory;
-  const AnswerDescription<VolumeDescription>& _userVolume;
+  const AnswerDescription<FileSystemStatistics>& _userVolume;
   SystemLog& _log;
 };
 

@@ -101,7 +101,7 @@ std::optional<Bytes> HostKernel::captureSnapshot(std::uint32_t /*captureFlags*/)
   const std::optional<std::string> content =
       readWholeFile(_directory.hostPath(*_description.snapshotFile), error);
   if (!content) {
-    _log.write(LogLevel::Error, error);
+    _log.write(LogLevel::Error, "Kernel snapshot: " + error);
     return std::nullopt;
   }
   return Bytes(content->begin(), content->end());

@@ -19,7 +19,8 @@ class HostKernel : public Kernel {
   std::uint64_t pageSize() override;
   std::uint64_t monotonicTicks() override;
   std::optional<TickRatio> tickRatio() override;
-  /// The described snapshot, whatever the flags; Linux has none to offer.
+  /// The described snapshot, whatever the flags; Linux has none to offer. A file that cannot be
+  /// read leaves an error in the system log.
   std::optional<Bytes> captureSnapshot(std::uint32_t captureFlags) override;
 
  private:

@@ -58,8 +58,10 @@ class HostMurmur::Replies {
     }
     try {
       handler(&usage.records);
-    } catch (const std::exception& failure) {  // nobody else is on this thread to catch it
-      _log.write(LogLevel::Error, std::string("the usage feed's reply: ") + failure.what());
+    } catch (const std::exception& failure) {
+      _log.write(LogLevel::Error, std::string("usage feed: ") + failure.what());
+    } catch (...) {
+      _log.write(LogLevel::Error, "usage feed: the handler of a reply failed");
     }
   }
 

@@ -21,7 +21,7 @@ std::optional<PropertyValue> HostOrrery::diskUsage() const {
   if (!_description.diskUsage.isLive()) {
     return _description.diskUsage.value;
   }
-  const std::optional<VolumeDescription> volume = live::volume(_directory.path());
+  const std::optional<FileSystemStatistics> volume = live::volume(_directory.path());
   if (!volume) {
     return std::nullopt;
   }
@@ -29,8 +29,8 @@ std::optional<PropertyValue> HostOrrery::diskUsage() const {
     return static_cast<std::int64_t>(blocks * volume->blockSize);
   };
   return PropertyDict{{std::string(kDiskUsageTotalDiskCapacity), bytes(volume->blocks)},
-                      {std::string(kDiskUsageTotalDataAvailable), bytes(volume->available)},
-                      {std::string(kDiskUsageAmountDataAvailable), bytes(volume->available)}};
+                      {std::string(kDiskUsageTotalDataAvailable), bytes(volume->availableBlocks)},
+                      {std::string(kDiskUsageAmountDataAvailable), bytes(volume->availableBlocks)}};
 }
 
 }  // namespace vesprun

@@ -28,6 +28,7 @@
 #include "platform/host/HostTapline.h"
 #include "platform/host/HostUserDefaults.h"
 #include "platform/host/PollMainLoop.h"
+#include "platform/host/QuotedText.h"
 #include "platform/host/SqliteTallybook.h"
 #include "platform/host/UnixMessageService.h"
 #include "platform/host/WholeFile.h"
@@ -51,15 +52,18 @@ struct HostPlatform::Services {
     std::optional<Service> _service;
   };
 
-  Services(DeviceDirectory deviceDirectory, DeviceDescription deviceDescription)
+  Services(DeviceDirectory deviceDirectory, DeviceDescription deviceDescription,
+           ProcessTimeZone processTimeZone)
       : directory(std::move(deviceDirectory)),
         description(std::move(deviceDescription)),
+        timeZone(std::move(processTimeZone)),
         clock(description.clock),
         systemLog(directory, clock, description.logLevel),
         outbox(directory, clock, systemLog) {}
 
   DeviceDirectory directory;
   DeviceDescription description;
+  ProcessTimeZone timeZone;
   HostClock clock;
   HostSystemLog systemLog;
   Outbox outbox;
@@ -112,11 +116,13 @@ std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, std::s
   } else if (!missing) {
     return nullptr;
   }
-  if (!useTimeZone(description.timeZone)) {
-    error = file + ": timeZone: unknown time zone \"" + *description.timeZone + '"';
+  ProcessTimeZone timeZone;
+  if (description.timeZone && !timeZone.set(*description.timeZone)) {
+    error = file + ": timeZone: unknown time zone " + quotedText(*description.timeZone);
     return nullptr;
   }
-  auto services = std::make_unique<Services>(*std::move(directory), std::move(description));
+  auto services = std::make_unique<Services>(*std::move(directory), std::move(description),
+                                             std::move(timeZone));
   return std::unique_ptr<HostPlatform>(new HostPlatform(std::move(services)));
 }
 
@@ -193,7 +199,7 @@ Orrery& HostPlatform::orrery() {
 }
 
 Preferences& HostPlatform::preferences() {
-  return _services->preferences.get(directory(), systemLog());
+  return _services->preferences.get(directory(), clock(), systemLog());
 }
 
 ProcessInformation& HostPlatform::processInformation() {
@@ -207,7 +213,7 @@ PtreeSerialization& HostPlatform::ptreeSerialization() {
 Reclaimer& HostPlatform::reclaimer() { return _services->reclaimer.get(description()); }
 
 LGSServicesClient& HostPlatform::servicesClient() {
-  return _services->servicesClient.get(directory(), systemLog());
+  return _services->servicesClient.get(directory(), clock(), systemLog());
 }
 
 SupportLibrary& HostPlatform::supportLibrary() {
@@ -215,7 +221,7 @@ SupportLibrary& HostPlatform::supportLibrary() {
 }
 
 LGSSystemConfiguration& HostPlatform::systemConfiguration() {
-  return _services->systemConfiguration.get(description(), directory(), systemLog());
+  return _services->systemConfiguration.get(description(), directory(), clock(), systemLog());
 }
 
 Tapline& HostPlatform::tapline() { return _services->tapline.get(description().channels); }

@@ -17,7 +17,8 @@ class SqliteTallybook;
 class HostPlatform : public Platform {
  public:
   /// Reads the description of the device. Nothing, with a text in `error` that names the place,
-  /// when the folder or its `device.json` cannot be used.
+  /// when the folder or its `device.json` cannot be used. A described time zone is that of the
+  /// whole process, in its environment variable TZ, until the platform is destroyed.
   static std::unique_ptr<HostPlatform> open(const std::string& path, std::string& error);
 
   ~HostPlatform() override;

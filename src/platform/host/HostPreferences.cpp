@@ -14,9 +14,9 @@ bool isPartOfPath(std::string_view name) {
 
 }  // namespace
 
-HostPreferences::HostPreferences(const DeviceDirectory& device, SystemLog& log,
+HostPreferences::HostPreferences(const DeviceDirectory& device, Clock& clock, SystemLog& log,
                                  std::string_view user)
-    : _device(device), _log(log) {
+    : _device(device), _clock(clock), _log(log) {
   if (isPartOfPath(user)) {
     _folder = "var/" + std::string(user) + "/Library/Preferences";
   } else {
@@ -24,9 +24,9 @@ HostPreferences::HostPreferences(const DeviceDirectory& device, SystemLog& log,
   }
 }
 
-HostPreferences::HostPreferences(const DeviceDirectory& device, SystemLog& log,
+HostPreferences::HostPreferences(const DeviceDirectory& device, Clock& clock, SystemLog& log,
                                  PreferenceFolder folder)
-    : _device(device), _log(log), _folder(std::move(folder.path)) {}
+    : _device(device), _clock(clock), _log(log), _folder(std::move(folder.path)) {}
 
 HostPreferences::~HostPreferences() {
   for (auto& [domain, file] : _files) {
@@ -47,7 +47,8 @@ PreferenceFile* HostPreferences::file(std::string_view domain) {
     }
     return nullptr;
   }
-  const auto added = _files.try_emplace(std::string(domain), _device, _log, _folder, domain);
+  const auto added =
+      _files.try_emplace(std::string(domain), _device, _clock, _log, _folder, domain);
   return &added.first->second;
 }
 

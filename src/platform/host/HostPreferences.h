@@ -8,6 +8,7 @@
 #include <string>
 #include <string_view>
 
+#include "platform/Clock.h"
 #include "platform/Preferences.h"
 #include "platform/SystemLog.h"
 #include "platform/host/DeviceDirectory.h"
@@ -29,12 +30,14 @@ struct PreferenceFolder {
 /// value, and nothing can be written. A refused domain is told once.
 class HostPreferences final : public Preferences {
  public:
-  /// The preferences of a user: var/USER/Library/Preferences. `device` and `log` must outlive the
-  /// object; the log must stand being written to by several threads.
-  HostPreferences(const DeviceDirectory& device, SystemLog& log, std::string_view user = "mobile");
+  /// The preferences of a user: var/USER/Library/Preferences. What the references name must outlive
+  /// the object; the log must stand being written to by several threads.
+  HostPreferences(const DeviceDirectory& device, Clock& clock, SystemLog& log,
+                  std::string_view user = "mobile");
 
   /// Those of another folder, such as Library/Logsmith.
-  HostPreferences(const DeviceDirectory& device, SystemLog& log, PreferenceFolder folder);
+  HostPreferences(const DeviceDirectory& device, Clock& clock, SystemLog& log,
+                  PreferenceFolder folder);
 
   /// Synchronizes every domain.
   ~HostPreferences() override;
@@ -57,6 +60,7 @@ class HostPreferences final : public Preferences {
   PreferenceFile* file(std::string_view domain);
 
   const DeviceDirectory& _device;
+  Clock& _clock;
   SystemLog& _log;
   std::string _folder;  ///< empty when the user's name was refused
   std::mutex _mutex;

@@ -8,8 +8,9 @@ namespace vesprun {
 /// The preferences of each user as documents in var/USER/Library/Preferences.
 class HostServicesClient final : public LGSServicesClient {
  public:
-  /// Both must outlive the object.
-  HostServicesClient(const DeviceDirectory& device, SystemLog& log) : _device(device), _log(log) {}
+  /// What the references name must outlive the object.
+  HostServicesClient(const DeviceDirectory& device, Clock& clock, SystemLog& log)
+      : _device(device), _clock(clock), _log(log) {}
 
   void setPreferenceForUserInDomainToValue(std::optional<std::string_view> key,
                                            std::string_view user, std::string_view domain,
@@ -19,6 +20,7 @@ class HostServicesClient final : public LGSServicesClient {
 
  private:
   const DeviceDirectory& _device;
+  Clock& _clock;
   SystemLog& _log;
 };
 

@@ -5,6 +5,7 @@
 
 namespace vesprun {
 
+/// The support library as described. It is simulated: what it offers, `Preferences` does.
 class HostSupportLibrary : public SupportLibrary {
  public:
   explicit HostSupportLibrary(const SupportLibraryDescription& description)

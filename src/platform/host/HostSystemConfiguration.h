@@ -10,10 +10,11 @@ namespace vesprun {
 /// the object is destroyed.
 class HostSystemConfiguration final : public LGSSystemConfiguration {
  public:
-  /// All three must outlive the object.
+  /// What the references name must outlive the object.
   HostSystemConfiguration(const DeviceDescription& description, const DeviceDirectory& device,
-                          SystemLog& log)
-      : _description(description), _values(device, log, PreferenceFolder{"Library/Logsmith"}) {}
+                          Clock& clock, SystemLog& log)
+      : _description(description),
+        _values(device, clock, log, PreferenceFolder{"Library/Logsmith"}) {}
 
   std::optional<PropertyValue> getPrefsKeyForDomainWithOptions(std::string_view key,
                                                                std::string_view domain,

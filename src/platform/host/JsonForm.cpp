@@ -6,20 +6,19 @@
 #include <cstdint>
 #include <limits>
 #include <nlohmann/json.hpp>
+#include <string_view>
 #include <utility>
 #include <vector>
 
 #include "common/Date.h"
 #include "platform/host/Base64.h"
+#include "platform/host/NestedPlace.h"
 #include "platform/host/QuotedText.h"
-#include "platform/host/StrictJson.h"
 
 namespace vesprun {
 namespace {
 
 using Json = nlohmann::ordered_json;
-
-constexpr std::size_t kMostLevels = 200;
 
 Json tagged(const char* name, Json content) {
   Json object = Json::object();
@@ -149,18 +148,18 @@ std::optional<PropertyValue> untagged(PropertyDict dict, std::string& error) {
   return dict;
 }
 
-/// Builds values as the library's parser meets them: no tree of the library's own, whose objects
-/// take long to fill, and the digits of integers are still at hand.
-class ValueBuilder final : public nlohmann::json_sax<Json> {
+/// Builds the library's tree as its parser meets the parts: stricter than the library does, with
+/// the digits of integers still at hand, and without its search for each name among the earlier.
+class TreeBuilder final : public nlohmann::json_sax<Json> {
  public:
-  explicit ValueBuilder(std::string& error) : _error(error) {}
+  explicit TreeBuilder(std::string& error) : _error(error) {}
 
-  std::optional<PropertyValue> result() { return std::move(_result); }
+  Json takeResult() { return std::move(_result); }
 
-  bool null() override { return fail("null is no value"); }
+  bool null() override { return add(nullptr); }
   bool boolean(bool value) override { return add(value); }
   bool number_integer(number_integer_t value) override { return add(value); }
-  bool number_unsigned(number_unsigned_t value) override { return add(integerValue(value)); }
+  bool number_unsigned(number_unsigned_t value) override { return add(value); }
   bool number_float(number_float_t value, const std::string& text) override {
     if (text.find_first_of(".eE") == std::string::npos) {
       return fail("the integer " + text.substr(0, 40) + " does not fit 64 bits");
@@ -171,86 +170,96 @@ class ValueBuilder final : public nlohmann::json_sax<Json> {
   bool binary(Json::binary_t& /*value*/) override { return fail("binary data"); }
   bool start_object(std::size_t /*count*/) override { return open(true); }
   bool key(std::string& name) override {
-    _open.back().key = std::move(name);
+    _open.back().name = std::move(name);
     return true;
   }
   bool end_object() override {
-    PropertyDict dict = std::move(_open.back().dict);
+    Container& container = _open.back();
+    std::vector<std::string_view> names;
+    names.reserve(container.entries.size());
+    for (const auto& entry : container.entries) {
+      names.emplace_back(entry.first);
+    }
+    std::sort(names.begin(), names.end());
+    if (const auto twice = std::adjacent_find(names.begin(), names.end()); twice != names.end()) {
+      container.name = *twice;
+      return fail("there twice");
+    }
+    Json::object_t object;
+    static_cast<Entries&>(object) = std::move(container.entries);
     _open.pop_back();
-    std::string error;
-    std::optional<PropertyValue> value = untagged(std::move(dict), error);
-    return value ? add(*std::move(value)) : fail(std::move(error));
+    return add(std::move(object));
   }
   bool start_array(std::size_t /*count*/) override { return open(false); }
   bool end_array() override {
-    PropertyArray array = std::move(_open.back().array);
+    Json::array_t elements = std::move(_open.back().elements);
     _open.pop_back();
-    return add(std::move(array));
+    return add(std::move(elements));
   }
   bool parse_error(std::size_t /*position*/, const std::string& /*token*/,
                    const nlohmann::detail::exception& exception) override {
-    _error = parseErrorText(exception);
+    std::string message = exception.what();
+    message.erase(0, message.find(' ') + 1);  // "[json.exception....] parse error at line ..."
+    if (dynamic_cast<const Json::parse_error*>(&exception) == nullptr) {
+      return fail(message);  // a number that no double can hold
+    }
+    _error = std::move(message);
     return false;
   }
 
  private:
+  using Entries = std::vector<Json::object_t::value_type>;
   struct Container {
-    bool isDict;
-    std::string key;
-    PropertyDict dict;
-    PropertyArray array;
+    bool isObject;
+    std::string name;
+    Entries entries;
+    Json::array_t elements;
   };
 
-  bool open(bool isDict) {
-    if (_open.size() == kMostLevels) {
-      return fail("nested deeper than 200 levels");
+  bool open(bool isObject) {
+    if (_open.size() == kMostNestedLevels) {
+      return fail(kNestedTooDeeply);
     }
-    _open.push_back({isDict, {}, {}, {}});
+    _open.push_back({isObject, {}, {}, {}});
     return true;
   }
 
-  bool add(PropertyValue value) {
+  bool add(Json value) {
     if (_open.empty()) {
       _result = std::move(value);
-    } else if (Container& container = _open.back(); container.isDict) {
-      container.dict.set(container.key, std::move(value));
+    } else if (Container& container = _open.back(); container.isObject) {
+      container.entries.emplace_back(container.name, std::move(value));
     } else {
-      container.array.push_back(std::move(value));
+      container.elements.push_back(std::move(value));
     }
     return true;
   }
 
-  /// Names the place by its names and array indices; a parse error names line and column.
-  bool fail(std::string message) {
-    _error.clear();
-    constexpr std::size_t kMostSteps = 8;
-    for (std::size_t step = 0; step < _open.size() && step < kMostSteps; ++step) {
-      const Container& container = _open[step];
-      _error += step == 0 ? "" : " > ";
-      _error += container.isDict ? quotedText(container.key)
-                                 : '[' + std::to_string(container.array.size()) + ']';
+  bool fail(const std::string& message) {
+    NestedPlace place;
+    for (auto container = _open.rbegin(); container != _open.rend(); ++container) {
+      if (container->isObject) {
+        place.addOuterKey(container->name);
+      } else {
+        place.addOuterIndex(container->elements.size());
+      }
     }
-    _error += _open.empty() ? "" : ": ";
-    _error += message;
+    _error = place.with(message);
     return false;
   }
 
   std::string& _error;
   std::vector<Container> _open;
-  std::optional<PropertyValue> _result;
+  Json _result;
 };
 
-std::optional<PropertyValue> valueOf(const Json& json, std::size_t level, std::string& error) {
-  if ((json.is_object() || json.is_array()) && level == kMostLevels) {
-    error = "nested deeper than 200 levels";
-    return std::nullopt;
-  }
+std::optional<PropertyValue> valueOf(const Json& json, NestedPlace& place, std::string& error) {
   if (json.is_object()) {
     PropertyDict dict;
     for (const auto& [name, content] : json.get_ref<const Json::object_t&>()) {
-      std::optional<PropertyValue> value = valueOf(content, level + 1, error);
+      std::optional<PropertyValue> value = valueOf(content, place, error);
       if (!value) {
-        error.insert(0, quotedText(name) + ": ");
+        place.addOuterKey(name);
         return std::nullopt;
       }
       dict.set(name, *std::move(value));
@@ -260,9 +269,9 @@ std::optional<PropertyValue> valueOf(const Json& json, std::size_t level, std::s
   if (json.is_array()) {
     PropertyArray array;
     for (const Json& content : json) {
-      std::optional<PropertyValue> value = valueOf(content, level + 1, error);
+      std::optional<PropertyValue> value = valueOf(content, place, error);
       if (!value) {
-        error.insert(0, '[' + std::to_string(array.size()) + "]: ");
+        place.addOuterIndex(array.size());
         return std::nullopt;
       }
       array.push_back(*std::move(value));
@@ -294,13 +303,25 @@ std::string jsonText(const PropertyValue& value) { return textOf(jsonOf(value), 
 std::string jsonText(const PropertyDict& dict) { return textOf(jsonOf(dict), -1); }
 std::string indentedJsonText(const PropertyValue& value) { return textOf(jsonOf(value), 2); }
 
-std::optional<PropertyValue> valueFromJsonText(std::string_view text, std::string& error) {
-  ValueBuilder builder(error);
-  return Json::sax_parse(text.begin(), text.end(), &builder) ? builder.result() : std::nullopt;
+std::optional<Json> jsonFromText(std::string_view text, std::string& error) {
+  TreeBuilder builder(error);
+  return Json::sax_parse(text.begin(), text.end(), &builder) ? std::optional(builder.takeResult())
+                                                             : std::nullopt;
 }
 
-std::optional<PropertyValue> valueFromJson(const nlohmann::ordered_json& json, std::string& error) {
-  return valueOf(json, 0, error);
+std::optional<PropertyValue> valueFromJson(const Json& json, std::string& error) {
+  NestedPlace place;
+  std::string fault;
+  std::optional<PropertyValue> value = valueOf(json, place, fault);
+  if (!value) {
+    error = place.with(fault);
+  }
+  return value;
+}
+
+std::optional<PropertyValue> valueFromJsonText(std::string_view text, std::string& error) {
+  const std::optional<Json> json = jsonFromText(text, error);
+  return json ? valueFromJson(*json, error) : std::nullopt;
 }
 
 }  // namespace vesprun

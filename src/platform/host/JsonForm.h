@@ -25,17 +25,20 @@ std::string jsonText(const PropertyValue& value);
 std::string jsonText(const PropertyDict& dict);
 std::string indentedJsonText(const PropertyValue& value);
 
-/// The value of a JSON text in that form. Nothing, with a text in `error`, for what is no JSON, a
-/// null, an integer outside the 64-bit range (signed or unsigned), containers nested deeper than
-/// 200, and one of the four objects whose text is not of its kind.
+/// What a JSON text holds. Nothing, with a text in `error` that names the line or the entry, for
+/// what is no JSON, a name that an object has twice, an integer outside the 64-bit range (signed or
+/// unsigned), any other number that no double can hold, and containers nested deeper than 200.
+std::optional<nlohmann::ordered_json> jsonFromText(std::string_view text, std::string& error);
+
+/// The value that such JSON stands for. Nothing, with a text in `error` that names the entry, for a
+/// null and for one of the four objects whose text is not of its kind.
 ///
 /// An integer is a signed 64-bit number when it fits, else an unsigned one. An object with one
 /// entry is one of the four only when the entry is of the type that they have (a number for
-/// "float", a string for the others); any other object is a dictionary. A repeated name keeps its
-/// first place and its last value.
-std::optional<PropertyValue> valueFromJsonText(std::string_view text, std::string& error);
-
-/// The same for JSON that is parsed already, by `parseStrictJson`.
+/// "float", a string for the others); any other object is a dictionary.
 std::optional<PropertyValue> valueFromJson(const nlohmann::ordered_json& json, std::string& error);
+
+/// Both in one.
+std::optional<PropertyValue> valueFromJsonText(std::string_view text, std::string& error);
 
 }  // namespace vesprun

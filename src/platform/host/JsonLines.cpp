@@ -7,7 +7,6 @@
 
 #include <cerrno>
 #include <cstring>
-#include <utility>
 
 #include "platform/host/FileLock.h"
 #include "platform/host/SystemError.h"
@@ -34,8 +33,10 @@ bool JsonLines::append(std::string_view line, std::string& error) {
     error = systemError(_path);
     return false;
   }
-  if (!lockFile(_file, LOCK_EX, _longestWait, _path, error)) {
-    _longestWait = {};  // a run has many lines, and must not wait for each
+  const bool locked = takeLock(_file.get(), LOCK_EX, _wait, _path, error);
+  // Only one line waits for whoever keeps the file; the others would together wait for ever.
+  _wait = locked ? _longestWait : std::chrono::milliseconds::zero();
+  if (!locked) {
     return false;
   }
   const bool appended = appendLocked(line, error);
@@ -62,7 +63,7 @@ bool JsonLines::appendLocked(std::string_view line, std::string& error) {
   if (written == static_cast<ssize_t>(bytes.size())) {
     return true;
   }
-  error = _path + ": " + (written < 0 ? std::strerror(errno) : "no room for a line");
+  error = written < 0 ? systemError(_path) : _path + ": no room for a line";
   if (written > 0 && ftruncate(_file.get(), before.st_size) != 0) {
     error += ", and a part of it stays: ";
     error += std::strerror(errno);

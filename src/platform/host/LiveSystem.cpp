@@ -16,6 +16,8 @@
 #include <string_view>
 #include <utility>
 
+#include "common/LittleEndian.h"
+
 namespace vesprun::live {
 namespace {
 
@@ -48,13 +50,6 @@ std::string upperCase(std::string text) {
   std::transform(text.begin(), text.end(), text.begin(),
                  [](unsigned char c) { return static_cast<char>(std::toupper(c)); });
   return text;
-}
-
-template <typename T>
-void appendLittleEndian(Bytes& bytes, T value) {
-  for (std::size_t i = 0; i < sizeof value; ++i) {
-    bytes.push_back(static_cast<std::uint8_t>(value >> 8 * i & 0xFF));
-  }
 }
 
 /// "en_GB.UTF-8@euro" as {"en", "GB"}; nothing for the locales that name no language.
@@ -137,11 +132,11 @@ std::optional<Bytes> swapUsage() {
   const std::uint64_t totalBytes = std::strtoull(total->second.c_str(), nullptr, 10) * 1024;
   const std::uint64_t freeBytes = std::strtoull(free->second.c_str(), nullptr, 10) * 1024;
   Bytes record;
-  appendLittleEndian(record, totalBytes);
-  appendLittleEndian(record, freeBytes);
-  appendLittleEndian(record, totalBytes - freeBytes);
-  appendLittleEndian(record, static_cast<std::uint32_t>(sysconf(_SC_PAGESIZE)));
-  appendLittleEndian(record, std::uint32_t{0});
+  appendLittleEndian(record, totalBytes, 8);
+  appendLittleEndian(record, freeBytes, 8);
+  appendLittleEndian(record, totalBytes - freeBytes, 8);
+  appendLittleEndian(record, static_cast<std::uint64_t>(sysconf(_SC_PAGESIZE)), 4);
+  appendLittleEndian(record, 0, 4);
   return record;
 }
 
@@ -159,14 +154,14 @@ std::string hardwareModel() {
 
 std::string newIdentifier() { return upperCase(firstLineOf("/proc/sys/kernel/random/uuid")); }
 
-std::optional<VolumeDescription> volume(const std::string& path) {
+std::optional<FileSystemStatistics> volume(const std::string& path) {
   struct statvfs status {};
   if (statvfs(path.c_str(), &status) != 0 ||
       status.f_frsize > std::numeric_limits<std::uint32_t>::max()) {
     return std::nullopt;
   }
-  return VolumeDescription{static_cast<std::uint32_t>(status.f_frsize), status.f_blocks,
-                           status.f_bavail};
+  return FileSystemStatistics{static_cast<std::uint32_t>(status.f_frsize), status.f_blocks,
+                              status.f_bavail};
 }
 
 std::vector<ApplicationDescription> applications() {

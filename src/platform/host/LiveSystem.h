@@ -26,7 +26,7 @@ std::string hardwareModel();      ///< the machine's architecture, for example "
 std::string newIdentifier();      ///< a random UUID in upper case
 
 /// The file system that a path lies on; nothing when it cannot be measured.
-std::optional<VolumeDescription> volume(const std::string& path);
+std::optional<FileSystemStatistics> volume(const std::string& path);
 
 /// Applications by their desktop entries: those of the system and those of the user's home.
 std::vector<ApplicationDescription> applications();

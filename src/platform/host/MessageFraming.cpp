@@ -1,7 +1,10 @@
 #include "platform/host/MessageFraming.h"
 
 #include <algorithm>
+#include <bit>
 #include <utility>
+
+#include "common/LittleEndian.h"
 
 namespace vesprun {
 
@@ -19,11 +22,8 @@ std::optional<std::string> messageFrame(std::string_view document) {
 }
 
 std::uint32_t MessageAssembler::announcedLength() const {
-  std::uint32_t length = 0;
-  for (std::size_t i = 0; i < _length.size(); ++i) {
-    length |= static_cast<std::uint32_t>(static_cast<unsigned char>(_length[i])) << (8 * i);
-  }
-  return length;
+  return loadLittleEndian<std::uint32_t>(
+      std::bit_cast<std::array<std::uint8_t, 4>>(_length).data());
 }
 
 MessageAssembler::Progress MessageAssembler::take(std::string_view& bytes) {

@@ -54,14 +54,14 @@ std::string baseName(std::uint64_t number, std::string_view type, std::string_vi
   return std::string(digits) + '-' + std::string(type) + '-' + std::string(name);
 }
 
-/// What was submitted is never written over.
-bool addNew(AtomicFile& file, const std::string& folder, const std::string& name,
-            std::string& error) {
-  const AtomicFile::Added added = file.addNew(name, error);
-  if (added == AtomicFile::Added::NameTaken) {
-    error = folder + '/' + name + ": there already";
+AtomicFile::Added addHeader(const std::string& folder, const std::string& name,
+                            const PropertyDict& header, std::string& error) {
+  std::optional<AtomicFile> file = AtomicFile::create(folder, error);
+  if (!file) {
+    return AtomicFile::Added::Failed;
   }
-  return added == AtomicFile::Added::Done;
+  file->append(jsonText(header) + '\n');  // a failure is told by `addNew`
+  return file->addNew(name, error);
 }
 
 }  // namespace
@@ -106,30 +106,24 @@ bool Outbox::writeLog(std::string_view type, std::string_view name, const Proper
   if (!lock) {
     return false;
   }
-  const std::optional<std::uint64_t> number = nextNumber(*folder, error);
-  if (!number) {
-    return false;
-  }
-  const std::string base = baseName(*number, type, name);
-  const std::string headerName = base + ".header.json";
-  if (header != nullptr) {
+  const std::optional<std::uint64_t> first = nextNumber(*folder, error);
+  auto added = first ? AtomicFile::Added::NameTaken : AtomicFile::Added::Failed;
+  for (std::uint64_t number = first.value_or(0); added == AtomicFile::Added::NameTaken; ++number) {
+    const std::string base = baseName(number, type, name);
+    const std::string headerName = base + ".header.json";
     // First, so that a log which is there has its header beside it.
-    std::optional<AtomicFile> headerFile = AtomicFile::create(*folder, error);
-    if (!headerFile) {
-      return false;
+    if (header != nullptr) {
+      added = addHeader(*folder, headerName, *header, error);
+      if (added != AtomicFile::Added::Done) {
+        continue;
+      }
     }
-    headerFile->append(jsonText(*header) + '\n');  // a failure is told by `addNew`
-    if (!addNew(*headerFile, *folder, headerName, error)) {
-      return false;
+    added = file->addNew(base + (type == kPtreeLogType ? ".ptree" : ".log"), error);
+    if (added != AtomicFile::Added::Done && header != nullptr) {
+      unlink((*folder + '/' + headerName).c_str());
     }
   }
-  if (addNew(*file, *folder, base + (type == kPtreeLogType ? ".ptree" : ".log"), error)) {
-    return true;
-  }
-  if (header != nullptr) {
-    unlink((*folder + '/' + headerName).c_str());
-  }
-  return false;
+  return added == AtomicFile::Added::Done;
 }
 
 }  // namespace vesprun

@@ -4,21 +4,21 @@
 
 #include <algorithm>
 #include <cerrno>
-#include <cstring>
-#include <ctime>
 #include <utility>
 
-#include "common/Date.h"
 #include "platform/host/AtomicFile.h"
+#include "platform/host/NameAside.h"
 #include "platform/host/PtreeReader.h"
 #include "platform/host/PtreeWriter.h"
+#include "platform/host/SystemError.h"
 #include "platform/host/WholeFile.h"
 
 namespace vesprun {
 
-PreferenceFile::PreferenceFile(const DeviceDirectory& device, SystemLog& log, std::string folder,
-                               std::string_view domain)
+PreferenceFile::PreferenceFile(const DeviceDirectory& device, Clock& clock, SystemLog& log,
+                               std::string folder, std::string_view domain)
     : _device(device),
+      _clock(clock),
       _log(log),
       _folder(std::move(folder)),
       _name(std::string(domain) + ".ptree"),
@@ -148,9 +148,7 @@ bool PreferenceFile::writeChanges(std::string& error) {
 }
 
 bool PreferenceFile::keepAside(std::string& error) const {
-  std::string time = dateText({std::time(nullptr), 0});
-  std::erase_if(time, [](char c) { return c == '-' || c == ':'; });
-  const std::string aside = _path + ".unreadable-" + time;
+  const std::string aside = nameAside(_path, "unreadable", _clock);
   constexpr int kMostInOneSecond = 1000;
   for (int number = 1; number <= kMostInOneSecond; ++number) {
     const std::string name = number == 1 ? aside : aside + '-' + std::to_string(number);
@@ -160,7 +158,7 @@ bool PreferenceFile::keepAside(std::string& error) const {
       return true;
     }
     if (errno != EEXIST) {
-      error = name + ": " + std::strerror(errno);
+      error = systemError(name);
       return false;
     }
   }

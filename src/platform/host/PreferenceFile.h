@@ -6,6 +6,7 @@
 #include <string_view>
 
 #include "common/PropertyDict.h"
+#include "platform/Clock.h"
 #include "platform/SystemLog.h"
 #include "platform/host/DeviceDirectory.h"
 
@@ -20,7 +21,7 @@ namespace vesprun {
 class PreferenceFile {
  public:
   /// `folder` is a path of the device; it is made with the first document.
-  PreferenceFile(const DeviceDirectory& device, SystemLog& log, std::string folder,
+  PreferenceFile(const DeviceDirectory& device, Clock& clock, SystemLog& log, std::string folder,
                  std::string_view domain);
 
   std::optional<PropertyValue> get(std::string_view key);
@@ -55,6 +56,7 @@ class PreferenceFile {
                     PropertyDict& values);
 
   const DeviceDirectory& _device;
+  Clock& _clock;
   SystemLog& _log;
   std::string _folder;
   std::string _name;

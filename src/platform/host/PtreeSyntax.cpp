@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <utility>
 
+#include "platform/host/NestedPlace.h"
 #include "platform/host/QuotedText.h"
 #include "platform/host/XmlText.h"
 
@@ -333,8 +334,8 @@ class SyntaxCheck {
                                             : "malformed tag");
     }
     const bool container = element == PtreeElement::Dict || element == PtreeElement::Array;
-    if (container && _level == kMostPtreeLevels) {
-      return failAt(start, "nested deeper than 200 levels");
+    if (container && _level == kMostNestedLevels) {
+      return failAt(start, kNestedTooDeeply);
     }
     if (empty) {
       return true;
@@ -352,10 +353,10 @@ class SyntaxCheck {
   std::string_view _document;
   PtreeFault& _fault;
   std::size_t _at = 0;
-  std::array<Level, kMostPtreeLevels> _levels{};  ///< the containers around the current place
-  std::size_t _level = 0;                         ///< how many those are
-  bool _inText = false;                           ///< in an element that holds no others
-  std::string_view _textName;                     ///< the name of that element
+  std::array<Level, kMostNestedLevels> _levels{};  ///< the containers around the current place
+  std::size_t _level = 0;                          ///< how many those are
+  bool _inText = false;                            ///< in an element that holds no others
+  std::string_view _textName;                      ///< the name of that element
   std::size_t _textStart = 0;
   std::string_view _lastText;  ///< after a key and before its value: the key as it is written
   std::size_t _keyStart = 0;

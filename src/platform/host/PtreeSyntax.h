@@ -7,9 +7,6 @@
 
 namespace vesprun {
 
-/// Dictionaries and arrays may lie in one another this deep, read or written.
-inline constexpr std::size_t kMostPtreeLevels = 200;
-
 enum class PtreeElement { Dict, Array, Key, String, Integer, Real, True, False, Data, Date };
 
 /// Nothing for a name that is no element of a ptree document; "ptree" itself is not among them.

@@ -7,7 +7,7 @@
 
 #include "common/Date.h"
 #include "platform/host/Base64.h"
-#include "platform/host/PtreeSyntax.h"
+#include "platform/host/NestedPlace.h"
 #include "platform/host/QuotedText.h"
 #include "platform/host/XmlText.h"
 
@@ -16,7 +16,9 @@ namespace {
 
 class TreeWriter {
  public:
-  TreeWriter(std::string& document, std::string& error) : _document(document), _error(error) {}
+  explicit TreeWriter(std::string& document) : _document(document) {}
+
+  std::string error() const { return _place.with(_fault); }
 
   bool write(const PropertyValue& value) {
     if (const PropertyDict* dict = value.dict()) {
@@ -50,7 +52,8 @@ class TreeWriter {
     for (const auto& [key, value] : dict) {
       indent();
       if (!writeText("key", key) || !write(value)) {
-        return failIn(quotedText(key));
+        _place.addOuterKey(key);
+        return false;
       }
     }
     close("dict", dict.empty());
@@ -64,7 +67,8 @@ class TreeWriter {
     }
     for (std::size_t index = 0; index < array.size(); ++index) {
       if (!write(array[index])) {
-        return failIn('[' + std::to_string(index) + ']');
+        _place.addOuterIndex(index);
+        return false;
       }
     }
     close("array", array.empty());
@@ -72,8 +76,8 @@ class TreeWriter {
   }
 
   bool open(std::string_view name, bool empty) {
-    if (_level == kMostPtreeLevels) {
-      return fail("nested deeper than 200 levels");
+    if (_level == kMostNestedLevels) {
+      return fail(kNestedTooDeeply);
     }
     indent();
     _document += '<';
@@ -156,22 +160,14 @@ class TreeWriter {
   }
 
   bool fail(std::string message) {
-    _error = std::move(message);
-    _placed = false;
-    return false;
-  }
-
-  /// Puts one step of the way to the fault in front of the message.
-  bool failIn(const std::string& step) {
-    _error.insert(0, step + (_placed ? " > " : ": "));
-    _placed = true;
+    _fault = std::move(message);
     return false;
   }
 
   std::string& _document;
-  std::string& _error;
+  std::string _fault;
+  NestedPlace _place;  ///< of the fault
   std::size_t _level = 0;
-  bool _placed = false;  ///< the message already begins with a step
 };
 
 template <typename T>
@@ -180,7 +176,9 @@ bool writeDocument(const T& value, std::string& document, std::string& error) {
   document +=
       "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
       "<ptree version=\"1.0\">\n";
-  if (!TreeWriter(document, error).write(value)) {
+  TreeWriter writer(document);
+  if (!writer.write(value)) {
+    error = writer.error();
     document.resize(before);
     return false;
   }

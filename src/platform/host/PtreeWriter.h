@@ -13,7 +13,7 @@ namespace vesprun {
 /// False when the document could not carry the value: a key or string that is not UTF-8 or holds
 /// a character that XML 1.0 excludes, a date outside the years that date texts can have, or
 /// containers nested deeper than 200. `error` then names the place by its keys and array indices
-/// ("\"outer\" > [2] > \"name\": ..."), and `document` is what it was.
+/// ("\"outer\" > [2] > \"name\": ...", eight of them at most), and `document` is what it was.
 bool writePtree(const PropertyValue& value, std::string& document, std::string& error);
 bool writePtree(const PropertyDict& dict, std::string& document, std::string& error);
 

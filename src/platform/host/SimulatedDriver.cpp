@@ -6,12 +6,13 @@
 #include <iterator>
 #include <limits>
 
+#include "common/LittleEndian.h"
 #include "platform/host/WholeFile.h"
 
 namespace vesprun {
 namespace {
 
-static_assert(std::endian::native == std::endian::little, "requests are little-endian");
+static_assert(std::endian::native == std::endian::little, "answers are little-endian");
 
 struct DriverClass {
   std::string_view name;
@@ -29,12 +30,6 @@ constexpr std::size_t kRequestSize = 24;
 constexpr std::uint32_t kSizePhase = 1;
 constexpr std::uint32_t kListKindShift = 2;
 constexpr std::uint32_t kListKindMask = 0xFF;
-
-std::uint32_t wordAt(std::span<const std::uint8_t> bytes, std::size_t offset) {
-  std::uint32_t word = 0;
-  std::memcpy(&word, bytes.data() + offset, sizeof word);
-  return word;
-}
 
 }  // namespace
 
@@ -66,11 +61,12 @@ RegistryResult SimulatedDriver::tunnel(std::span<const std::uint8_t> input,
   if (input.size() != kRequestSize) {
     return kBadArgument;
   }
-  const std::uint32_t flags = wordAt(input, 4);
+  const std::uint32_t flags = loadLittleEndian<std::uint32_t>(&input[4]);
   const auto& answers = _entry.userClient->tunnel;
   const auto answer =
       std::find_if(answers.begin(), answers.end(), [&](const TunnelAnswerDescription& candidate) {
-        return candidate.opcode == wordAt(input, 0) && candidate.argument == wordAt(input, 8) &&
+        return candidate.opcode == loadLittleEndian<std::uint32_t>(&input[0]) &&
+               candidate.argument == loadLittleEndian<std::uint32_t>(&input[8]) &&
                candidate.kind == (flags >> kListKindShift & kListKindMask);
       });
   if (answer == answers.end()) {

@@ -6,15 +6,6 @@
 #include "platform/PreferenceNames.h"
 
 namespace vesprun {
-namespace {
-
-std::int64_t wrappingSum(std::int64_t left, std::int64_t right) {
-  return static_cast<std::int64_t>(static_cast<std::uint64_t>(left) +
-                                   static_cast<std::uint64_t>(right));
-}
-
-}  // namespace
-
 class SqliteTallybook::History final : public TBHistory {
  public:
   explicit History(SqliteTallybook& tallybook) : _tallybook(tallybook) {}

@@ -17,6 +17,7 @@
 #include "platform/host/CounterFile.h"
 #include "platform/host/CounterStore.h"
 #include "platform/host/DeviceDirectory.h"
+#include "platform/host/FileLock.h"
 
 namespace vesprun {
 
@@ -31,12 +32,10 @@ namespace vesprun {
 /// may use the database at once.
 class SqliteTallybook final : public Tallybook {
  public:
-  static constexpr std::chrono::seconds kLongestWait{20};
-
   /// What the references name must outlive the object. While other processes keep the database
   /// locked, an operation waits for `longestWait` at most.
   SqliteTallybook(const DeviceDirectory& directory, Clock& clock, Preferences& preferences,
-                  SystemLog& log, std::chrono::milliseconds longestWait = kLongestWait);
+                  SystemLog& log, std::chrono::milliseconds longestWait = kLongestLockWait);
   /// Writes what is still collected; an error line says when that is lost.
   ~SqliteTallybook() override;
   SqliteTallybook(const SqliteTallybook&) = delete;

@@ -9,7 +9,7 @@ void holdStandardStreams() {
   for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
     if (fcntl(stream, F_GETFD) == -1) {
       // The lowest free number is taken: the streams below are there already.
-      open("/dev/null", stream == STDIN_FILENO ? O_WRONLY : O_RDONLY);
+      static_cast<void>(open("/dev/null", stream == STDIN_FILENO ? O_WRONLY : O_RDONLY));
     }
   }
 }

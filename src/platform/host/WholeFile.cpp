@@ -5,7 +5,9 @@
 #include <unistd.h>
 
 #include <cerrno>
-#include <cstring>
+
+#include "platform/host/FileDescriptor.h"
+#include "platform/host/SystemError.h"
 
 namespace vesprun {
 namespace {
@@ -34,30 +36,22 @@ bool readAll(int file, std::string& content) {
 std::optional<std::string> readWholeFile(const std::string& path, std::string& error,
                                          bool* missing) {
   // A pipe or device under the name must not stop the reader for ever.
-  const int file = open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
+  const FileDescriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
   struct stat status {};
   std::optional<std::string> content;
-  const char* wrongKind = nullptr;
-  errno = file < 0 ? errno : 0;
-  if (file >= 0 && fstat(file, &status) == 0) {
-    if (!S_ISREG(status.st_mode)) {
-      wrongKind = S_ISDIR(status.st_mode) ? "Is a directory" : "not a regular file";
-    } else {
-      content.emplace(static_cast<std::size_t>(status.st_size) + 1, '\0');
-      if (!readAll(file, *content)) {
-        content.reset();
-      }
-    }
-  }
-  const int cause = errno;
-  if (file >= 0) {
-    close(file);
-  }
   if (missing != nullptr) {
-    *missing = !content && cause == ENOENT;
+    *missing = !file.isOpen() && errno == ENOENT;
   }
-  if (!content) {
-    error = path + ": " + (wrongKind != nullptr ? wrongKind : std::strerror(cause));
+  if (!file.isOpen() || fstat(file.get(), &status) != 0) {
+    error = systemError(path);
+  } else if (!S_ISREG(status.st_mode)) {
+    error = path + (S_ISDIR(status.st_mode) ? ": Is a directory" : ": not a regular file");
+  } else {
+    content.emplace(static_cast<std::size_t>(status.st_size) + 1, '\0');
+    if (!readAll(file.get(), *content)) {
+      error = systemError(path);
+      content.reset();
+    }
   }
   return content;
 }
