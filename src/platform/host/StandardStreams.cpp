@@ -6,7 +6,7 @@
 namespace vesprun {
 
 void holdStandardStreams() {
-  for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
+  for (int stream = STDIN_FILENO; stream <= STDERR_FILENO; ++stream) {
     if (fcntl(stream, F_GETFD) == -1) {
       // The lowest free number is taken: the streams below are there already.
       static_cast<void>(open("/dev/null", stream == STDIN_FILENO ? O_WRONLY : O_RDONLY));
