@@ -1,5 +1,7 @@
 #include "platform/host/HostPlatform.h"
 
+#include <fcntl.h>
+
 #include <cerrno>
 #include <future>
 #include <stdexcept>
@@ -139,7 +141,7 @@ TEST(Outbox, AFailedSubmissionLeavesWhatWasThereAndNothingElse) {
   }
   rlimit before{};
   getrlimit(RLIMIT_NOFILE, &before);
-  const int lowestFree = dup(0);
+  const int lowestFree = open("/dev/null", O_RDONLY);
   close(lowestFree);
   for (int allowed = 0; allowed < 4; ++allowed) {
     const rlimit limited{static_cast<rlim_t>(lowestFree + allowed), before.rlim_max};
