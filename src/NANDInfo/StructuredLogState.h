@@ -5,8 +5,7 @@
 namespace vesprun {
 
 // What one structured storage log tells its list handlers. Written by `DumpStorageStructuredLog`,
-// but for
-// the first, which its caller may set.
+// but for the first, which its caller may set.
 
 extern std::uint8_t gForceCollectionSet;  ///< not 0: the validity list is always collected
 extern std::uint8_t gNeedValidityList;    ///< not 0: the validity list is wanted in this run

@@ -14,9 +14,8 @@ namespace vesprun {
 struct TunnelRequest {
   static constexpr std::size_t kSize = 24;
 
-  std::uint32_t opcode = 0;  ///< 0
-  std::uint32_t sizeQuery =
-      0;  ///< 4: 1 when the size is asked for, 0 when the data is; the flags of a list
+  std::uint32_t opcode = 0;        ///< 0
+  std::uint32_t sizeQuery = 0;     ///< 4: 1 when the size is asked for, else 0; flags for a list
   std::uint32_t argument = 0;      ///< 8: MSP index, hours back, or 0
   std::uint32_t inputLength = 0;   ///< 12
   std::uint64_t inputAddress = 0;  ///< 16

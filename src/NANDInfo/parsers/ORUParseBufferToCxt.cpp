@@ -10,8 +10,8 @@ namespace {
 
 constexpr std::uint32_t kReadCountHisto = 265;
 
-// Headers of arrays that overlap make far more fields than a buffer has words. All keys there are
-// make some 2,500.
+// Array headers without elements share the words behind them: a small buffer could make fields
+// without end. All keys there are make some 2,500.
 constexpr std::size_t kMostFields = 1'000'000;
 
 void keepInSummary(ORUStatsContext& ctx, std::uint32_t id, std::uint64_t value) {

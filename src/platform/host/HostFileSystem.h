@@ -8,8 +8,8 @@
 namespace vesprun {
 
 /// The files of the device directory. The user volume, at /private/var, is as large as described,
-/// or else as the file system that the directory lies on. A file
-/// that is there but cannot be read leaves an error in the system log.
+/// or else as the file system that the directory lies on. A file that is there but cannot be read
+/// leaves an error in the system log.
 class HostFileSystem : public FileSystem {
  public:
   HostFileSystem(const DeviceDirectory& directory,
