@@ -7,8 +7,6 @@
 #include <span>
 #include <vector>
 
-#include "NANDInfo/FieldSets.h"
-#include "NANDInfo/FilteredDict.h"
 #include "NANDInfo/parsers/MSPRecord.h"
 #include "NANDInfo/parsers/ORUFTLParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUMSPKeyTable.h"
@@ -17,6 +15,8 @@
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
 #include "NANDInfo/parsers/StatisticsBufferBuilder.h"
 #include "NANDInfo/parsers/StatisticsRecord.h"
+#include "NANDInfo/sets/FilteredDict.h"
+#include "NANDInfo/tables/FieldSets.h"
 
 namespace vesprun {
 namespace {

@@ -13,10 +13,10 @@
 #include <string_view>
 #include <vector>
 
-#include "platform/host/AtomicFile.h"
 #include "platform/host/HostPlatform.h"
-#include "platform/host/PtreeWriter.h"
-#include "platform/host/SqliteTallybook.h"
+#include "platform/host/counters/SqliteTallybook.h"
+#include "platform/host/documents/PtreeWriter.h"
+#include "platform/host/files/AtomicFile.h"
 
 namespace vesprun {
 namespace {

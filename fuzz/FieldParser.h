@@ -4,7 +4,7 @@
 #include <cstdint>
 
 #include "ExactCopy.h"
-#include "NANDInfo/APIErrorMessage.h"
+#include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/GenericParserCxt.h"
 #include "Require.h"
 

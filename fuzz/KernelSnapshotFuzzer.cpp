@@ -1,5 +1,5 @@
 #include "ExactCopy.h"
-#include "NANDInfo/KernelSnapshot.h"
+#include "NANDInfo/parsers/KernelSnapshot.h"
 #include "Require.h"
 
 using namespace vesprun;

@@ -1,8 +1,8 @@
 #include <string_view>
 
 #include "Require.h"
-#include "platform/host/PtreeReader.h"
-#include "platform/host/PtreeWriter.h"
+#include "platform/host/documents/PtreeReader.h"
+#include "platform/host/documents/PtreeWriter.h"
 
 using namespace vesprun;
 

@@ -2,8 +2,8 @@
 
 #include <optional>
 
-#include "NANDInfo/NANDInfo.h"
-#include "NANDInfo/StructuredLog.h"
+#include "NANDInfo/lists/StructuredLog.h"
+#include "NANDInfo/sets/NANDInfo.h"
 #include "platform/Platform.h"
 #include "telemetry/DataUsage.h"
 #include "telemetry/DiskUsage.h"

@@ -3,7 +3,7 @@
 #include <cstdint>
 #include <optional>
 
-#include "NANDInfo/UserCapacity.h"
+#include "NANDInfo/sets/UserCapacity.h"
 #include "platform/Platform.h"
 #include "telemetry/DiskUsage.h"
 

@@ -3,7 +3,7 @@
 #include <string>
 #include <string_view>
 
-#include "NANDInfo/APIErrorMessage.h"
+#include "NANDInfo/parsers/APIErrorMessage.h"
 #include "common/TextForm.h"
 #include "platform/Platform.h"
 

@@ -8,8 +8,8 @@
 #include <optional>
 #include <utility>
 
-#include "NANDInfo/NANDInfo.h"
-#include "NANDInfo/StructuredLogState.h"
+#include "NANDInfo/lists/StructuredLogState.h"
+#include "NANDInfo/sets/NANDInfo.h"
 #include "common/Date.h"
 #include "common/LittleEndian.h"
 #include "common/TextForm.h"

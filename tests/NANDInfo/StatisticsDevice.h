@@ -3,7 +3,7 @@
 #include <string>
 
 #include "NANDInfo/parsers/StatisticsBufferBuilder.h"
-#include "platform/host/JsonForm.h"
+#include "platform/host/documents/JsonForm.h"
 #include "support/ControllerTest.h"
 
 namespace vesprun {

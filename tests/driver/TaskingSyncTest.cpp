@@ -5,9 +5,9 @@
 
 #include <algorithm>
 
-#include "platform/host/JsonForm.h"
-#include "platform/host/PtreeReader.h"
-#include "platform/host/PtreeWriter.h"
+#include "platform/host/documents/JsonForm.h"
+#include "platform/host/documents/PtreeReader.h"
+#include "platform/host/documents/PtreeWriter.h"
 #include "support/TestDevice.h"
 
 namespace vesprun {

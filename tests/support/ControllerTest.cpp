@@ -1,9 +1,9 @@
 #include "support/ControllerTest.h"
 
-#include "NANDInfo/APIErrorMessage.h"
-#include "NANDInfo/NandExporter.h"
+#include "NANDInfo/controller/NandExporter.h"
+#include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/StatisticsBufferBuilder.h"
-#include "platform/host/HostDeviceRegistry.h"
+#include "platform/host/registry/HostDeviceRegistry.h"
 #include "support/WatchedRegistry.h"
 
 namespace vesprun {

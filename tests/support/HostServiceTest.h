@@ -8,7 +8,7 @@
 #include <unistd.h>
 
 #include "platform/SystemLog.h"
-#include "platform/host/DeviceDirectory.h"
+#include "platform/host/device/DeviceDirectory.h"
 #include "support/TemporaryFolder.h"
 
 namespace vesprun {

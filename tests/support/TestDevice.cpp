@@ -5,10 +5,10 @@
 
 #include "common/TextForm.h"
 #include "config/InternalDevice.h"
-#include "platform/host/JsonForm.h"
-#include "platform/host/PtreeReader.h"
-#include "platform/host/PtreeWriter.h"
-#include "platform/host/WholeFile.h"
+#include "platform/host/documents/JsonForm.h"
+#include "platform/host/documents/PtreeReader.h"
+#include "platform/host/documents/PtreeWriter.h"
+#include "platform/host/files/WholeFile.h"
 #include "report/SupportLibraryFunctions.h"
 
 namespace vesprun {

@@ -3,8 +3,8 @@
 #include <string>
 #include <vector>
 
-#include "platform/host/HostDeviceRegistry.h"
 #include "platform/host/HostPlatform.h"
+#include "platform/host/registry/HostDeviceRegistry.h"
 
 namespace vesprun {
 

@@ -2,7 +2,7 @@
 
 #include <thread>
 
-#include "platform/host/JsonForm.h"
+#include "platform/host/documents/JsonForm.h"
 #include "telemetry/ReportingChannels.h"
 #include "telemetry/TodaysScalars.h"
 

@@ -4,7 +4,7 @@
 
 #include <limits>
 
-#include "NANDInfo/StructuredLogState.h"
+#include "NANDInfo/lists/StructuredLogState.h"
 #include "support/ListBuffers.h"
 #include "support/TestDevice.h"
 

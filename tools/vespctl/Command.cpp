@@ -5,10 +5,10 @@
 
 #include <iostream>
 
-#include "platform/host/FileDescriptor.h"
-#include "platform/host/JsonForm.h"
-#include "platform/host/QuotedText.h"
-#include "platform/host/SystemError.h"
+#include "platform/host/documents/JsonForm.h"
+#include "platform/host/documents/QuotedText.h"
+#include "platform/host/files/FileDescriptor.h"
+#include "platform/host/files/SystemError.h"
 
 namespace vesprun {
 

@@ -4,7 +4,7 @@
 #include <new>
 
 #include "Command.h"
-#include "platform/host/StandardStreams.h"
+#include "platform/host/files/StandardStreams.h"
 
 int main(int argc, char** argv) {
   vesprun::holdStandardStreams();

@@ -3,7 +3,7 @@
 
 #include "driver/DailyDriver.h"
 #include "platform/host/HostPlatform.h"
-#include "platform/host/StandardStreams.h"
+#include "platform/host/files/StandardStreams.h"
 
 namespace vesprun {
 namespace {

@@ -5,7 +5,7 @@
 #include <cstdio>
 #include <optional>
 
-#include "NANDInfo/APIErrorMessage.h"
+#include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
 #include "NANDInfo/parsers/StatisticsRecord.h"
 

@@ -2,7 +2,7 @@
 
 #include <algorithm>
 
-#include "NANDInfo/APIErrorMessage.h"
+#include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/MSPRecord.h"
 #include "NANDInfo/parsers/ORUMSPKeyTable.h"
 

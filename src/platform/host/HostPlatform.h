@@ -4,8 +4,8 @@
 #include <string>
 
 #include "platform/Platform.h"
-#include "platform/host/DeviceDescription.h"
-#include "platform/host/DeviceDirectory.h"
+#include "platform/host/device/DeviceDescription.h"
+#include "platform/host/device/DeviceDirectory.h"
 
 namespace vesprun {
 

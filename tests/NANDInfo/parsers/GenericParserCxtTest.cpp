@@ -1,8 +1,8 @@
 #include "NANDInfo/parsers/GenericParserCxt.h"
 
 #include "FieldsOf.h"
+#include "NANDInfo/lists/HexText.h"
 #include "NANDInfo/parsers/DictionaryHelpers.h"
-#include "NANDInfo/parsers/HexText.h"
 #include "support/TestDevice.h"
 
 namespace vesprun {

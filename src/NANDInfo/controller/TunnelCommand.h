@@ -1,0 +1,60 @@
+#pragma once
+
+#include <array>
+#include <cstdint>
+#include <cstdlib>
+#include <memory>
+#include <span>
+
+#include "NANDInfo/controller/NandExporter.h"
+
+namespace vesprun {
+
+/// The struct input of both phases of a tunnel command: 24 bytes, little-endian, at these offsets.
+struct TunnelRequest {
+  static constexpr std::size_t kSize = 24;
+
+  std::uint32_t opcode = 0;        ///< 0
+  std::uint32_t sizeQuery = 0;     ///< 4: 1 when the size is asked for, else 0; flags for a list
+  std::uint32_t argument = 0;      ///< 8: MSP index, hours back, or 0
+  std::uint32_t inputLength = 0;   ///< 12
+  std::uint64_t inputAddress = 0;  ///< 16
+
+  std::array<std::uint8_t, kSize> encode() const;
+};
+
+/// Bytes that a driver fills: zero at first, and of the size that the driver asks for, which may be
+/// close to 4 GiB. Memory that nobody touches is not used up.
+class TunnelBuffer {
+ public:
+  TunnelBuffer() = default;
+  /// Without memory (see `operator bool`) when the size cannot be had.
+  explicit TunnelBuffer(std::size_t size);
+
+  explicit operator bool() const { return _bytes != nullptr; }
+  std::size_t size() const { return _bytes ? _size : 0; }
+  std::span<std::uint8_t> bytes() { return {_bytes.get(), size()}; }
+  /// The first `length` bytes, or all when it has fewer.
+  std::span<const std::uint8_t> bytes(std::uint64_t length) const;
+
+ private:
+  struct Free {
+    void operator()(std::uint8_t* bytes) const { std::free(bytes); }
+  };
+
+  std::unique_ptr<std::uint8_t[], Free> _bytes;
+  std::size_t _size = 0;
+};
+
+/// Asks the controller for the size of its answer, then for the answer. `request` carries the
+/// argument; everything else in it is set here. `length` goes into the request when it comes in.
+///
+/// True: `buffer` is a new block of exactly the stated size and `length` what the driver reports,
+/// but never more than that size, so that nobody reads outside. False, with the error recorded:
+/// the block is not handed out; when the size could not be had, `buffer` becomes empty and `length`
+/// 0, else both are as they were.
+bool executeTunnelCommand(RegistryHandle connection, const nand_exporter_t& exporter,
+                          const TunnelSelector* selector, TunnelRequest& request,
+                          TunnelBuffer& buffer, std::uint64_t& length);
+
+}  // namespace vesprun

@@ -1,0 +1,106 @@
+#include "NANDInfo/lists/FactoryDefectList.h"
+
+#include <algorithm>
+#include <cstdio>
+
+#include "common/LittleEndian.h"
+#include "platform/Platform.h"
+
+namespace vesprun {
+namespace {
+
+constexpr std::int32_t kRecordType = 176;
+
+// The header: a word that is not read, the factory count, the number of records.
+constexpr std::size_t kFactoryCountOffset = 4;
+constexpr std::size_t kRecordCountOffset = 8;
+constexpr std::size_t kListHeaderSize = 12;
+constexpr std::size_t kRecordSize = 32;
+
+/// A defect as it lies in the buffer, 32 bytes.
+struct DefectRecord {
+  std::uint16_t bus;
+  std::uint16_t chipEnable;
+  std::uint32_t cau;
+  std::uint32_t block;
+  std::uint32_t cycle;
+  std::uint32_t reason;
+  std::uint32_t page;
+  std::int8_t temperature;  ///< the low byte of its word
+  std::uint32_t mode;
+
+  explicit DefectRecord(const std::uint8_t* bytes)
+      : bus(loadLittleEndian<std::uint16_t>(bytes)),
+        chipEnable(loadLittleEndian<std::uint16_t>(bytes + 2)),
+        cau(loadLittleEndian<std::uint32_t>(bytes + 4)),
+        block(loadLittleEndian<std::uint32_t>(bytes + 8)),
+        cycle(loadLittleEndian<std::uint32_t>(bytes + 12)),
+        reason(loadLittleEndian<std::uint32_t>(bytes + 16)),
+        page(loadLittleEndian<std::uint32_t>(bytes + 20)),
+        temperature(static_cast<std::int8_t>(bytes[24])),
+        mode(loadLittleEndian<std::uint32_t>(bytes + 28)) {}
+
+  /// The reason with what the mode adds to it; wraps as 32 bits do.
+  std::uint32_t adjustedReason() const {
+    switch (mode) {
+      case 0:
+        return reason;
+      case 1:
+        return reason + 200;
+      case 2:
+        return reason + 100;
+      default:
+        std::fprintf(stderr, "Encountered unexpected defectMode: 0x%x", mode);
+        return reason;
+    }
+  }
+};
+
+PropertyValue signedNumber(std::uint32_t word) { return static_cast<std::int32_t>(word); }
+
+void log(const PropertyDict& record) {
+  platform().logsmith().FLLogStructuredData(kRecordType, record);
+}
+
+void logHeader(std::uint32_t factoryCount, const PropertyValue* properties) {
+  PropertyDict record{{"Factory Count", signedNumber(factoryCount)}};
+  const PropertyDict* characteristics = properties != nullptr ? properties->dict() : nullptr;
+  const PropertyValue* description =
+      characteristics != nullptr ? characteristics->find("nand-device-desc") : nullptr;
+  if (description != nullptr && description->number() != nullptr) {
+    record.set("com.quill.NANDInfo.nandDesc", description->number()->asInt32());
+  }
+  log(record);
+}
+
+void logDefect(const DefectRecord& defect, bool modeAdjustsReason) {
+  log({{"Bus", std::int32_t{defect.bus}},
+       {"CE", std::int32_t{defect.chipEnable}},
+       {"CAU", signedNumber(defect.cau)},
+       {"Block", signedNumber(defect.block)},
+       {"Cycle", signedNumber(defect.cycle)},
+       {"Reason", signedNumber(modeAdjustsReason ? defect.adjustedReason() : defect.reason)},
+       {"Page", signedNumber(defect.page)},
+       {"Temperature", defect.temperature}});
+}
+
+}  // namespace
+
+bool LogFactoryDefectList(std::span<const std::uint8_t> buffer, const PropertyValue* properties,
+                          std::string_view className) {
+  if (buffer.size() >= kRecordCountOffset) {
+    logHeader(loadLittleEndian<std::uint32_t>(buffer.data() + kFactoryCountOffset), properties);
+  }
+  if (buffer.size() < kListHeaderSize) {
+    return true;
+  }
+  const std::size_t stated = loadLittleEndian<std::uint32_t>(buffer.data() + kRecordCountOffset);
+  const std::size_t count = std::min(stated, (buffer.size() - kListHeaderSize) / kRecordSize);
+  for (std::size_t i = 0; i < count; ++i) {
+    const std::uint8_t* bytes = buffer.data() + kListHeaderSize + i * kRecordSize;
+    logDefect(DefectRecord(bytes), className != "ORUStorage");
+  }
+  return true;
+}
+
+}  // namespace vesprun

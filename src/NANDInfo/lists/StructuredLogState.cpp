@@ -1,0 +1,17 @@
+#include "NANDInfo/lists/StructuredLogState.h"
+
+namespace vesprun {
+
+std::uint8_t gForceCollectionSet = 0;
+std::uint8_t gNeedValidityList = 0;
+double gCurrentUserWamp = 0.0;
+double gCurrentSysWamp = 0.0;
+
+void forgetStructuredLogState() {
+  gForceCollectionSet = 0;
+  gNeedValidityList = 0;
+  gCurrentUserWamp = 0.0;
+  gCurrentSysWamp = 0.0;
+}
+
+}  // namespace vesprun

@@ -1,0 +1,115 @@
+#include "NANDInfo/sets/HealthSets.h"
+
+#include <algorithm>
+#include <array>
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/sets/FieldNumber.h"
+#include "NANDInfo/sets/FilteredDict.h"
+#include "NANDInfo/sets/NANDInfo.h"
+
+namespace vesprun {
+namespace {
+
+constexpr const char* kMaxPercentageNANDUsed = "com.quill.NANDInfo.Health.MaxPercentageNANDUsed";
+constexpr const char* kMaxE2EErrors = "com.quill.NANDInfo.Health.MaxE2EErrors";
+constexpr const char* kHostReadErrors = "com.quill.NANDInfo.Health.HostReadErrors";
+constexpr const char* kNumGrownBadBlocks = "com.quill.NANDInfo.Health.NumGrownBadBlocks";
+constexpr const char* kSpareAvailablePercent = "com.quill.NANDInfo.Health.SpareAvailablePercent";
+constexpr const char* kNumDieFailures = "com.quill.NANDInfo.Health.NumDieFailures";
+constexpr const char* kIsNANDRetirable = "com.quill.NANDInfo.Health.IsNANDRetirable";
+
+constexpr unsigned kE2EErrorCounters = 12;
+
+constexpr auto kTendmarkRanges = std::to_array<FieldRange>(
+    {kMaxPercentageNANDUsed, kHostReadErrors, kMaxE2EErrors, kNumGrownBadBlocks, kNumDieFailures});
+constexpr FieldIndex kTendmarkIndex(kTendmarkRanges);
+constinit const FieldTable kTendmarkFields(kTendmarkRanges, kTendmarkIndex);
+
+constexpr auto kOTARanges = std::to_array<FieldRange>(
+    {kMaxPercentageNANDUsed, kHostReadErrors, kMaxE2EErrors, kNumGrownBadBlocks});
+constexpr FieldIndex kOTAIndex(kOTARanges);
+constinit const FieldTable kOTAFields(kOTARanges, kOTAIndex);
+
+constexpr auto kInternalLabRanges =
+    std::to_array<FieldRange>({kMaxPercentageNANDUsed, kHostReadErrors, kMaxE2EErrors,
+                               kSpareAvailablePercent, kNumGrownBadBlocks});
+constexpr FieldIndex kInternalLabIndex(kInternalLabRanges);
+constinit const FieldTable kInternalLabFields(kInternalLabRanges, kInternalLabIndex);
+
+/// The number as a signed 32-bit one, but at least 0, which it also is when missing.
+std::int32_t atLeastZero(const PropertyDict& fields, std::string_view name) {
+  const Number* number = numberUnder(fields, name);
+  return number != nullptr ? std::max(number->asInt32(), 0) : 0;
+}
+
+std::int32_t maxPercentageUsed(const PropertyDict& ftl) {
+  return std::max({atLeastZero(ftl, "fwUpdatesPercentUsed"), atLeastZero(ftl, "slcPercentUsed"),
+                   atLeastZero(ftl, "percentUsed")});
+}
+
+std::int32_t maxE2EErrors(const PropertyDict& ftl) {
+  std::int32_t most = 0;
+  for (unsigned i = 0; i < kE2EErrorCounters; ++i) {
+    most = std::max(most, atLeastZero(ftl, "E2EDPErrorCounters_" + std::to_string(i)));
+  }
+  return most;
+}
+
+std::int64_t hostReadErrors(const PropertyDict& ftl) {
+  const Number* isQNS1 = numberUnder(ftl, "com.quill.NANDInfo.IsQNS1Controller");
+  if (isQNS1 == nullptr) {
+    return 0;
+  }
+  const Number* errors = numberUnder(ftl, isQNS1->asInt64() != 0 ? "ueccReads" : "raidSmartErrors");
+  return errors != nullptr ? std::max<std::int64_t>(errors->asInt64(), 0) : 0;
+}
+
+std::int64_t numberOrMinusOne(const PropertyDict& fields, std::string_view name) {
+  const Number* number = numberUnder(fields, name);
+  return number != nullptr ? number->asInt64() : -1;
+}
+
+bool isRetirable(const PropertyDict& health) {
+  const Number* spare = numberUnder(health, kSpareAvailablePercent);
+  const Number* used = numberUnder(health, kMaxPercentageNANDUsed);
+  return spare != nullptr && used != nullptr && spare->asInt64() >= 0 && used->asInt64() >= 0 &&
+         (spare->asInt64() < 100 || used->asInt64() >= 100);
+}
+
+}  // namespace
+
+PropertyDict gatherNANDHealthInfo() {
+  const std::optional<PropertyDict> ftl = gatherORUFTLData(false, true, 0);
+  if (!ftl) {
+    SetAPIErrorMessage("gatherNANDHealthInfo: Unable to get FTL fields");
+    return {};
+  }
+  return {{kMaxPercentageNANDUsed, maxPercentageUsed(*ftl)},
+          {kMaxE2EErrors, maxE2EErrors(*ftl)},
+          {kHostReadErrors, hostReadErrors(*ftl)},
+          {kNumGrownBadBlocks, numberOrMinusOne(*ftl, "numGrownBad")},
+          {kSpareAvailablePercent, numberOrMinusOne(*ftl, "spareAvailablePercent")},
+          {kNumDieFailures, numberOrMinusOne(*ftl, "numDieFailures")}};
+}
+
+PropertyDict CopyTendmarkNANDInfo() {
+  PropertyDict set = CreateFilteredDict(gatherNANDHealthInfo(), &kTendmarkFields);
+  set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
+  return set;
+}
+
+PropertyDict CopyOTANANDInfo() { return CreateFilteredDict(gatherNANDHealthInfo(), &kOTAFields); }
+
+PropertyDict CopyInternalLabNANDInfo() {
+  PropertyDict set = CreateFilteredDict(gatherNANDHealthInfo(), &kInternalLabFields);
+  set.set(kIsNANDRetirable, std::int32_t{isRetirable(set)});
+  set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
+  return set;
+}
+
+}  // namespace vesprun

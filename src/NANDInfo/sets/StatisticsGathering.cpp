@@ -1,0 +1,182 @@
+// Fetches the controller's statistics buffers and has them parsed.
+
+#include <cstdio>
+#include <cstring>
+#include <memory>
+#include <new>
+#include <string>
+
+#include "NANDInfo/controller/ControllerConnection.h"
+#include "NANDInfo/controller/TunnelCommand.h"
+#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/GenericParserCxt.h"
+#include "NANDInfo/parsers/ORUParseBufferToCxt.h"
+#include "NANDInfo/sets/MagazineSnapshot.h"
+#include "NANDInfo/sets/NANDInfo.h"
+#include "platform/RegistryObject.h"
+
+namespace vesprun {
+namespace {
+
+/// What `findNandExporterNew` opened, given back at the end.
+class OpenExporter {
+ public:
+  OpenExporter() {
+    if (!findNandExporterNew(_exporter)) {
+      _exporter = nullptr;
+    }
+  }
+  OpenExporter(const OpenExporter&) = delete;
+  OpenExporter& operator=(const OpenExporter&) = delete;
+  ~OpenExporter() {
+    if (_exporter != nullptr) {
+      ReleaseIOInterfaces(*_exporter);
+    }
+  }
+
+  explicit operator bool() const { return _exporter != nullptr; }
+  const nand_exporter_t* operator->() const { return _exporter; }
+  const nand_exporter_t& operator*() const { return *_exporter; }
+
+ private:
+  nand_exporter_t* _exporter = nullptr;
+};
+
+/// The answer to one command.
+struct Answer {
+  TunnelBuffer buffer;
+  std::uint64_t length = 0;
+
+  std::span<const std::uint8_t> bytes() const { return buffer.bytes(length); }
+};
+
+bool fetch(RegistryHandle connection, const nand_exporter_t& exporter,
+           nand_exporter_t::SelectorGetter getSelector, std::uint32_t argument, Answer& answer) {
+  TunnelRequest request{.argument = argument};
+  return executeTunnelCommand(connection, exporter,
+                              getSelector != nullptr ? getSelector() : nullptr, request,
+                              answer.buffer, answer.length);
+}
+
+/// How many MSPs answer, up to `kMostMSPs`.
+std::uint32_t countMSPs(const nand_exporter_t& exporter) {
+  constexpr std::uint32_t kMostMSPs = 10;
+  std::uint32_t count = 0;
+  const auto answers = [&] {
+    Answer answer;
+    return fetch(exporter.connection, exporter, exporter.getMspStatsSelectors, count, answer);
+  };
+  while (count < kMostMSPs && answers()) {
+    ++count;
+  }
+  return count;
+}
+
+}  // namespace
+
+std::optional<PropertyDict> gatherORUFTLData(bool useStatKeyParser, bool useStatsSelector,
+                                             std::uint32_t argument) {
+  const OpenExporter exporter;
+  if (!exporter) {
+    SetAPIErrorMessage("gatherORUFTLData: Could not get nand_exporter_t");
+    return std::nullopt;
+  }
+  if (exporter->connection == 0) {
+    SetAPIErrorMessage("gatherORUFTLData: No io_connection exist");
+    return std::nullopt;
+  }
+  const nand_exporter_t::SelectorGetter getSelector =
+      useStatsSelector ? exporter->getStatsSelectors : exporter->getReadStatsSelectors;
+  if (getSelector == nullptr) {
+    SetAPIErrorMessage("gatherORUFTLData: No %s exist",
+                       useStatsSelector ? "getStatsSelectors" : "getReadStatsSelectors");
+    return std::nullopt;
+  }
+  Answer answer;
+  if (!fetch(exporter->connection, *exporter, getSelector, useStatsSelector ? 0 : argument,
+             answer)) {
+    return std::nullopt;
+  }
+  const std::unique_ptr<GenericParserCxt> context(new (std::nothrow) GenericParserCxt());
+  if (!context) {
+    SetAPIErrorMessage("gatherORUFTLData: Could not allocate memory for pcxt.ftlData");
+    return std::nullopt;
+  }
+  const auto parse = useStatKeyParser ? exporter->parseFTLStatKey : exporter->parseFTL;
+  if (parse(*context, answer.bytes()) == 0) {
+    SetAPIErrorMessage("gatherORUFTLData: parseFTL failed");
+    return std::nullopt;
+  }
+  PropertyDict fields = CreateDictFromCxt(*context);
+  exporter->releaseGenericCxt(*context);
+
+  const bool isQNS1 = std::strcmp(exporter->name, "ORUStorage") == 0;
+  fields.set("com.quill.NANDInfo.IsQNS1Controller", std::int32_t{isQNS1});
+  const bool hasMagazine = fields.contains("magazineFWVersion_1");
+  fields.set(kIsStatMagSupportedKey, std::int32_t{hasMagazine});
+  if (!hasMagazine) {
+    SetAPIErrorMessage("Stat Magazine not supported");
+  }
+  return fields;
+}
+
+std::optional<PropertyDict> gatherORUMSPData() {
+  const OpenExporter exporter;
+  if (!exporter) {
+    SetAPIErrorMessage("gatherORUMSPData: Could not get nand_exporter_t");
+    return std::nullopt;
+  }
+  if (exporter->getMspStatsSelectors == nullptr || exporter->parseMSP == nullptr) {
+    SetAPIErrorMessage("gatherORUMSPData: Controller does not support MSP data");
+    return std::nullopt;
+  }
+  if (exporter->connection == 0) {
+    SetAPIErrorMessage("gatherORUMSPData: No io_connection exist");
+    return std::nullopt;
+  }
+  const std::uint32_t count = countMSPs(*exporter);
+  if (count == 0) {
+    SetAPIErrorMessage("CopyWhitelistedNANDMSPInfo: Unable to gather any NAND MSP fields");
+    return std::nullopt;
+  }
+  const std::unique_ptr<GenericParserCxt[]> contexts(new (std::nothrow) GenericParserCxt[count]);
+  if (!contexts) {
+    SetAPIErrorMessage("gatherORUMSPData: Could not allocate memory for genericPCxt");
+    return std::nullopt;
+  }
+  PropertyDict fieldsByIndex;
+  for (std::uint32_t index = 0; index < count; ++index) {
+    Answer answer;
+    if (!fetch(exporter->connection, *exporter, exporter->getMspStatsSelectors, index, answer)) {
+      SetAPIErrorMessage("gatherORUMSPData: getNANDMSPBuffer tunnel command failed !");
+      break;
+    }
+    if (exporter->parseMSP(contexts[index], answer.bytes()) == 0) {
+      SetAPIErrorMessage("gatherORUMSPData: parseMSP failed !");
+      break;
+    }
+    fieldsByIndex.set(std::to_string(index), CreateDictFromCxt(contexts[index]));
+    exporter->releaseGenericCxt(contexts[index]);
+  }
+  return fieldsByIndex;
+}
+
+bool GatherNANDStats(nand_exporter_t*& exporter, ORUStatsContext& context) {
+  const RegistryObject service(findNandExporter(exporter));
+  if (!service) {
+    std::fputs("Could not get matching DevRegKit service for exporting classes\n", stderr);
+    return false;
+  }
+  ControllerConnection connection(service.get());
+  if (!connection) {
+    std::fputs("Could not get connection to service\n", stderr);
+    return false;
+  }
+  Answer answer;
+  const bool parsed = fetch(connection.get(), *exporter, exporter->getStatsSelectors, 0, answer) &&
+                      exporter->parseStats != nullptr &&
+                      exporter->parseStats(context, answer.bytes());
+  return connection.close() && parsed;
+}
+
+}  // namespace vesprun

@@ -1,0 +1,138 @@
+#include "NANDInfo/sets/StorageHealthFields.h"
+
+#include <algorithm>
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/sets/FieldNumber.h"
+#include "NANDInfo/sets/NANDInfo.h"
+#include "NANDInfo/tables/FieldSets.h"
+#include "platform/Platform.h"
+#include "telemetry/DiskInfo.h"
+#include "vesprun.h"
+
+namespace vesprun {
+namespace {
+
+constexpr std::uint32_t kStartOf2000 = 946'684'800;
+constexpr std::uint32_t kSecondsPerWeek = 604'800;
+constexpr unsigned kMSPs = 8;
+constexpr unsigned kBackupBootBlocks = 3;
+
+constexpr std::string_view kCopiedFields[] = {"averageSLCPECycles", "averageTLCPECycles",
+                                              "hostWrites", "powerOnHours", "powerOnSeconds"};
+
+const Number* numberUnder(const PropertyDict& fields, std::string_view stem, std::uint64_t index) {
+  return numberUnder(fields, std::string(stem) + std::to_string(index));
+}
+
+std::int32_t storeDemoMode() {
+  bool found = false;
+  const bool demo = platform().preferences().LGSPreferencesGetBoolValue(
+      "StoreDemoMode", "com.quill.demo-settings", found);
+  return found && demo ? 1 : 0;
+}
+
+std::uint64_t weeksSince2000(std::uint32_t secondsSince1970) {
+  return secondsSince1970 > kStartOf2000 ? (secondsSince1970 - kStartOf2000) / kSecondsPerWeek : 0;
+}
+
+std::uint64_t mostBootBlockRefreshes(const PropertyDict& ftl) {
+  std::uint64_t most = 0;
+  for (unsigned i = 0; i < kMSPs; ++i) {
+    std::uint64_t refreshes = 0;
+    for (const char* stem : {"numBootBlockRefreshSuccess_", "numBootBlockRefreshFail_"}) {
+      if (const Number* count = numberUnder(ftl, stem, i)) {
+        refreshes += count->asUInt64();
+      }
+    }
+    most = std::max(most, refreshes);
+  }
+  return most;
+}
+
+/// Adds up one kind of failure over `blocks` boot blocks of each MSP, from the one that comes
+/// `first` after the MSP's primary one.
+std::uint64_t bootBlockFailures(const PropertyDict& ftl, std::string_view stem,
+                                std::uint64_t blocksPerMSP, unsigned first, unsigned blocks) {
+  std::int64_t sum = 0;
+  for (unsigned msp = 0; msp < kMSPs; ++msp) {
+    for (unsigned block = first; block < first + blocks; ++block) {
+      if (const Number* failures = numberUnder(ftl, stem, msp * blocksPerMSP + block)) {
+        sum += failures->asInt32();
+      }
+    }
+  }
+  return static_cast<std::uint64_t>(sum);
+}
+
+void addBootBlockFailures(const PropertyDict& ftl, std::uint64_t blocksPerMSP,
+                          PropertyDict& fields) {
+  constexpr std::string_view kFailures[] = {"mspBootBlockReadFails", "mspBootBlockProgFails",
+                                            "mspBootBlockEraseFails"};
+  const auto add = [&](std::string_view suffix, unsigned first, unsigned blocks) {
+    for (const std::string_view failure : kFailures) {
+      fields.set("HLT_" + std::string(failure) + std::string(suffix),
+                 bootBlockFailures(ftl, std::string(failure) + '_', blocksPerMSP, first, blocks));
+    }
+  };
+  add("_main", 0, 1);
+  add("_backup", 1, kBackupBootBlocks);
+}
+
+void addFieldsOfFTL(const PropertyDict& ftl, PropertyDict& fields) {
+  const Number* userStart = numberUnder(ftl, "userPartitionStart");
+  const Number* intermediateStart = numberUnder(ftl, "intermediatePartitionStart");
+  if (userStart != nullptr && intermediateStart != nullptr) {
+    const std::int64_t size = std::int64_t{userStart->asInt32()} - intermediateStart->asInt32();
+    fields.set("HLT_intermediatePartitionSize", static_cast<std::uint64_t>(size));
+  }
+  if (const Number* formatTime = numberUnder(ftl, "utilFormatTime")) {
+    fields.set("HLT_formatWeeksSince2000", weeksSince2000(formatTime->asUInt32()));
+  }
+  for (const std::string_view name : kCopiedFields) {
+    if (const PropertyValue* value = ftl.find(name)) {
+      fields.set("HLT_" + std::string(name), *value);
+    }
+  }
+  fields.set("HLT_numBootBlockRefreshes_max", mostBootBlockRefreshes(ftl));
+  if (const Number* blocksPerMSP = numberUnder(ftl, "mspBootBlockCountPerMsp")) {
+    addBootBlockFailures(ftl, blocksPerMSP->asUInt64(), fields);
+  }
+}
+
+}  // namespace
+
+PropertyDict gatherORUFTLOtherData(const PropertyDict* ftl) {
+  PropertyDict fields = getReclaimerInfo();
+  fields.merge(CopyVMFreezerNANDInfo());
+  fields.merge(GetDiskInfo());
+  fields.set("HLT_storeDemoMode", storeDemoMode());
+  if (ftl == nullptr) {
+    SetAPIErrorMessage("gatherORUFTLOtherData: ftlDict is NULL");
+    return fields;
+  }
+  addFieldsOfFTL(*ftl, fields);
+  return fields;
+}
+
+PropertyDict gatherORUOtherData() {
+  PropertyDict selected;
+  const std::optional<PropertyDict> ftl = gatherORUFTLData(false, true, 0);
+  if (!ftl) {
+    SetAPIErrorMessage("gatherORUOtherData: Unable to get FTL counters");
+    return selected;
+  }
+  const PropertyDict derived = gatherORUFTLOtherData(&*ftl);
+  FTLStats4MSPStats.forEach([&](std::string_view name, const FieldRange&) {
+    if (const PropertyValue* value = derived.find(name)) {
+      selected.set(name, *value);
+    }
+  });
+  return selected;
+}
+
+}  // namespace vesprun

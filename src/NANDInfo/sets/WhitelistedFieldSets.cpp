@@ -1,0 +1,117 @@
+#include "vesprun.h"
+
+#include <cstdint>
+#include <string>
+#include <string_view>
+
+#include "NANDInfo/controller/EANQueries.h"
+#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/sets/FieldNumber.h"
+#include "NANDInfo/sets/FilteredDict.h"
+#include "NANDInfo/sets/NANDInfo.h"
+#include "NANDInfo/sets/StorageHealthFields.h"
+#include "NANDInfo/tables/FieldSets.h"
+
+namespace vesprun {
+namespace {
+
+constexpr std::string_view kFirmwareVersionKey = "fw_version_identifier";
+
+constexpr std::string_view kHealthFieldsOfStorageStats[] = {
+    "HLT_formatWeeksSince2000", "HLT_OR_Capacity_GB", "HLT_averageSLCPECycles",
+    "HLT_averageTLCPECycles",   "HLT_hostWrites",     "HLT_OR_Diskfullness_BP"};
+
+/// A figure that the EAN service tells of the image with a four-character code.
+struct ImageFigure {
+  std::string_view field;
+  std::uint64_t (*query)(std::uint32_t code);
+  char code[5];
+};
+
+constexpr ImageFigure kImageFigures[] = {
+    {"EAN_imageSize_BIC", GetEANImageSize, "dBIC"},
+    {"EAN_imageSize_LTH", GetEANImageSize, "dLTH"},
+    {"EAN_updateCount_FW", GetEANUpdateCount, "ifw1"},
+    {"EAN_updateCount_BIC", GetEANUpdateCount, "dBIC"},
+    {"EAN_updateCount_LTH", GetEANUpdateCount, "dLTH"},
+    {"EAN_updateCount_dConfig", GetEANUpdateCount, "dCfg"},
+    {"EAN_updateCount_fConfig", GetEANUpdateCount, "fCfg"},
+    {"EAN_updateCount_NonEssentialFW", GetEANUpdateCount, "nefw"},
+    {"EAN_updateCount_LowPowerEM", GetEANUpdateCount, "LPEM"},
+};
+
+constexpr std::uint32_t fourCharacterCode(const char (&text)[5]) {
+  std::uint32_t code = 0;
+  for (unsigned i = 0; i < 4; ++i) {
+    code = code << 8 | static_cast<unsigned char>(text[i]);
+  }
+  return code;
+}
+
+void addFirmwareVersionParts(const PropertyDict& msp, PropertyDict& set) {
+  const Number* version = numberUnder(msp, kFirmwareVersionKey);
+  if (version == nullptr) {
+    return;
+  }
+  for (unsigned part = 0; part < 4; ++part) {
+    set.set(std::string(kFirmwareVersionKey) + '_' + std::to_string(part),
+            version->asUInt64() >> (16 * part) & 0xFFFF);
+  }
+}
+
+}  // namespace
+
+PropertyDict CopyWhitelistedNANDFTLInfo(bool round) {
+  PropertyDict set;
+  if (std::optional<PropertyDict> fields = gatherORUFTLData(false, true, 0)) {
+    const PropertyDict derived = gatherORUFTLOtherData(&*fields);
+    if (derived.empty()) {
+      SetAPIErrorMessage("CopyWhitelistedNANDFTLInfo: Unable to gather HLT FTL fields");
+    }
+    fields->merge(derived);
+    set = CreateFilteredDict_SigDig(*fields, &WhitelistedRawNANDFTLCounters_SigDigDict, round);
+  } else {
+    SetAPIErrorMessage("CopyWhitelistedNANDFTLInfo: Unable to gather other FTL fields");
+  }
+  set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
+  return set;
+}
+
+std::optional<PropertyDict> CopyWhitelistedNANDFTLCountersInfo() { return std::nullopt; }
+
+PropertyDict CopyWhitelistedNANDMSPInfo(bool round) {
+  PropertyDict sets;
+  if (const std::optional<PropertyDict> fieldsByIndex = gatherORUMSPData()) {
+    const PropertyDict derived = gatherORUOtherData();
+    for (const auto& [index, fields] : *fieldsByIndex) {
+      const PropertyDict& msp = *fields.dict();
+      PropertyDict set =
+          CreateFilteredDict_SigDig(msp, &WhitelistedRawNANDMSPCounters_SigDigDict, round);
+      set.merge(derived);
+      addFirmwareVersionParts(msp, set);
+      sets.set(index, std::move(set));
+    }
+  } else {
+    SetAPIErrorMessage("CopyWhitelistedNANDMSPInfo: Unable to gather MSP fields");
+  }
+  sets.set(kAPIErrorMessageKey, GetAPIErrorMessage());
+  return sets;
+}
+
+PropertyDict CopyWhitelistedStorageStats(bool round) {
+  PropertyDict fields;
+  const PropertyDict derived = gatherORUOtherData();
+  for (const std::string_view name : kHealthFieldsOfStorageStats) {
+    if (const PropertyValue* value = derived.find(name)) {
+      fields.set(name, *value);
+    }
+  }
+  for (const ImageFigure& figure : kImageFigures) {
+    fields.set(figure.field, figure.query(fourCharacterCode(figure.code)));
+  }
+  PropertyDict set = CreateFilteredDict_SigDig(fields, &WhitelistedStorageStats_SigDigDict, round);
+  set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
+  return set;
+}
+
+}  // namespace vesprun

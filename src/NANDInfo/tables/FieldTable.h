@@ -1,0 +1,113 @@
+#pragma once
+
+#include <array>
+#include <bit>
+#include <cstddef>
+#include <cstdint>
+#include <span>
+#include <string>
+#include <string_view>
+
+#include "NANDInfo/tables/FieldName.h"
+
+namespace vesprun {
+
+/// Consecutively numbered fields, or a single one: a row of a field table. `digits` is the number
+/// of significant decimal digits that the fields keep, in the tables that say so.
+struct FieldRange {
+  std::string_view stem;
+  std::uint32_t first;  ///< `FieldName::kNoNumber`, as `last`, for a name without a number
+  std::uint32_t last;
+  std::uint8_t digits;
+
+  consteval FieldRange(const char* name) : FieldRange(0, name) {}
+  consteval FieldRange(const char* nameStem, std::uint32_t firstNumber, std::uint32_t lastNumber)
+      : FieldRange(0, nameStem, firstNumber, lastNumber) {}
+  consteval FieldRange(std::uint8_t digitCount, const char* name)
+      : FieldRange(digitCount, splitFieldName(name)) {}
+  consteval FieldRange(std::uint8_t digitCount, const char* nameStem, std::uint32_t firstNumber,
+                       std::uint32_t lastNumber)
+      : stem(nameStem), first(firstNumber), last(lastNumber), digits(digitCount) {
+    if (firstNumber > lastNumber || splitFieldName(nameStem).number != FieldName::kNoNumber) {
+      throw "a range runs upwards and its stem does not end in a digit";
+    }
+  }
+
+  constexpr std::size_t size() const { return std::size_t{last - first} + 1; }
+  constexpr bool contains(std::uint32_t number) const { return first <= number && number <= last; }
+
+ private:
+  consteval FieldRange(std::uint8_t digitCount, FieldName name)
+      : stem(name.stem), first(name.number), last(name.number), digits(digitCount) {}
+};
+
+/// Hash index over the stems of a table's ranges, made when the table is compiled. Ranges of one
+/// stem are chained in table order. A name that stands in the table twice does not compile.
+template <std::size_t RangeCount>
+struct FieldIndex {
+  // Entries are positions of ranges, counted from 1; 0 is none.
+  std::array<std::uint16_t, std::bit_ceil(2 * RangeCount)> slots{};
+  std::array<std::uint16_t, RangeCount> nextOfStem{};
+  std::size_t fieldCount = 0;
+
+  explicit consteval FieldIndex(const std::array<FieldRange, RangeCount>& ranges) {
+    for (std::size_t i = 0; i < RangeCount; ++i) {
+      fieldCount += ranges[i].size();
+      std::uint16_t* link = &slots[hashOfStem(ranges[i].stem) % slots.size()];
+      while (*link != 0 && ranges[*link - 1].stem != ranges[i].stem) {
+        link = link == &slots.back() ? &slots.front() : link + 1;
+      }
+      for (; *link != 0; link = &nextOfStem[*link - 1U]) {
+        const FieldRange& earlier = ranges[*link - 1];
+        if (earlier.first <= ranges[i].last && ranges[i].first <= earlier.last) {
+          throw "a name stands in the table twice";
+        }
+      }
+      *link = static_cast<std::uint16_t>(i + 1);
+    }
+  }
+};
+
+/// An ordered, constant set of field names, each with its digit count. It refers to its ranges and
+/// their index, which are constants; nothing is built when a program starts.
+class FieldTable {
+ public:
+  template <std::size_t RangeCount>
+  constexpr FieldTable(const std::array<FieldRange, RangeCount>& ranges,
+                       const FieldIndex<RangeCount>& index)
+      : _ranges(ranges),
+        _slots(index.slots),
+        _nextOfStem(index.nextOfStem),
+        _fieldCount(index.fieldCount) {}
+
+  /// The number of names.
+  constexpr std::size_t size() const { return _fieldCount; }
+
+  /// The range that `name` belongs to, or null. Takes the same time whatever the table's size, and
+  /// no memory.
+  const FieldRange* find(std::string_view name) const { return find(splitFieldName(name)); }
+  const FieldRange* find(const FieldName& name) const;
+  bool contains(std::string_view name) const { return find(name) != nullptr; }
+
+  std::span<const FieldRange> ranges() const { return _ranges; }
+
+  /// Calls `visit(name, range)` for every name in table order. The name lives as long as the call.
+  template <typename Visit>
+  void forEach(Visit&& visit) const {
+    std::string name;
+    for (const FieldRange& range : _ranges) {
+      for (std::size_t i = 0; i < range.size(); ++i) {
+        assignFieldName(name, range.stem, range.first + static_cast<std::uint32_t>(i));
+        visit(std::string_view(name), range);
+      }
+    }
+  }
+
+ private:
+  std::span<const FieldRange> _ranges;
+  std::span<const std::uint16_t> _slots;
+  std::span<const std::uint16_t> _nextOfStem;
+  std::size_t _fieldCount;
+};
+
+}  // namespace vesprun

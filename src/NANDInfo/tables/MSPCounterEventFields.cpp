@@ -1,0 +1,92 @@
+#include "NANDInfo/tables/EventFields.h"
+
+namespace vesprun {
+namespace {
+
+constexpr auto kMSPEventRanges = std::to_array<FieldRange>({
+    // clang-format off
+    "msp_index", {"active_time_hist", 0, 7}, {"avg_rd_window_size", 0, 4},
+    "bdbDefaultMoveFastToNormal", "bdbDefaultMoveNormalToFast", "bdbDynamicMovedToEOL_LSB",
+    "bdbDynamicMovedToEOL_MSB", "bdbDynamicMovedToEOL_QSB", "bdbDynamicMovedToEOL_USB",
+    "bdbDynamicMovedToSOL_LSB", "bdbDynamicMovedToSOL_MSB", "bdbDynamicMovedToSOL_QSB",
+    "bdbDynamicMovedToSOL_USB", "boot_block_convert_to_main", "boot_block_erase_failures",
+    "boot_block_program_failures", "boot_block_read_failures", "boot_block_read_source_changed",
+    "boot_block_refresh", "boot_block_read_verify_failures", {"deepSoft1Decoded", 0, 9},
+    {"deepSoft2Decoded", 0, 9}, "device_config", {"DYCE1_Decoded_Bitflips", 0, 14},
+    {"DYCE1_Target_Bitflips", 0, 19}, {"DYCE2_Decoded_Bitflips", 0, 14},
+    {"DYCE2_Target_Bitflips", 0, 19}, "firstReadWasFS2EOL", "firstReadWasFS2EOL_DSP",
+    "firstReadWasHardWithAcq", "firstReadWasHardWithDefaultBDB",
+    "firstReadWasHardWithDefaultBDBFastRead", {"FS1decodedbitflips", 0, 10},
+    {"FS2decodedBitFlips", 0, 10}, {"higher_die_temperature", 0, 15}, "link_speed_recoveries",
+    {"lower_die_temperature", 0, 15}, "maintenance_backup_to_main", "maintenance_main_to_backup",
+    "num_zq_failures", "number_of_reset_failures", "number_of_sram_flips",
+    "number_of_throttling_events", "numOfCwFailedInTmodeFS2_DSP_EOL", "numOfCwFailedInTmodeFS2_EOL",
+    {"numOfSensesWereSentDuringMiniAcq", 0, 2}, {"numOfSensesWereSentDuringSyndSumAcq", 0, 4},
+    "numOfSlipTracking", {"open_blocks_hist", 0, 6}, "passWithTmodeFS1_2b",
+    "passWithTmodeFS1_2b_fast", "passWithTmodeFS1_4b", "passWithTmodeFS1_4b_fast",
+    "passWithTmodeHard", "passWithTmodeHard_fast", {"random_read_hit_ratio_hist", 0, 5},
+    {"readAlgoPassedThroughDS", 1, 2}, "readAlgoPassedThroughDS1_DSP",
+    "readAlgoPassedThroughFS2_2b", "readAlgoPassedThroughFS2_2b_fast",
+    "readAlgoPassedThroughFS2_4b", "readAlgoPassedThroughFS2_4b_fast", "readAlgoPassedThroughFS3",
+    "readAlgoPassedThroughFS3_fast", "readAlgoPassedThroughSlip", "readAlgoPassedThroughSlip_fast",
+    "readAlgoPassedThroughSyndSumAcquisition", {"readalgoPassWithDS", 1, 2},
+    "readAlgoPassedThroughSyndSumAcquisition_DSP", "readalgoPassWithDS1_DSP",
+    {"readalgoPassWithDYCE", 1, 2}, "readalgoPassWithDYCE1_DSP", "readalgoPassWithEXH",
+    "readalgoPassWithEXH_DSP", "readAlgoPassWithFS12BitAfterAcq",
+    "readAlgoPassWithFS12BitAfterSlip", "readAlgoPassWithFS12BitAfterSlip_fast",
+    "readAlgoPassWithFS14BitAfterAcq", "readAlgoPassWithFS14BitAfterSlip",
+    "readAlgoPassWithFS14BitAfterSlip_fast", "readAlgoPassWithFS2_4b",
+    "readAlgoPassWithFS2_4b_fast", "readAlgoPassWithFS3", "readAlgoPassWithFS3_fast",
+    "total_nof_msps", "syndSumAcqConvergedToStaticWalls",
+    {"slipTrackingAfterFs1ForceFailChangedVthInTicksHist", 0, 3}, "readZeroPage", "readFail",
+    "readErasedPage", "readAlgoPassWithHardAfterSlip_fast", "readAlgoPassWithHardAfterSlip",
+    "readAlgoPassWithHardAfterAcq", "HLT_APIErrorCode", "HLT_averageSLCPECycles",
+    "HLT_averageTLCPECycles", "HLT_formatWeeksSince2000", "HLT_hostWrites", "HLT_OR_Capacity_GB",
+    "active_time_bw_pg_acc", {"active_time_bw_pg_hist", 0, 9}, "active_time_bw_pg_max",
+    "active_time_bw_pg_min", {"auto_skip", 0, 4}, {"boot_time_low_power", 0, 4},
+    {"boot_time_normal_power", 0, 4}, "cbdr_outlier", {"cbdr_ref_", 1, 2}, {"cbdr_step_", 10, 79},
+    {"dspExceptionParameter", 115, 121}, {"dspExceptionParameter", 1000, 1003},
+    {"dspExceptionParameter", 1010, 1013}, {"dspExceptionParameter", 1020, 1023},
+    {"dspExceptionParameter", 1030, 1033}, {"dspExceptionParameter", 1040, 1043},
+    {"dspExceptionParameter", 1050, 1053}, {"dspExceptionParameter", 1060, 1063},
+    {"dspExceptionParameter", 1070, 1073}, {"dspExceptionParameter", 1080, 1083},
+    {"dspExceptionParameter", 1090, 1093}, {"dspExceptionParameter", 1100, 1103},
+    {"dspExceptionParameter", 1110, 1113}, {"dspExceptionParameter", 1120, 1123},
+    {"dspExceptionParameter", 1130, 1133}, {"dspExceptionParameter", 1140, 1149},
+    {"dspExceptionParameter", 1220, 1237}, {"dspExceptionParameter", 11410, 11419},
+    {"dspExceptionParameter", 12210, 12219}, {"e2e_error_count_tmode", 0, 4},
+    {"external_etags_usage_hist", 0, 6}, "gps_max_num_of_failures",
+    "gps_num_of_failures_max_overflow", {"initialReadStage", 100, 104},
+    {"initialReadStage", 200, 209}, {"initialReadStage", 211, 213},
+    {"initialReadStage", 2100, 2103}, {"internal_etags_usage_hist", 0, 3}, "max_heap_usage",
+    "max_size_open_blocks_list", {"mdll_relative_offset", 0, 4}, "msp_number_sram_flips",
+    {"nandStageOfLife", 100, 104}, "num_auto_program_cache_terminations", "num_pg_events",
+    "num_pg_regrets", "number_gracefull_read_terminations", "number_of_dcc_failures",
+    "number_of_dcc_pass_after_retry", "number_of_read_cache_auto_terminations",
+    {"random_read_size_ratio", 0, 4}, "readStage100", {"readStage", 102, 104}, "readStage200",
+    {"readStage", 203, 208}, {"readStage", 211, 215}, {"readStage", 1010, 1013},
+    {"readStage", 1050, 1053}, {"readStage", 1060, 1063}, {"readStage", 1070, 1073},
+    {"readStage", 1080, 1083}, {"readStage", 1090, 1093}, {"readStage", 1100, 1103},
+    {"readStage", 2010, 2013}, {"readStage", 2020, 2023}, {"readStage", 2090, 2093},
+    {"readStage", 2100, 2103}, {"readStageNumOfErrorsBin", 1000, 1009},
+    {"readStageNumOfErrorsBin", 10010, 10019}, {"readStageNumOfFails", 100, 101},
+    {"readStageNumOfFails", 200, 203}, {"readStageNumOfFails", 1020, 1023},
+    {"readStageNumOfFails", 1030, 1043}, {"readStageNumOfFails", 1050, 1053},
+    {"readStageNumOfFails", 1060, 1063}, {"readStageNumOfFails", 1070, 1073},
+    {"readStageNumOfFails", 1080, 1089}, {"readStageNumOfFails", 10310, 10363},
+    {"readStageNumOfFails", 10810, 10863}, {"rom_num_hard_resets", 0, 5},
+    "spi_image_cw_fetch_duration_acc", {"spi_image_cw_fetch_duration_hist", 0, 4},
+    "spi_image_overall_duration_acc", "spi_num_uses", {"fw_version_identifier_", 0, 3},
+    "fw_updates", {"rd_retraining_failures", 0, 1}, {"wr_retraining_failures", 0, 1},
+    {"rd_retraining_failures_v", 20, 21}, {"extended_rd_window_diff_dist", 0, 8},
+    {"rd_window_dist", 0, 8}, "Count",
+    // clang-format on
+});
+constexpr FieldIndex kMSPEventIndex(kMSPEventRanges);
+static_assert(kMSPEventIndex.fieldCount == 822);
+
+}  // namespace
+
+constinit const FieldTable massStorage_NANDInfo_MSPCounters_1(kMSPEventRanges, kMSPEventIndex);
+
+}  // namespace vesprun

@@ -1,0 +1,182 @@
+#include "platform/host/counters/CounterFile.h"
+
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <cstdio>
+#include <string_view>
+
+#include "platform/host/files/AtomicFile.h"
+#include "platform/host/files/FileLock.h"
+#include "platform/host/files/NameAside.h"
+#include "platform/host/files/SystemError.h"
+
+namespace vesprun {
+namespace {
+
+constexpr std::string_view kFolder = "var/mobile/Library/Tallybook";
+constexpr const char* kName = "TBDataStore.sqlitedb";
+
+// What SQLite may keep beside a database. We use only the first; other tools may turn on the rest.
+constexpr std::array kCompanions{"-journal", "-wal", "-shm"};
+
+constexpr int kMostAttempts = 3;
+
+bool exists(const std::string& path) {
+  struct stat status {};
+  return lstat(path.c_str(), &status) == 0;
+}
+
+}  // namespace
+
+bool CounterFile::write(const std::function<bool(CounterStore&)>& work, std::string& error,
+                        std::optional<Damage>& damage) {
+  return use(SqliteTransaction::Kind::Writing, work, error, damage);
+}
+
+bool CounterFile::read(const std::function<void(CounterStore&)>& work, std::string& error,
+                       std::optional<Damage>& damage) {
+  const auto reading = [&work](CounterStore& store) {
+    work(store);
+    return true;
+  };
+  return use(SqliteTransaction::Kind::Reading, reading, error, damage);
+}
+
+bool CounterFile::use(SqliteTransaction::Kind kind, const std::function<bool(CounterStore&)>& work,
+                      std::string& error, std::optional<Damage>& damage) {
+  const bool writes = kind == SqliteTransaction::Kind::Writing;
+  const std::string folder = _directory.hostPath(kFolder);
+  const std::string path = folder + '/' + kName;
+  struct stat status {};
+  std::optional<FolderLock> shared;
+  // Between making and locking, another process may move the new file away.
+  for (int attempt = 1; !shared; ++attempt) {
+    if (stat(path.c_str(), &status) != 0 && errno == ENOENT) {
+      if (!writes) {
+        return true;
+      }
+      if (!make(error)) {
+        return false;
+      }
+    }
+    shared = FolderLock::take(folder, error, FolderLock::Kind::Shared, _longestWait);
+    if (!shared) {
+      return false;
+    }
+    if (stat(path.c_str(), &status) != 0) {
+      if (errno != ENOENT || attempt == kMostAttempts) {
+        error = systemError(path);
+        return false;
+      }
+      shared.reset();
+    }
+  }
+  if (!S_ISREG(status.st_mode)) {
+    error = path + ": not a regular file";
+    return false;
+  }
+  try {
+    CounterStore store(path, _longestWait);
+    SqliteTransaction transaction(store.connection(), kind);
+    if (!work(store)) {
+      return false;
+    }
+    if (writes) {
+      transaction.commit();
+    }
+    return true;
+  } catch (const SqliteFailure& failure) {
+    error = failure.text;
+    if (failure.isCorruption()) {
+      damage = Damage{status.st_dev, status.st_ino, failure.text};
+    }
+    return false;
+  }
+}
+
+bool CounterFile::make(std::string& error) {
+  const std::optional<std::string> folder = _directory.makeFolder(kFolder, error);
+  if (!folder) {
+    return false;
+  }
+  const auto exclusive =
+      FolderLock::take(*folder, error, FolderLock::Kind::Exclusive, _longestWait);
+  return exclusive && makeLocked(error);
+}
+
+// The file gets its name complete, so an empty one is never ours.
+bool CounterFile::makeLocked(std::string& error) {
+  const std::string folder = _directory.hostPath(kFolder);
+  const std::string path = folder + '/' + kName;
+  if (exists(path)) {
+    return true;
+  }
+  // The journal of a file that is gone would be played back into the new one.
+  const std::string aside = unusedNameAside();
+  for (const char* companion : kCompanions) {
+    if (std::rename((path + companion).c_str(), (aside + companion).c_str()) != 0 &&
+        errno != ENOENT) {
+      error = systemError(path + companion);
+      return false;
+    }
+  }
+  std::string content;
+  try {
+    content = CounterStore::emptyDatabase();
+  } catch (const SqliteFailure& failure) {
+    error = failure.text;
+    return false;
+  }
+  std::optional<AtomicFile> file = AtomicFile::create(folder, error);
+  if (!file) {
+    return false;
+  }
+  file->append(content);
+  return file->addNew(kName, error) != AtomicFile::Added::Failed;
+}
+
+std::optional<std::string> CounterFile::replace(const Damage& damage, std::string& error) {
+  const std::string folder = _directory.hostPath(kFolder);
+  const std::string path = folder + '/' + kName;
+  const auto exclusive = FolderLock::take(folder, error, FolderLock::Kind::Exclusive, _longestWait);
+  if (!exclusive) {
+    return std::nullopt;
+  }
+  std::string aside;
+  struct stat status {};
+  if (stat(path.c_str(), &status) == 0 && status.st_dev == damage.device &&
+      status.st_ino == damage.number) {
+    aside = unusedNameAside();
+    // The file first: without it, a journal left by a kill at this point is moved later, too.
+    if (std::rename(path.c_str(), aside.c_str()) != 0) {
+      error = systemError(path);
+      return std::nullopt;
+    }
+    for (const char* companion : kCompanions) {
+      std::rename((path + companion).c_str(), (aside + companion).c_str());
+    }
+  }
+  if (!makeLocked(error)) {
+    return std::nullopt;
+  }
+  return aside;
+}
+
+std::string CounterFile::unusedNameAside() const {
+  const std::string aside =
+      nameAside(_directory.hostPath(kFolder) + '/' + kName, "corrupt", _clock);
+  std::string name = aside;
+  const auto isTaken = [&name] {
+    return exists(name) || std::any_of(kCompanions.begin(), kCompanions.end(),
+                                       [&](const char* end) { return exists(name + end); });
+  };
+  for (int number = 2; isTaken(); ++number) {
+    name = aside + '-' + std::to_string(number);
+  }
+  return name;
+}
+
+}  // namespace vesprun

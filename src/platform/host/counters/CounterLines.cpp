@@ -1,0 +1,301 @@
+#include "platform/host/counters/CounterLines.h"
+
+#include <cerrno>
+#include <cmath>
+#include <cstring>
+#include <map>
+#include <optional>
+#include <utility>
+#include <vector>
+
+#include "platform/host/documents/QuotedText.h"
+
+namespace vesprun {
+namespace {
+
+constexpr std::size_t kReadSize = 256 * 1024;
+constexpr std::size_t kLongestLine = 2 * 1024 * 1024;  // the longest key fits
+constexpr std::size_t kMostBufferedBytes = 32 * 1024 * 1024;
+
+/// Parts a stream at line feeds; the last line may go without.
+class LineReader {
+ public:
+  explicit LineReader(std::istream& stream) : _stream(stream) {}
+
+  /// The next line, valid until the next call; nothing at the end, and, with a text in `error`,
+  /// when it cannot be had.
+  std::optional<std::string_view> next(std::string& error) {
+    std::size_t searched = _begin;
+    for (;;) {
+      const void* feed = std::memchr(_buffer.data() + searched, '\n', _end - searched);
+      if (feed != nullptr) {
+        const auto end = static_cast<std::size_t>(static_cast<const char*>(feed) - _buffer.data());
+        const std::string_view line(_buffer.data() + _begin, end - _begin);
+        _begin = end + 1;
+        return line;
+      }
+      if (_end - _begin > kLongestLine) {
+        error = "longer than 2 MiB";
+        return std::nullopt;
+      }
+      searched = _end - _begin;
+      if (!readMore(error)) {
+        if (!error.empty() || _begin == _end) {
+          return std::nullopt;
+        }
+        return std::string_view(_buffer.data() + std::exchange(_begin, _end), searched);
+      }
+    }
+  }
+
+ private:
+  bool readMore(std::string& error) {
+    std::memmove(_buffer.data(), _buffer.data() + _begin, _end - _begin);
+    _end -= std::exchange(_begin, 0);
+    if (_buffer.size() < _end + kReadSize) {
+      _buffer.resize(_end + kReadSize);
+    }
+    errno = 0;
+    _stream.read(_buffer.data() + _end, static_cast<std::streamsize>(_buffer.size() - _end));
+    if (_stream.bad()) {
+      error = errno != 0 ? std::strerror(errno) : "cannot be read";
+      return false;
+    }
+    _end += static_cast<std::size_t>(_stream.gcount());
+    return _stream.gcount() > 0;
+  }
+
+  std::istream& _stream;
+  std::string _buffer;
+  std::size_t _begin = 0;
+  std::size_t _end = 0;
+};
+
+/// Collects the samples of each key, so that lines of many keys in turn reach the tables as runs.
+class SampleBuffer {
+ public:
+  explicit SampleBuffer(CounterStore& counters) : _counters(counters) {}
+
+  bool add(std::int32_t day, std::string_view key, Sample sample, std::string& error) {
+    constexpr std::size_t kEntrySize = 128;  // about what a node costs beside its key and samples
+    if (_current == _samples.end() || _current->first.first != day ||
+        _current->first.second != key) {
+      if (!isCounterKey(key, error)) {
+        return false;
+      }
+      const auto [entry, isNew] = _samples.try_emplace({day, std::string(key)});
+      _current = entry;
+      _size += isNew ? kEntrySize + key.size() : 0;
+    }
+    _current->second.push_back(sample);
+    _size += sizeof sample;
+    if (_size > kMostBufferedBytes) {
+      flush();
+    }
+    return true;
+  }
+
+  void flush() {
+    for (const auto& [place, samples] : _samples) {
+      _counters.appendSamples(place.first, place.second, samples);
+    }
+    _samples.clear();
+    _current = _samples.end();
+    _size = 0;
+  }
+
+ private:
+  using Samples = std::map<std::pair<std::int32_t, std::string>, std::vector<Sample>>;
+
+  CounterStore& _counters;
+  Samples _samples;
+  Samples::iterator _current = _samples.end();
+  std::size_t _size = 0;
+};
+
+/// Takes the first field from the text; false when no tab follows it.
+bool takeFirst(std::string_view& text, std::string_view& field) {
+  const auto tab = text.find('\t');
+  if (tab == std::string_view::npos) {
+    return false;
+  }
+  field = text.substr(0, tab);
+  text.remove_prefix(tab + 1);
+  return true;
+}
+
+bool takeLast(std::string_view& text, std::string_view& field) {
+  const auto tab = text.rfind('\t');
+  if (tab == std::string_view::npos) {
+    return false;
+  }
+  field = text.substr(tab + 1);
+  text.remove_suffix(text.size() - tab);
+  return true;
+}
+
+template <typename T>
+bool parseField(std::string_view field, const char* what, T& value, std::string& error) {
+  if (parseWholeText(field, value)) {
+    return true;
+  }
+  error = quotedText(field) + " is not " + what;
+  return false;
+}
+
+bool importLine(std::string_view line, CounterStore& counters, SampleBuffer& samples,
+                std::string& error) {
+  std::string_view kind;
+  std::string_view dayText;
+  std::string_view valueText;
+  std::string_view offsetText;
+  std::string_view key = line;
+  const bool hasKind = takeFirst(key, kind) && (kind == "scalar" || kind == "sample");
+  const bool isSample = kind == "sample";
+  if (!hasKind || !takeFirst(key, dayText) || (isSample && !takeLast(key, offsetText)) ||
+      !takeLast(key, valueText)) {
+    error = quotedText(line) +
+            " is neither scalar, DAY, KEY, VALUE nor sample, DAY, KEY, VALUE, "
+            "OFFSET with tabs between";
+    return false;
+  }
+  std::int32_t day = 0;
+  if (!parseField(dayText, "a day number", day, error)) {
+    return false;
+  }
+  if (!isSample) {
+    std::int64_t value = 0;
+    if (!parseField(valueText, "a signed 64-bit integer", value, error) ||
+        !isCounterKey(key, error)) {
+      return false;
+    }
+    counters.setScalar(day, key, value);
+    return true;
+  }
+  Sample sample{};
+  return parseField(valueText, "a double", sample.value, error) &&
+         parseField(offsetText, "an offset in seconds", sample.secondsInDay, error) &&
+         samples.add(day, key, sample, error);
+}
+
+/// Forms the lines and hands them on in pieces.
+class LineWriter {
+ public:
+  explicit LineWriter(const std::function<bool(std::string_view)>& sink) : _sink(sink) {}
+
+  bool isOpen() const { return _open; }
+
+  void scalar(std::int32_t day, std::string_view key, std::int64_t value) {
+    begin("scalar", day, key);
+    number(value);
+    end();
+  }
+
+  void sample(std::int32_t day, std::string_view key, double value, std::int32_t offset) {
+    begin("sample", day, key);
+    if (std::isnan(value)) {
+      _text += "nan";  // whatever its sign
+    } else {
+      number(value);
+    }
+    _text += '\t';
+    number(offset);
+    end();
+  }
+
+  void flush() {
+    _open = _open && (_text.empty() || _sink(_text));
+    _text.clear();
+  }
+
+ private:
+  void begin(const char* kind, std::int32_t day, std::string_view key) {
+    _text += kind;
+    _text += '\t';
+    number(day);
+    _text += '\t';
+    _text += key;
+    _text += '\t';
+  }
+
+  template <typename T>
+  void number(T value) {
+    char digits[32];  // the longest double takes 24
+    const auto result = std::to_chars(digits, digits + sizeof digits, value);
+    _text.append(digits, result.ptr);
+  }
+
+  void end() {
+    _text += '\n';
+    if (_text.size() >= kReadSize) {
+      flush();
+    }
+  }
+
+  const std::function<bool(std::string_view)>& _sink;
+  std::string _text;
+  bool _open = true;
+};
+
+}  // namespace
+
+bool importCounterLines(std::istream& lines, CounterStore& counters, std::string& error) {
+  LineReader reader(lines);
+  SampleBuffer samples(counters);
+  std::string cause;
+  for (std::uint64_t number = 1;; ++number) {
+    const std::optional<std::string_view> line = reader.next(cause);
+    if (!line && cause.empty()) {
+      samples.flush();
+      return true;
+    }
+    if (!line || !importLine(*line, counters, samples, cause)) {
+      error = "line " + std::to_string(number) + ": " + cause;
+      return false;
+    }
+  }
+}
+
+bool exportCounterLines(CounterStore& counters, std::int32_t firstDay, std::int32_t lastDay,
+                        const std::function<bool(std::string_view)>& sink, std::string& error) {
+  LineWriter writer(sink);
+  std::uint64_t leftOut = 0;
+  const auto canBeWritten = [&](std::string_view key) {
+    const bool good = key.find('\n') == std::string_view::npos;
+    if (!good && leftOut++ == 0) {
+      error = quotedText(key);
+    }
+    return good;
+  };
+  std::optional<std::int32_t> day = counters.nextDay(std::int64_t{firstDay} - 1);
+  for (; writer.isOpen() && day && *day <= lastDay; day = counters.nextDay(*day)) {
+    counters.readScalars(
+        "", *day, *day,
+        [&](std::string_view key, std::int32_t rowDay, std::int64_t value, bool& stop) {
+          if (canBeWritten(key)) {
+            writer.scalar(rowDay, key, value);
+          }
+          stop = !writer.isOpen();
+        });
+    counters.readDistributions(
+        "", *day, *day,
+        [&](std::string_view key, std::int32_t rowDay, TBHistoryDistributionEnumerator& values,
+            bool& stop) {
+          double value = 0;
+          std::int32_t offset = 0;
+          const bool good = canBeWritten(key);
+          while (good && writer.isOpen() && values.getNextValueSecondsInDayOffset(value, &offset)) {
+            writer.sample(rowDay, key, value, offset);
+          }
+          stop = !writer.isOpen();
+        });
+  }
+  writer.flush();
+  if (leftOut != 0) {
+    error = std::to_string(leftOut) + " counters, the first of them " + error +
+            ", are left out: no line can carry a line feed in a key";
+  }
+  return leftOut == 0;
+}
+
+}  // namespace vesprun

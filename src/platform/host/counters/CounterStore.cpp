@@ -1,0 +1,255 @@
+#include "platform/host/counters/CounterStore.h"
+
+#include <algorithm>
+#include <cstring>
+#include <limits>
+
+#include "common/PropertyValue.h"
+#include "platform/host/counters/ChunkEnumerator.h"
+#include "platform/host/documents/QuotedText.h"
+#include "platform/host/documents/XmlText.h"
+
+namespace vesprun {
+namespace {
+
+constexpr std::int64_t kApplicationIdentifier = 0x56455350;  // "VESP"
+constexpr std::int64_t kSchemaVersion = 1;
+constexpr std::size_t kLongestKey = 1024 * 1024;
+
+// Pages of 16 KiB: a chunk of samples is read by few calls.
+constexpr const char* kSchema = R"(
+  PRAGMA page_size = 16384;
+  CREATE TABLE scalar (
+    day INTEGER NOT NULL,
+    key TEXT NOT NULL,
+    value INTEGER NOT NULL,
+    PRIMARY KEY (day, key)
+  ) STRICT, WITHOUT ROWID;
+  CREATE TABLE distribution (
+    id INTEGER PRIMARY KEY,
+    day INTEGER NOT NULL,
+    key TEXT NOT NULL,
+    UNIQUE (day, key)
+  ) STRICT;
+  CREATE TABLE chunk (
+    distribution INTEGER NOT NULL REFERENCES distribution (id),
+    sequence INTEGER NOT NULL,
+    samples BLOB NOT NULL,
+    offsets BLOB NOT NULL,
+    PRIMARY KEY (distribution, sequence)
+  ) STRICT;
+  PRAGMA application_id = 0x56455350;
+  PRAGMA user_version = 1;
+)";
+
+/// Gives `deliver` the rows of day, key and a third column, which `statement` selects between two
+/// days in the order of days and keys, for which the key begins with `keyPrefix`; until it sets its
+/// last argument. Sees to it that all rows come in order and with keys that can have been written.
+template <typename Deliver>
+void forEachRow(const SqliteConnection& connection, const char* statement,
+                std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
+                const Deliver& deliver) {
+  SqliteStatement rows(connection, statement);
+  rows.bind(1, minDay).bind(2, maxDay);
+  std::int64_t lastDay = std::numeric_limits<std::int64_t>::min();
+  std::string lastKey;
+  bool stop = false;
+  while (!stop && rows.step()) {
+    const std::int64_t day = rows.integer(0);
+    const std::string_view key = rows.text(1);
+    if (!isXmlText(key)) {
+      connection.failAsCorrupt("a key is no text");
+    }
+    if (day < lastDay || (day == lastDay && key <= lastKey)) {
+      connection.failAsCorrupt("rows are out of order");
+    }
+    lastDay = day;
+    lastKey = key;
+    if (key.starts_with(keyPrefix)) {
+      deliver(key, static_cast<std::int32_t>(day), rows.integer(2), stop);
+    }
+  }
+}
+
+void appendBytes(Bytes& bytes, const void* value, std::size_t size) {
+  const std::size_t end = bytes.size();
+  bytes.resize(end + size);
+  std::memcpy(bytes.data() + end, value, size);
+}
+
+}  // namespace
+
+bool isCounterKey(std::string_view key, std::string& error) {
+  const std::size_t good = xmlTextLength(key);
+  if (good != key.size()) {
+    error = "the key " + quotedText(key) + " has, at byte " + std::to_string(good) +
+            ", what no ptree document can carry";
+    return false;
+  }
+  if (key.size() > kLongestKey) {
+    error = "the key " + quotedText(key) + " is longer than 1 MiB";
+    return false;
+  }
+  return true;
+}
+
+struct CounterStore::Writer {
+  explicit Writer(const SqliteConnection& connection)
+      : readScalar(connection, "SELECT value FROM scalar WHERE day = ? AND key = ?"),
+        putScalar(connection,
+                  "INSERT INTO scalar (day, key, value) VALUES (?, ?, ?) "
+                  "ON CONFLICT DO UPDATE SET value = excluded.value"),
+        findDistribution(connection, "SELECT id FROM distribution WHERE day = ? AND key = ?"),
+        putDistribution(connection, "INSERT INTO distribution (day, key) VALUES (?, ?)"),
+        lastChunk(connection,
+                  "SELECT sequence, samples, offsets FROM chunk WHERE distribution = ? "
+                  "ORDER BY sequence DESC LIMIT 1"),
+        putChunk(connection,
+                 "INSERT OR REPLACE INTO chunk (distribution, sequence, samples, offsets) "
+                 "VALUES (?, ?, ?, ?)") {}
+
+  SqliteStatement readScalar;
+  SqliteStatement putScalar;
+  SqliteStatement findDistribution;
+  SqliteStatement putDistribution;
+  SqliteStatement lastChunk;
+  SqliteStatement putChunk;
+};
+
+CounterStore::CounterStore(const std::string& path, std::chrono::milliseconds longestWait)
+    : _connection(path, longestWait) {
+  if (_connection.queryInteger("PRAGMA application_id") != kApplicationIdentifier ||
+      _connection.queryInteger("PRAGMA user_version") != kSchemaVersion) {
+    _connection.failAsCorrupt("not a counter database of this version");
+  }
+  // SQLite takes an unknown format version for a database of the future and never writes to it.
+  std::uint8_t header[20];
+  _connection.readHeader(header);
+  constexpr std::uint8_t kNewestFormat = 2;
+  if (header[18] > kNewestFormat) {
+    _connection.failAsCorrupt("the header is damaged");
+  }
+}
+
+std::string CounterStore::emptyDatabase() {
+  SqliteConnection database(":memory:", std::chrono::milliseconds::zero());
+  database.execute(kSchema);
+  sqlite3_int64 size = 0;
+  const std::unique_ptr<unsigned char, decltype(&sqlite3_free)> bytes(
+      sqlite3_serialize(database.handle(), "main", &size, 0), sqlite3_free);
+  if (!bytes) {
+    database.fail(SQLITE_NOMEM);
+  }
+  return {reinterpret_cast<const char*>(bytes.get()), static_cast<std::size_t>(size)};
+}
+
+CounterStore::Writer& CounterStore::writer() {
+  if (!_writer) {
+    _writer = std::make_shared<Writer>(_connection);
+  }
+  return *_writer;
+}
+
+void CounterStore::setScalar(std::int32_t day, std::string_view key, std::int64_t value) {
+  writer().putScalar.bind(1, day).bind(2, key).bind(3, value).run();
+}
+
+void CounterStore::addToScalar(std::int32_t day, std::string_view key, std::int64_t value) {
+  SqliteStatement& read = writer().readScalar.bind(1, day).bind(2, key);
+  const std::int64_t stored = read.step() ? read.integer(0) : 0;
+  read.reset();
+  setScalar(day, key, wrappingSum(stored, value));
+}
+
+std::int64_t CounterStore::distributionForWriting(std::int32_t day, std::string_view key) {
+  SqliteStatement& find = writer().findDistribution.bind(1, day).bind(2, key);
+  const bool found = find.step();
+  const std::int64_t id = found ? find.integer(0) : 0;
+  find.reset();
+  if (found) {
+    return id;
+  }
+  writer().putDistribution.bind(1, day).bind(2, key).run();
+  return sqlite3_last_insert_rowid(_connection.handle());
+}
+
+void CounterStore::appendSamples(std::int32_t day, std::string_view key,
+                                 std::span<const Sample> samples) {
+  const std::int64_t distribution = distributionForWriting(day, key);
+  Bytes values;
+  Bytes offsets;
+  std::int64_t sequence = 0;
+  SqliteStatement& last = writer().lastChunk.bind(1, distribution);
+  if (last.step()) {
+    sequence = last.integer(0);
+    const auto lastValues = last.bytes(1);
+    const auto lastOffsets = last.bytes(2);
+    if (lastValues.size() % sizeof(double) != 0 ||
+        lastOffsets.size() / sizeof(std::int32_t) != lastValues.size() / sizeof(double)) {
+      _connection.failAsCorrupt("a chunk of samples has a wrong length");
+    }
+    if (lastValues.size() / sizeof(double) < kSamplesPerChunk) {
+      values.assign(lastValues.begin(), lastValues.end());
+      offsets.assign(lastOffsets.begin(), lastOffsets.end());
+    } else {
+      ++sequence;
+    }
+  }
+  last.reset();
+  while (!samples.empty()) {
+    const std::size_t taken =
+        std::min(samples.size(), kSamplesPerChunk - values.size() / sizeof(double));
+    for (const Sample& sample : samples.first(taken)) {
+      appendBytes(values, &sample.value, sizeof sample.value);
+      appendBytes(offsets, &sample.secondsInDay, sizeof sample.secondsInDay);
+    }
+    writer()
+        .putChunk.bind(1, distribution)
+        .bind(2, sequence)
+        .bind(3, values)
+        .bind(4, offsets)
+        .run();
+    samples = samples.subspan(taken);
+    ++sequence;
+    values.clear();
+    offsets.clear();
+  }
+}
+
+void CounterStore::readScalars(std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
+                               const TBHistory::ScalarRowHandler& handler) {
+  forEachRow(_connection,
+             "SELECT day, key, value FROM scalar WHERE day BETWEEN ? AND ? ORDER BY day, key",
+             keyPrefix, minDay, maxDay, handler);
+}
+
+void CounterStore::readDistributions(std::string_view keyPrefix, std::int32_t minDay,
+                                     std::int32_t maxDay,
+                                     const TBHistory::DistributionRowHandler& handler) {
+  ChunkEnumerator values(_connection);
+  forEachRow(_connection,
+             "SELECT day, key, id FROM distribution WHERE day BETWEEN ? AND ? ORDER BY day, key",
+             keyPrefix, minDay, maxDay,
+             [&](std::string_view key, std::int32_t day, std::int64_t id, bool& stop) {
+               values.start(id);
+               handler(key, day, values, stop);
+               values.rethrowFailure();
+             });
+}
+
+std::optional<std::int32_t> CounterStore::nextDay(std::int64_t day) {
+  SqliteStatement next(_connection,
+                       "SELECT min(day) FROM (SELECT min(day) AS day FROM scalar WHERE day > ?1 "
+                       "UNION ALL SELECT min(day) FROM distribution WHERE day > ?1)");
+  next.bind(1, day);
+  if (!next.step() || next.isNull(0)) {
+    return std::nullopt;
+  }
+  const std::int64_t found = next.integer(0);
+  if (found <= day || found > std::numeric_limits<std::int32_t>::max()) {
+    _connection.failAsCorrupt("a day is out of range");
+  }
+  return static_cast<std::int32_t>(found);
+}
+
+}  // namespace vesprun

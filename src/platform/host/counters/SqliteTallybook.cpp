@@ -1,0 +1,170 @@
+#include "platform/host/counters/SqliteTallybook.h"
+
+#include <optional>
+
+#include "common/Date.h"
+#include "platform/PreferenceNames.h"
+
+namespace vesprun {
+class SqliteTallybook::History final : public TBHistory {
+ public:
+  explicit History(SqliteTallybook& tallybook) : _tallybook(tallybook) {}
+
+  void scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+      std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
+      const ScalarRowHandler& rowHandler) override {
+    read([&](CounterStore& store) { store.readScalars(keyPrefix, minDay, maxDay, rowHandler); });
+  }
+
+  void distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+      std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
+      const DistributionRowHandler& rowHandler) override {
+    read([&](CounterStore& store) {
+      store.readDistributions(keyPrefix, minDay, maxDay, rowHandler);
+    });
+  }
+
+ private:
+  void read(const std::function<void(CounterStore&)>& work) {
+    std::string error;
+    if (!_tallybook.read(work, error)) {
+      _tallybook._log.write(LogLevel::Error, "counters cannot be read: " + error);
+    }
+  }
+
+  SqliteTallybook& _tallybook;
+};
+
+SqliteTallybook::SqliteTallybook(const DeviceDirectory& directory, Clock& clock,
+                                 Preferences& preferences, SystemLog& log,
+                                 std::chrono::milliseconds longestWait)
+    : _clock(clock), _preferences(preferences), _log(log), _file(directory, clock, longestWait) {}
+
+SqliteTallybook::~SqliteTallybook() {
+  std::string error;
+  if (!flush(error)) {
+    _log.write(LogLevel::Error,
+               "changes of " + std::to_string(_pending.size()) + " counters are lost: " + error);
+  }
+}
+
+std::int32_t SqliteTallybook::TBDaysSince1970() { return daysSince1970(_clock.now()); }
+
+Date SqliteTallybook::dateForDaysSince1970(std::int32_t day) { return startOfDay(day); }
+
+void SqliteTallybook::TBClientCheckpoint() {
+  std::string error;
+  if (!flush(error)) {
+    _log.write(LogLevel::Error, "counters wait for the next checkpoint: " + error);
+  }
+}
+
+void SqliteTallybook::TBClientSetValueForScalarKey(std::string_view key, std::int64_t value) {
+  collect(key, {true, value});
+}
+
+void SqliteTallybook::TBClientAddValueForScalarKey(std::string_view key, std::int64_t value) {
+  collect(key, {false, value});
+}
+
+void SqliteTallybook::collect(std::string_view key, PendingScalar change) {
+  std::string error;
+  if (!isCounterKey(key, error)) {
+    _log.write(LogLevel::Error, "a counter is refused: " + error);
+    return;
+  }
+  const std::int32_t today = TBDaysSince1970();
+  const std::scoped_lock guard(_pendingMutex);
+  const auto [entry, isNew] = _pending.try_emplace({today, std::string(key)}, change);
+  if (isNew) {
+    return;
+  }
+  if (change.isSet) {
+    entry->second = change;
+  } else {
+    entry->second.value = wrappingSum(entry->second.value, change.value);
+  }
+}
+
+bool SqliteTallybook::flush(std::string& error) {
+  const std::scoped_lock flushing(_flushMutex);
+  PendingScalars changes;
+  {
+    const std::scoped_lock guard(_pendingMutex);
+    changes.swap(_pending);
+  }
+  if (changes.empty()) {
+    return true;
+  }
+  const auto apply = [&changes](CounterStore& store) {
+    for (const auto& [place, change] : changes) {
+      if (change.isSet) {
+        store.setScalar(place.first, place.second, change.value);
+      } else {
+        store.addToScalar(place.first, place.second, change.value);
+      }
+    }
+    return true;
+  };
+  if (write(apply, error)) {
+    return true;
+  }
+  const std::scoped_lock guard(_pendingMutex);
+  // What came meanwhile is later than what could not be written.
+  for (const auto& [place, later] : _pending) {
+    PendingScalar& change = changes.try_emplace(place, PendingScalar{false, 0}).first->second;
+    change =
+        later.isSet ? later : PendingScalar{change.isSet, wrappingSum(change.value, later.value)};
+  }
+  _pending = std::move(changes);
+  return false;
+}
+
+std::unique_ptr<TBHistory> SqliteTallybook::openHistory() {
+  return std::make_unique<History>(*this);
+}
+
+bool SqliteTallybook::write(const std::function<bool(CounterStore&)>& work, std::string& error) {
+  std::optional<CounterFile::Damage> damage;
+  if (_file.write(work, error, damage)) {
+    return true;
+  }
+  if (!damage || !recover(*damage, error)) {
+    return false;
+  }
+  return _file.write(work, error, damage);
+}
+
+bool SqliteTallybook::read(const std::function<void(CounterStore&)>& work, std::string& error) {
+  std::optional<CounterFile::Damage> damage;
+  if (_file.read(work, error, damage)) {
+    return true;
+  }
+  if (damage) {
+    recover(*damage, error);
+  }
+  return false;
+}
+
+bool SqliteTallybook::recover(const CounterFile::Damage& damage, std::string& error) {
+  std::string cause;
+  const std::optional<std::string> aside = _file.replace(damage, cause);
+  if (!aside) {
+    error = damage.text + "; it cannot be replaced: " + cause;
+    return false;
+  }
+  if (!aside->empty()) {
+    _log.write(LogLevel::Error,
+               damage.text + "; kept as " + *aside + ", an empty database takes its place");
+    // The first synchronization lets go of a count that another process may have changed.
+    _preferences.LGSPreferencesSynchronize(kAggregatedDomain);
+    const std::int64_t count =
+        _preferences.LGSPreferencesGetIntegerValue(kCorruptionCountKey, kAggregatedDomain);
+    _preferences.LGSPreferencesSetValue(kCorruptionCountKey, wrappingSum(count, 1),
+                                        kAggregatedDomain);
+    _preferences.LGSPreferencesSynchronize(kAggregatedDomain);
+  }
+  return true;
+}
+
+}  // namespace vesprun

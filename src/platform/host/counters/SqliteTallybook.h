@@ -1,0 +1,84 @@
+#pragma once
+
+#include <chrono>
+#include <cstdint>
+#include <functional>
+#include <map>
+#include <memory>
+#include <mutex>
+#include <string>
+#include <string_view>
+#include <utility>
+
+#include "platform/Clock.h"
+#include "platform/Preferences.h"
+#include "platform/SystemLog.h"
+#include "platform/Tallybook.h"
+#include "platform/host/counters/CounterFile.h"
+#include "platform/host/counters/CounterStore.h"
+#include "platform/host/device/DeviceDirectory.h"
+#include "platform/host/files/FileLock.h"
+
+namespace vesprun {
+
+/// The counter database in `var/mobile/Library/Tallybook/TBDataStore.sqlitedb`. It is opened when
+/// something is read or written, and not before.
+///
+/// A file found damaged, or of another shape, is moved aside with its journal under a name with the
+/// time ("TBDataStore.sqlitedb.corrupt-20240305T091502Z"), an empty one takes its place, the
+/// integer preference "DatabaseCorruptionCount" of "com.quill.aggregated" goes up by one, an error
+/// line says so, and the work goes on. Locks that last, permissions and full disks are no damage:
+/// an error line says what failed, and what was to be written stays collected. Several processes
+/// may use the database at once.
+class SqliteTallybook final : public Tallybook {
+ public:
+  /// What the references name must outlive the object. While other processes keep the database
+  /// locked, an operation waits for `longestWait` at most.
+  SqliteTallybook(const DeviceDirectory& directory, Clock& clock, Preferences& preferences,
+                  SystemLog& log, std::chrono::milliseconds longestWait = kLongestLockWait);
+  /// Writes what is still collected; an error line says when that is lost.
+  ~SqliteTallybook() override;
+  SqliteTallybook(const SqliteTallybook&) = delete;
+  SqliteTallybook& operator=(const SqliteTallybook&) = delete;
+
+  std::int32_t TBDaysSince1970() override;
+  Date dateForDaysSince1970(std::int32_t day) override;
+  void TBClientCheckpoint() override;
+  void TBClientSetValueForScalarKey(std::string_view key, std::int64_t value) override;
+  void TBClientAddValueForScalarKey(std::string_view key, std::int64_t value) override;
+  std::unique_ptr<TBHistory> openHistory() override;
+
+  // What tools need beside. Each writes or reads at once, all or nothing; false, with a text in
+  // `error`, when that failed.
+
+  /// Runs `work` on the tables in one transaction. When the first attempt finds the database
+  /// damaged, `work` runs again on the new one. A false result takes everything back.
+  bool write(const std::function<bool(CounterStore&)>& work, std::string& error);
+
+  /// Runs `work` on the tables as they stand at one moment; without a database it is not run. False
+  /// also when the database is damaged: `work` has then seen the rows before the damage.
+  bool read(const std::function<void(CounterStore&)>& work, std::string& error);
+
+ private:
+  struct PendingScalar {
+    bool isSet;  ///< replaces what is stored, rather than adding to it
+    std::int64_t value;
+  };
+  using PendingScalars = std::map<std::pair<std::int32_t, std::string>, PendingScalar>;
+
+  class History;
+
+  void collect(std::string_view key, PendingScalar change);
+  bool flush(std::string& error);
+  bool recover(const CounterFile::Damage& damage, std::string& error);
+
+  Clock& _clock;
+  Preferences& _preferences;
+  SystemLog& _log;
+  CounterFile _file;
+  std::mutex _flushMutex;  ///< held for the whole of a flush
+  std::mutex _pendingMutex;
+  PendingScalars _pending;
+};
+
+}  // namespace vesprun

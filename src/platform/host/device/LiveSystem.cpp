@@ -1,0 +1,215 @@
+#include "platform/host/device/LiveSystem.h"
+
+#include <sys/statvfs.h>
+#include <sys/utsname.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cctype>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <limits>
+#include <map>
+#include <sstream>
+#include <string_view>
+#include <utility>
+
+#include "common/LittleEndian.h"
+
+namespace vesprun::live {
+namespace {
+
+/// The entries "NAME=value" or "Name: value kB" of a text file.
+std::map<std::string, std::string> readEntries(const std::string& file, char separator) {
+  std::map<std::string, std::string> entries;
+  std::ifstream stream(file);
+  for (std::string line; std::getline(stream, line);) {
+    const auto end = line.find(separator);
+    if (end == std::string::npos) {
+      continue;
+    }
+    std::string value = line.substr(end + 1);
+    if (value.size() >= 2 && value.front() == '"' && value.back() == '"') {
+      value = value.substr(1, value.size() - 2);
+    }
+    entries.emplace(line.substr(0, end), std::move(value));
+  }
+  return entries;
+}
+
+std::string firstLineOf(const std::string& file) {
+  std::ifstream stream(file);
+  std::string line;
+  std::getline(stream, line);
+  return line;
+}
+
+std::string upperCase(std::string text) {
+  std::transform(text.begin(), text.end(), text.begin(),
+                 [](unsigned char c) { return static_cast<char>(std::toupper(c)); });
+  return text;
+}
+
+/// "en_GB.UTF-8@euro" as {"en", "GB"}; nothing for the locales that name no language.
+struct LocaleName {
+  std::string language;
+  std::string country;
+};
+
+std::optional<LocaleName> parseLocaleName(std::string_view name) {
+  name = name.substr(0, name.find_first_of(".@"));
+  if (name.empty() || name == "C" || name == "POSIX") {
+    return std::nullopt;
+  }
+  const auto separator = name.find('_');
+  return LocaleName{
+      std::string(name.substr(0, separator)),
+      separator == std::string_view::npos ? "" : std::string(name.substr(separator + 1))};
+}
+
+std::string languageTag(const LocaleName& locale) {
+  return locale.country.empty() ? locale.language : locale.language + '-' + locale.country;
+}
+
+std::optional<LocaleName> processLocale(const char* category) {
+  for (const char* variable : {"LC_ALL", category, "LANG"}) {
+    const char* value = std::getenv(variable);
+    if (value != nullptr && *value != '\0') {
+      return parseLocaleName(value);
+    }
+  }
+  return std::nullopt;
+}
+
+void appendDesktopEntries(const std::filesystem::path& folder, bool user,
+                          std::vector<ApplicationDescription>& applications) {
+  std::error_code error;
+  std::vector<std::string> bundles;
+  for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
+       entry.increment(error)) {
+    if (entry->path().extension() == ".desktop") {
+      bundles.push_back(entry->path().stem());
+    }
+  }
+  std::sort(bundles.begin(), bundles.end());
+  for (std::string& bundle : bundles) {
+    applications.push_back({std::move(bundle), user});
+  }
+}
+
+}  // namespace
+
+std::string osVersion() {
+  const auto entries = readEntries("/etc/os-release", '=');
+  const auto name = entries.find("PRETTY_NAME");
+  if (name != entries.end()) {
+    return name->second;
+  }
+  utsname system{};
+  return uname(&system) == 0 ? std::string(system.sysname) + ' ' + system.release : "Linux";
+}
+
+std::string osBuild() {
+  const auto entries = readEntries("/etc/os-release", '=');
+  for (const char* name : {"BUILD_ID", "VERSION_ID"}) {
+    if (const auto entry = entries.find(name); entry != entries.end()) {
+      return entry->second;
+    }
+  }
+  utsname system{};
+  return uname(&system) == 0 ? system.release : "";
+}
+
+std::optional<Bytes> swapUsage() {
+  const auto entries = readEntries("/proc/meminfo", ':');
+  const auto total = entries.find("SwapTotal");
+  const auto free = entries.find("SwapFree");
+  if (total == entries.end() || free == entries.end()) {
+    return std::nullopt;
+  }
+  const std::uint64_t totalBytes = std::strtoull(total->second.c_str(), nullptr, 10) * 1024;
+  const std::uint64_t freeBytes = std::strtoull(free->second.c_str(), nullptr, 10) * 1024;
+  Bytes record;
+  appendLittleEndian(record, totalBytes, 8);
+  appendLittleEndian(record, freeBytes, 8);
+  appendLittleEndian(record, totalBytes - freeBytes, 8);
+  appendLittleEndian(record, static_cast<std::uint64_t>(sysconf(_SC_PAGESIZE)), 4);
+  appendLittleEndian(record, 0, 4);
+  return record;
+}
+
+std::optional<std::string> bootSessionIdentifier() {
+  std::string identifier = upperCase(firstLineOf("/proc/sys/kernel/random/boot_id"));
+  return identifier.empty() ? std::nullopt : std::optional(std::move(identifier));
+}
+
+std::string machineIdentifier() { return firstLineOf("/etc/machine-id"); }
+
+std::string hardwareModel() {
+  utsname system{};
+  return uname(&system) == 0 ? system.machine : "";
+}
+
+std::string newIdentifier() { return upperCase(firstLineOf("/proc/sys/kernel/random/uuid")); }
+
+std::optional<FileSystemStatistics> volume(const std::string& path) {
+  struct statvfs status {};
+  if (statvfs(path.c_str(), &status) != 0 ||
+      status.f_frsize > std::numeric_limits<std::uint32_t>::max()) {
+    return std::nullopt;
+  }
+  return FileSystemStatistics{static_cast<std::uint32_t>(status.f_frsize), status.f_blocks,
+                              status.f_bavail};
+}
+
+std::vector<ApplicationDescription> applications() {
+  std::vector<ApplicationDescription> applications;
+  appendDesktopEntries("/usr/share/applications", false, applications);
+  appendDesktopEntries("/usr/local/share/applications", false, applications);
+  if (const char* home = std::getenv("HOME")) {
+    appendDesktopEntries(std::filesystem::path(home) / ".local/share/applications", true,
+                         applications);
+  }
+  return applications;
+}
+
+std::vector<std::string> preferredLanguages() {
+  std::vector<std::string> languages;
+  if (const char* list = std::getenv("LANGUAGE")) {
+    std::istringstream names(list);
+    for (std::string name; std::getline(names, name, ':');) {
+      if (const auto locale = parseLocaleName(name)) {
+        languages.push_back(languageTag(*locale));
+      }
+    }
+  }
+  if (languages.empty()) {
+    if (const auto locale = processLocale("LC_MESSAGES")) {
+      languages.push_back(languageTag(*locale));
+    }
+  }
+  return languages;
+}
+
+std::vector<std::string> localizations() {
+  std::vector<std::string> languages;
+  std::error_code error;
+  for (std::filesystem::directory_iterator entry("/usr/share/locale", error), end;
+       !error && entry != end; entry.increment(error)) {
+    if (const auto locale = parseLocaleName(entry->path().filename().string())) {
+      languages.push_back(languageTag(*locale));
+    }
+  }
+  std::sort(languages.begin(), languages.end());
+  languages.erase(std::unique(languages.begin(), languages.end()), languages.end());
+  return languages;
+}
+
+std::optional<std::string> countryCode() {
+  const auto locale = processLocale("LC_ADDRESS");
+  return locale && !locale->country.empty() ? std::optional(locale->country) : std::nullopt;
+}
+
+}  // namespace vesprun::live

@@ -1,0 +1,238 @@
+#include "platform/host/files/AtomicFile.h"
+
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <utility>
+
+#include "platform/host/files/SystemError.h"
+
+namespace vesprun {
+namespace {
+
+constexpr mode_t kOwnerOnly = 0600;
+constexpr std::size_t kPieceSize = 64 * 1024;
+// A document that replaces another stands here, complete, for the moment between its two steps.
+constexpr const char* kReplacementName = ".replacement";
+constexpr int kMostUnfinished = 100;
+
+FileDescriptor openFolder(const std::string& folder) {
+  return FileDescriptor(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+}
+
+/// The path under which a nameless file of this process can be linked into a folder.
+std::string procPath(int descriptor) { return "/proc/self/fd/" + std::to_string(descriptor); }
+
+}  // namespace
+
+AtomicFile::AtomicFile(std::string folder, FileDescriptor folderDescriptor)
+    : _folder(std::move(folder)), _folderDescriptor(std::move(folderDescriptor)) {}
+
+AtomicFile::AtomicFile(AtomicFile&& other) noexcept
+    : _folder(std::move(other._folder)),
+      _folderDescriptor(std::move(other._folderDescriptor)),
+      _file(std::move(other._file)),
+      _unfinishedName(std::exchange(other._unfinishedName, {})),
+      _pending(std::move(other._pending)),
+      _failure(std::move(other._failure)) {}
+
+AtomicFile::~AtomicFile() {
+  if (!_unfinishedName.empty()) {
+    unlinkat(_folderDescriptor.get(), _unfinishedName.c_str(), 0);
+  }
+}
+
+std::optional<AtomicFile> AtomicFile::create(const std::string& folder, std::string& error) {
+  AtomicFile file(folder, openFolder(folder));
+  if (!file._folderDescriptor.isOpen()) {
+    error = systemError(folder);
+    return std::nullopt;
+  }
+  if (!file.openUnnamed() && !file.openUnfinished(error)) {
+    return std::nullopt;
+  }
+  if (fchmod(file._file.get(), kOwnerOnly) != 0) {  // whatever the process's file mode mask says
+    error = systemError(folder);
+    return std::nullopt;
+  }
+  return file;
+}
+
+bool AtomicFile::openUnnamed() {
+  FileDescriptor file(
+      openat(_folderDescriptor.get(), ".", O_TMPFILE | O_WRONLY | O_CLOEXEC, kOwnerOnly));
+  // Without /proc a nameless file could never get a name.
+  if (!file.isOpen() || access(procPath(file.get()).c_str(), F_OK) != 0) {
+    return false;
+  }
+  _file = std::move(file);
+  return true;
+}
+
+bool AtomicFile::openUnfinished(std::string& error) {
+  for (int number = 1; number <= kMostUnfinished; ++number) {
+    const std::string name = ".unfinished-" + std::to_string(number);
+    FileDescriptor file(openat(_folderDescriptor.get(), name.c_str(),
+                               O_CREAT | O_WRONLY | O_CLOEXEC | O_NOFOLLOW, kOwnerOnly));
+    if (!file.isOpen()) {
+      error = systemError(pathOf(name));
+      return false;
+    }
+    // Its writer holds the lock while it lives; what a killed one left is written over. The name
+    // may have gone to another file while this one was being opened.
+    struct stat opened {};
+    struct stat named {};
+    if (flock(file.get(), LOCK_EX | LOCK_NB) != 0 || fstat(file.get(), &opened) != 0 ||
+        fstatat(_folderDescriptor.get(), name.c_str(), &named, AT_SYMLINK_NOFOLLOW) != 0 ||
+        opened.st_ino != named.st_ino) {
+      continue;
+    }
+    if (opened.st_nlink != 1) {  // killed after the document got its name: that one is finished
+      unlinkat(_folderDescriptor.get(), name.c_str(), 0);
+      continue;
+    }
+    if (ftruncate(file.get(), 0) != 0) {
+      error = systemError(pathOf(name));
+      return false;
+    }
+    _file = std::move(file);
+    _unfinishedName = name;
+    return true;
+  }
+  error = _folder + ": too many documents are being written";
+  return false;
+}
+
+bool AtomicFile::append(std::string_view bytes) {
+  if (!_failure.empty()) {
+    return false;
+  }
+  if (_pending.size() + bytes.size() < kPieceSize) {
+    _pending += bytes;
+    return true;
+  }
+  return writeOut(std::exchange(_pending, {})) && writeOut(bytes);
+}
+
+bool AtomicFile::writeOut(std::string_view bytes) {
+  while (!bytes.empty()) {
+    const ssize_t written = write(_file.get(), bytes.data(), bytes.size());
+    if (written < 0 && errno == EINTR) {
+      continue;
+    }
+    if (written <= 0) {
+      _failure = written == 0 ? "nothing could be written" : std::strerror(errno);
+      return false;
+    }
+    bytes.remove_prefix(static_cast<std::size_t>(written));
+  }
+  return true;
+}
+
+bool AtomicFile::makeDurable(const std::string& name, std::string& error) {
+  if (_failure.empty() && writeOut(std::exchange(_pending, {})) && fsync(_file.get()) != 0) {
+    _failure = std::strerror(errno);
+  }
+  if (!_failure.empty()) {
+    error = pathOf(name) + ": " + _failure;
+  }
+  return _failure.empty();
+}
+
+bool AtomicFile::link(const std::string& name) const {
+  const int folder = _folderDescriptor.get();
+  return _unfinishedName.empty()
+             ? linkat(AT_FDCWD, procPath(_file.get()).c_str(), folder, name.c_str(),
+                      AT_SYMLINK_FOLLOW) == 0
+             : linkat(folder, _unfinishedName.c_str(), folder, name.c_str(), 0) == 0;
+}
+
+bool AtomicFile::syncFolder(std::string& error) const {
+  if (fsync(_folderDescriptor.get()) != 0) {
+    error = systemError(_folder);
+    return false;
+  }
+  return true;
+}
+
+bool AtomicFile::replace(const std::string& name, std::string& error, const FolderLock* held) {
+  if (!makeDurable(name, error)) {
+    return false;
+  }
+  const int folder = _folderDescriptor.get();
+  if (!_unfinishedName.empty()) {
+    if (renameat(folder, _unfinishedName.c_str(), folder, name.c_str()) != 0) {
+      error = systemError(pathOf(name));
+      return false;
+    }
+    _unfinishedName.clear();
+    return syncFolder(error);
+  }
+  if (held == nullptr && !takeLock(folder, LOCK_EX, kLongestLockWait, _folder, error)) {
+    return false;
+  }
+  const bool replaced = replaceThroughHiddenName(name, error);
+  if (held == nullptr) {
+    flock(folder, LOCK_UN);
+  }
+  return replaced && syncFolder(error);
+}
+
+bool AtomicFile::replaceThroughHiddenName(const std::string& name, std::string& error) const {
+  const int folder = _folderDescriptor.get();
+  if (link(name)) {
+    return true;
+  }
+  if (errno != EEXIST) {
+    error = systemError(pathOf(name));
+    return false;
+  }
+  // Under the folder's lock such a name can only be what a killed process left.
+  if ((unlinkat(folder, kReplacementName, 0) != 0 && errno != ENOENT) || !link(kReplacementName)) {
+    error = systemError(pathOf(kReplacementName));
+    return false;
+  }
+  if (renameat(folder, kReplacementName, folder, name.c_str()) != 0) {
+    error = systemError(pathOf(name));
+    unlinkat(folder, kReplacementName, 0);
+    return false;
+  }
+  return true;
+}
+
+AtomicFile::Added AtomicFile::addNew(const std::string& name, std::string& error) {
+  if (!makeDurable(name, error)) {
+    return Added::Failed;
+  }
+  if (!link(name)) {
+    if (errno == EEXIST) {
+      return Added::NameTaken;
+    }
+    error = systemError(pathOf(name));
+    return Added::Failed;
+  }
+  if (!syncFolder(error)) {
+    unlinkat(_folderDescriptor.get(), name.c_str(), 0);
+    return Added::Failed;
+  }
+  return Added::Done;
+}
+
+bool replaceFile(const std::string& path, std::string_view content, std::string& error) {
+  const auto slash = path.rfind('/');
+  const std::string folder =
+      slash == std::string::npos ? "." : path.substr(0, slash == 0 ? 1 : slash);
+  std::optional<AtomicFile> file = AtomicFile::create(folder, error);
+  if (!file) {
+    return false;
+  }
+  file->append(content);
+  return file->replace(path.substr(slash + 1), error);
+}
+
+}  // namespace vesprun

@@ -1,0 +1,67 @@
+#pragma once
+
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "platform/host/files/FileDescriptor.h"
+#include "platform/host/files/FileLock.h"
+
+namespace vesprun {
+
+/// A whole document on its way into a folder. It appears under its name complete and durable, or
+/// not at all: a process killed at any moment leaves no part of it under any name where the file
+/// system knows nameless files. Elsewhere such a part may stay as ".unfinished-N" until a later
+/// document is written over it.
+///
+/// Files are readable and writable for their owner alone. Dropping the object before it got a name
+/// drops the document. Error texts name the path and the cause.
+class AtomicFile {
+ public:
+  /// Starts an empty document in an existing folder.
+  static std::optional<AtomicFile> create(const std::string& folder, std::string& error);
+
+  AtomicFile(AtomicFile&& other) noexcept;
+  AtomicFile& operator=(AtomicFile&&) = delete;
+  ~AtomicFile();
+
+  /// Appends the bytes. False when they cannot be written; the document can then no longer get a
+  /// name, and `replace` and `addNew` repeat the reason.
+  bool append(std::string_view bytes);
+
+  /// Gives the document its name in the folder, in place of the file that has it. Takes the
+  /// folder's lock for a moment, unless the caller shows that it holds it already. False, with a
+  /// text in `error`, when that failed: the earlier file is still there, unless only making the
+  /// new name durable failed.
+  bool replace(const std::string& name, std::string& error, const FolderLock* held = nullptr);
+
+  enum class Added { Done, NameTaken, Failed };
+
+  /// Gives the document a name that no file has yet. After `NameTaken` another name can be tried;
+  /// only `Failed` sets `error`.
+  Added addNew(const std::string& name, std::string& error);
+
+ private:
+  AtomicFile(std::string folder, FileDescriptor folderDescriptor);
+
+  bool openUnnamed();
+  bool openUnfinished(std::string& error);
+  bool writeOut(std::string_view bytes);
+  bool makeDurable(const std::string& name, std::string& error);
+  bool link(const std::string& name) const;
+  bool syncFolder(std::string& error) const;
+  bool replaceThroughHiddenName(const std::string& name, std::string& error) const;
+  std::string pathOf(const std::string& name) const { return _folder + '/' + name; }
+
+  std::string _folder;
+  FileDescriptor _folderDescriptor;
+  FileDescriptor _file;
+  std::string _unfinishedName;  ///< empty while the file has no name at all
+  std::string _pending;         ///< bytes not handed to the kernel yet
+  std::string _failure;         ///< the first reason why an `append` failed
+};
+
+/// Writes a whole document in place of the file at `path`, as `AtomicFile` does.
+bool replaceFile(const std::string& path, std::string_view content, std::string& error);
+
+}  // namespace vesprun

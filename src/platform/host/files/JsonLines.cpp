@@ -1,0 +1,74 @@
+#include "platform/host/files/JsonLines.h"
+
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstring>
+
+#include "platform/host/files/FileLock.h"
+#include "platform/host/files/SystemError.h"
+
+namespace vesprun {
+
+bool JsonLines::open() {
+  // Reading, to see how the last line ends; not blocking, in case it is no file.
+  _file = FileDescriptor(
+      ::open(_path.c_str(), O_RDWR | O_APPEND | O_CREAT | O_CLOEXEC | O_NONBLOCK, 0600));
+  return _file.isOpen();
+}
+
+bool JsonLines::append(std::string_view line, std::string& error) {
+  if (line.find('\n') != std::string_view::npos) {
+    error = _path + ": a line cannot hold a line feed";
+    return false;
+  }
+  const std::scoped_lock guard(_mutex);
+  struct stat status {};
+  // A file that was deleted meanwhile would take the line with it.
+  const bool usable = _file.isOpen() && fstat(_file.get(), &status) == 0 && status.st_nlink != 0;
+  if (!usable && !open()) {
+    error = systemError(_path);
+    return false;
+  }
+  const bool locked = takeLock(_file.get(), LOCK_EX, _wait, _path, error);
+  // Only one line waits for whoever keeps the file; the others would together wait for ever.
+  _wait = locked ? _longestWait : std::chrono::milliseconds::zero();
+  if (!locked) {
+    return false;
+  }
+  const bool appended = appendLocked(line, error);
+  flock(_file.get(), LOCK_UN);
+  return appended;
+}
+
+bool JsonLines::appendLocked(std::string_view line, std::string& error) {
+  struct stat before {};
+  if (fstat(_file.get(), &before) != 0) {
+    error = systemError(_path);
+    return false;
+  }
+  char last = '\n';
+  const bool torn =
+      before.st_size > 0 && pread(_file.get(), &last, 1, before.st_size - 1) == 1 && last != '\n';
+  std::string bytes = torn ? "\n" : "";
+  bytes += line;
+  bytes += '\n';
+  ssize_t written = 0;
+  do {
+    written = write(_file.get(), bytes.data(), bytes.size());
+  } while (written < 0 && errno == EINTR);
+  if (written == static_cast<ssize_t>(bytes.size())) {
+    return true;
+  }
+  error = written < 0 ? systemError(_path) : _path + ": no room for a line";
+  if (written > 0 && ftruncate(_file.get(), before.st_size) != 0) {
+    error += ", and a part of it stays: ";
+    error += std::strerror(errno);
+  }
+  return false;
+}
+
+}  // namespace vesprun

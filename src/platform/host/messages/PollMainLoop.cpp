@@ -1,0 +1,83 @@
+#include "platform/host/messages/PollMainLoop.h"
+
+#include <poll.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <chrono>
+#include <thread>
+#include <utility>
+#include <vector>
+
+namespace vesprun {
+namespace {
+
+using MonotonicClock = std::chrono::steady_clock;
+using Seconds = std::chrono::duration<double>;
+
+constexpr double kLongestSlice = 1e9;
+constexpr double kPauseAfterFailure = 0.1;
+
+timespec timespecOf(double seconds) {
+  const auto whole = static_cast<std::time_t>(seconds);
+  const double rest = (seconds - static_cast<double>(whole)) * 1e9;
+  return {whole, std::min(static_cast<long>(rest), 999'999'999L)};
+}
+
+}  // namespace
+
+void PollMainLoop::watch(int descriptor, Work whenReady) {
+  _watched.insert_or_assign(descriptor, std::move(whenReady));
+}
+
+void PollMainLoop::unwatch(int descriptor) { _watched.erase(descriptor); }
+
+MainLoop::SliceResult PollMainLoop::runMainLoopSlice(double seconds) {
+  const double length = seconds > 0 ? std::min(seconds, kLongestSlice) : 0;  // 0 for NaN as well
+  const auto start = MonotonicClock::now();
+  for (bool looked = false; !doQueuedWork(); looked = true) {
+    const double left = length - Seconds(MonotonicClock::now() - start).count();
+    if (looked && left <= 0) {
+      return SliceResult::TimedOut;
+    }
+    waitForReadiness(std::max(left, 0.0));
+  }
+  return SliceResult::HandledEvent;
+}
+
+bool PollMainLoop::doQueuedWork() {
+  if (_queue.empty()) {
+    return false;
+  }
+  const Work work = std::move(_queue.front());
+  _queue.pop_front();
+  work();
+  return true;
+}
+
+void PollMainLoop::waitForReadiness(double seconds) {
+  std::vector<pollfd> descriptors;
+  descriptors.reserve(_watched.size());
+  for (const auto& [descriptor, whenReady] : _watched) {
+    descriptors.push_back({descriptor, POLLIN, 0});
+  }
+  const timespec timeout = timespecOf(seconds);
+  const int ready = ppoll(descriptors.data(), descriptors.size(), &timeout, nullptr);
+  if (ready < 0 && errno != EINTR) {
+    // Out of memory, say: without a pause the loop would spin until it passes.
+    std::this_thread::sleep_for(Seconds(std::min(seconds, kPauseAfterFailure)));
+  }
+  if (ready <= 0) {
+    return;
+  }
+  for (const pollfd& descriptor : descriptors) {
+    // What was called before may have ended this watch.
+    const auto watched = _watched.find(descriptor.fd);
+    if (descriptor.revents != 0 && watched != _watched.end()) {
+      const Work whenReady = watched->second;  // a copy: it may end its own watch
+      whenReady();
+    }
+  }
+}
+
+}  // namespace vesprun

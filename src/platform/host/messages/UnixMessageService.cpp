@@ -1,0 +1,199 @@
+#include "platform/host/messages/UnixMessageService.h"
+
+#include <sys/socket.h>
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <chrono>
+#include <cstring>
+#include <map>
+#include <utility>
+
+#include "platform/host/messages/MessageFraming.h"
+#include "platform/host/messages/ServiceSocket.h"
+
+namespace vesprun {
+namespace {
+
+constexpr std::size_t kMostPeers = 16;
+constexpr std::size_t kPieceSize = 64 * 1024;
+
+class UnixPeer final : public PeerConnection {
+ public:
+  explicit UnixPeer(FileDescriptor socket) : _socket(std::move(socket)) {}
+
+  void setMessageHandler(MessageHandler handler) override { _handler = std::move(handler); }
+  void start() override { _started = true; }
+
+  /// When it came, or last sent anything.
+  std::chrono::steady_clock::time_point lastHeard() const { return _lastHeard; }
+  void noteHeard() { _lastHeard = std::chrono::steady_clock::now(); }
+
+  int descriptor() const { return _socket.get(); }
+  bool isStarted() const { return _started; }
+  MessageAssembler& assembler() { return _assembler; }
+  void deliver(const PropertyValue& message) const {
+    if (_handler) {
+      _handler(message);
+    }
+  }
+
+ private:
+  FileDescriptor _socket;
+  MessageHandler _handler;
+  MessageAssembler _assembler;
+  std::chrono::steady_clock::time_point _lastHeard = std::chrono::steady_clock::now();
+  bool _started = false;
+};
+
+class UnixServiceListener final : public ServiceListener {
+ public:
+  UnixServiceListener(ServiceSocket socket, std::string name, PtreeSerialization& serialization,
+                      SystemLog& log, PollMainLoop& mainLoop)
+      : _socket(std::move(socket)),
+        _name(std::move(name)),
+        _serialization(serialization),
+        _log(log),
+        _mainLoop(mainLoop) {}
+
+  ~UnixServiceListener() override {
+    _mainLoop.unwatch(_socket.descriptor());
+    for (const auto& [descriptor, peer] : _peers) {
+      _mainLoop.unwatch(descriptor);
+    }
+  }
+
+  void setPeerHandler(PeerHandler handler) override { _handler = std::move(handler); }
+
+  void start() override {
+    _started = true;
+    watchForPeers();
+  }
+
+ private:
+  using PeerPointer = std::shared_ptr<UnixPeer>;
+
+  /// Queues work that is dropped if the listener is gone by then.
+  void queueWork(PollMainLoop::Work work) {
+    _mainLoop.queueWork([alive = std::weak_ptr<bool>(_alive), work = std::move(work)] {
+      if (!alive.expired()) {
+        work();
+      }
+    });
+  }
+
+  void watchForPeers() {
+    if (_started) {
+      _mainLoop.watch(_socket.descriptor(), [this] { acceptPeer(); });
+    }
+  }
+
+  void acceptPeer() {
+    std::string error;
+    FileDescriptor socket = _socket.accept(error);
+    if (!error.empty()) {
+      tell("no peer can be accepted: " + error);
+      // It would fail again at once; the next peer that goes makes room.
+      _mainLoop.unwatch(_socket.descriptor());
+    }
+    if (!socket.isOpen()) {
+      return;
+    }
+    if (!peerIsTrusted(socket.get())) {
+      tell("a peer of another user is turned away");
+      return;
+    }
+    if (_peers.size() == kMostPeers) {
+      const auto quietest =
+          std::min_element(_peers.begin(), _peers.end(), [](const auto& left, const auto& right) {
+            return left.second->lastHeard() < right.second->lastHeard();
+          });
+      drop(*PeerPointer(quietest->second), "others wait, and it has been silent longest");
+    }
+    const auto peer = std::make_shared<UnixPeer>(std::move(socket));
+    _peers.emplace(peer->descriptor(), peer);
+    queueWork([this, peer] { introduce(peer); });
+  }
+
+  void introduce(const PeerPointer& peer) {
+    if (_handler) {
+      _handler(*peer);
+    }
+    if (peer->isStarted()) {
+      _mainLoop.watch(peer->descriptor(), [this, peer] { receive(peer); });
+    } else {
+      drop(*peer, "");
+    }
+  }
+
+  void receive(const PeerPointer& peer) {
+    const ssize_t count = recv(peer->descriptor(), _piece.data(), _piece.size(), MSG_DONTWAIT);
+    if (count < 0) {
+      if (errno != EAGAIN && errno != EINTR) {
+        drop(*peer, std::strerror(errno));
+      }
+      return;
+    }
+    peer->noteHeard();
+    MessageAssembler& assembler = peer->assembler();
+    if (count == 0) {
+      drop(*peer, assembler.isInsideMessage() ? "it ended in the middle of a message" : "");
+      return;
+    }
+    std::string_view bytes(_piece.data(), static_cast<std::size_t>(count));
+    MessageAssembler::Progress progress = assembler.take(bytes);
+    for (; progress == MessageAssembler::Progress::Complete; progress = assembler.take(bytes)) {
+      std::string error;
+      std::optional<PropertyValue> message = _serialization.parse(assembler.takeDocument(), error);
+      if (!message) {
+        drop(*peer, error);
+        return;
+      }
+      queueWork([peer, message = *std::move(message)] { peer->deliver(message); });
+    }
+    if (progress == MessageAssembler::Progress::TooLong) {
+      drop(*peer, "a message is longer than " + std::to_string(kLongestMessage) + " bytes");
+    }
+  }
+
+  void drop(const UnixPeer& peer, std::string_view why) {
+    if (!why.empty()) {
+      tell("a peer is dropped: " + std::string(why));
+    }
+    const int descriptor = peer.descriptor();
+    // Its queued messages may keep the object for a while; the connection ends now.
+    shutdown(descriptor, SHUT_RDWR);
+    _mainLoop.unwatch(descriptor);
+    _peers.erase(descriptor);
+    watchForPeers();
+  }
+
+  void tell(const std::string& what) { _log.write(LogLevel::Error, _name + ": " + what); }
+
+  ServiceSocket _socket;
+  std::string _name;
+  PtreeSerialization& _serialization;
+  SystemLog& _log;
+  PollMainLoop& _mainLoop;
+  PeerHandler _handler;
+  bool _started = false;
+  std::map<int, PeerPointer> _peers;
+  std::array<char, kPieceSize> _piece{};
+  std::shared_ptr<bool> _alive = std::make_shared<bool>(true);
+};
+
+}  // namespace
+
+std::unique_ptr<ServiceListener> UnixMessageService::createListener(std::string_view name) {
+  std::string error;
+  std::optional<ServiceSocket> socket = ServiceSocket::listen(_directory, name, error);
+  if (!socket) {
+    _log.write(LogLevel::Error, error);
+    return nullptr;
+  }
+  return std::make_unique<UnixServiceListener>(*std::move(socket), std::string(name),
+                                               _serialization, _log, _mainLoop);
+}
+
+}  // namespace vesprun

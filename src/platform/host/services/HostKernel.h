@@ -1,0 +1,35 @@
+#pragma once
+
+#include "platform/Kernel.h"
+#include "platform/host/device/DeviceDescription.h"
+#include "platform/host/device/DeviceDirectory.h"
+#include "platform/host/device/ECCEventQueue.h"
+
+namespace vesprun {
+
+/// The kernel variables and figures that the device description gives, and those of Linux where it
+/// is silent.
+class HostKernel : public Kernel {
+ public:
+  HostKernel(const KernelDescription& description, const DeviceDirectory& directory, SystemLog& log)
+      : _description(description), _directory(directory), _log(log), _eccEvents(directory, log) {}
+
+  int sysctlbyname(const std::string& name, std::span<std::uint8_t> buffer,
+                   std::size_t& length) override;
+  std::uint64_t pageSize() override;
+  std::uint64_t monotonicTicks() override;
+  std::optional<TickRatio> tickRatio() override;
+  /// The described snapshot, whatever the flags; Linux has none to offer. A file that cannot be
+  /// read leaves an error in the system log.
+  std::optional<Bytes> captureSnapshot(std::uint32_t captureFlags) override;
+
+ private:
+  std::optional<KernelVariable> variable(const std::string& name) const;
+
+  const KernelDescription& _description;
+  const DeviceDirectory& _directory;
+  SystemLog& _log;
+  ECCEventQueue _eccEvents;
+};
+
+}  // namespace vesprun

@@ -1,0 +1,104 @@
+#include "platform/host/services/HostMurmur.h"
+
+#include <algorithm>
+#include <chrono>
+#include <condition_variable>
+#include <exception>
+#include <mutex>
+#include <system_error>
+#include <thread>
+#include <utility>
+#include <vector>
+
+namespace vesprun {
+
+/// The threads that replies come from. Feeds, and so the handlers that hold them, share it: it may
+/// outlive the service, but has then ended and holds no thread.
+class HostMurmur::Replies {
+ public:
+  Replies(const AnswerDescription<UsageDescription>& description, SystemLog& log)
+      : _description(description), _log(log) {}
+
+  void send(UsageFeed::ReplyHandler handler) {
+    const std::lock_guard lock(_mutex);
+    if (_ended || _description.isNull) {
+      return;
+    }
+    try {
+      _threads.emplace_back([this, handler = std::move(handler)] { reply(handler); });
+    } catch (const std::system_error& error) {
+      _log.write(LogLevel::Error, std::string("no thread for the usage feed: ") + error.what());
+    }
+  }
+
+  void end() {
+    std::vector<std::thread> threads;
+    {
+      const std::lock_guard lock(_mutex);
+      _ended = true;
+      threads.swap(_threads);
+    }
+    _endedChanged.notify_all();
+    for (std::thread& thread : threads) {
+      thread.join();
+    }
+  }
+
+ private:
+  void reply(const UsageFeed::ReplyHandler& handler) {
+    constexpr double kLongestDelay = 1e8;  // three years; far more would overflow the clock
+    static const UsageDescription kEmptyAtOnce;
+    const UsageDescription& usage = _description.value ? *_description.value : kEmptyAtOnce;
+    const std::chrono::duration<double> delay(std::min(usage.delaySeconds, kLongestDelay));
+    {
+      std::unique_lock lock(_mutex);
+      if (_endedChanged.wait_for(lock, delay, [this] { return _ended; })) {
+        return;
+      }
+    }
+    try {
+      handler(&usage.records);
+    } catch (const std::exception& failure) {
+      _log.write(LogLevel::Error, std::string("usage feed: ") + failure.what());
+    } catch (...) {
+      _log.write(LogLevel::Error, "usage feed: the handler of a reply failed");
+    }
+  }
+
+  const AnswerDescription<UsageDescription>& _description;
+  SystemLog& _log;
+  std::mutex _mutex;
+  std::condition_variable _endedChanged;
+  bool _ended = false;
+  std::vector<std::thread> _threads;
+};
+
+class HostMurmur::Feed final : public UsageFeed {
+ public:
+  Feed(std::shared_ptr<UsageWorkspace> workspace, std::shared_ptr<Replies> replies)
+      : _workspace(std::move(workspace)), _replies(std::move(replies)) {}
+
+  void usageToDateForNameKindReply(const std::set<std::string>& /*names*/, UsageNameKind /*kind*/,
+                                   ReplyHandler reply) override {
+    _replies->send(std::move(reply));
+  }
+
+ private:
+  std::shared_ptr<UsageWorkspace> _workspace;
+  std::shared_ptr<Replies> _replies;
+};
+
+HostMurmur::HostMurmur(const AnswerDescription<UsageDescription>& description, SystemLog& log)
+    : _replies(std::make_shared<Replies>(description, log)) {}
+
+HostMurmur::~HostMurmur() { _replies->end(); }
+
+std::shared_ptr<UsageWorkspace> HostMurmur::createUsageWorkspace(std::string_view /*endpoint*/) {
+  return std::make_shared<UsageWorkspace>();
+}
+
+std::shared_ptr<UsageFeed> HostMurmur::createUsageFeed(std::shared_ptr<UsageWorkspace> workspace) {
+  return std::make_shared<Feed>(std::move(workspace), _replies);
+}
+
+}  // namespace vesprun

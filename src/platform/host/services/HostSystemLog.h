@@ -1,0 +1,26 @@
+#pragma once
+
+#include "platform/Clock.h"
+#include "platform/SystemLog.h"
+#include "platform/host/device/DeviceDirectory.h"
+#include "platform/host/files/JsonLines.h"
+
+namespace vesprun {
+
+/// The system log, in `outbox/log.jsonl`. What cannot be written there goes to standard error.
+/// Messages may come from any thread.
+class HostSystemLog : public SystemLog {
+ public:
+  HostSystemLog(const DeviceDirectory& directory, Clock& clock, LogLevel lowestKept);
+
+  bool keeps(LogLevel level) const override { return level <= _lowestKept; }
+  void write(LogLevel level, std::string_view message) override;
+
+ private:
+  const DeviceDirectory& _directory;
+  Clock& _clock;
+  LogLevel _lowestKept;
+  JsonLines _lines;
+};
+
+}  // namespace vesprun

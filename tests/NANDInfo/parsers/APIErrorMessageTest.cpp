@@ -1,0 +1,27 @@
+#include "NANDInfo/parsers/APIErrorMessage.h"
+
+#include <gtest/gtest.h>
+
+namespace vesprun {
+namespace {
+
+TEST(APIErrorMessage, keepsTheFirstTextCutAt1023Bytes) {
+  forgetAPIErrorMessage();
+  EXPECT_EQ(GetAPIErrorMessage(), "NA");
+  SetAPIErrorMessage("open: %s failed with 0x%x", "controller", 0xE00002C2U);
+  SetAPIErrorMessage("second");
+  EXPECT_EQ(GetAPIErrorMessage(), "open: controller failed with 0xe00002c2");
+
+  forgetAPIErrorMessage();
+  SetAPIErrorMessage("%s", std::string(1023, 'x').append("yz").c_str());
+  EXPECT_EQ(GetAPIErrorMessage(), std::string(1023, 'x'));
+
+  forgetAPIErrorMessage();
+  SetAPIErrorMessage("%s", "");
+  SetAPIErrorMessage("second");
+  EXPECT_EQ(GetAPIErrorMessage(), "");
+  forgetAPIErrorMessage();
+}
+
+}  // namespace
+}  // namespace vesprun

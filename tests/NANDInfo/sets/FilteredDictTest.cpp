@@ -1,0 +1,91 @@
+#include "NANDInfo/sets/FilteredDict.h"
+
+#include <gtest/gtest.h>
+#include <limits>
+
+#include "NANDInfo/sets/SignificantDigits.h"
+#include "NANDInfo/sets/UserCapacity.h"
+
+namespace vesprun {
+namespace {
+
+TEST(RoundSig, roundsHalfUpOnTheDigitThatIsCutOff) {
+  constexpr std::uint64_t kMax = std::numeric_limits<std::uint64_t>::max();
+  constexpr std::uint64_t kE17 = 100'000'000'000'000'000;
+  constexpr std::uint64_t kE18 = 10 * kE17;
+  constexpr std::uint64_t kBelow = kE18 - 1;
+  constexpr std::uint64_t kE19 = 10 * kE18;
+  // A sum may wrap, and what is just below 10^18 counts as 19 digits.
+  const std::array<std::uint64_t, 3> cases[] = {
+      {0, 3, 0},          {4, 0, 0},         {5, 0, 10},           {50, 0, 100},
+      {123, 3, 123},      {999, 2, 1000},    {1000, 3, 1000},      {12345, 2, 12000},
+      {12499, 2, 12000},  {12500, 2, 13000}, {99'995, 4, 100'000}, {kE19, 1, 0},
+      {kE19, 2, kE19},    {kMax, 19, 4},     {kMax, 20, kMax},     {kMax, kMax, kMax},
+      {kBelow, 18, kE18}, {kBelow, 0, 0},    {6 * kE17, 0, kE18}};
+  EXPECT_EQ(roundSig(kMax, 2), 18 * kE18);
+  EXPECT_EQ(roundSig(5 * kE17 - 1, 1), 5 * kE17);
+  for (const auto& [x, sig, rounded] : cases) {
+    EXPECT_EQ(roundSig(x, sig), rounded) << x << " to " << sig;
+  }
+}
+
+constexpr auto kListedRanges = std::to_array<FieldRange>({{2, "a"}, {1, "b"}, {3, "bin", 9, 11}});
+constexpr FieldIndex kListedIndex(kListedRanges);
+constexpr FieldTable kListed(kListedRanges, kListedIndex);
+
+std::vector<std::string> keysOf(const PropertyDict& dict) {
+  std::vector<std::string> keys;
+  for (const auto& [key, value] : dict) {
+    keys.push_back(key);
+  }
+  return keys;
+}
+
+TEST(FilteredDict, keepsListedEntriesInTheOrderOfTheSource) {
+  const PropertyDict source = {{"bin10", 12345}, {"c", 7}, {"b", "x"}, {"bin12", 1}, {"a", 12345}};
+  const PropertyDict kept = {{"bin10", 12345}, {"b", "x"}, {"a", 12345}};
+  EXPECT_EQ(CreateFilteredDict(source, &kListed), kept);
+  EXPECT_EQ(CreateFilteredDict_SigDig(source, &kListed, false), kept);
+  EXPECT_EQ(keysOf(CreateFilteredDict(source, &kListed)), keysOf(kept));
+  const PropertyDict rounded = {{"bin10", 12300}, {"b", "x"}, {"a", 12000}};
+  EXPECT_EQ(CreateFilteredDict_SigDig(source, &kListed, true), rounded);
+
+  EXPECT_EQ(CreateFilteredDict(source, nullptr), source);
+  EXPECT_EQ(CreateFilteredDict_SigDig(source, nullptr, true), source);
+}
+
+TEST(FilteredDict, roundsNumbersOfEveryKindAndNothingElse) {
+  const std::pair<PropertyValue, PropertyValue> cases[] = {
+      {std::int8_t{-1}, std::uint64_t{18'000'000'000'000'000'000U}},
+      {std::uint32_t{4'294'967'295}, std::uint64_t{4'300'000'000}},
+      {12567.9, std::uint64_t{13'000}},
+      {true, true},
+      {"12345", "12345"},
+      {Bytes{1, 2, 3}, Bytes{1, 2, 3}},
+      {Date{12345, 0}, Date{12345, 0}},
+      {PropertyDict{{"a", 12345}}, PropertyDict{{"a", 12345}}},
+      {PropertyArray{12345}, PropertyArray{12345}}};
+  for (const auto& [value, rounded] : cases) {
+    const PropertyDict filtered = CreateFilteredDict_SigDig({{"a", value}}, &kListed, true);
+    ASSERT_NE(filtered.find("a"), nullptr);
+    EXPECT_EQ(*filtered.find("a"), rounded);
+    if (const Number* number = filtered.find("a")->number()) {
+      EXPECT_EQ(number->kind(), NumberKind::UInt64);
+    }
+  }
+}
+
+TEST(UserCapacity, isThePowerOfTwoAboveButFor1536) {
+  const std::pair<std::uint64_t, std::uint32_t> cases[] = {
+      {500, 0},          {1000, 1},         {1024, 2},
+      {121'856, 128},    {1'376'255, 2048}, {1'376'256, 1536},
+      {1'770'495, 1536}, {1'770'496, 2048}, {0xFFFF'FFFF, 4'194'304},
+      {0x7'0000'0400, 2}};
+  EXPECT_EQ(GetUserCapacityInGB(0), 0U);
+  for (const auto& [megabytes, gigabytes] : cases) {
+    EXPECT_EQ(GetUserCapacityInGB(megabytes), gigabytes) << megabytes;
+  }
+}
+
+}  // namespace
+}  // namespace vesprun

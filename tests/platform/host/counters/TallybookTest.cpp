@@ -1,0 +1,411 @@
+#include <algorithm>
+#include <limits>
+#include <random>
+#include <sstream>
+#include <thread>
+
+#include "platform/host/counters/CounterLines.h"
+#include "platform/host/counters/SqliteTallybook.h"
+#include "platform/host/preferences/HostPreferences.h"
+#include "platform/host/services/HostClock.h"
+#include "support/HostServiceTest.h"
+
+namespace vesprun {
+namespace {
+
+using namespace std::string_literals;
+using ::testing::AnyOf, ::testing::ElementsAre, ::testing::HasSubstr, ::testing::IsEmpty,
+    ::testing::MatchesRegex, ::testing::SizeIs, ::testing::StartsWith;
+
+constexpr const char* kFolder = "var/mobile/Library/Tallybook";
+constexpr const char* kFile = "var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
+constexpr std::int32_t kToday = 19787;
+constexpr std::int64_t kLargest = std::numeric_limits<std::int64_t>::max();
+constexpr std::chrono::milliseconds kShortWait{50};
+
+class TallybookTest : public HostServiceTest {
+ protected:
+  std::string dump(std::int32_t from = kToday - 10, std::int32_t to = kToday + 10) {
+    SqliteTallybook tallybook(device, clock, preferences, log);
+    std::string text;
+    const auto append = [&text](std::string_view piece) {
+      text += piece;
+      return true;
+    };
+    EXPECT_TRUE(tallybook.read(
+        [&](CounterStore& store) {
+          EXPECT_TRUE(exportCounterLines(store, from, to, append, error)) << error;
+        },
+        error))
+        << error;
+    return text;
+  }
+
+  bool import(const std::string& text) {
+    SqliteTallybook tallybook(device, clock, preferences, log);
+    std::istringstream lines(text);
+    return tallybook.write(
+        [&](CounterStore& store) { return importCounterLines(lines, store, error); }, error);
+  }
+
+  void add(std::string_view key, std::int64_t value) {
+    SqliteTallybook(device, clock, preferences, log).TBClientAddValueForScalarKey(key, value);
+  }
+
+  std::int64_t corruptions() {
+    return HostPreferences(device, clock, log)
+        .LGSPreferencesGetIntegerValue("DatabaseCorruptionCount", "com.quill.aggregated");
+  }
+
+  HostClock clock{Date{1709630102, 500}};  // 2024-03-05 09:15:02
+  HostPreferences preferences{device, clock, log};
+};
+
+/// The lines of two counters of today.
+std::string scalars(std::int64_t first, std::int64_t second) {
+  return "scalar\t19787\tfirst\t" + std::to_string(first) + "\nscalar\t19787\tsecond\t" +
+         std::to_string(second) + '\n';
+}
+std::string scalar(std::int64_t value) {
+  return "scalar\t19787\tk\t" + std::to_string(value) + '\n';
+}
+
+TEST_F(TallybookTest, collectsUntilTheCheckpointAndMakesNothingWithoutNeed) {
+  {
+    SqliteTallybook tallybook(device, clock, preferences, log);
+    EXPECT_EQ(tallybook.TBDaysSince1970(), kToday);
+    EXPECT_EQ(tallybook.dateForDaysSince1970(kToday), (Date{1709596800, 0}));
+    tallybook.TBClientCheckpoint();
+    EXPECT_EQ(dump(), "");
+    tallybook.TBClientSetValueForScalarKey("second", 5);
+    tallybook.TBClientAddValueForScalarKey("second", 2);
+    tallybook.TBClientAddValueForScalarKey("first", kLargest);
+    EXPECT_THAT(folder.names(), IsEmpty());
+    tallybook.TBClientCheckpoint();
+    EXPECT_EQ(dump(), scalars(kLargest, 7));
+    tallybook.TBClientAddValueForScalarKey("first", 1);
+    tallybook.TBClientSetValueForScalarKey("second", -1);
+  }
+  EXPECT_EQ(dump(), scalars(-kLargest - 1, -1));
+  EXPECT_THAT(folder.names(kFolder), ElementsAre("TBDataStore.sqlitedb"));
+  EXPECT_EQ(modeOf(kFile), mode_t{S_IFREG | 0600});
+  EXPECT_THAT(log.messages, IsEmpty());
+}
+
+TEST_F(TallybookTest, deliversDaysInclusivelyByDayThenKeyBytes) {
+  ASSERT_TRUE(
+      import("scalar\t3\tb\t1\nscalar\t1\tz\t2\nscalar\t2\t\xC3\xA9\t3\nscalar\t2\tZ\t4\n"
+             "scalar\t2\ta\t5\nscalar\t4\ta\t6\nscalar\t-1\ta\t7\n"
+             "sample\t3\td\t1\t0\nsample\t2\te\t2\t7\nsample\t2\te\t3\t-7\n"));
+  SqliteTallybook tallybook(device, clock, preferences, log);
+  const std::unique_ptr<TBHistory> history = tallybook.openHistory();
+  std::vector<std::string> rows;
+  const auto found = [&](std::string_view prefix, std::int32_t from, std::int32_t to,
+                         std::size_t most = 99) {
+    rows.clear();
+    history->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+        prefix, from, to,
+        [&](std::string_view key, std::int32_t day, std::int64_t value, bool& stop) {
+          rows.push_back(std::to_string(day) + std::string(key) + std::to_string(value));
+          stop = rows.size() == most;
+        });
+    return rows;
+  };
+  EXPECT_THAT(found("", 1, 3), ElementsAre("1z2", "2Z4", "2a5", "2\u00E93", "3b1"));
+  EXPECT_THAT(found("a", std::numeric_limits<std::int32_t>::min(), kToday),
+              ElementsAre("-1a7", "2a5", "4a6"));
+  EXPECT_THAT(found("", 2, 3, 2), ElementsAre("2Z4", "2a5"));
+  EXPECT_THAT(found("", 3, 2), IsEmpty());
+  rows.clear();
+  history->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+      "", 2, 3,
+      [&](std::string_view key, std::int32_t day, TBHistoryDistributionEnumerator& values, bool&) {
+        double value = 0;
+        std::int32_t offset = 0;
+        while (values.getNextValueSecondsInDayOffset(value, &offset)) {
+          rows.push_back(std::to_string(day) + std::string(key) + std::to_string(offset));
+        }
+        EXPECT_FALSE(values.getNextValueSecondsInDayOffset(value, nullptr));
+      });
+  EXPECT_THAT(rows, ElementsAre("2e7", "2e-7", "3d0"));
+}
+
+TEST_F(TallybookTest, readsBackWhatItDumps) {
+  std::string text =
+      "scalar\t19786\t\t-9223372036854775808\n"
+      "scalar\t19786\ta\tb\r\"\xF0\x9F\x98\x80\t9223372036854775807\n"
+      "sample\t19786\ta\tb\t-inf\t0\nsample\t19786\ta\tb\tnan\t86399\nsample\t19786\ta\tb\tinf\t1\n"
+      "sample\t19786\tc\t-0\t2147483647\nsample\t19786\tc\t5e-324\t-2147483648\n"
+      "scalar\t19787\ta\t0\n";
+  std::string interleaved = text;
+  // More than one chunk each, the keys in turn.
+  std::string first;
+  std::string second;
+  for (std::size_t i = 0; i < 2 * CounterStore::kSamplesPerChunk + 5; ++i) {
+    const std::string value = std::to_string(i) + ".1\t" + std::to_string(i) + '\n';
+    first += "sample\t19787\tfirst\t" + value;
+    second += "sample\t19787\tsecond\t" + value;
+    interleaved += "sample\t19787\tsecond\t" + value + "sample\t19787\tfirst\t" + value;
+  }
+  text += first + second;
+  interleaved.pop_back();
+  ASSERT_TRUE(import(interleaved)) << error;
+  EXPECT_EQ(dump(), text);
+  ASSERT_TRUE(import("sample\t19787\tfirst\t-1\t3\n"));
+  EXPECT_EQ(dump(),
+            text.substr(0, text.size() - second.size()) + "sample\t19787\tfirst\t-1\t3\n" + second);
+  EXPECT_EQ(dump(19788), "");
+}
+
+TEST_F(TallybookTest, keepsNothingOfAnImportWithABadLine) {
+  const std::string good = "scalar\t19787\tk\t1\nsample\t19787\tk\t1\t1\n";
+  ASSERT_TRUE(import(good));
+  for (const std::string bad :
+       {"", "scalar", "scalar\t1\tk", "other\t1\tk\t1", "scalar\t\tk\t1",
+        "scalar\t2147483648\tk\t1", "scalar\t1\tk\t9223372036854775808", "scalar\t1\tk\t1.5",
+        "scalar\t1\tk\t1\r", "scalar\t1\tk\t+1", "scalar\t1\tk\xFF\t1", "sample\t1\tk\t1",
+        "sample\t1\tk\tx\t1", "sample\t1\tk\t1e999\t1", "sample\t1\tk\t1\t1.0",
+        "sample\t1\t\xEF\xBF\xBF\t1\t1"}) {
+    EXPECT_FALSE(import("scalar\t19787\tk\t2\nsample\t19787\tk\t2\t2\n" + bad + "\nrest"));
+    EXPECT_THAT(error, StartsWith("line 3: ")) << bad;
+    EXPECT_EQ(dump(), good);
+  }
+}
+
+TEST_F(TallybookTest, refusesKeysThatNoDocumentCarries) {
+  const std::string longest(1024 * 1024, 'k');
+  for (const std::string& key : {"a\xFF"s, "a\0b"s, longest + 'k'}) {
+    add(key, 1);
+    SqliteTallybook(device, clock, preferences, log).TBClientSetValueForScalarKey(key, 1);
+    EXPECT_THAT(log.messages.back(), StartsWith("a counter is refused: the key \""));
+  }
+  EXPECT_THAT(log.messages, SizeIs(6));
+  EXPECT_THAT(folder.names(), IsEmpty());
+  add(longest, 1);
+  EXPECT_EQ(dump(), "scalar\t19787\t" + longest + "\t1\n");
+}
+
+TEST_F(TallybookTest, losesNoIncrementOfProcessesAndThreadsThatWriteAtOnce) {
+  constexpr int kRounds = 20;
+  const auto work = [&](SqliteTallybook& tallybook) {
+    for (int i = 0; i < kRounds; ++i) {
+      tallybook.TBClientAddValueForScalarKey("k", 1);
+      tallybook.TBClientCheckpoint();
+    }
+  };
+  const pid_t child = startProcess([&] {
+    {
+      SqliteTallybook tallybook(device, clock, preferences, log);
+      work(tallybook);
+    }
+    EXPECT_THAT(log.messages, IsEmpty());
+  });
+  {
+    SqliteTallybook tallybook(device, clock, preferences, log);
+    std::thread other([&] { work(tallybook); });
+    work(tallybook);
+    other.join();
+  }
+  EXPECT_TRUE(hasSucceeded(child));
+  EXPECT_EQ(dump(), scalar(3 * kRounds));
+  EXPECT_THAT(log.messages, IsEmpty());
+}
+
+TEST_F(TallybookTest, keepsEveryCommittedCounterOfAKilledWriter) {
+  std::mt19937 random(7);
+  std::int64_t committed = 0;
+  for (int round = 0; round < 12; ++round) {
+    int ends[2];
+    ASSERT_EQ(pipe(ends), 0);
+    const pid_t child = startProcess([&] {
+      SqliteTallybook tallybook(device, clock, preferences, log);
+      for (char done = 'x'; done != 0;) {
+        tallybook.TBClientAddValueForScalarKey("first", 1);
+        tallybook.TBClientAddValueForScalarKey("second", 1);
+        tallybook.TBClientCheckpoint();
+        done = write(ends[1], &done, 1) == 1 ? 'x' : '\0';
+      }
+    });
+    close(ends[1]);
+    if (char done; round % 2 != 0 && read(ends[0], &done, 1) == 1) {  // also on a slow machine
+      ++committed;
+    }
+    usleep(static_cast<useconds_t>(random() % 60'000));
+    kill(child, SIGKILL);
+    waitpid(child, nullptr, 0);
+    for (char done; read(ends[0], &done, 1) == 1;) {
+      ++committed;
+    }
+    close(ends[0]);
+    const std::string text = dump();
+    const auto both = [](std::int64_t count) { return count == 0 ? "" : scalars(count, count); };
+    // A kill between the commit and the word of it counts one more.
+    committed += text == both(committed + 1) ? 1 : 0;
+    EXPECT_EQ(text, both(committed));
+  }
+  EXPECT_GT(committed, 0);
+  EXPECT_EQ(corruptions(), 0);
+}
+
+/// Damages `content` in the way that `number` picks.
+std::string damaged(std::string content, int number, std::mt19937& random) {
+  const std::size_t place = random() % content.size();
+  if (number % 3 == 0) {
+    return content.substr(0, place);
+  }
+  // Also at the beginning, where little is left to chance.
+  const std::size_t begin = number % 3 == 1 ? place : random() % 120;
+  const std::size_t end = std::min(content.size(), begin + 1 + random() % 2000);
+  std::generate(&content[begin], content.data() + end, [&] { return static_cast<char>(random()); });
+  return content;
+}
+
+TEST_F(TallybookTest, movesDamagedFilesAsideAndGoesOn) {
+  std::string text;
+  for (int i = 0; i < 12'400; ++i) {
+    const std::string name = "com.quill.key" + std::to_string(i / 31);
+    text += (i % 31 == 0 ? "scalar\t19786\t" + name : "sample\t19786\t" + name + "\t1") + "\t1\n";
+  }
+  ASSERT_TRUE(import(text));
+  const std::string sound = folder.read(kFile);
+  std::mt19937 random(42);
+  int found = 0;
+  for (int number = 0; number < 60; ++number) {
+    SCOPED_TRACE(number);
+    const std::string content = damaged(sound, number, random);
+    for (const std::string& name : folder.names(kFolder)) {
+      unlink(folder.path(std::string(kFolder) + '/' + name).c_str());
+    }
+    folder.write(kFile, content);
+    const std::int64_t before = corruptions();
+    log.messages.clear();
+    {
+      SqliteTallybook tallybook(device, clock, preferences, log);
+      const std::unique_ptr<TBHistory> history = tallybook.openHistory();
+      const auto ignore = [](std::string_view, std::int32_t, std::int64_t, bool&) {};
+      const auto readAll = [](std::string_view, std::int32_t,
+                              TBHistoryDistributionEnumerator& values, bool&) {
+        for (double value = 0; values.getNextValueSecondsInDayOffset(value, nullptr);) {
+        }
+      };
+      tallybook.TBClientAddValueForScalarKey("k", 1);
+      if (number % 2 == 0) {
+        tallybook.TBClientCheckpoint();  // sometimes writing comes across the damage first
+      }
+      history->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler("", 0, 99999, ignore);
+      history->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler("", 0, 99999,
+                                                                                   readAll);
+      tallybook.TBClientAddValueForScalarKey("k", 1);
+    }
+    const std::vector<std::string> names = folder.names(kFolder);
+    const auto moved = static_cast<std::int64_t>(names.size()) - 1;
+    EXPECT_EQ(corruptions(), before + moved);
+    ASSERT_LE(moved, 1);
+    if (moved == 1) {
+      ++found;
+      EXPECT_THAT(names[1], "TBDataStore.sqlitedb.corrupt-20240305T091502Z");
+      EXPECT_THAT(log.messages.front(), HasSubstr("; kept as " + folder.path(kFolder)));
+      // The first one may have gone into the file before its damage was found.
+      EXPECT_THAT(dump(), AnyOf(scalar(2), scalar(number % 2 == 0 ? 1 : 2)));
+    } else {
+      EXPECT_THAT(log.messages, IsEmpty());
+      EXPECT_THAT(dump(kToday, kToday), HasSubstr(scalar(2)));
+    }
+  }
+  EXPECT_GT(found, 20);
+}
+
+TEST_F(TallybookTest, movesForeignFilesAsideWithTheirJournals) {
+  const auto database = [&](const char* sql) {
+    const std::string path = folder.path("other");
+    folder.write("other", "");
+    SqliteConnection(path, kShortWait).execute(sql);
+    return folder.read("other");
+  };
+  const std::string foreign[] = {
+      "", "text, not a database", std::string(5000, '\0'), database("CREATE TABLE scalar (day)"),
+      database("PRAGMA application_id = 0x56455350; PRAGMA user_version = 1; CREATE TABLE t (x)")};
+  std::int64_t count = 0;
+  for (const std::string& content : foreign) {
+    folder.write(kFile, content);
+    log.messages.clear();
+    add("k", 1);
+    EXPECT_EQ(corruptions(), ++count);
+    ASSERT_THAT(log.messages, SizeIs(1));
+    EXPECT_THAT(folder.names(kFolder), SizeIs(1 + static_cast<std::size_t>(count)));
+    const std::string name = "TBDataStore.sqlitedb.corrupt-20240305T091502Z" +
+                             (count == 1 ? "" : '-' + std::to_string(count));
+    EXPECT_EQ(folder.read(std::string(kFolder) + '/' + name), content);
+    EXPECT_EQ(dump(), scalar(1));
+  }
+  // The journal of a file that is gone must not reach the new one.
+  unlink(folder.path(kFile).c_str());
+  folder.write(std::string(kFile) + "-journal", "left");
+  add("k", 1);
+  EXPECT_THAT(folder.names(kFolder).back(), MatchesRegex(".*\\.corrupt-.*-journal"));
+  EXPECT_EQ(dump(), scalar(1));
+  EXPECT_EQ(corruptions(), count);
+}
+
+TEST_F(TallybookTest, neverTakesALockForDamage) {
+  add("k", 1);
+  SqliteTallybook tallybook(device, clock, preferences, log, kShortWait);
+  tallybook.TBClientAddValueForScalarKey("k", 1);
+  SqliteTallybook other(device, clock, preferences, log);
+  EXPECT_FALSE(other.write(
+      [&](CounterStore& store) {
+        store.setScalar(kToday, "k", 99);
+        tallybook.TBClientCheckpoint();
+        return false;
+      },
+      error));
+  EXPECT_THAT(log.messages, ElementsAre("counters wait for the next checkpoint: " +
+                                        folder.path(kFile) + ": another process keeps it locked"));
+  EXPECT_EQ(dump(), scalar(1));
+  tallybook.TBClientAddValueForScalarKey("k", 1);
+  tallybook.TBClientCheckpoint();
+  EXPECT_EQ(dump(), scalar(3));
+}
+
+TEST_F(TallybookTest, neverTakesPermissionsOrAFullDiskForDamage) {
+  add("k", 1);
+  const auto waits = [&](SqliteTallybook& tallybook) {
+    EXPECT_THAT(log.messages, IsEmpty());
+    tallybook.TBClientAddValueForScalarKey("k", 1);
+    tallybook.TBClientCheckpoint();
+    EXPECT_THAT(log.messages, ElementsAre(StartsWith("counters wait for the next checkpoint: ")));
+  };
+  for (std::string path = folder.path(kFolder); path.size() >= folder.path().size();) {
+    chmod(path.c_str(), 0755);
+    path.resize(path.rfind('/'));
+  }
+  const std::pair<mode_t, mode_t> modes[] = {{0444, 0555}, {0666, 0555}, {0, 0755}};
+  for (const auto& [fileMode, folderMode] : modes) {
+    chmod(folder.path(kFile).c_str(), fileMode);
+    chmod(folder.path(kFolder).c_str(), folderMode);
+    EXPECT_TRUE(hasSucceeded(startProcess([&, isReadable = fileMode != 0] {
+      EXPECT_TRUE(geteuid() != 0 || setuid(65534) == 0);  // root may write everywhere
+      SqliteTallybook tallybook(device, clock, preferences, log, kShortWait);
+      if (isReadable) {
+        EXPECT_EQ(dump(), scalar(1));
+      }
+      waits(tallybook);
+    })));
+  }
+  chmod(folder.path(kFile).c_str(), 0600);
+  EXPECT_TRUE(hasSucceeded(startProcess([&] {
+    SqliteTallybook tallybook(device, clock, preferences, log);
+    {
+      const FileSizeLimit limit(4096);
+      waits(tallybook);
+      EXPECT_EQ(dump(), scalar(1));
+    }
+    tallybook.TBClientCheckpoint();
+    EXPECT_EQ(dump(), scalar(2));
+  })));
+  EXPECT_THAT(folder.names(kFolder), ElementsAre("TBDataStore.sqlitedb"));
+  EXPECT_EQ(corruptions(), 0);
+}
+
+}  // namespace
+}  // namespace vesprun

@@ -1,0 +1,253 @@
+#include <cmath>
+
+#include <gmock/gmock.h>
+#include <limits>
+
+#include "platform/host/documents/PtreeReader.h"
+#include "platform/host/documents/PtreeWriter.h"
+
+namespace vesprun {
+namespace {
+
+using ::testing::HasSubstr, ::testing::StartsWith;
+
+std::string inPtree(const std::string& content) {
+  return "<ptree version=\"1.0\">" + content + "</ptree>";
+}
+
+PropertyValue readOf(const std::string& document) {
+  std::string error;
+  std::optional<PropertyValue> value = readPtree(document, error);
+  EXPECT_TRUE(value) << error << "\n" << document.substr(0, 300);
+  return value.value_or(PropertyValue("not read"));
+}
+
+std::string readingError(const std::string& document) {
+  std::string error;
+  EXPECT_FALSE(readPtree(document, error)) << document.substr(0, 300);
+  return error;
+}
+
+std::string writtenOf(const PropertyValue& value) {
+  std::string document;
+  std::string error;
+  EXPECT_TRUE(writePtree(value, document, error)) << error;
+  return document;
+}
+
+std::string nestedArrays(std::size_t count) {
+  std::string start, end;
+  for (std::size_t level = 0; level < count; ++level) {
+    start += "<array>";
+    end += "</array>";
+  }
+  return inPtree(start + "<true/>" + end);
+}
+
+PropertyDict everything() {
+  return {{"name", "text"},
+          {"escaped <&>\"'", "a & b < c > d ]]> \"e\" 'f'"},
+          {"white", " \t\n\r \r\n"},
+          {"", ""},
+          {"unicode", "\xC3\xA4\xE2\x82\xAC\xF0\x9F\x98\x80"},
+          {"smallest", std::numeric_limits<std::int64_t>::min()},
+          {"largest", std::numeric_limits<std::uint64_t>::max()},
+          {"tiny", 5e-324},
+          {"third", 1.0 / 3},
+          {"huge", -1.7976931348623157e308},
+          {"single", 0.1F},
+          {"infinite", -std::numeric_limits<double>::infinity()},
+          {"yes", true},
+          {"no", false},
+          {"no bytes", Bytes{}},
+          {"bytes", Bytes{0, 255, 16, 128}},
+          {"date", Date{1709630102, 250'000'000}},
+          {"list", PropertyArray{PropertyDict{{"in", 1}}, PropertyArray{}, PropertyDict{}, "x"}}};
+}
+
+TEST(PtreeWriter, writesTabIndentedDocuments) {
+  EXPECT_EQ(writtenOf(PropertyDict{{"name", "text"},
+                                   {"list", PropertyArray{std::uint8_t{7}, 2.0, 0.25F, true}},
+                                   {"empty", PropertyDict{}},
+                                   {"data", Bytes{1, 2, 3, 4}},
+                                   {"date", Date{1709630102, 0}},
+                                   {"text", "a<b>&\r\n"}}),
+            R"(<?xml version="1.0" encoding="UTF-8"?>
+<ptree version="1.0">
+<dict>
+	<key>name</key>
+	<string>text</string>
+	<key>list</key>
+	<array>
+		<integer>7</integer>
+		<real>2</real>
+		<real>0.25</real>
+		<true/>
+	</array>
+	<key>empty</key>
+	<dict/>
+	<key>data</key>
+	<data>AQIDBA==</data>
+	<key>date</key>
+	<date>2024-03-05T09:15:02Z</date>
+	<key>text</key>
+	<string>a&lt;b&gt;&amp;&#13;
+</string>
+</dict>
+</ptree>
+)");
+}
+
+TEST(PtreeWriter, namesThePlaceOfWhatADocumentCannotCarry) {
+  std::string document = "before";
+  std::string error;
+  const auto refuses = [&](const PropertyValue& value) {
+    EXPECT_FALSE(writePtree(value, document, error));
+    EXPECT_EQ(document, "before");
+    return error;
+  };
+  EXPECT_EQ(refuses(PropertyDict{{"a", PropertyArray{1, PropertyDict{{"b", "x\x01"}}}}}),
+            "\"a\" > [1] > \"b\": the string \"x\\x01\" holds what XML cannot carry");
+  EXPECT_EQ(refuses(PropertyDict{{"bad\xFF", 1}}),
+            "\"bad\\xff\": the key \"bad\\xff\" holds what XML cannot carry");
+  EXPECT_THAT(refuses("\xEF\xBF\xBE"), HasSubstr("XML"));
+  EXPECT_THAT(refuses(PropertyArray{Date{std::numeric_limits<std::int64_t>::max(), 0}}),
+              StartsWith("[0]: a date"));
+  PropertyValue nested(1);
+  for (int level = 0; level < 200; ++level) {
+    nested = PropertyArray{std::move(nested)};
+  }
+  EXPECT_EQ(readOf(writtenOf(nested)), nested);
+  EXPECT_THAT(refuses(PropertyArray{nested}),
+              HasSubstr("\xE2\x80\xA6: nested deeper than 200 levels"));
+}
+
+TEST(PtreeReader, readsBackEveryKindOfValue) {
+  const PropertyDict original = everything();
+  const PropertyValue read = readOf(writtenOf(original));
+  EXPECT_EQ(read, PropertyValue(original));
+  ASSERT_NE(read.dict(), nullptr);
+  auto entry = read.dict()->begin();
+  for (const auto& [key, value] : original) {
+    EXPECT_EQ((entry++)->first, key);  // in order
+  }
+  EXPECT_TRUE(std::isnan(readOf(writtenOf(std::nan(""))).number()->asDouble()));
+  EXPECT_TRUE(std::isnan(readOf(writtenOf(-std::nan(""))).number()->asDouble()));
+  const auto kindOf = [](const char* text) { return readOf(inPtree(text)).number()->kind(); };
+  EXPECT_EQ(kindOf("<integer>9223372036854775807</integer>"), NumberKind::Int64);
+  EXPECT_EQ(kindOf("<integer>9223372036854775808</integer>"), NumberKind::UInt64);
+  EXPECT_EQ(kindOf("<real>2</real>"), NumberKind::Double);
+}
+
+TEST(PtreeReader, takesWhatOtherWritersMayWrite) {
+  const PropertyValue one(PropertyArray{1});
+  for (const std::string start :
+       {"", "\xEF\xBB\xBF", "\n", "<?xml version='1.0'?>",
+        "<?xml version = \"1.0\" encoding='utf-8' standalone=\"yes\" ?>\r\n"}) {
+    EXPECT_EQ(readOf(start + inPtree("<array><integer>1</integer></array>") + " \n"), one);
+  }
+  EXPECT_EQ(readOf("<ptree  version = '1.0' >\r\n<array >\r\n\t<integer >1</integer >\n</array>"
+                   "</ptree >"),
+            one);
+  EXPECT_EQ(readOf(inPtree("<string>&#x41;&#66;&lt;&gt;&amp;&quot;&apos;&#x1F600;&#10;</string>")),
+            PropertyValue("AB<>&\"'\xF0\x9F\x98\x80\n"));
+  EXPECT_EQ(readOf(inPtree("<string>a\r\nb\rc&#13;\n</string>")), PropertyValue("a\nb\nc\r\n"));
+  EXPECT_EQ(readOf(inPtree("<data>\n\tAQ\n ID\t</data>")), PropertyValue(Bytes{1, 2, 3}));
+  EXPECT_EQ(readOf(inPtree("<array><string/><string></string><true></true><data/></array>")),
+            PropertyValue(PropertyArray{"", "", true, Bytes{}}));
+  EXPECT_EQ(readOf(inPtree("<dict>\n</dict>")), PropertyValue(PropertyDict{}));
+  const PropertyValue repeated =
+      readOf(inPtree("<dict><key>a</key><true/><key> </key><string> </string>"
+                     "<key>a</key><string>\n</string></dict>"));
+  EXPECT_EQ(repeated, PropertyValue(PropertyDict{{"a", "\n"}, {" ", " "}}));
+  EXPECT_EQ(repeated.dict()->begin()->first, "a");
+}
+
+TEST(PtreeReader, refusesWhatTheGrammarDoesNotKnow) {
+  const std::pair<const char*, std::vector<const char*>> cases[] = {
+      {"line 1: the key \"a\" has no value", {"<dict><key>a</key></dict>"}},
+      {"the key \"a\" has no value", {"<dict><key>a</key><key>b</key><true/></dict>"}},
+      {"a value without a key", {"<dict><true/></dict>"}},
+      {"a key where a value is expected", {"<array><key>a</key></array>"}},
+      {"text outside of a value", {"<dict>text</dict>", "<array>&#32;</array>", "<true/>text"}},
+      {"a document without a value", {""}},
+      {"more than one value", {"<true/><true/>"}},
+      {"an element inside <string>", {"<string><true/></string>"}},
+      {"comments", {"<string>a<!-- b --></string>"}},
+      {"DOCTYPE", {"<!DOCTYPE ptree><true/>"}},
+      {"CDATA", {"<string><![CDATA[a]]></string>"}},
+      {"processing instructions", {"<?php ?><true/>"}},
+      {"<string> cannot have attributes", {"<string id=\"1\">a</string>"}},
+      {"unknown element \"text\"", {"<text>a</text>"}},
+      {"unknown element \"String\"", {"<String>a</String>"}},
+      {"unknown element \"ptree\"", {"<ptree version=\"1.0\"><true/></ptree>"}},
+      {"malformed tag", {"< string>a</string>"}},
+      {"<string> is not ended by \"</array>\"", {"<string>a</array>"}},
+      {"<dict> is not ended by \"</array>\"", {"<dict></array>"}},
+      {"<true> is not empty", {"<true> </true>"}},
+      {"unknown entity", {"<string>a&nbsp;b</string>", "<string>a & b</string>"}},
+      {"XML does not allow",
+       {"<string>&#0;</string>", "<string>&#xD800;</string>", "<string>&#4294967361;</string>",
+        "<string>&#;</string>", "<string>\x01</string>"}},
+      {"malformed character reference", {"<string>&#X41;</string>", "<string>&#1a;</string>"}},
+      {"\"]]>\"", {"<string>a]]>b</string>"}},
+      {"not UTF-8", {"<string>\xFF</string>"}},
+      {"\"\" is no integer", {"<integer></integer>"}},
+      {"no integer",
+       {"<integer>+1</integer>", "<integer> 1</integer>", "<integer>0x10</integer>",
+        "<integer>-9223372036854775809</integer>", "<integer>18446744073709551616</integer>"}},
+      {"no real number",
+       {"<real>1e999</real>", "<real>infinity</real>", "<real>0x1p3</real>", "<real>1.5 </real>",
+        "<real/>"}},
+      {"is not base64",
+       {"<data>AQI</data>", "<data>AQ==AQ==</data>", "<data>A===</data>", "<data>AR==</data>",
+        "<data>A*==</data>"}},
+      {"\"2024-02-30T00:00:00Z\" is not a date", {"<date>2024-02-30T00:00:00Z</date>"}}};
+  for (const auto& [message, contents] : cases) {
+    for (const char* content : contents) {
+      EXPECT_THAT(readingError(inPtree(content)), HasSubstr(message)) << content;
+    }
+  }
+}
+
+TEST(PtreeReader, refusesWhatIsNoPtreeDocument) {
+  for (const char* document :
+       {"", "plain", "<", "<ptree>", "<ptree version=\"1.0\"/>", "<ptreeversion=\"1.0\"><true/>",
+        "<ptree><true/></ptree>", "<ptree version=\"2.0\"><true/></ptree>",
+        "<ptree version=\"1.0\" x=\"y\"><true/></ptree>", "<dict></dict>",
+        "<!-- a --><ptree version=\"1.0\"><true/></ptree>", "<?xml?><ptree version=\"1.0\">",
+        "<?xml version=\"1.1\"?><ptree version=\"1.0\"><true/></ptree>",
+        "<?xml version=\"1.0\" encoding=\"UTF-16\"?><ptree version=\"1.0\"><true/></ptree>",
+        "<?xml version=\"1.0\"encoding=\"UTF-8\"?><ptree version=\"1.0\"><true/></ptree>",
+        "<ptree version=\"1.0\"><true/></ptree><ptree version=\"1.0\"><true/></ptree>",
+        "<ptree version=\"1.0\"><true/></ptree>x", " <?xml version=\"1.0\"?>"}) {
+    EXPECT_THAT(readingError(document), StartsWith("line 1: ")) << document;
+  }
+  EXPECT_THAT(readingError(std::string("<\0p\0t\0", 6)), StartsWith("line 1: "));
+}
+
+TEST(PtreeReader, namesTheLine) {
+  const std::string start = "<?xml version=\"1.0\"?>\r\n<ptree version=\"1.0\">\n<dict>\n";
+  EXPECT_THAT(readingError(start + "<key>a</key>\n<integer>1x</integer>\n</dict></ptree>"),
+              StartsWith("line 5: \"1x\" is no integer"));
+  EXPECT_THAT(readingError(start + "<key>a&amp;\nb</key>\n<string>\n\n&bad;</string>"),
+              StartsWith("line 8: an unknown entity"));
+  EXPECT_THAT(readingError(start + "<key>a</key>\n</dict>\n</ptree>"),
+              StartsWith("line 4: the key"));
+  EXPECT_EQ(readingError(start + "\n\n"), "line 6: the document ends early");
+  EXPECT_EQ(readingError(nestedArrays(201)), "line 1: nested deeper than 200 levels");
+  EXPECT_THAT(readingError(nestedArrays(1'000'000)), HasSubstr("nested"));
+  readOf(nestedArrays(200));
+}
+
+TEST(PtreeReader, refusesADocumentCutAtAnyByte) {
+  const std::string document = writtenOf(everything());
+  const std::size_t end = document.size() - 1;  // without the last line feed it is complete
+  for (std::size_t size = 0; size < end; ++size) {
+    EXPECT_THAT(readingError(document.substr(0, size)), StartsWith("line ")) << size;
+  }
+  readOf(document.substr(0, end));
+}
+
+}  // namespace
+}  // namespace vesprun

@@ -1,0 +1,150 @@
+#include "platform/host/files/AtomicFile.h"
+
+#include <fcntl.h>
+#include <sys/file.h>
+
+#include <sstream>
+#include <thread>
+
+#include "platform/host/files/JsonLines.h"
+#include "support/HostServiceTest.h"
+
+namespace vesprun {
+namespace {
+
+using ::testing::ElementsAre, ::testing::HasSubstr;
+
+using AtomicFileTest = HostServiceTest;
+using JsonLinesTest = HostServiceTest;
+
+TEST_F(AtomicFileTest, showsTheDocumentOnlyWhenItIsComplete) {
+  const std::string large(200'000, 'x');
+  for (const std::string& content : {large, std::string("second")}) {
+    const auto before = folder.names();
+    std::optional<AtomicFile> file = AtomicFile::create(folder.path(), error);
+    ASSERT_TRUE(file) << error;
+    EXPECT_TRUE(file->append(content));
+    EXPECT_TRUE(file->append("!"));
+    EXPECT_EQ(folder.names(), before);
+    ASSERT_TRUE(file->replace("document", error)) << error;
+    EXPECT_THAT(folder.names(), ElementsAre("document"));
+    EXPECT_EQ(folder.read("document"), content + "!");
+    EXPECT_EQ(modeOf("document"), mode_t{S_IFREG | 0600});
+  }
+}
+
+TEST_F(AtomicFileTest, addsOnlyUnderANameThatIsFree) {
+  folder.write("0001", "earlier");
+  std::optional<AtomicFile> file = AtomicFile::create(folder.path(), error);
+  file->append("new");
+  EXPECT_EQ(file->addNew("0001", error), AtomicFile::Added::NameTaken);
+  EXPECT_EQ(error, "");
+  EXPECT_EQ(file->addNew("0002", error), AtomicFile::Added::Done);
+  EXPECT_EQ(file->addNew("missing/0003", error), AtomicFile::Added::Failed);
+  EXPECT_THAT(error, HasSubstr("missing/0003: No such file"));
+  EXPECT_EQ(folder.read("0001"), "earlier");
+  EXPECT_EQ(folder.read("0002"), "new");
+  AtomicFile::create(folder.path(), error)->append("dropped");
+  EXPECT_THAT(folder.names(), ElementsAre("0001", "0002"));
+  EXPECT_FALSE(AtomicFile::create(folder.path("none"), error));
+  EXPECT_EQ(error, folder.path("none") + ": No such file or directory");
+}
+
+TEST_F(AtomicFileTest, keepsTheEarlierDocumentUntilTheNewOneIsComplete) {
+  folder.write("document", "earlier");
+  {
+    const FileSizeLimit limit(100'000);
+    EXPECT_FALSE(replaceFile(folder.path("document"), std::string(150'000, 'x'), error));
+  }
+  EXPECT_THAT(error, HasSubstr(folder.path("document") + ": File too large"));
+  EXPECT_EQ(folder.read("document"), "earlier");
+  EXPECT_THAT(folder.names(), ElementsAre("document"));
+  folder.write(".replacement", "complete, but never renamed by a process that was killed");
+  EXPECT_TRUE(replaceFile(folder.path("document"), "new", error)) << error;
+  EXPECT_EQ(folder.read("document"), "new");
+  EXPECT_THAT(folder.names(), ElementsAre("document"));
+}
+
+TEST_F(AtomicFileTest, isCompleteOrAbsentWhereverItsWriterIsKilled) {
+  const std::string content(300'000, 'x');
+  for (int delay = 0; delay < 20; ++delay) {
+    const pid_t child = startProcess([&] {
+      while (replaceFile(folder.path("document"), content, error)) {
+      }
+    });
+    usleep(static_cast<useconds_t>(delay * 700));
+    kill(child, SIGKILL);
+    int status = 0;
+    waitpid(child, &status, 0);
+    ASSERT_TRUE(WIFSIGNALED(status));
+    for (const std::string& name : folder.names()) {
+      EXPECT_EQ(folder.read(name).size(), content.size()) << name;
+    }
+  }
+  EXPECT_THAT(folder.names(), ::testing::Contains("document"));
+}
+
+TEST_F(JsonLinesTest, appendsWholeLinesFromManyWriters) {
+  JsonLines first(folder.path("events.jsonl"));
+  JsonLines second(folder.path("events.jsonl"));
+  const std::string line(500, 'x');
+  const auto write = [&line](JsonLines& lines) {
+    std::string reason;
+    for (int count = 0; count < 200; ++count) {
+      EXPECT_TRUE(lines.append(line, reason)) << reason;
+    }
+  };
+  std::thread shared(write, std::ref(first));
+  std::thread other(write, std::ref(second));
+  write(first);
+  shared.join();
+  other.join();
+  std::istringstream written(folder.read("events.jsonl"));
+  int count = 0;
+  for (std::string text; std::getline(written, text); ++count) {
+    EXPECT_EQ(text, line);
+  }
+  EXPECT_EQ(count, 600);
+  EXPECT_EQ(modeOf("events.jsonl"), mode_t{S_IFREG | 0600});
+}
+
+TEST_F(JsonLinesTest, endsATornLineAndMakesADeletedFileAnew) {
+  folder.write("log.jsonl", "{\"whole\":1}\n{\"to");
+  JsonLines lines(folder.path("log.jsonl"));
+  EXPECT_TRUE(lines.append("{}", error)) << error;
+  EXPECT_EQ(folder.read("log.jsonl"), "{\"whole\":1}\n{\"to\n{}\n");
+  EXPECT_FALSE(lines.append("two\nlines", error));
+  unlink(folder.path("log.jsonl").c_str());
+  EXPECT_TRUE(lines.append("{}", error)) << error;
+  EXPECT_EQ(folder.read("log.jsonl"), "{}\n");
+}
+
+TEST_F(JsonLinesTest, takesBackALineThatDidNotFit) {
+  JsonLines lines(folder.path("log.jsonl"));
+  EXPECT_TRUE(lines.append("{}", error)) << error;
+  {
+    const FileSizeLimit limit(100);
+    EXPECT_FALSE(lines.append(std::string(200, 'x'), error));
+  }
+  EXPECT_EQ(error, folder.path("log.jsonl") + ": no room for a line");
+  EXPECT_EQ(folder.read("log.jsonl"), "{}\n");
+  EXPECT_TRUE(lines.append("{}", error)) << error;
+  EXPECT_EQ(folder.read("log.jsonl"), "{}\n{}\n");
+}
+
+TEST_F(JsonLinesTest, waitOnceForALockThatNobodyReleases) {
+  folder.write("log.jsonl", "");
+  JsonLines lines(folder.path("log.jsonl"), std::chrono::milliseconds(50));
+  {
+    const FileDescriptor stopped(open(folder.path("log.jsonl").c_str(), O_RDONLY));
+    flock(stopped.get(), LOCK_EX);
+    for (int line = 0; line < 1000; ++line) {
+      EXPECT_FALSE(lines.append("{}", error));
+    }
+    EXPECT_EQ(error, folder.path("log.jsonl") + ": another process keeps it locked");
+  }
+  EXPECT_TRUE(lines.append("{}", error)) << error;
+}
+
+}  // namespace
+}  // namespace vesprun

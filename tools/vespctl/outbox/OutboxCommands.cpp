@@ -1,0 +1,209 @@
+#include <algorithm>
+#include <filesystem>
+#include <iostream>
+#include <sstream>
+#include <system_error>
+#include <utility>
+
+#include "Command.h"
+#include "common/TextForm.h"
+#include "outbox/DailyLogView.h"
+#include "platform/host/documents/JsonForm.h"
+#include "platform/host/documents/PtreeReader.h"
+#include "platform/host/files/WholeFile.h"
+
+namespace vesprun {
+namespace {
+
+std::string entryText(const PropertyDict& line, const char* key) {
+  const PropertyValue* value = line.find(key);
+  return value != nullptr ? textForm(*value) : "";
+}
+
+/// One shown line for each line of the file; what cannot be read is said where it stands.
+template <typename Show>
+void showLines(const std::string& file, Show show) {
+  std::string error;
+  bool missing = false;
+  const std::optional<std::string> content = readWholeFile(file, error, &missing);
+  if (!content) {
+    if (!missing) {
+      throw CommandFailure(error);
+    }
+    return;
+  }
+  std::istringstream lines(*content);
+  int number = 0;
+  for (std::string line; std::getline(lines, line);) {
+    ++number;
+    const std::optional<PropertyValue> value = valueFromJsonText(line, error);
+    if (value && value->dict() != nullptr) {
+      show(*value->dict());
+    } else {
+      std::cout << "(line " << number << " cannot be read)\n";
+    }
+  }
+}
+
+void showEvents(const DeviceDirectory& directory, bool inFull) {
+  showLines(directory.hostPath("outbox/events.jsonl"), [inFull](const PropertyDict& event) {
+    const PropertyValue* payload = event.find("payload");
+    const PropertyDict* fields = payload != nullptr ? payload->dict() : nullptr;
+    std::cout << entryText(event, "time") << "  " << entryText(event, "event") << "  "
+              << (fields != nullptr ? fields->size() : 0) << " fields\n";
+    if (inFull && fields != nullptr) {
+      for (const auto& [key, value] : *fields) {
+        std::cout << "    " << key << " = " << textForm(value) << '\n';
+      }
+    }
+  });
+}
+
+/// The text form of a record, or of its first entries and the number of the others.
+std::string recordText(const PropertyDict& record, bool inFull) {
+  constexpr std::size_t kShownEntries = 8;
+  if (inFull || record.size() <= kShownEntries) {
+    return textForm(record);
+  }
+  PropertyDict first;
+  for (auto entry = record.begin(); first.size() < kShownEntries; ++entry) {
+    first.set(entry->first, entry->second);
+  }
+  return textForm(first) + " and " + std::to_string(record.size() - kShownEntries) + " more";
+}
+
+void showRecords(const DeviceDirectory& directory, bool inFull) {
+  showLines(directory.hostPath("outbox/records.jsonl"), [inFull](const PropertyDict& line) {
+    const PropertyValue* value = line.find("record");
+    const PropertyDict* record = value != nullptr ? value->dict() : nullptr;
+    std::cout << entryText(line, "time") << "  type " << entryText(line, "type") << "  "
+              << (record != nullptr ? recordText(*record, inFull) : "") << '\n';
+  });
+}
+
+void showNotifications(const DeviceDirectory& directory) {
+  showLines(directory.hostPath("outbox/notifications.jsonl"), [](const PropertyDict& line) {
+    std::cout << entryText(line, "time") << "  " << entryText(line, "name") << '\n';
+  });
+}
+
+void showSystemLog(const DeviceDirectory& directory) {
+  showLines(directory.hostPath("outbox/log.jsonl"), [](const PropertyDict& line) {
+    std::string message = entryText(line, "message");
+    message.erase(message.find_last_not_of('\n') + 1);  // some messages end their own line
+    std::cout << entryText(line, "time") << "  " << entryText(line, "level") << "  " << message
+              << '\n';
+  });
+}
+
+/// A text log: the lines, those with fields parted by semicolons as a line for each field.
+void showText(const std::string& content, bool inFull) {
+  constexpr std::size_t kShownFields = 24;
+  std::vector<std::string> fields;
+  std::istringstream lines(content);
+  for (std::string line; std::getline(lines, line);) {
+    std::istringstream parts(line);
+    const char* indentation = "  ";
+    for (std::string part; std::getline(parts, part, ';');) {
+      fields.push_back(std::exchange(indentation, "    ") + part);
+    }
+  }
+  const std::size_t shown = inFull ? fields.size() : std::min(fields.size(), kShownFields);
+  for (std::size_t i = 0; i < shown; ++i) {
+    std::cout << fields[i] << '\n';
+  }
+  if (shown < fields.size()) {
+    std::cout << "    … " << fields.size() - shown << " more; vespctl show DIR logs has all\n";
+  }
+}
+
+void showLog(const std::filesystem::path& file, bool inFull) {
+  std::cout << file.filename().string() << '\n';
+  std::string error;
+  const std::optional<std::string> content = readWholeFile(file, error);
+  if (!content) {
+    throw CommandFailure(error);
+  }
+  const std::filesystem::path header =
+      std::filesystem::path(file).replace_extension(".header.json");
+  std::string headerError;
+  if (const std::optional<std::string> text = readWholeFile(header, headerError)) {
+    const std::optional<PropertyValue> value = valueFromJsonText(*text, headerError);
+    std::cout << "  header     " << (value ? textForm(*value) : headerError) << '\n';
+  }
+  if (file.extension() != ".ptree") {
+    showText(*content, inFull);
+    return;
+  }
+  const std::optional<PropertyValue> log = readPtree(*content, error);
+  if (log && log->dict() != nullptr) {
+    showDailyLog(std::cout, *log->dict());
+  } else {
+    std::cout << "  cannot be read: " << (log ? "not a dictionary" : error) << '\n';
+  }
+}
+
+void showLogs(const DeviceDirectory& directory, bool inFull) {
+  const std::string folder = directory.hostPath("outbox/logs");
+  std::vector<std::filesystem::path> files;
+  std::error_code error;
+  for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
+       entry.increment(error)) {
+    const std::filesystem::path extension = entry->path().extension();
+    if (entry->path().filename().string().front() != '.' &&
+        (extension == ".ptree" || extension == ".log")) {
+      files.push_back(entry->path());
+    }
+  }
+  if (error && error != std::errc::no_such_file_or_directory) {
+    throw CommandFailure(folder + ": " + error.message());
+  }
+  std::sort(files.begin(), files.end());
+  for (const std::filesystem::path& file : files) {
+    showLog(file, inFull);
+  }
+}
+
+void showTitle(const char* title) { std::cout << "\n== " << title << '\n'; }
+
+void showAll(const DeviceDirectory& directory) {
+  showTitle("system log");
+  showSystemLog(directory);
+  showTitle("notifications");
+  showNotifications(directory);
+  showTitle("events");
+  showEvents(directory, false);
+  showTitle("structured records");
+  showRecords(directory, false);
+  showTitle("submitted logs");
+  showLogs(directory, false);
+}
+
+}  // namespace
+
+void addOutboxCommands(CLI::App& vespctl) {
+  const auto path = std::make_shared<std::string>();
+  CLI::App* show = vespctl.add_subcommand("show", "Shows what the runs left in the outbox");
+  show->add_option("DIR", *path, "The device directory")->required();
+  show->callback([show, path] {
+    if (show->get_subcommands().empty()) {
+      showAll(openDirectory(*path));
+    }
+  });
+  const auto addPart = [&](const char* name, const char* description, auto showPart) {
+    show->add_subcommand(name, description)->callback([path, showPart] {
+      showPart(openDirectory(*path));
+    });
+  };
+  addPart("logs", "The submitted logs alone, in full",
+          [](const DeviceDirectory& device) { showLogs(device, true); });
+  addPart("events", "The analytics events alone, with their payloads",
+          [](const DeviceDirectory& device) { showEvents(device, true); });
+  addPart("records", "The structured records alone, in full",
+          [](const DeviceDirectory& device) { showRecords(device, true); });
+  addPart("notifications", "The posted notifications alone", showNotifications);
+  addPart("log", "The system log alone", showSystemLog);
+  allowOneCommand(*show, false);
+}
+
+}  // namespace vesprun

@@ -1,0 +1,164 @@
+#include <algorithm>
+#include <iostream>
+#include <iterator>
+#include <nlohmann/json.hpp>
+#include <optional>
+
+#include "Command.h"
+#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/KernelSnapshot.h"
+#include "NANDInfo/parsers/ORUFTLParseBufferToCxt.h"
+#include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"
+#include "NANDInfo/parsers/ORUParseBufferToCxt.h"
+#include "NANDInfo/parsers/VendorCounterParsers.h"
+#include "common/LittleEndian.h"
+
+namespace vesprun {
+namespace {
+
+using Buffer = std::span<const std::uint8_t>;
+
+PropertyValue numbersOf(std::span<const std::uint64_t> numbers) {
+  return PropertyArray(numbers.begin(), numbers.end());
+}
+
+PropertyDict decoded(PropertyValue result, const GenericParserCxt& fields) {
+  PropertyArray pairs;
+  pairs.reserve(fields.size());
+  for (const GenericParserCxt::Field field : fields) {
+    pairs.emplace_back(PropertyArray{field.name, field.value});
+  }
+  return {
+      {"result", std::move(result)}, {"error", GetAPIErrorMessage()}, {"fields", std::move(pairs)}};
+}
+
+PropertyDict decodeBase(Buffer buffer) {
+  ORUStatsContext ctx;
+  const bool result = ORUParseBufferToCxt(ctx, buffer);
+  PropertyDict answer = decoded(result, ctx.fields);
+  answer.set("summary",
+             PropertyDict{{"exportVersion", ctx.exportVersion},
+                          {"driverVersion", ctx.driverVersion},
+                          {"numVirtualBlocks", ctx.numVirtualBlocks},
+                          {"blocksPerVirtualBlock", ctx.blocksPerVirtualBlock},
+                          {"pagesPerVirtualBlock", ctx.pagesPerVirtualBlock},
+                          {"bytesPerPage", ctx.bytesPerPage},
+                          {"hostReads", ctx.hostReads},
+                          {"hostWrites", ctx.hostWrites},
+                          {"numFreeVirtualBlocks", ctx.numFreeVirtualBlocks},
+                          {"wearLevMoves", ctx.wearLevMoves},
+                          {"nandReads", ctx.nandReads},
+                          {"nandWrites", ctx.nandWrites},
+                          {"bandErases", ctx.bandErases},
+                          {"IND_pool_free", ctx.IND_pool_free},
+                          {"IND_pool_count", ctx.IND_pool_count},
+                          {"utilFormatTime", ctx.utilFormatTime},
+                          {"numSleepOps", ctx.numSleepOps},
+                          {"maxHighEnduranceBlockErases", ctx.maxHighEnduranceBlockErases},
+                          {"readCountHisto", numbersOf(ctx.readCountHisto)}});
+  return answer;
+}
+
+template <auto parse>
+PropertyDict decodeGeneric(Buffer buffer) {
+  GenericParserCxt ctx;
+  const std::uint32_t result = parse(ctx, buffer);
+  return decoded(result, ctx);
+}
+
+template <auto parse>
+PropertyDict decodeCounters(Buffer buffer) {
+  NandChannelCounters counters{};
+  parse(buffer.first<kCounterRegionSize>(), counters);
+  return {{"words", PropertyArray(counters.begin(), counters.end())}};
+}
+
+struct Layout {
+  const char* name;
+  PropertyDict (*decode)(Buffer buffer);
+  std::size_t size = 0;  ///< bytes that the file must have; 0: any number but none
+};
+
+constexpr Layout kLayouts[] = {
+    {"base", decodeBase},
+    {"ftl", decodeGeneric<ORUFTLParseBufferToCxt>},
+    {"ftl-keys", decodeGeneric<ORUFTLParseStatKeyBufferToCxt>},
+    {"msp", decodeGeneric<ORUMSPParseBufferToCxt>},
+    {"counters-generic", decodeCounters<parseCountersAlgoGeneric>, kCounterRegionSize},
+    {"counters-kx4", decodeCounters<parseCountersAlgoGenericKX4>, kCounterRegionSize},
+    {"counters-1y", decodeCounters<parseCounters1y>, kCounterRegionSize},
+    {"counters-1x-sandisk", decodeCounters<parseCounters1xSandisk>, kCounterRegionSize},
+    {"counters-1x-hynix", decodeCounters<parseCounters1xHynix>, kCounterRegionSize},
+};
+
+constexpr const char* kSnapshot = "snapshot";
+
+const Layout* findLayout(const std::string& name) {
+  const auto* layout = std::find_if(std::begin(kLayouts), std::end(kLayouts),
+                                    [&name](const Layout& each) { return each.name == name; });
+  return layout != std::end(kLayouts) ? layout : nullptr;
+}
+
+/// The whole 64-bit words of the thread's statistics.
+void printSnapshot(Buffer snapshot, const std::string& thread) {
+  std::optional<Buffer> statistics;
+  nlohmann::ordered_json answer;
+  answer["found"] = getIOStatsWithThreadnameFromSnapData(snapshot, thread.c_str(), statistics);
+  answer["ioStatistics"] = nullptr;
+  if (statistics) {
+    answer["ioStatistics"] = nlohmann::ordered_json::array();
+    for (std::size_t at = 0; at + sizeof(std::uint64_t) <= statistics->size();
+         at += sizeof(std::uint64_t)) {
+      answer["ioStatistics"].push_back(loadLittleEndian<std::uint64_t>(statistics->data() + at));
+    }
+  }
+  std::cout << answer.dump() << '\n';
+}
+
+struct Arguments {
+  std::string layout;
+  std::string file;
+  std::optional<std::string> thread;
+};
+
+void decode(const Arguments& arguments) {
+  const bool isSnapshot = arguments.layout == kSnapshot;
+  const Layout* layout = findLayout(arguments.layout);
+  if (layout == nullptr && !isSnapshot) {
+    throw CLI::ValidationError("LAYOUT", "there is no layout " + arguments.layout);
+  }
+  if (isSnapshot != arguments.thread.has_value()) {
+    throw CLI::ValidationError("--thread", "goes with the layout snapshot, which needs it");
+  }
+  const std::string content = readInput(arguments.file);
+  if (content.empty()) {
+    throw CommandFailure(inputName(arguments.file) + ": is empty");
+  }
+  const Buffer buffer(reinterpret_cast<const std::uint8_t*>(content.data()), content.size());
+  if (isSnapshot) {
+    printSnapshot(buffer, *arguments.thread);
+    return;
+  }
+  if (layout->size != 0 && buffer.size() != layout->size) {
+    throw CommandFailure(inputName(arguments.file) + ": has " + std::to_string(buffer.size()) +
+                         " bytes, not " + std::to_string(layout->size));
+  }
+  printJson(layout->decode(buffer));
+}
+
+}  // namespace
+
+void addDecodeCommand(CLI::App& vespctl) {
+  const auto arguments = std::make_shared<Arguments>();
+  std::string layouts = kSnapshot;
+  for (const Layout& layout : kLayouts) {
+    layouts.append(", ").append(layout.name);
+  }
+  CLI::App* command = vespctl.add_subcommand("decode", "Decodes one saved buffer of the device");
+  command->add_option("LAYOUT", arguments->layout, "What the buffer is: " + layouts)->required();
+  command->add_option("FILE", arguments->file, "The buffer; - for standard input")->required();
+  command->add_option("--thread", arguments->thread, "The thread to look for in a snapshot");
+  command->callback([arguments] { decode(*arguments); });
+}
+
+}  // namespace vesprun
