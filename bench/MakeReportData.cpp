@@ -14,7 +14,7 @@
 #include <vector>
 
 #include "platform/host/HostPlatform.h"
-#include "platform/host/counters/SqliteTallybook.h"
+#include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/PtreeWriter.h"
 #include "platform/host/files/AtomicFile.h"
 

@@ -11,8 +11,8 @@
 #include "driver/ActiveAppInfoListener.h"
 #include "driver/DailyTasks.h"
 #include "platform/host/documents/PtreeWriter.h"
+#include "platform/host/messages/HostMainLoop.h"
 #include "platform/host/messages/MessageFraming.h"
-#include "platform/host/messages/PollMainLoop.h"
 #include "platform/host/messages/ServiceSocket.h"
 #include "support/WatchedRegistry.h"
 #include "telemetry/TodaysScalars.h"
@@ -83,7 +83,7 @@ class DailyDriverTest : public ::testing::Test {
   /// The listener mode while one peer sends these messages at once.
   static void runWithMessages(TestDevice& device, const std::vector<PropertyValue>& messages) {
     FileDescriptor peer;
-    auto& loop = dynamic_cast<PollMainLoop&>(device.platform().mainLoop());
+    auto& loop = dynamic_cast<HostMainLoop&>(device.platform().mainLoop());
     loop.queueWork([&] {
       std::string error;
       peer = connectToService(device.platform().directory(), kService, 5, error);

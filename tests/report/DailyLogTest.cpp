@@ -1,6 +1,6 @@
 #include "common/TextForm.h"
 #include "platform/host/counters/CounterStore.h"
-#include "platform/host/counters/SqliteTallybook.h"
+#include "platform/host/counters/HostTallybook.h"
 #include "report/TBReport.h"
 #include "support/TestDevice.h"
 

@@ -4,11 +4,11 @@
 #include <optional>
 #include <utility>
 
-#include "platform/host/counters/SqliteTallybook.h"
+#include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/WholeFile.h"
-#include "platform/host/messages/PollMainLoop.h"
-#include "platform/host/messages/UnixMessageService.h"
+#include "platform/host/messages/HostMainLoop.h"
+#include "platform/host/messages/HostMessageService.h"
 #include "platform/host/preferences/HostPreferences.h"
 #include "platform/host/preferences/HostServicesClient.h"
 #include "platform/host/preferences/HostSystemConfiguration.h"
@@ -68,7 +68,7 @@ struct HostPlatform::Services {
   HostSystemLog systemLog;
   Outbox outbox;
   Lazy<HostPreferences> preferences;
-  Lazy<SqliteTallybook> tallybook;
+  Lazy<HostTallybook> tallybook;
   Lazy<HostDeviceRegistry> describedRegistry;
   DeviceRegistry* interposedRegistry = nullptr;
   Lazy<HostDiagnosticHeader> diagnosticHeader;
@@ -88,8 +88,8 @@ struct HostPlatform::Services {
   Lazy<HostSupportLibrary> supportLibrary;
   Lazy<HostSystemConfiguration> systemConfiguration;
   Lazy<HostUserDefaults> userDefaults;
-  Lazy<PollMainLoop> mainLoop;
-  Lazy<UnixMessageService> messageService;
+  Lazy<HostMainLoop> mainLoop;
+  Lazy<HostMessageService> messageService;
   Lazy<HostTapline> tapline;
   Lazy<HostMurmur> murmur;  // last: until it has ended, a reply may use what stands above
 };
@@ -134,7 +134,7 @@ Clock& HostPlatform::clock() { return _services->clock; }
 
 SystemLog& HostPlatform::systemLog() { return _services->systemLog; }
 
-SqliteTallybook& HostPlatform::counters() {
+HostTallybook& HostPlatform::counters() {
   return _services->tallybook.get(directory(), clock(), preferences(), systemLog());
 }
 

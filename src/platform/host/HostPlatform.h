@@ -10,7 +10,7 @@
 namespace vesprun {
 
 class HostDeviceRegistry;
-class SqliteTallybook;
+class HostTallybook;
 
 /// The platform of one device directory on the running Linux system. What the services hold back is
 /// written when it is destroyed.
@@ -26,7 +26,7 @@ class HostPlatform : public Platform {
   const DeviceDirectory& directory() const;
   const DeviceDescription& description() const;
   /// The counter database with the operations that only tools need.
-  SqliteTallybook& counters();
+  HostTallybook& counters();
   /// The described registry, which knows which handles are out.
   HostDeviceRegistry& describedRegistry();
   /// From now on `deviceRegistry` is this one, which outlives the platform: it stands between the

@@ -10,7 +10,7 @@
 #include "Complaints.h"
 #include "common/Date.h"
 #include "platform/host/counters/CounterLines.h"
-#include "platform/host/counters/SqliteTallybook.h"
+#include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {
@@ -68,7 +68,7 @@ class DeviceCounters {
  private:
   std::unique_ptr<HostPlatform> _device;
   Complaints _complaints;
-  SqliteTallybook _counters;
+  HostTallybook _counters;
 };
 
 /// Runs `change` with a key that has been checked, on the day that was given or today.

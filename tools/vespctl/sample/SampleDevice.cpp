@@ -5,7 +5,7 @@
 
 #include "Command.h"
 #include "common/Date.h"
-#include "platform/host/counters/SqliteTallybook.h"
+#include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/PtreeWriter.h"
 #include "platform/host/files/AtomicFile.h"
 #include "sample/SampleCounters.h"
@@ -104,7 +104,7 @@ void recordDay(CounterStore& store, std::int32_t day, const DayReadings& reading
 
 /// The first readings are those of the day before yesterday, the second ones those of yesterday.
 void recordCounters(HostPlatform& device) {
-  SqliteTallybook& counters = device.counters();
+  HostTallybook& counters = device.counters();
   const std::int32_t yesterday = counters.TBDaysSince1970() - 1;
   const DayReadings earlier{readKernelCounters(), takeReadingBurst()};
   const DayReadings later{readKernelCounters(), takeReadingBurst()};

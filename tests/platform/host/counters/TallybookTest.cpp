@@ -5,7 +5,7 @@
 #include <thread>
 
 #include "platform/host/counters/CounterLines.h"
-#include "platform/host/counters/SqliteTallybook.h"
+#include "platform/host/counters/HostTallybook.h"
 #include "platform/host/preferences/HostPreferences.h"
 #include "platform/host/services/HostClock.h"
 #include "support/HostServiceTest.h"
@@ -26,7 +26,7 @@ constexpr std::chrono::milliseconds kShortWait{50};
 class TallybookTest : public HostServiceTest {
  protected:
   std::string dump(std::int32_t from = kToday - 10, std::int32_t to = kToday + 10) {
-    SqliteTallybook tallybook(device, clock, preferences, log);
+    HostTallybook tallybook(device, clock, preferences, log);
     std::string text;
     const auto append = [&text](std::string_view piece) {
       text += piece;
@@ -42,14 +42,14 @@ class TallybookTest : public HostServiceTest {
   }
 
   bool import(const std::string& text) {
-    SqliteTallybook tallybook(device, clock, preferences, log);
+    HostTallybook tallybook(device, clock, preferences, log);
     std::istringstream lines(text);
     return tallybook.write(
         [&](CounterStore& store) { return importCounterLines(lines, store, error); }, error);
   }
 
   void add(std::string_view key, std::int64_t value) {
-    SqliteTallybook(device, clock, preferences, log).TBClientAddValueForScalarKey(key, value);
+    HostTallybook(device, clock, preferences, log).TBClientAddValueForScalarKey(key, value);
   }
 
   std::int64_t corruptions() {
@@ -72,7 +72,7 @@ std::string scalar(std::int64_t value) {
 
 TEST_F(TallybookTest, collectsUntilTheCheckpointAndMakesNothingWithoutNeed) {
   {
-    SqliteTallybook tallybook(device, clock, preferences, log);
+    HostTallybook tallybook(device, clock, preferences, log);
     EXPECT_EQ(tallybook.TBDaysSince1970(), kToday);
     EXPECT_EQ(tallybook.dateForDaysSince1970(kToday), (Date{1709596800, 0}));
     tallybook.TBClientCheckpoint();
@@ -97,7 +97,7 @@ TEST_F(TallybookTest, deliversDaysInclusivelyByDayThenKeyBytes) {
       import("scalar\t3\tb\t1\nscalar\t1\tz\t2\nscalar\t2\t\xC3\xA9\t3\nscalar\t2\tZ\t4\n"
              "scalar\t2\ta\t5\nscalar\t4\ta\t6\nscalar\t-1\ta\t7\n"
              "sample\t3\td\t1\t0\nsample\t2\te\t2\t7\nsample\t2\te\t3\t-7\n"));
-  SqliteTallybook tallybook(device, clock, preferences, log);
+  HostTallybook tallybook(device, clock, preferences, log);
   const std::unique_ptr<TBHistory> history = tallybook.openHistory();
   std::vector<std::string> rows;
   const auto found = [&](std::string_view prefix, std::int32_t from, std::int32_t to,
@@ -176,7 +176,7 @@ TEST_F(TallybookTest, refusesKeysThatNoDocumentCarries) {
   const std::string longest(1024 * 1024, 'k');
   for (const std::string& key : {"a\xFF"s, "a\0b"s, longest + 'k'}) {
     add(key, 1);
-    SqliteTallybook(device, clock, preferences, log).TBClientSetValueForScalarKey(key, 1);
+    HostTallybook(device, clock, preferences, log).TBClientSetValueForScalarKey(key, 1);
     EXPECT_THAT(log.messages.back(), StartsWith("a counter is refused: the key \""));
   }
   EXPECT_THAT(log.messages, SizeIs(6));
@@ -187,7 +187,7 @@ TEST_F(TallybookTest, refusesKeysThatNoDocumentCarries) {
 
 TEST_F(TallybookTest, losesNoIncrementOfProcessesAndThreadsThatWriteAtOnce) {
   constexpr int kRounds = 20;
-  const auto work = [&](SqliteTallybook& tallybook) {
+  const auto work = [&](HostTallybook& tallybook) {
     for (int i = 0; i < kRounds; ++i) {
       tallybook.TBClientAddValueForScalarKey("k", 1);
       tallybook.TBClientCheckpoint();
@@ -195,13 +195,13 @@ TEST_F(TallybookTest, losesNoIncrementOfProcessesAndThreadsThatWriteAtOnce) {
   };
   const pid_t child = startProcess([&] {
     {
-      SqliteTallybook tallybook(device, clock, preferences, log);
+      HostTallybook tallybook(device, clock, preferences, log);
       work(tallybook);
     }
     EXPECT_THAT(log.messages, IsEmpty());
   });
   {
-    SqliteTallybook tallybook(device, clock, preferences, log);
+    HostTallybook tallybook(device, clock, preferences, log);
     std::thread other([&] { work(tallybook); });
     work(tallybook);
     other.join();
@@ -218,7 +218,7 @@ TEST_F(TallybookTest, keepsEveryCommittedCounterOfAKilledWriter) {
     int ends[2];
     ASSERT_EQ(pipe(ends), 0);
     const pid_t child = startProcess([&] {
-      SqliteTallybook tallybook(device, clock, preferences, log);
+      HostTallybook tallybook(device, clock, preferences, log);
       for (char done = 'x'; done != 0;) {
         tallybook.TBClientAddValueForScalarKey("first", 1);
         tallybook.TBClientAddValueForScalarKey("second", 1);
@@ -280,7 +280,7 @@ TEST_F(TallybookTest, movesDamagedFilesAsideAndGoesOn) {
     const std::int64_t before = corruptions();
     log.messages.clear();
     {
-      SqliteTallybook tallybook(device, clock, preferences, log);
+      HostTallybook tallybook(device, clock, preferences, log);
       const std::unique_ptr<TBHistory> history = tallybook.openHistory();
       const auto ignore = [](std::string_view, std::int32_t, std::int64_t, bool&) {};
       const auto readAll = [](std::string_view, std::int32_t,
@@ -349,9 +349,9 @@ TEST_F(TallybookTest, movesForeignFilesAsideWithTheirJournals) {
 
 TEST_F(TallybookTest, neverTakesALockForDamage) {
   add("k", 1);
-  SqliteTallybook tallybook(device, clock, preferences, log, kShortWait);
+  HostTallybook tallybook(device, clock, preferences, log, kShortWait);
   tallybook.TBClientAddValueForScalarKey("k", 1);
-  SqliteTallybook other(device, clock, preferences, log);
+  HostTallybook other(device, clock, preferences, log);
   EXPECT_FALSE(other.write(
       [&](CounterStore& store) {
         store.setScalar(kToday, "k", 99);
@@ -369,7 +369,7 @@ TEST_F(TallybookTest, neverTakesALockForDamage) {
 
 TEST_F(TallybookTest, neverTakesPermissionsOrAFullDiskForDamage) {
   add("k", 1);
-  const auto waits = [&](SqliteTallybook& tallybook) {
+  const auto waits = [&](HostTallybook& tallybook) {
     EXPECT_THAT(log.messages, IsEmpty());
     tallybook.TBClientAddValueForScalarKey("k", 1);
     tallybook.TBClientCheckpoint();
@@ -385,7 +385,7 @@ TEST_F(TallybookTest, neverTakesPermissionsOrAFullDiskForDamage) {
     chmod(folder.path(kFolder).c_str(), folderMode);
     EXPECT_TRUE(hasSucceeded(startProcess([&, isReadable = fileMode != 0] {
       EXPECT_TRUE(geteuid() != 0 || setuid(65534) == 0);  // root may write everywhere
-      SqliteTallybook tallybook(device, clock, preferences, log, kShortWait);
+      HostTallybook tallybook(device, clock, preferences, log, kShortWait);
       if (isReadable) {
         EXPECT_EQ(dump(), scalar(1));
       }
@@ -394,7 +394,7 @@ TEST_F(TallybookTest, neverTakesPermissionsOrAFullDiskForDamage) {
   }
   chmod(folder.path(kFile).c_str(), 0600);
   EXPECT_TRUE(hasSucceeded(startProcess([&] {
-    SqliteTallybook tallybook(device, clock, preferences, log);
+    HostTallybook tallybook(device, clock, preferences, log);
     {
       const FileSizeLimit limit(4096);
       waits(tallybook);

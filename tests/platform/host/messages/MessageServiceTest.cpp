@@ -3,9 +3,9 @@
 #include <chrono>
 #include <thread>
 
+#include "platform/host/messages/HostMessageService.h"
 #include "platform/host/messages/MessageFraming.h"
 #include "platform/host/messages/ServiceSocket.h"
-#include "platform/host/messages/UnixMessageService.h"
 #include "platform/host/services/HostPtreeSerialization.h"
 #include "support/HostServiceTest.h"
 
@@ -69,8 +69,8 @@ class MessageServiceTest : public HostServiceTest {
   }
 
   HostPtreeSerialization serialization;
-  PollMainLoop loop;
-  UnixMessageService service{device, serialization, log, loop};
+  HostMainLoop loop;
+  HostMessageService service{device, serialization, log, loop};
   std::vector<std::string> received;
 };
 

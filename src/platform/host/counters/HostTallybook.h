@@ -30,16 +30,16 @@ namespace vesprun {
 /// line says so, and the work goes on. Locks that last, permissions and full disks are no damage:
 /// an error line says what failed, and what was to be written stays collected. Several processes
 /// may use the database at once.
-class SqliteTallybook final : public Tallybook {
+class HostTallybook final : public Tallybook {
  public:
   /// What the references name must outlive the object. While other processes keep the database
   /// locked, an operation waits for `longestWait` at most.
-  SqliteTallybook(const DeviceDirectory& directory, Clock& clock, Preferences& preferences,
-                  SystemLog& log, std::chrono::milliseconds longestWait = kLongestLockWait);
+  HostTallybook(const DeviceDirectory& directory, Clock& clock, Preferences& preferences,
+                SystemLog& log, std::chrono::milliseconds longestWait = kLongestLockWait);
   /// Writes what is still collected; an error line says when that is lost.
-  ~SqliteTallybook() override;
-  SqliteTallybook(const SqliteTallybook&) = delete;
-  SqliteTallybook& operator=(const SqliteTallybook&) = delete;
+  ~HostTallybook() override;
+  HostTallybook(const HostTallybook&) = delete;
+  HostTallybook& operator=(const HostTallybook&) = delete;
 
   std::int32_t TBDaysSince1970() override;
   Date dateForDaysSince1970(std::int32_t day) override;

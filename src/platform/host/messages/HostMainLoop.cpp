@@ -1,4 +1,4 @@
-#include "platform/host/messages/PollMainLoop.h"
+#include "platform/host/messages/HostMainLoop.h"
 
 #include <poll.h>
 
@@ -26,13 +26,13 @@ timespec timespecOf(double seconds) {
 
 }  // namespace
 
-void PollMainLoop::watch(int descriptor, Work whenReady) {
+void HostMainLoop::watch(int descriptor, Work whenReady) {
   _watched.insert_or_assign(descriptor, std::move(whenReady));
 }
 
-void PollMainLoop::unwatch(int descriptor) { _watched.erase(descriptor); }
+void HostMainLoop::unwatch(int descriptor) { _watched.erase(descriptor); }
 
-MainLoop::SliceResult PollMainLoop::runMainLoopSlice(double seconds) {
+MainLoop::SliceResult HostMainLoop::runMainLoopSlice(double seconds) {
   const double length = seconds > 0 ? std::min(seconds, kLongestSlice) : 0;  // 0 for NaN as well
   const auto start = MonotonicClock::now();
   for (bool looked = false; !doQueuedWork(); looked = true) {
@@ -45,7 +45,7 @@ MainLoop::SliceResult PollMainLoop::runMainLoopSlice(double seconds) {
   return SliceResult::HandledEvent;
 }
 
-bool PollMainLoop::doQueuedWork() {
+bool HostMainLoop::doQueuedWork() {
   if (_queue.empty()) {
     return false;
   }
@@ -55,7 +55,7 @@ bool PollMainLoop::doQueuedWork() {
   return true;
 }
 
-void PollMainLoop::waitForReadiness(double seconds) {
+void HostMainLoop::waitForReadiness(double seconds) {
   std::vector<pollfd> descriptors;
   descriptors.reserve(_watched.size());
   for (const auto& [descriptor, whenReady] : _watched) {

@@ -4,7 +4,7 @@
 #include "platform/PtreeSerialization.h"
 #include "platform/SystemLog.h"
 #include "platform/host/device/DeviceDirectory.h"
-#include "platform/host/messages/PollMainLoop.h"
+#include "platform/host/messages/HostMainLoop.h"
 
 namespace vesprun {
 
@@ -20,10 +20,10 @@ namespace vesprun {
 ///
 /// All references must outlive the listeners, and a listener must not be destroyed by one of its
 /// own handlers.
-class UnixMessageService final : public MessageService {
+class HostMessageService final : public MessageService {
  public:
-  UnixMessageService(const DeviceDirectory& directory, PtreeSerialization& serialization,
-                     SystemLog& log, PollMainLoop& mainLoop)
+  HostMessageService(const DeviceDirectory& directory, PtreeSerialization& serialization,
+                     SystemLog& log, HostMainLoop& mainLoop)
       : _directory(directory), _serialization(serialization), _log(log), _mainLoop(mainLoop) {}
 
   /// A device has one service at a time: see `ServiceSocket`.
@@ -33,7 +33,7 @@ class UnixMessageService final : public MessageService {
   const DeviceDirectory& _directory;
   PtreeSerialization& _serialization;
   SystemLog& _log;
-  PollMainLoop& _mainLoop;
+  HostMainLoop& _mainLoop;
 };
 
 }  // namespace vesprun

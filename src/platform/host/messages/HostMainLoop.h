@@ -14,7 +14,7 @@ namespace vesprun {
 /// An event is one piece of queued work, such as the delivery of a message. Readiness alone is
 /// none: a peer that sends bytes which never become a message does not prolong a slice. Time is
 /// measured by the monotonic clock, and the thread sleeps while there is nothing to do.
-class PollMainLoop final : public MainLoop {
+class HostMainLoop final : public MainLoop {
  public:
   using Work = std::function<void()>;
 

@@ -1,4 +1,4 @@
-#include "platform/host/messages/UnixMessageService.h"
+#include "platform/host/messages/HostMessageService.h"
 
 #include <sys/socket.h>
 
@@ -50,7 +50,7 @@ class UnixPeer final : public PeerConnection {
 class UnixServiceListener final : public ServiceListener {
  public:
   UnixServiceListener(ServiceSocket socket, std::string name, PtreeSerialization& serialization,
-                      SystemLog& log, PollMainLoop& mainLoop)
+                      SystemLog& log, HostMainLoop& mainLoop)
       : _socket(std::move(socket)),
         _name(std::move(name)),
         _serialization(serialization),
@@ -75,7 +75,7 @@ class UnixServiceListener final : public ServiceListener {
   using PeerPointer = std::shared_ptr<UnixPeer>;
 
   /// Queues work that is dropped if the listener is gone by then.
-  void queueWork(PollMainLoop::Work work) {
+  void queueWork(HostMainLoop::Work work) {
     _mainLoop.queueWork([alive = std::weak_ptr<bool>(_alive), work = std::move(work)] {
       if (!alive.expired()) {
         work();
@@ -175,7 +175,7 @@ class UnixServiceListener final : public ServiceListener {
   std::string _name;
   PtreeSerialization& _serialization;
   SystemLog& _log;
-  PollMainLoop& _mainLoop;
+  HostMainLoop& _mainLoop;
   PeerHandler _handler;
   bool _started = false;
   std::map<int, PeerPointer> _peers;
@@ -185,7 +185,7 @@ class UnixServiceListener final : public ServiceListener {
 
 }  // namespace
 
-std::unique_ptr<ServiceListener> UnixMessageService::createListener(std::string_view name) {
+std::unique_ptr<ServiceListener> HostMessageService::createListener(std::string_view name) {
   std::string error;
   std::optional<ServiceSocket> socket = ServiceSocket::listen(_directory, name, error);
   if (!socket) {

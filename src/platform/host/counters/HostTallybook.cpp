@@ -1,4 +1,4 @@
-#include "platform/host/counters/SqliteTallybook.h"
+#include "platform/host/counters/HostTallybook.h"
 
 #include <optional>
 
@@ -6,9 +6,9 @@
 #include "platform/PreferenceNames.h"
 
 namespace vesprun {
-class SqliteTallybook::History final : public TBHistory {
+class HostTallybook::History final : public TBHistory {
  public:
-  explicit History(SqliteTallybook& tallybook) : _tallybook(tallybook) {}
+  explicit History(HostTallybook& tallybook) : _tallybook(tallybook) {}
 
   void scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
       std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
@@ -32,15 +32,15 @@ class SqliteTallybook::History final : public TBHistory {
     }
   }
 
-  SqliteTallybook& _tallybook;
+  HostTallybook& _tallybook;
 };
 
-SqliteTallybook::SqliteTallybook(const DeviceDirectory& directory, Clock& clock,
-                                 Preferences& preferences, SystemLog& log,
-                                 std::chrono::milliseconds longestWait)
+HostTallybook::HostTallybook(const DeviceDirectory& directory, Clock& clock,
+                             Preferences& preferences, SystemLog& log,
+                             std::chrono::milliseconds longestWait)
     : _clock(clock), _preferences(preferences), _log(log), _file(directory, clock, longestWait) {}
 
-SqliteTallybook::~SqliteTallybook() {
+HostTallybook::~HostTallybook() {
   std::string error;
   if (!flush(error)) {
     _log.write(LogLevel::Error,
@@ -48,26 +48,26 @@ SqliteTallybook::~SqliteTallybook() {
   }
 }
 
-std::int32_t SqliteTallybook::TBDaysSince1970() { return daysSince1970(_clock.now()); }
+std::int32_t HostTallybook::TBDaysSince1970() { return daysSince1970(_clock.now()); }
 
-Date SqliteTallybook::dateForDaysSince1970(std::int32_t day) { return startOfDay(day); }
+Date HostTallybook::dateForDaysSince1970(std::int32_t day) { return startOfDay(day); }
 
-void SqliteTallybook::TBClientCheckpoint() {
+void HostTallybook::TBClientCheckpoint() {
   std::string error;
   if (!flush(error)) {
     _log.write(LogLevel::Error, "counters wait for the next checkpoint: " + error);
   }
 }
 
-void SqliteTallybook::TBClientSetValueForScalarKey(std::string_view key, std::int64_t value) {
+void HostTallybook::TBClientSetValueForScalarKey(std::string_view key, std::int64_t value) {
   collect(key, {true, value});
 }
 
-void SqliteTallybook::TBClientAddValueForScalarKey(std::string_view key, std::int64_t value) {
+void HostTallybook::TBClientAddValueForScalarKey(std::string_view key, std::int64_t value) {
   collect(key, {false, value});
 }
 
-void SqliteTallybook::collect(std::string_view key, PendingScalar change) {
+void HostTallybook::collect(std::string_view key, PendingScalar change) {
   std::string error;
   if (!isCounterKey(key, error)) {
     _log.write(LogLevel::Error, "a counter is refused: " + error);
@@ -86,7 +86,7 @@ void SqliteTallybook::collect(std::string_view key, PendingScalar change) {
   }
 }
 
-bool SqliteTallybook::flush(std::string& error) {
+bool HostTallybook::flush(std::string& error) {
   const std::scoped_lock flushing(_flushMutex);
   PendingScalars changes;
   {
@@ -120,11 +120,9 @@ bool SqliteTallybook::flush(std::string& error) {
   return false;
 }
 
-std::unique_ptr<TBHistory> SqliteTallybook::openHistory() {
-  return std::make_unique<History>(*this);
-}
+std::unique_ptr<TBHistory> HostTallybook::openHistory() { return std::make_unique<History>(*this); }
 
-bool SqliteTallybook::write(const std::function<bool(CounterStore&)>& work, std::string& error) {
+bool HostTallybook::write(const std::function<bool(CounterStore&)>& work, std::string& error) {
   std::optional<CounterFile::Damage> damage;
   if (_file.write(work, error, damage)) {
     return true;
@@ -135,7 +133,7 @@ bool SqliteTallybook::write(const std::function<bool(CounterStore&)>& work, std:
   return _file.write(work, error, damage);
 }
 
-bool SqliteTallybook::read(const std::function<void(CounterStore&)>& work, std::string& error) {
+bool HostTallybook::read(const std::function<void(CounterStore&)>& work, std::string& error) {
   std::optional<CounterFile::Damage> damage;
   if (_file.read(work, error, damage)) {
     return true;
@@ -146,7 +144,7 @@ bool SqliteTallybook::read(const std::function<void(CounterStore&)>& work, std::
   return false;
 }
 
-bool SqliteTallybook::recover(const CounterFile::Damage& damage, std::string& error) {
+bool HostTallybook::recover(const CounterFile::Damage& damage, std::string& error) {
   std::string cause;
   const std::optional<std::string> aside = _file.replace(damage, cause);
   if (!aside) {
