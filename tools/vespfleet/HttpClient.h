@@ -1,0 +1,31 @@
+#pragma once
+
+#include <memory>
+#include <string>
+#include <string_view>
+
+namespace vesprun {
+
+/// Posts to one ClickHouse server. User and password come from `VESPFLEET_USER` and
+/// `VESPFLEET_PASSWORD`. A server that does not answer is given up after 10 seconds, one that falls
+/// silent after five minutes.
+class HttpClient {
+ public:
+  /// `address` is "http://HOST:PORT/DATABASE". Throws `std::invalid_argument` for another form, and
+  /// for one that holds a user or password.
+  explicit HttpClient(const std::string& address);
+  ~HttpClient();
+
+  /// Runs `query`, with `data` behind it when it inserts, and returns what the server answers.
+  /// Throws `StoreFailure` with the server's reason.
+  std::string post(const std::string& query, std::string_view data = {});
+
+ private:
+  struct Handle;
+
+  std::string _address;
+  std::string _url;
+  std::unique_ptr<Handle> _handle;
+};
+
+}  // namespace vesprun

@@ -1,0 +1,540 @@
+#include "SqliteStore.h"
+
+#include <sqlite3.h>
+#include <sys/stat.h>
+#include <zlib.h>
+
+#include <algorithm>
+#include <chrono>
+#include <filesystem>
+#include <span>
+#include <tuple>
+
+#include "Varint.h"
+#include "platform/host/files/AtomicFile.h"
+
+namespace vesprun {
+namespace {
+
+// `line` numbers are never used again: what chunks have of a replaced line must not come back.
+constexpr const char* kSchema = R"(
+  PRAGMA page_size = 16384;
+  PRAGMA application_id = 0x76666C74;
+  PRAGMA user_version = 1;
+  CREATE TABLE device(number INTEGER PRIMARY KEY, name TEXT NOT NULL UNIQUE) STRICT;
+  CREATE TABLE key(number INTEGER PRIMARY KEY, kind INTEGER NOT NULL, name TEXT NOT NULL,
+                   UNIQUE(name, kind)) STRICT;
+  CREATE TABLE label(number INTEGER PRIMARY KEY, name TEXT NOT NULL UNIQUE) STRICT;
+  CREATE TABLE line(number INTEGER PRIMARY KEY AUTOINCREMENT, day INTEGER NOT NULL,
+                    device INTEGER NOT NULL, revision INTEGER NOT NULL, seconds INTEGER NOT NULL,
+                    nanoseconds INTEGER NOT NULL, size INTEGER NOT NULL, text BLOB NOT NULL,
+                    UNIQUE(day, device)) STRICT;
+  CREATE TABLE chunk(number INTEGER PRIMARY KEY, last INTEGER NOT NULL, entries BLOB NOT NULL)
+    STRICT;
+  CREATE TABLE replaced(lines INTEGER NOT NULL) STRICT;
+  INSERT INTO replaced VALUES(0);)";
+constexpr std::int64_t kApplication = 0x76666C74;
+
+// One chunk is one page of the file.
+constexpr std::size_t kChunkSize = 12U * 1024;
+constexpr std::int64_t kChunksOfKey = std::int64_t{1} << 32;
+
+// What a load keeps in memory and writes in one transaction.
+constexpr std::size_t kBatchSize = 32U * 1024 * 1024;
+constexpr std::size_t kBatchTails = 20000;
+
+// One load waits for another, which commits batch by batch.
+constexpr std::chrono::minutes kLongestWait{5};
+
+constexpr int kLongestCell = 1024 * 1024 * 1024;
+
+std::string compressed(std::string_view text) {
+  std::string bytes(compressBound(text.size()), '\0');
+  uLongf size = bytes.size();
+  if (compress2(reinterpret_cast<Bytef*>(bytes.data()), &size,
+                reinterpret_cast<const Bytef*>(text.data()), text.size(), Z_BEST_SPEED) != Z_OK) {
+    throw std::bad_alloc();
+  }
+  bytes.resize(size);
+  return bytes;
+}
+
+std::string uncompressed(std::span<const std::uint8_t> bytes, std::int64_t size) {
+  std::string text(static_cast<std::size_t>(size), '\0');
+  uLongf length = text.size();
+  if (uncompress(reinterpret_cast<Bytef*>(text.data()), &length, bytes.data(), bytes.size()) !=
+          Z_OK ||
+      length != text.size()) {
+    throw std::out_of_range("a line that does not unpack");
+  }
+  return text;
+}
+
+std::span<const std::uint8_t> asBytes(std::string_view text) {
+  return {reinterpret_cast<const std::uint8_t*>(text.data()), text.size()};
+}
+
+std::string_view asText(std::span<const std::uint8_t> bytes) {
+  return {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
+}
+
+/// Makes the file unless it is there, complete or not at all.
+void makeStore(const std::string& path) {
+  std::error_code ignored;
+  if (std::filesystem::exists(std::filesystem::symlink_status(path, ignored))) {
+    return;
+  }
+  SqliteConnection empty(":memory:", kLongestWait);
+  empty.execute(kSchema);
+  sqlite3_int64 size = 0;
+  const std::unique_ptr<unsigned char, decltype(&sqlite3_free)> image(
+      sqlite3_serialize(empty.handle(), "main", &size, 0), sqlite3_free);
+  if (!image) {
+    throw std::bad_alloc();
+  }
+  const std::filesystem::path file(path);
+  const std::string folder = file.has_parent_path() ? file.parent_path().string() : ".";
+  std::string error;
+  auto added = AtomicFile::Added::Failed;
+  if (auto document = AtomicFile::create(folder, error)) {
+    document->append(asText({image.get(), static_cast<std::size_t>(size)}));
+    added = document->addNew(file.filename().string(), error);
+  }
+  if (added == AtomicFile::Added::Failed) {
+    throw StoreFailure(error);
+  }
+}
+
+/// Reads one value of a chunk; `Value` is what the entries stand for.
+template <typename Value>
+Value readValue(PackedReader& entries);
+
+template <>
+std::int64_t readValue(PackedReader& entries) {
+  return entries.signedInteger();
+}
+
+/// Labels by their numbers in `label`.
+struct PackedDistribution {
+  Statistics statistics;
+  bool hasHistogram = false;
+  std::vector<std::pair<std::int64_t, std::uint64_t>> counts;
+};
+
+template <>
+PackedDistribution readValue(PackedReader& entries) {
+  PackedDistribution value;
+  value.statistics.minimum = entries.real();
+  value.statistics.maximum = entries.real();
+  value.statistics.mean = entries.real();
+  value.statistics.deviations = entries.real();
+  value.statistics.count = static_cast<std::int64_t>(entries.varint());
+  std::uint64_t labels = entries.varint();
+  value.hasHistogram = labels != 0;
+  for (; labels > 1; --labels) {
+    const auto label = static_cast<std::int64_t>(entries.varint());
+    value.counts.emplace_back(label, entries.varint());
+  }
+  return value;
+}
+
+}  // namespace
+
+class SqliteStore::Statements {
+ public:
+  explicit Statements(const SqliteConnection& database)
+      : find(database,
+             "SELECT number, revision, seconds, nanoseconds, size, text FROM line"
+             " WHERE day = ? AND device = ?"),
+        remove(database, "DELETE FROM line WHERE number = ?"),
+        insert(database,
+               "INSERT INTO line(day, device, revision, seconds, nanoseconds, size, text)"
+               " VALUES(?, ?, ?, ?, ?, ?, ?)"),
+        lastChunk(database,
+                  "SELECT number, last, entries FROM chunk WHERE number >= ? AND number < ?"
+                  " ORDER BY number DESC LIMIT 1"),
+        writeChunk(database, "INSERT OR REPLACE INTO chunk(number, last, entries) VALUES(?, ?, ?)"),
+        countReplaced(database, "UPDATE replaced SET lines = lines + 1") {}
+
+  SqliteStatement find;
+  SqliteStatement remove;
+  SqliteStatement insert;
+  SqliteStatement lastChunk;
+  SqliteStatement writeChunk;
+  SqliteStatement countReplaced;
+};
+
+/// Turns what goes wrong in the file into one line.
+template <typename Task>
+auto SqliteStore::guarded(const Task& task) {
+  try {
+    return task();
+  } catch (const SqliteFailure& failure) {
+    throw StoreFailure(failure.text);
+  } catch (const std::out_of_range& damage) {
+    throw StoreFailure(_path + ": the store is damaged: " + damage.what());
+  }
+}
+
+SqliteStore::SqliteStore(const std::string& path, bool toBeLoaded) : _path(path) {
+  guarded([&] {
+    if (toBeLoaded) {
+      makeStore(path);
+    }
+    struct stat status {};
+    if (stat(path.c_str(), &status) == 0 && !S_ISREG(status.st_mode)) {
+      throw StoreFailure(path + ": no fleet store");
+    }
+    try {
+      _database = std::make_unique<SqliteConnection>(path, kLongestWait);
+      sqlite3_limit(_database->handle(), SQLITE_LIMIT_LENGTH, kLongestCell);
+      if (_database->queryInteger("PRAGMA application_id") != kApplication ||
+          _database->queryInteger("PRAGMA user_version") != 1) {
+        throw StoreFailure(path + ": no fleet store");
+      }
+    } catch (const SqliteFailure& failure) {
+      if (failure.isCorruption()) {
+        throw StoreFailure(path + ": no fleet store");
+      }
+      throw;
+    }
+    _database->execute("PRAGMA cache_size = -65536");
+    if (toBeLoaded) {
+      _statements = std::make_unique<Statements>(*_database);
+    }
+  });
+}
+
+SqliteStore::~SqliteStore() = default;
+
+std::int64_t SqliteStore::numberOf(const char* table, KeyKind kind, std::string_view text) {
+  const bool isKey = std::string_view(table) == "key";
+  std::string cached = table;
+  cached.append(kind == KeyKind::Scalar ? "\1" : "\2").append(text);
+  if (const auto known = _numbers.find(cached); known != _numbers.end()) {
+    return known->second;
+  }
+  const std::string where =
+      std::string(table) + (isKey ? " WHERE name = ? AND kind = ?" : " WHERE name = ?");
+  SqliteStatement find(*_database, ("SELECT number FROM " + where).c_str());
+  find.bind(1, text);
+  if (isKey) {
+    find.bind(2, static_cast<std::int64_t>(kind));
+  }
+  std::int64_t number = 0;
+  if (find.step()) {
+    number = find.integer(0);
+  } else {
+    SqliteStatement insert(*_database, (std::string("INSERT INTO ") + table +
+                                        (isKey ? "(name, kind) VALUES(?, ?)" : "(name) VALUES(?)"))
+                                           .c_str());
+    insert.bind(1, text);
+    if (isKey) {
+      insert.bind(2, static_cast<std::int64_t>(kind));
+    }
+    insert.run();
+    number = sqlite3_last_insert_rowid(_database->handle());
+  }
+  return _numbers.emplace(std::move(cached), number).first->second;
+}
+
+/// Removes the line that `line` takes the place of; false when that one holds on.
+bool SqliteStore::replacesEarlier(const ExportedLine& line, std::int64_t device) {
+  SqliteStatement& find = _statements->find;
+  find.bind(1, line.day).bind(2, device);
+  bool replaces = true;
+  std::optional<std::int64_t> earlier;
+  if (find.step()) {
+    earlier = find.integer(0);
+    const auto rank =
+        std::tuple(line.revision, line.created.seconds, std::int64_t{line.created.nanoseconds});
+    const auto rankOfEarlier = std::tuple(find.integer(1), find.integer(2), find.integer(3));
+    replaces = rank == rankOfEarlier ? line.text > uncompressed(find.bytes(5), find.integer(4))
+                                     : rank > rankOfEarlier;
+  }
+  find.reset();
+  if (replaces && earlier) {
+    _statements->remove.bind(1, *earlier).run();
+    _statements->countReplaced.run();
+  }
+  return replaces;
+}
+
+void SqliteStore::add(const ExportedLine& line) {
+  guarded([&] {
+    if (!_transaction) {
+      _transaction.emplace(*_database, SqliteTransaction::Kind::Writing);
+    }
+    const std::int64_t device = numberOf("device", KeyKind::Scalar, line.device);
+    if (replacesEarlier(line, device)) {
+      const std::string text = compressed(line.text);
+      _statements->insert.bind(1, line.day)
+          .bind(2, device)
+          .bind(3, line.revision)
+          .bind(4, line.created.seconds)
+          .bind(5, std::int64_t{line.created.nanoseconds})
+          .bind(6, static_cast<std::int64_t>(line.text.size()))
+          .bind(7, asBytes(text))
+          .run();
+      const std::int64_t number = sqlite3_last_insert_rowid(_database->handle());
+      std::string value;
+      for (const ReportedScalar& scalar : line.scalars) {
+        value.clear();
+        appendSigned(value, scalar.value);
+        append(numberOf("key", KeyKind::Scalar, scalar.key), number, value);
+      }
+      for (const ReportedDistribution& reported : line.distributions) {
+        const auto& [statistics, histogram] = reported.values;
+        value.clear();
+        for (const double real :
+             {statistics.minimum, statistics.maximum, statistics.mean, statistics.deviations}) {
+          appendDouble(value, real);
+        }
+        appendVarint(value, static_cast<std::uint64_t>(statistics.count));
+        appendVarint(value, histogram ? histogram->size() + 1 : 0);
+        if (histogram) {
+          for (const auto& [label, count] : *histogram) {
+            appendVarint(value,
+                         static_cast<std::uint64_t>(numberOf("label", KeyKind::Scalar, label)));
+            appendVarint(value, count);
+          }
+        }
+        append(numberOf("key", KeyKind::Distribution, reported.key), number, value);
+      }
+    }
+    _batchSize += line.text.size();
+    if (_batchSize >= kBatchSize || _tails.size() >= kBatchTails) {
+      commitBatch();
+    }
+  });
+}
+
+SqliteStore::Tail& SqliteStore::tailOf(std::int64_t key) {
+  const auto [found, isNew] = _tails.try_emplace(key);
+  Tail& tail = found->second;
+  if (isNew) {
+    SqliteStatement& last = _statements->lastChunk;
+    last.bind(1, key * kChunksOfKey).bind(2, (key + 1) * kChunksOfKey);
+    if (last.step()) {
+      tail = {last.integer(0), last.integer(1), std::string(asText(last.bytes(2)))};
+    } else {
+      tail.chunk = key * kChunksOfKey;
+    }
+    last.reset();
+  }
+  return tail;
+}
+
+void SqliteStore::append(std::int64_t key, std::int64_t line, std::string_view value) {
+  Tail& tail = tailOf(key);
+  if (tail.entries.size() >= kChunkSize) {
+    write(tail);
+    tail = {tail.chunk + 1, 0, {}};
+  }
+  appendVarint(tail.entries, static_cast<std::uint64_t>(line - tail.last));
+  tail.entries.append(value);
+  tail.last = line;
+}
+
+void SqliteStore::write(Tail& tail) {
+  _statements->writeChunk.bind(1, tail.chunk)
+      .bind(2, tail.last)
+      .bind(3, asBytes(tail.entries))
+      .run();
+}
+
+void SqliteStore::commitBatch() {
+  // In the order of the file.
+  std::vector<std::int64_t> keys;
+  keys.reserve(_tails.size());
+  for (const auto& [key, tail] : _tails) {
+    keys.push_back(key);
+  }
+  std::sort(keys.begin(), keys.end());
+  for (const std::int64_t key : keys) {
+    write(_tails.at(key));
+  }
+  _transaction->commit();
+  _transaction.reset();
+  _tails.clear();
+  _numbers.clear();  // another load may go on from here
+  _batchSize = 0;
+}
+
+void SqliteStore::finish() {
+  guarded([&] {
+    if (_transaction) {
+      commitBatch();
+    }
+    if (_database->queryInteger("SELECT lines > (SELECT count(*) FROM line) FROM replaced") != 0) {
+      writeAnew();
+    }
+  });
+}
+
+/// Leaves out of the chunks what replaced lines said.
+void SqliteStore::writeAnew() {
+  _transaction.emplace(*_database, SqliteTransaction::Kind::Writing);
+  const std::vector<Line> lines = linesThatHold({});
+  SqliteStatement remove(*_database, "DELETE FROM chunk WHERE number >= ? AND number < ?");
+  SqliteStatement keys(*_database, "SELECT number, kind FROM key");
+  const auto keep = [&]<typename Value>(std::int64_t key, Value* /*kind*/) {
+    std::vector<std::pair<std::int64_t, std::string>> kept;
+    visitEntries<Value>(key, lines,
+                        [&](const Line& line, const Value& /*value*/, std::string_view packed) {
+                          kept.emplace_back(line.number, packed);
+                        });
+    remove.bind(1, key * kChunksOfKey).bind(2, (key + 1) * kChunksOfKey).run();
+    for (const auto& [line, packed] : kept) {
+      append(key, line, packed);
+    }
+    if (const auto tail = _tails.find(key); tail != _tails.end()) {
+      write(tail->second);
+      _tails.erase(tail);
+    }
+  };
+  while (keys.step()) {
+    if (static_cast<KeyKind>(keys.integer(1)) == KeyKind::Scalar) {
+      keep(keys.integer(0), static_cast<std::int64_t*>(nullptr));
+    } else {
+      keep(keys.integer(0), static_cast<PackedDistribution*>(nullptr));
+    }
+  }
+  _database->execute("UPDATE replaced SET lines = 0");
+  commitBatch();
+}
+
+std::vector<SqliteStore::Line> SqliteStore::linesThatHold(const DayRange& days) {
+  SqliteStatement select(*_database,
+                         "SELECT number, day, device FROM line WHERE day BETWEEN ? AND ?");
+  select.bind(1, days.from).bind(2, days.to);
+  std::vector<Line> lines;
+  while (select.step()) {
+    lines.push_back(
+        {select.integer(0), static_cast<std::int32_t>(select.integer(1)), select.integer(2)});
+  }
+  std::sort(lines.begin(), lines.end(),
+            [](const Line& left, const Line& right) { return left.number < right.number; });
+  return lines;
+}
+
+std::optional<std::int64_t> SqliteStore::findKey(KeyKind kind, std::string_view key) {
+  SqliteStatement find(*_database, "SELECT number FROM key WHERE name = ? AND kind = ?");
+  find.bind(1, key).bind(2, static_cast<std::int64_t>(kind));
+  return find.step() ? std::optional(find.integer(0)) : std::nullopt;
+}
+
+/// Visits the entries of a key whose lines hold. Both ascend by the lines' numbers.
+template <typename Value, typename Visit>
+void SqliteStore::visitEntries(std::int64_t key, const std::vector<Line>& lines,
+                               const Visit& visit) {
+  SqliteStatement chunks(*_database,
+                         "SELECT entries FROM chunk WHERE number >= ? AND number < ?"
+                         " ORDER BY number");
+  chunks.bind(1, key * kChunksOfKey).bind(2, (key + 1) * kChunksOfKey);
+  auto line = lines.begin();
+  while (chunks.step()) {
+    PackedReader entries(asText(chunks.bytes(0)));
+    std::int64_t number = 0;
+    while (!entries.atEnd()) {
+      number += static_cast<std::int64_t>(entries.varint());
+      const char* const begin = entries.position();
+      const Value value = readValue<Value>(entries);
+      while (line != lines.end() && line->number < number) {
+        ++line;
+      }
+      if (line != lines.end() && line->number == number) {
+        visit(*line, value, std::string_view(begin, entries.position()));
+      }
+    }
+  }
+}
+
+void SqliteStore::visitKeys(const std::function<void(const ReportedKey&)>& visit) {
+  guarded([&] {
+    SqliteTransaction reading(*_database, SqliteTransaction::Kind::Reading);
+    const std::vector<Line> lines = linesThatHold({});
+    std::vector<std::int32_t> days;
+    std::int64_t devices = 0;
+    for (const Line& line : lines) {
+      days.push_back(line.day);
+      devices = std::max(devices, line.device);
+    }
+    std::sort(days.begin(), days.end());
+    days.erase(std::unique(days.begin(), days.end()), days.end());
+
+    SqliteStatement keys(*_database, "SELECT number, name, kind FROM key ORDER BY name, kind");
+    // The number of the last key that was met on a device, on a day.
+    std::vector<std::int64_t> keyOfDevice(static_cast<std::size_t>(devices) + 1, -1);
+    std::vector<std::int64_t> keyOfDay(days.size(), -1);
+    while (keys.step()) {
+      const std::int64_t key = keys.integer(0);
+      ReportedKey reported{std::string(keys.text(1)), static_cast<KeyKind>(keys.integer(2)), 0, 0};
+      const auto meet = [&](const Line& line, const auto& /*value*/, std::string_view /*packed*/) {
+        const auto day = std::lower_bound(days.begin(), days.end(), line.day) - days.begin();
+        std::int64_t& onDay = keyOfDay[static_cast<std::size_t>(day)];
+        std::int64_t& onDevice = keyOfDevice[static_cast<std::size_t>(line.device)];
+        reported.days += onDay != key ? 1 : 0;
+        reported.devices += onDevice != key ? 1 : 0;
+        onDay = onDevice = key;
+      };
+      if (reported.kind == KeyKind::Scalar) {
+        visitEntries<std::int64_t>(key, lines, meet);
+      } else {
+        visitEntries<PackedDistribution>(key, lines, meet);
+      }
+      if (reported.devices > 0) {
+        visit(reported);
+      }
+    }
+  });
+}
+
+void SqliteStore::visitScalars(std::string_view key, const DayRange& days,
+                               const std::function<void(std::int32_t, std::int64_t)>& visit) {
+  guarded([&] {
+    SqliteTransaction reading(*_database, SqliteTransaction::Kind::Reading);
+    if (const auto number = findKey(KeyKind::Scalar, key)) {
+      visitEntries<std::int64_t>(
+          *number, linesThatHold(days),
+          [&](const Line& line, std::int64_t value, std::string_view) { visit(line.day, value); });
+    }
+  });
+}
+
+void SqliteStore::visitDistributions(
+    std::string_view key, const DayRange& days,
+    const std::function<void(std::int32_t, const Distribution&)>& visit) {
+  guarded([&] {
+    SqliteTransaction reading(*_database, SqliteTransaction::Kind::Reading);
+    const auto number = findKey(KeyKind::Distribution, key);
+    if (!number) {
+      return;
+    }
+    std::unordered_map<std::int64_t, std::string> labels;
+    SqliteStatement label(*_database, "SELECT name FROM label WHERE number = ?");
+    visitEntries<PackedDistribution>(
+        *number, linesThatHold(days),
+        [&](const Line& line, const PackedDistribution& packed, std::string_view) {
+          Distribution distribution{packed.statistics, std::nullopt};
+          if (packed.hasHistogram) {
+            distribution.histogram.emplace();
+          }
+          for (const auto& [numberOfLabel, count] : packed.counts) {
+            const auto [name, isNew] = labels.try_emplace(numberOfLabel);
+            if (isNew) {
+              label.bind(1, numberOfLabel);
+              if (!label.step()) {
+                throw std::out_of_range("a label that is not there");
+              }
+              name->second = label.text(0);
+              label.reset();
+            }
+            (*distribution.histogram)[name->second] = count;
+          }
+          visit(line.day, distribution);
+        });
+  });
+}
+
+}  // namespace vesprun
