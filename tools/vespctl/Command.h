@@ -47,5 +47,6 @@ void addOutboxCommands(CLI::App& vespctl);
 void addPtreeCommands(CLI::App& vespctl);
 void addFieldsCommand(CLI::App& vespctl);
 void addDecodeCommand(CLI::App& vespctl);
+void addExportCommand(CLI::App& vespctl);
 
 }  // namespace vesprun

@@ -19,6 +19,7 @@ int main(int argc, char** argv) {
   vesprun::addPtreeCommands(vespctl);
   vesprun::addFieldsCommand(vespctl);
   vesprun::addDecodeCommand(vespctl);
+  vesprun::addExportCommand(vespctl);
   vesprun::allowOneCommand(vespctl);
   try {
     vespctl.parse(argc, argv);

@@ -1,0 +1,115 @@
+#include <sha2.h>
+
+#include <array>
+#include <cstdint>
+#include <cstdio>
+#include <iostream>
+#include <limits>
+
+#include "Command.h"
+#include "outbox/SubmittedLogs.h"
+#include "platform/DiagnosticHeader.h"
+#include "platform/host/documents/JsonForm.h"
+#include "platform/host/documents/XmlText.h"
+
+namespace vesprun {
+namespace {
+
+using Digest = std::array<std::uint8_t, SHA256_DIGEST_LENGTH>;
+
+Digest sha256(std::string_view bytes) {
+  SHA2_CTX context;
+  SHA256Init(&context);
+  SHA256Update(&context, reinterpret_cast<const std::uint8_t*>(bytes.data()), bytes.size());
+  Digest digest{};
+  SHA256Final(digest.data(), &context);
+  return digest;
+}
+
+std::string text(const Digest& digest) {
+  return {reinterpret_cast<const char*>(digest.data()), digest.size()};
+}
+
+/// HMAC-SHA-256 (RFC 2104).
+Digest authenticationCode(std::string_view key, std::string_view message) {
+  std::string block = key.size() > SHA256_BLOCK_LENGTH ? text(sha256(key)) : std::string(key);
+  block.resize(SHA256_BLOCK_LENGTH, '\0');
+  std::string inner = block;
+  for (std::size_t i = 0; i < block.size(); ++i) {
+    inner[i] = static_cast<char>(inner[i] ^ 0x36);
+    block[i] = static_cast<char>(block[i] ^ 0x5C);
+  }
+  return sha256(block + text(sha256(inner.append(message))));
+}
+
+/// A name for the device that stays the same and does not hold its identifier.
+std::string pseudonymOf(const std::string& systemIdentifier) {
+  constexpr std::size_t kBytes = 16;
+  const Digest code = authenticationCode(systemIdentifier, "vesprun exported device");
+  std::string name;
+  for (std::size_t i = 0; i < kBytes; ++i) {
+    constexpr char kDigits[] = "0123456789abcdef";
+    name += kDigits[code[i] >> 4];
+    name += kDigits[code[i] & 0xF];
+  }
+  return name;
+}
+
+struct Export {
+  std::string directory;
+  std::string device;
+  std::int32_t from = std::numeric_limits<std::int32_t>::min();
+  std::int32_t to = std::numeric_limits<std::int32_t>::max();
+};
+
+void run(const Export& wanted) {
+  const auto platform = openDevice(wanted.directory);
+  const std::string device =
+      !wanted.device.empty()
+          ? wanted.device
+          : pseudonymOf(platform->diagnosticHeader().GetSysIDWithDescription(false));
+  const SubmittedLogs submitted = readSubmittedLogs(platform->directory());
+  for (const SubmittedLog& log : submitted.logs) {
+    if (log.day < wanted.from || log.day > wanted.to) {
+      continue;
+    }
+    const auto entry = [&log](std::string_view key) { return *log.document.find(key); };
+    printJson(PropertyDict{{"version", 1},
+                           {"device", device},
+                           {"day", log.day},
+                           {"revision", log.revision},
+                           {"created", entry("TBLogCreationDate")},
+                           {"whitelist", entry("TBWhitelistDigest")},
+                           {"scalars", entry("TBScalars")},
+                           {"distributions", entry("TBDistributions")},
+                           {"histograms", entry("TBDistributionsHistogram")}});
+  }
+  for (std::size_t i = 0; i < submitted.unreadable.size(); ++i) {
+    const auto& [name, why] = submitted.unreadable[i];
+    if (i + 1 == submitted.unreadable.size()) {
+      throw CommandFailure(name + ": " + why);
+    }
+    std::fprintf(stderr, "vespctl: %s: %s\n", name.c_str(), why.c_str());
+  }
+}
+
+}  // namespace
+
+void addExportCommand(CLI::App& vespctl) {
+  const auto wanted = std::make_shared<Export>();
+  CLI::App* command =
+      vespctl.add_subcommand("export", "Prints each submitted daily log as one line for vespfleet");
+  command->add_option("DIR", wanted->directory, "The device directory")->required();
+  command->add_option("--device", wanted->device, "A name instead of the device's pseudonym")
+      ->check([](const std::string& name) -> std::string {
+        constexpr std::size_t kLongest = 255;
+        return !name.empty() && name.size() <= kLongest && isXmlText(name)
+                   ? ""
+                   : "a device's name has 1 to 255 bytes of text";
+      });
+  command->add_option("--from", wanted->from, "First day, in days since 1970");
+  command->add_option("--to", wanted->to, "Last day");
+  command->callback([wanted] { run(*wanted); });
+}
+
+}  // namespace vesprun
