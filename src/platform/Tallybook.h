@@ -34,7 +34,8 @@ class TBHistory {
 
   virtual ~TBHistory() = default;
 
-  virtual void scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+  /// False when the database could not be read to its end.
+  virtual bool scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
       std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
       const ScalarRowHandler& rowHandler) = 0;
 

@@ -67,7 +67,7 @@ PropertyDict TBReport::buildDocument(std::int32_t day, const AppInfoList* appInf
   document.set("TBTaskDigest", std::move(taskDigest));
   document.set("TBWhitelistDigest", whitelistDigest);
   if (appInfo != nullptr) {
-    document.set("TBActivatedAppInfo", *appInfo);
+    document.set("TBActivatedAppInfo", appInfo->array());
   }
   return document;
 }

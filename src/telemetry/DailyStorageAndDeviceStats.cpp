@@ -4,6 +4,7 @@
 
 #include "NANDInfo/lists/StructuredLog.h"
 #include "NANDInfo/sets/NANDInfo.h"
+#include "platform/Guarded.h"
 #include "platform/Platform.h"
 #include "telemetry/DataUsage.h"
 #include "telemetry/DiskUsage.h"
@@ -39,12 +40,12 @@ void logNANDInfo() {
 }  // namespace
 
 void LogDailyStorageAndDeviceStats() {
-  logDiskUsage();
-  DumpStorageStructuredLog(false);
-  logNANDInfo();
-  LogKernelECCEvents();
-  CollectDataUsage();
-  LogTaplineChannelScalars();
+  runGuarded(logDiskUsage);
+  runGuarded([] { DumpStorageStructuredLog(false); });
+  runGuarded(logNANDInfo);
+  runGuarded(LogKernelECCEvents);
+  runGuarded([] { CollectDataUsage(); });
+  runGuarded(LogTaplineChannelScalars);
 }
 
 }  // namespace vesprun

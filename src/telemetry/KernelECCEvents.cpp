@@ -41,13 +41,20 @@ void LogKernelECCEvents() {
   Kernel& kernel = platform().kernel();
   ECCEventRecord event{};
   std::size_t length = event.size();  // not reset between reads
-  const auto takeNext = [&] {
+  const auto readNext = [&] {
     return kernel.sysctlbyname(kNextEvent, std::span(event).first(length), length);
   };
-  int systemError = takeNext();
+  int systemError = readNext();
   for (int logged = 0; systemError == 0 && logged < kMostEventsOfARun; ++logged) {
-    platform().logsmith().FLLogStructuredData(kECCEventRecordType, describe(event));
-    systemError = takeNext();
+    // An event without a record is not acknowledged: it waits for the next run.
+    if (!platform().logsmith().FLLogStructuredData(kECCEventRecordType, describe(event)) ||
+        !kernel.acknowledgeECCEvent()) {
+      return;
+    }
+    systemError = readNext();
+  }
+  if (systemError == 0) {
+    kernel.acknowledgeECCEvent();  // the one beyond the limit
   }
   if (systemError != kNoSuchEntry && systemError != kBusy) {
     logMessage(LogLevel::Default, "Unexpected errno (%d) reading ECC events from kernel",

@@ -69,14 +69,15 @@ TEST_F(DailyLogTest, HoldsItsEntriesInOrder) {
   preferences->LGSPreferencesSetValue("TaskingDigest", Bytes{1}, kDomain);
   preferences->LGSPreferencesSetValue("TaskingPayload", PropertyArray{PropertyDict{{"a", 1}}},
                                       kDomain);
-  const AppInfoList apps{PropertyDict{{"bundle", "b"}}};
+  const PropertyValue data(PropertyArray{PropertyDict{{"bundle_id", "b"}}});
+  const AppInfoList apps(&data);
   write(&apps);
   const PropertyDict second = device->documents().back();
   EXPECT_EQ(textForm(*second.find("TBTaskID")), "id");
   EXPECT_EQ(textForm(*second.find("TBTaskDigest")), "<01>");
   EXPECT_EQ(textForm(*second.find("TBTasking")), "({a = 1})");
   EXPECT_EQ((second.end() - 1)->first, "TBActivatedAppInfo");
-  EXPECT_EQ((second.end() - 1)->second, PropertyValue(apps));
+  EXPECT_EQ((second.end() - 1)->second, PropertyValue(apps.array()));
 }
 
 TEST_F(DailyLogTest, NamesAPreviousOSVersionOnceThereIsALog) {
@@ -103,7 +104,8 @@ TEST_F(DailyLogTest, NamesAPreviousOSVersionOnceThereIsALog) {
 TEST_F(DailyLogTest, SurvivesARefusedSubmissionAndDocument) {
   start("true");
   count();
-  const AppInfoList unwritable{PropertyDict{{"bundle", "\x01"}}};
+  const PropertyValue data(PropertyArray{PropertyDict{{"bundle_id", "\x01"}}});
+  const AppInfoList unwritable(&data);
   write(&unwritable);
   EXPECT_THAT(device->log().back(),
               ::testing::StartsWith("error: Could not create aggregated ptree: "));

@@ -2,6 +2,7 @@
 
 #include "support/ControllerTest.h"
 #include "support/SnapshotBuilder.h"
+#include "support/WatchedRegistry.h"
 #include "telemetry/TodaysScalars.h"
 
 namespace vesprun {
@@ -58,6 +59,24 @@ TEST_F(DailyStorageAndDeviceStatsTest, GoesOnAfterEachFailure) {
             (Scalars{{kTotal, -1}, {kFree, -1}, {"com.quill.tapline.c", 3}}));
   EXPECT_THAT(device().log(),
               Contains(testing::StartsWith("default: error reading nand info, error ")));
+  EXPECT_EQ(device().lines("records.jsonl").size(), 1U);
+}
+
+TEST_F(DailyStorageAndDeviceStatsTest, MemoryThatRunsOutInOneStepStopsNoOther) {
+  struct Exhausted : WatchedRegistry {
+    using WatchedRegistry::WatchedRegistry;
+    RegistryHandle DevRegServiceGetMatchingService(const std::string& /*className*/) override {
+      ++asked;
+      throw std::bad_alloc();
+    }
+    int asked = 0;
+  };
+  start("", session("0A") + R"(, "channels": [{"name": "c", "value": 3}])");
+  device().write("kernel/ecc/1.bin", std::string(72, '\0'));
+  Exhausted registry(device().platform());
+  errorsOf(LogDailyStorageAndDeviceStats);
+  EXPECT_GE(registry.asked, 2) << "for the structured log and the NAND info";
+  EXPECT_THAT(todaysScalars(device()), Contains(Pair("com.quill.tapline.c", 3)));
   EXPECT_EQ(device().lines("records.jsonl").size(), 1U);
 }
 

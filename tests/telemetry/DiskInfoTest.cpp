@@ -22,6 +22,11 @@ TEST(DiskInfo, MeasuresTheVolumeOrAsksForDiskUsage) {
        1430511},
       {R"({"blockSize": 1000, "blocks": 65536000, "available": 32768000})", kNull, 31250, 5000, 128,
        62500},
+      // As full and as small as is still believed.
+      {R"({"blockSize": 4096, "blocks": 10000000, "available": 9999000})", kNull, 39058, 1, 64,
+       39062},
+      {R"({"blockSize": 1000, "blocks": 512000, "available": 0})", kNull, 0, 10000, 1, 488},
+      {R"({"blockSize": 1000, "blocks": 1023000, "available": 0})", kNull, 0, 10000, 1, 975},
       // Nearly empty, without a size and too small for a gigabyte: not believed.
       {R"({"blockSize": 4096, "blocks": 10000000, "available": 9999001})",
        R"({"TotalDiskCapacity": 137438953472})", 0, 10000, 256, 131072},
@@ -50,7 +55,7 @@ TEST(DiskInfo, MeasuresTheVolumeOrAsksForDiskUsage) {
         << c.volume << c.usage;
     for (const auto& [key, value] : info) {
       const NumberKind asked = key.ends_with("_GB") ? NumberKind::UInt32 : NumberKind::Int64;
-      EXPECT_EQ(value.number()->kind(), &c - cases < 3 ? NumberKind::UInt64 : asked) << key;
+      EXPECT_EQ(value.number()->kind(), &c - cases < 6 ? NumberKind::UInt64 : asked) << key;
     }
   }
 }

@@ -15,6 +15,7 @@
 #include "platform/host/preferences/HostUserDefaults.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
 #include "platform/host/services/HostClock.h"
+#include "platform/host/services/HostDailyWorkLock.h"
 #include "platform/host/services/HostDiagnosticHeader.h"
 #include "platform/host/services/HostEventHub.h"
 #include "platform/host/services/HostFileSystem.h"
@@ -67,6 +68,7 @@ struct HostPlatform::Services {
   HostClock clock;
   HostSystemLog systemLog;
   Outbox outbox;
+  Lazy<HostDailyWorkLock> dailyWorkLock;  // freed when what stands below has been written
   Lazy<HostPreferences> preferences;
   Lazy<HostTallybook> tallybook;
   Lazy<HostDeviceRegistry> describedRegistry;
@@ -151,6 +153,10 @@ void HostPlatform::interposeDeviceRegistry(DeviceRegistry* registry) {
 DeviceRegistry& HostPlatform::deviceRegistry() {
   return _services->interposedRegistry != nullptr ? *_services->interposedRegistry
                                                   : describedRegistry();
+}
+
+DailyWorkLock& HostPlatform::dailyWorkLock() {
+  return _services->dailyWorkLock.get(directory(), systemLog());
 }
 
 DiagnosticHeader& HostPlatform::diagnosticHeader() {

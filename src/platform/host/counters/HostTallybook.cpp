@@ -10,10 +10,11 @@ class HostTallybook::History final : public TBHistory {
  public:
   explicit History(HostTallybook& tallybook) : _tallybook(tallybook) {}
 
-  void scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+  bool scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
       std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
       const ScalarRowHandler& rowHandler) override {
-    read([&](CounterStore& store) { store.readScalars(keyPrefix, minDay, maxDay, rowHandler); });
+    return read(
+        [&](CounterStore& store) { store.readScalars(keyPrefix, minDay, maxDay, rowHandler); });
   }
 
   void distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
@@ -25,11 +26,13 @@ class HostTallybook::History final : public TBHistory {
   }
 
  private:
-  void read(const std::function<void(CounterStore&)>& work) {
+  bool read(const std::function<void(CounterStore&)>& work) {
     std::string error;
-    if (!_tallybook.read(work, error)) {
+    const bool done = _tallybook.read(work, error);
+    if (!done) {
       _tallybook._log.write(LogLevel::Error, "counters cannot be read: " + error);
     }
+    return done;
   }
 
   HostTallybook& _tallybook;

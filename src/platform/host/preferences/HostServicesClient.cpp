@@ -8,9 +8,8 @@ void HostServicesClient::setPreferenceForUserInDomainToValue(std::optional<std::
                                                              std::string_view user,
                                                              std::string_view domain,
                                                              std::optional<PropertyValue> value) {
-  // Written when it goes.
-  HostPreferences(_device, _clock, _log, user)
-      .LGSPreferencesSetValue(key, std::move(value), domain);
+  _users.try_emplace(std::string(user), _device, _clock, _log, user)
+      .first->second.LGSPreferencesSetValue(key, std::move(value), domain);
 }
 
 void HostServicesClient::deletePreferenceForUserInDomain(std::optional<std::string_view> key,

@@ -1,5 +1,9 @@
 #pragma once
 
+#include <functional>
+#include <map>
+#include <string>
+
 #include "platform/ServicesClient.h"
 #include "platform/host/preferences/HostPreferences.h"
 
@@ -17,11 +21,13 @@ class HostServicesClient final : public LGSServicesClient {
                                            std::optional<PropertyValue> value) override;
   void deletePreferenceForUserInDomain(std::optional<std::string_view> key, std::string_view user,
                                        std::string_view domain) override;
+  void synchronizeAllUsers() override { _users.clear(); }  // each writes when it goes
 
  private:
   const DeviceDirectory& _device;
   Clock& _clock;
   SystemLog& _log;
+  std::map<std::string, HostPreferences, std::less<>> _users;
 };
 
 }  // namespace vesprun
