@@ -10,8 +10,7 @@
 #include "NANDInfo/parsers/ORUFTLParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
-#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
-#include "support/SnapshotBuilder.h"
+#include "buffers/DeviceBuffers.h"
 
 namespace {
 
