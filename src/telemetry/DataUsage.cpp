@@ -93,15 +93,16 @@ std::optional<std::uint64_t> fingerprintSince(Tallybook& tallybook, std::int32_t
   std::uint64_t hash = 0xCBF29CE484222325;  // FNV-1a
   const auto take = [&hash](std::uint64_t value) { hash = (hash ^ value) * 0x100000001B3; };
   const bool done =
-      tallybook.openHistory()->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
-          "datausage.", day, std::numeric_limits<std::int32_t>::max(),
-          [&take](std::string_view key, std::int32_t rowDay, std::int64_t value, bool&) {
-            for (const char byte : key) {
-              take(static_cast<std::uint8_t>(byte));
-            }
-            take(static_cast<std::uint32_t>(rowDay));
-            take(static_cast<std::uint64_t>(value));
-          });
+      tallybook.initWithDefaultPath()
+          ->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+              "datausage.", day, std::numeric_limits<std::int32_t>::max(),
+              [&take](std::string_view key, std::int32_t rowDay, std::int64_t value, bool&) {
+                for (const char byte : key) {
+                  take(static_cast<std::uint8_t>(byte));
+                }
+                take(static_cast<std::uint32_t>(rowDay));
+                take(static_cast<std::uint64_t>(value));
+              });
   return done ? std::optional(hash) : std::nullopt;
 }
 
