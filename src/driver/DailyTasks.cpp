@@ -2,12 +2,12 @@
 
 #include <string_view>
 
+#include "driver/DailyStorageAndDeviceStats.h"
 #include "driver/TaskingSync.h"
 #include "platform/Guarded.h"
 #include "platform/Platform.h"
 #include "platform/PreferenceNames.h"
 #include "report/TBReport.h"
-#include "telemetry/DailyStorageAndDeviceStats.h"
 
 namespace vesprun {
 namespace {

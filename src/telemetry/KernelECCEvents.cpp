@@ -6,7 +6,7 @@
 #include <span>
 #include <string>
 
-#include "NANDInfo/parsers/DictionaryHelpers.h"
+#include "platform/DictionaryHelpers.h"
 #include "platform/Platform.h"
 
 namespace vesprun {

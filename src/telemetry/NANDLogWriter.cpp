@@ -9,12 +9,12 @@
 #include <utility>
 
 #include "NANDInfo/lists/StructuredLogState.h"
-#include "NANDInfo/parsers/DictionaryHelpers.h"
-#include "NANDInfo/sets/NANDInfo.h"
 #include "common/Date.h"
 #include "common/LittleEndian.h"
 #include "common/TextForm.h"
+#include "platform/DictionaryHelpers.h"
 #include "platform/Platform.h"
+#include "vesprun.h"
 
 namespace vesprun {
 namespace {

@@ -1,6 +1,7 @@
 #include "telemetry/DiskInfo.h"
 
 #include "telemetry/TodaysScalars.h"
+#include "telemetry/UserCapacity.h"
 
 namespace vesprun {
 namespace {
@@ -57,6 +58,18 @@ TEST(DiskInfo, MeasuresTheVolumeOrAsksForDiskUsage) {
       const NumberKind asked = key.ends_with("_GB") ? NumberKind::UInt32 : NumberKind::Int64;
       EXPECT_EQ(value.number()->kind(), &c - cases < 6 ? NumberKind::UInt64 : asked) << key;
     }
+  }
+}
+
+TEST(UserCapacity, IsThePowerOfTwoAboveButFor1536) {
+  const std::pair<std::uint64_t, std::uint32_t> cases[] = {
+      {500, 0},          {1000, 1},         {1024, 2},
+      {121'856, 128},    {1'376'255, 2048}, {1'376'256, 1536},
+      {1'770'495, 1536}, {1'770'496, 2048}, {0xFFFF'FFFF, 4'194'304},
+      {0x7'0000'0400, 2}};
+  EXPECT_EQ(GetUserCapacityInGB(0), 0U);
+  for (const auto& [megabytes, gigabytes] : cases) {
+    EXPECT_EQ(GetUserCapacityInGB(megabytes), gigabytes) << megabytes;
   }
 }
 

@@ -3,8 +3,8 @@
 #include <algorithm>
 #include <cstdio>
 
-#include "NANDInfo/parsers/DictionaryHelpers.h"
 #include "common/LittleEndian.h"
+#include "platform/DictionaryHelpers.h"
 #include "platform/Platform.h"
 
 namespace vesprun {

@@ -9,8 +9,8 @@
 #include <string>
 
 #include "NANDInfo/lists/HexText.h"
-#include "NANDInfo/parsers/DictionaryHelpers.h"
 #include "NANDInfo/parsers/VendorCounterParsers.h"
+#include "platform/DictionaryHelpers.h"
 #include "platform/Platform.h"
 
 namespace vesprun {

@@ -5,10 +5,10 @@
 #include <utility>
 
 #include "NANDInfo/parsers/APIErrorMessage.h"
-#include "NANDInfo/parsers/DictionaryHelpers.h"
 #include "NANDInfo/parsers/ORUStatsContext.h"
 #include "NANDInfo/sets/NANDInfo.h"
 #include "common/Date.h"
+#include "platform/DictionaryHelpers.h"
 #include "platform/Platform.h"
 
 namespace vesprun {

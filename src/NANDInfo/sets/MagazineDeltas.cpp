@@ -5,13 +5,13 @@
 #include <string_view>
 
 #include "NANDInfo/parsers/APIErrorMessage.h"
-#include "NANDInfo/parsers/DictionaryHelpers.h"
 #include "NANDInfo/sets/FieldNumber.h"
 #include "NANDInfo/sets/MagazineSnapshot.h"
 #include "NANDInfo/sets/NANDInfo.h"
 #include "NANDInfo/sets/StorageHealthFields.h"
 #include "NANDInfo/tables/MagazineFields.h"
 #include "common/Date.h"
+#include "platform/DictionaryHelpers.h"
 
 namespace vesprun {
 namespace {

@@ -2,7 +2,7 @@
 
 #include "FieldsOf.h"
 #include "NANDInfo/lists/HexText.h"
-#include "NANDInfo/parsers/DictionaryHelpers.h"
+#include "platform/DictionaryHelpers.h"
 #include "support/TestDevice.h"
 
 namespace vesprun {

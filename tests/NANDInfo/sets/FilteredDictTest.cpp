@@ -4,7 +4,6 @@
 #include <limits>
 
 #include "NANDInfo/sets/SignificantDigits.h"
-#include "NANDInfo/sets/UserCapacity.h"
 
 namespace vesprun {
 namespace {
@@ -72,18 +71,6 @@ TEST(FilteredDict, roundsNumbersOfEveryKindAndNothingElse) {
     if (const Number* number = filtered.find("a")->number()) {
       EXPECT_EQ(number->kind(), NumberKind::UInt64);
     }
-  }
-}
-
-TEST(UserCapacity, isThePowerOfTwoAboveButFor1536) {
-  const std::pair<std::uint64_t, std::uint32_t> cases[] = {
-      {500, 0},          {1000, 1},         {1024, 2},
-      {121'856, 128},    {1'376'255, 2048}, {1'376'256, 1536},
-      {1'770'495, 1536}, {1'770'496, 2048}, {0xFFFF'FFFF, 4'194'304},
-      {0x7'0000'0400, 2}};
-  EXPECT_EQ(GetUserCapacityInGB(0), 0U);
-  for (const auto& [megabytes, gigabytes] : cases) {
-    EXPECT_EQ(GetUserCapacityInGB(megabytes), gigabytes) << megabytes;
   }
 }
 

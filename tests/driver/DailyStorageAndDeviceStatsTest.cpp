@@ -1,4 +1,4 @@
-#include "telemetry/DailyStorageAndDeviceStats.h"
+#include "driver/DailyStorageAndDeviceStats.h"
 
 #include "buffers/DeviceBuffers.h"
 #include "support/ControllerTest.h"

@@ -1,4 +1,4 @@
-#include "NANDInfo/sets/UserCapacity.h"
+#include "telemetry/UserCapacity.h"
 
 #include <bit>
 

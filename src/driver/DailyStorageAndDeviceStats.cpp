@@ -1,15 +1,15 @@
-#include "telemetry/DailyStorageAndDeviceStats.h"
+#include "driver/DailyStorageAndDeviceStats.h"
 
 #include <optional>
 
 #include "NANDInfo/lists/StructuredLog.h"
 #include "NANDInfo/sets/NANDInfo.h"
+#include "driver/NANDInfoScalars.h"
 #include "platform/Guarded.h"
 #include "platform/Platform.h"
 #include "telemetry/DataUsage.h"
 #include "telemetry/DiskUsage.h"
 #include "telemetry/KernelECCEvents.h"
-#include "telemetry/NANDInfoScalars.h"
 #include "telemetry/ReportingChannels.h"
 #include "vesprun.h"
 

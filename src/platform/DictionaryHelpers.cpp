@@ -1,4 +1,4 @@
-#include "NANDInfo/parsers/DictionaryHelpers.h"
+#include "platform/DictionaryHelpers.h"
 
 #include <cstring>
 #include <optional>

@@ -1,4 +1,4 @@
-#include "telemetry/NANDInfoScalars.h"
+#include "driver/NANDInfoScalars.h"
 
 #include <string>
 #include <string_view>
