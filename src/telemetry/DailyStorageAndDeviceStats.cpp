@@ -2,6 +2,8 @@
 
 #include <optional>
 
+#include "NANDInfo/CopyNANDInfo.h"
+#include "NANDInfo/VMFreezer.h"
 #include "NANDInfo/lists/StructuredLog.h"
 #include "NANDInfo/sets/NANDInfo.h"
 #include "platform/Platform.h"
@@ -10,7 +12,6 @@
 #include "telemetry/KernelECCEvents.h"
 #include "telemetry/NANDInfoScalars.h"
 #include "telemetry/ReportingChannels.h"
-#include "vesprun.h"
 
 namespace vesprun {
 namespace {

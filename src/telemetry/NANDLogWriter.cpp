@@ -8,8 +8,8 @@
 #include <optional>
 #include <utility>
 
-#include "NANDInfo/lists/StructuredLogState.h"
-#include "NANDInfo/sets/NANDInfo.h"
+#include "NANDInfo/CopyNANDInfo.h"
+#include "NANDInfo/StructuredLogState.h"
 #include "common/Date.h"
 #include "common/LittleEndian.h"
 #include "common/TextForm.h"

@@ -2,6 +2,7 @@
 
 #include <string>
 
+#include "NANDInfo/controller/EntryPoint.h"
 #include "NANDInfo/events/MagazineEvents.h"
 #include "NANDInfo/events/StatisticsEvents.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
@@ -61,26 +62,28 @@ bool EventHubSendEventLazyWrapper(std::string_view event, const EventHub::Payloa
 std::optional<PropertyDict> NandInfoExtractToEH_runAllSteps(std::uint64_t /*context*/,
                                                             bool allowMonthly,
                                                             std::uint32_t collectResults,
-                                                            std::uint32_t firstStep) {
-  PropertyDict results;
-  for (std::uint32_t step = firstStep; step < kEH_Extraction_Step_Names.size(); ++step) {
-    if (step == kMonthlyStep && !allowMonthly) {
-      logMessage(LogLevel::Default, "Skipping Stats Mag Monthly Delta");
-      break;
+                                                            std::uint32_t firstStep) noexcept {
+  return runEntryPoint(__func__, [&]() -> std::optional<PropertyDict> {
+    PropertyDict results;
+    for (std::uint32_t step = firstStep; step < kEH_Extraction_Step_Names.size(); ++step) {
+      if (step == kMonthlyStep && !allowMonthly) {
+        logMessage(LogLevel::Default, "Skipping Stats Mag Monthly Delta");
+        break;
+      }
+      const std::optional<PropertyDict> result = runStep(step);
+      if (result && collectResults != 0) {
+        results.merge(*result);
+      }
+      if (step == kMonthlyStep) {
+        break;
+      }
     }
-    const std::optional<PropertyDict> result = runStep(step);
-    if (result && collectResults != 0) {
-      results.merge(*result);
+    if (collectResults == 0) {
+      return std::nullopt;
     }
-    if (step == kMonthlyStep) {
-      break;
-    }
-  }
-  if (collectResults == 0) {
-    return std::nullopt;
-  }
-  results.set(kNANDInfoErrorMessageKey, GetAPIErrorMessage());
-  return results;
+    results.set(kNANDInfoErrorMessageKey, GetAPIErrorMessage());
+    return results;
+  });
 }
 
 }  // namespace vesprun

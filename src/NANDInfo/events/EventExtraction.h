@@ -3,8 +3,8 @@
 #include <array>
 #include <string_view>
 
+#include "NANDInfo/EventExtraction.h"
 #include "platform/EventHub.h"
-#include "vesprun.h"
 
 namespace vesprun {
 

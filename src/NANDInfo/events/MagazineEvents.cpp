@@ -3,6 +3,7 @@
 #include <iterator>
 #include <string>
 
+#include "NANDInfo/Magazine.h"
 #include "NANDInfo/events/EventExtraction.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/sets/FieldNumber.h"
@@ -10,7 +11,6 @@
 #include "NANDInfo/sets/MagazineSnapshot.h"
 #include "NANDInfo/tables/EventFields.h"
 #include "platform/Platform.h"
-#include "vesprun.h"
 
 namespace vesprun {
 namespace {
@@ -19,14 +19,18 @@ constexpr const char* kOperation = "createAndLogSMagFTLFieldsToEventHubForEvent"
 
 struct MagazineView {
   const char* event;
+  const char* view;  ///< the event's name in the log line on its outcome
   std::uint64_t hours;
   bool withHistory;
 };
 
 constexpr MagazineView kMagazineViews[] = {
-    {"com.quill.massStorage.NANDInfo.SM.Daily.FTLCounters_1", 24, true},
-    {"com.quill.massStorage.NANDInfo.SM.WeeklyMA.FTLCounters_1", 168, false},
-    {"com.quill.massStorage.NANDInfo.SM.Monthly.FTLCounters_1", 720, false},
+    {"com.quill.massStorage.NANDInfo.SM.Daily.FTLCounters_1",
+     "massStorage_NANDInfo_SM_Daily_FTLCounters_1", 24, true},
+    {"com.quill.massStorage.NANDInfo.SM.WeeklyMA.FTLCounters_1",
+     "massStorage_NANDInfo_SM_WeeklyMA_FTLCounters_1", 168, false},
+    {"com.quill.massStorage.NANDInfo.SM.Monthly.FTLCounters_1",
+     "massStorage_NANDInfo_SM_Monthly_FTLCounters_1", 720, false},
 };
 
 }  // namespace
@@ -36,7 +40,7 @@ PropertyDict createAndLogSMagFTLFieldsToEventHubForEvent(std::uint32_t view) {
     logMessage(LogLevel::Default, "Unexpected SM delta type %d", static_cast<std::int32_t>(view));
     return {{std::string(kNANDInfoErrorMessageKey), "Wrong SM delta type"}};
   }
-  const auto& [event, hours, withHistory] = kMagazineViews[view];
+  const auto& [event, viewName, hours, withHistory] = kMagazineViews[view];
   const PropertyDict fields = CopySMagNANDFTLInfo(hours, 1, 2);
   if (fields.empty()) {
     return {{std::string(kNANDInfoErrorMessageKey), "Unable gather FTL fields to log to EH"}};
@@ -53,7 +57,7 @@ PropertyDict createAndLogSMagFTLFieldsToEventHubForEvent(std::uint32_t view) {
   }
   const bool sent = EventHubSendEventLazyWrapper(event, [&payload] { return payload; });
   logMessage(LogLevel::Default, "NANDInfo: %s: %s %s using EventHubSendEventLazy\n", kOperation,
-             sent ? "SUCCESS in logging" : "FAILED to log", event);
+             sent ? "SUCCESS in logging" : "FAILED to log", viewName);
   return sent ? payload : PropertyDict();
 }
 

@@ -3,12 +3,12 @@
 #include <cstdint>
 #include <string>
 
+#include "NANDInfo/WhitelistedFieldSets.h"
 #include "NANDInfo/events/EventExtraction.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/sets/FilteredDict.h"
 #include "NANDInfo/tables/EventFields.h"
 #include "platform/Platform.h"
-#include "vesprun.h"
 
 namespace vesprun {
 namespace {

@@ -4,7 +4,10 @@
 #include <string_view>
 #include <utility>
 
+#include "NANDInfo/CopyNANDInfo.h"
+#include "NANDInfo/controller/EntryPoint.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/DictionaryHelpers.h"
 #include "NANDInfo/parsers/ORUStatsContext.h"
 #include "NANDInfo/sets/NANDInfo.h"
 #include "common/Date.h"
@@ -61,60 +64,55 @@ PropertyDict getReclaimerInfo() {
   return info;
 }
 
-PropertyDict CopyNANDInfo() {
-  nand_exporter_t* exporter = nullptr;
-  ORUStatsContext context;
-  if (!GatherNANDStats(exporter, context)) {
-    return {{"com.quill.NANDInfo.Error", "1"},
-            {std::string(kNANDInfoErrorMessageKey), "Unable to parse buffer"}};
-  }
-  PropertyDict info = CreateNANDInfoDict(context, false);
-  const PropertyDict purgeable = getReclaimerInfo();
-  copyIfPresent(purgeable, "HLT_Reclaimer_totalPurgeable", info,
-                "com.quill.NANDInfo.Reclaimer.TotalPurgeableBytes");
-  copyIfPresent(purgeable, "HLT_Reclaimer_totalNonPurgeable", info,
-                "com.quill.NANDInfo.Reclaimer.TotalNonPurgeableBytes");
-  exporter->releaseStats(context);
-  return info;
-}
-
-std::optional<PropertyDict> CopyNANDInfoWithOptions(const PropertyDict& /*options*/) {
-  if (NandInfoShouldLogAllToEH()) {
-    return PropertyDict();
-  }
-  logMessage(LogLevel::Default, "NANDInfo: CopyNANDInfoWithOptions: obtaining FTL data for TLYD\n");
-  std::optional<PropertyDict> info = CopyNANDInfo();
-  if (info->empty()) {
-    SetAPIErrorMessage("CopyNANDInfoWithOptions: Unable to get FTL Fields for TLYD");
-    logMessage(LogLevel::Default,
-               "NANDInfo: CopyNANDInfoWithOptions: Unable to get FTL Fields for TLYD\n");
-    info.reset();
-  }
-  logMessage(LogLevel::Default, "NANDInfo: CopyNANDInfoWithOptions: returning TLYD dictionary\n");
-  return info;
-}
-
-void DumpNANDInfo(PropertyDict& info) {
-  nand_exporter_t* exporter = nullptr;
-  ORUStatsContext context;
-  if (GatherNANDStats(exporter, context)) {
-    info.merge(CreateNANDInfoDict(context, true));
+PropertyDict CopyNANDInfo() noexcept {
+  return runEntryPoint(__func__, [&]() -> PropertyDict {
+    nand_exporter_t* exporter = nullptr;
+    ORUStatsContext context;
+    if (!GatherNANDStats(exporter, context)) {
+      return {{"com.quill.NANDInfo.Error", "1"},
+              {std::string(kNANDInfoErrorMessageKey), "Unable to parse buffer"}};
+    }
+    PropertyDict info = CreateNANDInfoDict(context, false);
+    const PropertyDict purgeable = getReclaimerInfo();
+    copyIfPresent(purgeable, "HLT_Reclaimer_totalPurgeable", info,
+                  "com.quill.NANDInfo.Reclaimer.TotalPurgeableBytes");
+    copyIfPresent(purgeable, "HLT_Reclaimer_totalNonPurgeable", info,
+                  "com.quill.NANDInfo.Reclaimer.TotalNonPurgeableBytes");
     exporter->releaseStats(context);
-  }
+    return info;
+  });
 }
 
-std::optional<PropertyDict> CopyNANDFTLInfo(bool useStatKeyParser, std::uint32_t enabled) {
-  if (enabled == 0) {
-    return std::nullopt;
-  }
-  std::optional<PropertyDict> fields = gatherORUFTLData(useStatKeyParser, true, 0);
-  if (!fields || fields->empty()) {
-    SetAPIErrorMessage("CopyWhitelistedNANDFTLInfo: Unable to gather other stats magazine deltas");
-  }
-  if (fields) {
-    fields->set(kAPIErrorMessageKey, GetAPIErrorMessage());
-  }
-  return fields;
+std::optional<PropertyDict> CopyNANDInfoWithOptions(const PropertyDict& /*options*/) noexcept {
+  return runEntryPoint(__func__, [&]() -> std::optional<PropertyDict> {
+    if (NandInfoShouldLogAllToEH()) {
+      return PropertyDict();
+    }
+    logMessage(LogLevel::Default,
+               "NANDInfo: CopyNANDInfoWithOptions: obtaining FTL data for TLYD\n");
+    std::optional<PropertyDict> info = CopyNANDInfo();
+    if (info->empty()) {
+      SetAPIErrorMessage("CopyNANDInfoWithOptions: Unable to get FTL Fields for TLYD");
+      logMessage(LogLevel::Default,
+                 "NANDInfo: CopyNANDInfoWithOptions: Unable to get FTL Fields for TLYD\n");
+      info.reset();
+    }
+    logMessage(LogLevel::Default, "NANDInfo: CopyNANDInfoWithOptions: returning TLYD dictionary\n");
+    return info;
+  });
+}
+
+void DumpNANDInfo(PropertyDict& info) noexcept {
+  return runEntryPoint(__func__, [&] {
+    nand_exporter_t* exporter = nullptr;
+    ORUStatsContext context;
+    if (GatherNANDStats(exporter, context)) {
+      for (const auto& [key, value] : CreateNANDInfoDict(context, true)) {
+        CopyDictionary(key, value, info);
+      }
+      exporter->releaseStats(context);
+    }
+  });
 }
 
 }  // namespace vesprun

@@ -7,6 +7,7 @@
 #include <string>
 #include <string_view>
 
+#include "NANDInfo/controller/EntryPoint.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/sets/FieldNumber.h"
 #include "NANDInfo/sets/FilteredDict.h"
@@ -97,19 +98,26 @@ PropertyDict gatherNANDHealthInfo() {
           {kNumDieFailures, numberOrMinusOne(*ftl, "numDieFailures")}};
 }
 
-PropertyDict CopyTendmarkNANDInfo() {
-  PropertyDict set = CreateFilteredDict(gatherNANDHealthInfo(), &kTendmarkFields);
-  set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
-  return set;
+PropertyDict CopyTendmarkNANDInfo() noexcept {
+  return runEntryPoint(__func__, [&] {
+    PropertyDict set = CreateFilteredDict(gatherNANDHealthInfo(), &kTendmarkFields);
+    set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
+    return set;
+  });
 }
 
-PropertyDict CopyOTANANDInfo() { return CreateFilteredDict(gatherNANDHealthInfo(), &kOTAFields); }
+PropertyDict CopyOTANANDInfo() noexcept {
+  return runEntryPoint(__func__,
+                       [&] { return CreateFilteredDict(gatherNANDHealthInfo(), &kOTAFields); });
+}
 
-PropertyDict CopyInternalLabNANDInfo() {
-  PropertyDict set = CreateFilteredDict(gatherNANDHealthInfo(), &kInternalLabFields);
-  set.set(kIsNANDRetirable, std::int32_t{isRetirable(set)});
-  set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
-  return set;
+PropertyDict CopyInternalLabNANDInfo() noexcept {
+  return runEntryPoint(__func__, [&] {
+    PropertyDict set = CreateFilteredDict(gatherNANDHealthInfo(), &kInternalLabFields);
+    set.set(kIsNANDRetirable, std::int32_t{isRetirable(set)});
+    set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
+    return set;
+  });
 }
 
 }  // namespace vesprun

@@ -1,9 +1,10 @@
-#include "vesprun.h"
+#include "NANDInfo/Magazine.h"
 
 #include <optional>
 #include <string>
 #include <string_view>
 
+#include "NANDInfo/controller/EntryPoint.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/sets/FieldNumber.h"
 #include "NANDInfo/sets/MagazineSnapshot.h"
@@ -86,29 +87,31 @@ void addAverageCycles(PropertyDict& result) {
 }  // namespace
 
 PropertyDict CopySMagNANDFTLInfo(std::uint64_t hours, std::uint32_t deltaWanted,
-                                 std::uint32_t mode) {
-  PropertyDict result{{std::string(kIsStatMagSupportedKey), std::int32_t{0}}};
-  const std::optional<PropertyDict> newest = copyMagazineSnapshot(0);
-  const std::optional<PropertyDict> old = copyMagazineSnapshot(hours);
-  if (newest) {
-    const PropertyValue* isSupported = newest->find(kIsStatMagSupportedKey);
-    if (newest->contains(kMagazineMetaKey) && isSupported != nullptr) {
-      result.set(kIsStatMagSupportedKey, *isSupported);
+                                 std::uint32_t mode) noexcept {
+  return runEntryPoint(__func__, [&] {
+    PropertyDict result{{std::string(kIsStatMagSupportedKey), std::int32_t{0}}};
+    const std::optional<PropertyDict> newest = copyMagazineSnapshot(0);
+    const std::optional<PropertyDict> old = copyMagazineSnapshot(hours);
+    if (newest) {
+      const PropertyValue* isSupported = newest->find(kIsStatMagSupportedKey);
+      if (newest->contains(kMagazineMetaKey) && isSupported != nullptr) {
+        result.set(kIsStatMagSupportedKey, *isSupported);
+      }
+      if (old) {
+        addDeltas(*newest, *old, deltaWanted != 0, mode, result);
+      }
+    } else if (old) {
+      result.merge(*old);
     }
-    if (old) {
-      addDeltas(*newest, *old, deltaWanted != 0, mode, result);
+    const PropertyDict derived = gatherORUFTLOtherData(newest ? &*newest : nullptr);
+    if (derived.empty()) {
+      SetAPIErrorMessage("CopyWhitelistedNANDFTLInfo: Unable to gather HLT FTL fields");
     }
-  } else if (old) {
-    result.merge(*old);
-  }
-  const PropertyDict derived = gatherORUFTLOtherData(newest ? &*newest : nullptr);
-  if (derived.empty()) {
-    SetAPIErrorMessage("CopyWhitelistedNANDFTLInfo: Unable to gather HLT FTL fields");
-  }
-  result.merge(derived);
-  addAverageCycles(result);
-  result.set(kAPIErrorMessageKey, GetAPIErrorMessage());
-  return result;
+    result.merge(derived);
+    addAverageCycles(result);
+    result.set(kAPIErrorMessageKey, GetAPIErrorMessage());
+    return result;
+  });
 }
 
 }  // namespace vesprun

@@ -3,10 +3,11 @@
 #include <string>
 #include <string_view>
 
+#include "NANDInfo/Magazine.h"
+#include "NANDInfo/controller/EntryPoint.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/sets/FieldNumber.h"
 #include "NANDInfo/sets/MagazineSnapshot.h"
-#include "vesprun.h"
 
 namespace vesprun {
 namespace {
@@ -51,28 +52,30 @@ double writeAmplification(const PropertyDict& snapshot) {
 
 }  // namespace
 
-PropertyDict CopySMagNANDFTLCustomHistoryInfo(std::uint32_t skipHistory) {
-  std::optional<PropertyDict> newer = copyMagazineSnapshot(0);
-  const Number* isSupported = newer ? numberUnder(*newer, kIsStatMagSupportedKey) : nullptr;
-  if (isSupported != nullptr && isSupported->asInt32() == 0) {
-    return {{std::string(kNANDInfoErrorMessageKey), GetAPIErrorMessage()}};
-  }
-  PropertyDict history;
-  if (skipHistory != 0) {
-    return history;
-  }
-  std::uint64_t hours = 0;
-  for (const std::string_view name : kHLT_instantaneous_gc_wamp_array) {
-    hours += kHoursPerPeriod;
-    std::optional<PropertyDict> older = copyMagazineSnapshot(hours);
-    if (newer && older && collectedGarbage(*newer, *older)) {
-      history.set(name, writeAmplification(*older));
-    } else {
-      history.set(name, std::int32_t{0});
+PropertyDict CopySMagNANDFTLCustomHistoryInfo(std::uint32_t skipHistory) noexcept {
+  return runEntryPoint(__func__, [&]() -> PropertyDict {
+    std::optional<PropertyDict> newer = copyMagazineSnapshot(0);
+    const Number* isSupported = newer ? numberUnder(*newer, kIsStatMagSupportedKey) : nullptr;
+    if (isSupported != nullptr && isSupported->asInt32() == 0) {
+      return {{std::string(kNANDInfoErrorMessageKey), GetAPIErrorMessage()}};
     }
-    newer = std::move(older);
-  }
-  return history;
+    PropertyDict history;
+    if (skipHistory != 0) {
+      return history;
+    }
+    std::uint64_t hours = 0;
+    for (const std::string_view name : kHLT_instantaneous_gc_wamp_array) {
+      hours += kHoursPerPeriod;
+      std::optional<PropertyDict> older = copyMagazineSnapshot(hours);
+      if (newer && older && collectedGarbage(*newer, *older)) {
+        history.set(name, writeAmplification(*older));
+      } else {
+        history.set(name, std::int32_t{0});
+      }
+      newer = std::move(older);
+    }
+    return history;
+  });
 }
 
 }  // namespace vesprun

@@ -4,7 +4,7 @@
 #include <optional>
 
 #include "NANDInfo/controller/NandExporter.h"
-#include "vesprun.h"
+#include "common/PropertyDict.h"
 
 namespace vesprun {
 

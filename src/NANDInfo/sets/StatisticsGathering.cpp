@@ -21,11 +21,7 @@ namespace {
 /// What `findNandExporterNew` opened, given back at the end.
 class OpenExporter {
  public:
-  OpenExporter() {
-    if (!findNandExporterNew(_exporter)) {
-      _exporter = nullptr;
-    }
-  }
+  OpenExporter() = default;
   OpenExporter(const OpenExporter&) = delete;
   OpenExporter& operator=(const OpenExporter&) = delete;
   ~OpenExporter() {
@@ -34,7 +30,8 @@ class OpenExporter {
     }
   }
 
-  explicit operator bool() const { return _exporter != nullptr; }
+  /// False when there is no controller that opens.
+  bool open() { return findNandExporterNew(_exporter); }
   const nand_exporter_t* operator->() const { return _exporter; }
   const nand_exporter_t& operator*() const { return *_exporter; }
 
@@ -76,8 +73,8 @@ std::uint32_t countMSPs(const nand_exporter_t& exporter) {
 
 std::optional<PropertyDict> gatherORUFTLData(bool useStatKeyParser, bool useStatsSelector,
                                              std::uint32_t argument) {
-  const OpenExporter exporter;
-  if (!exporter) {
+  OpenExporter exporter;
+  if (!exporter.open()) {
     SetAPIErrorMessage("gatherORUFTLData: Could not get nand_exporter_t");
     return std::nullopt;
   }
@@ -121,8 +118,8 @@ std::optional<PropertyDict> gatherORUFTLData(bool useStatKeyParser, bool useStat
 }
 
 std::optional<PropertyDict> gatherORUMSPData() {
-  const OpenExporter exporter;
-  if (!exporter) {
+  OpenExporter exporter;
+  if (!exporter.open()) {
     SetAPIErrorMessage("gatherORUMSPData: Could not get nand_exporter_t");
     return std::nullopt;
   }

@@ -6,13 +6,13 @@
 #include <string>
 #include <string_view>
 
+#include "NANDInfo/VMFreezer.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/sets/FieldNumber.h"
 #include "NANDInfo/sets/NANDInfo.h"
 #include "NANDInfo/tables/FieldSets.h"
 #include "platform/Platform.h"
 #include "telemetry/DiskInfo.h"
-#include "vesprun.h"
 
 namespace vesprun {
 namespace {

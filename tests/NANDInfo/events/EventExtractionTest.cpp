@@ -122,11 +122,11 @@ NANDInfo: NandInfoExtractToEH_runStep: logging NVRAM stat
 NANDInfo: NandInfoExtractToEH_runStep: successfully logged NVRAM stat
 NANDInfo: NandInfoExtractToEH_runStep: logging FTL statsMag daily
 NANDInfo: createAndLogSMagFTLFieldsToEventHubForEvent: @SM.Daily.FTLCounters_1 enabled=0
-NANDInfo: createAndLogSMagFTLFieldsToEventHubForEvent: FAILED to log @SM.Daily.FTLCounters_1 using EventHubSendEventLazy
+NANDInfo: createAndLogSMagFTLFieldsToEventHubForEvent: FAILED to log massStorage_NANDInfo_SM_Daily_FTLCounters_1 using EventHubSendEventLazy
 NANDInfo: NandInfoExtractToEH_runStep: successfully logged FTL statsMag daily
 NANDInfo: NandInfoExtractToEH_runStep: logging FTL statsMag weekly
 NANDInfo: createAndLogSMagFTLFieldsToEventHubForEvent: @SM.WeeklyMA.FTLCounters_1 enabled=0
-NANDInfo: createAndLogSMagFTLFieldsToEventHubForEvent: SUCCESS in logging @SM.WeeklyMA.FTLCounters_1 using EventHubSendEventLazy
+NANDInfo: createAndLogSMagFTLFieldsToEventHubForEvent: SUCCESS in logging massStorage_NANDInfo_SM_WeeklyMA_FTLCounters_1 using EventHubSendEventLazy
 NANDInfo: NandInfoExtractToEH_runStep: successfully logged FTL statsMag weekly
 Skipping Stats Mag Monthly Delta)";
 

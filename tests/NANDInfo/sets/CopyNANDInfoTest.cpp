@@ -1,6 +1,7 @@
 #include "NANDInfo/controller/EANQueries.h"
 #include "NANDInfo/sets/NANDInfo.h"
 #include "support/ControllerTest.h"
+#include "vesprun.h"
 
 namespace vesprun {
 namespace {

@@ -1,5 +1,6 @@
 #include <algorithm>
 
+#include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/ORUStatsContext.h"
 #include "NANDInfo/parsers/StatisticsBufferBuilder.h"
 #include "NANDInfo/sets/NANDInfo.h"
