@@ -3,12 +3,14 @@
 #include <array>
 #include <cstddef>
 #include <cstdio>
+#include <memory>
+#include <new>
 #include <optional>
 #include <string>
 
 #include "NANDInfo/lists/HexText.h"
+#include "NANDInfo/parsers/DictionaryHelpers.h"
 #include "NANDInfo/parsers/VendorCounterParsers.h"
-#include "common/LittleEndian.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
@@ -165,13 +167,12 @@ PropertyDict busRecord(const std::uint8_t* busEntry, const NandChannelCounters& 
   PropertyDict record;
   record.reserve(kMostEntries);
   for (std::size_t i = 0; i < kBusEntryKeys.size(); ++i) {
-    const auto word = loadLittleEndian<std::uint32_t>(busEntry + i * kWordSize);
-    record.set(kBusEntryKeys[i], static_cast<std::int32_t>(word));
+    setNumberValueForType(record, kBusEntryKeys[i], busEntry + i * kWordSize, PVNumberType::Int);
   }
   for (const CounterField& field : layout.fields()) {
     for (std::size_t i = 0; i < field.count; ++i) {
-      record.set(field.name + ('[' + std::to_string(i) + ']'),
-                 static_cast<std::int32_t>(counters[field.firstWord + i]));
+      setNumberValueForType(record, field.name + ('[' + std::to_string(i) + ']'),
+                            &counters[field.firstWord + i], PVNumberType::Int);
     }
   }
   return record;
@@ -181,6 +182,11 @@ PropertyDict busRecord(const std::uint8_t* busEntry, const NandChannelCounters& 
 
 bool LogNANDTelemetryList(std::span<const std::uint8_t> buffer,
                           const PropertyValue* characteristics, std::string_view /*className*/) {
+  const std::unique_ptr<NandChannelCounters> counters(new (std::nothrow) NandChannelCounters);
+  if (!counters) {
+    std::fprintf(stderr, "ERROR: Could not malloc %zu bytes\n", sizeof *counters);
+    return false;
+  }
   const std::optional<Characteristics> read = readCharacteristics(characteristics);
   if (!read) {
     return false;
@@ -195,11 +201,11 @@ bool LogNANDTelemetryList(std::span<const std::uint8_t> buffer,
   }
   const std::uint8_t* busEntries = buffer.data() + busCount * kCounterRegionSize;
   for (std::size_t bus = 0; bus < busCount; ++bus) {
-    NandChannelCounters counters{};
+    counters->fill(0);
     const auto region = buffer.subspan(bus * kCounterRegionSize).first<kCounterRegionSize>();
-    read->layout.parse(region, counters);
+    read->layout.parse(region, *counters);
     platform().logsmith().FLLogStructuredData(
-        kRecordType, busRecord(busEntries + bus * kBusEntrySize, counters, read->layout));
+        kRecordType, busRecord(busEntries + bus * kBusEntrySize, *counters, read->layout));
   }
   return true;
 }

@@ -18,7 +18,8 @@ namespace vesprun {
 /// Names are compared as C strings, over the size of the name item or 64 bytes, whichever is less;
 /// so an item that is shorter than the name matches when it is the name's beginning. Of several
 /// name or statistics items in one container the last counts. An item that does not lie wholly
-/// within the snapshot ends it. Any nesting is followed, without recursion.
+/// within the snapshot ends it. Any nesting is followed, without
+/// recursion; the thread is not found when memory runs out for it.
 bool getIOStatsWithThreadnameFromSnapData(
     std::span<const std::uint8_t> snapshot, const char* threadName,
     std::optional<std::span<const std::uint8_t>>& ioStatistics);

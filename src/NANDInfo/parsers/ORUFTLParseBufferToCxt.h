@@ -18,9 +18,9 @@ namespace vesprun {
 ///
 /// A record without payload is only stepped over. The first header that is invalid (the id 0xFFFF,
 /// or one above 0x30000000, or more words than follow) quietly ends the walk, and so does, with an
-/// error, a record of an unknown id with more than 65,535 words, of which none is taken. What was
-/// taken before stays and counts; so 0 is all there is for failure. Errors are recorded as
-/// `SetAPIErrorMessage` does.
+/// error, a record of an unknown id with more than 65,535 words, of which none is taken, and one
+/// for whose array memory runs out. What was taken before stays and counts; so 0 is all there is
+/// for failure. Errors are recorded as `SetAPIErrorMessage` does.
 std::uint32_t ORUFTLParseBufferToCxt(GenericParserCxt& ctx, std::span<const std::uint8_t> buffer);
 
 /// The same walk, naming every record by its id as if all were unknown.

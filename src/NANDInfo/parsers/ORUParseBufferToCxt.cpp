@@ -10,9 +10,9 @@ namespace {
 
 constexpr std::uint32_t kReadCountHisto = 265;
 
-// Array headers without elements share the words behind them: a small buffer could make fields
-// without end. All keys there are make some 2,500.
-constexpr std::size_t kMostFields = 1'000'000;
+// A full record gives fewer fields than it has words. Arrays cut short share the words behind them,
+// so that a buffer of headers alone could give 256 fields for each word: 1,024 words may.
+constexpr std::size_t kMostSharedFields = 1024 * 256;
 
 void keepInSummary(ORUStatsContext& ctx, std::uint32_t id, std::uint64_t value) {
   const auto lowBits = static_cast<std::uint32_t>(value);
@@ -100,7 +100,8 @@ bool ORUParseBufferToCxt(ORUStatsContext& ctx, std::span<const std::uint8_t> buf
   if (reader.remaining() == 0) {
     return false;
   }
-  const std::size_t mostFields = ctx.fields.size() + kMostFields;
+  const std::size_t mostFields =
+      ctx.fields.size() + std::max(reader.remaining(), kMostSharedFields);
   do {
     const StatisticsRecordHeader header = reader.readHeader();
     if (!reader.holds(header) || ctx.fields.size() > mostFields) {

@@ -13,9 +13,10 @@ namespace vesprun {
 /// stepped over. Fields that `ctx` holds already stay.
 ///
 /// True when the records fill the buffer's words exactly. False for a buffer of less than one word,
-/// and at the first header that is invalid or claims more words than follow, or after a
-/// million fields when more follow: then `exportVersion` is 0, and what was decoded before stays in
-/// `ctx`.
+/// and at the first header that is invalid or claims more words than follow: then `exportVersion`
+/// is 0, and what was decoded before stays in `ctx`. So it is, too, when a buffer has given more
+/// fields than it has words, and more than 262,144, as overlapping records can. A field for which
+/// memory runs out is missing.
 ///
 /// How many values a statistic has is fixed; what a record holds beyond them is stepped over. A
 /// record that holds fewer takes the missing ones from the words behind it, which are also read as

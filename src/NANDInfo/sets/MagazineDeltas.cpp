@@ -6,6 +6,7 @@
 
 #include "NANDInfo/controller/EntryPoint.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/DictionaryHelpers.h"
 #include "NANDInfo/sets/FieldNumber.h"
 #include "NANDInfo/sets/MagazineSnapshot.h"
 #include "NANDInfo/sets/NANDInfo.h"
@@ -91,11 +92,11 @@ PropertyDict CopySMagNANDFTLInfo(std::uint64_t hours, std::uint32_t deltaWanted,
   return runEntryPoint(__func__, [&] {
     PropertyDict result{{std::string(kIsStatMagSupportedKey), std::int32_t{0}}};
     const std::optional<PropertyDict> newest = copyMagazineSnapshot(0);
-    const std::optional<PropertyDict> old = copyMagazineSnapshot(hours);
+    std::optional<PropertyDict> old = copyMagazineSnapshot(hours);
     if (newest) {
-      const PropertyValue* isSupported = newest->find(kIsStatMagSupportedKey);
-      if (newest->contains(kMagazineMetaKey) && isSupported != nullptr) {
-        result.set(kIsStatMagSupportedKey, *isSupported);
+      if (newest->contains(kMagazineMetaKey)) {
+        result.set(kIsStatMagSupportedKey,
+                   GetNumberFromDictionarySafe(*newest, kIsStatMagSupportedKey));
       }
       if (old) {
         addDeltas(*newest, *old, deltaWanted != 0, mode, result);
@@ -103,11 +104,7 @@ PropertyDict CopySMagNANDFTLInfo(std::uint64_t hours, std::uint32_t deltaWanted,
     } else if (old) {
       result.merge(*old);
     }
-    const PropertyDict derived = gatherORUFTLOtherData(newest ? &*newest : nullptr);
-    if (derived.empty()) {
-      SetAPIErrorMessage("CopyWhitelistedNANDFTLInfo: Unable to gather HLT FTL fields");
-    }
-    result.merge(derived);
+    result.merge(gatherORUFTLOtherData(newest ? &*newest : nullptr));
     addAverageCycles(result);
     result.set(kAPIErrorMessageKey, GetAPIErrorMessage());
     return result;

@@ -76,7 +76,7 @@ PropertyDict decodeCounters(Buffer buffer) {
 struct Layout {
   const char* name;
   PropertyDict (*decode)(Buffer buffer);
-  std::size_t size = 0;  ///< bytes that the file must have; 0: any number but none
+  std::size_t size = 0;  ///< bytes that the file must have; 0: any number
 };
 
 constexpr Layout kLayouts[] = {
@@ -131,9 +131,6 @@ void decode(const Arguments& arguments) {
     throw CLI::ValidationError("--thread", "goes with the layout snapshot, which needs it");
   }
   const std::string content = readInput(arguments.file);
-  if (content.empty()) {
-    throw CommandFailure(inputName(arguments.file) + ": is empty");
-  }
   const Buffer buffer(reinterpret_cast<const std::uint8_t*>(content.data()), content.size());
   if (isSnapshot) {
     printSnapshot(buffer, *arguments.thread);
