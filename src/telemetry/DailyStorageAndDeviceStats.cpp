@@ -5,7 +5,6 @@
 #include "NANDInfo/CopyNANDInfo.h"
 #include "NANDInfo/VMFreezer.h"
 #include "NANDInfo/lists/StructuredLog.h"
-#include "NANDInfo/sets/NANDInfo.h"
 #include "platform/Platform.h"
 #include "telemetry/DataUsage.h"
 #include "telemetry/DiskUsage.h"

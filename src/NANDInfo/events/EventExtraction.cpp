@@ -1,17 +1,23 @@
-#include "NANDInfo/events/EventExtraction.h"
+#include "NANDInfo/EventExtraction.h"
 
+#include <array>
 #include <string>
+#include <utility>
 
 #include "NANDInfo/controller/EntryPoint.h"
-#include "NANDInfo/events/MagazineEvents.h"
-#include "NANDInfo/events/StatisticsEvents.h"
+#include "NANDInfo/events/StorageEvents.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
-#include "platform/Platform.h"
 #include "telemetry/NVRAMStatistics.h"
 
 namespace vesprun {
 namespace {
 
+/// What each step sends. The last one only has a name.
+constexpr std::array kEH_Extraction_Step_Names{
+    "FTL big view",       "MSP stats",           "storage stats",        "NVRAM stat",
+    "FTL statsMag daily", "FTL statsMag weekly", "FTL statsMag monthly", "FTL counters"};
+
+constexpr std::uint32_t kDailyStep = 4;
 constexpr std::uint32_t kMonthlyStep = 6;
 
 /// Nothing for a step that is only a name.
@@ -25,10 +31,10 @@ std::optional<PropertyDict> resultOfStep(std::uint32_t step) {
       return createAndLogStorageStatsToEventHubForEvent();
     case 3:
       return gatherNVRAMStats();
-    case 4:
-    case 5:
+    case kDailyStep:
+    case kDailyStep + 1:
     case kMonthlyStep:
-      return createAndLogSMagFTLFieldsToEventHubForEvent(step - 4);
+      return createAndLogSMagFTLFieldsToEventHubForEvent(step - kDailyStep);
     default:
       return std::nullopt;
   }
@@ -39,25 +45,18 @@ std::optional<PropertyDict> runStep(std::uint32_t step) {
     return PropertyDict{
         {std::string(kNANDInfoErrorMessageKey), "Unable call EH API EventHubSendEventLazy"}};
   }
-  const char* name = kEH_Extraction_Step_Names[step].data();
+  const char* name = kEH_Extraction_Step_Names[step];
   logMessage(LogLevel::Default, "NANDInfo: NandInfoExtractToEH_runStep: logging %s\n", name);
   std::optional<PropertyDict> result = resultOfStep(step);
-  if (result) {
-    logMessage(LogLevel::Default, "NANDInfo: NandInfoExtractToEH_runStep: successfully logged %s\n",
-               name);
-  } else {
+  if (!result) {
     SetAPIErrorMessage("%s: unable to log %s to EH", "NANDInfo", name);
-    logMessage(LogLevel::Default, "NANDInfo: NandInfoExtractToEH_runStep: unable to log %s\n",
-               name);
   }
+  logMessage(LogLevel::Default, "NANDInfo: NandInfoExtractToEH_runStep: %s %s\n",
+             result ? "successfully logged" : "unable to log", name);
   return result;
 }
 
 }  // namespace
-
-bool EventHubSendEventLazyWrapper(std::string_view event, const EventHub::PayloadBuilder& build) {
-  return platform().eventHub().EventHubSendEventLazy(event, build);
-}
 
 std::optional<PropertyDict> NandInfoExtractToEH_runAllSteps(std::uint64_t /*context*/,
                                                             bool allowMonthly,
@@ -70,9 +69,8 @@ std::optional<PropertyDict> NandInfoExtractToEH_runAllSteps(std::uint64_t /*cont
         logMessage(LogLevel::Default, "Skipping Stats Mag Monthly Delta");
         break;
       }
-      const std::optional<PropertyDict> result = runStep(step);
-      if (result && collectResults != 0) {
-        results.merge(*result);
+      if (std::optional<PropertyDict> result = runStep(step)) {
+        results.merge(*std::move(result));
       }
       if (step == kMonthlyStep) {
         break;

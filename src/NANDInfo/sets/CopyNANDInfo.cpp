@@ -1,17 +1,15 @@
-// The entry points that offer the NAND info, and what they are made from besides the statistics.
+#include "NANDInfo/sets/CopyNANDInfo.h"
 
 #include <array>
-#include <string_view>
 #include <utility>
 
-#include "NANDInfo/CopyNANDInfo.h"
 #include "NANDInfo/controller/EntryPoint.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/DictionaryHelpers.h"
-#include "NANDInfo/parsers/ORUStatsContext.h"
-#include "NANDInfo/sets/NANDInfo.h"
+#include "NANDInfo/sets/NANDInfoDict.h"
+#include "NANDInfo/sets/StatisticsGathering.h"
+#include "NANDInfo/sets/StorageHealthFields.h"
 #include "common/Date.h"
-#include "platform/Platform.h"
 
 namespace vesprun {
 namespace {
@@ -25,13 +23,6 @@ std::uint8_t parityOf(std::uint8_t character) {
   return character >= 'A' && character <= 'F' ? (character + 1) & 1 : 0;
 }
 
-void copyIfPresent(const PropertyDict& from, std::string_view key, PropertyDict& to,
-                   std::string_view newKey) {
-  if (const PropertyValue* value = from.find(key)) {
-    to.set(newKey, *value);
-  }
-}
-
 }  // namespace
 
 bool NandInfoShouldLogAllToEH() {
@@ -41,27 +32,6 @@ bool NandInfoShouldLogAllToEH() {
     return false;
   }
   return (daysSince1970(platform().clock().now()) & 1) == parityOf(session[0]);
-}
-
-PropertyDict getReclaimerInfo() {
-  PropertyDict info;
-  Reclaimer& reclaimer = platform().reclaimer();
-  if (!reclaimer.isAvailable()) {
-    return info;
-  }
-  const std::optional<PropertyDict> answer =
-      reclaimer.ReclaimerCopyItemizedPurgeableSpaceWithInfo({{"RECLAIMER_VOLUME", "/private/var"}});
-  if (!answer) {
-    SetAPIErrorMessage(
-        "getReclaimerInfo: unable to get output from ReclaimerCopyItemizedPurgeableSpaceWithInfo");
-    return info;
-  }
-  if (!answer->contains("com.quill.NANDInfo.Reclaimer.Error")) {
-    copyIfPresent(*answer, "RECLAIMER_TOTAL_AVAILABLE", info, "HLT_Reclaimer_totalPurgeable");
-    copyIfPresent(*answer, "RECLAIMER_NONPURGEABLE_AMOUNT", info,
-                  "HLT_Reclaimer_totalNonPurgeable");
-  }
-  return info;
 }
 
 PropertyDict CopyNANDInfo() noexcept {
@@ -74,10 +44,10 @@ PropertyDict CopyNANDInfo() noexcept {
     }
     PropertyDict info = CreateNANDInfoDict(context, false);
     const PropertyDict purgeable = getReclaimerInfo();
-    copyIfPresent(purgeable, "HLT_Reclaimer_totalPurgeable", info,
-                  "com.quill.NANDInfo.Reclaimer.TotalPurgeableBytes");
-    copyIfPresent(purgeable, "HLT_Reclaimer_totalNonPurgeable", info,
-                  "com.quill.NANDInfo.Reclaimer.TotalNonPurgeableBytes");
+    copyField(purgeable, "HLT_Reclaimer_totalPurgeable", info,
+              "com.quill.NANDInfo.Reclaimer.TotalPurgeableBytes");
+    copyField(purgeable, "HLT_Reclaimer_totalNonPurgeable", info,
+              "com.quill.NANDInfo.Reclaimer.TotalNonPurgeableBytes");
     exporter->releaseStats(context);
     return info;
   });

@@ -9,9 +9,8 @@
 
 #include "NANDInfo/controller/EntryPoint.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
-#include "NANDInfo/sets/FieldNumber.h"
 #include "NANDInfo/sets/FilteredDict.h"
-#include "NANDInfo/sets/NANDInfo.h"
+#include "NANDInfo/sets/StatisticsGathering.h"
 
 namespace vesprun {
 namespace {
@@ -44,7 +43,7 @@ constinit const FieldTable kInternalLabFields(kInternalLabRanges, kInternalLabIn
 
 /// The number as a signed 32-bit one, but at least 0, which it also is when missing.
 std::int32_t atLeastZero(const PropertyDict& fields, std::string_view name) {
-  const Number* number = numberUnder(fields, name);
+  const Number* number = fields.findNumber(name);
   return number != nullptr ? std::max(number->asInt32(), 0) : 0;
 }
 
@@ -62,22 +61,22 @@ std::int32_t maxE2EErrors(const PropertyDict& ftl) {
 }
 
 std::int64_t hostReadErrors(const PropertyDict& ftl) {
-  const Number* isQNS1 = numberUnder(ftl, "com.quill.NANDInfo.IsQNS1Controller");
+  const Number* isQNS1 = ftl.findNumber("com.quill.NANDInfo.IsQNS1Controller");
   if (isQNS1 == nullptr) {
     return 0;
   }
-  const Number* errors = numberUnder(ftl, isQNS1->asInt64() != 0 ? "ueccReads" : "raidSmartErrors");
+  const Number* errors = ftl.findNumber(isQNS1->asInt64() != 0 ? "ueccReads" : "raidSmartErrors");
   return errors != nullptr ? std::max<std::int64_t>(errors->asInt64(), 0) : 0;
 }
 
 std::int64_t numberOrMinusOne(const PropertyDict& fields, std::string_view name) {
-  const Number* number = numberUnder(fields, name);
+  const Number* number = fields.findNumber(name);
   return number != nullptr ? number->asInt64() : -1;
 }
 
 bool isRetirable(const PropertyDict& health) {
-  const Number* spare = numberUnder(health, kSpareAvailablePercent);
-  const Number* used = numberUnder(health, kMaxPercentageNANDUsed);
+  const Number* spare = health.findNumber(kSpareAvailablePercent);
+  const Number* used = health.findNumber(kMaxPercentageNANDUsed);
   return spare != nullptr && used != nullptr && spare->asInt64() >= 0 && used->asInt64() >= 0 &&
          (spare->asInt64() < 100 || used->asInt64() >= 100);
 }

@@ -1,19 +1,15 @@
-// Fetches the controller's statistics buffers and has them parsed.
+#include "NANDInfo/sets/StatisticsGathering.h"
 
-#include <cstdio>
 #include <cstring>
 #include <memory>
 #include <new>
 #include <string>
 
-#include "NANDInfo/controller/ControllerConnection.h"
+#include "NANDInfo/controller/Controller.h"
 #include "NANDInfo/controller/TunnelCommand.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/GenericParserCxt.h"
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
-#include "NANDInfo/sets/MagazineSnapshot.h"
-#include "NANDInfo/sets/NANDInfo.h"
-#include "platform/RegistryObject.h"
 
 namespace vesprun {
 namespace {
@@ -159,21 +155,16 @@ std::optional<PropertyDict> gatherORUMSPData() {
 }
 
 bool GatherNANDStats(nand_exporter_t*& exporter, ORUStatsContext& context) {
-  const RegistryObject service(findNandExporter(exporter));
-  if (!service) {
-    std::fputs("Could not get matching DevRegKit service for exporting classes\n", stderr);
-    return false;
-  }
-  ControllerConnection connection(service.get());
-  if (!connection) {
-    std::fputs("Could not get connection to service\n", stderr);
+  Controller controller;
+  exporter = &controller.exporter();
+  if (!controller.open()) {
     return false;
   }
   Answer answer;
-  const bool parsed = fetch(connection.get(), *exporter, exporter->getStatsSelectors, 0, answer) &&
-                      exporter->parseStats != nullptr &&
-                      exporter->parseStats(context, answer.bytes());
-  return connection.close() && parsed;
+  const bool parsed =
+      fetch(controller.connection(), *exporter, exporter->getStatsSelectors, 0, answer) &&
+      exporter->parseStats != nullptr && exporter->parseStats(context, answer.bytes());
+  return controller.close() && parsed;
 }
 
 }  // namespace vesprun

@@ -7,9 +7,8 @@
 #include "NANDInfo/controller/EANQueries.h"
 #include "NANDInfo/controller/EntryPoint.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
-#include "NANDInfo/sets/FieldNumber.h"
 #include "NANDInfo/sets/FilteredDict.h"
-#include "NANDInfo/sets/NANDInfo.h"
+#include "NANDInfo/sets/StatisticsGathering.h"
 #include "NANDInfo/sets/StorageHealthFields.h"
 #include "NANDInfo/tables/FieldSets.h"
 
@@ -50,7 +49,7 @@ constexpr std::uint32_t fourCharacterCode(const char (&text)[5]) {
 }
 
 void addFirmwareVersionParts(const PropertyDict& msp, PropertyDict& set) {
-  const Number* version = numberUnder(msp, kFirmwareVersionKey);
+  const Number* version = msp.findNumber(kFirmwareVersionKey);
   if (version == nullptr) {
     return;
   }
@@ -83,11 +82,7 @@ PropertyDict CopyWhitelistedNANDFTLInfo(bool round) noexcept {
   return runEntryPoint(__func__, [&] {
     PropertyDict set;
     if (std::optional<PropertyDict> fields = gatherORUFTLData(false, true, 0)) {
-      const PropertyDict derived = gatherORUFTLOtherData(&*fields);
-      if (derived.empty()) {
-        SetAPIErrorMessage("CopyWhitelistedNANDFTLInfo: Unable to gather HLT FTL fields");
-      }
-      fields->merge(derived);
+      fields->merge(gatherORUFTLOtherData(&*fields));
       set = CreateFilteredDict_SigDig(*fields, &WhitelistedRawNANDFTLCounters_SigDigDict, round);
     } else {
       SetAPIErrorMessage("CopyWhitelistedNANDFTLInfo: Unable to gather other FTL fields");
@@ -125,9 +120,7 @@ PropertyDict CopyWhitelistedStorageStats(bool round) noexcept {
     PropertyDict fields;
     const PropertyDict derived = gatherORUOtherData();
     for (const std::string_view name : kHealthFieldsOfStorageStats) {
-      if (const PropertyValue* value = derived.find(name)) {
-        fields.set(name, *value);
-      }
+      copyField(derived, name, fields, name);
     }
     for (const ImageFigure& figure : kImageFigures) {
       fields.set(figure.field, figure.query(fourCharacterCode(figure.code)));

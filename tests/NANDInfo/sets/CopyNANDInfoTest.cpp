@@ -1,5 +1,7 @@
+#include "NANDInfo/sets/CopyNANDInfo.h"
+
 #include "NANDInfo/controller/EANQueries.h"
-#include "NANDInfo/sets/NANDInfo.h"
+#include "NANDInfo/sets/StorageHealthFields.h"
 #include "support/ControllerTest.h"
 #include "vesprun.h"
 

@@ -3,7 +3,7 @@
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/ORUStatsContext.h"
 #include "NANDInfo/parsers/StatisticsBufferBuilder.h"
-#include "NANDInfo/sets/NANDInfo.h"
+#include "NANDInfo/sets/StatisticsGathering.h"
 #include "support/ControllerTest.h"
 #include "support/WatchedRegistry.h"
 

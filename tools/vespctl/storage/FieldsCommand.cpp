@@ -70,7 +70,7 @@ std::vector<List> lists() {
       {"ftl-stats-for-msp", [] { return namesIn(FTLStats4MSPStats); }},
       {"magazine-accumulating", [] { return namesIn(PrivacyApprovedSMagNANDFTLCounters_Accum); }},
       {"magazine-dynamic", [] { return namesIn(PrivacyApprovedSMagNANDFTLCounters_Dynamic); }}};
-  for (const EventFields& event : EventHubConfigDetails) {
+  for (const StorageEvent& event : EventHubConfigDetails) {
     lists.push_back(
         {"event " + std::string(event.event), [table = event.fields] { return namesIn(*table); }});
   }
