@@ -25,21 +25,18 @@ constexpr const char* kIsNANDRetirable = "com.quill.NANDInfo.Health.IsNANDRetira
 
 constexpr unsigned kE2EErrorCounters = 12;
 
-constexpr auto kTendmarkRanges = std::to_array<FieldRange>(
+constexpr auto kTendmarkKeys = std::to_array<FieldRange>(
     {kMaxPercentageNANDUsed, kHostReadErrors, kMaxE2EErrors, kNumGrownBadBlocks, kNumDieFailures});
-constexpr FieldIndex kTendmarkIndex(kTendmarkRanges);
-constinit const FieldTable kTendmarkFields(kTendmarkRanges, kTendmarkIndex);
+constinit const FieldTable kTendmarkFields = fieldTable<kTendmarkKeys, 5>();
 
-constexpr auto kOTARanges = std::to_array<FieldRange>(
+constexpr auto kOTAKeys = std::to_array<FieldRange>(
     {kMaxPercentageNANDUsed, kHostReadErrors, kMaxE2EErrors, kNumGrownBadBlocks});
-constexpr FieldIndex kOTAIndex(kOTARanges);
-constinit const FieldTable kOTAFields(kOTARanges, kOTAIndex);
+constinit const FieldTable kOTAFields = fieldTable<kOTAKeys, 4>();
 
-constexpr auto kInternalLabRanges =
+constexpr auto kInternalLabKeys =
     std::to_array<FieldRange>({kMaxPercentageNANDUsed, kHostReadErrors, kMaxE2EErrors,
                                kSpareAvailablePercent, kNumGrownBadBlocks});
-constexpr FieldIndex kInternalLabIndex(kInternalLabRanges);
-constinit const FieldTable kInternalLabFields(kInternalLabRanges, kInternalLabIndex);
+constinit const FieldTable kInternalLabFields = fieldTable<kInternalLabKeys, 5>();
 
 /// The number as a signed 32-bit one, but at least 0, which it also is when missing.
 std::int32_t atLeastZero(const PropertyDict& fields, std::string_view name) {

@@ -1,27 +1,10 @@
 #include "NANDInfo/controller/EntryPoint.h"
 
-#include <cstdlib>
-#include <new>
-
-#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
+#include "buffers/DeviceBuffers.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
 #include "support/ControllerTest.h"
-#include "support/SnapshotBuilder.h"
+#include "support/ScarceMemory.h"
 #include "vesprun.h"
-
-namespace {
-
-/// How many more allocations of this thread succeed before one fails; 0: all do.
-thread_local std::size_t allocationsLeft = 0;
-
-}  // namespace
-
-void* operator new(std::size_t size) {
-  void* const block = allocationsLeft == 0 || --allocationsLeft != 0 ? std::malloc(size) : nullptr;
-  return block != nullptr ? block : throw std::bad_alloc();
-}
-void operator delete(void* block) noexcept { std::free(block); }
-void operator delete(void* block, std::size_t /*size*/) noexcept { std::free(block); }
 
 namespace vesprun {
 namespace {
@@ -76,14 +59,15 @@ TEST_F(EntryPointTest, AnswersNothingWithoutADevice) {
 }
 
 TEST_F(EntryPointTest, RunsOutOfMemoryWithoutThrowingOrHoldingAnything) {
-  TestDevice device(R"({"logLevel": "error", "events": {"used": []},
+  TestDevice device(
+      R"({"logLevel": "error", "events": {"used": []},
                         "kernel": {"snapshot": "snapshot"}, "registry": [)" +
-                    controller("QuillQNS3NVMeController", R"({"opcode": 13, "file": "ftl"},
+      controller("QuillQNS3NVMeController", R"({"opcode": 13, "file": "ftl"},
                         {"opcode": 10, "argument": 0, "file": "ftl"},
                         {"opcode": 10, "argument": 4, "file": "ftl"},
                         {"opcode": 10, "argument": 24, "file": "ftl"},
                         {"opcode": 221, "argument": 0, "file": "msp"})") +
-                    "]}");
+      R"(, {"class": "QuillNVMeEAN", "userClient": {"scalarMethods": {"3": {"dBIC": 1}}}}]})");
   device.write("ftl", StatisticsBufferBuilder().add(4, {9000}).add(680, {1, 2, 3}).bytes());
   device.write("msp", MSPBufferBuilder().add(8202, {40}).bytes());
   device.write("snapshot", SnapshotBuilder().thread(1, "VM_swapout", 7).bytes);

@@ -1,6 +1,6 @@
 #include "NANDInfo/parsers/KernelSnapshot.h"
 
-#include "support/SnapshotBuilder.h"
+#include "buffers/DeviceBuffers.h"
 
 namespace vesprun {
 namespace {

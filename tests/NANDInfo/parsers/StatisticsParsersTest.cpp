@@ -9,7 +9,7 @@
 #include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
-#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
+#include "buffers/DeviceBuffers.h"
 
 namespace vesprun {
 namespace {
@@ -244,31 +244,19 @@ TEST(MSPParser, walksRecords) {
   }
 }
 
-Bytes allStatistics() {
-  Statistics buffer;
-  for (const ORUStatKey& key : ORUStatKeyTable) {
-    buffer.add(key.id, countingUp(key.count, key.id));
-  }
-  return buffer.bytes();
-}
-
-Bytes allMSPStatistics() {
-  MSP buffer;
-  for (const ORUMSPKey& key : ORUMSPKeyTable) {
-    buffer.add(key.key, countingUp(key.count, key.key));
-  }
-  return buffer.bytes();
-}
-
 TEST(StatisticsParsers, decodeEveryKnownStatistic) {
-  const Outcome all = ftl(allStatistics());
+  const Bytes statistics =
+      everyStatistic([](const ORUStatKey& key) { return countingUp(key.count, key.id); });
+  const Bytes mspStatistics =
+      everyMSPStatistic([](const ORUMSPKey& key) { return countingUp(key.count, key.key); });
+  const Outcome all = ftl(statistics);
   EXPECT_EQ(all.result, 540U + 1956U);
   EXPECT_EQ(all.error, "NA");
-  EXPECT_EQ(base(allStatistics()).fields.size(), 540U + 1956U);
-  EXPECT_EQ(base(allStatistics()).fields.back(), Fields::value_type("numDipFailures", 828));
-  EXPECT_EQ(ftlStatKey(allStatistics()).result, 540U + 1956U);
-  EXPECT_EQ(msp(allMSPStatistics()).result, 857U);
-  EXPECT_EQ(msp(allMSPStatistics()).error, "NA");
+  EXPECT_EQ(base(statistics).fields.size(), 540U + 1956U);
+  EXPECT_EQ(base(statistics).fields.back(), Fields::value_type("numDipFailures", 828));
+  EXPECT_EQ(ftlStatKey(statistics).result, 540U + 1956U);
+  EXPECT_EQ(msp(mspStatistics).result, 857U);
+  EXPECT_EQ(msp(mspStatistics).error, "NA");
 }
 
 }  // namespace

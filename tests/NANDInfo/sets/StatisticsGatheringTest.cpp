@@ -2,8 +2,8 @@
 
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/ORUStatsContext.h"
-#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
 #include "NANDInfo/sets/StatisticsGathering.h"
+#include "buffers/DeviceBuffers.h"
 #include "support/ControllerTest.h"
 #include "support/WatchedRegistry.h"
 
