@@ -69,6 +69,20 @@ TEST_F(StructuredLog, WritesTheValidityListOnlyWhenItIsWanted) {
   EXPECT_EQ(gCurrentUserWamp, 0.0);
 }
 
+TEST_F(StructuredLog, FindsTheCharacteristicsUnderTheNameThatTheClassHas) {
+  const std::pair<std::string, std::string> names[] = {
+      {"QuillEmbeddedNVMeController", "Controller Characteristics"},
+      {"ORUStorage", "DevRegPropertyMatch"}};
+  for (const auto& [className, property] : names) {
+    start(
+        R"({"class": ")" + className + R"(", "properties": {")" + property +
+        R"(": {"nand-device-desc": 7}}, "userClient": {"tunnel": [{"opcode": 15, "size": 12}]}})");
+    dump();
+    EXPECT_EQ(textForm(*device().lines("records.jsonl").at(0).find("record")),
+              "{Factory Count = 0; com.quill.NANDInfo.nandDesc = 7}");
+  }
+}
+
 TEST_F(StructuredLog, SendsKindsAndTheCallersFlag) {
   startController();
   for (const std::uint32_t flag : {0U, 2U}) {
