@@ -12,8 +12,6 @@ namespace {
 
 class StructuredLog : public ControllerTest {
  protected:
-  ~StructuredLog() override { forgetStructuredLogState(); }
-
   /// A controller that delivers every list, with a write amplification of 1.25. Of several answers
   /// to a request the first counts: `tunnel` stands before its own. Its characteristics are its
   /// parent's, unless it has some; those of its sibling and its child are no concern of its.
@@ -169,6 +167,14 @@ TEST_F(StructuredLog, FetchesOnlyWhatTheControllerOffers) {
             "Telemetry list retrieval is not supported\n"
             "Defects list retrieval is not supported\n");
   exporter = complete;
+}
+
+TEST_F(StructuredLog, ACustomControllerHasItsCharacteristicsElsewhere) {
+  for (const bool elsewhere : {false, true}) {
+    start(std::string(R"({"class": "ORUStorage", "userClient": {}, "properties": {")") +
+          (elsewhere ? "DevRegPropertyMatch" : "Controller Characteristics") + "\": {}}}");
+    EXPECT_EQ(dump().find("failed to create dictionary") == std::string::npos, elsewhere);
+  }
 }
 
 }  // namespace
