@@ -12,7 +12,7 @@ namespace vesprun {
 ///
 /// Key, user and domain may come from somebody else's data. A missing key, the empty name of a user
 /// or domain, which also stands for a missing one, and a name that cannot be theirs are refused
-/// with an error in the system log, a user or domain once; nothing is changed then.
+/// with an error in the system log; nothing is changed then.
 class LGSServicesClient {
  public:
   virtual ~LGSServicesClient() = default;
