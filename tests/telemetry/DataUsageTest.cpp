@@ -128,7 +128,7 @@ TEST(DataUsage, ALateReplyIsHandledWhileTheStepGoesOn) {
   TestDevice device(deviceWith(R"("channels": [{"name": "a", "value": 1}],
       "usage": {"records": [)" +
                                record(kApp, kToday, counters(2048, 0, 0, 0)) +
-                               R"(], "delaySeconds": 0.05})"));
+                               R"(], "delaySeconds": 0.5})"));
   CollectDataUsage(1ms);
   EXPECT_THAT(device.log(), ElementsAre("default: Murmur timed out, no datausage available"));
   for (int i = 0; i < 2000 && !baseline(device); ++i) {
@@ -200,6 +200,7 @@ TEST(DataUsage, GrowthIsCountedOnceWhateverIsKilledInBetween) {
   const std::string preferences = "var/mobile/Library/Preferences/" + std::string(kDomain);
   const std::string marked = device.read(preferences + ".ptree");
 
+  device.platform();
   CollectDataUsage();
   EXPECT_EQ(todaysScalars(device), kGrowth);
   EXPECT_EQ(jsonOf(baseline(device)), after);
