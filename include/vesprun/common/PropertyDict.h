@@ -78,18 +78,16 @@ class PropertyDict {
     return true;
   }
   /// Sets every entry of `other`, in its order.
+  void merge(PropertyDict&& other) {
+    if (empty()) {
+      *this = std::move(other);
+    } else {
+      merge(std::as_const(other));
+    }
+  }
   void merge(const PropertyDict& other) {
     for (const auto& [key, value] : other) {
       set(key, value);
-    }
-  }
-  void merge(PropertyDict&& other) {
-    if (empty()) {
-      std::swap(_entries, other._entries);
-    } else {
-      for (auto entry = other._entries.begin(); entry != other._entries.end(); ++entry) {
-        set(entry.key(), std::move(entry.value()));
-      }
     }
   }
   void clear() { _entries.clear(); }

@@ -63,8 +63,8 @@ struct nand_exporter_t {
 
 inline constexpr std::uint32_t kMethodNotOffered = 0xFFFFFFFF;
 
-/// The known controllers in the order in which they are looked for, then an entry with every field
-/// 0 that stands for "none". One table for the process, without a lock: look-ups must not overlap.
+/// The known controllers in the order in which they are looked for, then an ending entry with
+/// every field 0. One table for the process, without a lock: look-ups must not overlap.
 extern std::array<nand_exporter_t, 4> nand_exporters_tunnel;
 
 /// Forgets the handles in the table, as in a new process; nothing is closed or released.

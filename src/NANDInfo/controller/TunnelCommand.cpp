@@ -7,6 +7,7 @@
 #include "platform/Platform.h"
 
 namespace vesprun {
+
 // calloc takes large blocks straight from the system: zero, and without touching them.
 TunnelBuffer::TunnelBuffer(std::size_t size)
     : _bytes(static_cast<std::uint8_t*>(std::calloc(std::max<std::size_t>(size, 1), 1))),

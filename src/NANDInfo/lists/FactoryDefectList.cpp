@@ -3,14 +3,13 @@
 #include <algorithm>
 #include <cstdio>
 
+#include "NANDInfo/lists/StructuredLogState.h"
 #include "common/LittleEndian.h"
 #include "platform/DictionaryHelpers.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
 namespace {
-
-constexpr std::int32_t kRecordType = 176;
 
 // The header: a word that is not read, the factory count, the number of records.
 constexpr std::size_t kFactoryCountOffset = 4;
@@ -60,7 +59,7 @@ struct DefectRecord {
 PropertyValue signedNumber(std::uint32_t word) { return static_cast<std::int32_t>(word); }
 
 void log(const PropertyDict& record) {
-  platform().logsmith().FLLogStructuredData(kRecordType, record);
+  platform().logsmith().FLLogStructuredData(kListRecordType, record);
 }
 
 void logHeader(std::uint32_t factoryCount, const PropertyValue* properties) {

@@ -114,7 +114,7 @@ TunnelBuffer fetchList(const Controller& controller, const TunnelSelector& selec
   if (size == 0) {
     return {};
   }
-  // Not aligned to a page: the driver copies into it, and no handler can tell.
+  // Need not be aligned to a page: the driver copies into it.
   TunnelBuffer list(size);
   if (!list) {
     std::fprintf(stderr, "Could not malloc %zu bytes", std::size_t{size});

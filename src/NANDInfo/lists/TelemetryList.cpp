@@ -9,14 +9,13 @@
 #include <string>
 
 #include "NANDInfo/lists/HexText.h"
+#include "NANDInfo/lists/StructuredLogState.h"
 #include "NANDInfo/parsers/VendorCounterParsers.h"
 #include "platform/DictionaryHelpers.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
 namespace {
-
-constexpr std::int32_t kRecordType = 176;
 
 // For B buses: B counter regions, then B bus entries.
 constexpr std::size_t kWordSize = 4;
@@ -184,7 +183,7 @@ bool LogNANDTelemetryList(std::span<const std::uint8_t> buffer,
     const auto region = buffer.subspan(bus * kCounterRegionSize).first<kCounterRegionSize>();
     read->layout.parse(region, *counters);
     platform().logsmith().FLLogStructuredData(
-        kRecordType, busRecord(busEntries + bus * kBusEntrySize, *counters, read->layout));
+        kListRecordType, busRecord(busEntries + bus * kBusEntrySize, *counters, read->layout));
   }
   return true;
 }

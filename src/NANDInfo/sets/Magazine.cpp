@@ -121,8 +121,8 @@ bool collectedGarbage(const PropertyDict& newer, const PropertyDict& older) {
 /// What is invalid in a band of validity step `step`, as a share of the band. Below 0 from step 31.
 double invalidShare(unsigned step) { return 1 - 0.033 * step; }
 
-/// Takes bands from the validity curve, step by step, until they make one free band; the step at
-/// which that is reached tells how much had to be written for it.
+/// Takes bands from the validity curve, step by step, until they make one free band; what had to be
+/// written for it follows from the step at which that is reached.
 double writeAmplification(const PropertyDict& snapshot) {
   constexpr unsigned kLastStep = 32;
   double missing = 1.0;

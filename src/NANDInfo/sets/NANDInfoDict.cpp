@@ -11,7 +11,7 @@
 namespace vesprun {
 namespace {
 
-/// Figures that come from several fields, in none of which they stand by themselves.
+/// Figures that are made from several fields.
 struct DerivedFigures {
   static constexpr std::uint64_t kNotSeen = 0xFFFFFFFF;
 

@@ -99,6 +99,7 @@ TEST_F(NandExporterTest, ConnectionForOtherPrograms) {
   nand_exporters_tunnel[1].getStatsSelectors = getter;
 
   start("");
+  connection.connection = 99;  // of somebody else
   EXPECT_EQ(errorsOf([&] { EXPECT_FALSE(openORUConnection(connection)); }),
             kNoMatch + "Can't get ORU Connection, no matching service!\n");
   EXPECT_EQ(connection.exporter, &endOfTable());

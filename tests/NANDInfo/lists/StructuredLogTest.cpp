@@ -13,7 +13,7 @@ namespace {
 class StructuredLog : public ControllerTest {
  protected:
   /// A controller that delivers every list, with a write amplification of 1.25. Of several answers
-  /// to a request the first counts: `tunnel` stands before its own. Its characteristics are its
+  /// to a request the first counts: `tunnel` comes before its own. Its characteristics are its
   /// parent's, unless it has some; those of its sibling and its child are no concern of its.
   void startController(const std::string& tunnel = "", const std::string& properties = "{}") {
     const std::string unusable = R"("properties": {"Controller Characteristics": 5}})";

@@ -1,6 +1,7 @@
 #include "NANDInfo/sets/CopyNANDInfo.h"
 
 #include "NANDInfo/controller/EANQueries.h"
+#include "NANDInfo/controller/NandExporter.h"
 #include "NANDInfo/sets/StorageHealthFields.h"
 #include "support/ControllerTest.h"
 #include "vesprun.h"
