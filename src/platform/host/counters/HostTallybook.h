@@ -46,7 +46,7 @@ class HostTallybook final : public Tallybook {
   void TBClientCheckpoint() override;
   void TBClientSetValueForScalarKey(std::string_view key, std::int64_t value) override;
   void TBClientAddValueForScalarKey(std::string_view key, std::int64_t value) override;
-  std::unique_ptr<TBHistory> openHistory() override;
+  std::unique_ptr<TBHistory> initWithDefaultPath() override;
 
   // What tools need beside. Each writes or reads at once, all or nothing; false, with a text in
   // `error`, when that failed.

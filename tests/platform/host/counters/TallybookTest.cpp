@@ -98,7 +98,7 @@ TEST_F(TallybookTest, deliversDaysInclusivelyByDayThenKeyBytes) {
              "scalar\t2\ta\t5\nscalar\t4\ta\t6\nscalar\t-1\ta\t7\n"
              "sample\t3\td\t1\t0\nsample\t2\te\t2\t7\nsample\t2\te\t3\t-7\n"));
   HostTallybook tallybook(device, clock, preferences, log);
-  const std::unique_ptr<TBHistory> history = tallybook.openHistory();
+  const std::unique_ptr<TBHistory> history = tallybook.initWithDefaultPath();
   std::vector<std::string> rows;
   const auto found = [&](std::string_view prefix, std::int32_t from, std::int32_t to,
                          std::size_t most = 99) {
@@ -281,7 +281,7 @@ TEST_F(TallybookTest, movesDamagedFilesAsideAndGoesOn) {
     log.messages.clear();
     {
       HostTallybook tallybook(device, clock, preferences, log);
-      const std::unique_ptr<TBHistory> history = tallybook.openHistory();
+      const std::unique_ptr<TBHistory> history = tallybook.initWithDefaultPath();
       const auto ignore = [](std::string_view, std::int32_t, std::int64_t, bool&) {};
       const auto readAll = [](std::string_view, std::int32_t,
                               TBHistoryDistributionEnumerator& values, bool&) {
