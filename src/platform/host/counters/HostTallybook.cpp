@@ -133,7 +133,9 @@ bool HostTallybook::flush(std::string& error) {
   return false;
 }
 
-std::unique_ptr<TBHistory> HostTallybook::initWithDefaultPath() { return std::make_unique<History>(*this); }
+std::unique_ptr<TBHistory> HostTallybook::initWithDefaultPath() {
+  return std::make_unique<History>(*this);
+}
 
 bool HostTallybook::write(const std::function<bool(CounterStore&)>& work, std::string& error) {
   std::optional<CounterFile::Damage> damage;
