@@ -44,7 +44,7 @@ HostTallybook::HostTallybook(const DeviceDirectory& directory, Clock& clock,
     : _clock(clock), _preferences(preferences), _log(log), _file(directory, clock, longestWait) {}
 
 HostTallybook::~HostTallybook() {
-  runGuarded(_log, [this] {
+  runGuarded(_log, "counters", [this] {
     std::string error;
     if (!flush(error)) {
       _log.write(LogLevel::Error,

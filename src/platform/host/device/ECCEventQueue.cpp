@@ -5,32 +5,17 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <cerrno>
 #include <cstdio>
-#include <filesystem>
-#include <system_error>
+#include <optional>
+#include <string>
 #include <utility>
 #include <vector>
 
+#include "platform/host/files/FolderNames.h"
 #include "platform/host/files/SystemError.h"
 
 namespace vesprun {
-namespace {
-
-std::vector<std::string> eventFiles(const std::string& folder, std::error_code& error) {
-  std::vector<std::string> files;
-  for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
-       entry.increment(error)) {
-    if (entry->path().extension() == ".bin") {
-      files.push_back(entry->path());
-    }
-  }
-  std::sort(files.begin(), files.end());
-  return files;
-}
-
-}  // namespace
 
 ECCEventQueue::Outcome ECCEventQueue::take(const std::string& path, std::span<std::uint8_t> buffer,
                                            std::string& error) {
@@ -73,17 +58,22 @@ ECCEventQueue::Outcome ECCEventQueue::take(const std::string& path, std::span<st
 int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length) {
   _taken = FileDescriptor();
   const std::string folder = _directory.hostPath("kernel/ecc");
-  std::error_code failure;
-  const std::vector<std::string> files = eventFiles(folder, failure);
-  if (failure && failure != std::errc::no_such_file_or_directory) {
-    _log.write(LogLevel::Error, folder + ": " + failure.message());
+  std::string error;
+  const std::optional<std::vector<std::string>> names = namesInFolder(folder, error);
+  if (!names) {
+    _log.write(LogLevel::Error, error);
     return EIO;
+  }
+  std::vector<std::string> files;
+  for (const std::string& name : *names) {
+    if (name.ends_with(".bin") && name != ".bin") {
+      files.push_back(folder + '/' + name);
+    }
   }
   if (!files.empty() && buffer.size() != kEventLength) {
     return EINVAL;
   }
   for (const std::string& path : files) {
-    std::string error;
     switch (take(path, buffer, error)) {
       case Outcome::Taken:
         length = kEventLength;
