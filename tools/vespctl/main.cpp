@@ -4,6 +4,7 @@
 #include <new>
 
 #include "Command.h"
+#include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/StandardStreams.h"
 
 int main(int argc, char** argv) {
@@ -31,7 +32,7 @@ int main(int argc, char** argv) {
     std::fputs("vespctl: out of memory\n", stderr);
     return 1;
   } catch (const std::exception& failure) {  // most are a `CommandFailure`
-    std::fprintf(stderr, "vespctl: %s\n", failure.what());
+    std::fprintf(stderr, "vespctl: %s\n", vesprun::printableText(failure.what()).c_str());
     return 1;
   }
   if (!std::cout.flush() || std::fflush(stdout) != 0) {

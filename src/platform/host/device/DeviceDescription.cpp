@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <initializer_list>
 #include <limits>
-#include <nlohmann/json.hpp>
 #include <string_view>
 
 #include "common/Date.h"
@@ -11,8 +10,6 @@
 
 namespace vesprun {
 namespace {
-
-using Json = nlohmann::ordered_json;
 
 /// What is wrong with the description; caught before it leaves this file.
 struct DescriptionError {
@@ -22,11 +19,11 @@ struct DescriptionError {
 /// One place of the description: the value found there, if any, and the path that leads to it.
 class Entry {
  public:
-  Entry(const Json* value, std::string path) : _value(value), _path(std::move(path)) {}
+  Entry(const PropertyValue* value, std::string path) : _value(value), _path(std::move(path)) {}
 
   bool isPresent() const { return _value != nullptr; }
-  bool isNull() const { return isPresent() && _value->is_null(); }
-  bool isTrue() const { return isPresent() && _value->is_boolean() && _value->get<bool>(); }
+  bool isNull() const { return isPresent() && _value->data() != nullptr; }
+  bool isTrue() const { return isPresent() && *_value == PropertyValue(true); }
   explicit operator bool() const { return isPresent(); }
 
   [[noreturn]] void fail(const std::string& problem) const {
@@ -35,18 +32,14 @@ class Entry {
 
   /// Requires a dictionary that has no other entries than these.
   void dictionaryOf(std::initializer_list<std::string_view> names) const {
-    require(_value->is_object(), "not a dictionary");
-    for (const auto& [name, value] : _value->items()) {
+    for (const auto& [name, value] : dict()) {
       if (std::find(names.begin(), names.end(), name) == names.end()) {
         Entry(nullptr, joined(name)).fail("unknown entry");
       }
     }
   }
 
-  Entry operator[](const std::string& name) const {
-    const auto found = _value->find(name);
-    return {found != _value->end() ? &*found : nullptr, joined(name)};
-  }
+  Entry operator[](const std::string& name) const { return {dict().find(name), joined(name)}; }
 
   Entry required(const std::string& name) const {
     const Entry entry = (*this)[name];
@@ -57,9 +50,9 @@ class Entry {
   }
 
   std::vector<Entry> elements() const {
-    require(_value->is_array(), "not an array");
+    require(_value->array() != nullptr, "not an array");
     std::vector<Entry> elements;
-    for (const Json& element : *_value) {
+    for (const PropertyValue& element : *_value->array()) {
       elements.emplace_back(&element, _path + '[' + std::to_string(elements.size()) + ']');
     }
     return elements;
@@ -67,41 +60,34 @@ class Entry {
 
   /// The entries of a dictionary whose names are free.
   std::vector<std::pair<std::string, Entry>> namedEntries() const {
-    require(_value->is_object(), "not a dictionary");
     std::vector<std::pair<std::string, Entry>> entries;
-    for (const auto& [name, value] : _value->items()) {
+    for (const auto& [name, value] : dict()) {
       entries.emplace_back(name, Entry(&value, joined(name)));
     }
     return entries;
   }
 
   std::string text() const {
-    require(_value->is_string(), "not a string");
-    return _value->get<std::string>();
+    require(_value->string() != nullptr, "not a string");
+    return *_value->string();
   }
 
   bool boolean() const {
-    require(_value->is_boolean(), "not a boolean");
-    return _value->get<bool>();
+    require(_value->boolean() != nullptr, "not a boolean");
+    return *_value->boolean();
   }
 
   template <typename T>
   T integer() const {
-    require(_value->is_number_integer(), "not an integer");
-    const bool negative = !_value->is_number_unsigned() && _value->get<std::int64_t>() < 0;
-    const bool fits = negative ? std::is_signed_v<T> &&
-                                     _value->get<std::int64_t>() >=
-                                         static_cast<std::int64_t>(std::numeric_limits<T>::min())
-                               : _value->get<std::uint64_t>() <=
-                                     static_cast<std::uint64_t>(std::numeric_limits<T>::max());
-    require(fits, "out of range");
-    return negative ? static_cast<T>(_value->get<std::int64_t>())
-                    : static_cast<T>(_value->get<std::uint64_t>());
+    const Number* number = _value->number();
+    require(number != nullptr && !number->isFloatingPoint(), "not an integer");
+    require(Number(static_cast<T>(number->asUInt64())) == *number, "out of range");
+    return static_cast<T>(number->asUInt64());
   }
 
   double real() const {
-    require(_value->is_number(), "not a number");
-    return _value->get<double>();
+    require(_value->number() != nullptr, "not a number");
+    return _value->number()->asDouble();
   }
 
   std::vector<std::string> texts() const {
@@ -119,7 +105,7 @@ class Entry {
 
   PropertyValue value() const {
     std::string error;
-    std::optional<PropertyValue> value = valueFromJson(*_value, error);
+    std::optional<PropertyValue> value = valueFromPlain(*_value, error);
     require(value.has_value(), error);
     return *std::move(value);
   }
@@ -139,6 +125,10 @@ class Entry {
   }
 
  private:
+  const PropertyDict& dict() const {
+    require(_value->dict() != nullptr, "not a dictionary");
+    return *_value->dict();
+  }
   std::string joined(const std::string& name) const {
     return _path.empty() ? name : _path + '.' + name;
   }
@@ -148,7 +138,7 @@ class Entry {
     }
   }
 
-  const Json* _value;
+  const PropertyValue* _value;
   std::string _path;
 };
 
@@ -480,7 +470,11 @@ DeviceDescription readDevice(const Entry& root) {
 
 std::optional<DeviceDescription> readDeviceDescription(const std::string& text,
                                                        std::string& error) {
-  const std::optional<Json> root = jsonFromText(text, error);
+  if (text.size() > kLongestDeviceDescription) {
+    error = "longer than 16 MiB";
+    return std::nullopt;
+  }
+  const std::optional<PropertyValue> root = plainValueFromJsonText(text, error);
   if (!root) {
     return std::nullopt;
   }

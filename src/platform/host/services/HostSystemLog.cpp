@@ -5,6 +5,7 @@
 
 #include "common/Date.h"
 #include "platform/host/documents/JsonForm.h"
+#include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {
 namespace {
@@ -41,8 +42,10 @@ void HostSystemLog::write(LogLevel level, std::string_view message) {
       {"time", dateText(_clock.now())}, {"level", levelName(level)}, {"message", message}};
   std::string error;
   if (!_directory.makeFolder("outbox", error) || !_lines.append(jsonText(line), error)) {
-    const std::string text(message);
-    std::fprintf(stderr, "vesprun: %s (not logged: %s)\n", text.c_str(), error.c_str());
+    message.remove_suffix(message.ends_with('\n') ? 1 : 0);  // some messages end their own line
+    const std::string text = printableText(message);
+    std::fprintf(stderr, "vesprun: %s (not logged: %s)\n", text.c_str(),
+                 printableText(error).c_str());
   }
 }
 
