@@ -4,6 +4,7 @@
 #include <string>
 #include <string_view>
 
+#include "common/HexText.h"
 #include "common/TextForm.h"
 #include "driver/DailyTasks.h"
 #include "platform/Platform.h"
@@ -33,7 +34,6 @@ std::string textField(const PropertyDict& dict, std::string_view key) {
 }
 
 std::string uuidField(const PropertyDict& dict, std::string_view key) {
-  constexpr std::string_view kDigits = "0123456789ABCDEF";
   constexpr std::size_t kLength = 16;
   const PropertyValue* value = dict.find(key);
   const Bytes* bytes = value != nullptr ? value->data() : nullptr;
@@ -45,8 +45,7 @@ std::string uuidField(const PropertyDict& dict, std::string_view key) {
     if (i == 4 || i == 6 || i == 8 || i == 10) {
       text += '-';
     }
-    text += kDigits[(*bytes)[i] >> 4U];
-    text += kDigits[(*bytes)[i] & 0xFU];
+    appendHex(text, (*bytes)[i], kUpperHexDigits);
   }
   return text;
 }

@@ -56,6 +56,20 @@ class PropertyDict {
   }
   bool contains(std::string_view key) const { return find(key) != nullptr; }
 
+  // The same for one type: null too when the value is of another.
+  const PropertyDict* findDict(std::string_view key) const {
+    return find<PropertyDict>(key, &PropertyValue::dict);
+  }
+  const PropertyArray* findArray(std::string_view key) const {
+    return find(key, &PropertyValue::array);
+  }
+  const std::string* findString(std::string_view key) const {
+    return find(key, &PropertyValue::string);
+  }
+  const Number* findNumber(std::string_view key) const { return find(key, &PropertyValue::number); }
+  const Bytes* findData(std::string_view key) const { return find(key, &PropertyValue::data); }
+  const Date* findDate(std::string_view key) const { return find(key, &PropertyValue::date); }
+
   void set(std::string_view key, PropertyValue value) {
     if (!_many) {
       if (const auto entry = findFew(key); entry != _few.end()) {
@@ -111,6 +125,12 @@ class PropertyDict {
   friend bool operator==(const PropertyDict& left, const PropertyDict& right);
 
  private:
+  template <typename T>
+  const T* find(std::string_view key, const T* (PropertyValue::*typed)() const) const {
+    const PropertyValue* value = find(key);
+    return value != nullptr ? (value->*typed)() : nullptr;
+  }
+
   // There are many small dictionaries: they do without a hash table.
   static constexpr std::size_t kMostFew = 8;
 

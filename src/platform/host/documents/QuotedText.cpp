@@ -3,13 +3,13 @@
 #include <cstddef>
 #include <limits>
 
+#include "common/HexText.h"
 #include "platform/host/documents/XmlText.h"
 
 namespace vesprun {
 namespace {
 
 void appendPrintable(std::string_view text, std::size_t mostCharacters, std::string& printable) {
-  static constexpr std::string_view kHexDigits = "0123456789abcdef";
   for (std::size_t count = 0; !text.empty(); ++count) {
     if (count == mostCharacters) {
       printable += "...";
@@ -22,8 +22,7 @@ void appendPrintable(std::string_view text, std::size_t mostCharacters, std::str
         (length == 2 && byte == 0xC2 && static_cast<unsigned char>(text[1]) < 0xA0);
     if (length == 0 || control) {
       printable += "\\x";
-      printable += kHexDigits[byte >> 4];
-      printable += kHexDigits[byte & 15];
+      appendHex(printable, byte);
       text.remove_prefix(1);
     } else {
       printable += text.substr(0, length);

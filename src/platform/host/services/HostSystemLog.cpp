@@ -1,6 +1,7 @@
 #include "platform/host/services/HostSystemLog.h"
 
 #include <cstdio>
+#include <exception>
 #include <string>
 
 #include "common/Date.h"
@@ -38,14 +39,24 @@ void HostSystemLog::write(LogLevel level, std::string_view message) {
   if (!keeps(level)) {
     return;
   }
-  const PropertyDict line{
-      {"time", dateText(_clock.now())}, {"level", levelName(level)}, {"message", message}};
   std::string error;
-  if (!_directory.makeFolder("outbox", error) || !_lines.append(jsonText(line), error)) {
-    message.remove_suffix(message.ends_with('\n') ? 1 : 0);  // some messages end their own line
-    const std::string text = printableText(message);
-    std::fprintf(stderr, "vesprun: %s (not logged: %s)\n", text.c_str(),
-                 printableText(error).c_str());
+  try {
+    const PropertyDict line{
+        {"time", dateText(_clock.now())}, {"level", levelName(level)}, {"message", message}};
+    if (_directory.makeFolder("outbox", error) && _lines.append(jsonText(line), error)) {
+      return;
+    }
+  } catch (const std::exception&) {
+    error.clear();
+  }
+  while (message.ends_with('\n')) {
+    message.remove_suffix(1);
+  }
+  try {
+    std::fprintf(stderr, "vesprun: %s (not logged: %s)\n", printableText(message).c_str(),
+                 error.empty() ? "out of memory" : printableText(error).c_str());
+  } catch (const std::exception&) {
+    std::fputs("vesprun: out of memory\n", stderr);
   }
 }
 
