@@ -27,8 +27,8 @@ inline constexpr std::size_t kLongestPtree = std::size_t{256} << 20;
 /// - White space counts in keys and strings, also where there is nothing else; in numbers and dates
 ///   it is refused, between elements it is skipped. `true` and `false` are empty.
 ///
-/// Beside the value that it makes, reading takes a few MiB at most: whatever the document is, both
-/// take less than nine times its size.
+/// The document, its value and the reading together take less than eight times the document's size;
+/// measured with documents of the smallest elements.
 std::optional<PropertyValue> readPtree(std::string_view bytes, std::string& error);
 
 }  // namespace vesprun
