@@ -276,6 +276,7 @@ TEST(PtreeReader, namesTheLine) {
               StartsWith("line 8: an unknown entity"));
   EXPECT_THAT(readingError(start + "<key>a</key>\n</dict>\n</ptree>"),
               StartsWith("line 4: the key"));
+  EXPECT_EQ(readingError(start + "<key\n\nid></key>"), "line 4: <key> cannot have attributes");
   EXPECT_EQ(readingError(start + "\n\n"), "line 6: the document ends early");
   EXPECT_EQ(readingError(nestedArrays(201)), "line 1: nested deeper than 200 levels");
   EXPECT_THAT(readingError(nestedArrays(1'000'000)), HasSubstr("nested"));
