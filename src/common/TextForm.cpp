@@ -7,6 +7,7 @@
 #include <string_view>
 
 #include "common/Date.h"
+#include "common/HexText.h"
 
 namespace vesprun {
 namespace {
@@ -41,11 +42,9 @@ std::string shortestText(T value) {
 }
 
 std::string dataText(const Bytes& data) {
-  static constexpr std::string_view kDigits = "0123456789abcdef";
   std::string text = "<";
   for (const std::uint8_t byte : data) {
-    text += kDigits[byte >> 4];
-    text += kDigits[byte & 15];
+    appendHex(text, byte);
   }
   return text + '>';
 }

@@ -4,6 +4,7 @@
 #include <optional>
 #include <utility>
 
+#include "common/HexText.h"
 #include "config/InternalDevice.h"
 #include "config/WhitelistTables.h"
 #include "platform/Platform.h"
@@ -24,11 +25,9 @@ std::optional<std::string> readWhitelist() {
 }
 
 std::string hexadecimalDigest(std::string_view bytes) {
-  static constexpr std::string_view kDigits = "0123456789abcdef";
   std::string text;
   for (const std::uint8_t byte : platform().messageDigest().md5(bytes)) {
-    text += kDigits[byte >> 4];
-    text += kDigits[byte & 15];
+    appendHex(text, byte);
   }
   return text;
 }

@@ -4,6 +4,7 @@
 #include <new>
 
 #include "Command.h"
+#include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/StandardStreams.h"
 
 namespace vesprun {
@@ -49,7 +50,7 @@ int main(int argc, char** argv) {
   } catch (const std::bad_alloc&) {
     std::fputs("vespctl: out of memory\n", stderr);
   } catch (const std::exception& failure) {  // most are a `CommandFailure`
-    std::fprintf(stderr, "vespctl: %s\n", failure.what());
+    std::fprintf(stderr, "vespctl: %s\n", vesprun::printableText(failure.what()).c_str());
   }
   return 1;
 }

@@ -40,6 +40,16 @@ TEST(HostPlatform, LogKeepsLevelsDownToTheDescribedOne) {
             "\"message\":\"a \\\"quoted\\\"\\nline \xC3\xA9\"}\n");
 }
 
+TEST(HostPlatform, SaysOnStandardErrorWhatCannotBeLogged) {
+  TestDevice device("{}");
+  device.write("outbox", "");
+  testing::internal::CaptureStderr();
+  logMessage(LogLevel::Error, "a \x1B line\n");
+  EXPECT_THAT(testing::internal::GetCapturedStderr(),
+              testing::MatchesRegex(
+                  "vesprun: a \\\\x1b line \\(not logged: /[^\n]*/outbox: File exists\\)\n"));
+}
+
 TEST(HostKernel, ReadsOnlyVariablesOfTheAskedWidth) {
   TestDevice device(R"({"kernel": {"variables": {
       "narrow": {"u32": 258}, "wide": {"u64": 1}, "text": "abc", "bytes": {"data": "AQID"}}}})");

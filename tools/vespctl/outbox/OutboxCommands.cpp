@@ -10,6 +10,7 @@
 #include "outbox/DailyLogView.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeReader.h"
+#include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/FolderNames.h"
 #include "platform/host/files/WholeFile.h"
 
@@ -18,7 +19,7 @@ namespace {
 
 std::string entryText(const PropertyDict& line, const char* key) {
   const PropertyValue* value = line.find(key);
-  return value != nullptr ? textForm(*value) : "";
+  return value != nullptr ? printableText(textForm(*value)) : "";
 }
 
 /// One shown line for each line of the file; what cannot be read is said where it stands.
@@ -54,7 +55,7 @@ void showEvents(const DeviceDirectory& directory, bool inFull) {
               << (fields != nullptr ? fields->size() : 0) << " fields\n";
     if (inFull && fields != nullptr) {
       for (const auto& [key, value] : *fields) {
-        std::cout << "    " << key << " = " << textForm(value) << '\n';
+        std::cout << "    " << printableText(key + " = " + textForm(value)) << '\n';
       }
     }
   });
@@ -78,7 +79,7 @@ void showRecords(const DeviceDirectory& directory, bool inFull) {
     const PropertyValue* value = line.find("record");
     const PropertyDict* record = value != nullptr ? value->dict() : nullptr;
     std::cout << entryText(line, "time") << "  type " << entryText(line, "type") << "  "
-              << (record != nullptr ? recordText(*record, inFull) : "") << '\n';
+              << (record != nullptr ? printableText(recordText(*record, inFull)) : "") << '\n';
   });
 }
 
@@ -90,10 +91,11 @@ void showNotifications(const DeviceDirectory& directory) {
 
 void showSystemLog(const DeviceDirectory& directory) {
   showLines(directory.hostPath("outbox/log.jsonl"), [](const PropertyDict& line) {
-    std::string message = entryText(line, "message");
+    const PropertyValue* value = line.find("message");
+    std::string message = value != nullptr ? textForm(*value) : "";
     message.erase(message.find_last_not_of('\n') + 1);  // some messages end their own line
-    std::cout << entryText(line, "time") << "  " << entryText(line, "level") << "  " << message
-              << '\n';
+    std::cout << entryText(line, "time") << "  " << entryText(line, "level") << "  "
+              << printableText(message) << '\n';
   });
 }
 
@@ -106,7 +108,7 @@ void showText(const std::string& content, bool inFull) {
     std::istringstream parts(line);
     const char* indentation = "  ";
     for (std::string part; std::getline(parts, part, ';');) {
-      fields.push_back(std::exchange(indentation, "    ") + part);
+      fields.push_back(std::exchange(indentation, "    ") + printableText(part));
     }
   }
   const std::size_t shown = inFull ? fields.size() : std::min(fields.size(), kShownFields);
@@ -119,7 +121,7 @@ void showText(const std::string& content, bool inFull) {
 }
 
 void showLog(const std::filesystem::path& file, bool inFull) {
-  std::cout << file.filename().string() << '\n';
+  std::cout << printableText(file.filename().string()) << '\n';
   std::string error;
   const std::optional<std::string> content = readWholeFile(file, error);
   if (!content) {
@@ -130,7 +132,7 @@ void showLog(const std::filesystem::path& file, bool inFull) {
   std::string headerError;
   if (const std::optional<std::string> text = readWholeFile(header, headerError)) {
     const std::optional<PropertyValue> value = valueFromJsonText(*text, headerError);
-    std::cout << "  header     " << (value ? textForm(*value) : headerError) << '\n';
+    std::cout << "  header     " << printableText(value ? textForm(*value) : headerError) << '\n';
   }
   if (file.extension() != ".ptree") {
     showText(*content, inFull);
@@ -140,7 +142,7 @@ void showLog(const std::filesystem::path& file, bool inFull) {
   if (log && log->dict() != nullptr) {
     showDailyLog(std::cout, *log->dict());
   } else {
-    std::cout << "  cannot be read: " << (log ? "not a dictionary" : error) << '\n';
+    std::cout << "  cannot be read: " << printableText(log ? "not a dictionary" : error) << '\n';
   }
 }
 

@@ -22,7 +22,8 @@ constexpr std::string_view kWhitelistFile = "Whitelist_Stagebox.ptree";
 void writeWhitelist(const DeviceDirectory& directory) {
   std::string document;
   std::string error;
-  const std::optional<PropertyValue> whitelist = valueFromJson(sampleData().at("whitelist"), error);
+  const std::optional<PropertyValue> whitelist =
+      valueFromJsonText(sampleData().at("whitelist").dump(), error);
   const auto folder = directory.makeFolder(kWhitelistFolder, error);
   if (!folder || !whitelist || !writePtree(*whitelist, document, error) ||
       !replaceFile(*folder + '/' + std::string(kWhitelistFile), document, error)) {

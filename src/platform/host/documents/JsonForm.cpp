@@ -148,53 +148,78 @@ std::optional<PropertyValue> untagged(PropertyDict dict, std::string& error) {
   return dict;
 }
 
-/// Builds the library's tree as its parser meets the parts: stricter than the library does, with
-/// the digits of integers still at hand, and without its search for each name among the earlier.
-class TreeBuilder final : public nlohmann::json_sax<Json> {
+/// Builds values as the library's parser meets the parts: stricter than the library's own tree, and
+/// with the digits of integers still at hand.
+class ValueBuilder final : public nlohmann::json_sax<Json> {
  public:
-  explicit TreeBuilder(std::string& error) : _error(error) {}
+  ValueBuilder(bool plain, std::string& error) : _plain(plain), _error(error) {}
 
-  Json takeResult() { return std::move(_result); }
+  /// Nothing when a part that is JSON has no value; the first such part is the error.
+  std::optional<PropertyValue> takeResult() {
+    if (!_valueError.empty()) {
+      _error = std::move(_valueError);
+      return std::nullopt;
+    }
+    return std::move(_result);
+  }
 
-  bool null() override { return add(nullptr); }
+  bool add(PropertyValue value) {
+    if (_open.empty()) {
+      _result = std::move(value);
+    } else if (Container& container = _open.back(); container.isObject) {
+      container.dict.set(container.name, std::move(value));
+    } else {
+      container.array.push_back(std::move(value));
+    }
+    return true;
+  }
+
+  bool null() override {
+    if (_plain) {
+      return add(Bytes{});
+    }
+    return addInvalid("null is no value");
+  }
   bool boolean(bool value) override { return add(value); }
   bool number_integer(number_integer_t value) override { return add(value); }
-  bool number_unsigned(number_unsigned_t value) override { return add(value); }
+  bool number_unsigned(number_unsigned_t value) override { return add(integerValue(value)); }
   bool number_float(number_float_t value, const std::string& text) override {
     if (text.find_first_of(".eE") == std::string::npos) {
       return fail("the integer " + text.substr(0, 40) + " does not fit 64 bits");
     }
     return add(value);
   }
-  bool string(std::string& value) override { return add(std::move(value)); }
+  bool string(std::string& value) override { return add(std::string_view(value)); }
   bool binary(Json::binary_t& /*value*/) override { return fail("binary data"); }
   bool start_object(std::size_t /*count*/) override { return open(true); }
   bool key(std::string& name) override {
-    _open.back().name = std::move(name);
+    Container& object = _open.back();
+    if (object.dict.contains(name) && (!object.twice || name < *object.twice)) {
+      object.twice = name;
+    }
+    object.name = std::move(name);
     return true;
   }
   bool end_object() override {
-    Container& container = _open.back();
-    std::vector<std::string_view> names;
-    names.reserve(container.entries.size());
-    for (const auto& entry : container.entries) {
-      names.emplace_back(entry.first);
-    }
-    std::sort(names.begin(), names.end());
-    if (const auto twice = std::adjacent_find(names.begin(), names.end()); twice != names.end()) {
-      container.name = *twice;
+    Container& object = _open.back();
+    if (object.twice) {
+      object.name = *std::move(object.twice);
       return fail("there twice");
     }
-    Json::object_t object;
-    static_cast<Entries&>(object) = std::move(container.entries);
+    PropertyDict dict = std::move(object.dict);
     _open.pop_back();
-    return add(std::move(object));
+    if (_plain) {
+      return add(std::move(dict));
+    }
+    std::string fault;
+    std::optional<PropertyValue> value = untagged(std::move(dict), fault);
+    return value ? add(*std::move(value)) : addInvalid(fault);
   }
   bool start_array(std::size_t /*count*/) override { return open(false); }
   bool end_array() override {
-    Json::array_t elements = std::move(_open.back().elements);
+    PropertyArray array = std::move(_open.back().array);
     _open.pop_back();
-    return add(std::move(elements));
+    return add(std::move(array));
   }
   bool parse_error(std::size_t /*position*/, const std::string& /*token*/,
                    const nlohmann::detail::exception& exception) override {
@@ -208,93 +233,80 @@ class TreeBuilder final : public nlohmann::json_sax<Json> {
   }
 
  private:
-  using Entries = std::vector<Json::object_t::value_type>;
   struct Container {
     bool isObject;
-    std::string name;
-    Entries entries;
-    Json::array_t elements;
+    std::string name{};
+    PropertyDict dict{};
+    PropertyArray array{};
+    std::optional<std::string> twice{};  ///< the first of the names that came again
   };
 
   bool open(bool isObject) {
     if (_open.size() == kMostNestedLevels) {
       return fail(kNestedTooDeeply);
     }
-    _open.push_back({isObject, {}, {}, {}});
+    _open.push_back({isObject});
     return true;
   }
 
-  bool add(Json value) {
-    if (_open.empty()) {
-      _result = std::move(value);
-    } else if (Container& container = _open.back(); container.isObject) {
-      container.entries.emplace_back(container.name, std::move(value));
-    } else {
-      container.elements.push_back(std::move(value));
+  /// Goes on, since what is no JSON further down is the error then.
+  bool addInvalid(const std::string& why) {
+    if (_valueError.empty()) {
+      _valueError = placed(why);
     }
-    return true;
+    return add(false);
   }
 
   bool fail(const std::string& message) {
+    _error = placed(message);
+    return false;
+  }
+
+  std::string placed(const std::string& message) const {
     NestedPlace place;
     for (auto container = _open.rbegin(); container != _open.rend(); ++container) {
       if (container->isObject) {
         place.addOuterKey(container->name);
       } else {
-        place.addOuterIndex(container->elements.size());
+        place.addOuterIndex(container->array.size());
       }
     }
-    _error = place.with(message);
-    return false;
+    return place.with(message);
   }
 
+  bool _plain;
   std::string& _error;
+  std::string _valueError;
   std::vector<Container> _open;
-  Json _result;
+  std::optional<PropertyValue> _result;
 };
 
-std::optional<PropertyValue> valueOf(const Json& json, NestedPlace& place, std::string& error) {
-  if (json.is_object()) {
-    PropertyDict dict;
-    for (const auto& [name, content] : json.get_ref<const Json::object_t&>()) {
-      std::optional<PropertyValue> value = valueOf(content, place, error);
-      if (!value) {
-        place.addOuterKey(name);
-        return std::nullopt;
-      }
-      dict.set(name, *std::move(value));
+std::optional<PropertyValue> read(std::string_view text, bool plain, std::string& error) {
+  ValueBuilder builder(plain, error);
+  return Json::sax_parse(text.begin(), text.end(), &builder) ? builder.takeResult() : std::nullopt;
+}
+
+/// Hands a plain value to a builder once more.
+void replay(const PropertyValue& plain, ValueBuilder& builder) {
+  if (const PropertyDict* dict = plain.dict()) {
+    builder.start_object(dict->size());
+    for (const auto& [name, content] : *dict) {
+      std::string copy = name;
+      builder.key(copy);
+      replay(content, builder);
     }
-    return untagged(std::move(dict), error);
-  }
-  if (json.is_array()) {
-    PropertyArray array;
-    for (const Json& content : json) {
-      std::optional<PropertyValue> value = valueOf(content, place, error);
-      if (!value) {
-        place.addOuterIndex(array.size());
-        return std::nullopt;
-      }
-      array.push_back(*std::move(value));
+    builder.end_object();
+  } else if (const PropertyArray* array = plain.array()) {
+    builder.start_array(array->size());
+    for (const PropertyValue& content : *array) {
+      replay(content, builder);
     }
-    return array;
+    builder.end_array();
+  } else if (plain.data() != nullptr) {
+    builder.null();
+  } else {
+    builder.add(plain);
   }
-  if (json.is_string()) {
-    return json.get_ref<const std::string&>();
-  }
-  if (json.is_boolean()) {
-    return json.get<bool>();
-  }
-  if (json.is_number_unsigned()) {
-    return integerValue(json.get<std::uint64_t>());
-  }
-  if (json.is_number_integer()) {
-    return json.get<std::int64_t>();
-  }
-  if (json.is_number_float()) {
-    return json.get<double>();
-  }
-  error = "null is no value";
-  return std::nullopt;
 }
 
 }  // namespace
@@ -303,25 +315,18 @@ std::string jsonText(const PropertyValue& value) { return textOf(jsonOf(value), 
 std::string jsonText(const PropertyDict& dict) { return textOf(jsonOf(dict), -1); }
 std::string indentedJsonText(const PropertyValue& value) { return textOf(jsonOf(value), 2); }
 
-std::optional<Json> jsonFromText(std::string_view text, std::string& error) {
-  TreeBuilder builder(error);
-  return Json::sax_parse(text.begin(), text.end(), &builder) ? std::optional(builder.takeResult())
-                                                             : std::nullopt;
+std::optional<PropertyValue> plainValueFromJsonText(std::string_view text, std::string& error) {
+  return read(text, true, error);
 }
 
-std::optional<PropertyValue> valueFromJson(const Json& json, std::string& error) {
-  NestedPlace place;
-  std::string fault;
-  std::optional<PropertyValue> value = valueOf(json, place, fault);
-  if (!value) {
-    error = place.with(fault);
-  }
-  return value;
+std::optional<PropertyValue> valueFromPlain(const PropertyValue& plain, std::string& error) {
+  ValueBuilder builder(false, error);
+  replay(plain, builder);
+  return builder.takeResult();
 }
 
 std::optional<PropertyValue> valueFromJsonText(std::string_view text, std::string& error) {
-  const std::optional<Json> json = jsonFromText(text, error);
-  return json ? valueFromJson(*json, error) : std::nullopt;
+  return read(text, false, error);
 }
 
 }  // namespace vesprun

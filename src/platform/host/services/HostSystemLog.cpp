@@ -6,6 +6,7 @@
 
 #include "common/Date.h"
 #include "platform/host/documents/JsonForm.h"
+#include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {
 namespace {
@@ -51,8 +52,12 @@ void HostSystemLog::write(LogLevel level, std::string_view message) {
   while (message.ends_with('\n')) {
     message.remove_suffix(1);
   }
-  std::fprintf(stderr, "vesprun: %.*s (not logged: %s)\n", static_cast<int>(message.size()),
-               message.data(), error.empty() ? "out of memory" : error.c_str());
+  try {
+    std::fprintf(stderr, "vesprun: %s (not logged: %s)\n", printableText(message).c_str(),
+                 error.empty() ? "out of memory" : printableText(error).c_str());
+  } catch (const std::exception&) {
+    std::fputs("vesprun: out of memory\n", stderr);
+  }
 }
 
 }  // namespace vesprun
