@@ -90,7 +90,10 @@ TEST(TaskingSync, AppliesUndoesAndKeepsByWhatIsStoredAndScheduled) {
     for (const std::string& file : kChanged) {
       device.store(file, json("{'old': 0}"));
     }
-    device.sync();
+    syncTaskingAndOSChange();
+    EXPECT_EQ(device.stored(kChanged[0]), json('{' + changedAfter + '}')) << "before the end";
+    EXPECT_EQ(device.stored(kOwn), sameBuildAnd(storedAfter)) << "before the end";
+    device.endProcess();
     EXPECT_EQ(device.stored(kOwn), sameBuildAnd(storedAfter));
     for (const std::string& file : kChanged) {
       EXPECT_EQ(device.stored(file), json('{' + changedAfter + '}')) << file;

@@ -329,8 +329,8 @@ struct FailingTallybook : Failing<Tallybook> {
   void TBClientAddValueForScalarKey(std::string_view key, std::int64_t value) override {
     sound(__func__).TBClientAddValueForScalarKey(key, value);
   }
-  std::unique_ptr<TBHistory> openHistory() override {
-    return std::make_unique<History>(sound(__func__).openHistory(), faults);
+  std::unique_ptr<TBHistory> initWithDefaultPath() override {
+    return std::make_unique<History>(sound(__func__).initWithDefaultPath(), faults);
   }
 };
 

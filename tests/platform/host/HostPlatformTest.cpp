@@ -3,6 +3,7 @@
 #include <fcntl.h>
 
 #include <cerrno>
+#include <fstream>
 #include <future>
 #include <stdexcept>
 #include <thread>
@@ -38,6 +39,40 @@ TEST(HostPlatform, LogKeepsLevelsDownToTheDescribedOne) {
             "{\"time\":\"2024-03-05T09:15:02.5Z\",\"level\":\"error\",\"message\":\"first 1\"}\n"
             "{\"time\":\"2024-03-05T09:15:02.5Z\",\"level\":\"notice\","
             "\"message\":\"a \\\"quoted\\\"\\nline \xC3\xA9\"}\n");
+}
+
+TEST(HostPlatform, SaysOnStandardErrorWhatTheLogCannotTake) {
+  TestDevice device(R"({"logLevel": "notice"})");
+  device.write("outbox", "a file in the way of the folder");
+  testing::internal::CaptureStderr();
+  logMessage(LogLevel::Notice, "first\nsecond\n\n");
+  logMessage(LogLevel::Info, "dropped");
+  EXPECT_THAT(testing::internal::GetCapturedStderr(),
+              testing::AllOf(testing::StartsWith("vesprun: first\nsecond (not logged: "),
+                             testing::EndsWith("outbox: Not a directory)\n")));
+}
+
+TEST(HostPlatform, IsLiveWhereNothingIsDescribed) {
+  setenv("LANGUAGE", "de_AT:x:zh_Hans.UTF-8", 1);
+  TestDevice device("{}");
+  EXPECT_THAT(platform().languages().preferredLanguages(),
+              testing::ElementsAre("de-AT", "x", "zh-Hans"));
+  unsetenv("LANGUAGE");
+
+  std::array<std::uint64_t, 4> swap{};
+  std::size_t length = 0;
+  const auto bytes = std::span(reinterpret_cast<std::uint8_t*>(swap.data()), sizeof swap);
+  ASSERT_EQ(platform().kernel().sysctlbyname("vm.swapusage", bytes, length), 0);
+  EXPECT_EQ(length, 32U);
+  const auto& [total, available, used, pageSize] = swap;
+  std::ifstream meminfo("/proc/meminfo");
+  std::uint64_t kilobytes = 1;
+  for (std::string name; meminfo >> name && name != "SwapTotal:";) {
+  }
+  meminfo >> kilobytes;
+  EXPECT_EQ(total, kilobytes * 1024);
+  EXPECT_EQ(used, total - available);
+  EXPECT_EQ(pageSize, platform().kernel().pageSize());
 }
 
 TEST(HostKernel, ReadsOnlyVariablesOfTheAskedWidth) {
