@@ -28,6 +28,11 @@ struct FailingClock : Failing<Clock> {
   }
 };
 
+struct FailingDailyWorkLock : Failing<DailyWorkLock> {
+  using Failing::Failing;
+  bool lock(double seconds) override { return !fails(__func__) && real.lock(seconds); }
+};
+
 /// The registry with the calls that a test can watch, but for what gives handles back.
 struct FailingRegistry : WatchedRegistry {
   FailingRegistry(DeviceRegistry& registry, Faults& operations)
@@ -88,6 +93,7 @@ struct FailingKernel : Failing<Kernel> {
     constexpr int kInputOutput = 5;
     return fails(__func__) ? kInputOutput : real.sysctlbyname(name, buffer, length);
   }
+  bool acknowledgeECCEvent() override { return !fails(__func__) && real.acknowledgeECCEvent(); }
   std::uint64_t pageSize() override { return sound(__func__).pageSize(); }
   std::uint64_t monotonicTicks() override { return sound(__func__).monotonicTicks(); }
   std::optional<TickRatio> tickRatio() override {
@@ -137,8 +143,8 @@ struct FailingLogsmith : Failing<Logsmith> {
   PropertyDict CopySystemVersionDictionary() override {
     return sound(__func__).CopySystemVersionDictionary();
   }
-  void FLLogStructuredData(std::int32_t type, const PropertyDict& record) override {
-    sound("FLLogStructuredData " + std::to_string(type)).FLLogStructuredData(type, record);
+  bool FLLogStructuredData(std::int32_t type, const PropertyDict& record) override {
+    return !fails(__func__) && real.FLLogStructuredData(type, record);
   }
   void FLDumpAllOldStructuredDataLogs() override {
     sound(__func__).FLDumpAllOldStructuredDataLogs();
@@ -257,6 +263,7 @@ struct FailingServicesClient : Failing<LGSServicesClient> {
                                        std::string_view domain) override {
     sound(__func__).deletePreferenceForUserInDomain(key, user, domain);
   }
+  void synchronizeAllUsers() override { sound(__func__).synchronizeAllUsers(); }
 };
 
 struct FailingSupportLibrary : Failing<SupportLibrary> {
@@ -295,13 +302,12 @@ struct FailingTallybook : Failing<Tallybook> {
   struct History : TBHistory {
     History(std::unique_ptr<TBHistory> history, Faults& operations)
         : real(std::move(history)), faults(operations) {}
-    void scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+    bool scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
         std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
         const ScalarRowHandler& rowHandler) override {
-      if (!faults.fails(__func__)) {
-        real->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(keyPrefix, minDay,
-                                                                            maxDay, rowHandler);
-      }
+      return !faults.fails(__func__) &&
+             real->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+                 keyPrefix, minDay, maxDay, rowHandler);
     }
     void distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
         std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
@@ -376,6 +382,7 @@ class FailingPlatform : public Platform {
   FailingPlatform(HostPlatform& real, Faults& operations) : host(real), faults(operations) {}
 
   Clock& clock() override { return _clock; }
+  DailyWorkLock& dailyWorkLock() override { return _dailyWorkLock; }
   DeviceRegistry& deviceRegistry() override { return _deviceRegistry; }
   DiagnosticHeader& diagnosticHeader() override { return _diagnosticHeader; }
   EventHub& eventHub() override { return _eventHub; }
@@ -406,6 +413,7 @@ class FailingPlatform : public Platform {
   HostPlatform& host;
   Faults& faults;
   FailingClock _clock{host.clock(), faults};
+  FailingDailyWorkLock _dailyWorkLock{host.dailyWorkLock(), faults};
   FailingRegistry _deviceRegistry{host.deviceRegistry(), faults};
   FailingDiagnosticHeader _diagnosticHeader{host.diagnosticHeader(), faults};
   FailingEventHub _eventHub{host.eventHub(), faults};

@@ -97,20 +97,20 @@ RegistryHandle FindServiceUsingIterator(const std::string& className) {
 
 RegistryHandle findNandExporter(nand_exporter_t*& exporter) {
   for (exporter = nand_exporters_tunnel.data(); exporter->name != nullptr; ++exporter) {
-    if (const RegistryHandle service =
-            platform().deviceRegistry().DevRegServiceGetMatchingService(exporter->name)) {
+    if (RegistryObject service{
+            platform().deviceRegistry().DevRegServiceGetMatchingService(exporter->name)}) {
       logMessage(LogLevel::Notice, "NANDInfo: findNandExporter: Controller found: %s\n",
                  exporter->name);
-      return service;
+      return service.take();
     }
   }
   std::fputs(
       "Failed to find matching service with DevRegServiceGetMatchingService, trying iterator...\n",
       stderr);
   for (exporter = nand_exporters_tunnel.data(); exporter->name != nullptr; ++exporter) {
-    if (const RegistryHandle service = FindServiceUsingIterator(exporter->name)) {
+    if (RegistryObject service{FindServiceUsingIterator(exporter->name)}) {
       logMessage(LogLevel::Notice, "Find service for class %s\n", exporter->name);
-      return service;
+      return service.take();
     }
   }
   return 0;
@@ -127,11 +127,11 @@ bool findNandExporterNew(nand_exporter_t*& exporter) {
     }
     RegistryHandle connection = 0;
     if (registry.DevRegServiceOpen(service.get(), connection) == kRegistrySuccess) {
-      logMessage(LogLevel::Notice, "NANDInfo: findNandExporterNew: Controller found: %s\n",
-                 entry->name);
       entry->connection = connection;
       entry->service = service.take();
       exporter = entry;
+      logMessage(LogLevel::Notice, "NANDInfo: findNandExporterNew: Controller found: %s\n",
+                 entry->name);
       return true;
     }
     registry.DevRegServiceClose(connection);

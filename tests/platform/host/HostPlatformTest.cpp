@@ -49,7 +49,7 @@ TEST(HostPlatform, SaysOnStandardErrorWhatTheLogCannotTake) {
   logMessage(LogLevel::Info, "dropped");
   EXPECT_THAT(testing::internal::GetCapturedStderr(),
               testing::AllOf(testing::StartsWith("vesprun: first\nsecond (not logged: "),
-                             testing::EndsWith("outbox: Not a directory)\n")));
+                             testing::EndsWith("outbox: File exists)\n")));
 }
 
 TEST(HostPlatform, IsLiveWhereNothingIsDescribed) {
