@@ -2,8 +2,9 @@
 
 #include <optional>
 
+#include "NANDInfo/CopyNANDInfo.h"
+#include "NANDInfo/VMFreezer.h"
 #include "NANDInfo/lists/StructuredLog.h"
-#include "NANDInfo/sets/NANDInfo.h"
 #include "driver/NANDInfoScalars.h"
 #include "platform/Guarded.h"
 #include "platform/Platform.h"
@@ -11,7 +12,6 @@
 #include "telemetry/DiskUsage.h"
 #include "telemetry/KernelECCEvents.h"
 #include "telemetry/ReportingChannels.h"
-#include "vesprun.h"
 
 namespace vesprun {
 namespace {

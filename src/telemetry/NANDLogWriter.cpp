@@ -8,13 +8,13 @@
 #include <optional>
 #include <utility>
 
-#include "NANDInfo/lists/StructuredLogState.h"
+#include "NANDInfo/CopyNANDInfo.h"
+#include "NANDInfo/StructuredLogState.h"
 #include "common/Date.h"
 #include "common/LittleEndian.h"
 #include "common/TextForm.h"
 #include "platform/DictionaryHelpers.h"
 #include "platform/Platform.h"
-#include "vesprun.h"
 
 namespace vesprun {
 namespace {

@@ -75,9 +75,6 @@ const std::string kSampleText =
 
 class DailyDriverTest : public ::testing::Test {
  protected:
-  DailyDriverTest() { startActiveAppInfoAfresh(); }
-  ~DailyDriverTest() override { startActiveAppInfoAfresh(); }
-
   static std::optional<PropertyValue> storedDay(TestDevice& device) {
     return device.platform().preferences().LGSPreferencesGetValue(kStoredDayKey, kService);
   }
@@ -223,7 +220,6 @@ TEST_F(DailyDriverTest, MessagesLeadToWhatTheirStateAllows) {
   };
   for (const auto& [messages, log] : kCases) {
     SCOPED_TRACE(textForm(PropertyArray(messages)));
-    startActiveAppInfoAfresh();
     DriverDevice device;
     runWithMessages(device, messages);
     EXPECT_THAT(device.log(), ElementsAreArray(log));

@@ -83,6 +83,15 @@ class PropertyDict {
       set(key, value);
     }
   }
+  void merge(PropertyDict&& other) {
+    if (empty()) {
+      std::swap(_entries, other._entries);
+    } else {
+      for (auto entry = other._entries.begin(); entry != other._entries.end(); ++entry) {
+        set(entry.key(), std::move(entry.value()));
+      }
+    }
+  }
   void clear() { _entries.clear(); }
   void reserve(std::size_t count) { _entries.reserve(count); }
 

@@ -50,16 +50,6 @@ constexpr nand_exporter_t withMSPStatistics(nand_exporter_t exporter) {
   return exporter;
 }
 
-void closeAndForget(RegistryHandle& connection, RegistryHandle& service) {
-  DeviceRegistry& registry = platform().deviceRegistry();
-  if (const RegistryHandle open = std::exchange(connection, 0)) {
-    registry.DevRegServiceClose(open);
-  }
-  if (const RegistryHandle held = std::exchange(service, 0)) {
-    registry.DevRegObjectRelease(held);
-  }
-}
-
 }  // namespace
 
 std::array<nand_exporter_t, 4> nand_exporters_tunnel{
@@ -146,32 +136,14 @@ void ReleaseIOInterfaces(nand_exporter_t& exporter) {
   closeAndForget(exporter.connection, exporter.service);
 }
 
-bool openORUConnection(ORUConnection& connection) {
-  connection.connection = 0;
-  connection.service = findNandExporter(connection.exporter);
-  if (connection.service == 0) {
-    std::fputs("Can't get ORU Connection, no matching service!\n", stderr);
-    closeORUConnection(connection);
-    return false;
+void closeAndForget(RegistryHandle& connection, RegistryHandle& service) {
+  DeviceRegistry& registry = platform().deviceRegistry();
+  if (const RegistryHandle open = std::exchange(connection, 0)) {
+    registry.DevRegServiceClose(open);
   }
-  nand_exporter_t& exporter = *connection.exporter;
-  const RegistryResult result =
-      platform().deviceRegistry().DevRegServiceOpen(connection.service, connection.connection);
-  exporter.connection = connection.connection;
-  if (result != kRegistrySuccess) {
-    std::fprintf(stderr, "DevRegServiceOpen failed for class '%s', result 0x%x\n", exporter.name,
-                 result);
+  if (const RegistryHandle held = std::exchange(service, 0)) {
+    registry.DevRegObjectRelease(held);
   }
-  if (exporter.getStatsSelectors == nullptr || connection.connection == 0) {
-    std::fputs("Can't get ORU Connection!\n", stderr);
-    closeORUConnection(connection);
-    return false;
-  }
-  return true;
-}
-
-void closeORUConnection(ORUConnection& connection) {
-  closeAndForget(connection.connection, connection.service);
 }
 
 }  // namespace vesprun

@@ -6,7 +6,6 @@
 #include <string>
 
 #include "platform/DeviceRegistry.h"
-#include "vesprun.h"
 
 namespace vesprun {
 
@@ -87,5 +86,8 @@ bool findNandExporterNew(nand_exporter_t*& exporter);
 
 /// Closes the entry's connection and releases its service, if any, and forgets them.
 void ReleaseIOInterfaces(nand_exporter_t& exporter);
+
+/// The same for handles that lie elsewhere.
+void closeAndForget(RegistryHandle& connection, RegistryHandle& service);
 
 }  // namespace vesprun

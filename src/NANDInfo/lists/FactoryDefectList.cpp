@@ -66,10 +66,10 @@ void log(const PropertyDict& record) {
 void logHeader(std::uint32_t factoryCount, const PropertyValue* properties) {
   PropertyDict record{{"Factory Count", signedNumber(factoryCount)}};
   const PropertyDict* characteristics = properties != nullptr ? properties->dict() : nullptr;
-  const PropertyValue* description =
-      characteristics != nullptr ? characteristics->find("nand-device-desc") : nullptr;
-  if (description != nullptr && description->number() != nullptr) {
-    record.set("com.quill.NANDInfo.nandDesc", description->number()->asInt32());
+  const Number* description =
+      characteristics != nullptr ? characteristics->findNumber("nand-device-desc") : nullptr;
+  if (description != nullptr) {
+    record.set("com.quill.NANDInfo.nandDesc", description->asInt32());
   }
   log(record);
 }

@@ -1,5 +1,6 @@
 #include "NANDInfo/controller/NandExporter.h"
 
+#include "NANDInfo/ORUConnection.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
 #include "support/ControllerTest.h"
 #include "support/WatchedRegistry.h"

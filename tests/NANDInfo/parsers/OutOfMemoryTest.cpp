@@ -1,7 +1,5 @@
-#include <cstdlib>
-#include <new>
-
 #include <gmock/gmock.h>
+#include <cstdint>
 
 #include "FieldsOf.h"
 #include "NANDInfo/lists/TelemetryList.h"
@@ -11,27 +9,7 @@
 #include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
 #include "buffers/DeviceBuffers.h"
-
-namespace {
-
-/// Larger allocations fail.
-std::size_t mostBytes = SIZE_MAX;
-
-}  // namespace
-
-void* operator new(std::size_t size) {
-  void* memory = size <= mostBytes ? std::malloc(size) : nullptr;
-  if (memory == nullptr) {
-    throw std::bad_alloc();
-  }
-  return memory;
-}
-void* operator new(std::size_t size, const std::nothrow_t& /*tag*/) noexcept {
-  return size <= mostBytes ? std::malloc(size) : nullptr;
-}
-void operator delete(void* memory) noexcept { std::free(memory); }
-void operator delete(void* memory, std::size_t /*size*/) noexcept { std::free(memory); }
-void operator delete(void* memory, const std::nothrow_t& /*tag*/) noexcept { std::free(memory); }
+#include "support/ScarceMemory.h"
 
 namespace vesprun {
 namespace {
@@ -40,9 +18,9 @@ namespace {
 template <typename Parse>
 auto whileScarce(std::size_t most, const Parse& parse) {
   forgetAPIErrorMessage();
-  mostBytes = most;
+  largestAllocation = most;
   const auto result = parse();
-  mostBytes = SIZE_MAX;
+  largestAllocation = SIZE_MAX;
   return result;
 }
 

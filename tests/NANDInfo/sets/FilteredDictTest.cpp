@@ -3,7 +3,6 @@
 #include <gtest/gtest.h>
 #include <limits>
 
-#include "NANDInfo/sets/SignificantDigits.h"
 
 namespace vesprun {
 namespace {

@@ -1,7 +1,8 @@
 #include <algorithm>
 
+#include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/ORUStatsContext.h"
-#include "NANDInfo/sets/NANDInfo.h"
+#include "NANDInfo/sets/StatisticsGathering.h"
 #include "buffers/DeviceBuffers.h"
 #include "support/ControllerTest.h"
 #include "support/WatchedRegistry.h"

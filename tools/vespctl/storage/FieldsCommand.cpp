@@ -69,7 +69,7 @@ std::vector<List> lists() {
       {"ftl-stats-for-msp", [] { printNames(FTLStats4MSPStats); }},
       {"magazine-accumulating", [] { printNames(PrivacyApprovedSMagNANDFTLCounters_Accum); }},
       {"magazine-dynamic", [] { printNames(PrivacyApprovedSMagNANDFTLCounters_Dynamic); }}};
-  for (const EventFields& event : EventHubConfigDetails) {
+  for (const StorageEvent& event : EventHubConfigDetails) {
     lists.push_back(
         {"event " + std::string(event.event), [table = event.fields] { printNames(*table); }});
   }

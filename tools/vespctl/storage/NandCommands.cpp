@@ -5,12 +5,10 @@
 
 #include "Command.h"
 #include "NANDInfo/controller/NandExporter.h"
-#include "NANDInfo/events/EventExtraction.h"
 #include "NANDInfo/lists/StructuredLog.h"
 #include "NANDInfo/lists/StructuredLogState.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/sets/HealthSets.h"
-#include "NANDInfo/sets/NANDInfo.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/files/FileDescriptor.h"
 #include "platform/host/files/SystemError.h"

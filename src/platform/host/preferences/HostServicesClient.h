@@ -10,6 +10,7 @@
 namespace vesprun {
 
 /// The preferences of each user as documents in var/USER/Library/Preferences.
+/// What is refused is reported once for each user and domain.
 class HostServicesClient final : public LGSServicesClient {
  public:
   /// What the references name must outlive the object.

@@ -1,11 +1,14 @@
 #pragma once
 
+#include <cstdint>
+
 #include "common/PropertyDict.h"
 
 namespace vesprun {
 
-// The steps of the event extraction that send the statistics of now, unrounded. Each result is what
-// the step sent: the payloads that the event service took in one dictionary, possibly none.
+// The steps of the event extraction that send storage statistics, unrounded. The result is what the
+// step sent: the payloads that the event service took in one dictionary, possibly none; or only
+// "com.quill.NANDInfo.ErrorMessage" when there was nothing to send.
 
 /// The event of FTL counters, then the two of FTL histograms.
 PropertyDict createAndLogFTLStatFieldsToEventHubForEvent();
@@ -17,5 +20,9 @@ PropertyDict createAndLogMSPFieldsToEventHubForEvent();
 
 /// The event of the storage statistics.
 PropertyDict createAndLogStorageStatsToEventHubForEvent();
+
+/// What the stats magazine holds of a period: of a day (view 0), with the history of
+/// `CopySMagNANDFTLCustomHistoryInfo`, of a week (1) or of a month (2).
+PropertyDict createAndLogSMagFTLFieldsToEventHubForEvent(std::uint32_t view);
 
 }  // namespace vesprun
