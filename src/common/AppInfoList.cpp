@@ -5,6 +5,8 @@
 #include <string_view>
 #include <utility>
 
+#include "common/HexText.h"
+
 namespace vesprun {
 namespace {
 
@@ -21,7 +23,6 @@ std::string appText(const PropertyDict& dict, std::string_view key) {
 }
 
 std::string appUUID(const PropertyDict& dict, std::string_view key) {
-  constexpr std::string_view kDigits = "0123456789ABCDEF";
   constexpr std::size_t kLength = 16;
   const PropertyValue* value = dict.find(key);
   const Bytes* bytes = value != nullptr ? value->data() : nullptr;
@@ -33,8 +34,7 @@ std::string appUUID(const PropertyDict& dict, std::string_view key) {
     if (i == 4 || i == 6 || i == 8 || i == 10) {
       text += '-';
     }
-    text += kDigits[(*bytes)[i] >> 4U];
-    text += kDigits[(*bytes)[i] & 0xFU];
+    appendHex(text, (*bytes)[i], kUpperHexDigits);
   }
   return text;
 }

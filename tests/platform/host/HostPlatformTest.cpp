@@ -3,6 +3,7 @@
 #include <fcntl.h>
 
 #include <cerrno>
+#include <fstream>
 #include <future>
 #include <stdexcept>
 #include <thread>
