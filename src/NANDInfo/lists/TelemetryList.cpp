@@ -160,7 +160,8 @@ PropertyDict busRecord(const std::uint8_t* busEntry, const NandChannelCounters& 
 
 bool LogNANDTelemetryList(std::span<const std::uint8_t> buffer,
                           const PropertyValue* characteristics, std::string_view /*className*/) {
-  const std::unique_ptr<NandChannelCounters> counters(new (std::nothrow) NandChannelCounters);
+  // One for all buses: a layout writes the same words each time.
+  const std::unique_ptr<NandChannelCounters> counters(new (std::nothrow) NandChannelCounters());
   if (!counters) {
     std::fprintf(stderr, "ERROR: Could not malloc %zu bytes\n", sizeof *counters);
     return false;
@@ -179,7 +180,6 @@ bool LogNANDTelemetryList(std::span<const std::uint8_t> buffer,
   }
   const std::uint8_t* busEntries = buffer.data() + busCount * kCounterRegionSize;
   for (std::size_t bus = 0; bus < busCount; ++bus) {
-    counters->fill(0);
     const auto region = buffer.subspan(bus * kCounterRegionSize).first<kCounterRegionSize>();
     read->layout.parse(region, *counters);
     platform().logsmith().FLLogStructuredData(

@@ -82,9 +82,13 @@ class GenericParserCxt {
 
  private:
   struct Entry {
-    std::size_t nameEnd;  ///< in `_names`; the name begins where the one before it ends
-    std::uint64_t value;
+    std::size_t nameEnd = 0;  ///< in `_names`; the name begins where the one before it ends
+    std::uint64_t value = 0;
   };
+
+  /// May leave a part of the array when it throws.
+  void appendAtOnce(std::string_view name, const std::uint8_t* source, std::size_t width,
+                    std::size_t count);
 
   std::string _names;
   std::vector<Entry> _entries;

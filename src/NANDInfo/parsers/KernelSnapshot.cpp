@@ -73,7 +73,8 @@ Items fromFirstContainer(Items items) {
   return item ? items : Items();
 }
 
-bool walk(Items snapshot, const char* threadName, std::optional<Items>& ioStatistics, Items* rest) {
+bool findThread(Items snapshot, const char* threadName, std::optional<Items>& ioStatistics,
+                Items* rest) {
   Items items = fromFirstContainer(snapshot);
   if (items.empty()) {
     return false;
@@ -123,7 +124,7 @@ bool getIOStatsWithThreadnameFromSnapData(Items snapshot, const char* threadName
 bool getIOStatsWithThreadnameFromSnapDataHelper(Items snapshot, const char* threadName,
                                                 std::optional<Items>& ioStatistics, Items* rest) {
   try {
-    return threadName != nullptr && walk(snapshot, threadName, ioStatistics, rest);
+    return threadName != nullptr && findThread(snapshot, threadName, ioStatistics, rest);
   } catch (const std::bad_alloc&) {  // nests deeper than memory holds
     return false;
   }

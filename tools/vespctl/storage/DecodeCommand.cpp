@@ -13,23 +13,26 @@
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
 #include "NANDInfo/parsers/VendorCounterParsers.h"
 #include "common/LittleEndian.h"
+#include "platform/host/documents/JsonForm.h"
 
 namespace vesprun {
 namespace {
 
 using Buffer = std::span<const std::uint8_t>;
 
-PropertyDict decoded(PropertyValue result, const GenericParserCxt& fields) {
-  PropertyArray pairs;
-  pairs.reserve(fields.size());
+/// Field by field: there can be a million. Names need no escape in JSON.
+void printFields(const PropertyValue& result, const GenericParserCxt& fields) {
+  std::cout << "{\"result\":" << jsonText(result)
+            << ",\"error\":" << jsonText(PropertyValue(GetAPIErrorMessage())) << ",\"fields\":[";
+  const char* separator = "";
   for (const GenericParserCxt::Field field : fields) {
-    pairs.emplace_back(PropertyArray{field.name, field.value});
+    std::cout << separator << "[\"" << field.name << "\"," << field.value << ']';
+    separator = ",";
   }
-  return {
-      {"result", std::move(result)}, {"error", GetAPIErrorMessage()}, {"fields", std::move(pairs)}};
+  std::cout << ']';
 }
 
-PropertyDict decodeBase(Buffer buffer) {
+void decodeBase(Buffer buffer) {
   ORUStatsContext ctx;
   const bool result = ORUParseBufferToCxt(ctx, buffer);
   PropertyDict summary;
@@ -41,28 +44,28 @@ PropertyDict decodeBase(Buffer buffer) {
   }
   summary.set("readCountHisto",
               PropertyArray(ctx.readCountHisto.begin(), ctx.readCountHisto.end()));
-  PropertyDict answer = decoded(result, ctx.fields);
-  answer.set("summary", std::move(summary));
-  return answer;
+  printFields(result, ctx.fields);
+  std::cout << ",\"summary\":" << jsonText(summary) << "}\n";
 }
 
 template <auto parse>
-PropertyDict decodeGeneric(Buffer buffer) {
+void decodeGeneric(Buffer buffer) {
   GenericParserCxt ctx;
   const std::uint32_t result = parse(ctx, buffer);
-  return decoded(result, ctx);
+  printFields(result, ctx);
+  std::cout << "}\n";
 }
 
 template <auto parse>
-PropertyDict decodeCounters(Buffer buffer) {
+void decodeCounters(Buffer buffer) {
   NandChannelCounters counters{};
   parse(buffer.first<kCounterRegionSize>(), counters);
-  return {{"words", PropertyArray(counters.begin(), counters.end())}};
+  printJson(PropertyDict{{"words", PropertyArray(counters.begin(), counters.end())}});
 }
 
 struct Layout {
   const char* name;
-  PropertyDict (*decode)(Buffer buffer);
+  void (*decode)(Buffer buffer);
   std::size_t size = 0;  ///< bytes that the file must have; 0: any number
 };
 
@@ -127,7 +130,7 @@ void decode(const Arguments& arguments) {
     throw CommandFailure(inputName(arguments.file) + ": has " + std::to_string(buffer.size()) +
                          " bytes, not " + std::to_string(layout->size));
   }
-  printJson(layout->decode(buffer));
+  layout->decode(buffer);
 }
 
 }  // namespace
