@@ -68,9 +68,8 @@ class Tallybook {
   /// Adds to a scalar of today, wrapping in 64 bits; a missing one counts as 0.
   virtual void TBClientAddValueForScalarKey(std::string_view key, std::int64_t value) = 0;
 
-  /// A history of the device's own database (`initWithDefaultPath`). It sees what the last
-  /// checkpoint wrote.
-  virtual std::unique_ptr<TBHistory> openHistory() = 0;
+  /// A history of the device's own database. It sees what the last checkpoint wrote.
+  virtual std::unique_ptr<TBHistory> initWithDefaultPath() = 0;
 };
 
 }  // namespace vesprun

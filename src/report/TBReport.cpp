@@ -8,9 +8,9 @@
 
 #include "config/KeyOptions.h"
 #include "platform/Platform.h"
+#include "report/DistributionStats.h"
 #include "report/Histogram.h"
 #include "report/RoundScalar.h"
-#include "report/RunningStatistics.h"
 
 namespace vesprun {
 namespace {
@@ -52,7 +52,7 @@ void TBReport::writeLogForYesterdayWithAppInfo(std::int32_t day, const AppInfoLi
 }
 
 void TBReport::readHistory(std::int32_t day) {
-  const std::unique_ptr<TBHistory> history = platform().tallybook().openHistory();
+  const std::unique_ptr<TBHistory> history = platform().tallybook().initWithDefaultPath();
   if (!history) {
     return;
   }
@@ -105,11 +105,11 @@ void TBReport::computeAndAddDistributionForKeyWithOptions(TBHistoryDistributionE
   if (read->intervals != nullptr) {
     histogram = allocateCounters(*read->intervals, key);
   }
-  RunningStatistics statistics;
+  DistributionStats statistics;
   double value = 0.0;
   if (histogram) {
     while (values.getNextValueSecondsInDayOffset(value, nullptr)) {
-      ++histogram->counts[histogram->boundaries.bucketFor(value)];
+      ++histogram->counts[determineHistBucketForValueWithIntervals(value, histogram->boundaries)];
       statistics.add(value);
     }
     if (std::optional<PropertyDict> dict =
@@ -123,7 +123,7 @@ void TBReport::computeAndAddDistributionForKeyWithOptions(TBHistoryDistributionE
       statistics.add(value);
     }
   }
-  _distributionsOutput.set(key, statistics.stats());
+  _distributionsOutput.set(key, statistics.toArray());
 }
 
 }  // namespace vesprun

@@ -1,5 +1,7 @@
 #include "config/TBConfig.h"
 
+#include <filesystem>
+
 #include "common/TextForm.h"
 #include "support/TestDevice.h"
 
@@ -100,6 +102,13 @@ TEST(TBConfig, FailsOnAnyFileThatIsNoWhitelist) {
     device.write(kPath, content);
     EXPECT_EQ(TBConfig::init(), nullptr);
     EXPECT_EQ(device.log().back(), kParseFailure + error);
+  }
+  // The first is read and fails later, the second is not even read; neither takes room on the disk.
+  for (const auto& [size, error] : {std::pair(256U << 20, "Couldn't parse"),
+                                    std::pair((256U << 20) + 1, "Couldn't load whitelist")}) {
+    std::filesystem::resize_file(device.path(kPath), size);
+    EXPECT_EQ(TBConfig::init(), nullptr);
+    EXPECT_THAT(device.log().back(), ::testing::HasSubstr(error));
   }
   const std::string whole = "<ptree version=\"1.0\"><dict/></ptree>";
   device.write(kPath, whole);

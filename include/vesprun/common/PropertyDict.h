@@ -47,6 +47,20 @@ class PropertyDict {
   }
   bool contains(std::string_view key) const { return find(key) != nullptr; }
 
+  // The same for one type: null too when the value is of another.
+  const PropertyDict* findDict(std::string_view key) const {
+    return find<PropertyDict>(key, &PropertyValue::dict);
+  }
+  const PropertyArray* findArray(std::string_view key) const {
+    return find(key, &PropertyValue::array);
+  }
+  const std::string* findString(std::string_view key) const {
+    return find(key, &PropertyValue::string);
+  }
+  const Number* findNumber(std::string_view key) const { return find(key, &PropertyValue::number); }
+  const Bytes* findData(std::string_view key) const { return find(key, &PropertyValue::data); }
+  const Date* findDate(std::string_view key) const { return find(key, &PropertyValue::date); }
+
   void set(std::string_view key, PropertyValue value) {
     // Most keys are new: one search finds that out and where they go.
     auto [entry, isNew] = _entries.try_emplace(std::string(key), std::move(value));
@@ -80,6 +94,12 @@ class PropertyDict {
   friend bool operator==(const PropertyDict& left, const PropertyDict& right);
 
  private:
+  template <typename T>
+  const T* find(std::string_view key, const T* (PropertyValue::*typed)() const) const {
+    const PropertyValue* value = find(key);
+    return value != nullptr ? (value->*typed)() : nullptr;
+  }
+
   Map _entries;
 };
 

@@ -12,7 +12,7 @@ namespace vesprun {
 ///
 /// The count is a signed 32-bit number and stops at its highest, 2^31 − 1: later values still count
 /// in everything else, with the weight of that one.
-class RunningStatistics {
+class DistributionStats {
  public:
   void add(double value) {
     if (_count == 0) {
@@ -31,9 +31,9 @@ class RunningStatistics {
     _squaredDeviations += deviation * (value - _mean);
   }
 
-  /// `DistributionStats`: minimum, maximum, mean, sum of squared deviations (not divided by the
-  /// count) as doubles, count as a signed 32-bit number.
-  PropertyArray stats() const { return {_minimum, _maximum, _mean, _squaredDeviations, _count}; }
+  /// Minimum, maximum, mean, sum of squared deviations (not divided by the count) as doubles, count
+  /// as a signed 32-bit number.
+  PropertyArray toArray() const { return {_minimum, _maximum, _mean, _squaredDeviations, _count}; }
 
  private:
   double _minimum = 0.0;
