@@ -397,8 +397,9 @@ TEST_F(TallybookTest, neverTakesAnErrorOfReadingForDamage) {
     {
       const FailingReads failing(number, 1'000'000);
       HostTallybook tallybook(device, clock, preferences, log);
-      tallybook.openHistory()->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
-          "", 0, kToday, [](std::string_view, std::int32_t, std::int64_t, bool&) {});
+      tallybook.initWithDefaultPath()
+          ->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+              "", 0, kToday, [](std::string_view, std::int32_t, std::int64_t, bool&) {});
       EXPECT_FALSE(tallybook.write(
           [&](CounterStore& store) {
             store.setScalar(kToday, "k", 1);
@@ -436,13 +437,14 @@ TEST_F(TallybookTest, noticesAChunkThatIsCutShort) {
     log.messages.clear();
     int count = 0;
     HostTallybook tallybook(device, clock, preferences, log);
-    tallybook.openHistory()->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
-        "", 0, kToday,
-        [&](std::string_view, std::int32_t, TBHistoryDistributionEnumerator& values, bool&) {
-          for (double value = 0; values.getNextValueSecondsInDayOffset(value, nullptr);) {
-            ++count;
-          }
-        });
+    tallybook.initWithDefaultPath()
+        ->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+            "", 0, kToday,
+            [&](std::string_view, std::int32_t, TBHistoryDistributionEnumerator& values, bool&) {
+              for (double value = 0; values.getNextValueSecondsInDayOffset(value, nullptr);) {
+                ++count;
+              }
+            });
     EXPECT_LT(count, 10'000);
     ASSERT_THAT(log.messages, SizeIs(2)) << change;
     EXPECT_THAT(log.messages[1], HasSubstr(std::string("a chunk of samples ") + cause));
