@@ -11,8 +11,8 @@ constexpr std::string_view kAppInstallsEvent = "com.quill.homeshell.appInstalls"
 }  // namespace
 
 void TBReport::addInstalledAppInfo() {
-  const PropertyDict* allAppsOptions = optionsForScalarKey(kAllAppsKey);
-  const PropertyDict* thirdPartyAppsOptions = optionsForScalarKey(kThirdPartyAppsKey);
+  const ScalarOptions* allAppsOptions = optionsForScalarKey(kAllAppsKey);
+  const ScalarOptions* thirdPartyAppsOptions = optionsForScalarKey(kThirdPartyAppsKey);
   EventHub& eventHub = platform().eventHub();
   if (allAppsOptions == nullptr && thirdPartyAppsOptions == nullptr &&
       !eventHub.EventHubIsEventUsed(kAppInstallsEvent)) {

@@ -41,7 +41,7 @@ std::optional<HistogramCounters> allocateCounters(const PropertyArray& intervals
 
 TBReport::TBReport() : _config(TBConfig::init()) {}
 
-const PropertyDict* TBReport::optionsForScalarKey(std::string_view key) const {
+const ScalarOptions* TBReport::optionsForScalarKey(std::string_view key) const {
   return _config ? _config->configOptionsForScalarKey(key) : nullptr;
 }
 
@@ -60,7 +60,7 @@ void TBReport::readHistory(std::int32_t day) {
   history->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
       "", firstDay, day,
       [this](std::string_view key, std::int32_t /*day*/, std::int64_t value, bool& /*stop*/) {
-        if (const PropertyDict* options = optionsForScalarKey(key)) {
+        if (const ScalarOptions* options = optionsForScalarKey(key)) {
           addScalarForKeyWithOptions(value, key, *options);
         }
       });
@@ -68,42 +68,33 @@ void TBReport::readHistory(std::int32_t day) {
       "", firstDay, day,
       [this](std::string_view key, std::int32_t /*day*/, TBHistoryDistributionEnumerator& values,
              bool& /*stop*/) {
-        if (const PropertyDict* options =
+        if (const DistributionOptions* options =
                 _config ? _config->configOptionsForDistributionKey(key) : nullptr) {
           computeAndAddDistributionForKeyWithOptions(values, key, *options);
         }
       });
 }
 
-std::optional<std::int64_t> TBReport::addScalarForKeyWithOptions(std::int64_t value,
-                                                                 std::string_view key,
-                                                                 const PropertyDict& options) {
-  const std::optional<ScalarOptions> read = readScalarOptions(options);
-  if (!read) {
-    return std::nullopt;
-  }
-  const std::int64_t rounded = roundScalar(value, *read);
+std::int64_t TBReport::addScalarForKeyWithOptions(std::int64_t value, std::string_view key,
+                                                  const ScalarOptions& options) {
+  const std::int64_t rounded = roundScalar(value, options);
   _scalarsOutput.set(key, rounded);
   return rounded;
 }
 
 void TBReport::addScalarForKeyByExecutingBlock(std::string_view key,
                                                const ScalarProducer& producer) {
-  if (const PropertyDict* options = optionsForScalarKey(key)) {
+  if (const ScalarOptions* options = optionsForScalarKey(key)) {
     addScalarForKeyWithOptions(producer(), key, *options);
   }
 }
 
 void TBReport::computeAndAddDistributionForKeyWithOptions(TBHistoryDistributionEnumerator& values,
                                                           std::string_view key,
-                                                          const PropertyDict& options) {
-  const std::optional<DistributionOptions> read = readDistributionOptions(options);
-  if (!read) {
-    return;
-  }
+                                                          const DistributionOptions& options) {
   std::optional<HistogramCounters> histogram;
-  if (read->intervals != nullptr) {
-    histogram = allocateCounters(*read->intervals, key);
+  if (options.intervals != nullptr) {
+    histogram = allocateCounters(*options.intervals, key);
   }
   DistributionStats statistics;
   double value = 0.0;
@@ -113,7 +104,7 @@ void TBReport::computeAndAddDistributionForKeyWithOptions(TBHistoryDistributionE
       statistics.add(value);
     }
     if (std::optional<PropertyDict> dict =
-            histogramDictForIntervalsWithHistCounts(*read->intervals, histogram->counts)) {
+            histogramDictForIntervalsWithHistCounts(*options.intervals, histogram->counts)) {
       _histogramsOutput.set(key, *std::move(dict));
     } else {
       _histogramsOutput.remove(key);

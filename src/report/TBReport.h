@@ -37,9 +37,8 @@ class TBReport {
   void serializeWithDateAndAppInfo(std::int32_t day, const AppInfoList* appInfo);
 
   /// Stores `value`, rounded as the options ask (`roundScalar`), and returns what was stored.
-  /// Nothing is stored or returned when the options cannot be read.
-  std::optional<std::int64_t> addScalarForKeyWithOptions(std::int64_t value, std::string_view key,
-                                                         const PropertyDict& options);
+  std::int64_t addScalarForKeyWithOptions(std::int64_t value, std::string_view key,
+                                          const ScalarOptions& options);
 
   /// Runs the producer and adds what it yields, only when the key is whitelisted.
   void addScalarForKeyByExecutingBlock(std::string_view key, const ScalarProducer& producer);
@@ -47,10 +46,10 @@ class TBReport {
   /// Goes once through the values and stores their statistics and, when the options name
   /// "intervals", their histogram; an empty histogram removes the key's earlier one. Memory is one
   /// counter and one boundary for each bucket. When there is none to be had, a log line says so and
-  /// the statistics are stored alone. Nothing is stored when the options cannot be read.
+  /// the statistics are stored alone.
   void computeAndAddDistributionForKeyWithOptions(TBHistoryDistributionEnumerator& values,
                                                   std::string_view key,
-                                                  const PropertyDict& options);
+                                                  const DistributionOptions& options);
 
   // The sources, in the order in which they run, each in a file of its own.
 
@@ -79,7 +78,7 @@ class TBReport {
   const PropertyDict& metadataOutput() const { return _metadataOutput; }
 
  private:
-  const PropertyDict* optionsForScalarKey(std::string_view key) const;
+  const ScalarOptions* optionsForScalarKey(std::string_view key) const;
   void readHistory(std::int32_t day);
   PropertyDict buildDocument(std::int32_t day, const AppInfoList* appInfo);
   void submit(const PropertyDict& document);
