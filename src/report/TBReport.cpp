@@ -6,10 +6,13 @@
 #include <utility>
 #include <vector>
 
-#include "config/KeyOptions.h"
 #include "platform/Platform.h"
+#include "platform/PreferenceNames.h"
 #include "report/DistributionStats.h"
 #include "report/Histogram.h"
+#include "report/KernelMemoryStatistics.h"
+#include "report/LogSubmission.h"
+#include "report/ReportSources.h"
 #include "report/RoundScalar.h"
 
 namespace vesprun {
@@ -37,6 +40,12 @@ std::optional<HistogramCounters> allocateCounters(const PropertyArray& intervals
   }
 }
 
+PropertyValue preferenceOr(std::string_view key, PropertyValue fallback) {
+  std::optional<PropertyValue> value =
+      platform().preferences().LGSPreferencesGetValue(key, kOwnDomain);
+  return value ? *std::move(value) : std::move(fallback);
+}
+
 }  // namespace
 
 TBReport::TBReport() : _config(TBConfig::init()) {}
@@ -49,6 +58,14 @@ void TBReport::writeLogForYesterdayWithAppInfo(std::int32_t day, const AppInfoLi
   logMessage(LogLevel::Info, "writing aggregated log. yesterday=%d", day);
   readHistory(day);
   serializeWithDateAndAppInfo(day, appInfo);
+}
+
+void TBReport::serializeWithDateAndAppInfo(std::int32_t day, const AppInfoList* appInfo) {
+  if (_scalarsOutput.empty() && _distributionsOutput.empty() && _histogramsOutput.empty()) {
+    return;
+  }
+  addOwnSources();
+  submitDailyLog(takeDocument(day, appInfo));
 }
 
 void TBReport::readHistory(std::int32_t day) {
@@ -73,6 +90,35 @@ void TBReport::readHistory(std::int32_t day) {
           computeAndAddDistributionForKeyWithOptions(values, key, *options);
         }
       });
+}
+
+void TBReport::addOwnSources() {
+  addInstalledAppInfo(*this);
+  addMetadataKeys(_metadataOutput);
+  reportDatabaseSize(*this);
+  reportCPUUptime(*this);
+  reportVMStats(*this);
+}
+
+PropertyDict TBReport::takeDocument(std::int32_t day, const AppInfoList* appInfo) {
+  const std::string whitelistDigest = _config ? _config->configFileDigest() : "";
+  _config.reset();
+  PropertyDict document;
+  document.set("TBCrashLogVersion", 1);
+  document.set("TBStartDate", platform().tallybook().dateForDaysSince1970(day));
+  document.set("TBLogCreationDate", platform().clock().now());
+  document.set("TBMetadata", std::exchange(_metadataOutput, {}));
+  document.set("TBScalars", std::exchange(_scalarsOutput, {}));
+  document.set("TBDistributions", std::exchange(_distributionsOutput, {}));
+  document.set("TBDistributionsHistogram", std::exchange(_histogramsOutput, {}));
+  document.set("TBTasking", preferenceOr(kTaskingPayloadKey, PropertyArray()));
+  document.set("TBTaskID", preferenceOr(kTaskingIDKey, "(no tasking id)"));
+  document.set("TBTaskDigest", preferenceOr(kTaskingDigestKey, "(no tasking digest)"));
+  document.set("TBWhitelistDigest", whitelistDigest);
+  if (appInfo != nullptr) {
+    document.set("TBActivatedAppInfo", *appInfo);
+  }
+  return document;
 }
 
 std::int64_t TBReport::addScalarForKeyWithOptions(std::int64_t value, std::string_view key,
