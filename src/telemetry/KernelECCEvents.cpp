@@ -6,7 +6,7 @@
 #include <span>
 #include <string>
 
-#include "common/LittleEndian.h"
+#include "NANDInfo/parsers/DictionaryHelpers.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
@@ -28,9 +28,9 @@ PropertyDict describe(const ECCEventRecord& event) {
   const std::uint8_t count = event[1];
   PropertyDict record{{"id", event[0]}, {"count", count}};
   for (std::size_t i = 0; i < std::min<std::size_t>(count, kMostRegisters); ++i) {
-    const std::uint8_t* content = event.data() + kFirstRegister + i * sizeof(std::uint64_t);
-    record.set("reg" + std::to_string(i),
-               static_cast<std::int64_t>(loadLittleEndian<std::uint64_t>(content)));
+    setNumberValueForType(record, "reg" + std::to_string(i),
+                          event.data() + kFirstRegister + i * sizeof(std::uint64_t),
+                          PVNumberType::Int64);
   }
   return record;
 }

@@ -2,7 +2,7 @@
 
 #include "NANDInfo/controller/NandExporter.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
-#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
+#include "buffers/DeviceBuffers.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
 #include "support/WatchedRegistry.h"
 

@@ -1,7 +1,7 @@
 #include "telemetry/DailyStorageAndDeviceStats.h"
 
+#include "buffers/DeviceBuffers.h"
 #include "support/ControllerTest.h"
-#include "support/SnapshotBuilder.h"
 #include "telemetry/TodaysScalars.h"
 
 namespace vesprun {

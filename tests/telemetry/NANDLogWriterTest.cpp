@@ -5,7 +5,7 @@
 #include <limits>
 
 #include "NANDInfo/lists/StructuredLogState.h"
-#include "support/ListBuffers.h"
+#include "buffers/DeviceBuffers.h"
 #include "support/TestDevice.h"
 
 namespace vesprun {

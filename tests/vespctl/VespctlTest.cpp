@@ -94,6 +94,31 @@ TEST_F(VespctlTest, SaysWhyItFailed) {
   }
 }
 
+TEST_F(VespctlTest, TakesNumbersAsDecimalOnes) {
+  for (const char* const number : {"0", "08", "18446744073709551615"}) {
+    EXPECT_EQ(run(std::string("nand \"$D\" magazine -- ") + number), 0) << error;
+  }
+  for (const char* const number : {"-- -1", "18446744073709551616", "0x8", "1 --mode 0x1",
+                                   "1 --mode=-1", "1 --mode 4294967296"}) {
+    EXPECT_EQ(run(std::string("nand \"$D\" magazine ") + number), 2) << number;
+    EXPECT_THAT(error, HasSubstr(" is not a number from 0 to ")) << number;
+  }
+}
+
+TEST_F(VespctlTest, DecodesAnEmptyBuffer) {
+  const std::pair<const char*, const char*> cases[] = {
+      {"base /dev/null",
+       R"({"result":false,"error":"NA","fields":[],"summary":{"exportVersion":0,)"},
+      {"ftl - </dev/null", R"({"result":0,"error":"NA","fields":[]})"},
+      {"msp /dev/null", R"({"result":0,"error":"ORUMSPParseBufferToCxt: Passed in invalid buffer)"},
+      {"snapshot --thread t /dev/null", R"({"found":false,"ioStatistics":null})"}};
+  for (const auto& [arguments, answer] : cases) {
+    EXPECT_EQ(run(std::string("decode ") + arguments), 0) << error;
+    EXPECT_THAT(output, StartsWith(answer));
+  }
+  EXPECT_EQ(run("decode base nowhere"), 1);
+}
+
 TEST_F(VespctlTest, TellsOfADamagedDatabase) {
   const char* const database = "device/var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
   const char* const kept = "is not a database; kept as ";

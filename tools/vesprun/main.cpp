@@ -25,6 +25,7 @@ void runOnDevice(std::span<const char* const> commandLine) {
 // The exit status is always 0: the system that starts the job does not look at it.
 int main(int argc, char** argv) {
   vesprun::holdStandardStreams();
+  vesprun::exitWithoutMemory("vesprun", 0);
   try {
     vesprun::runOnDevice({argv, argc > 0 ? static_cast<std::size_t>(argc) : 0});
   } catch (const std::exception& failure) {

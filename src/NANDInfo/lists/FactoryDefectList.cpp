@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cstdio>
 
+#include "NANDInfo/parsers/DictionaryHelpers.h"
 #include "common/LittleEndian.h"
 #include "platform/Platform.h"
 
@@ -74,14 +75,17 @@ void logHeader(std::uint32_t factoryCount, const PropertyValue* properties) {
 }
 
 void logDefect(const DefectRecord& defect, bool modeAdjustsReason) {
-  log({{"Bus", std::int32_t{defect.bus}},
-       {"CE", std::int32_t{defect.chipEnable}},
-       {"CAU", signedNumber(defect.cau)},
-       {"Block", signedNumber(defect.block)},
-       {"Cycle", signedNumber(defect.cycle)},
-       {"Reason", signedNumber(modeAdjustsReason ? defect.adjustedReason() : defect.reason)},
-       {"Page", signedNumber(defect.page)},
-       {"Temperature", defect.temperature}});
+  PropertyDict record{
+      {"Bus", std::int32_t{defect.bus}},
+      {"CE", std::int32_t{defect.chipEnable}},
+      {"CAU", signedNumber(defect.cau)},
+      {"Block", signedNumber(defect.block)},
+      {"Cycle", signedNumber(defect.cycle)},
+      {"Reason", signedNumber(modeAdjustsReason ? defect.adjustedReason() : defect.reason)},
+      {"Page", signedNumber(defect.page)},
+  };
+  setNumberValueForType(record, "Temperature", &defect.temperature, PVNumberType::Int8);
+  log(record);
 }
 
 }  // namespace

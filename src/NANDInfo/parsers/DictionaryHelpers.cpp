@@ -39,11 +39,6 @@ PropertyValue GetNumberFromDictionarySafe(const PropertyDict& dict, std::string_
   return value != nullptr ? *value : PropertyValue(std::int32_t{0});
 }
 
-PropertyValue GetStringFromDictionarySafe(const PropertyDict& dict, std::string_view key) {
-  const PropertyValue* value = dict.find(key);
-  return value != nullptr ? *value : PropertyValue("empty");
-}
-
 void setNumberValueForType(PropertyDict& dict, std::string_view key, const void* value,
                            PVNumberType kind) {
   if (const std::optional<Number> number = numberOf(value, kind)) {

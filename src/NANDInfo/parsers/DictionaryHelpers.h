@@ -13,9 +13,6 @@ enum class PVNumberType : std::uint32_t { Int8 = 1, Int64 = 4, Int = 9, Double =
 /// The value under `key`, or the 32-bit number 0 when there is none.
 PropertyValue GetNumberFromDictionarySafe(const PropertyDict& dict, std::string_view key);
 
-/// The value under `key`, of whatever type, or the string "empty" when there is none.
-PropertyValue GetStringFromDictionarySafe(const PropertyDict& dict, std::string_view key);
-
 /// Stores under `key` the number of kind `kind` that lies at `value`, aligned or not, replacing any
 /// earlier value. No number can be made of a null `value` or of another kind: that is logged, at
 /// level error, and the dictionary stays as it is.

@@ -51,7 +51,9 @@ Taken takeArray(GenericParserCxt& ctx, const ORUStatKey& key, const StatisticsRe
                        key.name.data(), key.id, key.count, static_cast<int>(header.count));
   }
   const std::uint32_t count = std::min<std::uint32_t>(header.count, key.count);
-  if (!append(ctx, std::string(key.name) + '_', payload, count)) {
+  std::array<char, GenericParserCxt::kMaxNameLength + 1> name;
+  std::snprintf(name.data(), name.size(), "%s_", key.name.data());
+  if (!append(ctx, name.data(), payload, count)) {
     SetAPIErrorMessage("ORUFTLParseBufferToCxt: %s(%d): Cannot add %d elements to context",
                        key.name.data(), key.id, key.count);
     return std::nullopt;

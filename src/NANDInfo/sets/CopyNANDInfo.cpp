@@ -5,6 +5,7 @@
 #include <utility>
 
 #include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/DictionaryHelpers.h"
 #include "NANDInfo/parsers/ORUStatsContext.h"
 #include "NANDInfo/sets/NANDInfo.h"
 #include "common/Date.h"
@@ -98,7 +99,9 @@ void DumpNANDInfo(PropertyDict& info) {
   nand_exporter_t* exporter = nullptr;
   ORUStatsContext context;
   if (GatherNANDStats(exporter, context)) {
-    info.merge(CreateNANDInfoDict(context, true));
+    for (const auto& [key, value] : CreateNANDInfoDict(context, true)) {
+      CopyDictionary(key, value, info);
+    }
     exporter->releaseStats(context);
   }
 }

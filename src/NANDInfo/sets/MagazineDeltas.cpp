@@ -5,6 +5,7 @@
 #include <string_view>
 
 #include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/DictionaryHelpers.h"
 #include "NANDInfo/sets/FieldNumber.h"
 #include "NANDInfo/sets/MagazineSnapshot.h"
 #include "NANDInfo/sets/NANDInfo.h"
@@ -91,9 +92,9 @@ PropertyDict CopySMagNANDFTLInfo(std::uint64_t hours, std::uint32_t deltaWanted,
   const std::optional<PropertyDict> newest = copyMagazineSnapshot(0);
   const std::optional<PropertyDict> old = copyMagazineSnapshot(hours);
   if (newest) {
-    const PropertyValue* isSupported = newest->find(kIsStatMagSupportedKey);
-    if (newest->contains(kMagazineMetaKey) && isSupported != nullptr) {
-      result.set(kIsStatMagSupportedKey, *isSupported);
+    if (newest->contains(kMagazineMetaKey)) {
+      result.set(kIsStatMagSupportedKey,
+                 GetNumberFromDictionarySafe(*newest, kIsStatMagSupportedKey));
     }
     if (old) {
       addDeltas(*newest, *old, deltaWanted != 0, mode, result);

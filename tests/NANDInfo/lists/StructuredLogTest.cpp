@@ -2,10 +2,9 @@
 
 #include "NANDInfo/controller/NandExporter.h"
 #include "NANDInfo/lists/StructuredLogState.h"
-#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
+#include "buffers/DeviceBuffers.h"
 #include "common/TextForm.h"
 #include "support/ControllerTest.h"
-#include "support/ListBuffers.h"
 #include "support/WatchedRegistry.h"
 
 namespace vesprun {

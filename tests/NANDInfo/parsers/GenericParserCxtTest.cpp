@@ -71,11 +71,9 @@ TEST(GenericParserCxt, keepsOrderAndRepeatsUntilReleased) {
 }
 
 TEST(DictionaryHelpers, fallBackAndKeepTheirKinds) {
-  PropertyDict dict{{"n", 7}, {"s", "text"}};
+  PropertyDict dict{{"n", 7}};
   EXPECT_EQ(GetNumberFromDictionarySafe(dict, "n"), PropertyValue(7));
   EXPECT_EQ(GetNumberFromDictionarySafe(dict, "no"), PropertyValue(0));
-  EXPECT_EQ(GetStringFromDictionarySafe(dict, "s"), PropertyValue("text"));
-  EXPECT_EQ(GetStringFromDictionarySafe(dict, "no"), PropertyValue("empty"));
 
   const std::int32_t minusTwo = -2;
   const double half = 0.5;
@@ -84,7 +82,7 @@ TEST(DictionaryHelpers, fallBackAndKeepTheirKinds) {
   setNumberValueForType(dict, "int", &minusTwo, PVNumberType::Int);
   appendNumberValueForType(array, &half, PVNumberType::Double);
   appendNumberValueForType(array, &half, PVNumberType::Int64);
-  EXPECT_EQ(dict, (PropertyDict{{"n", -2}, {"s", "text"}, {"int", -2}}));
+  EXPECT_EQ(dict, (PropertyDict{{"n", -2}, {"int", -2}}));
   EXPECT_EQ(dict.find("n")->number()->kind(), NumberKind::Int8);
   EXPECT_EQ(dict.find("int")->number()->kind(), NumberKind::Int32);
   EXPECT_EQ(array, (PropertyArray{0.5, std::int64_t{0x3FE0000000000000}}));

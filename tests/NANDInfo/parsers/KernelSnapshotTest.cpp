@@ -1,6 +1,6 @@
 #include "NANDInfo/parsers/KernelSnapshot.h"
 
-#include "support/SnapshotBuilder.h"
+#include "buffers/DeviceBuffers.h"
 
 namespace vesprun {
 namespace {
@@ -51,8 +51,14 @@ TEST(KernelSnapshot, findsTheThreadInTheFirstContainer) {
     EXPECT_EQ(look(each.first.bytes), each.second) << &each - cases;
   }
   EXPECT_EQ(look(B().thread(1, "VM_swapout", 7).bytes, nullptr), kAbsent);
-  const std::string name(70, 'n');  // 64 characters are compared
-  EXPECT_EQ(look(B().begin(1).name(name.substr(0, 64) + 'x').written(7).bytes, name.c_str()), 7);
+  // The first 64 bytes are compared, whether or not more follow.
+  const std::string same(63, 'n');
+  const std::pair<std::string, int> names[] = {
+      {same, 7}, {same + 'n', 7}, {same + "nx", 7}, {same + 'x', kAbsent}, {same + '\0', kAbsent}};
+  for (const auto& [name, expected] : names) {
+    EXPECT_EQ(look(B().begin(1).name(name).written(7).bytes, (same + "nnnn").c_str()), expected);
+  }
+  EXPECT_EQ(look(B().begin(1).name(same + 'n').written(7).bytes, (same + 'n').c_str()), 7);
 }
 
 TEST(KernelSnapshot, endsAtAnItemThatIsCutOff) {

@@ -3,7 +3,7 @@
 #include <map>
 #include <numeric>
 
-#include "support/ListBuffers.h"
+#include "buffers/DeviceBuffers.h"
 
 namespace vesprun {
 namespace {

@@ -1,8 +1,8 @@
 #include <algorithm>
 
 #include "NANDInfo/parsers/ORUStatsContext.h"
-#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
 #include "NANDInfo/sets/NANDInfo.h"
+#include "buffers/DeviceBuffers.h"
 #include "support/ControllerTest.h"
 #include "support/WatchedRegistry.h"
 

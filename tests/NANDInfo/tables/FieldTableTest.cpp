@@ -18,9 +18,7 @@ using Names = std::set<std::string, std::less<>>;
 
 constexpr auto kRanges = std::to_array<FieldRange>(
     {{1, "step10"}, {2, "step", 12, 14}, {3, "step_2b"}, {4, "step"}, {5, "step", 0, 3}, {6, "7"}});
-constexpr FieldIndex kIndex(kRanges);
-constexpr FieldTable kTable(kRanges, kIndex);
-static_assert(kTable.size() == 11);
+constexpr FieldTable kTable = fieldTable<kRanges, 11>();
 
 TEST(FieldTable, tellsNumbersAndTheirSpellingApart) {
   const std::pair<int, std::vector<const char*>> cases[] = {

@@ -10,6 +10,7 @@
 #include "NANDInfo/parsers/ORUFTLParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
+#include "NANDInfo/parsers/ORUStatKeyTable.h"
 #include "NANDInfo/parsers/VendorCounterParsers.h"
 #include "common/LittleEndian.h"
 
@@ -17,10 +18,6 @@ namespace vesprun {
 namespace {
 
 using Buffer = std::span<const std::uint8_t>;
-
-PropertyValue numbersOf(std::span<const std::uint64_t> numbers) {
-  return PropertyArray(numbers.begin(), numbers.end());
-}
 
 PropertyDict decoded(PropertyValue result, const GenericParserCxt& fields) {
   PropertyArray pairs;
@@ -35,27 +32,17 @@ PropertyDict decoded(PropertyValue result, const GenericParserCxt& fields) {
 PropertyDict decodeBase(Buffer buffer) {
   ORUStatsContext ctx;
   const bool result = ORUParseBufferToCxt(ctx, buffer);
+  PropertyDict summary;
+  for (const ORUSummaryField& field : kORUSummaryFields) {
+    summary.set(findORUStatKey(field.id)->name, field.get(ctx));
+    if (field.narrow == &ORUStatsContext::exportVersion) {
+      summary.set("driverVersion", ctx.driverVersion);
+    }
+  }
+  summary.set("readCountHisto",
+              PropertyArray(ctx.readCountHisto.begin(), ctx.readCountHisto.end()));
   PropertyDict answer = decoded(result, ctx.fields);
-  answer.set("summary",
-             PropertyDict{{"exportVersion", ctx.exportVersion},
-                          {"driverVersion", ctx.driverVersion},
-                          {"numVirtualBlocks", ctx.numVirtualBlocks},
-                          {"blocksPerVirtualBlock", ctx.blocksPerVirtualBlock},
-                          {"pagesPerVirtualBlock", ctx.pagesPerVirtualBlock},
-                          {"bytesPerPage", ctx.bytesPerPage},
-                          {"hostReads", ctx.hostReads},
-                          {"hostWrites", ctx.hostWrites},
-                          {"numFreeVirtualBlocks", ctx.numFreeVirtualBlocks},
-                          {"wearLevMoves", ctx.wearLevMoves},
-                          {"nandReads", ctx.nandReads},
-                          {"nandWrites", ctx.nandWrites},
-                          {"bandErases", ctx.bandErases},
-                          {"IND_pool_free", ctx.IND_pool_free},
-                          {"IND_pool_count", ctx.IND_pool_count},
-                          {"utilFormatTime", ctx.utilFormatTime},
-                          {"numSleepOps", ctx.numSleepOps},
-                          {"maxHighEnduranceBlockErases", ctx.maxHighEnduranceBlockErases},
-                          {"readCountHisto", numbersOf(ctx.readCountHisto)}});
+  answer.set("summary", std::move(summary));
   return answer;
 }
 
@@ -76,7 +63,7 @@ PropertyDict decodeCounters(Buffer buffer) {
 struct Layout {
   const char* name;
   PropertyDict (*decode)(Buffer buffer);
-  std::size_t size = 0;  ///< bytes that the file must have; 0: any number but none
+  std::size_t size = 0;  ///< bytes that the file must have; 0: any number
 };
 
 constexpr Layout kLayouts[] = {
@@ -131,9 +118,6 @@ void decode(const Arguments& arguments) {
     throw CLI::ValidationError("--thread", "goes with the layout snapshot, which needs it");
   }
   const std::string content = readInput(arguments.file);
-  if (content.empty()) {
-    throw CommandFailure(inputName(arguments.file) + ": is empty");
-  }
   const Buffer buffer(reinterpret_cast<const std::uint8_t*>(content.data()), content.size());
   if (isSnapshot) {
     printSnapshot(buffer, *arguments.thread);

@@ -41,11 +41,13 @@ HostTallybook::HostTallybook(const DeviceDirectory& directory, Clock& clock,
     : _clock(clock), _preferences(preferences), _log(log), _file(directory, clock, longestWait) {}
 
 HostTallybook::~HostTallybook() {
-  std::string error;
-  if (!flush(error)) {
-    _log.write(LogLevel::Error,
-               "changes of " + std::to_string(_pending.size()) + " counters are lost: " + error);
-  }
+  runGuarded(_log, [this] {
+    std::string error;
+    if (!flush(error)) {
+      _log.write(LogLevel::Error,
+                 "changes of " + std::to_string(_pending.size()) + " counters are lost: " + error);
+    }
+  });
 }
 
 std::int32_t HostTallybook::TBDaysSince1970() { return daysSince1970(_clock.now()); }
@@ -106,17 +108,28 @@ bool HostTallybook::flush(std::string& error) {
     }
     return true;
   };
-  if (write(apply, error)) {
-    return true;
+  // Without allocating: memory may just have run out.
+  const auto keepChanges = [&] {
+    const std::scoped_lock guard(_pendingMutex);
+    for (auto& [place, change] : changes) {
+      if (const auto later = _pending.find(place); later != _pending.end()) {
+        change = later->second.isSet
+                     ? later->second
+                     : PendingScalar{change.isSet, wrappingSum(change.value, later->second.value)};
+      }
+    }
+    changes.merge(_pending);
+    _pending.swap(changes);
+  };
+  try {
+    if (write(apply, error)) {
+      return true;
+    }
+  } catch (...) {
+    keepChanges();
+    throw;
   }
-  const std::scoped_lock guard(_pendingMutex);
-  // What came meanwhile is later than what could not be written.
-  for (const auto& [place, later] : _pending) {
-    PendingScalar& change = changes.try_emplace(place, PendingScalar{false, 0}).first->second;
-    change =
-        later.isSet ? later : PendingScalar{change.isSet, wrappingSum(change.value, later.value)};
-  }
-  _pending = std::move(changes);
+  keepChanges();
   return false;
 }
 

@@ -16,13 +16,15 @@
 namespace vesprun {
 
 PreferenceFile::PreferenceFile(const DeviceDirectory& device, Clock& clock, SystemLog& log,
-                               std::string folder, std::string_view domain)
+                               std::string folder, std::string_view domain,
+                               std::chrono::milliseconds longestWait)
     : _device(device),
       _clock(clock),
       _log(log),
       _folder(std::move(folder)),
       _name(std::string(domain) + ".ptree"),
-      _path(device.hostPath(_folder) + '/' + _name) {}
+      _path(device.hostPath(_folder) + '/' + _name),
+      _longestWait(longestWait) {}
 
 PreferenceFile::Content PreferenceFile::read() const {
   Content content;
@@ -114,7 +116,8 @@ bool PreferenceFile::writeChanges(std::string& error) {
   if (!folder) {
     return false;
   }
-  const std::optional<FolderLock> lock = FolderLock::take(*folder, error);
+  const std::optional<FolderLock> lock =
+      FolderLock::take(*folder, error, FolderLock::Kind::Exclusive, _longestWait);
   if (!lock) {
     return false;
   }

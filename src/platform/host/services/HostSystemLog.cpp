@@ -1,6 +1,7 @@
 #include "platform/host/services/HostSystemLog.h"
 
 #include <cstdio>
+#include <exception>
 #include <string>
 
 #include "common/Date.h"
@@ -37,13 +38,21 @@ void HostSystemLog::write(LogLevel level, std::string_view message) {
   if (!keeps(level)) {
     return;
   }
-  const PropertyDict line{
-      {"time", dateText(_clock.now())}, {"level", levelName(level)}, {"message", message}};
   std::string error;
-  if (!_directory.makeFolder("outbox", error) || !_lines.append(jsonText(line), error)) {
-    const std::string text(message);
-    std::fprintf(stderr, "vesprun: %s (not logged: %s)\n", text.c_str(), error.c_str());
+  try {
+    const PropertyDict line{
+        {"time", dateText(_clock.now())}, {"level", levelName(level)}, {"message", message}};
+    if (_directory.makeFolder("outbox", error) && _lines.append(jsonText(line), error)) {
+      return;
+    }
+  } catch (const std::exception&) {
+    error.clear();
   }
+  while (message.ends_with('\n')) {
+    message.remove_suffix(1);
+  }
+  std::fprintf(stderr, "vesprun: %.*s (not logged: %s)\n", static_cast<int>(message.size()),
+               message.data(), error.empty() ? "out of memory" : error.c_str());
 }
 
 }  // namespace vesprun

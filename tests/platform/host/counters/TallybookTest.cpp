@@ -14,8 +14,8 @@ namespace vesprun {
 namespace {
 
 using namespace std::string_literals;
-using ::testing::AnyOf, ::testing::ElementsAre, ::testing::HasSubstr, ::testing::IsEmpty,
-    ::testing::MatchesRegex, ::testing::SizeIs, ::testing::StartsWith;
+using ::testing::AnyOf, ::testing::Contains, ::testing::ElementsAre, ::testing::HasSubstr,
+    ::testing::IsEmpty, ::testing::MatchesRegex, ::testing::SizeIs, ::testing::StartsWith;
 
 constexpr const char* kFolder = "var/mobile/Library/Tallybook";
 constexpr const char* kFile = "var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
@@ -345,6 +345,143 @@ TEST_F(TallybookTest, movesForeignFilesAsideWithTheirJournals) {
   EXPECT_THAT(folder.names(kFolder).back(), MatchesRegex(".*\\.corrupt-.*-journal"));
   EXPECT_EQ(dump(), scalar(1));
   EXPECT_EQ(corruptions(), count);
+}
+
+/// Lets calls of `pread` by SQLite fail with EIO: those of the numbers `first` to `last`, from 1.
+class FailingReads {
+ public:
+  FailingReads(int first, int last) {
+    _number = 0;
+    _first = first;
+    _last = last;
+    _fileSystem->xSetSystemCall(_fileSystem, "pread64",
+                                reinterpret_cast<sqlite3_syscall_ptr>(&FailingReads::read));
+  }
+  ~FailingReads() { _fileSystem->xSetSystemCall(_fileSystem, "pread64", nullptr); }
+
+  static bool haveAllFailed() { return _number >= _last; }
+
+ private:
+  static ssize_t read(int file, void* bytes, std::size_t length, off_t offset) {
+    ++_number;
+    if (_number >= _first && _number <= _last) {
+      errno = EIO;
+      return -1;
+    }
+    return pread(file, bytes, length, offset);
+  }
+
+  sqlite3_vfs* _fileSystem = sqlite3_vfs_find("unix");
+  static inline int _number;
+  static inline int _first;
+  static inline int _last;
+};
+
+TEST_F(TallybookTest, neverTakesAnErrorOfReadingForDamage) {
+  std::string text;
+  for (int i = 0; i < 12'000; ++i) {
+    text += (i < 2000 ? "scalar\t19786\tkey" + std::to_string(i)
+                      : "sample\t19786\tkey" + std::to_string(i / 5000) + "\t1") +
+            "\t1\n";
+  }
+  ASSERT_TRUE(import(text));
+  text = dump();
+  bool isOver = false;
+  for (int number = 1; !isOver; ++number) {
+    {
+      const FailingReads failing(number, number);
+      EXPECT_EQ(dump(), text) << number;  // since it is read again
+      isOver = !FailingReads::haveAllFailed();
+    }
+    ASSERT_LT(number, 1000);
+    {
+      const FailingReads failing(number, 1'000'000);
+      HostTallybook tallybook(device, clock, preferences, log);
+      tallybook.openHistory()->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+          "", 0, kToday, [](std::string_view, std::int32_t, std::int64_t, bool&) {});
+      EXPECT_FALSE(tallybook.write(
+          [&](CounterStore& store) {
+            store.setScalar(kToday, "k", 1);
+            store.appendSamples(19786, "key2", {});
+            return false;
+          },
+          error));
+    }
+    EXPECT_EQ(dump(), text) << number;
+  }
+  EXPECT_THAT(log.messages, Contains(MatchesRegex("counters cannot be read: .*: disk I/O error, "
+                                                  "after [0-9]+ scalars up to \"key[0-9]*\" of "
+                                                  "day 19786")));
+  EXPECT_EQ(corruptions(), 0);
+}
+
+TEST_F(TallybookTest, noticesAChunkThatIsCutShort) {
+  std::string text;
+  for (int i = 0; i < 10'000; ++i) {
+    text += "sample\t19786\tk\t1\t1\n";
+  }
+  for (const auto& [change, cause] : std::vector<std::pair<const char*, const char*>>{
+           {"UPDATE chunk SET samples = substr(samples, 1, 100)", "has a wrong length"},
+           {"UPDATE chunk SET samples = substr(samples, 1, 800) WHERE sequence = 2",
+            "has a wrong length, after 8192 values of the last of 1 distributions up to \"k\""},
+           {"UPDATE chunk SET samples = x'', offsets = x'' WHERE sequence = 2",
+            "has a wrong length"},
+           {"UPDATE chunk SET samples = substr(samples, 1, 800), offsets = substr(offsets, 1, 400) "
+            "WHERE sequence = 0",
+            "is too short, after 100 values"},
+           {"DELETE FROM chunk WHERE sequence = 1", "is missing, after 4096 values"}}) {
+    unlink(folder.path(kFile).c_str());
+    ASSERT_TRUE(import(text));
+    SqliteConnection(folder.path(kFile), kShortWait).execute(change);
+    log.messages.clear();
+    int count = 0;
+    HostTallybook tallybook(device, clock, preferences, log);
+    tallybook.openHistory()->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+        "", 0, kToday,
+        [&](std::string_view, std::int32_t, TBHistoryDistributionEnumerator& values, bool&) {
+          for (double value = 0; values.getNextValueSecondsInDayOffset(value, nullptr);) {
+            ++count;
+          }
+        });
+    EXPECT_LT(count, 10'000);
+    ASSERT_THAT(log.messages, SizeIs(2)) << change;
+    EXPECT_THAT(log.messages[1], HasSubstr(std::string("a chunk of samples ") + cause));
+  }
+}
+
+TEST_F(TallybookTest, refusesPipesInPlaceOfItsFiles) {
+  add("k", 1);
+  for (const char* end : {"-journal", "-wal", "-shm"}) {
+    const std::string path = folder.path(kFile) + end;
+    ASSERT_EQ(mkfifo(path.c_str(), 0600), 0);
+    log.messages.clear();
+    add("k", 1);
+    EXPECT_THAT(log.messages, ElementsAre(HasSubstr(path + ": not a regular file")));
+    unlink(path.c_str());
+    EXPECT_EQ(dump(), scalar(1));
+  }
+}
+
+TEST_F(TallybookTest, keepsWhatItCollectedWhenMemoryRunsOut) {
+  class FailingPreferences final : public Preferences {
+    std::optional<PropertyValue> LGSPreferencesGetValue(std::string_view /*key*/,
+                                                        std::string_view /*domain*/) override {
+      throw std::bad_alloc();
+    }
+    void LGSPreferencesSetValue(std::optional<std::string_view> /*key*/,
+                                std::optional<PropertyValue> /*value*/,
+                                std::string_view /*domain*/) override {}
+    bool LGSPreferencesSynchronize(std::string_view /*domain*/) override { return true; }
+  } failing;
+  HostTallybook tallybook(device, clock, failing, log);
+  tallybook.TBClientAddValueForScalarKey("k", 1);
+  folder.write(kFile, "damaged");
+  EXPECT_THROW(tallybook.TBClientCheckpoint(), std::bad_alloc);
+  tallybook.TBClientAddValueForScalarKey("k", 1);
+  tallybook.TBClientCheckpoint();
+  EXPECT_EQ(dump(), scalar(2));
+  folder.write(kFile, "damaged");
+  HostTallybook(device, clock, failing, log).TBClientAddValueForScalarKey("k", 1);
 }
 
 TEST_F(TallybookTest, neverTakesALockForDamage) {

@@ -119,6 +119,20 @@ TEST_F(JsonLinesTest, endsATornLineAndMakesADeletedFileAnew) {
   EXPECT_EQ(folder.read("log.jsonl"), "{}\n");
 }
 
+TEST_F(JsonLinesTest, opensRegularFilesAloneAndKeepsThemToTheirOwner) {
+  folder.write("shared.jsonl", "");
+  chmod(folder.path("shared.jsonl").c_str(), 0666);
+  EXPECT_TRUE(JsonLines(folder.path("shared.jsonl")).append("{}", error)) << error;
+  EXPECT_EQ(modeOf("shared.jsonl"), mode_t{S_IFREG | 0600});
+  ASSERT_EQ(symlink("shared.jsonl", folder.path("link.jsonl").c_str()), 0);
+  EXPECT_FALSE(JsonLines(folder.path("link.jsonl")).append("{}", error));
+  EXPECT_EQ(error, folder.path("link.jsonl") + ": a symbolic link");
+  EXPECT_EQ(folder.read("shared.jsonl"), "{}\n");
+  ASSERT_EQ(mkfifo(folder.path("pipe.jsonl").c_str(), 0600), 0);
+  EXPECT_FALSE(JsonLines(folder.path("pipe.jsonl")).append("{}", error));
+  EXPECT_EQ(error, folder.path("pipe.jsonl") + ": not a regular file");
+}
+
 TEST_F(JsonLinesTest, takesBackALineThatDidNotFit) {
   JsonLines lines(folder.path("log.jsonl"));
   EXPECT_TRUE(lines.append("{}", error)) << error;

@@ -128,8 +128,44 @@ TEST_F(PreferencesTest, neverWriteOverWhatCannotBeRead) {
   EXPECT_THAT(folder.names(kFile), ElementsAre("inside"));
   unlink(folder.path(std::string(kFile) + "/inside").c_str());
   rmdir(folder.path(kFile).c_str());
+  ASSERT_EQ(symlink("a.ptree", folder.path(kFile).c_str()), 0);
+  EXPECT_FALSE(preferences.LGSPreferencesSynchronize("a"));
+  EXPECT_THAT(log.messages.back(), HasSubstr("a.ptree: Too many levels of symbolic links"));
+  EXPECT_EQ(modeOf(kFile) & S_IFMT, mode_t{S_IFLNK});
+  unlink(folder.path(kFile).c_str());
   EXPECT_TRUE(preferences.LGSPreferencesSynchronize("a"));  // the change has waited
   EXPECT_EQ(found(), (PropertyDict{{"first", 1}}));
+}
+
+TEST_F(PreferencesTest, areNotWrittenWhileAnotherProcessKeepsTheFolder) {
+  HostPreferences here(device, clock, log, "mobile", std::chrono::milliseconds(20));
+  folder.write(kFile, kOneKey);
+  here.LGSPreferencesSetValue("first", 2, "a");
+  {
+    const auto kept = FolderLock::take(folder.path(kFolder), error);
+    EXPECT_FALSE(here.LGSPreferencesSynchronize("a"));
+    EXPECT_THAT(log.messages,
+                ElementsAre(folder.path(kFolder) + ": another process keeps it locked"));
+    EXPECT_EQ(folder.read(kFile), kOneKey);
+  }
+  EXPECT_TRUE(here.LGSPreferencesSynchronize("a"));
+  EXPECT_EQ(found(), (PropertyDict{{"first", 2}}));
+}
+
+TEST_F(PreferencesTest, endWithoutAWordWhenNotEvenTheLogCanBeWritten) {
+  class FullLog final : public SystemLog {
+    bool keeps(LogLevel /*level*/) const override { return true; }
+    void write(LogLevel /*level*/, std::string_view /*message*/) override {
+      throw std::bad_alloc();
+    }
+  } full;
+  folder.write(std::string(kFile) + "/inside", "a folder in place of the document");
+  {
+    HostPreferences here(device, clock, full);
+    here.LGSPreferencesSetValue("first", 1, "a");
+    here.LGSPreferencesSetValue("first", 1, "b");
+  }
+  EXPECT_THAT(folder.names(kFolder), ElementsAre("a.ptree", "b.ptree"));
 }
 
 TEST_F(PreferencesTest, refuseNamesThatLeadElsewhereAndValuesThatNoDocumentCarries) {

@@ -158,12 +158,135 @@ constexpr auto kFTLDigitRanges = std::to_array<FieldRange>({
     {8, "wcacheDirtyAtFlush_", 0, 15}, {8, "wcacheWaitLogMs_", 0, 9}, {8, "wearLevMoves"},
     // clang-format on
 });
-constexpr FieldIndex kFTLDigitIndex(kFTLDigitRanges);
-static_assert(kFTLDigitIndex.fieldCount == 1447);
+
+constexpr auto kMSPDigitRanges = std::to_array<FieldRange>({
+    // clang-format off
+    {0, "HLT_APIErrorMessage"}, {2, "DYCE1_Decoded_Bitflips", 0, 14},
+    {2, "DYCE1_Target_Bitflips", 0, 19}, {2, "DYCE2_Decoded_Bitflips", 0, 14},
+    {2, "DYCE2_Target_Bitflips", 0, 19}, {2, "FS1decodedbitflips", 0, 10},
+    {2, "FS2decodedBitFlips", 0, 10}, {2, "active_time_bw_pg_hist", 0, 9},
+    {2, "active_time_hist", 0, 7}, {2, "auto_skip", 0, 4}, {2, "avg_rd_window_size", 0, 4},
+    {2, "bdbDefaultMoveFastToNormal"}, {2, "bdbDefaultMoveNormalToFast"},
+    {2, "bdbDynamicMovedToEOL_LSB"}, {2, "bdbDynamicMovedToEOL_MSB"},
+    {2, "bdbDynamicMovedToEOL_QSB"}, {2, "bdbDynamicMovedToEOL_USB"},
+    {2, "bdbDynamicMovedToSOL_LSB"}, {2, "bdbDynamicMovedToSOL_MSB"},
+    {2, "bdbDynamicMovedToSOL_QSB"}, {2, "bdbDynamicMovedToSOL_USB"},
+    {2, "boot_block_convert_to_main"}, {2, "boot_block_erase_failures"},
+    {2, "boot_block_program_failures"}, {2, "boot_block_read_failures"},
+    {2, "boot_block_read_source_changed"}, {2, "boot_block_read_verify_failures"},
+    {2, "boot_time_low_power", 0, 4}, {2, "boot_time_normal_power", 0, 4}, {2, "cbdr_outlier"},
+    {2, "cbdr_ref_", 1, 2}, {2, "cbdr_step_", 10, 79}, {2, "deepSoft1Decoded", 0, 9},
+    {2, "deepSoft2Decoded", 0, 9}, {2, "dspExceptionParameter", 115, 121},
+    {2, "dspExceptionParameter", 1000, 1003}, {2, "dspExceptionParameter", 1010, 1013},
+    {2, "dspExceptionParameter", 1020, 1023}, {2, "dspExceptionParameter", 1030, 1033},
+    {2, "dspExceptionParameter", 1040, 1043}, {2, "dspExceptionParameter", 1050, 1053},
+    {2, "dspExceptionParameter", 1060, 1063}, {2, "dspExceptionParameter", 1070, 1073},
+    {2, "dspExceptionParameter", 1080, 1083}, {2, "dspExceptionParameter", 1090, 1093},
+    {2, "dspExceptionParameter", 1100, 1103}, {2, "dspExceptionParameter", 1110, 1113},
+    {2, "dspExceptionParameter", 1120, 1123}, {2, "dspExceptionParameter", 1130, 1133},
+    {2, "dspExceptionParameter", 1140, 1149}, {2, "dspExceptionParameter", 1220, 1237},
+    {2, "dspExceptionParameter", 11410, 11419}, {2, "dspExceptionParameter", 12210, 12219},
+    {2, "e2e_error_count_tmode", 0, 4}, {2, "extended_rd_window_diff_dist", 0, 8},
+    {2, "external_etags_usage_hist", 0, 6}, {2, "firstReadWasFS2EOL"},
+    {2, "firstReadWasFS2EOL_DSP"}, {2, "firstReadWasHardWithAcq"},
+    {2, "firstReadWasHardWithDefaultBDB"}, {2, "firstReadWasHardWithDefaultBDBFastRead"},
+    {2, "gps_max_num_of_failures"}, {2, "higher_die_temperature", 0, 15},
+    {2, "initialReadStage", 100, 104}, {2, "initialReadStage", 200, 209},
+    {2, "initialReadStage", 211, 213}, {2, "initialReadStage", 2100, 2103},
+    {2, "internal_etags_usage_hist", 0, 3}, {2, "lower_die_temperature", 0, 15},
+    {2, "max_heap_usage"}, {2, "max_size_open_blocks_list"}, {2, "mdll_relative_offset", 0, 4},
+    {2, "msp_number_sram_flips"}, {2, "nandStageOfLife", 100, 104},
+    {2, "numOfCwFailedInTmodeFS2_DSP_EOL"}, {2, "numOfCwFailedInTmodeFS2_EOL"},
+    {2, "numOfSensesWereSentDuringMiniAcq", 0, 2}, {2, "numOfSensesWereSentDuringSyndSumAcq", 0, 4},
+    {2, "numOfSlipTracking"}, {2, "num_auto_program_cache_terminations"}, {2, "num_pg_regrets"},
+    {2, "num_zq_failures"}, {2, "number_gracefull_read_terminations"},
+    {2, "number_of_dcc_failures"}, {2, "number_of_dcc_pass_after_retry"},
+    {2, "number_of_read_cache_auto_terminations"}, {2, "number_of_reset_failures"},
+    {2, "number_of_throttling_events"}, {2, "open_blocks_hist", 0, 6}, {2, "passWithTmodeFS1_2b"},
+    {2, "passWithTmodeFS1_2b_fast"}, {2, "passWithTmodeFS1_4b"}, {2, "passWithTmodeFS1_4b_fast"},
+    {2, "passWithTmodeHard"}, {2, "passWithTmodeHard_fast"},
+    {2, "random_read_hit_ratio_hist", 0, 5}, {2, "random_read_size_ratio", 0, 4},
+    {2, "rd_retraining_failures", 0, 1}, {2, "rd_retraining_failures_v", 20, 21},
+    {2, "rd_window_dist", 0, 8}, {2, "readAlgoPassWithFS12BitAfterAcq"},
+    {2, "readAlgoPassWithFS12BitAfterSlip"}, {2, "readAlgoPassWithFS12BitAfterSlip_fast"},
+    {2, "readAlgoPassWithFS14BitAfterAcq"}, {2, "readAlgoPassWithFS14BitAfterSlip"},
+    {2, "readAlgoPassWithFS14BitAfterSlip_fast"}, {2, "readAlgoPassWithFS2_4b"},
+    {2, "readAlgoPassWithFS2_4b_fast"}, {2, "readAlgoPassWithFS3"}, {2, "readAlgoPassWithFS3_fast"},
+    {2, "readAlgoPassWithHardAfterAcq"}, {2, "readAlgoPassWithHardAfterSlip"},
+    {2, "readAlgoPassWithHardAfterSlip_fast"}, {2, "readAlgoPassedThroughDS", 1, 2},
+    {2, "readAlgoPassedThroughDS1_DSP"}, {2, "readAlgoPassedThroughFS2_2b"},
+    {2, "readAlgoPassedThroughFS2_2b_fast"}, {2, "readAlgoPassedThroughFS2_4b"},
+    {2, "readAlgoPassedThroughFS2_4b_fast"}, {2, "readAlgoPassedThroughFS3"},
+    {2, "readAlgoPassedThroughFS3_fast"}, {2, "readAlgoPassedThroughSlip"},
+    {2, "readAlgoPassedThroughSlip_fast"}, {2, "readAlgoPassedThroughSyndSumAcquisition"},
+    {2, "readAlgoPassedThroughSyndSumAcquisition_DSP"}, {2, "readErasedPage"}, {2, "readFail"},
+    {2, "readStage100"}, {2, "readStage", 102, 104}, {2, "readStage200"},
+    {2, "readStage", 203, 208}, {2, "readStage", 211, 215}, {2, "readStage", 1010, 1013},
+    {2, "readStage", 1050, 1053}, {2, "readStage", 1060, 1063}, {2, "readStage", 1070, 1073},
+    {2, "readStage", 1080, 1083}, {2, "readStage", 1090, 1093}, {2, "readStage", 1100, 1103},
+    {2, "readStage", 2010, 2013}, {2, "readStage", 2020, 2023}, {2, "readStage", 2090, 2093},
+    {2, "readStage", 2100, 2103}, {2, "readStageNumOfErrorsBin", 1000, 1009},
+    {2, "readStageNumOfErrorsBin", 10010, 10019}, {2, "readStageNumOfFails", 100, 101},
+    {2, "readStageNumOfFails", 200, 203}, {2, "readStageNumOfFails", 1020, 1023},
+    {2, "readStageNumOfFails", 1030, 1043}, {2, "readStageNumOfFails", 1050, 1053},
+    {2, "readStageNumOfFails", 1060, 1063}, {2, "readStageNumOfFails", 1070, 1073},
+    {2, "readStageNumOfFails", 1080, 1089}, {2, "readStageNumOfFails", 10310, 10363},
+    {2, "readStageNumOfFails", 10810, 10863}, {2, "readZeroPage"}, {2, "readalgoPassWithDS", 1, 2},
+    {2, "readalgoPassWithDS1_DSP"}, {2, "readalgoPassWithDYCE", 1, 2},
+    {2, "readalgoPassWithDYCE1_DSP"}, {2, "readalgoPassWithEXH"}, {2, "readalgoPassWithEXH_DSP"},
+    {2, "rom_num_hard_resets", 0, 5},
+    {2, "slipTrackingAfterFs1ForceFailChangedVthInTicksHist", 0, 3},
+    {2, "spi_image_cw_fetch_duration_hist", 0, 4}, {2, "spi_num_uses"},
+    {2, "syndSumAcqConvergedToStaticWalls"}, {2, "wr_retraining_failures", 0, 1},
+    {3, "active_time_bw_pg_max"}, {3, "active_time_bw_pg_min"}, {3, "fw_updates"},
+    {3, "gps_num_of_failures_max_overflow"}, {3, "link_speed_recoveries"},
+    {3, "maintenance_backup_to_main"}, {3, "maintenance_main_to_backup"},
+    {3, "number_of_sram_flips"}, {4, "HLT_APIErrorCode"}, {4, "boot_block_refresh"},
+    {4, "spi_image_cw_fetch_duration_acc"}, {4, "spi_image_overall_duration_acc"},
+    {5, "HLT_OR_Capacity_GB"}, {5, "HLT_averageTLCPECycles"}, {5, "HLT_formatWeeksSince2000"},
+    {5, "HLT_instantaneous_gc_wamp", 0, 5}, {5, "HLT_powerOnHours"}, {5, "HLT_powerOnSeconds"},
+    {6, "HLT_averageSLCPECycles"}, {6, "active_time_bw_pg_acc"}, {6, "device_config"},
+    {6, "num_pg_events"}, {8, "HLT_hostWrites"}, {20, "fw_version_identifier"},
+    // clang-format on
+});
+
+constexpr auto kStorageStatsDigitRanges = std::to_array<FieldRange>({
+    // clang-format off
+    {4, "EAN_updateCount_BIC"}, {4, "EAN_updateCount_FW"}, {4, "EAN_updateCount_LTH"},
+    {4, "EAN_updateCount_LowPowerEM"}, {4, "EAN_updateCount_NonEssentialFW"},
+    {4, "EAN_updateCount_dConfig"}, {4, "EAN_updateCount_fConfig"}, {4, "HLT_APIErrorCode"},
+    {4, "HLT_Diskfullness_BP"}, {4, "HLT_OR_Diskfullness_BP"}, {4, "HLT_SM_deltaDays"},
+    {5, "EAN_imageSize_BIC"}, {5, "EAN_imageSize_LTH"}, {5, "HLT_OR_Capacity_GB"},
+    {5, "HLT_averageTLCPECycles"}, {5, "HLT_formatWeeksSince2000"}, {5, "HLT_powerOnHours"},
+    {5, "HLT_powerOnSeconds"}, {6, "HLT_averageSLCPECycles"}, {8, "HLT_hostWrites"},
+    // clang-format on
+});
+
+constexpr auto kDerivedRanges = std::to_array<FieldRange>({
+    // clang-format off
+    "HLT_APIErrorMessage", "HLT_APIErrorCode", "HLT_OR_Diskfullness_BP", "HLT_OR_Capacity_GB",
+    "HLT_averageTLCPECycles", "HLT_averageSLCPECycles", "HLT_hostWrites",
+    "HLT_formatWeeksSince2000", "HLT_Reclaimer_totalPurgeable", "HLT_Reclaimer_totalNonPurgeable",
+    "HLT_mspBootBlockReadFails_main", "HLT_mspBootBlockReadFails_backup",
+    "HLT_mspBootBlockProgFails_main", "HLT_mspBootBlockProgFails_backup",
+    "HLT_mspBootBlockEraseFails_main", "HLT_mspBootBlockEraseFails_backup",
+    "HLT_numBootBlockRefreshes_max", "HLT_OR_AmountDataAvailable_MB", "HLT_Capacity_GB",
+    "HLT_Diskfullness_BP", "HLT_SM_deltaDays", "HLT_UserCapacity_MB", "HLT_powerOnHours",
+    "HLT_powerOnSeconds", {"HLT_instantaneous_gc_wamp_", 0, 5},
+    // clang-format on
+});
 
 }  // namespace
 
-constinit const FieldTable WhitelistedRawNANDFTLCounters_SigDigDict(kFTLDigitRanges,
-                                                                    kFTLDigitIndex);
+constinit const FieldTable WhitelistedRawNANDFTLCounters_SigDigDict =
+    fieldTable<kFTLDigitRanges, 1447>();
+
+constinit const FieldTable WhitelistedRawNANDMSPCounters_SigDigDict =
+    fieldTable<kMSPDigitRanges, 825>();
+
+constinit const FieldTable WhitelistedStorageStats_SigDigDict =
+    fieldTable<kStorageStatsDigitRanges, 20>();
+
+constinit const FieldTable FTLStats4MSPStats = fieldTable<kDerivedRanges, 30>();
 
 }  // namespace vesprun
