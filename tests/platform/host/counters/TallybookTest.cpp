@@ -397,7 +397,7 @@ TEST_F(TallybookTest, neverTakesAnErrorOfReadingForDamage) {
     {
       const FailingReads failing(number, 1'000'000);
       HostTallybook tallybook(device, clock, preferences, log);
-      tallybook.openHistory()->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+      tallybook.initWithDefaultPath()->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
           "", 0, kToday, [](std::string_view, std::int32_t, std::int64_t, bool&) {});
       EXPECT_FALSE(tallybook.write(
           [&](CounterStore& store) {
@@ -436,7 +436,7 @@ TEST_F(TallybookTest, noticesAChunkThatIsCutShort) {
     log.messages.clear();
     int count = 0;
     HostTallybook tallybook(device, clock, preferences, log);
-    tallybook.openHistory()->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+    tallybook.initWithDefaultPath()->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
         "", 0, kToday,
         [&](std::string_view, std::int32_t, TBHistoryDistributionEnumerator& values, bool&) {
           for (double value = 0; values.getNextValueSecondsInDayOffset(value, nullptr);) {
