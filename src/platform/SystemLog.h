@@ -2,6 +2,7 @@
 
 #include <cstdint>
 #include <exception>
+#include <string>
 #include <string_view>
 
 namespace vesprun {
@@ -21,15 +22,15 @@ class SystemLog {
   virtual void write(LogLevel level, std::string_view message) = 0;
 };
 
-/// Runs `work` and logs what it throws, such as memory running out: for destructors and threads,
-/// where it would end the process.
+/// Runs `work` and logs what it throws, such as memory running out, after "WHAT: ": for destructors
+/// and threads, where it would end the process.
 template <typename Work>
-void runGuarded(SystemLog& log, const Work& work) noexcept {
+void runGuarded(SystemLog& log, const char* what, const Work& work) noexcept {
   try {
     try {
       work();
     } catch (const std::exception& failure) {
-      log.write(LogLevel::Error, failure.what());
+      log.write(LogLevel::Error, std::string(what) + ": " + failure.what());
     }
   } catch (...) {  // not even the log can be written
   }

@@ -10,6 +10,7 @@
 #include "outbox/DailyLogView.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeReader.h"
+#include "platform/host/files/FolderNames.h"
 #include "platform/host/files/WholeFile.h"
 
 namespace vesprun {
@@ -145,22 +146,16 @@ void showLog(const std::filesystem::path& file, bool inFull) {
 
 void showLogs(const DeviceDirectory& directory, bool inFull) {
   const std::string folder = directory.hostPath("outbox/logs");
-  std::vector<std::filesystem::path> files;
-  std::error_code error;
-  for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
-       entry.increment(error)) {
-    const std::filesystem::path extension = entry->path().extension();
-    if (entry->path().filename().string().front() != '.' &&
-        (extension == ".ptree" || extension == ".log")) {
-      files.push_back(entry->path());
+  std::string error;
+  const std::optional<std::vector<std::string>> names = namesInFolder(folder, error);
+  if (!names) {
+    throw CommandFailure(error);
+  }
+  for (const std::string& name : *names) {
+    const std::filesystem::path file = folder + '/' + name;
+    if (name.front() != '.' && (file.extension() == ".ptree" || file.extension() == ".log")) {
+      showLog(file, inFull);
     }
-  }
-  if (error && error != std::errc::no_such_file_or_directory) {
-    throw CommandFailure(folder + ": " + error.message());
-  }
-  std::sort(files.begin(), files.end());
-  for (const std::filesystem::path& file : files) {
-    showLog(file, inFull);
   }
 }
 

@@ -41,7 +41,7 @@ HostTallybook::HostTallybook(const DeviceDirectory& directory, Clock& clock,
     : _clock(clock), _preferences(preferences), _log(log), _file(directory, clock, longestWait) {}
 
 HostTallybook::~HostTallybook() {
-  runGuarded(_log, [this] {
+  runGuarded(_log, "counters", [this] {
     std::string error;
     if (!flush(error)) {
       _log.write(LogLevel::Error,
@@ -133,7 +133,9 @@ bool HostTallybook::flush(std::string& error) {
   return false;
 }
 
-std::unique_ptr<TBHistory> HostTallybook::initWithDefaultPath() { return std::make_unique<History>(*this); }
+std::unique_ptr<TBHistory> HostTallybook::initWithDefaultPath() {
+  return std::make_unique<History>(*this);
+}
 
 bool HostTallybook::write(const std::function<bool(CounterStore&)>& work, std::string& error) {
   std::optional<CounterFile::Damage> damage;

@@ -114,8 +114,9 @@ std::int64_t SqliteConnection::queryInteger(const char* sql) {
 
 void SqliteConnection::commit() {
   const int result = sqlite3_exec(handle(), "COMMIT", nullptr, nullptr, nullptr);
-  // The journal is gone by then, and with it the way back.
-  if (result != SQLITE_OK && result != SQLITE_IOERR_DIR_FSYNC) {
+  // When these fail the journal is gone, and with it the way back.
+  if (result != SQLITE_OK && result != SQLITE_IOERR_DIR_FSYNC && result != SQLITE_IOERR_UNLOCK &&
+      result != SQLITE_IOERR_RDLOCK) {
     fail(result);
   }
 }

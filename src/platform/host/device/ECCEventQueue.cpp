@@ -2,45 +2,32 @@
 
 #include <unistd.h>
 
-#include <algorithm>
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
-#include <filesystem>
 #include <optional>
-#include <system_error>
+#include <string>
 #include <vector>
 
+#include "platform/host/files/FolderNames.h"
 #include "platform/host/files/SystemError.h"
 #include "platform/host/files/WholeFile.h"
 
 namespace vesprun {
-namespace {
-
-std::vector<std::string> eventFiles(const std::string& folder, std::error_code& error) {
-  std::vector<std::string> files;
-  for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
-       entry.increment(error)) {
-    if (entry->path().extension() == ".bin") {
-      files.push_back(entry->path());
-    }
-  }
-  std::sort(files.begin(), files.end());
-  return files;
-}
-
-}  // namespace
 
 int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length) {
   const std::string folder = _directory.hostPath("kernel/ecc");
-  std::error_code failure;
-  const std::vector<std::string> files = eventFiles(folder, failure);
-  if (failure && failure != std::errc::no_such_file_or_directory) {
-    _log.write(LogLevel::Error, folder + ": " + failure.message());
+  std::string error;
+  const std::optional<std::vector<std::string>> names = namesInFolder(folder, error);
+  if (!names) {
+    _log.write(LogLevel::Error, error);
     return EIO;
   }
-  for (const std::string& path : files) {
-    std::string error;
+  for (const std::string& name : *names) {
+    if (!name.ends_with(".bin") || name == ".bin") {
+      continue;
+    }
+    const std::string path = folder + '/' + name;
     bool missing = false;
     const std::optional<std::string> event = readWholeFile(path, error, &missing);
     if (missing) {

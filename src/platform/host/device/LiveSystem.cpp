@@ -17,6 +17,7 @@
 #include <utility>
 
 #include "common/LittleEndian.h"
+#include "platform/host/files/FolderNames.h"
 
 namespace vesprun::live {
 namespace {
@@ -85,17 +86,13 @@ std::optional<LocaleName> processLocale(const char* category) {
 
 void appendDesktopEntries(const std::filesystem::path& folder, bool user,
                           std::vector<ApplicationDescription>& applications) {
-  std::error_code error;
-  std::vector<std::string> bundles;
-  for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
-       entry.increment(error)) {
-    if (entry->path().extension() == ".desktop") {
-      bundles.push_back(entry->path().stem());
+  std::string error;
+  for (const std::string& name :
+       namesInFolder(folder, error).value_or(std::vector<std::string>())) {
+    const std::filesystem::path file(name);
+    if (file.extension() == ".desktop") {
+      applications.push_back({file.stem(), user});
     }
-  }
-  std::sort(bundles.begin(), bundles.end());
-  for (std::string& bundle : bundles) {
-    applications.push_back({std::move(bundle), user});
   }
 }
 
@@ -195,10 +192,10 @@ std::vector<std::string> preferredLanguages() {
 
 std::vector<std::string> localizations() {
   std::vector<std::string> languages;
-  std::error_code error;
-  for (std::filesystem::directory_iterator entry("/usr/share/locale", error), end;
-       !error && entry != end; entry.increment(error)) {
-    if (const auto locale = parseLocaleName(entry->path().filename().string())) {
+  std::string error;
+  for (const std::string& name :
+       namesInFolder("/usr/share/locale", error).value_or(std::vector<std::string>())) {
+    if (const auto locale = parseLocaleName(name)) {
       languages.push_back(languageTag(*locale));
     }
   }

@@ -30,7 +30,7 @@ HostPreferences::HostPreferences(const DeviceDirectory& device, Clock& clock, Sy
 
 HostPreferences::~HostPreferences() {
   for (auto& [domain, file] : _files) {
-    runGuarded(_log, [&changed = file] { changed.synchronize(); });
+    runGuarded(_log, "preferences", [&changed = file] { changed.synchronize(); });
   }
 }
 

@@ -9,6 +9,7 @@
 #include "platform/host/documents/PtreeReader.h"
 #include "platform/host/documents/PtreeWriter.h"
 #include "platform/host/files/AtomicFile.h"
+#include "platform/host/files/FileLock.h"
 #include "platform/host/files/NameAside.h"
 #include "platform/host/files/SystemError.h"
 #include "platform/host/files/WholeFile.h"
@@ -147,7 +148,7 @@ bool PreferenceFile::writeChanges(std::string& error) {
     return false;
   }
   file->append(document);  // a failure is told by `replace`
-  return file->replace(_name, error, &*lock);
+  return file->replace(_name, error);
 }
 
 bool PreferenceFile::keepAside(std::string& error) const {

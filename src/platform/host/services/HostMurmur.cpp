@@ -55,7 +55,7 @@ class HostMurmur::Replies {
         return;
       }
     }
-    runGuarded(_log, [&] { handler(&usage.records); });
+    runGuarded(_log, "usage feed", [&] { handler(&usage.records); });
   }
 
   const AnswerDescription<UsageDescription>& _description;

@@ -6,7 +6,7 @@
 #include "platform/host/messages/HostMessageService.h"
 #include "platform/host/messages/MessageFraming.h"
 #include "platform/host/messages/ServiceSocket.h"
-#include "platform/host/services/HostPtreeSerialization.h"
+#include "platform/host/services/ForwardingServices.h"
 #include "support/HostServiceTest.h"
 
 namespace vesprun {
