@@ -4,6 +4,7 @@
 #include <utility>
 #include <vector>
 
+#include "common/TextForm.h"
 #include "config/InternalDevice.h"
 #include "platform/Platform.h"
 
@@ -20,16 +21,6 @@ std::optional<std::string> readWhitelist() {
     return std::nullopt;
   }
   return fileSystem.readFile(kWhitelistPath);
-}
-
-std::string hexadecimalDigest(std::string_view bytes) {
-  static constexpr std::string_view kDigits = "0123456789abcdef";
-  std::string text;
-  for (const std::uint8_t byte : platform().messageDigest().md5(bytes)) {
-    text += kDigits[byte >> 4];
-    text += kDigits[byte & 15];
-  }
-  return text;
 }
 
 template <typename Options>
@@ -114,7 +105,7 @@ std::unique_ptr<TBConfig> TBConfig::init() {
 }
 
 std::unique_ptr<TBConfig> TBConfig::fromBytes(std::string_view bytes) {
-  std::string digest = hexadecimalDigest(bytes);
+  std::string digest = hexadecimalText(platform().messageDigest().md5(bytes));
   std::string error;
   std::optional<PropertyValue> root = platform().ptreeSerialization().parse(bytes, error);
   if (!root || root->dict() == nullptr) {
