@@ -6,7 +6,7 @@
 #include <cstdlib>
 #include <string_view>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 
 namespace vesprun {
 namespace {

@@ -7,7 +7,7 @@
 #include <string>
 #include <utility>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/Platform.h"
 
 namespace vesprun {

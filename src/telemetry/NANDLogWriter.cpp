@@ -11,7 +11,7 @@
 #include "NANDInfo/lists/StructuredLogState.h"
 #include "NANDInfo/parsers/DictionaryHelpers.h"
 #include "NANDInfo/sets/NANDInfo.h"
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "common/LittleEndian.h"
 #include "common/TextForm.h"
 #include "platform/Platform.h"

@@ -8,7 +8,7 @@
 #include <variant>
 #include <vector>
 
-#include "Instant.h"
+#include "Date.h"
 #include "Number.h"
 
 namespace vesprun {

@@ -8,7 +8,7 @@
 #include "NANDInfo/parsers/DictionaryHelpers.h"
 #include "NANDInfo/parsers/ORUStatsContext.h"
 #include "NANDInfo/sets/NANDInfo.h"
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/Platform.h"
 
 namespace vesprun {

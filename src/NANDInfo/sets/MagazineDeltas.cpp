@@ -11,7 +11,7 @@
 #include "NANDInfo/sets/NANDInfo.h"
 #include "NANDInfo/sets/StorageHealthFields.h"
 #include "NANDInfo/tables/MagazineFields.h"
-#include "common/Date.h"
+#include "common/Calendar.h"
 
 namespace vesprun {
 namespace {

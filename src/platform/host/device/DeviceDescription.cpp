@@ -6,7 +6,7 @@
 #include <nlohmann/json.hpp>
 #include <string_view>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/host/documents/JsonForm.h"
 
 namespace vesprun {

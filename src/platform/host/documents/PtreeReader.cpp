@@ -6,7 +6,7 @@
 #include <pugixml.hpp>
 #include <utility>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/host/documents/Base64.h"
 #include "platform/host/documents/PtreeSyntax.h"
 #include "platform/host/documents/QuotedText.h"

@@ -1,4 +1,4 @@
-#include "common/Date.h"
+#include "common/Calendar.h"
 
 #include <algorithm>
 #include <chrono>
