@@ -5,7 +5,7 @@
 #include <memory>
 #include <string_view>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 
 namespace vesprun {
 

@@ -9,7 +9,7 @@
 #include <utility>
 #include <vector>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/Platform.h"
 
 namespace vesprun {

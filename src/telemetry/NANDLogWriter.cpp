@@ -10,7 +10,7 @@
 
 #include "NANDInfo/CopyNANDInfo.h"
 #include "NANDInfo/StructuredLogState.h"
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "common/LittleEndian.h"
 #include "common/TextForm.h"
 #include "platform/DictionaryHelpers.h"

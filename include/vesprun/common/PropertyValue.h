@@ -7,7 +7,7 @@
 #include <utility>
 #include <vector>
 
-#include "Instant.h"
+#include "Date.h"
 #include "Number.h"
 
 namespace vesprun {

@@ -8,7 +8,7 @@
 #include "NANDInfo/sets/NANDInfoDict.h"
 #include "NANDInfo/sets/StatisticsGathering.h"
 #include "NANDInfo/sets/StorageHealthFields.h"
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/DictionaryHelpers.h"
 
 namespace vesprun {

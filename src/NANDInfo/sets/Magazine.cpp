@@ -10,7 +10,7 @@
 #include "NANDInfo/sets/StatisticsGathering.h"
 #include "NANDInfo/sets/StorageHealthFields.h"
 #include "NANDInfo/tables/MagazineFields.h"
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/DictionaryHelpers.h"
 
 namespace vesprun {

@@ -8,7 +8,7 @@
 
 #include "Command.h"
 #include "Complaints.h"
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/host/counters/CounterLines.h"
 #include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/QuotedText.h"

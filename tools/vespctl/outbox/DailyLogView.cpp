@@ -6,7 +6,7 @@
 #include <iomanip>
 #include <string>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "common/TextForm.h"
 #include "platform/host/documents/QuotedText.h"
 

@@ -2,7 +2,7 @@
 
 #include <cstdint>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "common/PropertyValue.h"
 
 namespace vesprun {

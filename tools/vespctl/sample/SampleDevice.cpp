@@ -4,7 +4,7 @@
 #include <vector>
 
 #include "Command.h"
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeWriter.h"

@@ -2,7 +2,7 @@
 
 #include <optional>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/PreferenceNames.h"
 
 namespace vesprun {

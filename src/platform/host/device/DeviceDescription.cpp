@@ -5,7 +5,7 @@
 #include <initializer_list>
 #include <string_view>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/host/documents/JsonForm.h"
 
 namespace vesprun {

@@ -9,7 +9,7 @@
 #include <optional>
 #include <vector>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/files/AtomicFile.h"
 #include "platform/host/files/FolderNames.h"

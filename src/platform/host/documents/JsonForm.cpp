@@ -10,7 +10,7 @@
 #include <utility>
 #include <vector>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/host/documents/Base64.h"
 #include "platform/host/documents/NestedPlace.h"
 #include "platform/host/documents/QuotedText.h"

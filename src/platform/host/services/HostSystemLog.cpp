@@ -4,7 +4,7 @@
 #include <exception>
 #include <string>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/QuotedText.h"
 

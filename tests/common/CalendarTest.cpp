@@ -1,4 +1,4 @@
-#include "common/Date.h"
+#include "common/Calendar.h"
 
 #include <gtest/gtest.h>
 #include <limits>
@@ -6,7 +6,7 @@
 namespace vesprun {
 namespace {
 
-TEST(Date, TextRoundTripsAtTheEdgesOfTheCalendar) {
+TEST(Calendar, TextRoundTripsAtTheEdgesOfTheCalendar) {
   for (const char* text :
        {"1970-01-01T00:00:00Z", "1969-12-31T23:59:59.999999999Z", "2000-02-29T12:00:00Z",
         "2024-03-05T09:15:02.25Z", "0000-03-01T00:00:00Z", "-0001-12-31T00:00:00Z",
@@ -17,7 +17,7 @@ TEST(Date, TextRoundTripsAtTheEdgesOfTheCalendar) {
   }
 }
 
-TEST(Date, EveryDayNumberRoundTrips) {
+TEST(Calendar, EveryDayNumberRoundTrips) {
   for (std::int64_t day = std::numeric_limits<std::int32_t>::min();
        day <= std::numeric_limits<std::int32_t>::max(); day += 1'000'003) {
     const Date start = startOfDay(static_cast<std::int32_t>(day));
@@ -28,7 +28,7 @@ TEST(Date, EveryDayNumberRoundTrips) {
   EXPECT_EQ(dateText(startOfDay(19787)), "2024-03-05T00:00:00Z");
 }
 
-TEST(Date, RefusesWhatIsNoDate) {
+TEST(Calendar, RefusesWhatIsNoDate) {
   for (const char* text :
        {"", "2024-03-05", "2024-03-05T09:15:02", "2024-02-30T00:00:00Z", "2023-02-29T00:00:00Z",
         "2024-13-01T00:00:00Z", "2024-00-01T00:00:00Z", "2024-01-01T24:00:00Z",

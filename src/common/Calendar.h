@@ -5,7 +5,7 @@
 #include <string>
 #include <string_view>
 
-#include "common/Instant.h"
+#include "common/Date.h"
 
 namespace vesprun {
 
