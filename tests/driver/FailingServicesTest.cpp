@@ -1,5 +1,6 @@
 #include <sys/socket.h>
 
+#include <cstdlib>
 #include <filesystem>
 
 #include "buffers/DeviceBuffers.h"
@@ -16,6 +17,30 @@
 #include "platform/host/registry/HostDeviceRegistry.h"
 #include "support/FailingPlatform.h"
 #include "support/TestDevice.h"
+
+namespace {
+
+/// The allocation of this thread that fails, counted down while it is not 0.
+thread_local std::size_t gAllocationsLeft = 0;
+
+void* allocate(std::size_t size) {
+  if (gAllocationsLeft != 0 && --gAllocationsLeft == 0) {
+    return nullptr;
+  }
+  return std::malloc(size == 0 ? 1 : size);
+}
+
+}  // namespace
+
+void* operator new(std::size_t size) {
+  void* memory = allocate(size);
+  return memory != nullptr ? memory : throw std::bad_alloc();
+}
+void* operator new(std::size_t size, const std::nothrow_t& /*tag*/) noexcept {
+  return allocate(size);
+}
+void operator delete(void* memory) noexcept { std::free(memory); }
+void operator delete(void* memory, std::size_t /*size*/) noexcept { std::free(memory); }
 
 namespace vesprun {
 namespace {
@@ -79,13 +104,16 @@ class FailingServices : public ::testing::Test {
 
   /// Runs the program's `work` on a copy of the device; false when fewer calls were made.
   template <typename Work>
-  bool run(Faults& faults, const Work& work) {
+  bool run(Faults& faults, std::size_t allocation, const Work& work) {
     TestDevice device("{}");
     device.endProcess();
     fs::copy(original.path(), device.path(),
              fs::copy_options::recursive | fs::copy_options::overwrite_existing);
     startActiveAppInfoAfresh();
+    gAllocationsLeft = allocation;
     runOn(device, faults, work);
+    const bool failed = gAllocationsLeft == 0 && (allocation != 0 || !faults.failed().empty());
+    gAllocationsLeft = 0;
     device.endProcess();
     expectWholeFiles(device);
 
@@ -96,7 +124,7 @@ class FailingServices : public ::testing::Test {
               TestDevice::kToday - 1);
     device.endProcess();
     expectWholeFiles(device);
-    return !faults.failed().empty();
+    return failed;
   }
 
   /// Once the tasks have begun, every step runs, but for the rest of the one that failed.
@@ -171,8 +199,8 @@ class FailingServices : public ::testing::Test {
 
 class FailingDailyRun : public FailingServices {
  protected:
-  bool runWithFault(Faults& faults) {
-    const bool failed = run(faults, [](HostPlatform& /*host*/) {
+  bool runWithFault(Faults& faults, std::size_t allocation = 0) {
+    const bool failed = run(faults, allocation, [](HostPlatform& /*host*/) {
       runDailyDriver(std::vector<const char*>{"vesprun", "-d"});
     });
     if (faults.called("DiagnosticLogSubmissionEnabled") ||
@@ -206,6 +234,19 @@ TEST_F(FailingDailyRun, GoesOnWhicheverCallRunsOutOfMemory) {
   EXPECT_GT(call, 100U);
 }
 
+TEST_F(FailingDailyRun, SurvivesAllocationsThatFail) {
+  constexpr std::size_t kStep = 97;
+  std::size_t allocation = 1;
+  bool failed = true;
+  while (failed) {
+    Faults faults(Faults::Kind::Failure, 0);
+    failed = runWithFault(faults, allocation);
+    ASSERT_FALSE(HasFailure()) << "allocation " << allocation;
+    allocation += kStep;
+  }
+  EXPECT_GT(allocation, 1000U);
+}
+
 class FailingListener : public FailingServices {
  protected:
   FailingListener() : FailingServices(kListeningDevice) {}
@@ -231,7 +272,7 @@ class FailingListener : public FailingServices {
     bool failed = true;
     while (failed) {
       Faults faults(kind, ++call);
-      failed = run(faults, listen);
+      failed = run(faults, 0, listen);
       if (faults.called("PostNotification") && faults.failed() != "lock") {
         expectEveryStep(faults);
       }
