@@ -20,7 +20,7 @@ int look(const Bytes& snapshot, const char* name = "VM_swapout") {
 
 using B = SnapshotBuilder;
 
-TEST(KernelSnapshot, findsTheThreadInTheFirstContainer) {
+TEST(KernelSnapshot, FindsTheThreadInTheFirstContainer) {
   const std::pair<B, int> cases[] = {
       {B().thread(1, "VM_swapout", 7), 7},
       {B().begin(1).name("VM_swapout", 16).written(7), 7},
@@ -61,7 +61,7 @@ TEST(KernelSnapshot, findsTheThreadInTheFirstContainer) {
   EXPECT_EQ(look(B().begin(1).name(same + 'n').written(7).bytes, (same + 'n').c_str()), 7);
 }
 
-TEST(KernelSnapshot, endsAtAnItemThatIsCutOff) {
+TEST(KernelSnapshot, EndsAtAnItemThatIsCutOff) {
   const B whole = B().begin(1).thread(2, "idle", 3).begin(3).name("VM_swapout", 16).written(7);
   const std::size_t nameEnd = whole.bytes.size() - 48;
   for (std::size_t size = 0; size <= whole.bytes.size(); ++size) {
@@ -71,7 +71,7 @@ TEST(KernelSnapshot, endsAtAnItemThatIsCutOff) {
   }
 }
 
-TEST(KernelSnapshot, followsAnyNesting) {
+TEST(KernelSnapshot, FollowsAnyNesting) {
   B deep;
   for (std::uint64_t id = 0; id < 200'000; ++id) {
     deep.begin(id);

@@ -27,7 +27,7 @@ auto whileScarce(std::size_t most, const Parse& parse) {
 // Names are kept in one text, values in one list: at 1,000 bytes, some 60 fields find room.
 constexpr std::size_t kScarce = 1000;
 
-TEST(OutOfMemory, leavesFieldsOutOfTheBaseStatistics) {
+TEST(OutOfMemory, LeavesFieldsOutOfTheBaseStatistics) {
   const Bytes buffer =
       StatisticsBufferBuilder().add(90, std::vector<std::uint64_t>(160, 1)).add(4, {5}).bytes();
   ORUStatsContext ctx;
@@ -41,7 +41,7 @@ TEST(OutOfMemory, leavesFieldsOutOfTheBaseStatistics) {
   EXPECT_EQ(fieldsOf(ctx.fields).back(), Fields::value_type("ab", 1));
 }
 
-TEST(OutOfMemory, isRecordedByTheOtherParsers) {
+TEST(OutOfMemory, IsRecordedByTheOtherParsers) {
   const std::vector<std::uint64_t> words(160, 1);
   const Bytes ftl = StatisticsBufferBuilder().add(4, {5}).add(90, words).add(7, {1}).bytes();
   const Bytes msp = MSPBufferBuilder()
@@ -74,7 +74,7 @@ TEST(OutOfMemory, isRecordedByTheOtherParsers) {
   }
 }
 
-TEST(OutOfMemory, endsTheSearchOfASnapshotAndATelemetryList) {
+TEST(OutOfMemory, EndsTheSearchOfASnapshotAndATelemetryList) {
   SnapshotBuilder deep;
   for (std::uint64_t id = 0; id < 100; ++id) {
     deep.begin(id);

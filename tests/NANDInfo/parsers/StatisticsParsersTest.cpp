@@ -70,7 +70,7 @@ std::string textOf(Outcome (*parse)(std::span<const std::uint8_t>), const Builde
   return outcome.error == "NA" ? text : text + ": " + outcome.error;
 }
 
-TEST(BaseParser, walksRecords) {
+TEST(BaseParser, WalksRecords) {
   const std::pair<Statistics, std::string> cases[] = {
       {Statistics(), "0"},
       {Statistics().add(900, {}), "1"},
@@ -94,7 +94,7 @@ TEST(BaseParser, walksRecords) {
   EXPECT_EQ(base(trailing).result, 1U);
 }
 
-TEST(BaseParser, givesUpOnlyWhenRecordsThatOverlapMultiplyFields) {
+TEST(BaseParser, GivesUpOnlyWhenRecordsThatOverlapMultiplyFields) {
   constexpr std::uint32_t kCacheDepthVsThroughput = 460;  // 256 elements
   Statistics overlapping;
   for (int record = 0; record < 32'768; ++record) {
@@ -134,7 +134,7 @@ Words summaryOf(const ORUStatsContext& ctx) {
           ctx.maxHighEnduranceBlockErases};
 }
 
-TEST(BaseParser, fillsTheSummary) {
+TEST(BaseParser, FillsTheSummary) {
   // In the order of the context, and a histogram at the end.
   const Words ids = {53, 52, 51, 50, 49, 7, 4, 48, 17, 19, 18, 20, 12, 13, 56, 28, 45};
   Words all(ids.size());
@@ -175,7 +175,7 @@ TEST(BaseParser, fillsTheSummary) {
   EXPECT_EQ(ctx.fields.size(), fieldCount + 1);
 }
 
-TEST(FTLParser, walksRecords) {
+TEST(FTLParser, WalksRecords) {
   const std::string tooMany = ": ORUFTLParseBufferToCxt 900: Cannot add 65536 elements to context";
   const std::string counts = ": ORUFTLParseBufferToCxt: qosPerCmdQ(90): (#160) cfg elements != ";
   const Statistics large = Statistics().add(11, {1}).add(900, Words(65'536)).add(11, {2});
@@ -204,7 +204,7 @@ TEST(FTLParser, walksRecords) {
   EXPECT_EQ(textOf(ftlStatKey, Statistics().add(65535, {2}).add(7, {3})), "0");
 }
 
-TEST(MSPParser, walksRecords) {
+TEST(MSPParser, WalksRecords) {
   const auto mismatch = [](const std::string& key, const std::string& configured,
                            const std::string& size) {
     return ": ORUMSPParseBufferToCxt: " + key + ": cfg " + configured + " cfg bytes != (" + size +
@@ -244,7 +244,7 @@ TEST(MSPParser, walksRecords) {
   }
 }
 
-TEST(StatisticsParsers, decodeEveryKnownStatistic) {
+TEST(StatisticsParsers, DecodeEveryKnownStatistic) {
   const Bytes statistics =
       everyStatistic([](const ORUStatKey& key) { return countingUp(key.count, key.id); });
   const Bytes mspStatistics =

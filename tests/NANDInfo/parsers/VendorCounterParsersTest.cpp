@@ -8,7 +8,7 @@
 namespace vesprun {
 namespace {
 
-TEST(VendorCounterParsers, copyWhatTheirLayoutsSay) {
+TEST(VendorCounterParsers, CopyWhatTheirLayoutsSay) {
   struct Case {
     void (*parse)(CounterRegion, NandChannelCounters&);
     std::uint64_t sum;

@@ -20,7 +20,7 @@ constexpr auto kRanges = std::to_array<FieldRange>(
     {{1, "step10"}, {2, "step", 12, 14}, {3, "step_2b"}, {4, "step"}, {5, "step", 0, 3}, {6, "7"}});
 constexpr FieldTable kTable = fieldTable<kRanges, 11>();
 
-TEST(FieldTable, tellsNumbersAndTheirSpellingApart) {
+TEST(FieldTable, TellsNumbersAndTheirSpellingApart) {
   const std::pair<int, std::vector<const char*>> cases[] = {
       {1, {"step10"}}, {2, {"step12", "step14"}},        {3, {"step_2b"}},
       {4, {"step"}},   {5, {"step0", "step1", "step3"}}, {6, {"7"}}};
@@ -37,7 +37,7 @@ TEST(FieldTable, tellsNumbersAndTheirSpellingApart) {
   }
 }
 
-TEST(FieldTable, findsEveryNameOfEveryTableInItsOwnRange) {
+TEST(FieldTable, FindsEveryNameOfEveryTableInItsOwnRange) {
   std::vector<const FieldTable*> tables = {&WhitelistedRawNANDFTLCounters_SigDigDict,
                                            &WhitelistedRawNANDMSPCounters_SigDigDict,
                                            &PrivacyApprovedSMagNANDFTLCounters_Accum,
@@ -78,7 +78,7 @@ Names unknownIn(const FieldTable& table, const Names& known) {
   return unknown;
 }
 
-TEST(FieldTable, namesOnlyFieldsThatTheDecodersMake) {
+TEST(FieldTable, NamesOnlyFieldsThatTheDecodersMake) {
   Names base, ftl, msp;
   for (const ORUStatKey& key : ORUStatKeyTable) {
     addFields(base, key, "");
@@ -94,7 +94,7 @@ TEST(FieldTable, namesOnlyFieldsThatTheDecodersMake) {
   EXPECT_THAT(unknownIn(keyMap, base), IsEmpty());
 }
 
-TEST(LegacyKeyMap, putsTheSuffixOfTheFieldBehindThePrefix) {
+TEST(LegacyKeyMap, PutsTheSuffixOfTheFieldBehindThePrefix) {
   const std::pair<const char*, std::optional<std::string>> cases[] = {
       {"numMemChoke", "com.quill.NANDInfo.numMemChoke"},
       {"CacheDepthVsThroughput255", "com.quill.NANDInfo.CacheDepthVsThroughput255"},

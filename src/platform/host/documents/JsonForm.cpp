@@ -11,83 +11,108 @@
 #include <vector>
 
 #include "common/Calendar.h"
+#include "common/TextForm.h"
 #include "platform/host/documents/Base64.h"
 #include "platform/host/documents/NestedPlace.h"
 #include "platform/host/documents/QuotedText.h"
+#include "platform/host/documents/XmlText.h"
 
 namespace vesprun {
 namespace {
 
 using Json = nlohmann::ordered_json;
 
-Json tagged(const char* name, Json content) {
-  Json object = Json::object();
-  object.emplace(name, std::move(content));
-  return object;
+}  // namespace
+
+// What a string has beyond escapes and sound text is left to the library.
+void appendJsonText(std::string_view string, std::string& text) {
+  static constexpr std::string_view kEscaped = "\b\f\n\r\t\"\\";
+  static constexpr std::string_view kEscapes = "bfnrt\"\\";
+  const std::size_t begin = text.size();
+  text += '"';
+  for (std::size_t at = 0; at < string.size();) {
+    if (const auto escape = kEscaped.find(string[at]); escape != std::string_view::npos) {
+      text.append(1, '\\').append(1, kEscapes[escape]);
+      ++at;
+      continue;
+    }
+    const std::size_t length = xmlCharacterLength(string.substr(at));
+    if (length == 0) {
+      text.resize(begin);
+      text += Json(string).dump(-1, ' ', false, Json::error_handler_t::replace);
+      return;
+    }
+    text.append(string, at, length);
+    at += length;
+  }
+  text += '"';
 }
 
-Json jsonOf(const Number& number) {
+namespace {
+
+void append(const PropertyValue& value, std::string& text);
+
+void appendTagged(const char* name, std::string_view string, std::string& text) {
+  text.append("{\"").append(name).append("\":");
+  appendJsonText(string, text);
+  text += '}';
+}
+
+void append(const Number& number, std::string& text) {
   if (!number.isFloatingPoint()) {
-    return number.isSigned() ? Json(number.asInt64()) : Json(number.asUInt64());
+    text += textForm(number);
+    return;
   }
   const double real = number.asDouble();
   if (!std::isfinite(real)) {
-    return tagged("real", std::isnan(real) ? "nan" : real < 0 ? "-inf" : "inf");
+    appendTagged("real", textForm(number), text);
+    return;
   }
   if (number.kind() == NumberKind::Double) {
-    return real;
+    text += Json(real).dump();
+    return;
   }
-  char text[32];
-  const char* end = std::to_chars(text, text + sizeof text, static_cast<float>(real)).ptr;
+  char digits[32];
+  const char* end = std::to_chars(digits, digits + sizeof digits, static_cast<float>(real)).ptr;
   double fewestDigits = real;
-  std::from_chars(text, end, fewestDigits);
-  return tagged("float", fewestDigits);
+  std::from_chars(digits, end, fewestDigits);
+  text.append("{\"float\":").append(Json(fewestDigits).dump()).append("}");
 }
 
-Json jsonOf(const PropertyValue& value);
-
-Json jsonOf(const PropertyDict& dict) {
-  // The library's own insertion searches all earlier names; ours are known to be different.
-  Json::object_t object;
-  object.reserve(dict.size());
-  std::vector<Json::object_t::value_type>& entries = object;
+void append(const PropertyDict& dict, std::string& text) {
+  text += '{';
   for (const auto& [key, entry] : dict) {
-    entries.emplace_back(key, jsonOf(entry));
+    text.append(text.back() == '{' ? "" : ",");
+    appendJsonText(key, text);
+    text += ':';
+    append(entry, text);
   }
-  return object;
+  text += '}';
 }
 
-Json jsonOf(const PropertyValue& value) {
+void append(const PropertyValue& value, std::string& text) {
   if (const PropertyDict* dict = value.dict()) {
-    return jsonOf(*dict);
-  }
-  if (const PropertyArray* array = value.array()) {
-    Json::array_t elements;
-    elements.reserve(array->size());
+    append(*dict, text);
+  } else if (const PropertyArray* array = value.array()) {
+    text += '[';
     for (const PropertyValue& element : *array) {
-      elements.push_back(jsonOf(element));
+      text.append(&element == array->data() ? "" : ",");
+      append(element, text);
     }
-    return elements;
-  }
-  if (const std::string* string = value.string()) {
-    return *string;
-  }
-  if (const Number* number = value.number()) {
-    return jsonOf(*number);
-  }
-  if (const bool* boolean = value.boolean()) {
-    return *boolean;
-  }
-  if (const Bytes* data = value.data()) {
-    std::string text;
+    text += ']';
+  } else if (const std::string* string = value.string()) {
+    appendJsonText(*string, text);
+  } else if (const Number* number = value.number()) {
+    append(*number, text);
+  } else if (const bool* boolean = value.boolean()) {
+    text += *boolean ? "true" : "false";
+  } else if (const Bytes* data = value.data()) {
+    text += "{\"data\":\"";
     appendBase64(*data, text);
-    return tagged("data", std::move(text));
+    text += "\"}";
+  } else {
+    appendTagged("date", dateText(value.date() != nullptr ? *value.date() : Date{}), text);
   }
-  return tagged("date", dateText(value.date() != nullptr ? *value.date() : Date{}));
-}
-
-std::string textOf(const Json& json, int indentation) {
-  return json.dump(indentation, ' ', false, Json::error_handler_t::replace);
 }
 
 PropertyValue integerValue(std::uint64_t integer) {
@@ -311,9 +336,17 @@ void replay(const PropertyValue& plain, ValueBuilder& builder) {
 
 }  // namespace
 
-std::string jsonText(const PropertyValue& value) { return textOf(jsonOf(value), -1); }
-std::string jsonText(const PropertyDict& dict) { return textOf(jsonOf(dict), -1); }
-std::string indentedJsonText(const PropertyValue& value) { return textOf(jsonOf(value), 2); }
+std::string jsonText(const PropertyValue& value) {
+  std::string text;
+  append(value, text);
+  return text;
+}
+
+std::string jsonText(const PropertyDict& dict) {
+  std::string text;
+  append(dict, text);
+  return text;
+}
 
 std::optional<PropertyValue> plainValueFromJsonText(std::string_view text, std::string& error) {
   return read(text, true, error);

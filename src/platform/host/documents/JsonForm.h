@@ -18,11 +18,13 @@ namespace vesprun {
 /// - `{"data":"AQID"}`: bytes, in base64;
 /// - `{"date":"2024-03-05T09:15:02Z"}`: a date.
 ///
-/// Bytes of a string that are no UTF-8 become U+FFFD. `jsonText` is one line without white space,
-/// `indentedJsonText` has a line for each entry, two spaces for each level. Neither ends the line.
+/// Bytes of a string that are not UTF-8 become U+FFFD. One line without white space and without an
+/// end.
 std::string jsonText(const PropertyValue& value);
 std::string jsonText(const PropertyDict& dict);
-std::string indentedJsonText(const PropertyValue& value);
+
+/// Appends the JSON form of a string.
+void appendJsonText(std::string_view string, std::string& text);
 
 /// The value that a JSON text stands for. Nothing, with a text in `error` that names the line or
 /// the entry, for what is no JSON, a name that an object has twice, an integer outside the 64-bit

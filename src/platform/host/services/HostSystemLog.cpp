@@ -41,9 +41,15 @@ void HostSystemLog::write(LogLevel level, std::string_view message) {
   }
   std::string error;
   try {
-    const PropertyDict line{
-        {"time", dateText(_clock.now())}, {"level", levelName(level)}, {"message", message}};
-    if (_directory.makeFolder("outbox", error) && _lines.append(jsonText(line), error)) {
+    // Put together here: a message may hold a long list, which no value should copy.
+    std::string line =
+        jsonText(PropertyDict{{"time", dateText(_clock.now())}, {"level", levelName(level)}});
+    line.back() = ',';
+    line.reserve(line.size() + message.size() + message.size() / 8 + 32);
+    line += "\"message\":";
+    appendJsonText(message, line);
+    line += '}';
+    if (_directory.makeFolder("outbox", error) && _lines.append(line, error)) {
       return;
     }
   } catch (const std::exception&) {

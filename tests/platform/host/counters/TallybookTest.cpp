@@ -70,7 +70,7 @@ std::string scalar(std::int64_t value) {
   return "scalar\t19787\tk\t" + std::to_string(value) + '\n';
 }
 
-TEST_F(TallybookTest, collectsUntilTheCheckpointAndMakesNothingWithoutNeed) {
+TEST_F(TallybookTest, CollectsUntilTheCheckpointAndMakesNothingWithoutNeed) {
   {
     HostTallybook tallybook(device, clock, preferences, log);
     EXPECT_EQ(tallybook.TBDaysSince1970(), kToday);
@@ -92,7 +92,7 @@ TEST_F(TallybookTest, collectsUntilTheCheckpointAndMakesNothingWithoutNeed) {
   EXPECT_THAT(log.messages, IsEmpty());
 }
 
-TEST_F(TallybookTest, deliversDaysInclusivelyByDayThenKeyBytes) {
+TEST_F(TallybookTest, DeliversDaysInclusivelyByDayThenKeyBytes) {
   ASSERT_TRUE(
       import("scalar\t3\tb\t1\nscalar\t1\tz\t2\nscalar\t2\t\xC3\xA9\t3\nscalar\t2\tZ\t4\n"
              "scalar\t2\ta\t5\nscalar\t4\ta\t6\nscalar\t-1\ta\t7\n"
@@ -130,7 +130,7 @@ TEST_F(TallybookTest, deliversDaysInclusivelyByDayThenKeyBytes) {
   EXPECT_THAT(rows, ElementsAre("2e7", "2e-7", "3d0"));
 }
 
-TEST_F(TallybookTest, readsBackWhatItDumps) {
+TEST_F(TallybookTest, ReadsBackWhatItDumps) {
   std::string text =
       "scalar\t19786\t\t-9223372036854775808\n"
       "scalar\t19786\ta\tb\r\"\xF0\x9F\x98\x80\t9223372036854775807\n"
@@ -157,7 +157,7 @@ TEST_F(TallybookTest, readsBackWhatItDumps) {
   EXPECT_EQ(dump(19788), "");
 }
 
-TEST_F(TallybookTest, keepsNothingOfAnImportWithABadLine) {
+TEST_F(TallybookTest, KeepsNothingOfAnImportWithABadLine) {
   const std::string good = "scalar\t19787\tk\t1\nsample\t19787\tk\t1\t1\n";
   ASSERT_TRUE(import(good));
   for (const std::string bad :
@@ -172,7 +172,7 @@ TEST_F(TallybookTest, keepsNothingOfAnImportWithABadLine) {
   }
 }
 
-TEST_F(TallybookTest, refusesKeysThatNoDocumentCarries) {
+TEST_F(TallybookTest, RefusesKeysThatNoDocumentCarries) {
   const std::string longest(1024 * 1024, 'k');
   for (const std::string& key : {"a\xFF"s, "a\0b"s, longest + 'k'}) {
     add(key, 1);
@@ -185,7 +185,7 @@ TEST_F(TallybookTest, refusesKeysThatNoDocumentCarries) {
   EXPECT_EQ(dump(), "scalar\t19787\t" + longest + "\t1\n");
 }
 
-TEST_F(TallybookTest, losesNoIncrementOfProcessesAndThreadsThatWriteAtOnce) {
+TEST_F(TallybookTest, LosesNoIncrementOfProcessesAndThreadsThatWriteAtOnce) {
   constexpr int kRounds = 20;
   const auto work = [&](HostTallybook& tallybook) {
     for (int i = 0; i < kRounds; ++i) {
@@ -211,7 +211,7 @@ TEST_F(TallybookTest, losesNoIncrementOfProcessesAndThreadsThatWriteAtOnce) {
   EXPECT_THAT(log.messages, IsEmpty());
 }
 
-TEST_F(TallybookTest, keepsEveryCommittedCounterOfAKilledWriter) {
+TEST_F(TallybookTest, KeepsEveryCommittedCounterOfAKilledWriter) {
   std::mt19937 random(7);
   std::int64_t committed = 0;
   for (int round = 0; round < 12; ++round) {
@@ -260,7 +260,7 @@ std::string damaged(std::string content, int number, std::mt19937& random) {
   return content;
 }
 
-TEST_F(TallybookTest, movesDamagedFilesAsideAndGoesOn) {
+TEST_F(TallybookTest, MovesDamagedFilesAsideAndGoesOn) {
   std::string text;
   for (int i = 0; i < 12'400; ++i) {
     const std::string name = "com.quill.key" + std::to_string(i / 31);
@@ -315,7 +315,7 @@ TEST_F(TallybookTest, movesDamagedFilesAsideAndGoesOn) {
   EXPECT_GT(found, 20);
 }
 
-TEST_F(TallybookTest, movesForeignFilesAsideWithTheirJournals) {
+TEST_F(TallybookTest, MovesForeignFilesAsideWithTheirJournals) {
   const auto database = [&](const char* sql) {
     const std::string path = folder.path("other");
     folder.write("other", "");
@@ -376,7 +376,7 @@ class FailingReads {
   static inline int _number;
 };
 
-TEST_F(TallybookTest, neverTakesAnErrorOfReadingForDamage) {
+TEST_F(TallybookTest, NeverTakesAnErrorOfReadingForDamage) {
   std::string text;
   for (int i = 0; i < 12'000; ++i) {
     text += (i < 2000 ? "scalar\t19786\tkey" + std::to_string(i)
@@ -426,7 +426,7 @@ TEST_F(TallybookTest, neverTakesAnErrorOfReadingForDamage) {
   EXPECT_EQ(corruptions(), 0);
 }
 
-TEST_F(TallybookTest, noticesAChunkThatIsCutShort) {
+TEST_F(TallybookTest, NoticesAChunkThatIsCutShort) {
   std::string text;
   for (int i = 0; i < 10'000; ++i) {
     text += "sample\t19786\tk\t1\t1\n";
@@ -461,7 +461,7 @@ TEST_F(TallybookTest, noticesAChunkThatIsCutShort) {
   }
 }
 
-TEST_F(TallybookTest, refusesPipesInPlaceOfItsFiles) {
+TEST_F(TallybookTest, RefusesPipesInPlaceOfItsFiles) {
   add("k", 1);
   for (const char* end : {"-journal", "-wal", "-shm"}) {
     const std::string path = folder.path(kFile) + end;
@@ -474,7 +474,7 @@ TEST_F(TallybookTest, refusesPipesInPlaceOfItsFiles) {
   }
 }
 
-TEST_F(TallybookTest, keepsWhatItCollectedWhenMemoryRunsOut) {
+TEST_F(TallybookTest, KeepsWhatItCollectedWhenMemoryRunsOut) {
   class FailingPreferences final : public Preferences {
     std::optional<PropertyValue> LGSPreferencesGetValue(std::string_view /*key*/,
                                                         std::string_view /*domain*/) override {
@@ -496,7 +496,7 @@ TEST_F(TallybookTest, keepsWhatItCollectedWhenMemoryRunsOut) {
   HostTallybook(device, clock, failing, log).TBClientAddValueForScalarKey("k", 1);
 }
 
-TEST_F(TallybookTest, neverTakesALockForDamage) {
+TEST_F(TallybookTest, NeverTakesALockForDamage) {
   add("k", 1);
   HostTallybook tallybook(device, clock, preferences, log, kShortWait);
   tallybook.TBClientAddValueForScalarKey("k", 1);
@@ -516,7 +516,7 @@ TEST_F(TallybookTest, neverTakesALockForDamage) {
   EXPECT_EQ(dump(), scalar(3));
 }
 
-TEST_F(TallybookTest, neverTakesPermissionsOrAFullDiskForDamage) {
+TEST_F(TallybookTest, NeverTakesPermissionsOrAFullDiskForDamage) {
   add("k", 1);
   const auto waits = [&](HostTallybook& tallybook) {
     EXPECT_THAT(log.messages, IsEmpty());

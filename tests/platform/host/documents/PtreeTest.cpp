@@ -66,7 +66,7 @@ PropertyDict everything() {
           {"list", PropertyArray{PropertyDict{{"in", 1}}, PropertyArray{}, PropertyDict{}, "x"}}};
 }
 
-TEST(PtreeWriter, writesTabIndentedDocuments) {
+TEST(PtreeWriter, WritesTabIndentedDocuments) {
   EXPECT_EQ(writtenOf(PropertyDict{{"name", "text"},
                                    {"list", PropertyArray{std::uint8_t{7}, 2.0, 0.25F, true}},
                                    {"empty", PropertyDict{}},
@@ -99,7 +99,7 @@ TEST(PtreeWriter, writesTabIndentedDocuments) {
 )");
 }
 
-TEST(PtreeWriter, namesThePlaceOfWhatADocumentCannotCarry) {
+TEST(PtreeWriter, NamesThePlaceOfWhatADocumentCannotCarry) {
   std::string document = "before";
   std::string error;
   const auto refuses = [&](const PropertyValue& value) {
@@ -123,7 +123,7 @@ TEST(PtreeWriter, namesThePlaceOfWhatADocumentCannotCarry) {
               HasSubstr("\xE2\x80\xA6: nested deeper than 200 levels"));
 }
 
-TEST(PtreeReader, readsBackEveryKindOfValue) {
+TEST(PtreeReader, ReadsBackEveryKindOfValue) {
   const PropertyDict original = everything();
   const PropertyValue read = readOf(writtenOf(original));
   EXPECT_EQ(read, PropertyValue(original));
@@ -140,7 +140,7 @@ TEST(PtreeReader, readsBackEveryKindOfValue) {
   EXPECT_EQ(kindOf("<real>2</real>"), NumberKind::Double);
 }
 
-TEST(PtreeReader, takesWhatOtherWritersMayWrite) {
+TEST(PtreeReader, TakesWhatOtherWritersMayWrite) {
   const PropertyValue one(PropertyArray{1});
   for (const std::string start :
        {"", "\xEF\xBB\xBF", "\n", "<?xml version='1.0'?>",
@@ -164,7 +164,7 @@ TEST(PtreeReader, takesWhatOtherWritersMayWrite) {
   EXPECT_EQ(repeated.dict()->begin()->first, "a");
 }
 
-TEST(PtreeReader, skipsCommentsWhereverXmlAllowsThem) {
+TEST(PtreeReader, SkipsCommentsWhereverXmlAllowsThem) {
   EXPECT_EQ(readOf("<?xml version=\"1.0\"?><!-- a > b --><ptree version=\"1.0\"><!----><dict><!--"
                    "<x>&y;--><key>a<!--b-->c</key><!-- \xC3\xA4 -->\n<array><!-- \n -->"
                    "<true><!-- - --></true><integer>1<!--2-->3</integer></array></dict><!-- -->"
@@ -175,7 +175,7 @@ TEST(PtreeReader, skipsCommentsWhereverXmlAllowsThem) {
 }
 
 /// Longer than a piece of the document that the parser is given at once.
-TEST(PtreeReader, readsLongTextsAndMarkupWhole) {
+TEST(PtreeReader, ReadsLongTextsAndMarkupWhole) {
   std::string text;
   for (int line = 0; text.size() < 3'000'000; ++line) {
     text += std::to_string(line) + "\r\n\xE2\x82\xAC";
@@ -193,7 +193,7 @@ TEST(PtreeReader, readsLongTextsAndMarkupWhole) {
             "line 1: the document is longer than 256 MiB");
 }
 
-TEST(PtreeReader, refusesWhatTheGrammarDoesNotKnow) {
+TEST(PtreeReader, RefusesWhatTheGrammarDoesNotKnow) {
   const std::pair<const char*, std::vector<const char*>> cases[] = {
       {"line 1: the key \"a\" has no value", {"<dict><key>a</key></dict>"}},
       {"the key \"a\" has no value", {"<dict><key>a</key><key>b</key><true/></dict>"}},
@@ -240,7 +240,7 @@ TEST(PtreeReader, refusesWhatTheGrammarDoesNotKnow) {
   }
 }
 
-TEST(PtreeReader, refusesWhatIsNoPtreeDocument) {
+TEST(PtreeReader, RefusesWhatIsNoPtreeDocument) {
   for (const char* document :
        {"", "plain", "<", "<ptree>", "<ptree version=\"1.0\"/>", "<ptreeversion=\"1.0\"><true/>",
         "<ptree><true/></ptree>", "<ptree version=\"2.0\"><true/></ptree>",
@@ -268,7 +268,7 @@ TEST(PtreeReader, refusesWhatIsNoPtreeDocument) {
   }
 }
 
-TEST(PtreeReader, namesTheLine) {
+TEST(PtreeReader, NamesTheLine) {
   const std::string start = "<?xml version=\"1.0\"?>\r\n<ptree version=\"1.0\">\n<dict>\n";
   EXPECT_THAT(readingError(start + "<key>a</key>\n<integer>1x</integer>\n</dict></ptree>"),
               StartsWith("line 5: \"1x\" is no integer"));
@@ -283,7 +283,7 @@ TEST(PtreeReader, namesTheLine) {
   readOf(nestedArrays(200));
 }
 
-TEST(PtreeReader, refusesADocumentCutAtAnyByte) {
+TEST(PtreeReader, RefusesADocumentCutAtAnyByte) {
   const std::string document = writtenOf(everything());
   const std::size_t end = document.size() - 1;  // without the last line feed it is complete
   for (std::size_t size = 0; size < end; ++size) {

@@ -17,7 +17,7 @@ using ::testing::ElementsAre, ::testing::HasSubstr;
 using AtomicFileTest = HostServiceTest;
 using JsonLinesTest = HostServiceTest;
 
-TEST_F(AtomicFileTest, showsTheDocumentOnlyWhenItIsComplete) {
+TEST_F(AtomicFileTest, ShowsTheDocumentOnlyWhenItIsComplete) {
   const std::string large(200'000, 'x');
   std::string before = "earlier";
   folder.write("document", before);
@@ -36,7 +36,7 @@ TEST_F(AtomicFileTest, showsTheDocumentOnlyWhenItIsComplete) {
   }
 }
 
-TEST_F(AtomicFileTest, addsOnlyUnderANameThatIsFree) {
+TEST_F(AtomicFileTest, AddsOnlyUnderANameThatIsFree) {
   folder.write("0001", "earlier");
   std::optional<AtomicFile> file = AtomicFile::create(folder.path(), error);
   file->append("new");
@@ -53,7 +53,7 @@ TEST_F(AtomicFileTest, addsOnlyUnderANameThatIsFree) {
   EXPECT_EQ(error, folder.path("none") + ": No such file or directory");
 }
 
-TEST_F(AtomicFileTest, keepsTheEarlierDocumentUntilTheNewOneIsComplete) {
+TEST_F(AtomicFileTest, KeepsTheEarlierDocumentUntilTheNewOneIsComplete) {
   folder.write("document", "earlier");
   {
     const FileSizeLimit limit(100'000);
@@ -68,7 +68,7 @@ TEST_F(AtomicFileTest, keepsTheEarlierDocumentUntilTheNewOneIsComplete) {
   EXPECT_THAT(folder.names(), ElementsAre("document"));
 }
 
-TEST_F(AtomicFileTest, isCompleteOrAbsentWhereverItsWriterIsKilled) {
+TEST_F(AtomicFileTest, IsCompleteOrAbsentWhereverItsWriterIsKilled) {
   const std::string content(300'000, 'x');
   for (int delay = 0; delay < 20; ++delay) {
     const pid_t child = startProcess([&] {
@@ -88,7 +88,7 @@ TEST_F(AtomicFileTest, isCompleteOrAbsentWhereverItsWriterIsKilled) {
   EXPECT_THAT(folder.names(), ElementsAre("document"));
 }
 
-TEST_F(JsonLinesTest, appendsWholeLinesFromManyWriters) {
+TEST_F(JsonLinesTest, AppendsWholeLinesFromManyWriters) {
   JsonLines first(folder.path("events.jsonl"));
   JsonLines second(folder.path("events.jsonl"));
   const std::string line(500, 'x');
@@ -112,7 +112,7 @@ TEST_F(JsonLinesTest, appendsWholeLinesFromManyWriters) {
   EXPECT_EQ(modeOf("events.jsonl"), mode_t{S_IFREG | 0600});
 }
 
-TEST_F(JsonLinesTest, endsATornLineAndMakesADeletedFileAnew) {
+TEST_F(JsonLinesTest, EndsATornLineAndMakesADeletedFileAnew) {
   folder.write("log.jsonl", "{\"whole\":1}\n{\"to");
   JsonLines lines(folder.path("log.jsonl"));
   EXPECT_TRUE(lines.append("{}", error)) << error;
@@ -123,7 +123,7 @@ TEST_F(JsonLinesTest, endsATornLineAndMakesADeletedFileAnew) {
   EXPECT_EQ(folder.read("log.jsonl"), "{}\n");
 }
 
-TEST_F(JsonLinesTest, opensRegularFilesAloneAndKeepsThemToTheirOwner) {
+TEST_F(JsonLinesTest, OpensRegularFilesAloneAndKeepsThemToTheirOwner) {
   folder.write("shared.jsonl", "");
   chmod(folder.path("shared.jsonl").c_str(), 0666);
   EXPECT_TRUE(JsonLines(folder.path("shared.jsonl")).append("{}", error)) << error;
@@ -137,7 +137,7 @@ TEST_F(JsonLinesTest, opensRegularFilesAloneAndKeepsThemToTheirOwner) {
   EXPECT_EQ(error, folder.path("pipe.jsonl") + ": not a regular file");
 }
 
-TEST_F(JsonLinesTest, takesBackALineThatDidNotFit) {
+TEST_F(JsonLinesTest, TakesBackALineThatDidNotFit) {
   JsonLines lines(folder.path("log.jsonl"));
   EXPECT_TRUE(lines.append("{}", error)) << error;
   {
@@ -150,7 +150,7 @@ TEST_F(JsonLinesTest, takesBackALineThatDidNotFit) {
   EXPECT_EQ(folder.read("log.jsonl"), "{}\n{}\n");
 }
 
-TEST_F(JsonLinesTest, waitOnceForALockThatNobodyReleases) {
+TEST_F(JsonLinesTest, WaitOnceForALockThatNobodyReleases) {
   folder.write("log.jsonl", "");
   JsonLines lines(folder.path("log.jsonl"), std::chrono::milliseconds(50));
   {
