@@ -235,7 +235,7 @@ TEST_F(FailingDailyRun, GoesOnWhicheverCallRunsOutOfMemory) {
 }
 
 TEST_F(FailingDailyRun, SurvivesAllocationsThatFail) {
-  constexpr std::size_t kStep = 97;
+  constexpr std::size_t kStep = 29;
   std::size_t allocation = 1;
   bool failed = true;
   while (failed) {
