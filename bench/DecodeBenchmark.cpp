@@ -13,10 +13,10 @@
 #include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
-#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
 #include "NANDInfo/parsers/StatisticsRecord.h"
 #include "NANDInfo/sets/FilteredDict.h"
 #include "NANDInfo/tables/FieldSets.h"
+#include "buffers/DeviceBuffers.h"
 
 namespace vesprun {
 namespace {
@@ -31,21 +31,12 @@ std::vector<std::uint64_t> values(std::size_t count, std::uint64_t seed) {
   return made;
 }
 
-/// Every known statistic with all its elements.
 Bytes statisticsBuffer() {
-  StatisticsBufferBuilder buffer;
-  for (const ORUStatKey& key : ORUStatKeyTable) {
-    buffer.add(key.id, values(key.count, key.id));
-  }
-  return buffer.bytes();
+  return everyStatistic([](const ORUStatKey& key) { return values(key.count, key.id); });
 }
 
 Bytes mspBuffer() {
-  MSPBufferBuilder buffer;
-  for (const ORUMSPKey& key : ORUMSPKeyTable) {
-    buffer.add(key.key, values(key.count, key.key));
-  }
-  return buffer.bytes();
+  return everyMSPStatistic([](const ORUMSPKey& key) { return values(key.count, key.key); });
 }
 
 using NameText = std::array<char, 128>;
@@ -92,12 +83,12 @@ void walkMSP(benchmark::State& state) {
   const Bytes buffer = mspBuffer();
   NameText name;
   for (auto _ : state) {
-    std::span<const std::uint8_t> rest(buffer);
-    while (!rest.empty()) {
-      const auto header = MSPRecordHeader::decodeFrom(rest.first<MSPRecordHeader::kSize>());
+    MSPRecordReader reader(buffer);
+    while (reader.holdsHeader()) {
+      const MSPRecordHeader header = reader.readHeader();
       const ORUMSPKey* key = findORUMSPKey(header.key);
       formatNames<Naming::Plain>(name, key->name.data(), header.length / key->width());
-      rest = rest.subspan(MSPRecordHeader::kSize + header.length);
+      reader.read(header.length);
     }
   }
 }

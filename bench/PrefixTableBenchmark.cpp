@@ -38,11 +38,11 @@ std::vector<std::string> keys(int prefixCount) {
 
 void lookUp(benchmark::State& state) {
   const int prefixCount = static_cast<int>(state.range(0));
-  PropertyDict prefixes;
+  std::vector<std::string> prefixes;
   for (int i = 0; i < prefixCount; ++i) {
-    prefixes.set(prefix(i), PropertyDict());
+    prefixes.push_back(prefix(i));
   }
-  const PrefixTable table(prefixes);
+  const PrefixTable table({prefixes.begin(), prefixes.end()});
   const std::vector<std::string> searched = keys(prefixCount);
   for (auto _ : state) {
     for (const std::string& key : searched) {

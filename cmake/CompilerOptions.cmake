@@ -1,14 +1,17 @@
 # Every target of the project is built with these options.
 add_library(vesprun_options INTERFACE)
+target_compile_features(vesprun_options INTERFACE cxx_std_20)
 target_compile_options(vesprun_options INTERFACE
   -Wall -Wextra -Wpedantic -Wshadow -Wconversion -Wsign-conversion -Wold-style-cast -Wcast-qual
-  -Wnon-virtual-dtor -Woverloaded-virtual -Wformat=2 -Wimplicit-fallthrough -Wundef -Werror
+  -Wnon-virtual-dtor -Woverloaded-virtual -Wformat=2 -Wimplicit-fallthrough -Wundef
+  $<$<BOOL:${VESPRUN_WARNINGS_AS_ERRORS}>:-Werror>
   -ffp-contract=off)  # statistics are the same to the last bit on every processor
 if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
-  # g++ 12 reports overruns inside std::string and std::vector that cannot happen; the sanitizers
-  # watch for real ones.
+  # g++ 12 reports overruns and uninitialized members inside std::string, std::vector and
+  # std::variant that cannot happen; the sanitizers watch for real ones.
   target_compile_options(vesprun_options INTERFACE
-    -Wno-array-bounds -Wno-stringop-overflow -Wno-stringop-overread -Wno-restrict)
+    -Wno-array-bounds -Wno-stringop-overflow -Wno-stringop-overread -Wno-restrict
+    -Wno-maybe-uninitialized)
 endif()
 
 if(VESPRUN_SANITIZERS)

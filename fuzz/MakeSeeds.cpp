@@ -7,11 +7,7 @@
 #include <vector>
 
 #include "NANDInfo/parsers/MSPRecord.h"
-#include "NANDInfo/parsers/ORUMSPKeyTable.h"
-#include "NANDInfo/parsers/ORUStatKeyTable.h"
-#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
-#include "NANDInfo/parsers/VendorCounterParsers.h"
-#include "common/LittleEndian.h"
+#include "buffers/DeviceBuffers.h"
 
 using namespace vesprun;
 
@@ -25,12 +21,10 @@ struct Seed {
 Bytes bytesOf(std::string_view text) { return {text.begin(), text.end()}; }
 
 std::vector<Seed> statisticsSeeds() {
-  StatisticsBufferBuilder all;
-  for (const ORUStatKey& key : ORUStatKeyTable) {
-    all.add(key.id, std::vector<std::uint64_t>(key.count, key.id));
-  }
   return {
-      {"everything", all.bytes()},
+      {"everything", everyStatistic([](const ORUStatKey& key) {
+         return std::vector<std::uint64_t>(key.count, key.id);
+       })},
       {"lengths", StatisticsBufferBuilder()
                       .add(11, {1, 2})
                       .add(113, {1})
@@ -46,12 +40,10 @@ std::vector<Seed> statisticsSeeds() {
 }
 
 std::vector<Seed> mspSeeds() {
-  MSPBufferBuilder all;
-  for (const ORUMSPKey& key : ORUMSPKeyTable) {
-    all.add(key.key, std::vector<std::uint64_t>(key.count, key.key));
-  }
   return {
-      {"everything", all.bytes()},
+      {"everything", everyMSPStatistic([](const ORUMSPKey& key) {
+         return std::vector<std::uint64_t>(key.count, key.key);
+       })},
       {"lengths", MSPBufferBuilder().add(4120, {1, 2}).add(12303, {1}).add(4096, {1, 2}).bytes()},
       {"marks", MSPBufferBuilder()
                     .add(4096, {1})
@@ -65,53 +57,22 @@ std::vector<Seed> mspSeeds() {
   };
 }
 
-std::vector<Seed> counterSeeds() {
-  Bytes region;
-  for (std::size_t word = 0; word < kCounterRegionWords; ++word) {
-    appendLittleEndian(region, word, sizeof(std::uint32_t));
-  }
-  return {{"counting", std::move(region)}};
-}
-
-/// Puts together a snapshot of the kernel, item by item.
-class Snapshot {
- public:
-  Snapshot& add(std::uint32_t type, std::uint64_t flags, const Bytes& data) {
-    appendLittleEndian(_bytes, type, 4);
-    appendLittleEndian(_bytes, data.size(), 4);
-    appendLittleEndian(_bytes, flags, 8);
-    _bytes.insert(_bytes.end(), data.begin(), data.end());
-    return *this;
-  }
-  Snapshot& begin(std::uint64_t identifier) { return add(19, identifier, Bytes(4)); }
-  Snapshot& end(std::uint64_t identifier) { return add(20, identifier, {}); }
-  Snapshot& name(std::string_view text) { return add(2313, 0, bytesOf(text)); }
-  Snapshot& statistics() { return add(2305, 0, Bytes(96, 1)); }
-  const Bytes& bytes() const { return _bytes; }
-
- private:
-  Bytes _bytes;
-};
-
 std::vector<Seed> snapshotSeeds() {
   return {
-      {"thread", Snapshot().begin(1).name("VM_swapout").statistics().end(1).bytes()},
-      {"nested", Snapshot()
-                     .add(0x30, 0, Bytes(8))
+      {"thread", SnapshotBuilder().thread(1, "VM_swapout", 1).bytes},
+      {"nested", SnapshotBuilder()
+                     .item(0x30, Bytes(8))
                      .begin(1)
                      .name("task")
-                     .begin(2)
-                     .name("other")
-                     .statistics()
-                     .end(2)
+                     .thread(2, "other", 1)
                      .begin(3)
-                     .statistics()
+                     .written(1)
                      .name("VM_swapout")
                      .end(3)
                      .end(1)
-                     .add(0xF19158ED, 0, {})
-                     .bytes()},
-      {"nameless", Snapshot().begin(1).begin(2).end(2).name("VM_swapout").end(1).bytes()},
+                     .bufferEnd()
+                     .bytes},
+      {"nameless", SnapshotBuilder().begin(1).begin(2).end(2).name("VM_swapout").end(1).bytes},
   };
 }
 
@@ -159,7 +120,7 @@ int main(int argc, char** argv) {
                        write(folder / "FTLStatisticsFuzzer", statisticsSeeds()) &&
                        write(folder / "FTLStatKeysFuzzer", statisticsSeeds()) &&
                        write(folder / "MSPStatisticsFuzzer", mspSeeds()) &&
-                       write(folder / "CounterLayoutsFuzzer", counterSeeds()) &&
+                       write(folder / "CounterLayoutsFuzzer", {{"counting", telemetryList(1)}}) &&
                        write(folder / "KernelSnapshotFuzzer", snapshotSeeds()) &&
                        write(folder / "PtreeReaderFuzzer", ptreeSeeds());
   return written ? 0 : 1;

@@ -12,13 +12,28 @@ cmake --install "$build" --prefix "$prefix" >/dev/null
 library=$(find "$prefix" -name libvesprun.so)
 export LD_LIBRARY_PATH=${library%/*} PKG_CONFIG_PATH=${library%/*}/pkgconfig
 
-# The shared library shows what the public header marks, and nothing else.
-grep -v '#define' "$prefix/include/vesprun/vesprun.h" | tr '\n' ' ' |
-  grep -oP 'VESPRUN_EXPORT [^(;]*?\K[\w~]+(?=\()' |
+# The shared library shows what the public headers mark, and nothing else.
+cat "$prefix"/include/vesprun/{*.h,NANDInfo/*.h} | grep -v '#define' | tr '\n' ' ' |
+  grep -oP 'VESPRUN_EXPORT [^(;]*?\K[\w~]+(?=\(|;)' |
   sort -u >"$work/marked"
 nm -DC --defined-only "$library" | cut -d' ' -f3- | sed 's/(.*//; s/\[.*//; s/.*:://' |
   sort -u >"$work/visible"
 diff "$work/marked" "$work/visible"
+
+# Another program sees the library's variables, and is not ended for want of a device.
+cat >"$work/values.cpp" <<'END'
+#include <vesprun/vesprun.h>
+#include <iostream>
+int main() {
+  vesprun::gForceCollectionSet = 1;
+  std::cout << vesprun::gCurrentUserWamp + vesprun::gCurrentSysWamp + vesprun::gNeedValidityList;
+  vesprun::NandInfoExtractToEH_runAllSteps(0, true, 1, 0);
+  std::cout << ' ' << vesprun::GetAPIErrorMessage() << '\n';
+}
+END
+# shellcheck disable=SC2046
+c++ -std=c++20 "$work/values.cpp" $(pkg-config --cflags --libs vesprun) -o "$work/values"
+[ "$("$work/values")" = "0 NandInfoExtractToEH_runAllSteps: no device is open" ]
 
 cp -r "$source/examples/print-health" "$work/example"
 cd "$work/example"

@@ -12,14 +12,9 @@ namespace vesprun {
 /// The little-endian unsigned integer of `width` bytes, 0 to 8, at `bytes`, which need not be
 /// aligned.
 inline std::uint64_t loadLittleEndian(const std::uint8_t* bytes, std::size_t width) {
+  static_assert(std::endian::native == std::endian::little);
   std::uint64_t value = 0;
-  if constexpr (std::endian::native == std::endian::little) {
-    std::memcpy(&value, bytes, width);
-  } else {
-    for (std::size_t at = width; at-- > 0;) {
-      value = value << 8 | bytes[at];
-    }
-  }
+  std::memcpy(&value, bytes, width);
   return value;
 }
 

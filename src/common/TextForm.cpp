@@ -6,7 +6,8 @@
 #include <cstdlib>
 #include <string_view>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
+#include "common/HexText.h"
 
 namespace vesprun {
 namespace {
@@ -40,16 +41,6 @@ std::string shortestText(T value) {
   return {text, static_cast<std::size_t>(end - text)};
 }
 
-std::string dataText(const Bytes& data) {
-  static constexpr std::string_view kDigits = "0123456789abcdef";
-  std::string text = "<";
-  for (const std::uint8_t byte : data) {
-    text += kDigits[byte >> 4];
-    text += kDigits[byte & 15];
-  }
-  return text + '>';
-}
-
 std::string spacedDateText(const Date& date) {
   std::string text = dateText({date.seconds, 0});
   text.pop_back();
@@ -58,6 +49,14 @@ std::string spacedDateText(const Date& date) {
 }
 
 }  // namespace
+
+std::string hexadecimalText(std::span<const std::uint8_t> bytes) {
+  std::string text;
+  for (const std::uint8_t byte : bytes) {
+    appendHex(text, byte);
+  }
+  return text;
+}
 
 std::string textForm(const Number& number) {
   switch (number.kind()) {
@@ -84,7 +83,7 @@ std::string textForm(const PropertyValue& value) {
     return spacedDateText(*date);
   }
   if (const Bytes* data = value.data()) {
-    return dataText(*data);
+    return '<' + hexadecimalText(*data) + '>';
   }
   std::string text;
   if (const PropertyArray* array = value.array()) {

@@ -1,6 +1,8 @@
 #pragma once
 
+#include <cstdint>
 #include <optional>
+#include <span>
 #include <string>
 
 #include "common/PropertyValue.h"
@@ -21,5 +23,8 @@ std::string textForm(const Number& number);
 
 /// The text form of a value that may be missing, which is "(null)" then.
 std::string textFormOrNull(const std::optional<PropertyValue>& value);
+
+/// Two lowercase digits for each byte.
+std::string hexadecimalText(std::span<const std::uint8_t> bytes);
 
 }  // namespace vesprun

@@ -6,39 +6,33 @@
 namespace vesprun {
 namespace {
 
-/// False when the entry is there and is no number.
+/// False when the entry is there but not a number.
 bool readUnsigned(const PropertyDict& options, std::string_view name,
                   std::optional<std::uint64_t>& read) {
-  const PropertyValue* value = options.find(name);
-  if (value != nullptr && value->number() != nullptr) {
-    read = value->number()->asUInt64();
+  if (const Number* number = options.findNumber(name)) {
+    read = number->asUInt64();
+    return true;
   }
-  return value == nullptr || read;
+  return !options.contains(name);
 }
 
 }  // namespace
 
-std::optional<ScalarOptions> readScalarOptions(const PropertyDict& options) {
+std::optional<ScalarOptions> ScalarOptions::read(const PropertyDict& options) {
   ScalarOptions read;
-  if (!readUnsigned(options, "bucket_interval", read.bucketInterval) ||
-      !readUnsigned(options, "sig_fig", read.significantDigits)) {
-    return std::nullopt;
-  }
-  return read;
+  const bool isReadable = readUnsigned(options, "bucket_interval", read.bucketInterval) &&
+                          readUnsigned(options, "sig_fig", read.significantDigits);
+  return isReadable ? std::optional(read) : std::nullopt;
 }
 
-std::optional<DistributionOptions> readDistributionOptions(const PropertyDict& options) {
-  const PropertyValue* value = options.find("intervals");
-  if (value == nullptr) {
-    return DistributionOptions{};
-  }
-  const PropertyArray* intervals = value->array();
-  if (intervals == nullptr ||
-      !std::all_of(intervals->begin(), intervals->end(),
-                   [](const PropertyValue& boundary) { return boundary.number() != nullptr; })) {
-    return std::nullopt;
-  }
-  return DistributionOptions{intervals};
+std::optional<DistributionOptions> DistributionOptions::read(const PropertyDict& options) {
+  const PropertyArray* intervals = options.findArray("intervals");
+  const bool isReadable =
+      intervals != nullptr
+          ? std::all_of(intervals->begin(), intervals->end(),
+                        [](const PropertyValue& boundary) { return boundary.number() != nullptr; })
+          : !options.contains("intervals");
+  return isReadable ? std::optional(DistributionOptions{intervals}) : std::nullopt;
 }
 
 }  // namespace vesprun

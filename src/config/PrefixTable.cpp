@@ -1,104 +1,71 @@
 #include "config/PrefixTable.h"
 
 #include <algorithm>
-#include <cstddef>
 
 namespace vesprun {
 namespace {
 
-/// So many places are tried for a state's children before they go behind all others, which bounds
-/// the time that unfavourable prefixes can take.
-constexpr std::uint32_t kMostPlacesTried = 1024;
+std::size_t commonLength(std::string_view left, std::string_view right) {
+  const auto [end, ignored] = std::mismatch(left.begin(), left.end(), right.begin(), right.end());
+  return static_cast<std::size_t>(end - left.begin());
+}
 
-struct SortedPrefix {
-  std::string_view text;
-  std::uint32_t place;
-};
-
-/// A state whose children are still to be made: the prefixes that lead through it.
-struct OpenState {
-  std::uint32_t state;
-  std::uint32_t begin;
-  std::uint32_t end;
-  std::size_t depth;
-};
-
-std::vector<SortedPrefix> sortedPrefixes(const PropertyDict& optionsByPrefix) {
-  std::vector<SortedPrefix> sorted;
-  sorted.reserve(optionsByPrefix.size());
-  for (const auto& [prefix, options] : optionsByPrefix) {
-    sorted.push_back({prefix, static_cast<std::uint32_t>(sorted.size())});
+/// The first eight bytes as a number that orders as the text does; a shorter text may tie.
+std::uint64_t head(std::string_view text) {
+  std::uint64_t head = 0;
+  for (std::size_t i = 0; i < sizeof head; ++i) {
+    head = head << 8 | (i < text.size() ? static_cast<std::uint8_t>(text[i]) : 0);
   }
-  std::sort(sorted.begin(), sorted.end(),
-            [](const auto& left, const auto& right) { return left.text < right.text; });
-  return sorted;
+  return head;
 }
 
 }  // namespace
 
-PrefixTable::PrefixTable(PropertyDict optionsByPrefix)
-    : _optionsByPrefix(std::move(optionsByPrefix)), _cells(1) {
-  const std::vector<SortedPrefix> sorted = sortedPrefixes(_optionsByPrefix);
-  std::uint32_t firstFree = 1;
-  std::vector<Branch> branches;
-  std::vector<OpenState> open{{0, 0, static_cast<std::uint32_t>(sorted.size()), 0}};
-  while (!open.empty()) {
-    const auto [state, begin, end, depth] = open.back();
-    open.pop_back();
-    branches.clear();
-    for (std::uint32_t i = begin; i < end; ++i) {
-      if (sorted[i].text.size() == depth) {
-        _cells[state].answer = std::min(_cells[state].answer, sorted[i].place);
-        continue;
-      }
-      const auto byte = static_cast<std::uint8_t>(sorted[i].text[depth]);
-      if (branches.empty() || branches.back().byte != byte) {
-        branches.push_back({byte, i, i});
-      }
-      branches.back().end = i + 1;
+PrefixTable::PrefixTable(const std::vector<std::string_view>& prefixes) {
+  for (const std::string_view prefix : prefixes) {
+    _sorted.push_back({prefix, static_cast<std::uint32_t>(_sorted.size()), nullptr});
+  }
+  if (_sorted.empty()) {
+    return;
+  }
+  std::sort(_sorted.begin(), _sorted.end(),
+            [](const Entry& left, const Entry& right) { return left.text < right.text; });
+  const std::string_view front = _sorted.front().text;
+  _common = front.substr(0, commonLength(front, _sorted.back().text));
+  const Entry* longest = nullptr;
+  for (Entry& entry : _sorted) {
+    while (longest != nullptr && !entry.text.starts_with(longest->text)) {
+      longest = longest->longest;
     }
-    if (branches.empty()) {
-      continue;
+    if (longest != nullptr) {
+      entry.longest = longest;
+      entry.first = std::min(entry.first, longest->first);
     }
-    const std::uint32_t base = baseFor(branches, firstFree);
-    _cells[state].base = base;
-    for (const Branch& branch : branches) {
-      const std::uint32_t child = base + branch.byte;
-      if (child >= _cells.size()) {
-        _cells.resize(child + std::size_t{1});
-      }
-      _cells[child].parent = state;
-      _cells[child].answer = _cells[state].answer;
-      open.push_back({child, branch.begin, branch.end, depth + 1});
-    }
+    longest = &entry;
+    _heads.push_back(head(entry.text.substr(_common.size())));
   }
 }
 
-std::uint32_t PrefixTable::baseFor(std::span<const Branch> branches, std::uint32_t& firstFree) {
-  while (!isFree(firstFree)) {
-    ++firstFree;
+std::optional<std::size_t> PrefixTable::find(std::string_view key) const {
+  if (!key.starts_with(_common)) {
+    return std::nullopt;
   }
-  for (std::uint32_t cell = firstFree; cell - firstFree < kMostPlacesTried; ++cell) {
-    const std::uint32_t base = cell - branches.front().byte;
-    if (std::all_of(branches.begin(), branches.end(),
-                    [&](const Branch& branch) { return isFree(base + branch.byte); })) {
-      return base;
+  const auto [from, to] =
+      std::equal_range(_heads.begin(), _heads.end(), head(key.substr(_common.size())));
+  const auto above = std::upper_bound(
+      _sorted.begin() + (from - _heads.begin()), _sorted.begin() + (to - _heads.begin()), key,
+      [](std::string_view text, const Entry& entry) { return text < entry.text; });
+  if (above == _sorted.begin()) {
+    return std::nullopt;
+  }
+  const Entry* entry = &*(above - 1);
+  if (!key.starts_with(entry->text)) {
+    const std::size_t length = commonLength(entry->text, key);
+    while (entry != nullptr && entry->text.size() > length) {
+      entry = entry->longest;
     }
   }
-  return static_cast<std::uint32_t>(_cells.size()) - branches.front().byte;
-}
-
-const PrefixTable::Entry* PrefixTable::find(std::string_view key) const {
-  std::uint32_t state = 0;
-  for (const char c : key) {
-    const std::uint32_t next = _cells[state].base + static_cast<std::uint8_t>(c);
-    if (next >= _cells.size() || _cells[next].parent != state) {
-      break;
-    }
-    state = next;
-  }
-  const std::uint32_t answer = _cells[state].answer;
-  return answer != kNone ? &*(_optionsByPrefix.begin() + answer) : nullptr;
+  return entry != nullptr ? std::optional<std::size_t>(entry->first) : std::nullopt;
 }
 
 }  // namespace vesprun

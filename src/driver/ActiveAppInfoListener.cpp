@@ -4,8 +4,10 @@
 #include <string>
 #include <string_view>
 
+#include "common/AppInfoList.h"
 #include "common/TextForm.h"
 #include "driver/DailyTasks.h"
+#include "platform/Guarded.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
@@ -26,35 +28,21 @@ std::int64_t integerField(const PropertyDict& dict, std::string_view key) {
   return number != nullptr ? number->asInt64() : 0;
 }
 
-std::string textField(const PropertyDict& dict, std::string_view key) {
-  const PropertyValue* value = dict.find(key);
-  const std::string* text = value != nullptr ? value->string() : nullptr;
-  return text != nullptr ? *text : "";
-}
-
-std::string uuidField(const PropertyDict& dict, std::string_view key) {
-  constexpr std::string_view kDigits = "0123456789ABCDEF";
-  constexpr std::size_t kLength = 16;
-  const PropertyValue* value = dict.find(key);
-  const Bytes* bytes = value != nullptr ? value->data() : nullptr;
-  if (bytes == nullptr || bytes->size() != kLength) {
-    return "";
-  }
+std::string textForm(const AppInfoList& list) {
   std::string text;
-  for (std::size_t i = 0; i < kLength; ++i) {
-    if (i == 4 || i == 6 || i == 8 || i == 10) {
-      text += '-';
-    }
-    text += kDigits[(*bytes)[i] >> 4U];
-    text += kDigits[(*bytes)[i] & 0xFU];
-  }
-  return text;
+  list.forEach([&text](const PropertyDict& app) {
+    text += (text.empty() ? "(" : ", ") + textForm(PropertyValue(app));
+  });
+  return text.empty() ? "()" : text + ')';
 }
 
 void takeActiveAppInfo(const PropertyDict& message) {
-  const AppInfoList list = appInfoListFromData(message.find("app_data"));
-  logMessage(LogLevel::Default, "vesprun got %sAAI:\n%s",
-             aaiRequested ? "requested" : "(unsolicited -- so ignoring) ", textForm(list).c_str());
+  const AppInfoList list(message.find("app_data"));
+  if (platform().systemLog().keeps(LogLevel::Default)) {
+    logMessage(LogLevel::Default, "vesprun got %sAAI:\n%s",
+               aaiRequested ? "requested" : "(unsolicited -- so ignoring) ",
+               textForm(list).c_str());
+  }
   if (aaiRequested) {
     runDayCheck(&list);
     aaiRequested = false;
@@ -68,25 +56,6 @@ void requestActiveAppInfo() {
 }
 
 }  // namespace
-
-AppInfoList appInfoListFromData(const PropertyValue* appData) {
-  AppInfoList list;
-  const PropertyArray* elements = appData != nullptr ? appData->array() : nullptr;
-  if (elements == nullptr) {
-    return list;
-  }
-  list.reserve(elements->size());
-  for (const PropertyValue& element : *elements) {
-    if (const PropertyDict* app = element.dict()) {
-      list.emplace_back(PropertyDict{{"bundle", textField(*app, "bundle_id")},
-                                     {"version", textField(*app, "version")},
-                                     {"adamID", integerField(*app, "adam_id")},
-                                     {"arch", integerField(*app, "arch")},
-                                     {"uuid", uuidField(*app, "uuid")}});
-    }
-  }
-  return list;
-}
 
 void handlePeerMessage(const PropertyValue& message) {
   const PropertyDict* dict = message.dict();
@@ -106,7 +75,8 @@ void handlePeerMessage(const PropertyValue& message) {
 }
 
 void handleNewPeer(PeerConnection& peer) {
-  peer.setMessageHandler(handlePeerMessage);
+  peer.setMessageHandler(
+      [](const PropertyValue& message) { runGuarded([&message] { handlePeerMessage(message); }); });
   peer.start();
 }
 

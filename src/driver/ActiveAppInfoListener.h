@@ -1,6 +1,5 @@
 #pragma once
 
-#include "common/AppInfoList.h"
 #include "platform/MessageService.h"
 
 namespace vesprun {
@@ -22,13 +21,6 @@ void handleNewPeer(PeerConnection& peer);
 ///
 /// Of all messages with another operation than 2 only the first in the life of the process counts.
 void handlePeerMessage(const PropertyValue& message);
-
-/// The list that the elements of "app_data" make, in their order: "bundle", "version", "adamID"
-/// (64-bit), "arch" (64-bit) and "uuid" (upper case, 8-4-4-4-12). No array is no apps, and an
-/// element that is no dictionary is skipped. A field that is missing or of another type, and a
-/// "uuid" of other than 16 bytes, becomes the empty text, or 0. As everywhere in a message, a
-/// fraction counts as the integer that it truncates to.
-AppInfoList appInfoListFromData(const PropertyValue* appData);
 
 /// For tests: nothing requested and no message come yet, as at the start of a process.
 void startActiveAppInfoAfresh();

@@ -6,12 +6,13 @@
 
 #include "driver/ActiveAppInfoListener.h"
 #include "driver/DailyTasks.h"
-#include "driver/Guarded.h"
+#include "platform/Guarded.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
 namespace {
 
+constexpr int kMostFailures = 100;  // of the main loop, one behind the other
 constexpr std::string_view kServiceName = "com.quill.aggregated.vesprun";
 
 void runOption(const char* argument) {
@@ -45,8 +46,14 @@ void runListenerMode(double quietSeconds) {
     listener->setPeerHandler(handleNewPeer);
     listener->start();
   }
-  MainLoop& mainLoop = platform().mainLoop();
-  while (mainLoop.runMainLoopSlice(quietSeconds) == MainLoop::SliceResult::HandledEvent) {
+  auto result = MainLoop::SliceResult::HandledEvent;
+  // A slice that fails has most likely used up its event, such as a message too large to be read.
+  for (int failures = 0; result == MainLoop::SliceResult::HandledEvent && failures < kMostFailures;
+       ++failures) {
+    runGuarded([&] {
+      result = platform().mainLoop().runMainLoopSlice(quietSeconds);
+      failures = -1;
+    });
   }
   if (aaiRequested) {
     logMessage(LogLevel::Default, "never received requested AAI, so moving along without it");

@@ -2,38 +2,30 @@
 
 #include <string_view>
 
-#include "driver/Guarded.h"
+#include "driver/DailyStorageAndDeviceStats.h"
 #include "driver/TaskingSync.h"
+#include "platform/Guarded.h"
 #include "platform/Platform.h"
 #include "platform/PreferenceNames.h"
 #include "report/TBReport.h"
-#include "telemetry/DailyStorageAndDeviceStats.h"
 
 namespace vesprun {
 namespace {
 
 constexpr std::string_view kStoredDayKey = "LastCrashLogSerializationDateInDaysSince1970";
 
-}  // namespace
+/// Longer than a day's work takes; a holder that has stopped must not hold up the others for ever.
+constexpr double kLongestWaitForOthers = 300;
 
-std::int32_t dayBefore(std::int32_t day) {
-  return static_cast<std::int32_t>(static_cast<std::uint32_t>(day) - 1U);
+bool isAlone() { return platform().dailyWorkLock().lock(kLongestWaitForOthers); }
+
+std::int32_t yesterday() { return dayBefore(platform().tallybook().TBDaysSince1970()); }
+
+bool isDoneFor(std::int32_t day) {
+  return platform().preferences().LGSPreferencesGetIntegerValue(kStoredDayKey, kOwnDomain) >= day;
 }
 
-void runDayCheck(const AppInfoList* appInfo) {
-  const std::int32_t yesterday = dayBefore(platform().tallybook().TBDaysSince1970());
-  Preferences& preferences = platform().preferences();
-  const std::int64_t last = preferences.LGSPreferencesGetIntegerValue(kStoredDayKey, kOwnDomain);
-  if (last >= yesterday) {
-    logMessage(LogLevel::Default, "Day unchanged since last run");
-    return;
-  }
-  runDailyTasks(yesterday, appInfo);
-  preferences.LGSPreferencesSetValue(kStoredDayKey, yesterday, kOwnDomain);
-  preferences.LGSPreferencesSynchronize(kOwnDomain);
-}
-
-void runDailyTasks(std::int32_t day, const AppInfoList* appInfo) {
+void runTasks(std::int32_t day, const AppInfoList* appInfo) {
   logMessage(LogLevel::Default, "daily tasks for day %d", day);
   const auto checkpoint = [] { platform().tallybook().TBClientCheckpoint(); };
   runGuarded(checkpoint);
@@ -48,6 +40,41 @@ void runDailyTasks(std::int32_t day, const AppInfoList* appInfo) {
   runGuarded([] { platform().logsmith().rollTendmarkLogs(); });
   // Before the day is stored: a run that is killed must not lose what the tasks counted.
   runGuarded(checkpoint);
+}
+
+/// Whether the day's tasks are still to be run, for a process that keeps the others off.
+bool isStillDue(std::int32_t day) {
+  // Lets go of what was read before another process may have stored the day.
+  platform().preferences().LGSPreferencesSynchronize(kOwnDomain);
+  return !isDoneFor(day);
+}
+
+}  // namespace
+
+std::int32_t dayBefore(std::int32_t day) {
+  return static_cast<std::int32_t>(static_cast<std::uint32_t>(day) - 1U);
+}
+
+void runDayCheck(const AppInfoList* appInfo) {
+  if (!isDoneFor(yesterday())) {
+    if (!isAlone()) {
+      return;
+    }
+    const std::int32_t day = yesterday();
+    if (isStillDue(day)) {
+      runTasks(day, appInfo);
+      platform().preferences().LGSPreferencesSetValue(kStoredDayKey, day, kOwnDomain);
+      platform().preferences().LGSPreferencesSynchronize(kOwnDomain);
+      return;
+    }
+  }
+  logMessage(LogLevel::Default, "Day unchanged since last run");
+}
+
+void runDailyTasks(std::int32_t day, const AppInfoList* appInfo) {
+  if (isAlone()) {
+    runTasks(day, appInfo);
+  }
 }
 
 }  // namespace vesprun

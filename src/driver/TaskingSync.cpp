@@ -7,7 +7,9 @@
 #include <set>
 #include <string>
 #include <string_view>
+#include <unordered_map>
 #include <utility>
+#include <vector>
 
 #include "common/PropertyDict.h"
 #include "common/TextForm.h"
@@ -47,51 +49,50 @@ std::optional<std::string_view> textEntry(const PropertyDict& record, std::strin
   return text != nullptr ? std::optional<std::string_view>(*text) : std::nullopt;
 }
 
-void changeMobilePreference(const PropertyDict& record, OptionalValue value, DomainSet& changed) {
-  const std::optional<std::string_view> domain = textEntry(record, "Domain");
-  platform().preferences().LGSPreferencesSetValue(textEntry(record, "Key"), std::move(value),
-                                                  domain.value_or(""));
-  if (domain) {
-    changed.emplace(*domain);
+/// One setting of a payload; what it lacks, or has in another type, is missing here.
+struct TaskingRecord {
+  explicit TaskingRecord(const PropertyValue& element) {
+    if (const PropertyDict* record = element.dict()) {
+      user = textEntry(*record, "User").value_or("");
+      domain = textEntry(*record, "Domain").value_or("");
+      key = textEntry(*record, "Key");
+      value = record->find("Value");
+    }
   }
-}
 
-void undoRecord(const PropertyDict& record, DomainSet& changed) {
-  const std::string_view user = textEntry(record, "User").value_or("");
-  const std::string_view domain = textEntry(record, "Domain").value_or("");
-  if (user == kMobileUser) {
-    changeMobilePreference(record, std::nullopt, changed);
-  } else if (user == kDiagnosticsUser) {
-    platform().systemConfiguration().setPrefsKeyValueForDomainWithSync(textEntry(record, "Key"),
-                                                                       std::nullopt, domain, false);
+  std::string_view user;
+  std::string_view domain;
+  std::optional<std::string_view> key;
+  const PropertyValue* value = nullptr;
+};
+
+enum class Change { Apply, Undo };
+
+void changePreference(const TaskingRecord& record, Change change, DomainSet& changed) {
+  const bool applies = change == Change::Apply;
+  OptionalValue value;
+  if (applies && record.value != nullptr) {
+    value = *record.value;
+  }
+  if (record.user == kMobileUser) {
+    platform().preferences().LGSPreferencesSetValue(record.key, std::move(value), record.domain);
+    changed.emplace(record.domain);
+  } else if (record.user == kDiagnosticsUser) {
+    platform().systemConfiguration().setPrefsKeyValueForDomainWithSync(record.key, std::move(value),
+                                                                       record.domain, applies);
+  } else if (applies) {
+    platform().servicesClient().setPreferenceForUserInDomainToValue(
+        record.key, record.user, record.domain, std::move(value));
   } else {
-    platform().servicesClient().deletePreferenceForUserInDomain(textEntry(record, "Key"), user,
-                                                                domain);
+    platform().servicesClient().deletePreferenceForUserInDomain(record.key, record.user,
+                                                                record.domain);
   }
 }
 
-void applyRecord(const PropertyDict& record, DomainSet& changed) {
-  const std::string_view user = textEntry(record, "User").value_or("");
-  const std::string_view domain = textEntry(record, "Domain").value_or("");
-  const PropertyValue* entry = record.find("Value");
-  OptionalValue value = entry != nullptr ? OptionalValue(*entry) : std::nullopt;
-  if (user == kMobileUser) {
-    changeMobilePreference(record, std::move(value), changed);
-  } else if (user == kDiagnosticsUser) {
-    platform().systemConfiguration().setPrefsKeyValueForDomainWithSync(
-        textEntry(record, "Key"), std::move(value), domain, true);
-  } else {
-    platform().servicesClient().setPreferenceForUserInDomainToValue(textEntry(record, "Key"), user,
-                                                                    domain, std::move(value));
-  }
-}
-
-void forEachRecord(const PropertyValue& payload, DomainSet& changed,
-                   void (*handle)(const PropertyDict&, DomainSet&)) {
-  const PropertyDict nothing;
+void changePreferences(const PropertyValue& payload, Change change, DomainSet& changed) {
   if (const PropertyArray* records = payload.array()) {
     for (const PropertyValue& record : *records) {
-      handle(record.dict() != nullptr ? *record.dict() : nothing, changed);
+      changePreference(TaskingRecord(record), change, changed);
     }
   }
 }
@@ -101,7 +102,7 @@ void undoStoredTasking(DomainSet& changed) {
   if (!payload) {
     return;
   }
-  forEachRecord(*payload, changed, undoRecord);
+  changePreferences(*payload, Change::Undo, changed);
   for (const std::string_view key : {kTaskingIDKey, kTaskingDigestKey, kTaskingPayloadKey}) {
     storeValue(key, std::nullopt);
   }
@@ -113,7 +114,7 @@ void applyTasking(const OptionalValue& tasking, const OptionalValue& build, Doma
   if (!payload) {
     return;
   }
-  forEachRecord(*payload, changed, applyRecord);
+  changePreferences(*payload, Change::Apply, changed);
   storeValue(kTaskingIDKey, entryOf(tasking, kTaskingIDKey));
   storeValue(kSystemKey, build);
   storeValue(kTaskingDigestKey, entryOf(tasking, kTaskingDigestKey));
@@ -121,7 +122,9 @@ void applyTasking(const OptionalValue& tasking, const OptionalValue& build, Doma
   changed.emplace(kOwnDomain);
 }
 
+/// The own domain, which says what was applied, comes last.
 void synchronize(DomainSet changed) {
+  platform().servicesClient().synchronizeAllUsers();
   const bool own = changed.erase(std::string(kOwnDomain)) != 0;
   for (const std::string& domain : changed) {
     platform().preferences().LGSPreferencesSynchronize(domain);
@@ -166,10 +169,22 @@ void syncTasking(const OptionalValue& build) {
   platform().notificationCenter().PostNotification("com.quill.da.tasking_changed");
 }
 
+/// A text that is the same for equal values, -0.0 and 0 too, and seldom so for others.
+std::string bucketOf(const PropertyValue& value) {
+  if (const Number* number = value.number()) {
+    return std::to_string(number->asDouble() + 0.0);
+  }
+  return value.string() != nullptr ? *value.string() : "";
+}
+
 PropertyArray distinctEntries(const PropertyArray& entries) {
   PropertyArray distinct;
+  std::unordered_map<std::string, std::vector<const PropertyValue*>> buckets;
   for (const PropertyValue& entry : entries) {
-    if (std::find(distinct.begin(), distinct.end(), entry) == distinct.end()) {
+    std::vector<const PropertyValue*>& bucket = buckets[bucketOf(entry)];
+    if (std::none_of(bucket.begin(), bucket.end(),
+                     [&entry](const PropertyValue* other) { return *other == entry; })) {
+      bucket.push_back(&entry);
       distinct.push_back(entry);
     }
   }

@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 
 namespace vesprun {
 

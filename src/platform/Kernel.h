@@ -26,9 +26,13 @@ class Kernel {
   /// its final NUL.
   ///
   /// "kern.next_ecc_event" (72 bytes) is a queue: each successful read takes one event out of it.
-  /// An empty queue is error 2.
+  /// An empty queue is error 2. Where the platform can keep an event, one that was read and not
+  /// acknowledged is in the queue again when the process has ended.
   virtual int sysctlbyname(const std::string& name, std::span<std::uint8_t> buffer,
                            std::size_t& length) = 0;
+
+  /// Lets go of the ECC event that was read last. False when it will be read again.
+  virtual bool acknowledgeECCEvent() = 0;
 
   /// Bytes of a memory page.
   virtual std::uint64_t pageSize() = 0;

@@ -39,8 +39,8 @@ class Logsmith {
   /// Tells of the running OS; "ProductBuildVersion", a string, identifies its build.
   virtual PropertyDict CopySystemVersionDictionary() = 0;
 
-  /// Records one structured-data log record under a type code.
-  virtual void FLLogStructuredData(std::int32_t type, const PropertyDict& record) = 0;
+  /// Records one structured-data log record under a type code. False when it could not be kept.
+  virtual bool FLLogStructuredData(std::int32_t type, const PropertyDict& record) = 0;
 
   /// Housekeeping of old structured-data logs and of service-plan logs.
   virtual void FLDumpAllOldStructuredDataLogs() = 0;

@@ -46,7 +46,8 @@ class UsageFeed {
 /// A reply may come while the process ends. The platform therefore ends this service before any
 /// other: it waits for a handler that is running, and drops the handlers that are still to be
 /// called. A handler is safe when it uses only services that may be called from any thread
-/// (`Tallybook`, `Preferences`, `SystemLog`), by references that it was made with: which platform
+/// (`Tallybook`, `Preferences`, `PtreeSerialization`,
+/// `SystemLog`), by references that it was made with: which platform
 /// is installed may change before it runs.
 class Murmur {
  public:

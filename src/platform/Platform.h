@@ -1,6 +1,7 @@
 #pragma once
 
 #include "platform/Clock.h"
+#include "platform/DailyWorkLock.h"
 #include "platform/DeviceRegistry.h"
 #include "platform/DiagnosticHeader.h"
 #include "platform/EventHub.h"
@@ -36,6 +37,7 @@ class Platform {
   virtual ~Platform() = default;
 
   virtual Clock& clock() = 0;
+  virtual DailyWorkLock& dailyWorkLock() = 0;
   virtual DeviceRegistry& deviceRegistry() = 0;
   virtual DiagnosticHeader& diagnosticHeader() = 0;
   virtual EventHub& eventHub() = 0;

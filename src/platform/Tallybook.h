@@ -5,7 +5,7 @@
 #include <memory>
 #include <string_view>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 
 namespace vesprun {
 
@@ -34,7 +34,8 @@ class TBHistory {
 
   virtual ~TBHistory() = default;
 
-  virtual void scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+  /// False when the database could not be read to its end.
+  virtual bool scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
       std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
       const ScalarRowHandler& rowHandler) = 0;
 
@@ -68,9 +69,8 @@ class Tallybook {
   /// Adds to a scalar of today, wrapping in 64 bits; a missing one counts as 0.
   virtual void TBClientAddValueForScalarKey(std::string_view key, std::int64_t value) = 0;
 
-  /// A history of the device's own database (`initWithDefaultPath`). It sees what the last
-  /// checkpoint wrote.
-  virtual std::unique_ptr<TBHistory> openHistory() = 0;
+  /// A history of the device's own database. It sees what the last checkpoint wrote.
+  virtual std::unique_ptr<TBHistory> initWithDefaultPath() = 0;
 };
 
 }  // namespace vesprun

@@ -21,11 +21,6 @@ HistogramBoundaries::HistogramBoundaries(const PropertyArray& intervals) {
   }
 }
 
-std::uint32_t determineHistBucketForValueWithIntervals(double value,
-                                                       const PropertyArray& intervals) {
-  return HistogramBoundaries(intervals).bucketFor(value);
-}
-
 std::optional<PropertyDict> histogramDictForIntervalsWithHistCounts(
     const PropertyArray& intervals, std::span<const std::uint64_t> counts) {
   constexpr double kInfinity = std::numeric_limits<double>::infinity();

@@ -11,34 +11,33 @@
 namespace vesprun {
 
 /// The boundaries of a histogram, made ready for many look-ups: n numbers, read as doubles, bound
-/// n + 1 buckets. What is no number counts as NaN.
+/// n + 1 buckets.
 class HistogramBoundaries {
  public:
   explicit HistogramBoundaries(const PropertyArray& intervals);
 
   std::size_t bucketCount() const { return _highest.size() + 1; }
 
-  /// The index of the first boundary, in array order, that is not below `value`; n when there is
-  /// none, as for NaN.
-  std::uint32_t bucketFor(double value) const {
-    // The first boundary that reaches a value is also the first place where the running maximum
-    // does, and that one is sorted. Written without jumps: values come in no order.
-    std::size_t bucket = 0;
-    for (std::size_t rest = _highest.size(); rest > 0;) {
-      const std::size_t half = (rest + 1) / 2;
-      bucket += _highest[bucket + half - 1] >= value ? 0 : half;
-      rest -= half;
-    }
-    return static_cast<std::uint32_t>(bucket);
-  }
-
  private:
+  friend std::uint32_t determineHistBucketForValueWithIntervals(double, const HistogramBoundaries&);
+
   std::vector<double> _highest;  ///< of the boundaries up to each; NaN before the first number
 };
 
-/// The bucket of one value, by boundaries read afresh.
-std::uint32_t determineHistBucketForValueWithIntervals(double value,
-                                                       const PropertyArray& intervals);
+/// The index of the first boundary, in array order, that is not below `value`; n when there is
+/// none, as for NaN.
+inline std::uint32_t determineHistBucketForValueWithIntervals(
+    double value, const HistogramBoundaries& intervals) {
+  // The first boundary that reaches a value is also the first place where the running maximum
+  // does, and that one is sorted. Written without jumps: values come in no order.
+  std::size_t bucket = 0;
+  for (std::size_t rest = intervals._highest.size(); rest > 0;) {
+    const std::size_t half = (rest + 1) / 2;
+    bucket += intervals._highest[bucket + half - 1] >= value ? 0 : half;
+    rest -= half;
+  }
+  return static_cast<std::uint32_t>(bucket);
+}
 
 /// Label to count (unsigned 64-bit), in bucket order, for the buckets that are not empty; nothing
 /// when all are. Bucket i is "(lower, upper]", the last one "(lower, inf)", the first one's lower

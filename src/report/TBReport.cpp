@@ -6,11 +6,14 @@
 #include <utility>
 #include <vector>
 
-#include "config/KeyOptions.h"
 #include "platform/Platform.h"
+#include "platform/PreferenceNames.h"
+#include "report/DistributionStats.h"
 #include "report/Histogram.h"
+#include "report/KernelMemoryStatistics.h"
+#include "report/LogSubmission.h"
+#include "report/ReportSources.h"
 #include "report/RoundScalar.h"
-#include "report/RunningStatistics.h"
 
 namespace vesprun {
 namespace {
@@ -37,11 +40,17 @@ std::optional<HistogramCounters> allocateCounters(const PropertyArray& intervals
   }
 }
 
+PropertyValue preferenceOr(std::string_view key, PropertyValue fallback) {
+  std::optional<PropertyValue> value =
+      platform().preferences().LGSPreferencesGetValue(key, kOwnDomain);
+  return value ? *std::move(value) : std::move(fallback);
+}
+
 }  // namespace
 
 TBReport::TBReport() : _config(TBConfig::init()) {}
 
-const PropertyDict* TBReport::optionsForScalarKey(std::string_view key) const {
+const ScalarOptions* TBReport::optionsForScalarKey(std::string_view key) const {
   return _config ? _config->configOptionsForScalarKey(key) : nullptr;
 }
 
@@ -51,8 +60,16 @@ void TBReport::writeLogForYesterdayWithAppInfo(std::int32_t day, const AppInfoLi
   serializeWithDateAndAppInfo(day, appInfo);
 }
 
+void TBReport::serializeWithDateAndAppInfo(std::int32_t day, const AppInfoList* appInfo) {
+  if (_scalarsOutput.empty() && _distributionsOutput.empty() && _histogramsOutput.empty()) {
+    return;
+  }
+  addOwnSources();
+  submitDailyLog(takeDocument(day, appInfo));
+}
+
 void TBReport::readHistory(std::int32_t day) {
-  const std::unique_ptr<TBHistory> history = platform().tallybook().openHistory();
+  const std::unique_ptr<TBHistory> history = platform().tallybook().initWithDefaultPath();
   if (!history) {
     return;
   }
@@ -60,7 +77,7 @@ void TBReport::readHistory(std::int32_t day) {
   history->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
       "", firstDay, day,
       [this](std::string_view key, std::int32_t /*day*/, std::int64_t value, bool& /*stop*/) {
-        if (const PropertyDict* options = optionsForScalarKey(key)) {
+        if (const ScalarOptions* options = optionsForScalarKey(key)) {
           addScalarForKeyWithOptions(value, key, *options);
         }
       });
@@ -68,52 +85,72 @@ void TBReport::readHistory(std::int32_t day) {
       "", firstDay, day,
       [this](std::string_view key, std::int32_t /*day*/, TBHistoryDistributionEnumerator& values,
              bool& /*stop*/) {
-        if (const PropertyDict* options =
+        if (const DistributionOptions* options =
                 _config ? _config->configOptionsForDistributionKey(key) : nullptr) {
           computeAndAddDistributionForKeyWithOptions(values, key, *options);
         }
       });
 }
 
-std::optional<std::int64_t> TBReport::addScalarForKeyWithOptions(std::int64_t value,
-                                                                 std::string_view key,
-                                                                 const PropertyDict& options) {
-  const std::optional<ScalarOptions> read = readScalarOptions(options);
-  if (!read) {
-    return std::nullopt;
+void TBReport::addOwnSources() {
+  addInstalledAppInfo(*this);
+  addMetadataKeys(_metadataOutput);
+  reportDatabaseSize(*this);
+  reportCPUUptime(*this);
+  reportVMStats(*this);
+}
+
+PropertyDict TBReport::takeDocument(std::int32_t day, const AppInfoList* appInfo) {
+  const std::string whitelistDigest = _config ? _config->configFileDigest() : "";
+  _config.reset();
+  PropertyDict document;
+  document.set("TBCrashLogVersion", 1);
+  document.set("TBStartDate", platform().tallybook().dateForDaysSince1970(day));
+  document.set("TBLogCreationDate", platform().clock().now());
+  document.set("TBMetadata", std::exchange(_metadataOutput, {}));
+  document.set("TBScalars", std::exchange(_scalarsOutput, {}));
+  document.set("TBDistributions", std::exchange(_distributionsOutput, {}));
+  document.set("TBDistributionsHistogram", std::exchange(_histogramsOutput, {}));
+  document.set("TBTasking", preferenceOr(kTaskingPayloadKey, PropertyArray()));
+  document.set("TBTaskID", preferenceOr(kTaskingIDKey, "(no tasking id)"));
+  document.set("TBTaskDigest", preferenceOr(kTaskingDigestKey, "(no tasking digest)"));
+  document.set("TBWhitelistDigest", whitelistDigest);
+  if (appInfo != nullptr) {
+    document.set("TBActivatedAppInfo", appInfo->array());
   }
-  const std::int64_t rounded = roundScalar(value, *read);
+  return document;
+}
+
+std::int64_t TBReport::addScalarForKeyWithOptions(std::int64_t value, std::string_view key,
+                                                  const ScalarOptions& options) {
+  const std::int64_t rounded = roundScalar(value, options);
   _scalarsOutput.set(key, rounded);
   return rounded;
 }
 
 void TBReport::addScalarForKeyByExecutingBlock(std::string_view key,
                                                const ScalarProducer& producer) {
-  if (const PropertyDict* options = optionsForScalarKey(key)) {
+  if (const ScalarOptions* options = optionsForScalarKey(key)) {
     addScalarForKeyWithOptions(producer(), key, *options);
   }
 }
 
 void TBReport::computeAndAddDistributionForKeyWithOptions(TBHistoryDistributionEnumerator& values,
                                                           std::string_view key,
-                                                          const PropertyDict& options) {
-  const std::optional<DistributionOptions> read = readDistributionOptions(options);
-  if (!read) {
-    return;
-  }
+                                                          const DistributionOptions& options) {
   std::optional<HistogramCounters> histogram;
-  if (read->intervals != nullptr) {
-    histogram = allocateCounters(*read->intervals, key);
+  if (options.intervals != nullptr) {
+    histogram = allocateCounters(*options.intervals, key);
   }
-  RunningStatistics statistics;
+  DistributionStats statistics;
   double value = 0.0;
   if (histogram) {
     while (values.getNextValueSecondsInDayOffset(value, nullptr)) {
-      ++histogram->counts[histogram->boundaries.bucketFor(value)];
+      ++histogram->counts[determineHistBucketForValueWithIntervals(value, histogram->boundaries)];
       statistics.add(value);
     }
     if (std::optional<PropertyDict> dict =
-            histogramDictForIntervalsWithHistCounts(*read->intervals, histogram->counts)) {
+            histogramDictForIntervalsWithHistCounts(*options.intervals, histogram->counts)) {
       _histogramsOutput.set(key, *std::move(dict));
     } else {
       _histogramsOutput.remove(key);
@@ -123,7 +160,7 @@ void TBReport::computeAndAddDistributionForKeyWithOptions(TBHistoryDistributionE
       statistics.add(value);
     }
   }
-  _distributionsOutput.set(key, statistics.stats());
+  _distributionsOutput.set(key, statistics.toArray());
 }
 
 }  // namespace vesprun

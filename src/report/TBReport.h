@@ -30,16 +30,16 @@ class TBReport {
   /// `appInfo` may be null. (No day comes before the lowest number; it is then read alone.)
   void writeLogForYesterdayWithAppInfo(std::int32_t day, const AppInfoList* appInfo);
 
-  /// Unless scalars, distributions and histograms are all empty: runs the sources, builds the
-  /// document of `day`, and submits it as log "log-aggregated" of type "193". The header names the
-  /// previous OS version on the first log after it changed. The outputs are moved into the
-  /// document.
+  /// Unless scalars, distributions and histograms are all empty: runs the log's own sources, and
+  /// submits the document of `day`, into which the outputs are moved.
   void serializeWithDateAndAppInfo(std::int32_t day, const AppInfoList* appInfo);
 
+  /// The options with which the whitelist lets a scalar through; null when it does not.
+  const ScalarOptions* optionsForScalarKey(std::string_view key) const;
+
   /// Stores `value`, rounded as the options ask (`roundScalar`), and returns what was stored.
-  /// Nothing is stored or returned when the options cannot be read.
-  std::optional<std::int64_t> addScalarForKeyWithOptions(std::int64_t value, std::string_view key,
-                                                         const PropertyDict& options);
+  std::int64_t addScalarForKeyWithOptions(std::int64_t value, std::string_view key,
+                                          const ScalarOptions& options);
 
   /// Runs the producer and adds what it yields, only when the key is whitelisted.
   void addScalarForKeyByExecutingBlock(std::string_view key, const ScalarProducer& producer);
@@ -47,42 +47,19 @@ class TBReport {
   /// Goes once through the values and stores their statistics and, when the options name
   /// "intervals", their histogram; an empty histogram removes the key's earlier one. Memory is one
   /// counter and one boundary for each bucket. When there is none to be had, a log line says so and
-  /// the statistics are stored alone. Nothing is stored when the options cannot be read.
+  /// the statistics are stored alone.
   void computeAndAddDistributionForKeyWithOptions(TBHistoryDistributionEnumerator& values,
                                                   std::string_view key,
-                                                  const PropertyDict& options);
-
-  // The sources, in the order in which they run, each in a file of its own.
-
-  /// "com.quill.homeshell.numAllInstalledApps" and ".numThirdPartyApps", also offered as the event
-  /// "com.quill.homeshell.appInstalls". Nothing is counted when nobody asks.
-  void addInstalledAppInfo();
-
-  /// Language and region, whitelisted or not.
-  void addMetadataKeys();
-
-  /// "com.quill.logsmith.tlyd.database.size": MiB of the counter database, −1 when it cannot be
-  /// examined. "com.quill.logsmith.tlyd.database.corruptions": the count since the last report,
-  /// which restarts from 0; 0 when the functions that read and reset it cannot be resolved.
-  void reportDatabaseSize();
-
-  /// "com.quill.usage.cur_boot_session_cpu_uptime": minutes awake since boot, −1 when the kernel
-  /// does not tell its tick ratio.
-  void reportCPUUptime();
-
-  /// 28 memory statistics of the kernel; see docs/daily-log.md.
-  void reportVMStats();
+                                                  const DistributionOptions& options);
 
   const PropertyDict& scalarsOutput() const { return _scalarsOutput; }
   const PropertyDict& distributionsOutput() const { return _distributionsOutput; }
   const PropertyDict& histogramsOutput() const { return _histogramsOutput; }
-  const PropertyDict& metadataOutput() const { return _metadataOutput; }
 
  private:
-  const PropertyDict* optionsForScalarKey(std::string_view key) const;
   void readHistory(std::int32_t day);
-  PropertyDict buildDocument(std::int32_t day, const AppInfoList* appInfo);
-  void submit(const PropertyDict& document);
+  void addOwnSources();
+  PropertyDict takeDocument(std::int32_t day, const AppInfoList* appInfo);
 
   std::unique_ptr<TBConfig> _config;  ///< null without a whitelist, and after its digest was taken
   PropertyDict _scalarsOutput;

@@ -1,45 +1,26 @@
 #include "telemetry/DataUsage.h"
 
 #include <array>
-#include <condition_variable>
+#include <limits>
 #include <memory>
-#include <mutex>
+#include <optional>
+#include <semaphore>
 #include <string>
 #include <utility>
+#include <vector>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
 namespace {
 
 constexpr std::string_view kBaselineKey = "netUsageBaseline";
+constexpr std::string_view kMarkKey = "netUsageBaselineMark";
 constexpr std::string_view kBaselineDomain = "com.quill.logsmith.vesprun";
 
 constexpr std::array<std::string_view, 4> kUsageCounters = {"wifiInBytes", "wifiOutBytes",
                                                             "wwanInBytes", "wwanOutBytes"};
-
-/// Waits by the monotonic clock: setting the time of day makes the wait neither longer nor shorter.
-class Semaphore {
- public:
-  void signal() {
-    const std::lock_guard lock(_mutex);
-    _signaled = true;
-    _changed.notify_all();
-  }
-
-  /// False when `timeout` has passed without a signal.
-  bool waitFor(std::chrono::nanoseconds timeout) {
-    std::unique_lock lock(_mutex);
-    return _changed.wait_until(lock, std::chrono::steady_clock::now() + timeout,
-                               [this] { return _signaled; });
-  }
-
- private:
-  std::mutex _mutex;
-  std::condition_variable _changed;
-  bool _signaled = false;
-};
 
 std::int64_t counterOf(const PropertyValue* value) {
   return value != nullptr && value->number() != nullptr ? value->number()->asInt64() : 0;
@@ -85,17 +66,104 @@ class BaselineEntry {
   const PropertyArray* _values;
 };
 
+/// The services that a reply is handled with. They are asked for before the feed is: a late reply
+/// may find another platform installed, or none.
+struct Services {
+  Tallybook& tallybook = platform().tallybook();
+  Preferences& preferences = platform().preferences();
+  PtreeSerialization& serialization = platform().ptreeSerialization();
+
+  std::optional<PropertyValue> stored(std::string_view key) const {
+    return preferences.LGSPreferencesGetValue(key, kBaselineDomain);
+  }
+  void store(std::string_view key, std::optional<PropertyValue> value) const {
+    preferences.LGSPreferencesSetValue(key, std::move(value), kBaselineDomain);
+  }
+  bool synchronize() const { return preferences.LGSPreferencesSynchronize(kBaselineDomain); }
+};
+
+// The counters and the baseline lie in two files, and a process can be killed, or a write can fail,
+// between the two. So the baseline is written first, with a mark beside it: the baseline before it,
+// and a fingerprint of the data-usage counters before the growth was added. Counters reach the
+// database all or none. As long as the fingerprint has not changed, the growth is not counted, and
+// the earlier baseline still holds. The mark goes when the counters are durable.
+
+/// The data-usage counters of a day and later as one number; nothing when they cannot be read.
+std::optional<std::uint64_t> fingerprintSince(Tallybook& tallybook, std::int32_t day) {
+  std::uint64_t hash = 0xCBF29CE484222325;  // FNV-1a
+  const auto take = [&hash](std::uint64_t value) { hash = (hash ^ value) * 0x100000001B3; };
+  const bool done =
+      tallybook.initWithDefaultPath()
+          ->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+              "datausage.", day, std::numeric_limits<std::int32_t>::max(),
+              [&take](std::string_view key, std::int32_t rowDay, std::int64_t value, bool&) {
+                for (const char byte : key) {
+                  take(static_cast<std::uint8_t>(byte));
+                }
+                take(static_cast<std::uint32_t>(rowDay));
+                take(static_cast<std::uint64_t>(value));
+              });
+  return done ? std::optional(hash) : std::nullopt;
+}
+
+/// What is kept beside a baseline until its growth is counted.
+struct CountingMark {
+  std::int32_t day;
+  std::uint64_t fingerprint;
+  std::optional<PropertyValue> baselineBefore;
+
+  PropertyDict dict() const {
+    PropertyDict dict{{"day", day}, {"fingerprint", fingerprint}};
+    if (baselineBefore) {
+      dict.set("baselineBefore", *baselineBefore);
+    }
+    return dict;
+  }
+  static std::optional<CountingMark> of(const std::optional<PropertyValue>& stored) {
+    const PropertyDict* dict = stored ? stored->dict() : nullptr;
+    const auto number = [dict](std::string_view key) {
+      const PropertyValue* value = dict != nullptr ? dict->find(key) : nullptr;
+      return value != nullptr ? value->number() : nullptr;
+    };
+    const Number* day = number("day");
+    const Number* fingerprint = number("fingerprint");
+    if (day == nullptr || fingerprint == nullptr) {
+      return std::nullopt;
+    }
+    const PropertyValue* before = dict->find("baselineBefore");
+    return CountingMark{day->asInt32(), fingerprint->asUInt64(),
+                        before != nullptr ? std::optional(*before) : std::nullopt};
+  }
+};
+
+/// Goes back to the earlier baseline when an earlier run ended before its growth was counted. False
+/// when the counters cannot be read.
+bool settleEarlierRun(const Services& services) {
+  if (const std::optional<CountingMark> mark = CountingMark::of(services.stored(kMarkKey))) {
+    const auto fingerprint = fingerprintSince(services.tallybook, mark->day);
+    if (!fingerprint) {
+      return false;
+    }
+    if (fingerprint == mark->fingerprint) {
+      services.store(kBaselineKey, mark->baselineBefore);
+    }
+    services.store(kMarkKey, std::nullopt);
+  }
+  return true;
+}
+
 /// Handles one reply of the feed.
 class UsageReply {
  public:
-  UsageReply(Tallybook& tallybook, Preferences& preferences)
-      : _tallybook(tallybook), _preferences(preferences) {}
+  UsageReply(const Services& services, CountingMark mark)
+      : _services(services), _mark(std::move(mark)) {}
 
+  /// Takes the counters and sets the baseline.
   void handle(const PropertyArray* records) {
-    _yesterday = std::int64_t{_tallybook.TBDaysSince1970()} - 1;
-    const auto stored = _preferences.LGSPreferencesGetValue(kBaselineKey, kBaselineDomain);
-    if (stored && stored->dict() != nullptr) {
-      _baseline = *stored->dict();
+    _yesterday = std::int64_t{_services.tallybook.TBDaysSince1970()} - 1;
+    _mark.baselineBefore = _services.stored(kBaselineKey);
+    if (_mark.baselineBefore && _mark.baselineBefore->dict() != nullptr) {
+      _baseline = *_mark.baselineBefore->dict();
     }
     if (records != nullptr) {
       for (const PropertyValue& record : *records) {
@@ -104,10 +172,33 @@ class UsageReply {
         }
       }
     }
-    // Before the baseline: a process that is killed in between counts growth again, and loses none.
-    _tallybook.TBClientCheckpoint();
-    _preferences.LGSPreferencesSetValue(kBaselineKey, std::move(_newBaseline), kBaselineDomain);
-    _preferences.LGSPreferencesSynchronize(kBaselineDomain);
+    _services.store(kBaselineKey, std::move(_newBaseline));
+    if (_hasGrowth) {
+      _services.store(kMarkKey, _mark.dict());
+    }
+    if (!_services.synchronize()) {
+      // The growth is left to the next run: without a baseline it would be counted again.
+      _services.store(kBaselineKey, std::move(_mark.baselineBefore));
+      _services.store(kMarkKey, std::nullopt);
+      _hasGrowth = false;
+      return;
+    }
+    for (const auto& [key, value] : _additions) {
+      _services.tallybook.TBClientAddValueForScalarKey(key, value);
+    }
+  }
+
+  /// Makes what was counted durable; may wait for the database.
+  void finish() const {
+    if (!_hasGrowth) {
+      return;
+    }
+    _services.tallybook.TBClientCheckpoint();
+    const auto fingerprint = fingerprintSince(_services.tallybook, _mark.day);
+    if (fingerprint && fingerprint != _mark.fingerprint) {
+      _services.store(kMarkKey, std::nullopt);
+      _services.synchronize();
+    }
   }
 
  private:
@@ -121,6 +212,7 @@ class UsageReply {
     const BaselineEntry before(_baseline.find(name->name));
     const bool goesOn = before.isSince(*since);
     const bool isRecent = daysSince1970(*since) >= _yesterday;
+    const std::size_t additionsBefore = _additions.size();
     PropertyArray after{*since};
     for (std::size_t i = 0; i < kUsageCounters.size(); ++i) {
       const std::int64_t value = counterOf(record.find(kUsageCounters[i]));
@@ -134,7 +226,11 @@ class UsageReply {
     if (!goesOn && !isRecent) {
       addOne("datausage.olddata.", *name);
     }
-    _newBaseline.set(name->name, std::move(after));
+    std::string error;
+    if (_services.serialization.serialize({{name->name, after}}, error)) {
+      _newBaseline.set(name->name, std::move(after));
+      _hasGrowth = _hasGrowth || _additions.size() > additionsBefore;
+    }
   }
 
   void addGrowth(std::string_view counter, const UsageName& name, std::int64_t value,
@@ -150,7 +246,7 @@ class UsageReply {
   }
 
   void addOne(std::string_view key, const UsageName& name) {
-    _tallybook.TBClientAddValueForScalarKey(std::string(key) + name.prefix + name.name, 1);
+    _additions.emplace_back(std::string(key) + name.prefix + name.name, 1);
   }
 
   void AddDataUsageKB(std::string_view counterName, std::string_view prefix, std::string_view name,
@@ -161,30 +257,40 @@ class UsageReply {
     }
     std::string key = "datausage.";
     key.append(counterName.substr(0, end)).append("KB.").append(prefix).append(name);
-    _tallybook.TBClientAddValueForScalarKey(key, bytes / 1024);
+    _additions.emplace_back(std::move(key), bytes / 1024);
   }
 
-  Tallybook& _tallybook;
-  Preferences& _preferences;
+  Services _services;
+  CountingMark _mark;
   std::int64_t _yesterday = 0;
   PropertyDict _baseline;
   PropertyDict _newBaseline;
+  std::vector<std::pair<std::string, std::int64_t>> _additions;
+  bool _hasGrowth = false;  ///< of a process that the new baseline holds
 };
 
 }  // namespace
 
 void CollectDataUsage(std::chrono::nanoseconds replyTimeout) {
+  const Services services;
+  const std::int32_t today = services.tallybook.TBDaysSince1970();
+  const auto fingerprint =
+      settleEarlierRun(services) ? fingerprintSince(services.tallybook, today) : std::nullopt;
+  if (!fingerprint) {
+    return;  // what lies in the database cannot be told; the next run counts the growth
+  }
   const auto workspace = platform().murmur().createUsageWorkspace(kUsageServiceEndpoint);
   const auto feed = platform().murmur().createUsageFeed(workspace);
-  const auto handled = std::make_shared<Semaphore>();
-  // The services are asked for here: a late reply may find another platform installed, or none.
-  const auto reply = [feed, workspace, handled, &tallybook = platform().tallybook(),
-                      &preferences = platform().preferences()](const PropertyArray* records) {
-    UsageReply(tallybook, preferences).handle(records);
-    handled->signal();
+  const auto handled = std::make_shared<std::binary_semaphore>(0);
+  const auto reply = [feed, workspace, handled, services,
+                      mark = CountingMark{today, *fingerprint, {}}](const PropertyArray* records) {
+    UsageReply usageReply(services, mark);
+    usageReply.handle(records);
+    handled->release();
+    usageReply.finish();
   };
   feed->usageToDateForNameKindReply({}, UsageNameKind::Process, reply);
-  if (!handled->waitFor(replyTimeout)) {
+  if (!handled->try_acquire_for(replyTimeout)) {
     logMessage(LogLevel::Default, "Murmur timed out, no datausage available");
   }
 }

@@ -12,13 +12,15 @@ inline constexpr std::chrono::nanoseconds kUsageReplyTimeout{10'000'000'000};
 /// Adds what each process has sent and received since the last run to today's scalars
 /// "datausage.COUNTERKB.NAME", counts under "datausage.olddata.NAME" and "datausage.baddata.NAME"
 /// the records that could not be used, and keeps the counters as the preference "netUsageBaseline"
-/// of "com.quill.logsmith.vesprun" for the next run. Returns when the feed's reply has been
-/// handled, or, with a message, after `replyTimeout`. A reply that comes later is handled all the
-/// same, as long as the platform lives; one that comes later still is lost, and the next run counts
-/// the growth from the baseline of the run before.
+/// of "com.quill.logsmith.vesprun" for the next run. A process whose name or date no document can
+/// carry is left out of it. Returns when the counters are added and the baseline is set, or, with a
+/// message, after `replyTimeout`; what is left is then done on the feed's thread, as long as the
+/// platform lives. A reply that comes later still is lost, and the next run counts the growth.
 ///
-/// The reply is handled on the feed's thread. It shares nothing with the caller but the counter
-/// database and the preferences, which may be called from any thread.
+/// Growth is counted once, also when the process is killed or a file cannot be written in between.
+/// While the baseline cannot be written, or the counters cannot be read, nothing is counted.
+///
+/// The reply is handled on the feed's thread, with services that may be called from any thread.
 ///
 /// A record without a name or a date is passed over; a counter that it lacks counts as 0.
 void CollectDataUsage(std::chrono::nanoseconds replyTimeout = kUsageReplyTimeout);

@@ -3,9 +3,9 @@
 #include <cstdint>
 #include <optional>
 
-#include "NANDInfo/sets/UserCapacity.h"
 #include "platform/Platform.h"
 #include "telemetry/DiskUsage.h"
+#include "telemetry/UserCapacity.h"
 
 namespace vesprun {
 namespace {

@@ -6,7 +6,7 @@
 #include <span>
 #include <string>
 
-#include "common/LittleEndian.h"
+#include "platform/DictionaryHelpers.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
@@ -28,9 +28,9 @@ PropertyDict describe(const ECCEventRecord& event) {
   const std::uint8_t count = event[1];
   PropertyDict record{{"id", event[0]}, {"count", count}};
   for (std::size_t i = 0; i < std::min<std::size_t>(count, kMostRegisters); ++i) {
-    const std::uint8_t* content = event.data() + kFirstRegister + i * sizeof(std::uint64_t);
-    record.set("reg" + std::to_string(i),
-               static_cast<std::int64_t>(loadLittleEndian<std::uint64_t>(content)));
+    setNumberValueForType(record, "reg" + std::to_string(i),
+                          event.data() + kFirstRegister + i * sizeof(std::uint64_t),
+                          PVNumberType::Int64);
   }
   return record;
 }
@@ -41,13 +41,20 @@ void LogKernelECCEvents() {
   Kernel& kernel = platform().kernel();
   ECCEventRecord event{};
   std::size_t length = event.size();  // not reset between reads
-  const auto takeNext = [&] {
+  const auto readNext = [&] {
     return kernel.sysctlbyname(kNextEvent, std::span(event).first(length), length);
   };
-  int systemError = takeNext();
+  int systemError = readNext();
   for (int logged = 0; systemError == 0 && logged < kMostEventsOfARun; ++logged) {
-    platform().logsmith().FLLogStructuredData(kECCEventRecordType, describe(event));
-    systemError = takeNext();
+    // An event without a record is not acknowledged: it waits for the next run.
+    if (!platform().logsmith().FLLogStructuredData(kECCEventRecordType, describe(event)) ||
+        !kernel.acknowledgeECCEvent()) {
+      return;
+    }
+    systemError = readNext();
+  }
+  if (systemError == 0) {
+    kernel.acknowledgeECCEvent();  // the one beyond the limit
   }
   if (systemError != kNoSuchEntry && systemError != kBusy) {
     logMessage(LogLevel::Default, "Unexpected errno (%d) reading ECC events from kernel",

@@ -8,11 +8,12 @@
 #include <optional>
 #include <utility>
 
-#include "NANDInfo/lists/StructuredLogState.h"
-#include "NANDInfo/sets/NANDInfo.h"
-#include "common/Date.h"
+#include "NANDInfo/CopyNANDInfo.h"
+#include "NANDInfo/StructuredLogState.h"
+#include "common/Calendar.h"
 #include "common/LittleEndian.h"
 #include "common/TextForm.h"
+#include "platform/DictionaryHelpers.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
@@ -54,9 +55,9 @@ class ValidityList {
     std::array<PropertyArray, kListCount> lists;
     for (std::size_t at = 0; at < _entries.size(); at += kEntrySize) {
       const auto list = loadLittleEndian<std::uint32_t>(_entries.data() + at + kWordSize);
-      const auto value = loadLittleEndian<std::uint32_t>(_entries.data() + at + 2 * kWordSize);
       if (list < kListCount) {
-        lists[list].emplace_back(static_cast<std::int32_t>(value));
+        appendNumberValueForType(lists[list], _entries.data() + at + 2 * kWordSize,
+                                 PVNumberType::Int);
       }
     }
     return lists;
@@ -178,7 +179,9 @@ bool WriteValidityListNANDLog(std::span<const std::uint8_t> buffer,
     std::fputs("data cannot be parsed", stderr);
     return false;
   }
-  PropertyDict fields{{"IntermediateWamp", gCurrentSysWamp}, {"UserWamp", gCurrentUserWamp}};
+  PropertyDict fields;
+  setNumberValueForType(fields, "IntermediateWamp", &gCurrentSysWamp, PVNumberType::Double);
+  setNumberValueForType(fields, "UserWamp", &gCurrentUserWamp, PVNumberType::Double);
   DumpNANDInfo(fields);
   int number = 0;
   for (PropertyArray& values : list->valuesByList()) {

@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
+#include "buffers/DeviceBuffers.h"
 #include "platform/host/documents/JsonForm.h"
 #include "support/ControllerTest.h"
 

@@ -57,6 +57,60 @@ TEST(PropertyDict, KeepsThePlaceOfAKey) {
   EXPECT_NE(dict, (PropertyDict{{"a", 4}, {"b", "replaced"}, {"c", 1}}));
 }
 
+TEST(PropertyDict, IsTheSameWithFewEntriesAndWithMany) {
+  for (const bool reserved : {false, true}) {
+    PropertyDict dict;
+    dict.reserve(reserved ? 30 : 0);
+    for (int i = 0; i < 30; ++i) {
+      EXPECT_FALSE(dict.contains(std::to_string(i)));
+      dict.set(std::to_string(i), -1);
+      dict.set(std::to_string(i / 2), i / 2);
+      const PropertyDict copy = dict;
+      ASSERT_EQ(copy.size(), static_cast<std::size_t>(i + 1));
+      ASSERT_EQ(copy, dict);
+    }
+    PropertyDict moved = std::move(dict);
+    int at = 0;
+    for (const auto& [key, value] : moved) {
+      EXPECT_EQ(key, std::to_string(at));
+      EXPECT_EQ(value, PropertyValue(at < 15 ? at : -1));
+      ++at;
+    }
+    for (int i = 29; i > 0; i -= 1) {
+      EXPECT_TRUE(moved.remove(std::to_string(i)));
+      EXPECT_FALSE(moved.remove(std::to_string(i)));
+      EXPECT_EQ(moved.begin()->first, "0");
+    }
+    moved.clear();
+    EXPECT_TRUE(moved.empty());
+    EXPECT_EQ(moved, PropertyDict());
+  }
+}
+
+TEST(PropertyValue, IsSmallAndCopiesWhatItHolds) {
+  EXPECT_EQ(sizeof(PropertyValue), 16U);
+  PropertyArray all{PropertyDict{},  PropertyDict{{"k", PropertyArray{1}}},
+                    PropertyArray{}, "",
+                    "text",          Bytes{},
+                    Bytes{1},        Date{},
+                    Date{1, 2},      0,
+                    false,           true};
+  const PropertyArray copy = all;
+  for (std::size_t i = 0; i < all.size(); ++i) {
+    for (std::size_t j = 0; j < all.size(); ++j) {
+      EXPECT_EQ(all[i] == copy[j], i == j) << i << ' ' << j;
+    }
+  }
+  all[0].dict()->set("new", 1);
+  EXPECT_EQ(all[0], PropertyValue(PropertyDict{{"new", 1}}));
+  EXPECT_TRUE(copy[0].dict()->empty());
+  all[4] = std::move(all[1]);
+  EXPECT_EQ(all[4], copy[1]);
+  all[4] = copy[6];
+  EXPECT_EQ(*all[4].data(), Bytes{1});
+  EXPECT_EQ(all[4].string(), nullptr);
+}
+
 TEST(TextForm, WritesEachType) {
   EXPECT_EQ(textForm(PropertyArray{"a", 7, -1.0, 0.25F, false}), "(a, 7, -1, 0.25, 0)");
   EXPECT_EQ(textForm(Bytes{0x0A, 0xFF}), "<0aff>");

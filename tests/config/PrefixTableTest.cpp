@@ -18,24 +18,30 @@ TEST(PrefixTable, AnswersLikeAScanInOrder) {
     return made;
   };
   int answered = 0;
-  for (const std::string& letters : {std::string("ab"), std::string("a.\x01\x7F\x80\xFF")}) {
-    for (const std::size_t count : {0U, 1U, 10U, 3000U}) {
-      PropertyDict prefixes;
+  const std::string common = "common to all.";
+  for (const std::string& letters : {std::string("ab"), std::string("a.\0\x01\x7F\x80\xFF", 7)}) {
+    for (const std::size_t count : {0U, 1U, 10U, 3000U, 3001U}) {
+      const std::string begin = count % 2 == 0 ? common : "";
+      std::vector<std::string> prefixes;
       for (std::size_t i = 0; i < count; ++i) {
         // The empty prefix, which hides all that follow, comes late.
-        const std::string prefix = text(letters, 9);
-        prefixes.set(prefix.empty() && i < count / 2 ? "a" : prefix, PropertyDict());
+        const std::string made = text(letters, 9);
+        const std::string prefix = begin + (made.empty() && i < count / 2 ? "a" : made);
+        if (std::find(prefixes.begin(), prefixes.end(), prefix) == prefixes.end()) {
+          prefixes.push_back(prefix);
+        }
       }
-      const PrefixTable table(prefixes);
+      const PrefixTable table({prefixes.begin(), prefixes.end()});
       for (int i = 0; i < 500; ++i) {
-        const std::string key = text(letters, 12);
-        const PrefixTable::Entry* entry = table.find(key);
-        const auto first = std::find_if(prefixes.begin(), prefixes.end(), [&](const auto& prefix) {
-          return key.starts_with(prefix.first);
-        });
-        ASSERT_EQ(entry != nullptr, first != prefixes.end()) << key;
-        ASSERT_TRUE(entry == nullptr || entry->first == first->first) << key << entry->first;
-        answered += entry != nullptr ? 1 : 0;
+        const std::string key = (i % 50 == 0 ? "comm" : begin) + text(letters, 12);
+        const auto first =
+            std::find_if(prefixes.begin(), prefixes.end(),
+                         [&](const std::string& prefix) { return key.starts_with(prefix); });
+        const std::optional<std::size_t> expected =
+            first != prefixes.end() ? std::optional<std::size_t>(first - prefixes.begin())
+                                    : std::nullopt;
+        ASSERT_EQ(table.find(key), expected) << key;
+        answered += expected ? 1 : 0;
       }
     }
   }

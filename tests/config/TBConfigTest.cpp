@@ -1,5 +1,7 @@
 #include "config/TBConfig.h"
 
+#include <filesystem>
+
 #include "common/TextForm.h"
 #include "support/TestDevice.h"
 
@@ -12,12 +14,22 @@ constexpr const char* kInternal = R"({"logLevel": "debug", "properties": {"Inter
 constexpr const char* kPath = "Library/Application Support/Tallybook/Whitelist_Stagebox.ptree";
 const std::string kParseFailure = "error: Couldn't parse the contents of the config file. Error: ";
 
-/// The options for each key as text, "none" for a key left out.
+std::string textOf(const ScalarOptions* options) {
+  if (options == nullptr) {
+    return "none";
+  }
+  const auto text = [](const std::optional<std::uint64_t>& number) {
+    return number ? std::to_string(*number) : "-";
+  };
+  return text(options->bucketInterval) + '/' + text(options->significantDigits);
+}
+
+/// For each key its bucket interval and digits, "-" where there is none, or "none" for a key left
+/// out.
 std::string scalarOptions(const TBConfig& config, std::initializer_list<const char*> keys) {
   std::string text;
   for (const char* key : keys) {
-    const PropertyDict* options = config.configOptionsForScalarKey(key);
-    text += (text.empty() ? "" : " ") + (options != nullptr ? textForm(*options) : "none");
+    text += (text.empty() ? "" : " ") + textOf(config.configOptionsForScalarKey(key));
   }
   return text;
 }
@@ -30,13 +42,13 @@ TEST(TBConfig, PutsExactKeysBeforePrefixesInOrder) {
                                       "long.er": {"sig_fig": 4}, "long": {"sig_fig": 5}},
                 "DistributionKeys": {"dist": {}}},
       "Second": {"ScalarKeys": {"twice": {"sig_fig": 6}}, "ScalarKeyPrefixes": {"long": {"sig_fig": 7}},
-                 "DistributionKeyPrefixes": {"d": {"intervals": []}}}})");
+                 "DistributionKeyPrefixes": {"d": {"intervals": [7]}}}})");
   const std::unique_ptr<TBConfig> config = TBConfig::init();
   EXPECT_EQ(scalarOptions(*config, {"exact", "exactly", "twice", "long.er.key", "long.key", "Exact",
                                     "dist", ""}),
-            "{} {sig_fig = 2} {sig_fig = 6} {sig_fig = 4} {sig_fig = 7} none none none");
-  EXPECT_EQ(textForm(*config->configOptionsForDistributionKey("dist")), "{}");
-  EXPECT_EQ(textForm(*config->configOptionsForDistributionKey("dust")), "{intervals = ()}");
+            "-/- -/2 -/6 -/4 -/7 none none none");
+  EXPECT_EQ(config->configOptionsForDistributionKey("dist")->intervals, nullptr);
+  EXPECT_EQ(textForm(*config->configOptionsForDistributionKey("dust")->intervals), "(7)");
   EXPECT_EQ(config->configOptionsForDistributionKey("exact"), nullptr);
   EXPECT_THAT(device.log(), ElementsAre("debug: prefix match ex for exactly",
                                         "debug: prefix match long.er for long.er.key",
@@ -48,18 +60,17 @@ TEST(TBConfig, TakesGroupsByDeviceAndTasking) {
   for (const bool isInternal : {false, true}) {
     TestDevice device(isInternal ? kInternal : TestDevice::kDescription);
     device.writeWhitelistJson(R"({
-        "Absent": {"ScalarKeys": {"absent": {}}}, "On": {"ScalarKeys": {"on": {"a": 1}}},
-        "Off": {"ScalarKeys": {"off": {"b": 1}}}, "Zero": {"ScalarKeys": {"zero": {"c": 1}}},
-        "InternalTesting": {"ScalarKeys": {"testing": {"d": 1}}}})");
+        "Absent": {"ScalarKeys": {"absent": {}}}, "On": {"ScalarKeys": {"on": {"sig_fig": 1}}},
+        "Off": {"ScalarKeys": {"off": {"sig_fig": 2}}}, "Zero": {"ScalarKeys": {"zero": {"bucket_interval": 3}}},
+        "InternalTesting": {"ScalarKeys": {"testing": {"sig_fig": 4}}}})");
     Preferences& preferences = device.platform().preferences();
     preferences.LGSPreferencesSetValue("On", true, "com.quill.da");
     preferences.LGSPreferencesSetValue("Off", false, "com.quill.da");
     preferences.LGSPreferencesSetValue("Zero", 0, "com.quill.da");
     preferences.LGSPreferencesSetValue("InternalTesting", true, "com.quill.da");
     const std::unique_ptr<TBConfig> config = TBConfig::init();
-    EXPECT_EQ(
-        scalarOptions(*config, {"absent", "on", "off", "zero", "testing", "other"}),
-        isInternal ? "{} {a = 1} {b = 1} {c = 1} {d = 1} {}" : "{} {a = 1} none none none none");
+    EXPECT_EQ(scalarOptions(*config, {"absent", "on", "off", "zero", "testing", "other"}),
+              isInternal ? "-/- -/1 -/2 3/- -/4 -/-" : "-/- -/1 none none none none");
     using Log = std::vector<std::string>;
     EXPECT_EQ(device.log(), isInternal
                                 ? Log({"debug: passing @{} for other as device is Quill Internal"})
@@ -72,20 +83,47 @@ TEST(TBConfig, HoldsBackWhatItCannotRead) {
   TestDevice device(kInternal);
   device.writeWhitelistJson(R"({"NoGroup": [], "Group": {
       "DistributionKeys": 1, "DistributionKeyPrefixes": {"d.": {"intervals": ["1"]}},
-      "ScalarKeys": {"p.true": true, "p.text": {"sig_fig": "2"}, "p.good": {"sig_fig": 3}},
-      "ScalarKeyPrefixes": {"q.": {"bucket_interval": true}, "p.": {}}}})");
+      "ScalarKeys": {"p.mended": {"sig_fig": "2"}, "p.true": true, "p.text": {"sig_fig": "2"},
+                     "p.spoiled": {}, "p.good": {"sig_fig": 3}},
+      "ScalarKeyPrefixes": {"q.": {"bucket_interval": true}, "p.": {}}},
+    "Later": {"ScalarKeys": {"p.mended": {"sig_fig": 4}, "p.spoiled": 1},
+              "DistributionKeys": {"e": {"intervals": 1}},
+              "DistributionKeyPrefixes": {"d.": {}}}})");
   const std::unique_ptr<TBConfig> config = TBConfig::init();
-  using ::testing::HasSubstr;
-  EXPECT_THAT(device.log(),
-              ElementsAre(HasSubstr("group NoGroup is not a dictionary and is skipped"),
-                          HasSubstr("group Group: DistributionKeys is not a dictionary"),
-                          HasSubstr("Prefixes: options of 1 keys cannot be read"),
-                          HasSubstr("ScalarKeys: options of 2 keys cannot be read, which are left "
-                                    "out; the first is p.true"),
-                          HasSubstr("the first is q.")));
-  EXPECT_EQ(scalarOptions(*config, {"p.true", "p.text", "p.good", "p.other", "q.any"}),
-            "none none {sig_fig = 3} {} none");
-  EXPECT_EQ(config->configOptionsForDistributionKey("d.any"), nullptr);
+  const std::string whitelist = "error: Whitelist: ";
+  const std::string held = "keys cannot be read, which are left out; the first is ";
+  EXPECT_THAT(
+      device.log(),
+      ElementsAre(
+          "error: Whitelist group NoGroup is not a dictionary and is skipped",
+          "error: Whitelist group Group: DistributionKeys is not a dictionary and is skipped",
+          whitelist + "ScalarKeys: options of 3 " + held + "p.true in group Group",
+          whitelist + "DistributionKeys: options of 1 " + held + "e in group Later",
+          whitelist + "ScalarKeyPrefixes: options of 1 " + held + "q. in group Group"));
+  EXPECT_EQ(scalarOptions(*config, {"p.true", "p.text", "p.spoiled", "p.mended", "p.good",
+                                    "p.other", "q.any"}),
+            "none none none -/4 -/3 -/- none");
+  EXPECT_NE(config->configOptionsForDistributionKey("d.any"), nullptr);
+  EXPECT_EQ(config->configOptionsForDistributionKey("e"), nullptr);
+}
+
+TEST(TBConfig, SaysByWhichEntryItDecides) {
+  TestDevice device(kInternal);
+  device.writeWhitelistJson(R"({"A": {"ScalarKeys": {"key": {}}, "ScalarKeyPrefixes": {"pre": 1}},
+                                "B": {"ScalarKeys": {"key": {"sig_fig": 5}}}})");
+  const std::unique_ptr<TBConfig> config = TBConfig::init();
+  const auto byKey = config->decideScalarKey("key");
+  EXPECT_EQ(byKey.by, DecidedBy::Key);
+  EXPECT_EQ(byKey.entry->group, "B");
+  EXPECT_EQ(textOf(byKey.options()), "-/5");
+  const auto byPrefix = config->decideScalarKey("prefix");
+  EXPECT_EQ(byPrefix.by, DecidedBy::Prefix);
+  EXPECT_EQ(byPrefix.prefix, "pre");
+  EXPECT_EQ(byPrefix.entry->group, "A");
+  EXPECT_EQ(byPrefix.options(), nullptr);
+  const auto byDevice = config->decideDistributionKey("key");
+  EXPECT_EQ(byDevice.by, DecidedBy::InternalDevice);
+  EXPECT_EQ(byDevice.options()->intervals, nullptr);
 }
 
 TEST(TBConfig, FailsOnAnyFileThatIsNoWhitelist) {
@@ -100,6 +138,13 @@ TEST(TBConfig, FailsOnAnyFileThatIsNoWhitelist) {
     device.write(kPath, content);
     EXPECT_EQ(TBConfig::init(), nullptr);
     EXPECT_EQ(device.log().back(), kParseFailure + error);
+  }
+  // The first is read and fails later, the second is not even read; neither takes room on the disk.
+  for (const auto& [size, error] : {std::pair(256U << 20, "Couldn't parse"),
+                                    std::pair((256U << 20) + 1, "Couldn't load whitelist")}) {
+    std::filesystem::resize_file(device.path(kPath), size);
+    EXPECT_EQ(TBConfig::init(), nullptr);
+    EXPECT_THAT(device.log().back(), ::testing::HasSubstr(error));
   }
   const std::string whole = "<ptree version=\"1.0\"><dict/></ptree>";
   device.write(kPath, whole);

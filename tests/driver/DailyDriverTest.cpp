@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <limits>
 
+#include "common/AppInfoList.h"
 #include "common/TextForm.h"
 #include "driver/ActiveAppInfoListener.h"
 #include "driver/DailyTasks.h"
@@ -14,6 +15,7 @@
 #include "platform/host/messages/HostMainLoop.h"
 #include "platform/host/messages/MessageFraming.h"
 #include "platform/host/messages/ServiceSocket.h"
+#include "support/HostServiceTest.h"
 #include "support/WatchedRegistry.h"
 #include "telemetry/TodaysScalars.h"
 
@@ -73,9 +75,6 @@ const std::string kSampleText =
 
 class DailyDriverTest : public ::testing::Test {
  protected:
-  DailyDriverTest() { startActiveAppInfoAfresh(); }
-  ~DailyDriverTest() override { startActiveAppInfoAfresh(); }
-
   static std::optional<PropertyValue> storedDay(TestDevice& device) {
     return device.platform().preferences().LGSPreferencesGetValue(kStoredDayKey, kService);
   }
@@ -165,7 +164,8 @@ TEST_F(DailyDriverTest, TheTasksReportCountAndSynchronize) {
   TestDevice device(kTaskDevice);
   device.writeWhitelistJson(R"({"G": {"ScalarKeyPrefixes": {"": {}}}})");
   device.platform().tallybook().TBClientAddValueForScalarKey("k", 1);
-  const AppInfoList apps{PropertyDict{{"bundle", "b"}}};
+  const PropertyValue data(PropertyArray{PropertyDict{{"bundle_id", "b"}}});
+  const AppInfoList apps(&data);
   runDailyTasks(TestDevice::kToday, &apps);
   ASSERT_THAT(device.documents(), SizeIs(1));
   const PropertyDict document = device.documents()[0];
@@ -220,7 +220,6 @@ TEST_F(DailyDriverTest, MessagesLeadToWhatTheirStateAllows) {
   };
   for (const auto& [messages, log] : kCases) {
     SCOPED_TRACE(textForm(PropertyArray(messages)));
-    startActiveAppInfoAfresh();
     DriverDevice device;
     runWithMessages(device, messages);
     EXPECT_THAT(device.log(), ElementsAreArray(log));
@@ -230,6 +229,59 @@ TEST_F(DailyDriverTest, MessagesLeadToWhatTheirStateAllows) {
     EXPECT_EQ(storedDay(device).has_value(), dayChecked);
     EXPECT_THAT(device.names("run"), IsEmpty());
   }
+}
+
+TEST_F(DailyDriverTest, AMessageThatFailsStopsNoOther) {
+  struct Failing : PeerConnection {
+    void setMessageHandler(MessageHandler handler) override { deliver = std::move(handler); }
+    void start() override {}
+    MessageHandler deliver;
+  };
+  DriverDevice device;
+  Failing peer;
+  handleNewPeer(peer);
+  auto& loop = dynamic_cast<HostMainLoop&>(device.platform().mainLoop());
+  loop.queueWork([&peer] { peer.deliver(operation(0)); });
+  loop.queueWork([] { throw std::bad_alloc(); });
+  loop.queueWork([&peer] { peer.deliver(PropertyDict{{"operation", 2}, {"app_data", 0}}); });
+  runListenerMode(kQuiet);
+  EXPECT_THAT(device.log(), Contains("error: unexpected failure: std::bad_alloc"));
+  EXPECT_EQ(storedDay(device), PropertyValue(kYesterday));
+}
+
+TEST_F(DailyDriverTest, OneProcessDoesTheDaysWorkAndTheOthersFindItDone) {
+  DriverDevice device;
+  device.endProcess();
+  std::vector<pid_t> starts;
+  for (int i = 0; i < 3; ++i) {
+    starts.push_back(startProcess([&device] {
+      device.platform();
+      runDayCheck(nullptr);
+      device.endProcess();
+    }));
+  }
+  for (const pid_t start : starts) {
+    EXPECT_TRUE(hasSucceeded(start));
+  }
+  device.platform();
+  EXPECT_THAT(device.log(),
+              ::testing::UnorderedElementsAre(kYesterdaysTasks, kUnchanged, kUnchanged));
+  EXPECT_EQ(storedDay(device), PropertyValue(kYesterday));
+}
+
+TEST_F(DailyDriverTest, AWaitForTheDaysWorkOfAnotherProcessEnds) {
+  DriverDevice device;
+  EXPECT_TRUE(device.platform().dailyWorkLock().lock(0));
+  EXPECT_TRUE(device.platform().dailyWorkLock().lock(0));
+  EXPECT_TRUE(hasSucceeded(startProcess([&device] {
+    std::string error;
+    const std::unique_ptr<HostPlatform> other = HostPlatform::open(device.path(), error);
+    EXPECT_FALSE(other->dailyWorkLock().lock(0.01));
+  })));
+  EXPECT_THAT(device.log(),
+              ::testing::ElementsAre(::testing::EndsWith(": another process keeps it locked")));
+  device.endProcess();
+  EXPECT_TRUE(device.platform().dailyWorkLock().lock(0));
 }
 
 TEST_F(DailyDriverTest, AServiceThatIsTakenChangesNothingElse) {
@@ -251,14 +303,14 @@ TEST_F(DailyDriverTest, AppsKeepFiveEntriesWhateverIsMissing) {
   odd.set("arch", 2.9);
   odd.set("uuid", Bytes(15, 1));
   const PropertyValue apps(PropertyArray{sampleApp(), "no app", PropertyDict{}, odd});
-  const AppInfoList list = appInfoListFromData(&apps);
+  const PropertyArray list = AppInfoList(&apps).array();
   ASSERT_THAT(list, SizeIs(3));
   EXPECT_EQ(textForm(PropertyArray{list[0]}), kSampleText);
   EXPECT_EQ(textForm(list[1]), "{bundle = ; version = ; adamID = 0; arch = 0; uuid = }");
   EXPECT_EQ(textForm(list[2]), "{bundle = ; version = 1.2; adamID = 0; arch = 2; uuid = }");
   EXPECT_EQ(list[2].dict()->find("arch")->number()->kind(), NumberKind::Int64);
-  const PropertyValue noArray(PropertyDict{{"0", sampleApp()}});
-  EXPECT_THAT(appInfoListFromData(&noArray), IsEmpty());
+  const PropertyValue notAnArray(PropertyDict{{"0", sampleApp()}});
+  EXPECT_THAT(AppInfoList(&notAnArray).array(), IsEmpty());
 }
 
 }  // namespace

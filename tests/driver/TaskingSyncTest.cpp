@@ -90,11 +90,14 @@ TEST(TaskingSync, AppliesUndoesAndKeepsByWhatIsStoredAndScheduled) {
     for (const std::string& file : kChanged) {
       device.store(file, json("{'old': 0}"));
     }
-    device.sync();
+    syncTaskingAndOSChange();
+    // Not left to the end of the process.
     EXPECT_EQ(device.stored(kOwn), sameBuildAnd(storedAfter));
-    for (const std::string& file : kChanged) {
+    for (const std::string& file : {kChanged[0], kChanged[2]}) {
       EXPECT_EQ(device.stored(file), json('{' + changedAfter + '}')) << file;
     }
+    device.endProcess();
+    EXPECT_EQ(device.stored(kChanged[1]), json('{' + changedAfter + '}'));
     EXPECT_EQ(::testing::PrintToString(device.log()),
               log.empty() ? "{}" : "{ \"default: Tasking update (" + log + ")\" }");
     EXPECT_THAT(device.lines("notifications.jsonl"), SizeIs(notifications));
@@ -113,7 +116,7 @@ TEST(TaskingSync, RecordsThatNameNothingChangeNothing) {
       {'User': '__logsmith__', 'Domain': 'com.b', 'Key': 'old'}]}})"));
   device.store(kChanged[1], json("{'old': 0}"));
   device.sync();
-  EXPECT_THAT(device.log(), SizeIs(8));
+  EXPECT_THAT(device.log(), SizeIs(7));
   EXPECT_EQ(device.stored(kChanged[1]), json("{}"));
   EXPECT_THAT(device.names("var"), ElementsAre("mobile"));
   EXPECT_THAT(device.names(kMobile), ElementsAre("com.quill.aggregated.vesprun.ptree"));

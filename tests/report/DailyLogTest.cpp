@@ -7,11 +7,13 @@
 namespace vesprun {
 namespace {
 
-using ::testing::ElementsAre, ::testing::IsEmpty;
+using ::testing::Contains, ::testing::IsEmpty;
 
 constexpr const char* kDomain = "com.quill.aggregated.vesprun";
 constexpr std::int32_t kYesterday = TestDevice::kToday - 1;
-/// A device that whitelists "s" (two digits) and "d" (intervals 10) and has counted both.
+
+/// A device that whitelists "s" (two digits) and "d" (intervals 10) and has counted both, and that
+/// has other whitelisted keys on one day alone.
 class DailyLogTest : public ::testing::Test {
  protected:
   void start(const char* fails) {
@@ -20,8 +22,9 @@ class DailyLogTest : public ::testing::Test {
         "system": {"osVersion": "Vesper 2"}, "submission": {"fails": ?},
         "languages": {"preferred": ["en"], "localizations": ["en"], "country": "IE"}})";
     device.emplace(description.replace(description.find('?'), 1, fails));
-    device->writeWhitelistJson(R"({"G": {"ScalarKeys": {"s": {"sig_fig": 2}},
-                                         "DistributionKeys": {"d": {"intervals": [10]}}}})");
+    device->writeWhitelistJson(R"({"G": {
+        "ScalarKeys": {"s": {"sig_fig": 2}}, "ScalarKeyPrefixes": {"day.": {}},
+        "DistributionKeys": {"d": {"intervals": [10]}}, "DistributionKeyPrefixes": {"day.": {}}}})");
     preferences = &device->platform().preferences();
   }
   void count() {
@@ -32,6 +35,9 @@ class DailyLogTest : public ::testing::Test {
         store.setScalar(day, "unlisted", 1);
         const Sample sample{2.5 * (kYesterday + 2 - day), 0};
         store.appendSamples(day, "d", {&sample, 1});
+        const std::string onlyThatDay = "day." + std::to_string(day - kYesterday);
+        store.setScalar(day, onlyThatDay, 1);
+        store.appendSamples(day, onlyThatDay, {&sample, 1});
       }
       return true;
     };
@@ -57,26 +63,28 @@ TEST_F(DailyLogTest, HoldsItsEntriesInOrder) {
             "{TBCrashLogVersion = 1; TBStartDate = 2024-03-04 00:00:00 +0000; "
             "TBLogCreationDate = 2024-03-05 09:15:02 +0000; "
             "TBMetadata = {TBUserInterfaceLanguage = en; TBPreferredUserInterfaceLanguage = en; "
-            "TBUserSetRegionFormat = IE}; TBScalars = {s = 12000}; "
-            "TBDistributions = {d = (5, 5, 5, 0, 1)}; "
+            "TBUserSetRegionFormat = IE}; TBScalars = {day.-1 = 1; s = 12000; day.0 = 1}; "
+            "TBDistributions = {d = (5, 5, 5, 0, 1); day.-1 = (7.5, 7.5, 7.5, 0, 1); "
+            "day.0 = (5, 5, 5, 0, 1)}; "
             "TBDistributionsHistogram = {d = {(-inf, 10] = 1}}; TBTasking = (); "
             "TBTaskID = (no tasking id); TBTaskDigest = (no tasking digest); "
             "TBWhitelistDigest = " +
                 TBConfig::init()->configFileDigest() + "}");
-  EXPECT_THAT(device->log(), ElementsAre("info: writing aggregated log. yesterday=19786"));
+  EXPECT_THAT(device->log(), Contains("info: writing aggregated log. yesterday=19786"));
 
   preferences->LGSPreferencesSetValue("TaskingID", "id", kDomain);
   preferences->LGSPreferencesSetValue("TaskingDigest", Bytes{1}, kDomain);
   preferences->LGSPreferencesSetValue("TaskingPayload", PropertyArray{PropertyDict{{"a", 1}}},
                                       kDomain);
-  const AppInfoList apps{PropertyDict{{"bundle", "b"}}};
+  const PropertyValue data(PropertyArray{PropertyDict{{"bundle_id", "b"}}});
+  const AppInfoList apps(&data);
   write(&apps);
   const PropertyDict second = device->documents().back();
   EXPECT_EQ(textForm(*second.find("TBTaskID")), "id");
   EXPECT_EQ(textForm(*second.find("TBTaskDigest")), "<01>");
   EXPECT_EQ(textForm(*second.find("TBTasking")), "({a = 1})");
   EXPECT_EQ((second.end() - 1)->first, "TBActivatedAppInfo");
-  EXPECT_EQ((second.end() - 1)->second, PropertyValue(apps));
+  EXPECT_EQ((second.end() - 1)->second, PropertyValue(apps.array()));
 }
 
 TEST_F(DailyLogTest, NamesAPreviousOSVersionOnceThereIsALog) {
@@ -103,7 +111,8 @@ TEST_F(DailyLogTest, NamesAPreviousOSVersionOnceThereIsALog) {
 TEST_F(DailyLogTest, SurvivesARefusedSubmissionAndDocument) {
   start("true");
   count();
-  const AppInfoList unwritable{PropertyDict{{"bundle", "\x01"}}};
+  const PropertyValue data(PropertyArray{PropertyDict{{"bundle_id", "\x01"}}});
+  const AppInfoList unwritable(&data);
   write(&unwritable);
   EXPECT_THAT(device->log().back(),
               ::testing::StartsWith("error: Could not create aggregated ptree: "));

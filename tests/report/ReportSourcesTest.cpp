@@ -1,7 +1,8 @@
 #include <algorithm>
 
 #include "common/TextForm.h"
-#include "report/TBReport.h"
+#include "report/KernelMemoryStatistics.h"
+#include "report/ReportSources.h"
 #include "support/TestDevice.h"
 
 namespace vesprun {
@@ -18,9 +19,9 @@ class SourceDevice : public TestDevice {
   }
 };
 
-std::string scalarsOf(void (TBReport::*source)()) {
+std::string scalarsOf(void (*source)(TBReport&)) {
   TBReport report;
-  (report.*source)();
+  source(report);
   return textForm(report.scalarsOutput());
 }
 
@@ -30,13 +31,13 @@ TEST(InstalledAppInfo, CountsForTheLogAndForTheEvent) {
                                        {"bundle": "c", "user": true}])";
   {
     SourceDevice device(apps + R"(, "events": {"used": []})");
-    EXPECT_EQ(scalarsOf(&TBReport::addInstalledAppInfo),
+    EXPECT_EQ(scalarsOf(addInstalledAppInfo),
               "{com.quill.homeshell.numAllInstalledApps = 3; "
               "com.quill.homeshell.numThirdPartyApps = 2}");
     EXPECT_THAT(device.lines("events.jsonl"), IsEmpty());
   }
   SourceDevice device(apps, false);
-  EXPECT_EQ(scalarsOf(&TBReport::addInstalledAppInfo), "{}");
+  EXPECT_EQ(scalarsOf(addInstalledAppInfo), "{}");
   EXPECT_EQ(device.read("outbox/events.jsonl"),
             R"({"time":"2024-03-05T09:15:02Z","event":"com.quill.homeshell.appInstalls",)"
             R"("payload":{"numThirdPartyApps":2,"numAllApps":3}})"
@@ -55,9 +56,9 @@ TEST(Metadata, NamesLanguagesAndRegion) {
   };
   for (const auto& [languages, expected] : kCases) {
     SourceDevice device(std::string("\"languages\": ") + languages);
-    TBReport report;
-    report.addMetadataKeys();
-    EXPECT_EQ(textForm(report.metadataOutput()), expected);
+    PropertyDict metadata;
+    addMetadataKeys(metadata);
+    EXPECT_EQ(textForm(metadata), expected);
   }
 }
 
@@ -81,11 +82,11 @@ TEST(DatabaseStatistics, TakeTheCorruptionCountOnce) {
     };
     device.platform().preferences().LGSPreferencesSetValue("DatabaseCorruptionCount", 3,
                                                            "com.quill.aggregated");
-    EXPECT_EQ(scalarsOf(&TBReport::reportDatabaseSize), expected(-1, log.empty() ? 3 : 0));
+    EXPECT_EQ(scalarsOf(reportDatabaseSize), expected(-1, log.empty() ? 3 : 0));
     EXPECT_EQ(count(), log.empty() ? 0 : 3);
     EXPECT_EQ(device.log(), log);
     device.write("var/mobile/Library/Tallybook/TBDataStore.sqlitedb", std::string(3 << 20, 'x'));
-    EXPECT_EQ(scalarsOf(&TBReport::reportDatabaseSize), expected(3, 0));
+    EXPECT_EQ(scalarsOf(reportDatabaseSize), expected(3, 0));
     EXPECT_EQ(device.log().size(), 2 * log.size());
   }
 }
@@ -100,7 +101,7 @@ TEST(CpuUptime, IsInMinutesAwake) {
       {"null", "-1"}};
   for (const auto& [ticks, expected] : kCases) {
     SourceDevice device(std::string(R"("kernel": {"ticks": )") + ticks + "}");
-    EXPECT_EQ(scalarsOf(&TBReport::reportCPUUptime),
+    EXPECT_EQ(scalarsOf(reportCPUUptime),
               "{com.quill.usage.cur_boot_session_cpu_uptime = " + std::string(expected) + "}");
     EXPECT_EQ(device.log().size(), std::string(expected) == "-1" ? 1U : 0U);
   }
@@ -110,7 +111,7 @@ TEST(CpuUptime, IsInMinutesAwake) {
 std::vector<std::string> memoryStatistics(const std::string& variables) {
   SourceDevice device(R"("kernel": {"pageSize": 16384, "variables": {)" + variables + "}}");
   TBReport report;
-  report.reportVMStats();
+  reportVMStats(report);
   std::vector<std::string> rows;
   for (const auto& [key, value] : report.scalarsOutput()) {
     rows.push_back(key.substr(std::string_view("com.quill.").size()) + ' ' + textForm(value));

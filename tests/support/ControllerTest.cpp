@@ -1,8 +1,6 @@
 #include "support/ControllerTest.h"
 
-#include "NANDInfo/controller/NandExporter.h"
-#include "NANDInfo/parsers/APIErrorMessage.h"
-#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
+#include "buffers/DeviceBuffers.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
 #include "support/WatchedRegistry.h"
 
@@ -28,8 +26,7 @@ void ControllerTest::endDevice() {
     expectNothingHeld();
     _device.reset();
   }
-  forgetAPIErrorMessage();
-  forgetNandExporterHandles();
+  startProcessAfresh();
 }
 
 void ControllerTest::expectNothingHeld() {

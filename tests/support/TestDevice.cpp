@@ -3,8 +3,12 @@
 #include <filesystem>
 #include <sstream>
 
+#include "NANDInfo/controller/NandExporter.h"
+#include "NANDInfo/lists/StructuredLogState.h"
+#include "NANDInfo/parsers/APIErrorMessage.h"
 #include "common/TextForm.h"
 #include "config/InternalDevice.h"
+#include "driver/ActiveAppInfoListener.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeReader.h"
 #include "platform/host/documents/PtreeWriter.h"
@@ -25,6 +29,15 @@ PropertyDict dictionaryOf(const Parse& parse, const std::string& text) {
 }
 
 }  // namespace
+
+void startProcessAfresh() {
+  forgetAPIErrorMessage();
+  forgetInternalDeviceAnswer();
+  forgetNandExporterHandles();
+  forgetStructuredLogState();
+  forgetSupportLibraryFunctions();
+  startActiveAppInfoAfresh();
+}
 
 TestDevice::TestDevice(std::string_view description) {
   write("device.json", description);
@@ -65,8 +78,7 @@ HostPlatform& TestDevice::platform() {
 void TestDevice::endProcess() {
   _installed.reset();
   _platform.reset();
-  forgetInternalDeviceAnswer();
-  forgetSupportLibraryFunctions();
+  startProcessAfresh();
 }
 
 std::vector<PropertyDict> TestDevice::lines(std::string_view file) const {

@@ -1,8 +1,11 @@
 #include "telemetry/DataUsage.h"
 
+#include <filesystem>
 #include <thread>
 
+#include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/JsonForm.h"
+#include "support/HostServiceTest.h"
 #include "telemetry/ReportingChannels.h"
 #include "telemetry/TodaysScalars.h"
 
@@ -125,7 +128,7 @@ TEST(DataUsage, ALateReplyIsHandledWhileTheStepGoesOn) {
   TestDevice device(deviceWith(R"("channels": [{"name": "a", "value": 1}],
       "usage": {"records": [)" +
                                record(kApp, kToday, counters(2048, 0, 0, 0)) +
-                               R"(], "delaySeconds": 0.05})"));
+                               R"(], "delaySeconds": 0.5})"));
   CollectDataUsage(1ms);
   EXPECT_THAT(device.log(), ElementsAre("default: Murmur timed out, no datausage available"));
   for (int i = 0; i < 2000 && !baseline(device); ++i) {
@@ -161,6 +164,85 @@ TEST(DataUsage, AReplyAtTheEndIsHandledWholeOrNotAtAll) {
     device.endProcess();
     const bool handled = baseline(device).has_value();
     EXPECT_EQ(todaysScalars(device).size(), handled ? 1U : 0U);
+  }
+}
+
+/// A process of its own that collects and is killed before any service has ended.
+void collectAndDie(TestDevice& device) {
+  device.platform();
+  CollectDataUsage(5s);
+  _exit(0);
+}
+
+const Scalars kGrowth{{"datausage.wifiInKB.app", 4}};
+
+TEST(DataUsage, GrowthIsCountedOnceWhateverIsKilledInBetween) {
+  TestDevice device(usage(record(kApp, kToday, counters(5096, 0, 0, 0))));
+  const std::string before = R"({"app":[{"date":"2024-03-05T00:00:00.5Z"},1000,0,0,0]})";
+  const std::string after = R"({"app":[{"date":"2024-03-05T00:00:00.5Z"},5096,0,0,0]})";
+  setBaseline(device, before);
+  device.platform().preferences().LGSPreferencesSynchronize(kDomain);
+  std::string error;
+  EXPECT_FALSE(device.platform().counters().write(
+      [&](CounterStore&) {  // which is locked meanwhile: the counters cannot become durable
+        EXPECT_TRUE(hasSucceeded(startProcess([&] {
+          device.endProcess();
+          collectAndDie(device);
+        })));
+        return false;
+      },
+      error));
+  EXPECT_EQ(device.read("outbox/log.jsonl"), "") << "the wait for the database is not the reply's";
+  device.endProcess();
+  EXPECT_EQ(jsonOf(baseline(device)), after);
+  EXPECT_EQ(todaysScalars(device), Scalars{});
+  device.endProcess();
+  const std::string preferences = "var/mobile/Library/Preferences/" + std::string(kDomain);
+  const std::string marked = device.read(preferences + ".ptree");
+
+  device.platform();
+  CollectDataUsage();
+  EXPECT_EQ(todaysScalars(device), kGrowth);
+  EXPECT_EQ(jsonOf(baseline(device)), after);
+  device.endProcess();
+  EXPECT_THAT(device.read(preferences + ".ptree"), testing::Not(testing::HasSubstr("Mark")));
+
+  // Killed when the counters were durable already.
+  device.write(preferences + ".ptree", marked);
+  device.platform();
+  CollectDataUsage();
+  EXPECT_EQ(todaysScalars(device), kGrowth);
+  EXPECT_EQ(jsonOf(baseline(device)), after);
+}
+
+TEST(DataUsage, GrowthWaitsForABaselineThatCanBeWrittenAndCountersThatCanBeRead) {
+  TestDevice device(usage(record(kApp, kToday, counters(4096, 0, 0, 0))));
+  for (const char* inTheWay :
+       {"var/mobile/Library/Preferences", "var/mobile/Library/Tallybook/TBDataStore.sqlitedb"}) {
+    SCOPED_TRACE(inTheWay);
+    device.endProcess();
+    std::filesystem::remove_all(device.path("var"));
+    device.write(std::string(inTheWay) + (inTheWay[19] == 'P' ? "" : "/folder"), "");
+    device.platform();
+    CollectDataUsage();
+    device.endProcess();
+    std::filesystem::remove_all(device.path(inTheWay));
+    device.platform();
+    EXPECT_EQ(todaysScalars(device), Scalars{});
+    CollectDataUsage();
+    EXPECT_EQ(todaysScalars(device), kGrowth);
+  }
+}
+
+TEST(DataUsage, ANameThatNoDocumentCanCarryCostsOnlyItself) {
+  TestDevice device(
+      usage(record(R"("procName": "bad\u0001name")", kToday, counters(9999, 0, 0, 0)) + "," +
+            record(kApp, kToday, counters(4096, 0, 0, 0))));
+  for (int run = 0; run < 2; ++run) {
+    CollectDataUsage();
+    EXPECT_EQ(todaysScalars(device), kGrowth);
+    EXPECT_EQ(jsonOf(baseline(device)),
+              R"({"app":[{"date":"2024-03-05T00:00:00.5Z"},4096,0,0,0]})");
   }
 }
 

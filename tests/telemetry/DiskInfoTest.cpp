@@ -1,6 +1,7 @@
 #include "telemetry/DiskInfo.h"
 
 #include "telemetry/TodaysScalars.h"
+#include "telemetry/UserCapacity.h"
 
 namespace vesprun {
 namespace {
@@ -22,6 +23,11 @@ TEST(DiskInfo, MeasuresTheVolumeOrAsksForDiskUsage) {
        1430511},
       {R"({"blockSize": 1000, "blocks": 65536000, "available": 32768000})", kNull, 31250, 5000, 128,
        62500},
+      // As full and as small as is still believed.
+      {R"({"blockSize": 4096, "blocks": 10000000, "available": 9999000})", kNull, 39058, 1, 64,
+       39062},
+      {R"({"blockSize": 1000, "blocks": 512000, "available": 0})", kNull, 0, 10000, 1, 488},
+      {R"({"blockSize": 1000, "blocks": 1023000, "available": 0})", kNull, 0, 10000, 1, 975},
       // Nearly empty, without a size and too small for a gigabyte: not believed.
       {R"({"blockSize": 4096, "blocks": 10000000, "available": 9999001})",
        R"({"TotalDiskCapacity": 137438953472})", 0, 10000, 256, 131072},
@@ -50,8 +56,20 @@ TEST(DiskInfo, MeasuresTheVolumeOrAsksForDiskUsage) {
         << c.volume << c.usage;
     for (const auto& [key, value] : info) {
       const NumberKind asked = key.ends_with("_GB") ? NumberKind::UInt32 : NumberKind::Int64;
-      EXPECT_EQ(value.number()->kind(), &c - cases < 3 ? NumberKind::UInt64 : asked) << key;
+      EXPECT_EQ(value.number()->kind(), &c - cases < 6 ? NumberKind::UInt64 : asked) << key;
     }
+  }
+}
+
+TEST(UserCapacity, IsThePowerOfTwoAboveButFor1536) {
+  const std::pair<std::uint64_t, std::uint32_t> cases[] = {
+      {500, 0},          {1000, 1},         {1024, 2},
+      {121'856, 128},    {1'376'255, 2048}, {1'376'256, 1536},
+      {1'770'495, 1536}, {1'770'496, 2048}, {0xFFFF'FFFF, 4'194'304},
+      {0x7'0000'0400, 2}};
+  EXPECT_EQ(GetUserCapacityInGB(0), 0U);
+  for (const auto& [megabytes, gigabytes] : cases) {
+    EXPECT_EQ(GetUserCapacityInGB(megabytes), gigabytes) << megabytes;
   }
 }
 

@@ -1,5 +1,9 @@
 #include "telemetry/KernelECCEvents.h"
 
+#include <filesystem>
+
+#include "platform/host/device/ECCEventQueue.h"
+#include "support/HostServiceTest.h"
 #include "telemetry/TodaysScalars.h"
 
 namespace vesprun {
@@ -77,7 +81,34 @@ TEST(ECCEventQueue, SetsAsideWhatIsNoEvent) {
   EXPECT_THAT(run(device), testing::SizeIs(1));
   EXPECT_THAT(device.names("kernel/ecc"), ElementsAre("1.bin.unusable", "2.bin.unusable"));
   EXPECT_THAT(device.log(), ElementsAre(EndsWith("1.bin: 71 bytes are not an ECC event of 72"),
-                                        EndsWith("2.bin: Is a directory")));
+                                        EndsWith("2.bin: not a regular file")));
+}
+
+TEST(ECCEventQueue, KeepsAnEventUntilItsRecordIsWritten) {
+  TestDevice device;
+  device.write("kernel/ecc/1.bin", event(1, 0));
+  device.write("kernel/ecc/2.bin", event(2, 0));
+  device.write("outbox/records.jsonl/in/the/way", "");
+  LogKernelECCEvents();
+  EXPECT_THAT(device.names("kernel/ecc"), ElementsAre("1.bin", "2.bin"));
+  std::filesystem::remove_all(device.path("outbox/records.jsonl"));
+  EXPECT_TRUE(hasSucceeded(startProcess([&device] {
+    std::string error;
+    const std::unique_ptr<HostPlatform> other = HostPlatform::open(device.path(), error);
+    std::array<std::uint8_t, ECCEventQueue::kEventLength> taken{};
+    std::size_t length = taken.size();
+    EXPECT_EQ(other->kernel().sysctlbyname("kern.next_ecc_event", taken, length), 0);
+    EXPECT_EQ(taken[0], 2) << "the first is still in the hands of the other process";
+  })));
+  EXPECT_THAT(run(device), testing::SizeIs(2));
+  EXPECT_THAT(device.names("kernel/ecc"), ElementsAre());
+}
+
+TEST(ECCEventQueue, SaysThatItsFolderCannotBeOpened) {
+  TestDevice device;
+  device.write("kernel/ecc", "");
+  EXPECT_THAT(run(device), ElementsAre());
+  EXPECT_THAT(device.log(), testing::Contains(EndsWith("kernel/ecc: Not a directory")));
 }
 
 }  // namespace

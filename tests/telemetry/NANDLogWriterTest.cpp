@@ -5,7 +5,7 @@
 #include <limits>
 
 #include "NANDInfo/lists/StructuredLogState.h"
-#include "support/ListBuffers.h"
+#include "buffers/DeviceBuffers.h"
 #include "support/TestDevice.h"
 
 namespace vesprun {
@@ -15,8 +15,6 @@ constexpr const char* kDateKey = "SSLastLoggedAt";
 
 class NANDLogWriter : public testing::Test {
  protected:
-  ~NANDLogWriter() override { forgetStructuredLogState(); }
-
   std::string log() const { return device.read("outbox/logs/0001-165-StorageStatus.log"); }
   /// The items of the log's last line.
   std::string items() const {

@@ -15,7 +15,7 @@ inline Scalars writtenScalars(TestDevice& device, std::string_view prefix = "") 
   Scalars scalars;
   device.platform()
       .tallybook()
-      .openHistory()
+      .initWithDefaultPath()
       ->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
           prefix, TestDevice::kToday, TestDevice::kToday,
           [&](std::string_view key, std::int32_t, std::int64_t value, bool&) {

@@ -8,7 +8,7 @@
 namespace vesprun {
 namespace {
 
-using ::testing::AllOf;
+using ::testing::AllOf, ::testing::AnyOf;
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 using ::testing::Not;
@@ -94,6 +94,31 @@ TEST_F(VespctlTest, SaysWhyItFailed) {
   }
 }
 
+TEST_F(VespctlTest, TakesNumbersAsDecimalOnes) {
+  for (const char* const number : {"0", "08", "18446744073709551615"}) {
+    EXPECT_EQ(run(std::string("nand \"$D\" magazine -- ") + number), 0) << error;
+  }
+  for (const char* const number : {"-- -1", "18446744073709551616", "0x8", "1 --mode 0x1",
+                                   "1 --mode=-1", "1 --mode 4294967296"}) {
+    EXPECT_EQ(run(std::string("nand \"$D\" magazine ") + number), 2) << number;
+    EXPECT_THAT(error, HasSubstr(" is not a number from 0 to ")) << number;
+  }
+}
+
+TEST_F(VespctlTest, DecodesAnEmptyBuffer) {
+  const std::pair<const char*, const char*> cases[] = {
+      {"base /dev/null",
+       R"({"result":false,"error":"NA","fields":[],"summary":{"exportVersion":0,)"},
+      {"ftl - </dev/null", R"({"result":0,"error":"NA","fields":[]})"},
+      {"msp /dev/null", R"({"result":0,"error":"ORUMSPParseBufferToCxt: Passed in invalid buffer)"},
+      {"snapshot --thread t /dev/null", R"({"found":false,"ioStatistics":null})"}};
+  for (const auto& [arguments, answer] : cases) {
+    EXPECT_EQ(run(std::string("decode ") + arguments), 0) << error;
+    EXPECT_THAT(output, StartsWith(answer));
+  }
+  EXPECT_EQ(run("decode base nowhere"), 1);
+}
+
 TEST_F(VespctlTest, TellsOfADamagedDatabase) {
   const char* const database = "device/var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
   const char* const kept = "is not a database; kept as ";
@@ -134,6 +159,29 @@ TEST_F(VespctlTest, ShowsSubmittedLogs) {
                             HasSubstr("count 2, min 1, mean 2, max 3, standard deviation 1\n"),
                             HasSubstr("  (-inf, 2]  " + std::string(40, '#') + " 1\n"),
                             HasSubstr("   (2, inf)   -4\n")));
+}
+
+TEST_F(VespctlTest, LetsNoControlCharacterFromAFileReachTheTerminal) {
+  const std::string clear = "\x1B[2J";
+  folder.write("device/outbox/logs/0001-165-" + clear + ".log", "a" + clear + ";b\r\n");
+  folder.write("device/outbox/logs/0001-165-" + clear + ".header.json", R"({"\u001b": "\u0007"})");
+  folder.write("device/outbox/logs/0002-193-log.ptree",
+               "<ptree version=\"1.0\"><dict><key>TBScalars</key><dict><key>\x7F</key>"
+               "<string>\n\xC2\x9B</string></dict></dict></ptree>");
+  for (const char* name : {"events", "records", "notifications", "log"}) {
+    folder.write(
+        "device/outbox/" + std::string(name) + ".jsonl",
+        R"({"time":"\u001b","event":"\u001b","payload":{"\u001b":"\u001b"},"type":"\b",)"
+        R"("record":{"\u001b":"\u001b"},"name":"\u001b","level":"\b","message":"\u001b"})");
+  }
+  for (const char* part : {"", " events", " records", " logs"}) {
+    EXPECT_EQ(run("show \"$D\"" + std::string(part)), 0);
+    EXPECT_EQ(output.find_first_of("\x1B\x7F\b\a\r\x9B"), std::string::npos) << output;
+    EXPECT_THAT(output, AnyOf(HasSubstr("\\x1b"), HasSubstr("\\x08")));
+  }
+  EXPECT_THAT(output, HasSubstr("    \\x7f  \\x0a\\xc2\\x9b\n"));
+  EXPECT_EQ(run("ptree $'\\e[2J'"), 1);
+  EXPECT_EQ(error, "vespctl: \\x1b[2J: No such file or directory\n");
 }
 
 }  // namespace

@@ -1,12 +1,17 @@
 #pragma once
 
 #include <CLI/CLI.hpp>
+#include <charconv>
+#include <concepts>
+#include <limits>
 #include <memory>
 #include <stdexcept>
 #include <string>
+#include <system_error>
 
 #include "common/PropertyValue.h"
 #include "platform/host/HostPlatform.h"
+#include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {
 
@@ -32,6 +37,26 @@ std::string inputName(const std::string& file);
 
 /// Prints a value in its JSON form and ends the line.
 void printJson(const PropertyValue& value);
+
+/// Takes a decimal integer that fits `T`, and nothing else: leading zeros mean nothing, and no
+/// unsigned number has a sign.
+template <std::integral T>
+CLI::Validator decimal() {
+  return CLI::Validator(
+      [](std::string& text) {
+        T number = 0;
+        const char* const end = text.data() + text.size();
+        const auto [rest, error] = std::from_chars(text.data(), end, number);
+        if (error != std::errc() || rest != end) {
+          return quotedText(text) + " is not a number from " +
+                 std::to_string(std::numeric_limits<T>::min()) + " to " +
+                 std::to_string(std::numeric_limits<T>::max());
+        }
+        text = std::to_string(number);
+        return std::string();
+      },
+      "");
+}
 
 /// Allows one command of those that `subject` has by now, and refuses any other word by naming
 /// them. That none is given is refused, too, when one is `needed`.

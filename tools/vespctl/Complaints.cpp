@@ -3,6 +3,7 @@
 #include <cstdio>
 
 #include "Command.h"
+#include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {
 
@@ -40,7 +41,7 @@ void Complaints::fail(const std::string& error) const {
 
 void Complaints::print() const {
   for (const std::string& message : _messages) {
-    std::fprintf(stderr, "vespctl: %s\n", message.c_str());
+    std::fprintf(stderr, "vespctl: %s\n", printableText(message).c_str());
   }
 }
 

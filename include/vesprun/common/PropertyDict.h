@@ -25,13 +25,12 @@ class PropertyDict {
       return std::hash<std::string_view>{}(key);
     }
   };
-  // Entries lie in a vector: an empty dictionary, and there are many, allocates nothing.
-  using Entry = std::pair<std::string, PropertyValue>;
+  using Entries = std::vector<std::pair<std::string, PropertyValue>>;
   using Map = tsl::ordered_map<std::string, PropertyValue, KeyHash, std::equal_to<>,
-                               std::allocator<Entry>, std::vector<Entry>>;
+                               Entries::allocator_type, Entries>;
 
  public:
-  using const_iterator = Map::const_iterator;  ///< over pairs of key and value, in order
+  using const_iterator = Entries::const_iterator;  ///< over pairs of key and value, in order
 
   PropertyDict() = default;
   PropertyDict(std::initializer_list<std::pair<std::string, PropertyValue>> entries) {
@@ -39,88 +38,195 @@ class PropertyDict {
       set(key, value);
     }
   }
+  PropertyDict(const PropertyDict& other)
+      : _few(other._few), _many(other._many ? std::make_unique<Map>(*other._many) : nullptr) {}
+  PropertyDict(PropertyDict&&) noexcept = default;
+  PropertyDict& operator=(const PropertyDict& other) { return *this = PropertyDict(other); }
+  PropertyDict& operator=(PropertyDict&&) noexcept = default;
+  ~PropertyDict() = default;
 
   /// The value under `key`, or null. Valid until the dictionary is changed.
   const PropertyValue* find(std::string_view key) const {
-    const auto entry = _entries.find(key);
-    return entry != _entries.end() ? &entry->second : nullptr;
+    if (_many) {
+      const auto entry = _many->find(key);
+      return entry != _many->end() ? &entry->second : nullptr;
+    }
+    const auto entry = findFew(key);
+    return entry != _few.end() ? &entry->second : nullptr;
   }
   bool contains(std::string_view key) const { return find(key) != nullptr; }
 
+  // The same for one type: null too when the value is of another.
+  const PropertyDict* findDict(std::string_view key) const {
+    return find<PropertyDict>(key, &PropertyValue::dict);
+  }
+  const PropertyArray* findArray(std::string_view key) const {
+    return find(key, &PropertyValue::array);
+  }
+  const std::string* findString(std::string_view key) const {
+    return find(key, &PropertyValue::string);
+  }
+  const Number* findNumber(std::string_view key) const { return find(key, &PropertyValue::number); }
+  const Bytes* findData(std::string_view key) const { return find(key, &PropertyValue::data); }
+  const Date* findDate(std::string_view key) const { return find(key, &PropertyValue::date); }
+
   void set(std::string_view key, PropertyValue value) {
+    if (!_many) {
+      if (const auto entry = findFew(key); entry != _few.end()) {
+        _few[static_cast<std::size_t>(entry - _few.begin())].second = std::move(value);
+        return;
+      }
+      if (_few.size() < kMostFew) {
+        _few.emplace_back(key, std::move(value));
+        return;
+      }
+      makeMap(kMostFew + 1);
+    }
     // Most keys are new: one search finds that out and where they go.
-    auto [entry, isNew] = _entries.try_emplace(std::string(key), std::move(value));
+    auto [entry, isNew] = _many->try_emplace(std::string(key), std::move(value));
     if (!isNew) {
       entry.value() = std::move(value);  // which was not taken
     }
   }
   /// Removes the entry, keeping the order of the others; false when there was none.
   bool remove(std::string_view key) {
-    const auto entry = _entries.find(key);
-    if (entry == _entries.end()) {
+    if (_many) {
+      return _many->erase(key) != 0;
+    }
+    const auto entry = findFew(key);
+    if (entry == _few.end()) {
       return false;
     }
-    _entries.erase(entry);
+    _few.erase(entry);
     return true;
   }
   /// Sets every entry of `other`, in its order.
+  void merge(PropertyDict&& other) {
+    if (empty()) {
+      *this = std::move(other);
+    } else {
+      merge(std::as_const(other));
+    }
+  }
   void merge(const PropertyDict& other) {
     for (const auto& [key, value] : other) {
       set(key, value);
     }
   }
-  void clear() { _entries.clear(); }
-  void reserve(std::size_t count) { _entries.reserve(count); }
+  void clear() { *this = {}; }
+  void reserve(std::size_t count) {
+    if (_many) {
+      _many->reserve(count);
+    } else if (count > kMostFew) {
+      makeMap(count);
+    } else {
+      _few.reserve(count);
+    }
+  }
 
-  std::size_t size() const { return _entries.size(); }
-  bool empty() const { return _entries.empty(); }
-  const_iterator begin() const { return _entries.begin(); }
-  const_iterator end() const { return _entries.end(); }
+  std::size_t size() const { return entries().size(); }
+  bool empty() const { return entries().empty(); }
+  const_iterator begin() const { return entries().begin(); }
+  const_iterator end() const { return entries().end(); }
 
   friend bool operator==(const PropertyDict& left, const PropertyDict& right);
 
  private:
-  Map _entries;
+  template <typename T>
+  const T* find(std::string_view key, const T* (PropertyValue::*typed)() const) const {
+    const PropertyValue* value = find(key);
+    return value != nullptr ? (value->*typed)() : nullptr;
+  }
+
+  // There are many small dictionaries: they do without a hash table.
+  static constexpr std::size_t kMostFew = 8;
+
+  const Entries& entries() const { return _many ? _many->values_container() : _few; }
+
+  const_iterator findFew(std::string_view key) const {
+    return std::find_if(_few.begin(), _few.end(),
+                        [key](const auto& entry) { return entry.first == key; });
+  }
+
+  void makeMap(std::size_t count) {
+    auto map = std::make_unique<Map>();
+    map->reserve(count);
+    for (auto& [key, value] : _few) {
+      map->try_emplace(std::move(key), std::move(value));
+    }
+    _few = {};
+    _many = std::move(map);
+  }
+
+  Entries _few;
+  std::unique_ptr<Map> _many;  // once there have been more than a few
 };
 
 // What a value can only do where a dictionary is complete.
 
 inline PropertyValue::PropertyValue(PropertyDict dict)
-    : _value(std::make_unique<PropertyDict>(std::move(dict))) {}
+    : PropertyValue(Type::Dict, std::move(dict)) {}
 
-inline PropertyValue::PropertyValue(const PropertyValue& other) : _value(copyOf(other._value)) {}
-
-inline PropertyValue& PropertyValue::operator=(const PropertyValue& other) {
-  if (this != &other) {
-    _value = copyOf(other._value);
+inline PropertyDict* PropertyValue::dict() {
+  if (_type == Type::Dict && _number.asUInt64() == 0) {
+    setBox(new PropertyDict);
   }
-  return *this;
+  return const_cast<PropertyDict*>(std::as_const(*this).dict());
 }
 
-inline PropertyValue::~PropertyValue() = default;
+template <typename Visit>
+void PropertyValue::visitBox(Visit visit) const {
+  switch (_type) {
+    case Type::Number:
+    case Type::Boolean:
+      break;
+    case Type::Dict:
+      return visit(box<PropertyDict>());
+    case Type::Array:
+      return visit(box<PropertyArray>());
+    case Type::String:
+      return visit(box<std::string>());
+    case Type::Data:
+      return visit(box<Bytes>());
+    case Type::Date:
+      return visit(box<Date>());
+  }
+}
 
-inline PropertyValue::Value PropertyValue::copyOf(const Value& value) {
-  return std::visit(
-      [](const auto& held) -> Value {
-        if constexpr (std::same_as<std::decay_t<decltype(held)>, DictBox>) {
-          return held ? std::make_unique<PropertyDict>(*held) : nullptr;
-        } else {
-          return held;
-        }
-      },
-      value);
+inline PropertyValue::PropertyValue(const PropertyValue& other)
+    : _number(other._number), _type(other._type), _boolean(other._boolean) {
+  visitBox([this](auto* box) {
+    if (box != nullptr) {
+      setBox(new std::decay_t<decltype(*box)>(*box));
+    }
+  });
+}
+
+inline void PropertyValue::deleteBox() {
+  visitBox([](auto* box) { delete box; });
 }
 
 inline bool operator==(const PropertyValue& left, const PropertyValue& right) {
-  if (left._value.index() != right._value.index()) {
+  if (left._type != right._type) {
     return false;
   }
-  const PropertyDict* leftDict = left.dict();
-  const PropertyDict* rightDict = right.dict();
-  if (leftDict != nullptr && rightDict != nullptr) {
-    return *leftDict == *rightDict;
+  switch (left._type) {
+    case PropertyValue::Type::Number:
+      return left._number == right._number;
+    case PropertyValue::Type::Boolean:
+      return left._boolean == right._boolean;
+    case PropertyValue::Type::Dict:
+      return *left.dict() == *right.dict();
+    case PropertyValue::Type::Array:
+      return *left.array() == *right.array();
+    case PropertyValue::Type::String:
+      return *left.string() == *right.string();
+    case PropertyValue::Type::Data:
+      return *left.data() == *right.data();
+    case PropertyValue::Type::Date:
+      return *left.date() == *right.date();
   }
-  return left._value == right._value;
+  return false;
 }
 
 inline bool operator==(const PropertyDict& left, const PropertyDict& right) {

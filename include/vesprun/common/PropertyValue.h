@@ -1,14 +1,13 @@
 #pragma once
 
+#include <bit>
 #include <cstdint>
-#include <memory>
 #include <string>
 #include <string_view>
 #include <utility>
-#include <variant>
 #include <vector>
 
-#include "Instant.h"
+#include "Date.h"
 #include "Number.h"
 
 namespace vesprun {
@@ -21,54 +20,93 @@ using Bytes = std::vector<std::uint8_t>;
 
 /// The dynamically typed value that the whole system exchanges: dictionary, array, string, number,
 /// boolean, byte data or date. A value owns everything in it; copying copies deeply, moving is
-/// cheap.
+/// cheap. It takes 16 bytes, and nothing else when it is an empty dictionary, array, string or
+/// data.
 ///
-/// The readers `dict()` to `date()` return a pointer into the value, or null when it is of another
-/// type. The pointer is valid as long as the value is neither changed nor destroyed.
+/// The readers `dict()` to `date()` return a pointer to the content, or null when the value is of
+/// another type. The pointer is valid until the value is changed, moved or destroyed.
 class PropertyValue {
  public:
   PropertyValue(PropertyDict dict);  // NOLINT(google-explicit-constructor): a value is any of these
-  PropertyValue(PropertyArray array) : _value(std::move(array)) {}
-  PropertyValue(std::string text) : _value(std::move(text)) {}
-  PropertyValue(std::string_view text) : _value(std::string(text)) {}
-  PropertyValue(const char* text) : _value(std::string(text)) {}
-  PropertyValue(Bytes data) : _value(std::move(data)) {}
-  PropertyValue(Date date) : _value(date) {}
-  PropertyValue(Number number) : _value(number) {}
+  PropertyValue(PropertyArray array) : PropertyValue(Type::Array, std::move(array)) {}
+  PropertyValue(std::string text) : PropertyValue(Type::String, std::move(text)) {}
+  PropertyValue(std::string_view text) : PropertyValue(std::string(text)) {}
+  PropertyValue(const char* text) : PropertyValue(std::string(text)) {}
+  PropertyValue(Bytes data) : PropertyValue(Type::Data, std::move(data)) {}
+  PropertyValue(Date date) : PropertyValue(Type::Date, date) {}
+  PropertyValue(Number number) : _number(number), _type(Type::Number) {}
   template <NumberType T>
-  PropertyValue(T number) : _value(Number(number)) {}
-  PropertyValue(std::same_as<bool> auto boolean) : _value(boolean) {}
+  PropertyValue(T number) : PropertyValue(Number(number)) {}
+  PropertyValue(std::same_as<bool> auto boolean)
+      : _number(0U), _type(Type::Boolean), _boolean(boolean) {}
 
   PropertyValue(const PropertyValue& other);
-  PropertyValue(PropertyValue&& other) noexcept = default;
-  PropertyValue& operator=(const PropertyValue& other);
-  PropertyValue& operator=(PropertyValue&& other) noexcept = default;
-  ~PropertyValue();
-
-  const PropertyDict* dict() const {
-    const auto* box = std::get_if<DictBox>(&_value);
-    return box != nullptr ? box->get() : nullptr;
+  PropertyValue(PropertyValue&& other) noexcept : PropertyValue(false) { swap(other); }
+  PropertyValue& operator=(const PropertyValue& other) {
+    PropertyValue(other).swap(*this);
+    return *this;
   }
-  PropertyDict* dict() { return const_cast<PropertyDict*>(std::as_const(*this).dict()); }
-  const PropertyArray* array() const { return std::get_if<PropertyArray>(&_value); }
-  const std::string* string() const { return std::get_if<std::string>(&_value); }
-  const Number* number() const { return std::get_if<Number>(&_value); }
-  const bool* boolean() const { return std::get_if<bool>(&_value); }
-  const Bytes* data() const { return std::get_if<Bytes>(&_value); }
-  const Date* date() const { return std::get_if<Date>(&_value); }
+  PropertyValue& operator=(PropertyValue&& other) noexcept {
+    PropertyValue(std::move(other)).swap(*this);
+    return *this;
+  }
+  ~PropertyValue() {
+    if (_type > Type::Boolean && _number.asUInt64() != 0) {
+      deleteBox();
+    }
+  }
+
+  const PropertyDict* dict() const { return content<PropertyDict>(Type::Dict); }
+  PropertyDict* dict();
+  const PropertyArray* array() const { return content<PropertyArray>(Type::Array); }
+  const std::string* string() const { return content<std::string>(Type::String); }
+  const Number* number() const { return _type == Type::Number ? &_number : nullptr; }
+  const bool* boolean() const { return _type == Type::Boolean ? &_boolean : nullptr; }
+  const Bytes* data() const { return content<Bytes>(Type::Data); }
+  const Date* date() const { return content<Date>(Type::Date); }
 
   /// Equal type and content. Numbers compare by value, not by kind; dictionaries compare as sets of
   /// entries, whatever their order.
   friend bool operator==(const PropertyValue& left, const PropertyValue& right);
 
  private:
-  // Boxed because a dictionary holds values; never null but in a moved-from value.
-  using DictBox = std::unique_ptr<PropertyDict>;
-  using Value = std::variant<DictBox, PropertyArray, std::string, Number, bool, Bytes, Date>;
+  enum class Type : std::uint8_t { Number, Boolean, Dict, Array, String, Data, Date };
 
-  static Value copyOf(const Value& value);
+  // What is neither a number nor a boolean lies in a box on the heap, whose address is kept as the
+  // number; 0 when it is empty.
+  template <typename T>
+  PropertyValue(Type type, T content) : _number(0U), _type(type) {
+    if (content != T()) {
+      setBox(new T(std::move(content)));
+    }
+  }
 
-  Value _value;
+  template <typename T>
+  T* box() const {
+    return std::bit_cast<T*>(_number.asUInt64());
+  }
+  template <typename T>
+  void setBox(T* box) {
+    _number = Number(std::bit_cast<std::uint64_t>(box));
+  }
+  template <typename T>
+  const T* content(Type type) const {
+    static const T kEmpty{};
+    return _type != type ? nullptr : _number.asUInt64() != 0 ? box<T>() : &kEmpty;
+  }
+
+  template <typename Visit>
+  void visitBox(Visit visit) const;
+  void deleteBox();
+  void swap(PropertyValue& other) noexcept {
+    std::swap(_number, other._number);
+    std::swap(_type, other._type);
+    std::swap(_boolean, other._boolean);
+  }
+
+  [[no_unique_address]] Number _number;  // the other two lie in its padding
+  Type _type;
+  bool _boolean = false;
 };
 
 }  // namespace vesprun

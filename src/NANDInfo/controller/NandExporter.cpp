@@ -50,16 +50,6 @@ constexpr nand_exporter_t withMSPStatistics(nand_exporter_t exporter) {
   return exporter;
 }
 
-void closeAndForget(RegistryHandle& connection, RegistryHandle& service) {
-  DeviceRegistry& registry = platform().deviceRegistry();
-  if (const RegistryHandle open = std::exchange(connection, 0)) {
-    registry.DevRegServiceClose(open);
-  }
-  if (const RegistryHandle held = std::exchange(service, 0)) {
-    registry.DevRegObjectRelease(held);
-  }
-}
-
 }  // namespace
 
 std::array<nand_exporter_t, 4> nand_exporters_tunnel{
@@ -97,20 +87,20 @@ RegistryHandle FindServiceUsingIterator(const std::string& className) {
 
 RegistryHandle findNandExporter(nand_exporter_t*& exporter) {
   for (exporter = nand_exporters_tunnel.data(); exporter->name != nullptr; ++exporter) {
-    if (const RegistryHandle service =
-            platform().deviceRegistry().DevRegServiceGetMatchingService(exporter->name)) {
+    if (RegistryObject service{
+            platform().deviceRegistry().DevRegServiceGetMatchingService(exporter->name)}) {
       logMessage(LogLevel::Notice, "NANDInfo: findNandExporter: Controller found: %s\n",
                  exporter->name);
-      return service;
+      return service.take();
     }
   }
   std::fputs(
       "Failed to find matching service with DevRegServiceGetMatchingService, trying iterator...\n",
       stderr);
   for (exporter = nand_exporters_tunnel.data(); exporter->name != nullptr; ++exporter) {
-    if (const RegistryHandle service = FindServiceUsingIterator(exporter->name)) {
+    if (RegistryObject service{FindServiceUsingIterator(exporter->name)}) {
       logMessage(LogLevel::Notice, "Find service for class %s\n", exporter->name);
-      return service;
+      return service.take();
     }
   }
   return 0;
@@ -127,11 +117,11 @@ bool findNandExporterNew(nand_exporter_t*& exporter) {
     }
     RegistryHandle connection = 0;
     if (registry.DevRegServiceOpen(service.get(), connection) == kRegistrySuccess) {
-      logMessage(LogLevel::Notice, "NANDInfo: findNandExporterNew: Controller found: %s\n",
-                 entry->name);
       entry->connection = connection;
       entry->service = service.take();
       exporter = entry;
+      logMessage(LogLevel::Notice, "NANDInfo: findNandExporterNew: Controller found: %s\n",
+                 entry->name);
       return true;
     }
     registry.DevRegServiceClose(connection);
@@ -146,32 +136,14 @@ void ReleaseIOInterfaces(nand_exporter_t& exporter) {
   closeAndForget(exporter.connection, exporter.service);
 }
 
-bool openORUConnection(ORUConnection& connection) {
-  connection.connection = 0;
-  connection.service = findNandExporter(connection.exporter);
-  if (connection.service == 0) {
-    std::fputs("Can't get ORU Connection, no matching service!\n", stderr);
-    closeORUConnection(connection);
-    return false;
+void closeAndForget(RegistryHandle& connection, RegistryHandle& service) {
+  DeviceRegistry& registry = platform().deviceRegistry();
+  if (const RegistryHandle open = std::exchange(connection, 0)) {
+    registry.DevRegServiceClose(open);
   }
-  nand_exporter_t& exporter = *connection.exporter;
-  const RegistryResult result =
-      platform().deviceRegistry().DevRegServiceOpen(connection.service, connection.connection);
-  exporter.connection = connection.connection;
-  if (result != kRegistrySuccess) {
-    std::fprintf(stderr, "DevRegServiceOpen failed for class '%s', result 0x%x\n", exporter.name,
-                 result);
+  if (const RegistryHandle held = std::exchange(service, 0)) {
+    registry.DevRegObjectRelease(held);
   }
-  if (exporter.getStatsSelectors == nullptr || connection.connection == 0) {
-    std::fputs("Can't get ORU Connection!\n", stderr);
-    closeORUConnection(connection);
-    return false;
-  }
-  return true;
-}
-
-void closeORUConnection(ORUConnection& connection) {
-  closeAndForget(connection.connection, connection.service);
 }
 
 }  // namespace vesprun

@@ -6,7 +6,6 @@
 #include <string>
 
 #include "platform/DeviceRegistry.h"
-#include "vesprun.h"
 
 namespace vesprun {
 
@@ -64,8 +63,8 @@ struct nand_exporter_t {
 
 inline constexpr std::uint32_t kMethodNotOffered = 0xFFFFFFFF;
 
-/// The known controllers in the order in which they are looked for, then an entry with every field
-/// 0 that stands for "none". One table for the process, without a lock: look-ups must not overlap.
+/// The known controllers in the order in which they are looked for, then an ending entry with
+/// every field 0. One table for the process, without a lock: look-ups must not overlap.
 extern std::array<nand_exporter_t, 4> nand_exporters_tunnel;
 
 /// Forgets the handles in the table, as in a new process; nothing is closed or released.
@@ -87,5 +86,8 @@ bool findNandExporterNew(nand_exporter_t*& exporter);
 
 /// Closes the entry's connection and releases its service, if any, and forgets them.
 void ReleaseIOInterfaces(nand_exporter_t& exporter);
+
+/// The same for handles that lie elsewhere.
+void closeAndForget(RegistryHandle& connection, RegistryHandle& service);
 
 }  // namespace vesprun

@@ -1,29 +1,12 @@
 #include "NANDInfo/controller/TunnelCommand.h"
 
 #include <algorithm>
-#include <bit>
-#include <cstring>
 
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "common/LittleEndian.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
-namespace {
-
-static_assert(std::endian::native == std::endian::little, "requests are little-endian");
-
-}  // namespace
-
-std::array<std::uint8_t, TunnelRequest::kSize> TunnelRequest::encode() const {
-  std::array<std::uint8_t, kSize> bytes{};
-  std::memcpy(bytes.data() + 0, &opcode, sizeof opcode);
-  std::memcpy(bytes.data() + 4, &sizeQuery, sizeof sizeQuery);
-  std::memcpy(bytes.data() + 8, &argument, sizeof argument);
-  std::memcpy(bytes.data() + 12, &inputLength, sizeof inputLength);
-  std::memcpy(bytes.data() + 16, &inputAddress, sizeof inputAddress);
-  return bytes;
-}
 
 // calloc takes large blocks straight from the system: zero, and without touching them.
 TunnelBuffer::TunnelBuffer(std::size_t size)

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <array>
+#include <bit>
 #include <cstdint>
 #include <cstdlib>
 #include <memory>
@@ -10,18 +11,20 @@
 
 namespace vesprun {
 
-/// The struct input of both phases of a tunnel command: 24 bytes, little-endian, at these offsets.
+/// The struct input of both phases of a tunnel command, as it lies in memory: little-endian, at
+/// these offsets.
 struct TunnelRequest {
-  static constexpr std::size_t kSize = 24;
-
   std::uint32_t opcode = 0;        ///< 0
   std::uint32_t sizeQuery = 0;     ///< 4: 1 when the size is asked for, else 0; flags for a list
   std::uint32_t argument = 0;      ///< 8: MSP index, hours back, or 0
   std::uint32_t inputLength = 0;   ///< 12
   std::uint64_t inputAddress = 0;  ///< 16
 
-  std::array<std::uint8_t, kSize> encode() const;
+  std::array<std::uint8_t, 24> encode() const {
+    return std::bit_cast<std::array<std::uint8_t, 24>>(*this);
+  }
 };
+static_assert(std::endian::native == std::endian::little);
 
 /// Bytes that a driver fills: zero at first, and of the size that the driver asks for, which may be
 /// close to 4 GiB. Memory that nobody touches is not used up.

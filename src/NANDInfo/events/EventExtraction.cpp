@@ -1,16 +1,23 @@
-#include "NANDInfo/events/EventExtraction.h"
+#include "NANDInfo/EventExtraction.h"
 
+#include <array>
 #include <string>
+#include <utility>
 
-#include "NANDInfo/events/MagazineEvents.h"
-#include "NANDInfo/events/StatisticsEvents.h"
+#include "NANDInfo/controller/EntryPoint.h"
+#include "NANDInfo/events/StorageEvents.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
-#include "platform/Platform.h"
 #include "telemetry/NVRAMStatistics.h"
 
 namespace vesprun {
 namespace {
 
+/// What each step sends. The last one only has a name.
+constexpr std::array kEH_Extraction_Step_Names{
+    "FTL big view",       "MSP stats",           "storage stats",        "NVRAM stat",
+    "FTL statsMag daily", "FTL statsMag weekly", "FTL statsMag monthly", "FTL counters"};
+
+constexpr std::uint32_t kDailyStep = 4;
 constexpr std::uint32_t kMonthlyStep = 6;
 
 /// Nothing for a step that is only a name.
@@ -24,10 +31,10 @@ std::optional<PropertyDict> resultOfStep(std::uint32_t step) {
       return createAndLogStorageStatsToEventHubForEvent();
     case 3:
       return gatherNVRAMStats();
-    case 4:
-    case 5:
+    case kDailyStep:
+    case kDailyStep + 1:
     case kMonthlyStep:
-      return createAndLogSMagFTLFieldsToEventHubForEvent(step - 4);
+      return createAndLogSMagFTLFieldsToEventHubForEvent(step - kDailyStep);
     default:
       return std::nullopt;
   }
@@ -38,49 +45,43 @@ std::optional<PropertyDict> runStep(std::uint32_t step) {
     return PropertyDict{
         {std::string(kNANDInfoErrorMessageKey), "Unable call EH API EventHubSendEventLazy"}};
   }
-  const char* name = kEH_Extraction_Step_Names[step].data();
+  const char* name = kEH_Extraction_Step_Names[step];
   logMessage(LogLevel::Default, "NANDInfo: NandInfoExtractToEH_runStep: logging %s\n", name);
   std::optional<PropertyDict> result = resultOfStep(step);
-  if (result) {
-    logMessage(LogLevel::Default, "NANDInfo: NandInfoExtractToEH_runStep: successfully logged %s\n",
-               name);
-  } else {
+  if (!result) {
     SetAPIErrorMessage("%s: unable to log %s to EH", "NANDInfo", name);
-    logMessage(LogLevel::Default, "NANDInfo: NandInfoExtractToEH_runStep: unable to log %s\n",
-               name);
   }
+  logMessage(LogLevel::Default, "NANDInfo: NandInfoExtractToEH_runStep: %s %s\n",
+             result ? "successfully logged" : "unable to log", name);
   return result;
 }
 
 }  // namespace
 
-bool EventHubSendEventLazyWrapper(std::string_view event, const EventHub::PayloadBuilder& build) {
-  return platform().eventHub().EventHubSendEventLazy(event, build);
-}
-
 std::optional<PropertyDict> NandInfoExtractToEH_runAllSteps(std::uint64_t /*context*/,
                                                             bool allowMonthly,
                                                             std::uint32_t collectResults,
-                                                            std::uint32_t firstStep) {
-  PropertyDict results;
-  for (std::uint32_t step = firstStep; step < kEH_Extraction_Step_Names.size(); ++step) {
-    if (step == kMonthlyStep && !allowMonthly) {
-      logMessage(LogLevel::Default, "Skipping Stats Mag Monthly Delta");
-      break;
+                                                            std::uint32_t firstStep) noexcept {
+  return runEntryPoint(__func__, [&]() -> std::optional<PropertyDict> {
+    PropertyDict results;
+    for (std::uint32_t step = firstStep; step < kEH_Extraction_Step_Names.size(); ++step) {
+      if (step == kMonthlyStep && !allowMonthly) {
+        logMessage(LogLevel::Default, "Skipping Stats Mag Monthly Delta");
+        break;
+      }
+      if (std::optional<PropertyDict> result = runStep(step)) {
+        results.merge(*std::move(result));
+      }
+      if (step == kMonthlyStep) {
+        break;
+      }
     }
-    const std::optional<PropertyDict> result = runStep(step);
-    if (result && collectResults != 0) {
-      results.merge(*result);
+    if (collectResults == 0) {
+      return std::nullopt;
     }
-    if (step == kMonthlyStep) {
-      break;
-    }
-  }
-  if (collectResults == 0) {
-    return std::nullopt;
-  }
-  results.set(kNANDInfoErrorMessageKey, GetAPIErrorMessage());
-  return results;
+    results.set(kNANDInfoErrorMessageKey, GetAPIErrorMessage());
+    return results;
+  });
 }
 
 }  // namespace vesprun

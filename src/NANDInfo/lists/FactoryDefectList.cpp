@@ -3,13 +3,13 @@
 #include <algorithm>
 #include <cstdio>
 
+#include "NANDInfo/lists/StructuredLogState.h"
 #include "common/LittleEndian.h"
+#include "platform/DictionaryHelpers.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
 namespace {
-
-constexpr std::int32_t kRecordType = 176;
 
 // The header: a word that is not read, the factory count, the number of records.
 constexpr std::size_t kFactoryCountOffset = 4;
@@ -59,29 +59,32 @@ struct DefectRecord {
 PropertyValue signedNumber(std::uint32_t word) { return static_cast<std::int32_t>(word); }
 
 void log(const PropertyDict& record) {
-  platform().logsmith().FLLogStructuredData(kRecordType, record);
+  platform().logsmith().FLLogStructuredData(kListRecordType, record);
 }
 
 void logHeader(std::uint32_t factoryCount, const PropertyValue* properties) {
   PropertyDict record{{"Factory Count", signedNumber(factoryCount)}};
   const PropertyDict* characteristics = properties != nullptr ? properties->dict() : nullptr;
-  const PropertyValue* description =
-      characteristics != nullptr ? characteristics->find("nand-device-desc") : nullptr;
-  if (description != nullptr && description->number() != nullptr) {
-    record.set("com.quill.NANDInfo.nandDesc", description->number()->asInt32());
+  const Number* description =
+      characteristics != nullptr ? characteristics->findNumber("nand-device-desc") : nullptr;
+  if (description != nullptr) {
+    record.set("com.quill.NANDInfo.nandDesc", description->asInt32());
   }
   log(record);
 }
 
 void logDefect(const DefectRecord& defect, bool modeAdjustsReason) {
-  log({{"Bus", std::int32_t{defect.bus}},
-       {"CE", std::int32_t{defect.chipEnable}},
-       {"CAU", signedNumber(defect.cau)},
-       {"Block", signedNumber(defect.block)},
-       {"Cycle", signedNumber(defect.cycle)},
-       {"Reason", signedNumber(modeAdjustsReason ? defect.adjustedReason() : defect.reason)},
-       {"Page", signedNumber(defect.page)},
-       {"Temperature", defect.temperature}});
+  PropertyDict record{
+      {"Bus", std::int32_t{defect.bus}},
+      {"CE", std::int32_t{defect.chipEnable}},
+      {"CAU", signedNumber(defect.cau)},
+      {"Block", signedNumber(defect.block)},
+      {"Cycle", signedNumber(defect.cycle)},
+      {"Reason", signedNumber(modeAdjustsReason ? defect.adjustedReason() : defect.reason)},
+      {"Page", signedNumber(defect.page)},
+  };
+  setNumberValueForType(record, "Temperature", &defect.temperature, PVNumberType::Int8);
+  log(record);
 }
 
 }  // namespace

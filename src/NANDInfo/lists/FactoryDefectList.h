@@ -9,7 +9,7 @@
 namespace vesprun {
 
 /// Logs a controller's list of factory defects as structured records of type 176: one with "Factory
-/// Count" and, when the controller's properties tell it, "com.quill.NANDInfo.nandDesc"; then one
+/// Count" and, when the controller's properties have it, "com.quill.NANDInfo.nandDesc"; then one
 /// for each defect that lies wholly within the buffer. All numbers are signed 32-bit, but for
 /// "Temperature", which is signed 8-bit.
 ///

@@ -10,20 +10,24 @@
 #include <string_view>
 #include <vector>
 
-#include "NANDInfo/controller/ControllerConnection.h"
-#include "NANDInfo/controller/ControllerListReader.h"
-#include "NANDInfo/controller/NandExporter.h"
+#include "NANDInfo/controller/Controller.h"
+#include "NANDInfo/controller/TunnelCommand.h"
 #include "NANDInfo/lists/FactoryDefectList.h"
 #include "NANDInfo/lists/StructuredLogState.h"
 #include "NANDInfo/lists/TelemetryList.h"
 #include "NANDInfo/lists/WriteAmplification.h"
-#include "NANDInfo/sets/NANDInfo.h"
-#include "platform/Platform.h"
-#include "platform/RegistryObject.h"
+#include "NANDInfo/sets/StatisticsGathering.h"
+#include "common/LittleEndian.h"
 #include "telemetry/NANDLogWriter.h"
 
 namespace vesprun {
 namespace {
+
+// The size query of a request for a list is a word of flags, with the kind of the list in bits 2 to
+// 9.
+constexpr std::uint32_t kSizePhase = 1;
+constexpr std::uint32_t kCallersFlag = 2;
+constexpr unsigned kKindShift = 2;
 
 /// Takes a list as the controller gave it, the controller's properties and its class name. False
 /// when the list could not be handled.
@@ -89,46 +93,74 @@ void decideOnValidityList() {
   gNeedValidityList = isAboveWriteAmplificationThreshold(amplification.user) || forced;
 }
 
-bool logLists(const nand_exporter_t& exporter, RegistryHandle connection,
-              const PropertyValue& properties, bool callersFlag) {
-  const ControllerListReader reader(platform().deviceRegistry(), connection, exporter, callersFlag);
-  bool result = true;
-  int index = 0;
-  for (const HandlerEntry& entry : handlerList(exporter)) {
-    const TunnelSelector* selector = entry.getter();
-    if (selector == nullptr) {
-      result = false;
-    } else if (const TunnelBuffer list = reader.read(*selector, entry.kind, index)) {
-      result = entry.handler(list.bytes(list.size()), &properties, exporter.name) && result;
-    }
-    ++index;
+/// A list, in a buffer of the size that the controller stated first; what it did not deliver of it
+/// is zero. Without memory when there is none. `index` is the list's place in the log.
+TunnelBuffer fetchList(const Controller& controller, const TunnelSelector& selector,
+                       std::uint32_t flags, int index) {
+  DeviceRegistry& registry = platform().deviceRegistry();
+  const nand_exporter_t& exporter = controller.exporter();
+  TunnelRequest request{.opcode = selector.sizeOpcode, .sizeQuery = flags | kSizePhase};
+  std::array<std::uint8_t, 4> answer{};
+  std::uint64_t reportedLength = 0;
+  if (const RegistryResult error =
+          registry.DevRegConnectCallStructMethod(controller.connection(), exporter.tunnelSizeMethod,
+                                                 request.encode(), answer, reportedLength)) {
+    std::fprintf(stderr,
+                 "DevRegConnectCallStructMethod failed with status 0x%x on selector index %d\n",
+                 error, index);
+    return {};
   }
-  return result;
+  const auto size = loadLittleEndian<std::uint32_t>(answer.data());
+  if (size == 0) {
+    return {};
+  }
+  // Need not be aligned to a page: the driver copies into it.
+  TunnelBuffer list(size);
+  if (!list) {
+    std::fprintf(stderr, "Could not malloc %zu bytes", std::size_t{size});
+    return {};
+  }
+  request.opcode = selector.dataOpcode;
+  request.sizeQuery = flags;
+  if (registry.DevRegConnectCallStructMethod(controller.connection(), exporter.tunnelDataMethod,
+                                             request.encode(), list.bytes(),
+                                             reportedLength) != kRegistrySuccess) {
+    std::fprintf(stderr, "Could not retrieve data from driver for selector %u\n",
+                 selector.dataOpcode);
+    return {};
+  }
+  return list;
 }
 
 }  // namespace
 
 bool DumpStorageStructuredLog(bool callersFlag) {
   decideOnValidityList();
-  nand_exporter_t* exporter = nullptr;
-  const RegistryObject service(findNandExporter(exporter));
-  if (!service) {
-    std::fputs("Could not get matching DevRegKit service for exporting classes\n", stderr);
+  Controller controller;
+  if (!controller.open()) {
     return false;
   }
-  const ControllerConnection connection(service.get());
-  if (!connection) {
-    std::fputs("Could not get connection to service\n", stderr);
-    return false;
-  }
+  const nand_exporter_t& exporter = controller.exporter();
   const std::optional<PropertyValue> properties =
       platform().deviceRegistry().DevRegRegistryEntrySearchProperty(
-          service.get(), exporter->propertyKey, DeviceRegistry::SearchDirection::Parents);
+          controller.service(), exporter.propertyKey, DeviceRegistry::SearchDirection::Parents);
   if (!properties) {
     std::fputs("failed to create dictionary", stderr);
     return false;
   }
-  return logLists(*exporter, connection.get(), *properties, callersFlag);
+  bool result = true;
+  int index = 0;
+  for (const HandlerEntry& entry : handlerList(exporter)) {
+    const TunnelSelector* selector = entry.getter();
+    const std::uint32_t flags = (callersFlag ? kCallersFlag : 0) | entry.kind << kKindShift;
+    if (selector == nullptr) {
+      result = false;
+    } else if (const TunnelBuffer list = fetchList(controller, *selector, flags, index)) {
+      result = entry.handler(list.bytes(list.size()), &*properties, exporter.name) && result;
+    }
+    ++index;
+  }
+  return result;
 }
 
 }  // namespace vesprun

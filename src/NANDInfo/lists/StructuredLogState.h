@@ -1,16 +1,11 @@
 #pragma once
 
-#include <cstdint>
+#include "NANDInfo/StructuredLogState.h"
 
 namespace vesprun {
 
-// What one structured storage log tells its list handlers. Written by `DumpStorageStructuredLog`,
-// but for the first, which its caller may set.
-
-extern std::uint8_t gForceCollectionSet;  ///< not 0: the validity list is always collected
-extern std::uint8_t gNeedValidityList;    ///< not 0: the validity list is wanted in this run
-extern double gCurrentUserWamp;  ///< write amplification of the user partition, a float's value
-extern double gCurrentSysWamp;   ///< and of the intermediate partition
+/// The type of the records that the handlers of telemetry and defect lists write.
+inline constexpr std::int32_t kListRecordType = 176;
 
 /// All four 0, as in a new process.
 void forgetStructuredLogState();

@@ -3,18 +3,19 @@
 #include <array>
 #include <cstddef>
 #include <cstdio>
+#include <memory>
+#include <new>
 #include <optional>
 #include <string>
 
 #include "NANDInfo/lists/HexText.h"
+#include "NANDInfo/lists/StructuredLogState.h"
 #include "NANDInfo/parsers/VendorCounterParsers.h"
-#include "common/LittleEndian.h"
+#include "platform/DictionaryHelpers.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
 namespace {
-
-constexpr std::int32_t kRecordType = 176;
 
 // For B buses: B counter regions, then B bus entries.
 constexpr std::size_t kWordSize = 4;
@@ -26,39 +27,30 @@ constexpr std::array<const char*, 7> kBusEntryKeys{"RD",  "PE",         "Max_PE_
                                                    "Ret", "block_type", "num_pages"};
 static_assert((kBusEntryKeys.size() + 1) * kWordSize == kBusEntrySize);
 
-/// Consecutive words of `NandChannelCounters` that are logged as NAME[0], NAME[1] and so on.
-struct CounterField {
-  const char* name;
-  std::size_t firstWord;
-  std::size_t count;
-};
-
 /// Everything that depends on the flash in use.
 struct CounterLayout {
   void (*parse)(CounterRegion, NandChannelCounters&);
-  std::size_t readStageCount;
-  std::size_t dspExceptionParameterCount;
-  std::optional<CounterField> extraBins;
+  std::size_t readStages = 23;
+  std::size_t dspParameters = 12;
+  CounterFieldId chipsOwnBins = CounterFieldId::NotUsed;
 
-  /// The logged fields, in order.
-  std::array<CounterField, 10> fields() const {
-    return {{{"readStage", 0, readStageCount},
-             {"initialReadStage", 33, 23},
-             {"nandStageOfLife", 56, 8},
-             {"dspExceptionParameter", 65, dspExceptionParameterCount},
-             {"readStage18NumOfErrorsBin", 103, 12},
-             {"readStage9NumOfErrorsBin", 115, 10},
-             {"readStage10NumOfErrorsBin", 125, 10},
-             {"readStage17NumOfErrorsBin", 135, 10},
-             {"readStage19NumOfErrorsBin", 145, 12},
-             extraBins.value_or(CounterField{"", 0, 0})}};
+  /// How many elements of a field are logged.
+  std::size_t count(CounterFieldId id) const {
+    switch (id) {
+      case CounterFieldId::ReadStage:
+        return readStages;
+      case CounterFieldId::DspExceptionParameter:
+        return dspParameters;
+      case CounterFieldId::NotUsed:
+        return 0;
+      case CounterFieldId::AlgoNANDAccessesBin:
+      case CounterFieldId::RetentionIndication:
+        return id == chipsOwnBins ? counterField(id).count : 0;
+      default:
+        return counterField(id).count;
+    }
   }
 };
-
-constexpr CounterField kAlgoNANDAccessesBin{"algoNANDAccessesBin", 157, 8};
-constexpr CounterField kRetentionIndication{"retentionIndication", 165, 12};
-static_assert(kRetentionIndication.firstWord + kRetentionIndication.count ==
-              kNandChannelCounterCount);
 
 struct Characteristics {
   CounterLayout layout;
@@ -79,59 +71,36 @@ CounterLayout vendorLayout(std::uint64_t manufacturer) {
   switch (manufacturer) {
     case 0x4582603A5700:
     case 0x458260DE5700:
-      return {parseCounters1xSandisk, 23, 12, std::nullopt};
+      return {parseCounters1xSandisk};
     case 0xAD8252232100:
-      return {parseCounters1xHynix, 23, 12, std::nullopt};
+      return {parseCounters1xHynix};
     default:
-      return {parseCounters1y, 23, 12, std::nullopt};
+      return {parseCounters1y};
   }
 }
 
 CounterLayout counterLayout(std::string_view chip, std::string_view manufacturer) {
   const std::uint64_t key = manufacturerKey(manufacturer);
   if (chip == "KX3") {
-    return {parseCountersAlgoGeneric, 23, 12, kAlgoNANDAccessesBin};
+    return {parseCountersAlgoGeneric, 23, 12, CounterFieldId::AlgoNANDAccessesBin};
   }
   if (chip == "KX4") {
-    return {parseCountersAlgoGenericKX4, 33, 38, kRetentionIndication};
+    return {parseCountersAlgoGenericKX4, 33, 38, CounterFieldId::RetentionIndication};
   }
   return vendorLayout(key);
 }
 
-/// Null, with a line on the standard error stream, when there is no usable chip identifier.
-const std::string* readChipIdentifier(const PropertyDict& characteristics) {
-  constexpr int kCapacity = 64;  // with a final NUL
-  const char* key = "chip-id";
+/// Null, with a line on the standard error stream, which says `ifNoText` when it is no text, when
+/// the characteristic is missing or unusable.
+const std::string* readText(const PropertyDict& characteristics, const char* key,
+                            const char* ifNoText) {
   const PropertyValue* value = characteristics.find(key);
   if (value == nullptr) {
     std::fprintf(stderr, "ERROR: Could not determine the %s\n", key);
     return nullptr;
   }
   if (value->string() == nullptr) {
-    std::fprintf(stderr, "ERROR: %s is not stored as a PVStringTypeID\n", key);
-    return nullptr;
-  }
-  if (value->string()->size() >= kCapacity) {
-    std::fprintf(stderr,
-                 "ERROR: Unable to obtain %s as conversion from the UniChar contents of PVString "
-                 "failed, or the buffer of %d bytes is too small\n",
-                 key, kCapacity);
-    return nullptr;
-  }
-  return value->string();
-}
-
-/// Null, with a line on the standard error stream, when there is no usable manufacturer identifier.
-const std::string* readManufacturerIdentifier(const PropertyDict& characteristics) {
-  const char* key = "manufacturer-id";
-  const PropertyValue* value = characteristics.find(key);
-  if (value == nullptr) {
-    std::fprintf(stderr, "ERROR: Could not determine the %s\n", key);
-    return nullptr;
-  }
-  if (value->string() == nullptr) {
-    std::fprintf(stderr, "ERROR: %s is NULL\n", key);
-    return nullptr;
+    std::fprintf(stderr, "ERROR: %s %s\n", key, ifNoText);
   }
   return value->string();
 }
@@ -142,11 +111,21 @@ std::optional<Characteristics> readCharacteristics(const PropertyValue* properti
     std::fputs("ERROR: Could not parse the Device Characteristics dictionary\n", stderr);
     return std::nullopt;
   }
-  const std::string* chip = readChipIdentifier(*characteristics);
+  constexpr const char* kChipKey = "chip-id";
+  constexpr int kChipCapacity = 64;  // with a final NUL
+  const std::string* chip =
+      readText(*characteristics, kChipKey, "is not stored as a PVStringTypeID");
   if (chip == nullptr) {
     return std::nullopt;
   }
-  const std::string* manufacturer = readManufacturerIdentifier(*characteristics);
+  if (chip->size() >= kChipCapacity) {
+    std::fprintf(stderr,
+                 "ERROR: Unable to obtain %s as conversion from the UniChar contents of PVString "
+                 "failed, or the buffer of %d bytes is too small\n",
+                 kChipKey, kChipCapacity);
+    return std::nullopt;
+  }
+  const std::string* manufacturer = readText(*characteristics, "manufacturer-id", "is NULL");
   if (manufacturer == nullptr) {
     return std::nullopt;
   }
@@ -165,13 +144,13 @@ PropertyDict busRecord(const std::uint8_t* busEntry, const NandChannelCounters& 
   PropertyDict record;
   record.reserve(kMostEntries);
   for (std::size_t i = 0; i < kBusEntryKeys.size(); ++i) {
-    const auto word = loadLittleEndian<std::uint32_t>(busEntry + i * kWordSize);
-    record.set(kBusEntryKeys[i], static_cast<std::int32_t>(word));
+    setNumberValueForType(record, kBusEntryKeys[i], busEntry + i * kWordSize, PVNumberType::Int);
   }
-  for (const CounterField& field : layout.fields()) {
-    for (std::size_t i = 0; i < field.count; ++i) {
-      record.set(field.name + ('[' + std::to_string(i) + ']'),
-                 static_cast<std::int32_t>(counters[field.firstWord + i]));
+  for (const CounterField& field : kCounterFields) {
+    const auto id = static_cast<CounterFieldId>(&field - kCounterFields);
+    for (std::size_t i = 0; i < layout.count(id); ++i) {
+      setNumberValueForType(record, std::string(field.name) + '[' + std::to_string(i) + ']',
+                            &counters[field.first + i], PVNumberType::Int);
     }
   }
   return record;
@@ -181,6 +160,12 @@ PropertyDict busRecord(const std::uint8_t* busEntry, const NandChannelCounters& 
 
 bool LogNANDTelemetryList(std::span<const std::uint8_t> buffer,
                           const PropertyValue* characteristics, std::string_view /*className*/) {
+  // One for all buses: a layout writes the same words each time.
+  const std::unique_ptr<NandChannelCounters> counters(new (std::nothrow) NandChannelCounters());
+  if (!counters) {
+    std::fprintf(stderr, "ERROR: Could not malloc %zu bytes\n", sizeof *counters);
+    return false;
+  }
   const std::optional<Characteristics> read = readCharacteristics(characteristics);
   if (!read) {
     return false;
@@ -195,11 +180,10 @@ bool LogNANDTelemetryList(std::span<const std::uint8_t> buffer,
   }
   const std::uint8_t* busEntries = buffer.data() + busCount * kCounterRegionSize;
   for (std::size_t bus = 0; bus < busCount; ++bus) {
-    NandChannelCounters counters{};
     const auto region = buffer.subspan(bus * kCounterRegionSize).first<kCounterRegionSize>();
-    read->layout.parse(region, counters);
+    read->layout.parse(region, *counters);
     platform().logsmith().FLLogStructuredData(
-        kRecordType, busRecord(busEntries + bus * kBusEntrySize, counters, read->layout));
+        kListRecordType, busRecord(busEntries + bus * kBusEntrySize, *counters, read->layout));
   }
   return true;
 }

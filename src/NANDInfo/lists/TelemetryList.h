@@ -17,7 +17,8 @@ namespace vesprun {
 /// to log. `className` is not used.
 ///
 /// False, with a line on the standard error stream and nothing logged, when a characteristic is
-/// missing or unusable or when the buffer does not hold all buses.
+/// missing or unusable, when the buffer does not hold all buses, or when there is no memory for
+/// the counters.
 bool LogNANDTelemetryList(std::span<const std::uint8_t> buffer,
                           const PropertyValue* characteristics, std::string_view className);
 

@@ -9,7 +9,7 @@ namespace vesprun {
 /// is infinite, or NaN when nothing was erased either.
 struct WriteAmplification {
   float user = 0.0F;
-  float intermediate = 0.0F;  ///< 0 when the statistics do not tell
+  float intermediate = 0.0F;  ///< 0 when not known
 };
 
 WriteAmplification writeAmplification(const ORUStatsContext& statistics);

@@ -3,6 +3,7 @@
 #include <array>
 #include <cstdarg>
 #include <cstdio>
+#include <new>
 #include <optional>
 
 namespace vesprun {
@@ -12,7 +13,7 @@ std::optional<std::array<char, 1024>> GlobalAPIErrorMessage;
 
 }  // namespace
 
-void SetAPIErrorMessage(const char* format, ...) {
+void SetAPIErrorMessage(const char* format, ...) noexcept {
   if (GlobalAPIErrorMessage) {
     return;
   }
@@ -23,8 +24,12 @@ void SetAPIErrorMessage(const char* format, ...) {
   va_end(arguments);
 }
 
-std::string GetAPIErrorMessage() {
-  return GlobalAPIErrorMessage ? GlobalAPIErrorMessage->data() : "NA";
+std::string GetAPIErrorMessage() noexcept {
+  try {
+    return GlobalAPIErrorMessage ? GlobalAPIErrorMessage->data() : "NA";
+  } catch (const std::bad_alloc&) {
+    return {};
+  }
 }
 
 void forgetAPIErrorMessage() { GlobalAPIErrorMessage.reset(); }

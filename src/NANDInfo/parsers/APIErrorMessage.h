@@ -2,7 +2,7 @@
 
 #include <string_view>
 
-#include "vesprun.h"
+#include "NANDInfo/APIErrorMessage.h"
 
 namespace vesprun {
 
@@ -14,7 +14,7 @@ inline constexpr std::string_view kNANDInfoErrorMessageKey = "com.quill.NANDInfo
 /// Records the first error text of the process, formatted in the manner of printf and cut to 1023
 /// bytes. By convention it begins with the name of the operation that failed. Once a text has been
 /// recorded, even an empty one, further calls do nothing and do not look at their arguments.
-[[gnu::format(printf, 1, 2)]] void SetAPIErrorMessage(const char* format, ...);
+[[gnu::format(printf, 1, 2)]] void SetAPIErrorMessage(const char* format, ...) noexcept;
 
 /// Makes the process as new: nothing recorded. For tests; the job itself never forgets.
 void forgetAPIErrorMessage();

@@ -1,6 +1,5 @@
 #pragma once
 
-#include <algorithm>
 #include <concepts>
 #include <cstddef>
 #include <cstdint>
@@ -17,8 +16,6 @@ namespace vesprun {
 /// Names may repeat; nothing is looked up while fields are appended.
 ///
 /// All names lie one behind the other in one text, so that a field costs no allocation of its own.
-/// Running out of memory is the one failure that no result tells of: std::bad_alloc goes on to the
-/// caller.
 class GenericParserCxt {
  public:
   static constexpr std::size_t kMaxNameLength = 98;  ///< longer names are cut
@@ -69,30 +66,36 @@ class GenericParserCxt {
   const_iterator begin() const { return {*this, 0}; }
   const_iterator end() const { return {*this, size()}; }
 
-  /// Appends a field; `name` is cut to `kMaxNameLength`.
-  void append(std::string_view name, std::uint64_t value) {
-    _names.append(name.substr(0, kMaxNameLength));
-    _entries.push_back({_names.size(), value});
+  /// Appends a field named `prefix` and then `suffix`, cut to `kMaxNameLength` together. False, and
+  /// the context is as it was, when memory runs out.
+  bool append(std::string_view prefix, std::string_view suffix, std::uint64_t value) noexcept;
+  bool append(std::string_view name, std::uint64_t value) noexcept {
+    return append({}, name, value);
   }
-  /// Appends `count` fields, each named `name` and its index in decimal, from 0, cut together: the
-  /// little-endian values of `width` bytes, 1 to 8, that lie end to end at `source`.
-  void appendArray(std::string_view name, const std::uint8_t* source, std::size_t width,
-                   std::size_t count);
+  /// Appends `count` fields, each named `name` and its index in decimal, from 0: the little-endian
+  /// values of `width` bytes, 1 to 8, that lie end to end at `source`. False when memory ran out
+  /// for some of them, which are missing.
+  bool appendArray(std::string_view name, const std::uint8_t* source, std::size_t width,
+                   std::size_t count) noexcept;
   /// Empties the context and gives its memory back.
   void release() { *this = GenericParserCxt(); }
 
  private:
   struct Entry {
-    std::size_t nameEnd;  ///< in `_names`; the name begins where the one before it ends
-    std::uint64_t value;
+    std::size_t nameEnd = 0;  ///< in `_names`; the name begins where the one before it ends
+    std::uint64_t value = 0;
   };
+
+  /// May leave a part of the array when it throws.
+  void appendAtOnce(std::string_view name, const std::uint8_t* source, std::size_t width,
+                    std::size_t count);
 
   std::string _names;
   std::vector<Entry> _entries;
 };
 
-/// Appends one field, named by `prefix` and then `suffix`, cut to 98 characters together. Always
-/// true.
+/// Appends one field, named by `prefix` and then `suffix`, cut to 98 characters together. False,
+/// and nothing is appended, when memory runs out.
 bool AddSingleValueToGenericContext(GenericParserCxt& ctx, std::string_view prefix,
                                     std::string_view suffix, std::uint64_t value);
 
@@ -106,7 +109,8 @@ inline constexpr std::uint32_t kMaxFieldsOfOneCall = 65'535;
 ///
 /// True, and nothing is appended, when `width` or `count` is 0. False, and nothing is appended,
 /// when `width` is above 8, or `count` above `kMaxFieldsOfOneCall`: such an array is refused as a
-/// whole, for a part of it would pass for all of it.
+/// whole, for a part of it would pass for all of it. False, too, when memory runs out for some
+/// elements, which are missing.
 bool AddMultipleFieldsToGenericContext(GenericParserCxt& ctx, std::string_view name,
                                        const std::uint8_t* source, std::uint32_t width,
                                        std::uint32_t count);

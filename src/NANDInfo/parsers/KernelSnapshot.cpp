@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cstddef>
+#include <new>
 #include <vector>
 
 #include "common/LittleEndian.h"
@@ -72,18 +73,8 @@ Items fromFirstContainer(Items items) {
   return item ? items : Items();
 }
 
-}  // namespace
-
-bool getIOStatsWithThreadnameFromSnapData(Items snapshot, const char* threadName,
-                                          std::optional<Items>& ioStatistics) {
-  return getIOStatsWithThreadnameFromSnapDataHelper(snapshot, threadName, ioStatistics, nullptr);
-}
-
-bool getIOStatsWithThreadnameFromSnapDataHelper(Items snapshot, const char* threadName,
-                                                std::optional<Items>& ioStatistics, Items* rest) {
-  if (threadName == nullptr) {
-    return false;
-  }
+bool findThread(Items snapshot, const char* threadName, std::optional<Items>& ioStatistics,
+                Items* rest) {
   Items items = fromFirstContainer(snapshot);
   if (items.empty()) {
     return false;
@@ -121,6 +112,22 @@ bool getIOStatsWithThreadnameFromSnapDataHelper(Items snapshot, const char* thre
     }
   } while (!open.empty());
   return false;
+}
+
+}  // namespace
+
+bool getIOStatsWithThreadnameFromSnapData(Items snapshot, const char* threadName,
+                                          std::optional<Items>& ioStatistics) {
+  return getIOStatsWithThreadnameFromSnapDataHelper(snapshot, threadName, ioStatistics, nullptr);
+}
+
+bool getIOStatsWithThreadnameFromSnapDataHelper(Items snapshot, const char* threadName,
+                                                std::optional<Items>& ioStatistics, Items* rest) {
+  try {
+    return threadName != nullptr && findThread(snapshot, threadName, ioStatistics, rest);
+  } catch (const std::bad_alloc&) {  // nests deeper than memory holds
+    return false;
+  }
 }
 
 }  // namespace vesprun

@@ -3,27 +3,63 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <string_view>
 
 namespace vesprun {
 
-inline constexpr std::size_t kNandChannelCounterCount = 177;
+/// Consecutive counters of one kind, reported as NAME[0], NAME[1] and so on.
+struct CounterField {
+  std::string_view name;  ///< empty: not reported
+  std::size_t first;      ///< word of `NandChannelCounters`
+  std::size_t count;
+};
 
-/// The counters of one NAND bus. What stands where:
-///
-/// | Words | Field |
-/// |---|---|
-/// | 0-32 | readStage[0-32] |
-/// | 33-55 | initialReadStage[0-22] |
-/// | 56-63 | nandStageOfLife[0-7] |
-/// | 64 | not used |
-/// | 65-102 | dspExceptionParameter[0-37] |
-/// | 103-114 | readStage18NumOfErrorsBin[0-11] |
-/// | 115-124 | readStage9NumOfErrorsBin[0-9] |
-/// | 125-134 | readStage10NumOfErrorsBin[0-9] |
-/// | 135-144 | readStage17NumOfErrorsBin[0-9] |
-/// | 145-156 | readStage19NumOfErrorsBin[0-11] |
-/// | 157-164 | algoNANDAccessesBin[0-7] |
-/// | 165-176 | retentionIndication[0-11] |
-using NandChannelCounters = std::array<std::uint32_t, kNandChannelCounterCount>;
+/// All words of `NandChannelCounters`, in order.
+inline constexpr CounterField kCounterFields[] = {
+    {"readStage", 0, 33},
+    {"initialReadStage", 33, 23},
+    {"nandStageOfLife", 56, 8},
+    {"", 64, 1},
+    {"dspExceptionParameter", 65, 38},
+    {"readStage18NumOfErrorsBin", 103, 12},
+    {"readStage9NumOfErrorsBin", 115, 10},
+    {"readStage10NumOfErrorsBin", 125, 10},
+    {"readStage17NumOfErrorsBin", 135, 10},
+    {"readStage19NumOfErrorsBin", 145, 12},
+    {"algoNANDAccessesBin", 157, 8},
+    {"retentionIndication", 165, 12},
+};
+
+/// The rows of `kCounterFields`.
+enum class CounterFieldId : std::uint8_t {
+  ReadStage,
+  InitialReadStage,
+  NandStageOfLife,
+  NotUsed,
+  DspExceptionParameter,
+  ReadStage18NumOfErrorsBin,
+  ReadStage9NumOfErrorsBin,
+  ReadStage10NumOfErrorsBin,
+  ReadStage17NumOfErrorsBin,
+  ReadStage19NumOfErrorsBin,
+  AlgoNANDAccessesBin,
+  RetentionIndication,
+};
+
+constexpr const CounterField& counterField(CounterFieldId id) {
+  return kCounterFields[static_cast<std::size_t>(id)];
+}
+
+/// The counters of one NAND bus.
+using NandChannelCounters = std::array<std::uint32_t, 177>;
+
+static_assert([] {
+  std::size_t words = 0;
+  for (const CounterField& field : kCounterFields) {
+    words += field.first == words ? field.count : NandChannelCounters().size() + 1;
+  }
+  return words == NandChannelCounters().size() &&
+         counterField(CounterFieldId::RetentionIndication).first == 165;
+}());
 
 }  // namespace vesprun

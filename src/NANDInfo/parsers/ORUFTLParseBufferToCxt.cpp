@@ -51,7 +51,10 @@ Taken takeArray(GenericParserCxt& ctx, const ORUStatKey& key, const StatisticsRe
                        key.name.data(), key.id, key.count, static_cast<int>(header.count));
   }
   const std::uint32_t count = std::min<std::uint32_t>(header.count, key.count);
-  if (!append(ctx, std::string(key.name) + '_', payload, count)) {
+  std::array<char, GenericParserCxt::kMaxNameLength> name;
+  const std::size_t length = key.name.copy(name.data(), name.size() - 1);
+  name[length] = '_';
+  if (!append(ctx, {name.data(), length + 1}, payload, count)) {
     SetAPIErrorMessage("ORUFTLParseBufferToCxt: %s(%d): Cannot add %d elements to context",
                        key.name.data(), key.id, key.count);
     return std::nullopt;

@@ -16,11 +16,10 @@ namespace vesprun {
 ///   another length than the array's is recorded as an error;
 /// - an unknown id, 900 say, as `Stat_900`, or as `Stat_900_0` and so on when there are several.
 ///
-/// A record without payload is only stepped over. The first header that is invalid (the id 0xFFFF,
-/// or one above 0x30000000, or more words than follow) quietly ends the walk, and so does, with an
-/// error, a record of an unknown id with more than 65,535 words, of which none is taken. What was
-/// taken before stays and counts; so 0 is all there is for failure. Errors are recorded as
-/// `SetAPIErrorMessage` does.
+/// A record without payload is skipped. The first invalid header (the id 0xFFFF, or one above
+/// 0x30000000, or more words than follow) quietly ends the walk. So does, as an error, an array for
+/// which memory runs out and a record of an unknown id with more than 65,535 words. What was taken
+/// before stays and counts. Errors are recorded as `SetAPIErrorMessage` does.
 std::uint32_t ORUFTLParseBufferToCxt(GenericParserCxt& ctx, std::span<const std::uint8_t> buffer);
 
 /// The same walk, naming every record by its id as if all were unknown.

@@ -1,5 +1,8 @@
 #include "NANDInfo/parsers/ORUMSPKeyTable.h"
 
+#include <algorithm>
+#include <functional>
+
 namespace vesprun {
 
 // clang-format off
@@ -145,17 +148,10 @@ constexpr std::array<std::size_t, kGroups> kKeysOfGroup = [] {
   return keys;
 }();
 
-constexpr bool kAscendingMSPKeys = [] {
-  for (std::size_t row = 1; row < ORUMSPKeyTable.size(); ++row) {
-    if (ORUMSPKeyTable[row - 1].key >= ORUMSPKeyTable[row].key) {
-      return false;
-    }
-  }
-  return true;
-}();
-
 static_assert(kKeysOfGroup == std::array<std::size_t, kGroups>{0, 138, 57, 34, 5});
-static_assert(kAscendingMSPKeys && ORUMSPKeyTable.size() < kNoMSPRow);
+static_assert(std::ranges::adjacent_find(ORUMSPKeyTable, std::ranges::greater_equal(),
+                                         &ORUMSPKey::key) == ORUMSPKeyTable.end());
+static_assert(ORUMSPKeyTable.size() < kNoMSPRow);
 
 }  // namespace
 

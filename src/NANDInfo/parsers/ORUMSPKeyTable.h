@@ -11,7 +11,7 @@ namespace vesprun {
 /// in the group.
 struct ORUMSPKey {
   std::uint16_t key;
-  std::string_view name;    ///< five names stand at two keys each
+  std::string_view name;    ///< five names have two keys each
   std::uint16_t count = 1;  ///< elements
 
   static constexpr std::uint32_t groupOf(std::uint16_t key) { return key >> 12; }

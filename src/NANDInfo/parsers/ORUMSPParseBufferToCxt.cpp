@@ -38,22 +38,21 @@ std::uint32_t ORUMSPParseBufferToCxt(GenericParserCxt& ctx, std::span<const std:
     return 0;
   }
   std::uint32_t total = 0;
-  std::span<const std::uint8_t> rest = buffer;
-  while (rest.size() >= MSPRecordHeader::kSize) {
-    const auto header = MSPRecordHeader::decodeFrom(rest.first<MSPRecordHeader::kSize>());
-    rest = rest.subspan(MSPRecordHeader::kSize);
+  MSPRecordReader reader(buffer);
+  while (reader.holdsHeader()) {
+    const MSPRecordHeader header = reader.readHeader();
     // Without payload, even the end marker ends nothing.
     if (header.length == 0) {
       continue;
     }
-    if (header.key == MSPRecordHeader::kEndMarker || header.length > rest.size()) {
+    if (header.key == MSPRecordHeader::kEndMarker || !reader.holds(header)) {
       break;
     }
+    const std::span<const std::uint8_t> payload = reader.read(header.length);
     const ORUMSPKey* key = findORUMSPKey(header.key);
-    if (key != nullptr && !take(ctx, *key, rest.first(header.length), total)) {
+    if (key != nullptr && !take(ctx, *key, payload, total)) {
       break;
     }
-    rest = rest.subspan(header.length);
   }
   return total;
 }

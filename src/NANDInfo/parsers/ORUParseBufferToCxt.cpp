@@ -1,6 +1,7 @@
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
 
 #include <algorithm>
+#include <array>
 
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
 #include "NANDInfo/parsers/StatisticsRecord.h"
@@ -10,66 +11,22 @@ namespace {
 
 constexpr std::uint32_t kReadCountHisto = 265;
 
-// Array headers without elements share the words behind them: a small buffer could make fields
-// without end. All keys there are make some 2,500.
-constexpr std::size_t kMostFields = 1'000'000;
+// A full record gives fewer fields than it has words. Arrays cut short share the words behind them,
+// so that a buffer of headers alone could give 256 fields for each word: 1,024 words may.
+constexpr std::size_t kMostSharedFields = 1024 * 256;
 
-void keepInSummary(ORUStatsContext& ctx, std::uint32_t id, std::uint64_t value) {
-  const auto lowBits = static_cast<std::uint32_t>(value);
-  switch (id) {
-    case 4:
-      ctx.hostWrites = value;
-      break;
-    case 7:
-      ctx.hostReads = value;
-      break;
-    case 12:
-      ctx.IND_pool_free = value;
-      break;
-    case 13:
-      ctx.IND_pool_count = value;
-      break;
-    case 17:
-      ctx.wearLevMoves = value;
-      break;
-    case 18:
-      ctx.nandWrites = value;
-      break;
-    case 19:
-      ctx.nandReads = value;
-      break;
-    case 20:
-      ctx.bandErases = value;
-      break;
-    case 28:
-      ctx.numSleepOps = value;
-      break;
-    case 45:
-      ctx.maxHighEnduranceBlockErases = value;
-      break;
-    case 48:
-      ctx.numFreeVirtualBlocks = value;
-      break;
-    case 49:
-      ctx.bytesPerPage = lowBits;
-      break;
-    case 50:
-      ctx.pagesPerVirtualBlock = lowBits;
-      break;
-    case 51:
-      ctx.blocksPerVirtualBlock = lowBits;
-      break;
-    case 52:
-      ctx.numVirtualBlocks = lowBits;
-      break;
-    case 53:
-      ctx.exportVersion = lowBits;
-      break;
-    case 56:
-      ctx.utilFormatTime = value;
-      break;
-    default:
-      break;
+/// By id, the summary field of the statistic; null when it has none.
+constexpr auto kSummaryFieldOfId = [] {
+  std::array<const ORUSummaryField*, 57> fields{};
+  for (const ORUSummaryField& field : kORUSummaryFields) {
+    fields[field.id] = &field;
+  }
+  return fields;
+}();
+
+void keepInSummary(ORUStatsContext& ctx, std::size_t id, std::uint64_t value) {
+  if (id < kSummaryFieldOfId.size() && kSummaryFieldOfId[id] != nullptr) {
+    kSummaryFieldOfId[id]->set(ctx, value);
   }
 }
 
@@ -100,7 +57,8 @@ bool ORUParseBufferToCxt(ORUStatsContext& ctx, std::span<const std::uint8_t> buf
   if (reader.remaining() == 0) {
     return false;
   }
-  const std::size_t mostFields = ctx.fields.size() + kMostFields;
+  const std::size_t mostFields =
+      ctx.fields.size() + std::max(reader.remaining(), kMostSharedFields);
   do {
     const StatisticsRecordHeader header = reader.readHeader();
     if (!reader.holds(header) || ctx.fields.size() > mostFields) {

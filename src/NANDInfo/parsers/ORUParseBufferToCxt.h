@@ -7,20 +7,19 @@
 
 namespace vesprun {
 
-/// Decodes the base statistics of the storage controller into `ctx`: appends the fields of every
-/// record of a known statistic, in buffer order, and keeps the values that the summary names. An
-/// array's fields are named by the statistic and an index from 0 (`ECBins0`). Unknown ids are
-/// stepped over. Fields that `ctx` holds already stay.
+/// Decodes the base statistics of the storage controller into `ctx`, behind the fields that it
+/// holds: the fields of every known statistic, in buffer order, and the values that the summary
+/// names. An array's fields are named by the statistic and an index from 0 (`ECBins0`). A field for
+/// which memory runs out is missing.
 ///
-/// True when the records fill the buffer's words exactly. False for a buffer of less than one word,
-/// and at the first header that is invalid or claims more words than follow, or after a
-/// million fields when more follow: then `exportVersion` is 0, and what was decoded before stays in
-/// `ctx`.
+/// True when the records fill the buffer's words exactly. False for a buffer of less than one word.
+/// False, with `exportVersion` 0 and what was decoded before in `ctx`, at the first header that is
+/// invalid or claims more words than follow, and when records that overlap have given more fields
+/// than the buffer has words, and more than 262,144.
 ///
-/// How many values a statistic has is fixed; what a record holds beyond them is stepped over. A
-/// record that holds fewer takes the missing ones from the words behind it, which are also read as
-/// the records they are. Values that would lie behind the end of the buffer are left out, from the
-/// fields and from the summary.
+/// The number of values is that of the statistic: words that a record holds beyond it are skipped,
+/// and missing ones are taken from the words behind the record, which are also read as the records
+/// they are. Values that would lie behind the buffer are left out.
 bool ORUParseBufferToCxt(ORUStatsContext& ctx, std::span<const std::uint8_t> buffer);
 
 }  // namespace vesprun

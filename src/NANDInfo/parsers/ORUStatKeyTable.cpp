@@ -1,5 +1,8 @@
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
 
+#include <algorithm>
+#include <functional>
+
 namespace vesprun {
 
 // clang-format off
@@ -274,36 +277,19 @@ constexpr std::array<std::uint16_t, kLargestKnownId + 1> kRowOfId = [] {
   return rows;
 }();
 
-struct Totals {
-  std::size_t singles = 0;
-  std::size_t arrays = 0;
-  std::size_t elementsOfArrays = 0;
-};
-
-constexpr Totals kTotals = [] {
-  Totals totals;
+constexpr std::size_t kArrays = std::ranges::count_if(ORUStatKeyTable, &ORUStatKey::isArray);
+constexpr std::size_t kElements = [] {
+  std::size_t elements = 0;
   for (const ORUStatKey& key : ORUStatKeyTable) {
-    if (key.isArray()) {
-      ++totals.arrays;
-      totals.elementsOfArrays += key.count;
-    } else {
-      ++totals.singles;
-    }
+    elements += key.count;
   }
-  return totals;
+  return elements;
 }();
 
-constexpr bool kAscending = [] {
-  for (std::size_t row = 1; row < ORUStatKeyTable.size(); ++row) {
-    if (ORUStatKeyTable[row - 1].id >= ORUStatKeyTable[row].id) {
-      return false;
-    }
-  }
-  return true;
-}();
-
-static_assert(kTotals.singles == 540 && kTotals.arrays == 117 && kTotals.elementsOfArrays == 1956);
-static_assert(kAscending && ORUStatKeyTable.back().id == kLargestKnownId);
+static_assert(kArrays == 117 && kElements == kORUStatKeyCount - kArrays + 1956);
+static_assert(std::ranges::adjacent_find(ORUStatKeyTable, std::ranges::greater_equal(),
+                                         &ORUStatKey::id) == ORUStatKeyTable.end());
+static_assert(ORUStatKeyTable.back().id == kLargestKnownId);
 
 }  // namespace
 

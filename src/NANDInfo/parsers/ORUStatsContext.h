@@ -33,6 +33,51 @@ struct ORUStatsContext {
   std::array<std::uint64_t, 5> readCountHisto{};
 };
 
+/// A summary field that keeps the value of one statistic, and is called as that one is.
+struct ORUSummaryField {
+  std::uint16_t id;
+  std::uint32_t ORUStatsContext::*narrow;  ///< null when the field is 64 bits wide
+  std::uint64_t ORUStatsContext::*wide;
+
+  constexpr ORUSummaryField(std::uint16_t statistic, std::uint32_t ORUStatsContext::*field)
+      : id(statistic), narrow(field), wide(nullptr) {}
+  constexpr ORUSummaryField(std::uint16_t statistic, std::uint64_t ORUStatsContext::*field)
+      : id(statistic), narrow(nullptr), wide(field) {}
+
+  std::uint64_t get(const ORUStatsContext& ctx) const {
+    return narrow != nullptr ? ctx.*narrow : ctx.*wide;
+  }
+  /// A narrow field takes the low 32 bits.
+  void set(ORUStatsContext& ctx, std::uint64_t value) const {
+    if (narrow != nullptr) {
+      ctx.*narrow = static_cast<std::uint32_t>(value);
+    } else {
+      ctx.*wide = value;
+    }
+  }
+};
+
+/// In the order of the context.
+inline constexpr ORUSummaryField kORUSummaryFields[] = {
+    {53, &ORUStatsContext::exportVersion},
+    {52, &ORUStatsContext::numVirtualBlocks},
+    {51, &ORUStatsContext::blocksPerVirtualBlock},
+    {50, &ORUStatsContext::pagesPerVirtualBlock},
+    {49, &ORUStatsContext::bytesPerPage},
+    {7, &ORUStatsContext::hostReads},
+    {4, &ORUStatsContext::hostWrites},
+    {48, &ORUStatsContext::numFreeVirtualBlocks},
+    {17, &ORUStatsContext::wearLevMoves},
+    {19, &ORUStatsContext::nandReads},
+    {18, &ORUStatsContext::nandWrites},
+    {20, &ORUStatsContext::bandErases},
+    {12, &ORUStatsContext::IND_pool_free},
+    {13, &ORUStatsContext::IND_pool_count},
+    {56, &ORUStatsContext::utilFormatTime},
+    {28, &ORUStatsContext::numSleepOps},
+    {45, &ORUStatsContext::maxHighEnduranceBlockErases},
+};
+
 /// Empties the field list and sets every summary field to 0.
 void ORUReleaseContext(ORUStatsContext& ctx);
 

@@ -1,177 +1,118 @@
 #include "NANDInfo/parsers/VendorCounterParsers.h"
 
-#include "common/LittleEndian.h"
+#include <algorithm>
+#include <cstring>
 
 namespace vesprun {
 namespace {
 
+using enum CounterFieldId;
+
 constexpr std::int16_t kSetToZero = -1;
 
-/// The words `first` to `last` of the record come from as many words of the region, from `source`
+/// The elements `first` to `last` of a field come from as many words of the region, from `source`
 /// on.
 struct CounterCopy {
-  std::int16_t first;
-  std::int16_t last;
+  CounterFieldId field;
+  std::uint8_t first;
+  std::uint8_t last;
   std::int16_t source;
+
+  constexpr std::size_t firstWord() const { return counterField(field).first + first; }
+  constexpr std::size_t count() const { return last - first + std::size_t{1}; }
 };
 
+// clang-format off
 constexpr CounterCopy kGeneric[] = {
-    {0, 18, 0},       // readStage[0-18]
-    {19, 19, 37},     // readStage[19]
-    {20, 21, 117},    // readStage[20-21]
-    {22, 22, 91},     // readStage[22]
-    {33, 40, 20},     // initialReadStage[0-7]
-    {41, 41, 19},     // initialReadStage[8]
-    {42, 42, 116},    // initialReadStage[9]
-    {43, 43, 90},     // initialReadStage[10]
-    {44, 44, 120},    // initialReadStage[11]
-    {45, 45, 119},    // initialReadStage[12]
-    {56, 63, 28},     // nandStageOfLife[0-7]
-    {65, 65, 104},    // dspExceptionParameter[0]
-    {66, 72, 38},     // dspExceptionParameter[1-7]
-    {73, 73, 89},     // dspExceptionParameter[8]
-    {74, 74, 105},    // dspExceptionParameter[9]
-    {75, 76, 114},    // dspExceptionParameter[10-11]
-    {103, 122, 45},   // readStage18NumOfErrorsBin[0-11], readStage9NumOfErrorsBin[0-7]
-    {125, 144, 67},   // readStage10NumOfErrorsBin[0-9], readStage17NumOfErrorsBin[0-9]
-    {145, 156, 92},   // readStage19NumOfErrorsBin[0-11]
-    {157, 164, 106},  // algoNANDAccessesBin[0-7]
+    {ReadStage, 0, 18, 0}, {ReadStage, 19, 19, 37}, {ReadStage, 20, 21, 117},
+    {ReadStage, 22, 22, 91}, {InitialReadStage, 0, 7, 20}, {InitialReadStage, 8, 8, 19},
+    {InitialReadStage, 9, 9, 116}, {InitialReadStage, 10, 10, 90}, {InitialReadStage, 11, 11, 120},
+    {InitialReadStage, 12, 12, 119}, {NandStageOfLife, 0, 7, 28},
+    {DspExceptionParameter, 0, 0, 104}, {DspExceptionParameter, 1, 7, 38},
+    {DspExceptionParameter, 8, 8, 89}, {DspExceptionParameter, 9, 9, 105},
+    {DspExceptionParameter, 10, 11, 114}, {ReadStage18NumOfErrorsBin, 0, 11, 45},
+    {ReadStage9NumOfErrorsBin, 0, 7, 57}, {ReadStage10NumOfErrorsBin, 0, 9, 67},
+    {ReadStage17NumOfErrorsBin, 0, 9, 77}, {ReadStage19NumOfErrorsBin, 0, 11, 92},
+    {AlgoNANDAccessesBin, 0, 7, 106},
 };
 
 constexpr CounterCopy kGenericKX4[] = {
-    {0, 7, 0},               // readStage[0-7]
-    {8, 8, kSetToZero},      // readStage[8]
-    {9, 18, 9},              // readStage[9-18]
-    {19, 19, 27},            // readStage[19]
-    {20, 21, 105},           // readStage[20-21]
-    {22, 22, 79},            // readStage[22]
-    {23, 24, kSetToZero},    // readStage[23-24]
-    {25, 28, 115},           // readStage[25-28]
-    {29, 29, 8},             // readStage[29]
-    {30, 31, 120},           // readStage[30-31]
-    {32, 32, 110},           // readStage[32]
-    {33, 40, kSetToZero},    // initialReadStage[0-7]
-    {41, 41, 19},            // initialReadStage[8]
-    {42, 42, 104},           // initialReadStage[9]
-    {43, 43, 78},            // initialReadStage[10]
-    {44, 44, 108},           // initialReadStage[11]
-    {45, 45, 107},           // initialReadStage[12]
-    {46, 46, 122},           // initialReadStage[13]
-    {56, 58, 20},            // nandStageOfLife[0-2]
-    {59, 59, kSetToZero},    // nandStageOfLife[3]
-    {60, 62, 23},            // nandStageOfLife[4-6]
-    {63, 63, kSetToZero},    // nandStageOfLife[7]
-    {65, 65, 92},            // dspExceptionParameter[0]
-    {66, 67, 28},            // dspExceptionParameter[1-2]
-    {68, 73, kSetToZero},    // dspExceptionParameter[3-8]
-    {74, 74, 93},            // dspExceptionParameter[9]
-    {75, 76, 102},           // dspExceptionParameter[10-11]
-    {77, 77, kSetToZero},    // dspExceptionParameter[12]
-    {78, 80, 30},            // dspExceptionParameter[13-15]
-    {81, 81, 77},            // dspExceptionParameter[16]
-    {82, 84, 112},           // dspExceptionParameter[17-19]
-    {85, 85, 126},           // dspExceptionParameter[20]
-    {86, 86, 123},           // dspExceptionParameter[21]
-    {87, 91, 94},            // dspExceptionParameter[22-26]
-    {92, 92, kSetToZero},    // dspExceptionParameter[27]
-    {93, 95, 99},            // dspExceptionParameter[28-30]
-    {96, 96, 109},           // dspExceptionParameter[31]
-    {97, 97, 111},           // dspExceptionParameter[32]
-    {98, 101, 45},           // dspExceptionParameter[33-36]
-    {102, 102, 26},          // dspExceptionParameter[37]
-    {103, 114, 33},          // readStage18NumOfErrorsBin[0-11]
-    {115, 122, kSetToZero},  // readStage9NumOfErrorsBin[0-7]
-    {125, 144, 55},          // readStage10NumOfErrorsBin[0-9], readStage17NumOfErrorsBin[0-9]
-    {145, 156, 80},          // readStage19NumOfErrorsBin[0-11]
-    {165, 166, kSetToZero},  // retentionIndication[0-1]
-    {167, 168, 75},          // retentionIndication[2-3]
-    {169, 176, kSetToZero},  // retentionIndication[4-11]
+    {ReadStage, 0, 7, 0}, {ReadStage, 8, 8, kSetToZero}, {ReadStage, 9, 18, 9},
+    {ReadStage, 19, 19, 27}, {ReadStage, 20, 21, 105}, {ReadStage, 22, 22, 79},
+    {ReadStage, 23, 24, kSetToZero}, {ReadStage, 25, 28, 115}, {ReadStage, 29, 29, 8},
+    {ReadStage, 30, 31, 120}, {ReadStage, 32, 32, 110}, {InitialReadStage, 0, 7, kSetToZero},
+    {InitialReadStage, 8, 8, 19}, {InitialReadStage, 9, 9, 104}, {InitialReadStage, 10, 10, 78},
+    {InitialReadStage, 11, 11, 108}, {InitialReadStage, 12, 12, 107},
+    {InitialReadStage, 13, 13, 122}, {NandStageOfLife, 0, 2, 20},
+    {NandStageOfLife, 3, 3, kSetToZero}, {NandStageOfLife, 4, 6, 23},
+    {NandStageOfLife, 7, 7, kSetToZero}, {DspExceptionParameter, 0, 0, 92},
+    {DspExceptionParameter, 1, 2, 28}, {DspExceptionParameter, 3, 8, kSetToZero},
+    {DspExceptionParameter, 9, 9, 93}, {DspExceptionParameter, 10, 11, 102},
+    {DspExceptionParameter, 12, 12, kSetToZero}, {DspExceptionParameter, 13, 15, 30},
+    {DspExceptionParameter, 16, 16, 77}, {DspExceptionParameter, 17, 19, 112},
+    {DspExceptionParameter, 20, 20, 126}, {DspExceptionParameter, 21, 21, 123},
+    {DspExceptionParameter, 22, 26, 94}, {DspExceptionParameter, 27, 27, kSetToZero},
+    {DspExceptionParameter, 28, 30, 99}, {DspExceptionParameter, 31, 31, 109},
+    {DspExceptionParameter, 32, 32, 111}, {DspExceptionParameter, 33, 36, 45},
+    {DspExceptionParameter, 37, 37, 26}, {ReadStage18NumOfErrorsBin, 0, 11, 33},
+    {ReadStage9NumOfErrorsBin, 0, 7, kSetToZero}, {ReadStage10NumOfErrorsBin, 0, 9, 55},
+    {ReadStage17NumOfErrorsBin, 0, 9, 65}, {ReadStage19NumOfErrorsBin, 0, 11, 80},
+    {RetentionIndication, 0, 1, kSetToZero}, {RetentionIndication, 2, 3, 75},
+    {RetentionIndication, 4, 11, kSetToZero},
 };
 
 constexpr CounterCopy k1y[] = {
-    {0, 7, 256},      // readStage[0-7]
-    {8, 8, 265},      // readStage[8]
-    {9, 18, 267},     // readStage[9-18]
-    {19, 19, 303},    // readStage[19]
-    {20, 21, 390},    // readStage[20-21]
-    {22, 22, 372},    // readStage[22]
-    {33, 40, 278},    // initialReadStage[0-7]
-    {41, 41, 277},    // initialReadStage[8]
-    {42, 42, 290},    // initialReadStage[9]
-    {43, 43, 371},    // initialReadStage[10]
-    {44, 44, 393},    // initialReadStage[11]
-    {45, 45, 392},    // initialReadStage[12]
-    {56, 63, 292},    // nandStageOfLife[0-7]
-    {65, 65, 21},     // dspExceptionParameter[0]
-    {66, 67, 305},    // dspExceptionParameter[1-2]
-    {68, 72, 313},    // dspExceptionParameter[3-7]
-    {73, 73, 370},    // dspExceptionParameter[8]
-    {74, 74, 15},     // dspExceptionParameter[9]
-    {75, 76, 531},    // dspExceptionParameter[10-11]
-    {103, 122, 318},  // readStage18NumOfErrorsBin[0-11], readStage9NumOfErrorsBin[0-7]
-    {125, 144, 338},  // readStage10NumOfErrorsBin[0-9], readStage17NumOfErrorsBin[0-9]
-    {145, 156, 373},  // readStage19NumOfErrorsBin[0-11]
+    {ReadStage, 0, 7, 256}, {ReadStage, 8, 8, 265}, {ReadStage, 9, 18, 267},
+    {ReadStage, 19, 19, 303}, {ReadStage, 20, 21, 390}, {ReadStage, 22, 22, 372},
+    {InitialReadStage, 0, 7, 278}, {InitialReadStage, 8, 8, 277}, {InitialReadStage, 9, 9, 290},
+    {InitialReadStage, 10, 10, 371}, {InitialReadStage, 11, 11, 393},
+    {InitialReadStage, 12, 12, 392}, {NandStageOfLife, 0, 7, 292},
+    {DspExceptionParameter, 0, 0, 21}, {DspExceptionParameter, 1, 2, 305},
+    {DspExceptionParameter, 3, 7, 313}, {DspExceptionParameter, 8, 8, 370},
+    {DspExceptionParameter, 9, 9, 15}, {DspExceptionParameter, 10, 11, 531},
+    {ReadStage18NumOfErrorsBin, 0, 11, 318}, {ReadStage9NumOfErrorsBin, 0, 7, 330},
+    {ReadStage10NumOfErrorsBin, 0, 9, 338}, {ReadStage17NumOfErrorsBin, 0, 9, 348},
+    {ReadStage19NumOfErrorsBin, 0, 11, 373},
 };
 
 constexpr CounterCopy k1xSandisk[] = {
-    {0, 5, 256},           // readStage[0-5]
-    {6, 7, kSetToZero},    // readStage[6-7]
-    {8, 8, 265},           // readStage[8]
-    {9, 15, 267},          // readStage[9-15]
-    {16, 16, kSetToZero},  // readStage[16]
-    {17, 18, 275},         // readStage[17-18]
-    {19, 19, 301},         // readStage[19]
-    {20, 22, kSetToZero},  // readStage[20-22]
-    {33, 38, 278},         // initialReadStage[0-5]
-    {39, 40, kSetToZero},  // initialReadStage[6-7]
-    {41, 41, 277},         // initialReadStage[8]
-    {42, 42, 288},         // initialReadStage[9]
-    {43, 45, kSetToZero},  // initialReadStage[10-12]
-    {56, 63, 290},         // nandStageOfLife[0-7]
-    {65, 65, 16},          // dspExceptionParameter[0]
-    {66, 67, 303},         // dspExceptionParameter[1-2]
-    {68, 72, 311},         // dspExceptionParameter[3-7]
-    {73, 73, kSetToZero},  // dspExceptionParameter[8]
-    {74, 74, 10},          // dspExceptionParameter[9]
-    {75, 76, kSetToZero},  // dspExceptionParameter[10-11]
+    {ReadStage, 0, 5, 256}, {ReadStage, 6, 7, kSetToZero}, {ReadStage, 8, 8, 265},
+    {ReadStage, 9, 15, 267}, {ReadStage, 16, 16, kSetToZero}, {ReadStage, 17, 18, 275},
+    {ReadStage, 19, 19, 301}, {ReadStage, 20, 22, kSetToZero}, {InitialReadStage, 0, 5, 278},
+    {InitialReadStage, 6, 7, kSetToZero}, {InitialReadStage, 8, 8, 277},
+    {InitialReadStage, 9, 9, 288}, {InitialReadStage, 10, 12, kSetToZero},
+    {NandStageOfLife, 0, 7, 290}, {DspExceptionParameter, 0, 0, 16},
+    {DspExceptionParameter, 1, 2, 303}, {DspExceptionParameter, 3, 7, 311},
+    {DspExceptionParameter, 8, 8, kSetToZero}, {DspExceptionParameter, 9, 9, 10},
+    {DspExceptionParameter, 10, 11, kSetToZero},
 };
 
 constexpr CounterCopy k1xHynix[] = {
-    {0, 3, 256},           // readStage[0-3]
-    {4, 7, kSetToZero},    // readStage[4-7]
-    {8, 8, 263},           // readStage[8]
-    {9, 15, 265},          // readStage[9-15]
-    {16, 16, kSetToZero},  // readStage[16]
-    {17, 18, 273},         // readStage[17-18]
-    {19, 19, 297},         // readStage[19]
-    {20, 22, kSetToZero},  // readStage[20-22]
-    {33, 36, 276},         // initialReadStage[0-3]
-    {37, 40, kSetToZero},  // initialReadStage[4-7]
-    {41, 41, 275},         // initialReadStage[8]
-    {42, 42, 284},         // initialReadStage[9]
-    {43, 45, kSetToZero},  // initialReadStage[10-12]
-    {56, 63, 286},         // nandStageOfLife[0-7]
-    {65, 65, 16},          // dspExceptionParameter[0]
-    {66, 67, 299},         // dspExceptionParameter[1-2]
-    {68, 72, 307},         // dspExceptionParameter[3-7]
-    {73, 73, kSetToZero},  // dspExceptionParameter[8]
-    {74, 74, 10},          // dspExceptionParameter[9]
-    {75, 76, kSetToZero},  // dspExceptionParameter[10-11]
+    {ReadStage, 0, 3, 256}, {ReadStage, 4, 7, kSetToZero}, {ReadStage, 8, 8, 263},
+    {ReadStage, 9, 15, 265}, {ReadStage, 16, 16, kSetToZero}, {ReadStage, 17, 18, 273},
+    {ReadStage, 19, 19, 297}, {ReadStage, 20, 22, kSetToZero}, {InitialReadStage, 0, 3, 276},
+    {InitialReadStage, 4, 7, kSetToZero}, {InitialReadStage, 8, 8, 275},
+    {InitialReadStage, 9, 9, 284}, {InitialReadStage, 10, 12, kSetToZero},
+    {NandStageOfLife, 0, 7, 286}, {DspExceptionParameter, 0, 0, 16},
+    {DspExceptionParameter, 1, 2, 299}, {DspExceptionParameter, 3, 7, 307},
+    {DspExceptionParameter, 8, 8, kSetToZero}, {DspExceptionParameter, 9, 9, 10},
+    {DspExceptionParameter, 10, 11, kSetToZero},
 };
+// clang-format on
 
-/// The number of words that a layout writes; 0 when it writes one twice, out of order, or one that
-/// there is not, or reads behind the region.
-constexpr int wordsOf(std::span<const CounterCopy> layout) {
-  int words = 0;
-  int previous = -1;
+/// The number of words that a layout writes; 0 when it writes one twice or out of order, leaves a
+/// field, or reads behind the region.
+constexpr std::size_t wordsOf(std::span<const CounterCopy> layout) {
+  std::size_t words = 0;
+  std::size_t end = 0;
   for (const CounterCopy& copy : layout) {
-    const int count = copy.last - copy.first + 1;
-    if (copy.first <= previous || count < 1 || copy.last >= int{kNandChannelCounterCount} ||
-        copy.source < kSetToZero || copy.source + count > int{kCounterRegionWords}) {
+    if (copy.firstWord() < end || copy.first > copy.last ||
+        copy.last >= counterField(copy.field).count || copy.source < kSetToZero ||
+        static_cast<std::size_t>(copy.source + 1) + copy.count() - 1 > kCounterRegionWords) {
       return 0;
     }
-    words += count;
-    previous = copy.last;
+    words += copy.count();
+    end = copy.firstWord() + copy.count();
   }
   return words;
 }
@@ -184,13 +125,14 @@ static_assert(wordsOf(k1xHynix) == 56);
 
 void copyCounters(std::span<const CounterCopy> layout, CounterRegion region,
                   NandChannelCounters& out) {
+  constexpr std::size_t kWordSize = sizeof(std::uint32_t);
   for (const CounterCopy& copy : layout) {
-    for (int word = copy.first; word <= copy.last; ++word) {
-      const auto source = static_cast<std::size_t>(copy.source + word - copy.first);
-      out[static_cast<std::size_t>(word)] =
-          copy.source == kSetToZero
-              ? 0
-              : loadLittleEndian<std::uint32_t>(region.data() + source * sizeof(std::uint32_t));
+    const auto words = std::span(out).subspan(copy.firstWord(), copy.count());
+    if (copy.source == kSetToZero) {
+      std::ranges::fill(words, 0);
+    } else {
+      std::memcpy(words.data(), region.data() + static_cast<std::size_t>(copy.source) * kWordSize,
+                  words.size_bytes());
     }
   }
 }

@@ -1,10 +1,41 @@
 #include "NANDInfo/sets/FilteredDict.h"
 
 #include <algorithm>
-
-#include "NANDInfo/sets/SignificantDigits.h"
+#include <array>
+#include <cmath>
+#include <cstddef>
 
 namespace vesprun {
+namespace {
+
+constexpr std::array<std::uint64_t, 19> kPowersOfTen = [] {
+  std::array<std::uint64_t, 19> powers{};
+  std::uint64_t power = 1;
+  for (std::uint64_t& entry : powers) {
+    entry = power;
+    power *= 10;
+  }
+  return powers;
+}();
+
+}  // namespace
+
+std::uint64_t roundSig(std::uint64_t x, std::uint64_t sig) {
+  if (x == 0) {
+    return 0;
+  }
+  const auto digits = static_cast<std::uint64_t>(std::log10(static_cast<double>(x))) + 1;
+  if (digits <= sig) {
+    return x;
+  }
+  const std::uint64_t cut = digits - sig;
+  if (cut >= kPowersOfTen.size()) {
+    return 0;
+  }
+  const std::uint64_t power = kPowersOfTen[static_cast<std::size_t>(cut)];
+  const std::uint64_t remainder = x % power;
+  return (x / power + (remainder >= power / 2 ? 1 : 0)) * power;
+}
 
 PropertyDict CreateFilteredDict(const PropertyDict& source, const FieldTable* keys) {
   return CreateFilteredDict_SigDig(source, keys, false);

@@ -7,10 +7,10 @@
 #include <string>
 #include <string_view>
 
+#include "NANDInfo/controller/EntryPoint.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
-#include "NANDInfo/sets/FieldNumber.h"
 #include "NANDInfo/sets/FilteredDict.h"
-#include "NANDInfo/sets/NANDInfo.h"
+#include "NANDInfo/sets/StatisticsGathering.h"
 
 namespace vesprun {
 namespace {
@@ -25,25 +25,22 @@ constexpr const char* kIsNANDRetirable = "com.quill.NANDInfo.Health.IsNANDRetira
 
 constexpr unsigned kE2EErrorCounters = 12;
 
-constexpr auto kTendmarkRanges = std::to_array<FieldRange>(
+constexpr auto kTendmarkKeys = std::to_array<FieldRange>(
     {kMaxPercentageNANDUsed, kHostReadErrors, kMaxE2EErrors, kNumGrownBadBlocks, kNumDieFailures});
-constexpr FieldIndex kTendmarkIndex(kTendmarkRanges);
-constinit const FieldTable kTendmarkFields(kTendmarkRanges, kTendmarkIndex);
+constinit const FieldTable kTendmarkFields = fieldTable<kTendmarkKeys, 5>();
 
-constexpr auto kOTARanges = std::to_array<FieldRange>(
+constexpr auto kOTAKeys = std::to_array<FieldRange>(
     {kMaxPercentageNANDUsed, kHostReadErrors, kMaxE2EErrors, kNumGrownBadBlocks});
-constexpr FieldIndex kOTAIndex(kOTARanges);
-constinit const FieldTable kOTAFields(kOTARanges, kOTAIndex);
+constinit const FieldTable kOTAFields = fieldTable<kOTAKeys, 4>();
 
-constexpr auto kInternalLabRanges =
+constexpr auto kInternalLabKeys =
     std::to_array<FieldRange>({kMaxPercentageNANDUsed, kHostReadErrors, kMaxE2EErrors,
                                kSpareAvailablePercent, kNumGrownBadBlocks});
-constexpr FieldIndex kInternalLabIndex(kInternalLabRanges);
-constinit const FieldTable kInternalLabFields(kInternalLabRanges, kInternalLabIndex);
+constinit const FieldTable kInternalLabFields = fieldTable<kInternalLabKeys, 5>();
 
 /// The number as a signed 32-bit one, but at least 0, which it also is when missing.
 std::int32_t atLeastZero(const PropertyDict& fields, std::string_view name) {
-  const Number* number = numberUnder(fields, name);
+  const Number* number = fields.findNumber(name);
   return number != nullptr ? std::max(number->asInt32(), 0) : 0;
 }
 
@@ -61,22 +58,22 @@ std::int32_t maxE2EErrors(const PropertyDict& ftl) {
 }
 
 std::int64_t hostReadErrors(const PropertyDict& ftl) {
-  const Number* isQNS1 = numberUnder(ftl, "com.quill.NANDInfo.IsQNS1Controller");
+  const Number* isQNS1 = ftl.findNumber("com.quill.NANDInfo.IsQNS1Controller");
   if (isQNS1 == nullptr) {
     return 0;
   }
-  const Number* errors = numberUnder(ftl, isQNS1->asInt64() != 0 ? "ueccReads" : "raidSmartErrors");
+  const Number* errors = ftl.findNumber(isQNS1->asInt64() != 0 ? "ueccReads" : "raidSmartErrors");
   return errors != nullptr ? std::max<std::int64_t>(errors->asInt64(), 0) : 0;
 }
 
 std::int64_t numberOrMinusOne(const PropertyDict& fields, std::string_view name) {
-  const Number* number = numberUnder(fields, name);
+  const Number* number = fields.findNumber(name);
   return number != nullptr ? number->asInt64() : -1;
 }
 
 bool isRetirable(const PropertyDict& health) {
-  const Number* spare = numberUnder(health, kSpareAvailablePercent);
-  const Number* used = numberUnder(health, kMaxPercentageNANDUsed);
+  const Number* spare = health.findNumber(kSpareAvailablePercent);
+  const Number* used = health.findNumber(kMaxPercentageNANDUsed);
   return spare != nullptr && used != nullptr && spare->asInt64() >= 0 && used->asInt64() >= 0 &&
          (spare->asInt64() < 100 || used->asInt64() >= 100);
 }
@@ -97,19 +94,26 @@ PropertyDict gatherNANDHealthInfo() {
           {kNumDieFailures, numberOrMinusOne(*ftl, "numDieFailures")}};
 }
 
-PropertyDict CopyTendmarkNANDInfo() {
-  PropertyDict set = CreateFilteredDict(gatherNANDHealthInfo(), &kTendmarkFields);
-  set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
-  return set;
+PropertyDict CopyTendmarkNANDInfo() noexcept {
+  return runEntryPoint(__func__, [&] {
+    PropertyDict set = CreateFilteredDict(gatherNANDHealthInfo(), &kTendmarkFields);
+    set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
+    return set;
+  });
 }
 
-PropertyDict CopyOTANANDInfo() { return CreateFilteredDict(gatherNANDHealthInfo(), &kOTAFields); }
+PropertyDict CopyOTANANDInfo() noexcept {
+  return runEntryPoint(__func__,
+                       [&] { return CreateFilteredDict(gatherNANDHealthInfo(), &kOTAFields); });
+}
 
-PropertyDict CopyInternalLabNANDInfo() {
-  PropertyDict set = CreateFilteredDict(gatherNANDHealthInfo(), &kInternalLabFields);
-  set.set(kIsNANDRetirable, std::int32_t{isRetirable(set)});
-  set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
-  return set;
+PropertyDict CopyInternalLabNANDInfo() noexcept {
+  return runEntryPoint(__func__, [&] {
+    PropertyDict set = CreateFilteredDict(gatherNANDHealthInfo(), &kInternalLabFields);
+    set.set(kIsNANDRetirable, std::int32_t{isRetirable(set)});
+    set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
+    return set;
+  });
 }
 
 }  // namespace vesprun

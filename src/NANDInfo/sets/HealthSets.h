@@ -1,6 +1,6 @@
 #pragma once
 
-#include "vesprun.h"
+#include "NANDInfo/HealthSets.h"
 
 namespace vesprun {
 

@@ -1,19 +1,17 @@
-// The legacy NAND info dictionary, from the base statistics.
+#include "NANDInfo/sets/NANDInfoDict.h"
 
 #include <algorithm>
 #include <iterator>
 #include <string_view>
 
-#include "NANDInfo/parsers/ORUStatsContext.h"
-#include "NANDInfo/sets/NANDInfo.h"
-#include "NANDInfo/sets/SignificantDigits.h"
+#include "NANDInfo/sets/FilteredDict.h"
+#include "NANDInfo/sets/StorageHealthFields.h"
 #include "NANDInfo/tables/LegacyKeyMap.h"
-#include "platform/Platform.h"
 
 namespace vesprun {
 namespace {
 
-/// Figures that come from several fields, in none of which they stand by themselves.
+/// Figures that are made from several fields.
 struct DerivedFigures {
   static constexpr std::uint64_t kNotSeen = 0xFFFFFFFF;
 
@@ -77,20 +75,6 @@ bool isRounded(std::string_view name) {
   return name == "maxMemLowDuration" || name == "maxMemChokeDuration";
 }
 
-/// Whole weeks since 2000, in spite of the name that their key has.
-std::uint64_t formatWeeksSince2000(std::uint64_t secondsSince1970) {
-  constexpr std::uint64_t kStartOf2000 = 946684800;
-  constexpr std::uint64_t kSecondsPerWeek = 604800;
-  return secondsSince1970 < kStartOf2000 ? 0 : (secondsSince1970 - kStartOf2000) / kSecondsPerWeek;
-}
-
-std::uint64_t demoMode() {
-  bool found = false;
-  const bool demo = platform().preferences().LGSPreferencesGetBoolValue(
-      "StoreDemoMode", "com.quill.demo-settings", found);
-  return found && demo ? 1 : 0;
-}
-
 }  // namespace
 
 PropertyDict CreateNANDInfoDict(const ORUStatsContext& context, bool omitVersionFields) {
@@ -98,7 +82,7 @@ PropertyDict CreateNANDInfoDict(const ORUStatsContext& context, bool omitVersion
   if (!omitVersionFields) {
     info.set("com.quill.NANDInfo.ExportVersion", context.exportVersion);
     info.set("com.quill.NANDInfo.DriverVersion", context.driverVersion);
-    info.set("com.quill.NANDInfo.DemoMode", demoMode());
+    info.set("com.quill.NANDInfo.DemoMode", std::uint64_t{isInStoreDemoMode()});
   }
   info.set("com.quill.NANDInfo.NumVirtualBlocks", context.numVirtualBlocks);
   info.set("com.quill.NANDInfo.PagesPerVirtualBlock", context.pagesPerVirtualBlock);
@@ -112,7 +96,8 @@ PropertyDict CreateNANDInfoDict(const ORUStatsContext& context, bool omitVersion
   info.set("com.quill.NANDInfo.NumPhysicalErases", context.bandErases);
   info.set("com.quill.NANDInfo.NodesFree", context.IND_pool_free);
   info.set("com.quill.NANDInfo.NodesTotal", context.IND_pool_count);
-  info.set("com.quill.NANDInfo.formatDaysSince2000", formatWeeksSince2000(context.utilFormatTime));
+  // Weeks, in spite of the name that the key has.
+  info.set("com.quill.NANDInfo.formatDaysSince2000", weeksSince2000(context.utilFormatTime));
   info.set("com.quill.NANDInfo.NumSleepOps", context.numSleepOps);
   info.set("com.quill.NANDInfo.HighEnduranceBlockEraseCount", context.maxHighEnduranceBlockErases);
   info.set("com.quill.NANDInfo.BlocksPerVirtualBlock", context.blocksPerVirtualBlock);

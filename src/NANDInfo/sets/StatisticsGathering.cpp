@@ -1,19 +1,15 @@
-// Fetches the controller's statistics buffers and has them parsed.
+#include "NANDInfo/sets/StatisticsGathering.h"
 
-#include <cstdio>
 #include <cstring>
 #include <memory>
 #include <new>
 #include <string>
 
-#include "NANDInfo/controller/ControllerConnection.h"
+#include "NANDInfo/controller/Controller.h"
 #include "NANDInfo/controller/TunnelCommand.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/GenericParserCxt.h"
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
-#include "NANDInfo/sets/MagazineSnapshot.h"
-#include "NANDInfo/sets/NANDInfo.h"
-#include "platform/RegistryObject.h"
 
 namespace vesprun {
 namespace {
@@ -21,11 +17,7 @@ namespace {
 /// What `findNandExporterNew` opened, given back at the end.
 class OpenExporter {
  public:
-  OpenExporter() {
-    if (!findNandExporterNew(_exporter)) {
-      _exporter = nullptr;
-    }
-  }
+  OpenExporter() = default;
   OpenExporter(const OpenExporter&) = delete;
   OpenExporter& operator=(const OpenExporter&) = delete;
   ~OpenExporter() {
@@ -34,7 +26,8 @@ class OpenExporter {
     }
   }
 
-  explicit operator bool() const { return _exporter != nullptr; }
+  /// False when there is no controller that opens.
+  bool open() { return findNandExporterNew(_exporter); }
   const nand_exporter_t* operator->() const { return _exporter; }
   const nand_exporter_t& operator*() const { return *_exporter; }
 
@@ -76,8 +69,8 @@ std::uint32_t countMSPs(const nand_exporter_t& exporter) {
 
 std::optional<PropertyDict> gatherORUFTLData(bool useStatKeyParser, bool useStatsSelector,
                                              std::uint32_t argument) {
-  const OpenExporter exporter;
-  if (!exporter) {
+  OpenExporter exporter;
+  if (!exporter.open()) {
     SetAPIErrorMessage("gatherORUFTLData: Could not get nand_exporter_t");
     return std::nullopt;
   }
@@ -121,8 +114,8 @@ std::optional<PropertyDict> gatherORUFTLData(bool useStatKeyParser, bool useStat
 }
 
 std::optional<PropertyDict> gatherORUMSPData() {
-  const OpenExporter exporter;
-  if (!exporter) {
+  OpenExporter exporter;
+  if (!exporter.open()) {
     SetAPIErrorMessage("gatherORUMSPData: Could not get nand_exporter_t");
     return std::nullopt;
   }
@@ -162,21 +155,16 @@ std::optional<PropertyDict> gatherORUMSPData() {
 }
 
 bool GatherNANDStats(nand_exporter_t*& exporter, ORUStatsContext& context) {
-  const RegistryObject service(findNandExporter(exporter));
-  if (!service) {
-    std::fputs("Could not get matching DevRegKit service for exporting classes\n", stderr);
-    return false;
-  }
-  ControllerConnection connection(service.get());
-  if (!connection) {
-    std::fputs("Could not get connection to service\n", stderr);
+  Controller controller;
+  exporter = &controller.exporter();
+  if (!controller.open()) {
     return false;
   }
   Answer answer;
-  const bool parsed = fetch(connection.get(), *exporter, exporter->getStatsSelectors, 0, answer) &&
-                      exporter->parseStats != nullptr &&
-                      exporter->parseStats(context, answer.bytes());
-  return connection.close() && parsed;
+  const bool parsed =
+      fetch(controller.connection(), *exporter, exporter->getStatsSelectors, 0, answer) &&
+      exporter->parseStats != nullptr && exporter->parseStats(context, answer.bytes());
+  return controller.close() && parsed;
 }
 
 }  // namespace vesprun

@@ -1,43 +1,28 @@
 #include "NANDInfo/sets/StorageHealthFields.h"
 
 #include <algorithm>
-#include <cstdint>
 #include <optional>
 #include <string>
 #include <string_view>
 
+#include "NANDInfo/VMFreezer.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
-#include "NANDInfo/sets/FieldNumber.h"
-#include "NANDInfo/sets/NANDInfo.h"
+#include "NANDInfo/sets/StatisticsGathering.h"
 #include "NANDInfo/tables/FieldSets.h"
 #include "platform/Platform.h"
 #include "telemetry/DiskInfo.h"
-#include "vesprun.h"
 
 namespace vesprun {
 namespace {
 
-constexpr std::uint32_t kStartOf2000 = 946'684'800;
-constexpr std::uint32_t kSecondsPerWeek = 604'800;
 constexpr unsigned kMSPs = 8;
 constexpr unsigned kBackupBootBlocks = 3;
 
 constexpr std::string_view kCopiedFields[] = {"averageSLCPECycles", "averageTLCPECycles",
                                               "hostWrites", "powerOnHours", "powerOnSeconds"};
 
-const Number* numberUnder(const PropertyDict& fields, std::string_view stem, std::uint64_t index) {
-  return numberUnder(fields, std::string(stem) + std::to_string(index));
-}
-
-std::int32_t storeDemoMode() {
-  bool found = false;
-  const bool demo = platform().preferences().LGSPreferencesGetBoolValue(
-      "StoreDemoMode", "com.quill.demo-settings", found);
-  return found && demo ? 1 : 0;
-}
-
-std::uint64_t weeksSince2000(std::uint32_t secondsSince1970) {
-  return secondsSince1970 > kStartOf2000 ? (secondsSince1970 - kStartOf2000) / kSecondsPerWeek : 0;
+const Number* findIndexed(const PropertyDict& fields, std::string_view stem, std::uint64_t index) {
+  return fields.findNumber(std::string(stem) + std::to_string(index));
 }
 
 std::uint64_t mostBootBlockRefreshes(const PropertyDict& ftl) {
@@ -45,7 +30,7 @@ std::uint64_t mostBootBlockRefreshes(const PropertyDict& ftl) {
   for (unsigned i = 0; i < kMSPs; ++i) {
     std::uint64_t refreshes = 0;
     for (const char* stem : {"numBootBlockRefreshSuccess_", "numBootBlockRefreshFail_"}) {
-      if (const Number* count = numberUnder(ftl, stem, i)) {
+      if (const Number* count = findIndexed(ftl, stem, i)) {
         refreshes += count->asUInt64();
       }
     }
@@ -61,7 +46,7 @@ std::uint64_t bootBlockFailures(const PropertyDict& ftl, std::string_view stem,
   std::int64_t sum = 0;
   for (unsigned msp = 0; msp < kMSPs; ++msp) {
     for (unsigned block = first; block < first + blocks; ++block) {
-      if (const Number* failures = numberUnder(ftl, stem, msp * blocksPerMSP + block)) {
+      if (const Number* failures = findIndexed(ftl, stem, msp * blocksPerMSP + block)) {
         sum += failures->asInt32();
       }
     }
@@ -84,33 +69,71 @@ void addBootBlockFailures(const PropertyDict& ftl, std::uint64_t blocksPerMSP,
 }
 
 void addFieldsOfFTL(const PropertyDict& ftl, PropertyDict& fields) {
-  const Number* userStart = numberUnder(ftl, "userPartitionStart");
-  const Number* intermediateStart = numberUnder(ftl, "intermediatePartitionStart");
+  const Number* userStart = ftl.findNumber("userPartitionStart");
+  const Number* intermediateStart = ftl.findNumber("intermediatePartitionStart");
   if (userStart != nullptr && intermediateStart != nullptr) {
     const std::int64_t size = std::int64_t{userStart->asInt32()} - intermediateStart->asInt32();
     fields.set("HLT_intermediatePartitionSize", static_cast<std::uint64_t>(size));
   }
-  if (const Number* formatTime = numberUnder(ftl, "utilFormatTime")) {
+  if (const Number* formatTime = ftl.findNumber("utilFormatTime")) {
     fields.set("HLT_formatWeeksSince2000", weeksSince2000(formatTime->asUInt32()));
   }
   for (const std::string_view name : kCopiedFields) {
-    if (const PropertyValue* value = ftl.find(name)) {
-      fields.set("HLT_" + std::string(name), *value);
-    }
+    copyField(ftl, name, fields, "HLT_" + std::string(name));
   }
   fields.set("HLT_numBootBlockRefreshes_max", mostBootBlockRefreshes(ftl));
-  if (const Number* blocksPerMSP = numberUnder(ftl, "mspBootBlockCountPerMsp")) {
+  if (const Number* blocksPerMSP = ftl.findNumber("mspBootBlockCountPerMsp")) {
     addBootBlockFailures(ftl, blocksPerMSP->asUInt64(), fields);
   }
 }
 
 }  // namespace
 
+void copyField(const PropertyDict& from, std::string_view name, PropertyDict& to,
+               std::string_view newName) {
+  if (const PropertyValue* value = from.find(name)) {
+    to.set(newName, *value);
+  }
+}
+
+bool isInStoreDemoMode() {
+  bool found = false;
+  const bool demo = platform().preferences().LGSPreferencesGetBoolValue(
+      "StoreDemoMode", "com.quill.demo-settings", found);
+  return found && demo;
+}
+
+std::uint64_t weeksSince2000(std::uint64_t secondsSince1970) {
+  constexpr std::uint64_t kStartOf2000 = 946'684'800;
+  constexpr std::uint64_t kSecondsPerWeek = 604'800;
+  return secondsSince1970 > kStartOf2000 ? (secondsSince1970 - kStartOf2000) / kSecondsPerWeek : 0;
+}
+
+PropertyDict getReclaimerInfo() {
+  PropertyDict info;
+  Reclaimer& reclaimer = platform().reclaimer();
+  if (!reclaimer.isAvailable()) {
+    return info;
+  }
+  const std::optional<PropertyDict> answer =
+      reclaimer.ReclaimerCopyItemizedPurgeableSpaceWithInfo({{"RECLAIMER_VOLUME", "/private/var"}});
+  if (!answer) {
+    SetAPIErrorMessage(
+        "getReclaimerInfo: unable to get output from ReclaimerCopyItemizedPurgeableSpaceWithInfo");
+    return info;
+  }
+  if (!answer->contains("com.quill.NANDInfo.Reclaimer.Error")) {
+    copyField(*answer, "RECLAIMER_TOTAL_AVAILABLE", info, "HLT_Reclaimer_totalPurgeable");
+    copyField(*answer, "RECLAIMER_NONPURGEABLE_AMOUNT", info, "HLT_Reclaimer_totalNonPurgeable");
+  }
+  return info;
+}
+
 PropertyDict gatherORUFTLOtherData(const PropertyDict* ftl) {
   PropertyDict fields = getReclaimerInfo();
   fields.merge(CopyVMFreezerNANDInfo());
   fields.merge(GetDiskInfo());
-  fields.set("HLT_storeDemoMode", storeDemoMode());
+  fields.set("HLT_storeDemoMode", std::int32_t{isInStoreDemoMode()});
   if (ftl == nullptr) {
     SetAPIErrorMessage("gatherORUFTLOtherData: ftlDict is NULL");
     return fields;
@@ -127,11 +150,8 @@ PropertyDict gatherORUOtherData() {
     return selected;
   }
   const PropertyDict derived = gatherORUFTLOtherData(&*ftl);
-  FTLStats4MSPStats.forEach([&](std::string_view name, const FieldRange&) {
-    if (const PropertyValue* value = derived.find(name)) {
-      selected.set(name, *value);
-    }
-  });
+  FTLStats4MSPStats.forEach(
+      [&](std::string_view name, const FieldRange&) { copyField(derived, name, selected, name); });
   return selected;
 }
 

@@ -1,9 +1,10 @@
-#include "vesprun.h"
+#include "NANDInfo/VMFreezer.h"
 
 #include <cstddef>
 #include <optional>
 #include <span>
 
+#include "NANDInfo/controller/EntryPoint.h"
 #include "NANDInfo/parsers/KernelSnapshot.h"
 #include "common/LittleEndian.h"
 #include "platform/Platform.h"
@@ -19,19 +20,21 @@ constexpr std::size_t kBytesWrittenOffset = 24;
 
 }  // namespace
 
-PropertyDict CopyVMFreezerNANDInfo() {
-  const std::optional<Bytes> snapshot = platform().kernel().captureSnapshot(kCaptureFlags);
-  std::optional<std::span<const std::uint8_t>> ioStatistics;
-  if (!snapshot || !getIOStatsWithThreadnameFromSnapDataHelper(*snapshot, kSwapOutThread,
-                                                               ioStatistics, nullptr)) {
-    return {};
-  }
-  std::uint64_t bytesWritten = 0;
-  if (ioStatistics && ioStatistics->size() >= kBytesWrittenOffset + sizeof(bytesWritten)) {
-    bytesWritten = loadLittleEndian<std::uint64_t>(ioStatistics->data() + kBytesWrittenOffset);
-  }
-  return {{"HLT_VMFreezer_bytesWritten", bytesWritten},
-          {"com.quill.NANDInfo.VMFreezer.NumPhysicalWrites", bytesWritten}};
+PropertyDict CopyVMFreezerNANDInfo() noexcept {
+  return runEntryPoint(__func__, [&]() -> PropertyDict {
+    const std::optional<Bytes> snapshot = platform().kernel().captureSnapshot(kCaptureFlags);
+    std::optional<std::span<const std::uint8_t>> ioStatistics;
+    if (!snapshot || !getIOStatsWithThreadnameFromSnapDataHelper(*snapshot, kSwapOutThread,
+                                                                 ioStatistics, nullptr)) {
+      return {};
+    }
+    std::uint64_t bytesWritten = 0;
+    if (ioStatistics && ioStatistics->size() >= kBytesWrittenOffset + sizeof(bytesWritten)) {
+      bytesWritten = loadLittleEndian<std::uint64_t>(ioStatistics->data() + kBytesWrittenOffset);
+    }
+    return {{"HLT_VMFreezer_bytesWritten", bytesWritten},
+            {"com.quill.NANDInfo.VMFreezer.NumPhysicalWrites", bytesWritten}};
+  });
 }
 
 }  // namespace vesprun

@@ -1,14 +1,14 @@
-#include "vesprun.h"
+#include "NANDInfo/WhitelistedFieldSets.h"
 
 #include <cstdint>
 #include <string>
 #include <string_view>
 
 #include "NANDInfo/controller/EANQueries.h"
+#include "NANDInfo/controller/EntryPoint.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
-#include "NANDInfo/sets/FieldNumber.h"
 #include "NANDInfo/sets/FilteredDict.h"
-#include "NANDInfo/sets/NANDInfo.h"
+#include "NANDInfo/sets/StatisticsGathering.h"
 #include "NANDInfo/sets/StorageHealthFields.h"
 #include "NANDInfo/tables/FieldSets.h"
 
@@ -21,7 +21,7 @@ constexpr std::string_view kHealthFieldsOfStorageStats[] = {
     "HLT_formatWeeksSince2000", "HLT_OR_Capacity_GB", "HLT_averageSLCPECycles",
     "HLT_averageTLCPECycles",   "HLT_hostWrites",     "HLT_OR_Diskfullness_BP"};
 
-/// A figure that the EAN service tells of the image with a four-character code.
+/// A figure of the image with that four-character code.
 struct ImageFigure {
   std::string_view field;
   std::uint64_t (*query)(std::uint32_t code);
@@ -49,7 +49,7 @@ constexpr std::uint32_t fourCharacterCode(const char (&text)[5]) {
 }
 
 void addFirmwareVersionParts(const PropertyDict& msp, PropertyDict& set) {
-  const Number* version = numberUnder(msp, kFirmwareVersionKey);
+  const Number* version = msp.findNumber(kFirmwareVersionKey);
   if (version == nullptr) {
     return;
   }
@@ -61,57 +61,75 @@ void addFirmwareVersionParts(const PropertyDict& msp, PropertyDict& set) {
 
 }  // namespace
 
-PropertyDict CopyWhitelistedNANDFTLInfo(bool round) {
-  PropertyDict set;
-  if (std::optional<PropertyDict> fields = gatherORUFTLData(false, true, 0)) {
-    const PropertyDict derived = gatherORUFTLOtherData(&*fields);
-    if (derived.empty()) {
-      SetAPIErrorMessage("CopyWhitelistedNANDFTLInfo: Unable to gather HLT FTL fields");
+std::optional<PropertyDict> CopyNANDFTLInfo(bool useStatKeyParser, std::uint32_t enabled) noexcept {
+  return runEntryPoint(__func__, [&]() -> std::optional<PropertyDict> {
+    if (enabled == 0) {
+      return std::nullopt;
     }
-    fields->merge(derived);
-    set = CreateFilteredDict_SigDig(*fields, &WhitelistedRawNANDFTLCounters_SigDigDict, round);
-  } else {
-    SetAPIErrorMessage("CopyWhitelistedNANDFTLInfo: Unable to gather other FTL fields");
-  }
-  set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
-  return set;
+    std::optional<PropertyDict> fields = gatherORUFTLData(useStatKeyParser, true, 0);
+    if (!fields || fields->empty()) {
+      SetAPIErrorMessage(
+          "CopyWhitelistedNANDFTLInfo: Unable to gather other stats magazine deltas");
+    }
+    if (fields) {
+      fields->set(kAPIErrorMessageKey, GetAPIErrorMessage());
+    }
+    return fields;
+  });
 }
 
-std::optional<PropertyDict> CopyWhitelistedNANDFTLCountersInfo() { return std::nullopt; }
+PropertyDict CopyWhitelistedNANDFTLInfo(bool round) noexcept {
+  return runEntryPoint(__func__, [&] {
+    PropertyDict set;
+    if (std::optional<PropertyDict> fields = gatherORUFTLData(false, true, 0)) {
+      fields->merge(gatherORUFTLOtherData(&*fields));
+      set = CreateFilteredDict_SigDig(*fields, &WhitelistedRawNANDFTLCounters_SigDigDict, round);
+    } else {
+      SetAPIErrorMessage("CopyWhitelistedNANDFTLInfo: Unable to gather other FTL fields");
+    }
+    set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
+    return set;
+  });
+}
 
-PropertyDict CopyWhitelistedNANDMSPInfo(bool round) {
-  PropertyDict sets;
-  if (const std::optional<PropertyDict> fieldsByIndex = gatherORUMSPData()) {
+std::optional<PropertyDict> CopyWhitelistedNANDFTLCountersInfo() noexcept { return std::nullopt; }
+
+PropertyDict CopyWhitelistedNANDMSPInfo(bool round) noexcept {
+  return runEntryPoint(__func__, [&] {
+    PropertyDict sets;
+    if (const std::optional<PropertyDict> fieldsByIndex = gatherORUMSPData()) {
+      const PropertyDict derived = gatherORUOtherData();
+      for (const auto& [index, fields] : *fieldsByIndex) {
+        const PropertyDict& msp = *fields.dict();
+        PropertyDict set =
+            CreateFilteredDict_SigDig(msp, &WhitelistedRawNANDMSPCounters_SigDigDict, round);
+        set.merge(derived);
+        addFirmwareVersionParts(msp, set);
+        sets.set(index, std::move(set));
+      }
+    } else {
+      SetAPIErrorMessage("CopyWhitelistedNANDMSPInfo: Unable to gather MSP fields");
+    }
+    sets.set(kAPIErrorMessageKey, GetAPIErrorMessage());
+    return sets;
+  });
+}
+
+PropertyDict CopyWhitelistedStorageStats(bool round) noexcept {
+  return runEntryPoint(__func__, [&] {
+    PropertyDict fields;
     const PropertyDict derived = gatherORUOtherData();
-    for (const auto& [index, fields] : *fieldsByIndex) {
-      const PropertyDict& msp = *fields.dict();
-      PropertyDict set =
-          CreateFilteredDict_SigDig(msp, &WhitelistedRawNANDMSPCounters_SigDigDict, round);
-      set.merge(derived);
-      addFirmwareVersionParts(msp, set);
-      sets.set(index, std::move(set));
+    for (const std::string_view name : kHealthFieldsOfStorageStats) {
+      copyField(derived, name, fields, name);
     }
-  } else {
-    SetAPIErrorMessage("CopyWhitelistedNANDMSPInfo: Unable to gather MSP fields");
-  }
-  sets.set(kAPIErrorMessageKey, GetAPIErrorMessage());
-  return sets;
-}
-
-PropertyDict CopyWhitelistedStorageStats(bool round) {
-  PropertyDict fields;
-  const PropertyDict derived = gatherORUOtherData();
-  for (const std::string_view name : kHealthFieldsOfStorageStats) {
-    if (const PropertyValue* value = derived.find(name)) {
-      fields.set(name, *value);
+    for (const ImageFigure& figure : kImageFigures) {
+      fields.set(figure.field, figure.query(fourCharacterCode(figure.code)));
     }
-  }
-  for (const ImageFigure& figure : kImageFigures) {
-    fields.set(figure.field, figure.query(fourCharacterCode(figure.code)));
-  }
-  PropertyDict set = CreateFilteredDict_SigDig(fields, &WhitelistedStorageStats_SigDigDict, round);
-  set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
-  return set;
+    PropertyDict set =
+        CreateFilteredDict_SigDig(fields, &WhitelistedStorageStats_SigDigDict, round);
+    set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
+    return set;
+  });
 }
 
 }  // namespace vesprun

@@ -1,7 +1,7 @@
 #pragma once
 
 #include <array>
-#include <string_view>
+#include <cstdint>
 
 #include "NANDInfo/tables/FieldTable.h"
 
@@ -17,15 +17,44 @@ extern const FieldTable massStorage_NANDInfo_SM_Daily_FTLCounters_1;     ///< 52
 extern const FieldTable massStorage_NANDInfo_SM_WeeklyMA_FTLCounters_1;  ///< 33
 extern const FieldTable massStorage_NANDInfo_SM_Monthly_FTLCounters_1;   ///< 33
 
-struct EventFields {
-  std::string_view event;  ///< "com.quill.massStorage.NANDInfo." and what kind of event it is
+struct StorageEvent {
+  const char* event;
+  const char* view;    ///< its name in the log line on its outcome; null: the outcome is not logged
+  std::uint32_t step;  ///< of the extraction
   const FieldTable* fields;
 };
 
-/// Every storage event with its fields, in the order in which the events are sent.
-extern const std::array<EventFields, 8> EventHubConfigDetails;
+/// Every storage event, in the order in which they are sent.
+inline constexpr std::array<StorageEvent, 8> EventHubConfigDetails{{
+    {"com.quill.massStorage.NANDInfo.FTLCounters_1", "massStorage_NANDInfo_FTLCounters_1", 0,
+     &massStorage_NANDInfo_FTLCounters_1},
+    {"com.quill.massStorage.NANDInfo.FTLHistograms_1", "massStorage_NANDInfo_FTLHistograms_1", 0,
+     &massStorage_NANDInfo_FTLHistograms_1},
+    {"com.quill.massStorage.NANDInfo.FTLHistograms_2", nullptr, 0,
+     &massStorage_NANDInfo_FTLHistograms_2},
+    {"com.quill.massStorage.NANDInfo.MSPCounters_1", "massStorage_NANDInfo_MSPCounters_1", 1,
+     &massStorage_NANDInfo_MSPCounters_1},
+    {"com.quill.massStorage.NANDInfo.StorageStats_1", "massStorage_NANDInfo_StorageStats_1", 2,
+     &massStorage_NANDInfo_StorageStats_1},
+    {"com.quill.massStorage.NANDInfo.SM.Daily.FTLCounters_1",
+     "massStorage_NANDInfo_SM_Daily_FTLCounters_1", 4,
+     &massStorage_NANDInfo_SM_Daily_FTLCounters_1},
+    {"com.quill.massStorage.NANDInfo.SM.WeeklyMA.FTLCounters_1",
+     "massStorage_NANDInfo_SM_WeeklyMA_FTLCounters_1", 5,
+     &massStorage_NANDInfo_SM_WeeklyMA_FTLCounters_1},
+    {"com.quill.massStorage.NANDInfo.SM.Monthly.FTLCounters_1",
+     "massStorage_NANDInfo_SM_Monthly_FTLCounters_1", 6,
+     &massStorage_NANDInfo_SM_Monthly_FTLCounters_1},
+}};
 
-/// The fields of the event of that name; an event that is not known may carry nothing.
-const FieldTable& fieldsOfEvent(std::string_view event);
+/// The first event of a step; a step that sends none does not compile.
+consteval const StorageEvent& eventOfStep(std::uint32_t step) {
+  for (const StorageEvent& event : EventHubConfigDetails) {
+    if (event.step == step) {
+      return event;
+    }
+  }
+  throw "no event of that step";
+}
 
 }  // namespace vesprun

@@ -1,6 +1,5 @@
 #pragma once
 
-#include <bit>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
@@ -49,8 +48,7 @@ constexpr std::size_t hashOfStem(std::string_view stem) {
   while (!stem.empty()) {
     const std::size_t length = stem.size() < 8 ? stem.size() : 8;
     std::uint64_t word = 0;
-    if (length == 8 && std::endian::native == std::endian::little &&
-        !std::is_constant_evaluated()) {
+    if (length == 8 && !std::is_constant_evaluated()) {
       std::memcpy(&word, stem.data(), 8);
     } else {
       for (std::size_t i = 0; i < length; ++i) {

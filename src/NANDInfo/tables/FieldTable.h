@@ -42,7 +42,7 @@ struct FieldRange {
 };
 
 /// Hash index over the stems of a table's ranges, made when the table is compiled. Ranges of one
-/// stem are chained in table order. A name that stands in the table twice does not compile.
+/// stem are chained in table order. A name that is in the table twice does not compile.
 template <std::size_t RangeCount>
 struct FieldIndex {
   // Entries are positions of ranges, counted from 1; 0 is none.
@@ -60,7 +60,7 @@ struct FieldIndex {
       for (; *link != 0; link = &nextOfStem[*link - 1U]) {
         const FieldRange& earlier = ranges[*link - 1];
         if (earlier.first <= ranges[i].last && ranges[i].first <= earlier.last) {
-          throw "a name stands in the table twice";
+          throw "a name is in the table twice";
         }
       }
       *link = static_cast<std::uint16_t>(i + 1);
@@ -109,5 +109,15 @@ class FieldTable {
   std::span<const std::uint16_t> _nextOfStem;
   std::size_t _fieldCount;
 };
+
+template <const auto& kRanges>
+inline constexpr FieldIndex<kRanges.size()> kFieldIndexOf(kRanges);
+
+/// The table of an array of ranges that hold `kFieldCount` names.
+template <const auto& kRanges, std::size_t kFieldCount>
+constexpr FieldTable fieldTable() {
+  static_assert(kFieldIndexOf<kRanges>.fieldCount == kFieldCount);
+  return FieldTable(kRanges, kFieldIndexOf<kRanges>);
+}
 
 }  // namespace vesprun

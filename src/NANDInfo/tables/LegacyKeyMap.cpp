@@ -131,15 +131,13 @@ constexpr auto kLegacyFields = []<std::size_t... Row>(std::index_sequence<Row...
   return std::array{kRows[Row].fields...};
 }
 (std::make_index_sequence<kRows.size()>());
-constexpr FieldIndex kLegacyIndex(kLegacyFields);
-static_assert(kLegacyIndex.fieldCount == 709);
 static_assert(std::ranges::all_of(kLegacyFields, [](const FieldRange& fields) {
   return fields.stem.size() + 9 < 100;
 }));
 
 }  // namespace
 
-constinit const FieldTable keyMap(kLegacyFields, kLegacyIndex);
+constinit const FieldTable keyMap = fieldTable<kLegacyFields, 709>();
 
 std::optional<std::string> legacyKeyOf(std::string_view field) {
   const FieldName name = splitFieldName(field);

@@ -8,9 +8,8 @@
 
 namespace vesprun {
 
-/// 709: the fields of the base statistics that have a key in the legacy NAND info. No field stands
-/// in it twice and every name is shorter than 100 characters, so that a look-up by the whole name
-/// finds what a search from the top, comparing 100 characters, would.
+/// 709: the fields of the base statistics that have a key in the legacy NAND info. Every name is
+/// shorter than 100 characters.
 extern const FieldTable keyMap;
 
 /// The legacy NAND info key of a field of the base statistics: "com.quill.NANDInfo." and a suffix,

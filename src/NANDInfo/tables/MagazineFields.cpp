@@ -65,8 +65,6 @@ constexpr auto kAccumulatingRanges = std::to_array<FieldRange>({
     "wearLevMoves",
     // clang-format on
 });
-constexpr FieldIndex kAccumulatingIndex(kAccumulatingRanges);
-static_assert(kAccumulatingIndex.fieldCount == 731);
 
 constexpr auto kDynamicRanges = std::to_array<FieldRange>({
     // clang-format off
@@ -81,15 +79,13 @@ constexpr auto kDynamicRanges = std::to_array<FieldRange>({
     "staticSizeInMB", {"unmapsPerHostFlow_", 0, 3}, "wcacheSectorsCur",
     // clang-format on
 });
-constexpr FieldIndex kDynamicIndex(kDynamicRanges);
-static_assert(kDynamicIndex.fieldCount == 41);
 
 }  // namespace
 
-constinit const FieldTable PrivacyApprovedSMagNANDFTLCounters_Accum(kAccumulatingRanges,
-                                                                    kAccumulatingIndex);
+constinit const FieldTable PrivacyApprovedSMagNANDFTLCounters_Accum =
+    fieldTable<kAccumulatingRanges, 731>();
 
-constinit const FieldTable PrivacyApprovedSMagNANDFTLCounters_Dynamic(kDynamicRanges,
-                                                                      kDynamicIndex);
+constinit const FieldTable PrivacyApprovedSMagNANDFTLCounters_Dynamic =
+    fieldTable<kDynamicRanges, 41>();
 
 }  // namespace vesprun

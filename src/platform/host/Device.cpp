@@ -1,7 +1,8 @@
+#include "Device.h"
+
 #include <exception>
 
 #include "platform/host/HostPlatform.h"
-#include "vesprun.h"
 
 namespace vesprun {
 
@@ -17,21 +18,22 @@ Device::Device(std::unique_ptr<Installation> installation)
 
 Device::~Device() = default;
 
-std::unique_ptr<Device> Device::open(const std::string& path, std::string& error) {
-  if (platformIsInstalled()) {
-    error = path + ": another device is open";
-    return nullptr;
-  }
+std::unique_ptr<Device> Device::open(const std::string& path, std::string& error) noexcept {
   try {
-    std::unique_ptr<HostPlatform> platform = HostPlatform::open(path, error);
-    if (!platform) {
-      return nullptr;
+    try {
+      if (platformIsInstalled()) {
+        error = path + ": another device is open";
+      } else if (std::unique_ptr<HostPlatform> platform = HostPlatform::open(path, error)) {
+        return std::unique_ptr<Device>(
+            new Device(std::make_unique<Installation>(std::move(platform))));
+      }
+    } catch (const std::exception& failure) {
+      error = path + ": " + failure.what();
     }
-    return std::unique_ptr<Device>(new Device(std::make_unique<Installation>(std::move(platform))));
-  } catch (const std::exception& failure) {
-    error = path + ": " + failure.what();
-    return nullptr;
+  } catch (const std::exception&) {
+    error = "out of memory";  // short enough to need none
   }
+  return nullptr;
 }
 
 }  // namespace vesprun

@@ -10,88 +10,78 @@
 #include "platform/host/messages/HostMainLoop.h"
 #include "platform/host/messages/HostMessageService.h"
 #include "platform/host/preferences/HostPreferences.h"
-#include "platform/host/preferences/HostServicesClient.h"
-#include "platform/host/preferences/HostSystemConfiguration.h"
-#include "platform/host/preferences/HostUserDefaults.h"
+#include "platform/host/preferences/PreferenceServices.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
+#include "platform/host/services/ForwardingServices.h"
 #include "platform/host/services/HostClock.h"
+#include "platform/host/services/HostDailyWorkLock.h"
 #include "platform/host/services/HostDiagnosticHeader.h"
 #include "platform/host/services/HostEventHub.h"
 #include "platform/host/services/HostFileSystem.h"
-#include "platform/host/services/HostInstalledApplications.h"
 #include "platform/host/services/HostKernel.h"
 #include "platform/host/services/HostLanguages.h"
 #include "platform/host/services/HostLogsmith.h"
 #include "platform/host/services/HostMessageDigest.h"
 #include "platform/host/services/HostMurmur.h"
-#include "platform/host/services/HostNotificationCenter.h"
 #include "platform/host/services/HostOrrery.h"
-#include "platform/host/services/HostProcessInformation.h"
-#include "platform/host/services/HostPtreeSerialization.h"
-#include "platform/host/services/HostReclaimer.h"
-#include "platform/host/services/HostSupportLibrary.h"
 #include "platform/host/services/HostSystemLog.h"
 #include "platform/host/services/HostTapline.h"
 
 namespace vesprun {
 
-// Destroyed from the last to the first: what writes at its end stands below what it needs for that.
+// Destroyed from the last to the first: what writes at its end comes after what it needs for that.
 struct HostPlatform::Services {
-  /// A service that is made when it is first asked for, from whichever thread.
-  template <typename Service>
-  class Lazy {
-   public:
-    template <typename... Arguments>
-    Service& get(Arguments&&... arguments) {
-      std::call_once(_once, [&] { _service.emplace(std::forward<Arguments>(arguments)...); });
-      return *_service;
-    }
-
-   private:
-    std::once_flag _once;
-    std::optional<Service> _service;
-  };
-
   Services(DeviceDirectory deviceDirectory, DeviceDescription deviceDescription,
            ProcessTimeZone processTimeZone)
       : directory(std::move(deviceDirectory)),
         description(std::move(deviceDescription)),
-        timeZone(std::move(processTimeZone)),
-        clock(description.clock),
-        systemLog(directory, clock, description.logLevel),
-        outbox(directory, clock, systemLog) {}
+        timeZone(std::move(processTimeZone)) {}
+
+  DeviceRegistry& deviceRegistry() {
+    return interposedRegistry != nullptr ? *interposedRegistry : describedRegistry();
+  }
+
+  /// Laid out when it is first asked for, from whichever thread.
+  HostDeviceRegistry& describedRegistry() {
+    std::call_once(registryOnce,
+                   [this] { registry.emplace(description.registry, directory, systemLog); });
+    return *registry;
+  }
 
   DeviceDirectory directory;
   DeviceDescription description;
   ProcessTimeZone timeZone;
-  HostClock clock;
-  HostSystemLog systemLog;
-  Outbox outbox;
-  Lazy<HostPreferences> preferences;
-  Lazy<HostTallybook> tallybook;
-  Lazy<HostDeviceRegistry> describedRegistry;
+  HostClock clock{description.clock};
+  HostSystemLog systemLog{directory, clock, description.logLevel};
+  Outbox outbox{directory, clock, systemLog};
+  HostDailyWorkLock dailyWorkLock{directory,
+                                  systemLog};  // freed when what follows has been written
+  HostPreferences preferences{directory, clock, systemLog};
+  HostTallybook tallybook{directory, clock, preferences, systemLog};
+  std::once_flag registryOnce;
+  std::optional<HostDeviceRegistry> registry;
   DeviceRegistry* interposedRegistry = nullptr;
-  Lazy<HostDiagnosticHeader> diagnosticHeader;
-  Lazy<HostEventHub> eventHub;
-  Lazy<HostFileSystem> fileSystem;
-  Lazy<HostInstalledApplications> installedApplications;
-  Lazy<HostKernel> kernel;
-  Lazy<HostLanguages> languages;
-  Lazy<HostLogsmith> logsmith;
-  Lazy<HostMessageDigest> messageDigest;
-  Lazy<HostNotificationCenter> notificationCenter;
-  Lazy<HostOrrery> orrery;
-  Lazy<HostProcessInformation> processInformation;
-  Lazy<HostPtreeSerialization> ptreeSerialization;
-  Lazy<HostReclaimer> reclaimer;
-  Lazy<HostServicesClient> servicesClient;
-  Lazy<HostSupportLibrary> supportLibrary;
-  Lazy<HostSystemConfiguration> systemConfiguration;
-  Lazy<HostUserDefaults> userDefaults;
-  Lazy<HostMainLoop> mainLoop;
-  Lazy<HostMessageService> messageService;
-  Lazy<HostTapline> tapline;
-  Lazy<HostMurmur> murmur;  // last: until it has ended, a reply may use what stands above
+  HostDiagnosticHeader diagnosticHeader{description.system};
+  HostEventHub eventHub{description.events, outbox};
+  HostFileSystem fileSystem{directory, description.userVolume, systemLog};
+  HostInstalledApplications installedApplications{description};
+  HostKernel kernel{description.kernel, directory, systemLog};
+  HostLanguages languages{description.languages};
+  HostLogsmith logsmith{description, outbox};
+  HostMessageDigest messageDigest;
+  HostNotificationCenter notificationCenter{outbox};
+  HostOrrery orrery{description.properties, directory};
+  HostProcessInformation processInformation;
+  HostPtreeSerialization ptreeSerialization;
+  HostReclaimer reclaimer{description};
+  HostServicesClient servicesClient{directory, clock, systemLog};
+  HostSupportLibrary supportLibrary{description.supportLibrary};
+  HostSystemConfiguration systemConfiguration{description, directory, clock, systemLog};
+  HostUserDefaults userDefaults{preferences};
+  HostMainLoop mainLoop;
+  HostMessageService messageService{directory, ptreeSerialization, systemLog, mainLoop};
+  HostTapline tapline{description.channels};
+  HostMurmur murmur{description.usage, systemLog};  // last: a reply may use all of the above
 };
 
 HostPlatform::HostPlatform(std::unique_ptr<Services> services) : _services(std::move(services)) {}
@@ -127,105 +117,43 @@ std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, std::s
 }
 
 const DeviceDirectory& HostPlatform::directory() const { return _services->directory; }
-
 const DeviceDescription& HostPlatform::description() const { return _services->description; }
-
-Clock& HostPlatform::clock() { return _services->clock; }
-
-SystemLog& HostPlatform::systemLog() { return _services->systemLog; }
-
-HostTallybook& HostPlatform::counters() {
-  return _services->tallybook.get(directory(), clock(), preferences(), systemLog());
-}
-
-Tallybook& HostPlatform::tallybook() { return counters(); }
-
-HostDeviceRegistry& HostPlatform::describedRegistry() {
-  return _services->describedRegistry.get(description().registry, directory(), systemLog());
-}
-
+HostTallybook& HostPlatform::counters() { return _services->tallybook; }
+HostDeviceRegistry& HostPlatform::describedRegistry() { return _services->describedRegistry(); }
 void HostPlatform::interposeDeviceRegistry(DeviceRegistry* registry) {
   _services->interposedRegistry = registry;
 }
 
-DeviceRegistry& HostPlatform::deviceRegistry() {
-  return _services->interposedRegistry != nullptr ? *_services->interposedRegistry
-                                                  : describedRegistry();
-}
-
-DiagnosticHeader& HostPlatform::diagnosticHeader() {
-  return _services->diagnosticHeader.get(description().system);
-}
-
-EventHub& HostPlatform::eventHub() {
-  return _services->eventHub.get(description().events, _services->outbox);
-}
-
-FileSystem& HostPlatform::fileSystem() {
-  return _services->fileSystem.get(directory(), description().userVolume, systemLog());
-}
-
+Clock& HostPlatform::clock() { return _services->clock; }
+DeviceRegistry& HostPlatform::deviceRegistry() { return _services->deviceRegistry(); }
+DailyWorkLock& HostPlatform::dailyWorkLock() { return _services->dailyWorkLock; }
+DiagnosticHeader& HostPlatform::diagnosticHeader() { return _services->diagnosticHeader; }
+EventHub& HostPlatform::eventHub() { return _services->eventHub; }
+FileSystem& HostPlatform::fileSystem() { return _services->fileSystem; }
 InstalledApplications& HostPlatform::installedApplications() {
-  return _services->installedApplications.get(description());
+  return _services->installedApplications;
 }
-
-Kernel& HostPlatform::kernel() {
-  return _services->kernel.get(description().kernel, directory(), systemLog());
-}
-
-Languages& HostPlatform::languages() { return _services->languages.get(description().languages); }
-
-Logsmith& HostPlatform::logsmith() {
-  return _services->logsmith.get(description(), _services->outbox);
-}
-
-MainLoop& HostPlatform::mainLoop() { return _services->mainLoop.get(); }
-
-MessageDigest& HostPlatform::messageDigest() { return _services->messageDigest.get(); }
-
-MessageService& HostPlatform::messageService() {
-  return _services->messageService.get(directory(), ptreeSerialization(), systemLog(),
-                                       _services->mainLoop.get());
-}
-
-Murmur& HostPlatform::murmur() { return _services->murmur.get(description().usage, systemLog()); }
-
-NotificationCenter& HostPlatform::notificationCenter() {
-  return _services->notificationCenter.get(_services->outbox);
-}
-
-Orrery& HostPlatform::orrery() {
-  return _services->orrery.get(description().properties, directory());
-}
-
-Preferences& HostPlatform::preferences() {
-  return _services->preferences.get(directory(), clock(), systemLog());
-}
-
-ProcessInformation& HostPlatform::processInformation() {
-  return _services->processInformation.get();
-}
-
-PtreeSerialization& HostPlatform::ptreeSerialization() {
-  return _services->ptreeSerialization.get();
-}
-
-Reclaimer& HostPlatform::reclaimer() { return _services->reclaimer.get(description()); }
-
-LGSServicesClient& HostPlatform::servicesClient() {
-  return _services->servicesClient.get(directory(), clock(), systemLog());
-}
-
-SupportLibrary& HostPlatform::supportLibrary() {
-  return _services->supportLibrary.get(description().supportLibrary);
-}
-
+Kernel& HostPlatform::kernel() { return _services->kernel; }
+Languages& HostPlatform::languages() { return _services->languages; }
+Logsmith& HostPlatform::logsmith() { return _services->logsmith; }
+MainLoop& HostPlatform::mainLoop() { return _services->mainLoop; }
+MessageDigest& HostPlatform::messageDigest() { return _services->messageDigest; }
+MessageService& HostPlatform::messageService() { return _services->messageService; }
+Murmur& HostPlatform::murmur() { return _services->murmur; }
+NotificationCenter& HostPlatform::notificationCenter() { return _services->notificationCenter; }
+Orrery& HostPlatform::orrery() { return _services->orrery; }
+Preferences& HostPlatform::preferences() { return _services->preferences; }
+ProcessInformation& HostPlatform::processInformation() { return _services->processInformation; }
+PtreeSerialization& HostPlatform::ptreeSerialization() { return _services->ptreeSerialization; }
+Reclaimer& HostPlatform::reclaimer() { return _services->reclaimer; }
+LGSServicesClient& HostPlatform::servicesClient() { return _services->servicesClient; }
+SupportLibrary& HostPlatform::supportLibrary() { return _services->supportLibrary; }
 LGSSystemConfiguration& HostPlatform::systemConfiguration() {
-  return _services->systemConfiguration.get(description(), directory(), clock(), systemLog());
+  return _services->systemConfiguration;
 }
-
-Tapline& HostPlatform::tapline() { return _services->tapline.get(description().channels); }
-
-UserDefaults& HostPlatform::userDefaults() { return _services->userDefaults.get(preferences()); }
+SystemLog& HostPlatform::systemLog() { return _services->systemLog; }
+Tallybook& HostPlatform::tallybook() { return _services->tallybook; }
+Tapline& HostPlatform::tapline() { return _services->tapline; }
+UserDefaults& HostPlatform::userDefaults() { return _services->userDefaults; }
 
 }  // namespace vesprun

@@ -34,6 +34,7 @@ class HostPlatform : public Platform {
   void interposeDeviceRegistry(DeviceRegistry* registry);
 
   Clock& clock() override;
+  DailyWorkLock& dailyWorkLock() override;
   DeviceRegistry& deviceRegistry() override;
   DiagnosticHeader& diagnosticHeader() override;
   EventHub& eventHub() override;

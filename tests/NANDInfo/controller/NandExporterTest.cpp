@@ -1,5 +1,6 @@
 #include "NANDInfo/controller/NandExporter.h"
 
+#include "NANDInfo/ORUConnection.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
 #include "support/ControllerTest.h"
 #include "support/WatchedRegistry.h"
@@ -98,6 +99,7 @@ TEST_F(NandExporterTest, ConnectionForOtherPrograms) {
   nand_exporters_tunnel[1].getStatsSelectors = getter;
 
   start("");
+  connection.connection = 99;  // of somebody else
   EXPECT_EQ(errorsOf([&] { EXPECT_FALSE(openORUConnection(connection)); }),
             kNoMatch + "Can't get ORU Connection, no matching service!\n");
   EXPECT_EQ(connection.exporter, &endOfTable());

@@ -1,7 +1,7 @@
 #include "NANDInfo/lists/FactoryDefectList.h"
 
+#include "buffers/DeviceBuffers.h"
 #include "common/TextForm.h"
-#include "support/ListBuffers.h"
 #include "support/TestDevice.h"
 
 namespace vesprun {
@@ -21,6 +21,7 @@ TEST(FactoryDefectList, LogsTheCountAndEveryDefect) {
   EXPECT_EQ(testing::internal::GetCapturedStderr(), "Encountered unexpected defectMode: 0xbad");
   std::string texts;
   for (const PropertyDict& line : device.lines("records.jsonl")) {
+    EXPECT_EQ(*line.find("type"), PropertyValue(176));
     texts += textForm(*line.find("record")) + '\n';
   }
   const auto defects = [](const std::string& first, const std::string& second) {

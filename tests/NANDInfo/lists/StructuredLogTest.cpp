@@ -2,10 +2,9 @@
 
 #include "NANDInfo/controller/NandExporter.h"
 #include "NANDInfo/lists/StructuredLogState.h"
-#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
+#include "buffers/DeviceBuffers.h"
 #include "common/TextForm.h"
 #include "support/ControllerTest.h"
-#include "support/ListBuffers.h"
 #include "support/WatchedRegistry.h"
 
 namespace vesprun {
@@ -13,10 +12,8 @@ namespace {
 
 class StructuredLog : public ControllerTest {
  protected:
-  ~StructuredLog() override { forgetStructuredLogState(); }
-
   /// A controller that delivers every list, with a write amplification of 1.25. Of several answers
-  /// to a request the first counts: `tunnel` stands before its own. Its characteristics are its
+  /// to a request the first counts: `tunnel` comes before its own. Its characteristics are its
   /// parent's, unless it has some; those of its sibling and its child are no concern of its.
   void startController(const std::string& tunnel = "", const std::string& properties = "{}") {
     const std::string unusable = R"("properties": {"Controller Characteristics": 5}})";
@@ -68,6 +65,20 @@ TEST_F(StructuredLog, WritesTheValidityListOnlyWhenItIsWanted) {
   gForceCollectionSet = 1;
   EXPECT_EQ(dump(), "false 5 data cannot be parsed");
   EXPECT_EQ(gCurrentUserWamp, 0.0);
+}
+
+TEST_F(StructuredLog, FindsTheCharacteristicsUnderTheNameThatTheClassHas) {
+  const std::pair<std::string, std::string> names[] = {
+      {"QuillEmbeddedNVMeController", "Controller Characteristics"},
+      {"ORUStorage", "DevRegPropertyMatch"}};
+  for (const auto& [className, property] : names) {
+    start(
+        R"({"class": ")" + className + R"(", "properties": {")" + property +
+        R"(": {"nand-device-desc": 7}}, "userClient": {"tunnel": [{"opcode": 15, "size": 12}]}})");
+    dump();
+    EXPECT_EQ(textForm(*device().lines("records.jsonl").at(0).find("record")),
+              "{Factory Count = 0; com.quill.NANDInfo.nandDesc = 7}");
+  }
 }
 
 TEST_F(StructuredLog, SendsKindsAndTheCallersFlag) {
@@ -156,6 +167,14 @@ TEST_F(StructuredLog, FetchesOnlyWhatTheControllerOffers) {
             "Telemetry list retrieval is not supported\n"
             "Defects list retrieval is not supported\n");
   exporter = complete;
+}
+
+TEST_F(StructuredLog, ACustomControllerHasItsCharacteristicsElsewhere) {
+  for (const bool elsewhere : {false, true}) {
+    start(std::string(R"({"class": "ORUStorage", "userClient": {}, "properties": {")") +
+          (elsewhere ? "DevRegPropertyMatch" : "Controller Characteristics") + "\": {}}}");
+    EXPECT_EQ(dump().find("failed to create dictionary") == std::string::npos, elsewhere);
+  }
 }
 
 }  // namespace

@@ -1,7 +1,7 @@
 #include "NANDInfo/lists/TelemetryList.h"
 
+#include "buffers/DeviceBuffers.h"
 #include "common/TextForm.h"
-#include "support/ListBuffers.h"
 #include "support/TestDevice.h"
 
 namespace vesprun {

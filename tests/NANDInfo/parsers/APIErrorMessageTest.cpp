@@ -5,7 +5,7 @@
 namespace vesprun {
 namespace {
 
-TEST(APIErrorMessage, keepsTheFirstTextCutAt1023Bytes) {
+TEST(APIErrorMessage, KeepsTheFirstTextCutAt1023Bytes) {
   forgetAPIErrorMessage();
   EXPECT_EQ(GetAPIErrorMessage(), "NA");
   SetAPIErrorMessage("open: %s failed with 0x%x", "controller", 0xE00002C2U);

@@ -2,7 +2,7 @@
 
 #include "FieldsOf.h"
 #include "NANDInfo/lists/HexText.h"
-#include "NANDInfo/parsers/DictionaryHelpers.h"
+#include "platform/DictionaryHelpers.h"
 #include "support/TestDevice.h"
 
 namespace vesprun {
@@ -12,7 +12,7 @@ using ::testing::ElementsAre, ::testing::IsEmpty;
 
 constexpr std::uint8_t kBytes[] = {1, 0, 0, 0, 2, 0, 0, 0, 0xFF, 0xFF, 0xFF, 0xFF, 0x80};
 
-TEST(GenericParserCxt, namesElementsAndWidensThem) {
+TEST(GenericParserCxt, NamesElementsAndWidensThem) {
   const std::tuple<const char*, std::uint32_t, std::uint32_t, bool, Fields> cases[] = {
       {"bin", 4, 3, true, {{"bin0", 1}, {"bin1", 2}, {"bin2", 4294967295}}},
       {"x_", 4, 1, true, {{"x_", 1}}},
@@ -28,7 +28,7 @@ TEST(GenericParserCxt, namesElementsAndWidensThem) {
   }
 }
 
-TEST(GenericParserCxt, refusesWhatOneCallCannotTake) {
+TEST(GenericParserCxt, RefusesWhatOneCallCannotTake) {
   const Bytes bytes(65'536);
   GenericParserCxt ctx;
   EXPECT_FALSE(AddMultipleFieldsToGenericContext(ctx, "n", bytes.data(), 1, 65'536));
@@ -38,7 +38,7 @@ TEST(GenericParserCxt, refusesWhatOneCallCannotTake) {
   EXPECT_EQ(ctx[65'534].name, "n65534");
 }
 
-TEST(GenericParserCxt, cutsNamesAt98Characters) {
+TEST(GenericParserCxt, CutsNamesAt98Characters) {
   const std::string prefix(97, 'p');
   GenericParserCxt ctx;
   EXPECT_TRUE(AddSingleValueToGenericContext(ctx, prefix, "suffix", 1));
@@ -49,7 +49,7 @@ TEST(GenericParserCxt, cutsNamesAt98Characters) {
   EXPECT_EQ(ctx[14].name, std::string(98, 'q'));
 }
 
-TEST(GenericParserCxt, keepsOrderAndRepeatsUntilReleased) {
+TEST(GenericParserCxt, KeepsOrderAndRepeatsUntilReleased) {
   GenericParserCxt ctx;
   EXPECT_THAT(CreateDictFromCxt(ctx), IsEmpty());
   AddSingleValueToGenericContext(ctx, "a", "1", 18446744073709551615U);
@@ -70,12 +70,10 @@ TEST(GenericParserCxt, keepsOrderAndRepeatsUntilReleased) {
   EXPECT_EQ(fieldsOf(ctx), (Fields{{"again", 4}}));
 }
 
-TEST(DictionaryHelpers, fallBackAndKeepTheirKinds) {
-  PropertyDict dict{{"n", 7}, {"s", "text"}};
+TEST(DictionaryHelpers, FallBackAndKeepTheirKinds) {
+  PropertyDict dict{{"n", 7}};
   EXPECT_EQ(GetNumberFromDictionarySafe(dict, "n"), PropertyValue(7));
   EXPECT_EQ(GetNumberFromDictionarySafe(dict, "no"), PropertyValue(0));
-  EXPECT_EQ(GetStringFromDictionarySafe(dict, "s"), PropertyValue("text"));
-  EXPECT_EQ(GetStringFromDictionarySafe(dict, "no"), PropertyValue("empty"));
 
   const std::int32_t minusTwo = -2;
   const double half = 0.5;
@@ -84,7 +82,7 @@ TEST(DictionaryHelpers, fallBackAndKeepTheirKinds) {
   setNumberValueForType(dict, "int", &minusTwo, PVNumberType::Int);
   appendNumberValueForType(array, &half, PVNumberType::Double);
   appendNumberValueForType(array, &half, PVNumberType::Int64);
-  EXPECT_EQ(dict, (PropertyDict{{"n", -2}, {"s", "text"}, {"int", -2}}));
+  EXPECT_EQ(dict, (PropertyDict{{"n", -2}, {"int", -2}}));
   EXPECT_EQ(dict.find("n")->number()->kind(), NumberKind::Int8);
   EXPECT_EQ(dict.find("int")->number()->kind(), NumberKind::Int32);
   EXPECT_EQ(array, (PropertyArray{0.5, std::int64_t{0x3FE0000000000000}}));
@@ -99,7 +97,7 @@ TEST(DictionaryHelpers, fallBackAndKeepTheirKinds) {
                                                               "from value: 0x")));
 }
 
-TEST(HexText, readsPairsFromTheLeft) {
+TEST(HexText, ReadsPairsFromTheLeft) {
   EXPECT_EQ(hexStringToInt32("12345678", 8), 0x12345678U);
   EXPECT_EQ(hexStringToInt32("a5", 2), 0xA5U);
   EXPECT_EQ(hexStringToInt32("123", 3), 0x1203U);

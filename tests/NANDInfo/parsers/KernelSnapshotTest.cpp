@@ -1,6 +1,6 @@
 #include "NANDInfo/parsers/KernelSnapshot.h"
 
-#include "support/SnapshotBuilder.h"
+#include "buffers/DeviceBuffers.h"
 
 namespace vesprun {
 namespace {
@@ -20,7 +20,7 @@ int look(const Bytes& snapshot, const char* name = "VM_swapout") {
 
 using B = SnapshotBuilder;
 
-TEST(KernelSnapshot, findsTheThreadInTheFirstContainer) {
+TEST(KernelSnapshot, FindsTheThreadInTheFirstContainer) {
   const std::pair<B, int> cases[] = {
       {B().thread(1, "VM_swapout", 7), 7},
       {B().begin(1).name("VM_swapout", 16).written(7), 7},
@@ -51,11 +51,17 @@ TEST(KernelSnapshot, findsTheThreadInTheFirstContainer) {
     EXPECT_EQ(look(each.first.bytes), each.second) << &each - cases;
   }
   EXPECT_EQ(look(B().thread(1, "VM_swapout", 7).bytes, nullptr), kAbsent);
-  const std::string name(70, 'n');  // 64 characters are compared
-  EXPECT_EQ(look(B().begin(1).name(name.substr(0, 64) + 'x').written(7).bytes, name.c_str()), 7);
+  // The first 64 bytes are compared, whether or not more follow.
+  const std::string same(63, 'n');
+  const std::pair<std::string, int> names[] = {
+      {same, 7}, {same + 'n', 7}, {same + "nx", 7}, {same + 'x', kAbsent}, {same + '\0', kAbsent}};
+  for (const auto& [name, expected] : names) {
+    EXPECT_EQ(look(B().begin(1).name(name).written(7).bytes, (same + "nnnn").c_str()), expected);
+  }
+  EXPECT_EQ(look(B().begin(1).name(same + 'n').written(7).bytes, (same + 'n').c_str()), 7);
 }
 
-TEST(KernelSnapshot, endsAtAnItemThatIsCutOff) {
+TEST(KernelSnapshot, EndsAtAnItemThatIsCutOff) {
   const B whole = B().begin(1).thread(2, "idle", 3).begin(3).name("VM_swapout", 16).written(7);
   const std::size_t nameEnd = whole.bytes.size() - 48;
   for (std::size_t size = 0; size <= whole.bytes.size(); ++size) {
@@ -65,7 +71,7 @@ TEST(KernelSnapshot, endsAtAnItemThatIsCutOff) {
   }
 }
 
-TEST(KernelSnapshot, followsAnyNesting) {
+TEST(KernelSnapshot, FollowsAnyNesting) {
   B deep;
   for (std::uint64_t id = 0; id < 200'000; ++id) {
     deep.begin(id);

@@ -9,7 +9,7 @@
 #include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
-#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
+#include "buffers/DeviceBuffers.h"
 
 namespace vesprun {
 namespace {
@@ -70,7 +70,7 @@ std::string textOf(Outcome (*parse)(std::span<const std::uint8_t>), const Builde
   return outcome.error == "NA" ? text : text + ": " + outcome.error;
 }
 
-TEST(BaseParser, walksRecords) {
+TEST(BaseParser, WalksRecords) {
   const std::pair<Statistics, std::string> cases[] = {
       {Statistics(), "0"},
       {Statistics().add(900, {}), "1"},
@@ -94,39 +94,76 @@ TEST(BaseParser, walksRecords) {
   EXPECT_EQ(base(trailing).result, 1U);
 }
 
-TEST(BaseParser, givesUpWhenFieldsMultiply) {
-  constexpr std::uint32_t kCacheDepthVsThroughput = 460;
-  Statistics buffer;
-  for (int record = 0; record < 100'000; ++record) {
-    buffer.addHeader(kCacheDepthVsThroughput, 0);
+TEST(BaseParser, GivesUpOnlyWhenRecordsThatOverlapMultiplyFields) {
+  constexpr std::uint32_t kCacheDepthVsThroughput = 460;  // 256 elements
+  Statistics overlapping;
+  for (int record = 0; record < 32'768; ++record) {
+    overlapping.addHeader(kCacheDepthVsThroughput, 0);
   }
   ORUStatsContext ctx;
-  EXPECT_FALSE(ORUParseBufferToCxt(ctx, buffer.bytes()));
-  EXPECT_LT(ctx.fields.size(), 1'001'000U);
+  EXPECT_FALSE(ORUParseBufferToCxt(ctx, overlapping.bytes()));
+  EXPECT_EQ(ctx.fields.size(), 1025U * 256);
+
+  Statistics full;
+  for (int record = 0; record < 4'000; ++record) {
+    full.add(kCacheDepthVsThroughput, Words(256));
+  }
+  full.add(kCacheDepthVsThroughput, {}).add(4, Words(300));
+  EXPECT_TRUE(ORUParseBufferToCxt(ctx, full.bytes()));  // adds to what a parse before it left
+  EXPECT_EQ(ctx.fields.size(), 1025U * 256 + 4001U * 256 + 1);
 }
 
-TEST(BaseParser, fillsTheSummary) {
-  Statistics buffer;
-  const std::uint32_t ids[] = {52, 53, 49, 7, 51, 4, 17, 18, 50, 19, 20, 12, 48, 13, 56, 28, 45};
-  for (const std::uint32_t id : ids) {
-    buffer.add(id, {0x500000000U + id});
+/// In the order of the context, without the driver version and the histogram.
+Words summaryOf(const ORUStatsContext& ctx) {
+  return {ctx.exportVersion,
+          ctx.numVirtualBlocks,
+          ctx.blocksPerVirtualBlock,
+          ctx.pagesPerVirtualBlock,
+          ctx.bytesPerPage,
+          ctx.hostReads,
+          ctx.hostWrites,
+          ctx.numFreeVirtualBlocks,
+          ctx.wearLevMoves,
+          ctx.nandReads,
+          ctx.nandWrites,
+          ctx.bandErases,
+          ctx.IND_pool_free,
+          ctx.IND_pool_count,
+          ctx.utilFormatTime,
+          ctx.numSleepOps,
+          ctx.maxHighEnduranceBlockErases};
+}
+
+TEST(BaseParser, FillsTheSummary) {
+  // In the order of the context, and a histogram at the end.
+  const Words ids = {53, 52, 51, 50, 49, 7, 4, 48, 17, 19, 18, 20, 12, 13, 56, 28, 45};
+  Words all(ids.size());
+  Statistics rising;
+  Statistics falling;
+  for (std::uint32_t id = 0; id <= 100; ++id) {
+    const auto at = static_cast<std::size_t>(std::find(ids.begin(), ids.end(), id) - ids.begin());
+    Words expected(ids.size());
+    if (at < ids.size()) {
+      expected[at] = all[at] = id + (id >= 49 && id <= 53 ? 0U : 0x500000000U);
+    }
+    ORUStatsContext ctx;
+    EXPECT_TRUE(ORUParseBufferToCxt(ctx, Statistics().add(id, {0x500000000U + id}).bytes()));
+    EXPECT_EQ(summaryOf(ctx), expected) << id;
+    rising.add(id, {0x500000000U + id});
+    falling.add(100 - id, {0x500000000U + 100 - id});
   }
-  buffer.add(265, {1, 2, 3, 4, 5});
   ORUStatsContext ctx;
-  ASSERT_TRUE(ORUParseBufferToCxt(ctx, buffer.bytes()));
-  const std::uint64_t kept[] = {
-      ctx.numVirtualBlocks,      ctx.exportVersion,  ctx.bytesPerPage,   ctx.hostReads,
-      ctx.blocksPerVirtualBlock, ctx.hostWrites,     ctx.wearLevMoves,   ctx.nandWrites,
-      ctx.pagesPerVirtualBlock,  ctx.nandReads,      ctx.bandErases,     ctx.IND_pool_free,
-      ctx.numFreeVirtualBlocks,  ctx.IND_pool_count, ctx.utilFormatTime, ctx.numSleepOps};
-  for (std::size_t i = 0; i < std::size(kept); ++i) {
-    const bool isNarrow = ids[i] >= 49 && ids[i] <= 53;
-    EXPECT_EQ(kept[i], ids[i] + (isNarrow ? 0U : 0x500000000U)) << ids[i];
-  }
-  EXPECT_EQ(ctx.maxHighEnduranceBlockErases, 0x50000002DU);
+  EXPECT_TRUE(ORUParseBufferToCxt(ctx, rising.bytes()));
+  EXPECT_EQ(summaryOf(ctx), all);
+  EXPECT_EQ(ctx.readCountHisto, (std::array<std::uint64_t, 5>{}));
+  ORUReleaseContext(ctx);
+  EXPECT_EQ(summaryOf(ctx), Words(ids.size()));
+  EXPECT_EQ(ctx.driverVersion, 0);
+  EXPECT_TRUE(ORUParseBufferToCxt(ctx, falling.add(265, {1, 2, 3, 4, 5}).bytes()));
+  EXPECT_EQ(summaryOf(ctx), all);
   EXPECT_THAT(ctx.readCountHisto, ::testing::ElementsAre(1, 2, 3, 4, 5));
   EXPECT_EQ(ctx.driverVersion, -1);
-  EXPECT_EQ(ctx.fields.size(), std::size(ids) + 5);
+  const std::size_t fieldCount = ctx.fields.size();
 
   // A later parse adds; a failing one takes back the export version only.
   EXPECT_FALSE(ORUParseBufferToCxt(ctx, Bytes(7)));
@@ -135,10 +172,10 @@ TEST(BaseParser, fillsTheSummary) {
   EXPECT_EQ(ctx.exportVersion, 0U);
   EXPECT_EQ(ctx.hostWrites, 8U);
   EXPECT_EQ(ctx.hostReads, 0x500000007U);
-  EXPECT_EQ(ctx.fields.size(), std::size(ids) + 6);
+  EXPECT_EQ(ctx.fields.size(), fieldCount + 1);
 }
 
-TEST(FTLParser, walksRecords) {
+TEST(FTLParser, WalksRecords) {
   const std::string tooMany = ": ORUFTLParseBufferToCxt 900: Cannot add 65536 elements to context";
   const std::string counts = ": ORUFTLParseBufferToCxt: qosPerCmdQ(90): (#160) cfg elements != ";
   const Statistics large = Statistics().add(11, {1}).add(900, Words(65'536)).add(11, {2});
@@ -167,7 +204,7 @@ TEST(FTLParser, walksRecords) {
   EXPECT_EQ(textOf(ftlStatKey, Statistics().add(65535, {2}).add(7, {3})), "0");
 }
 
-TEST(MSPParser, walksRecords) {
+TEST(MSPParser, WalksRecords) {
   const auto mismatch = [](const std::string& key, const std::string& configured,
                            const std::string& size) {
     return ": ORUMSPParseBufferToCxt: " + key + ": cfg " + configured + " cfg bytes != (" + size +
@@ -207,31 +244,19 @@ TEST(MSPParser, walksRecords) {
   }
 }
 
-Bytes allStatistics() {
-  Statistics buffer;
-  for (const ORUStatKey& key : ORUStatKeyTable) {
-    buffer.add(key.id, countingUp(key.count, key.id));
-  }
-  return buffer.bytes();
-}
-
-Bytes allMSPStatistics() {
-  MSP buffer;
-  for (const ORUMSPKey& key : ORUMSPKeyTable) {
-    buffer.add(key.key, countingUp(key.count, key.key));
-  }
-  return buffer.bytes();
-}
-
-TEST(StatisticsParsers, decodeEveryKnownStatistic) {
-  const Outcome all = ftl(allStatistics());
+TEST(StatisticsParsers, DecodeEveryKnownStatistic) {
+  const Bytes statistics =
+      everyStatistic([](const ORUStatKey& key) { return countingUp(key.count, key.id); });
+  const Bytes mspStatistics =
+      everyMSPStatistic([](const ORUMSPKey& key) { return countingUp(key.count, key.key); });
+  const Outcome all = ftl(statistics);
   EXPECT_EQ(all.result, 540U + 1956U);
   EXPECT_EQ(all.error, "NA");
-  EXPECT_EQ(base(allStatistics()).fields.size(), 540U + 1956U);
-  EXPECT_EQ(base(allStatistics()).fields.back(), Fields::value_type("numDipFailures", 828));
-  EXPECT_EQ(ftlStatKey(allStatistics()).result, 540U + 1956U);
-  EXPECT_EQ(msp(allMSPStatistics()).result, 857U);
-  EXPECT_EQ(msp(allMSPStatistics()).error, "NA");
+  EXPECT_EQ(base(statistics).fields.size(), 540U + 1956U);
+  EXPECT_EQ(base(statistics).fields.back(), Fields::value_type("numDipFailures", 828));
+  EXPECT_EQ(ftlStatKey(statistics).result, 540U + 1956U);
+  EXPECT_EQ(msp(mspStatistics).result, 857U);
+  EXPECT_EQ(msp(mspStatistics).error, "NA");
 }
 
 }  // namespace

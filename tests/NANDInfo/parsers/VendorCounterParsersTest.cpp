@@ -3,12 +3,12 @@
 #include <map>
 #include <numeric>
 
-#include "support/ListBuffers.h"
+#include "buffers/DeviceBuffers.h"
 
 namespace vesprun {
 namespace {
 
-TEST(VendorCounterParsers, copyWhatTheirLayoutsSay) {
+TEST(VendorCounterParsers, CopyWhatTheirLayoutsSay) {
   struct Case {
     void (*parse)(CounterRegion, NandChannelCounters&);
     std::uint64_t sum;

@@ -1,6 +1,10 @@
+#include "NANDInfo/sets/CopyNANDInfo.h"
+
 #include "NANDInfo/controller/EANQueries.h"
-#include "NANDInfo/sets/NANDInfo.h"
+#include "NANDInfo/controller/NandExporter.h"
+#include "NANDInfo/sets/StorageHealthFields.h"
 #include "support/ControllerTest.h"
+#include "vesprun.h"
 
 namespace vesprun {
 namespace {

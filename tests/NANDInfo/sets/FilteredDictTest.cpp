@@ -3,13 +3,10 @@
 #include <gtest/gtest.h>
 #include <limits>
 
-#include "NANDInfo/sets/SignificantDigits.h"
-#include "NANDInfo/sets/UserCapacity.h"
-
 namespace vesprun {
 namespace {
 
-TEST(RoundSig, roundsHalfUpOnTheDigitThatIsCutOff) {
+TEST(RoundSig, RoundsHalfUpOnTheDigitThatIsCutOff) {
   constexpr std::uint64_t kMax = std::numeric_limits<std::uint64_t>::max();
   constexpr std::uint64_t kE17 = 100'000'000'000'000'000;
   constexpr std::uint64_t kE18 = 10 * kE17;
@@ -41,7 +38,7 @@ std::vector<std::string> keysOf(const PropertyDict& dict) {
   return keys;
 }
 
-TEST(FilteredDict, keepsListedEntriesInTheOrderOfTheSource) {
+TEST(FilteredDict, KeepsListedEntriesInTheOrderOfTheSource) {
   const PropertyDict source = {{"bin10", 12345}, {"c", 7}, {"b", "x"}, {"bin12", 1}, {"a", 12345}};
   const PropertyDict kept = {{"bin10", 12345}, {"b", "x"}, {"a", 12345}};
   EXPECT_EQ(CreateFilteredDict(source, &kListed), kept);
@@ -54,7 +51,7 @@ TEST(FilteredDict, keepsListedEntriesInTheOrderOfTheSource) {
   EXPECT_EQ(CreateFilteredDict_SigDig(source, nullptr, true), source);
 }
 
-TEST(FilteredDict, roundsNumbersOfEveryKindAndNothingElse) {
+TEST(FilteredDict, RoundsNumbersOfEveryKindAndNothingElse) {
   const std::pair<PropertyValue, PropertyValue> cases[] = {
       {std::int8_t{-1}, std::uint64_t{18'000'000'000'000'000'000U}},
       {std::uint32_t{4'294'967'295}, std::uint64_t{4'300'000'000}},
@@ -72,18 +69,6 @@ TEST(FilteredDict, roundsNumbersOfEveryKindAndNothingElse) {
     if (const Number* number = filtered.find("a")->number()) {
       EXPECT_EQ(number->kind(), NumberKind::UInt64);
     }
-  }
-}
-
-TEST(UserCapacity, isThePowerOfTwoAboveButFor1536) {
-  const std::pair<std::uint64_t, std::uint32_t> cases[] = {
-      {500, 0},          {1000, 1},         {1024, 2},
-      {121'856, 128},    {1'376'255, 2048}, {1'376'256, 1536},
-      {1'770'495, 1536}, {1'770'496, 2048}, {0xFFFF'FFFF, 4'194'304},
-      {0x7'0000'0400, 2}};
-  EXPECT_EQ(GetUserCapacityInGB(0), 0U);
-  for (const auto& [megabytes, gigabytes] : cases) {
-    EXPECT_EQ(GetUserCapacityInGB(megabytes), gigabytes) << megabytes;
   }
 }
 

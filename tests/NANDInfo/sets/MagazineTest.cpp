@@ -25,7 +25,7 @@ class MagazineTest : public StatisticsDevice {
   void snapshotAt(std::uint32_t hours, const Statistics& fields) {
     answer(10, hours, fields.bytes());
   }
-  /// The result between the support flag and the error text, without what the device tells.
+  /// The result between the support flag and the error text, without the device's own fields.
   std::string deltas(std::uint32_t deltaWanted, std::uint32_t mode) {
     startController();
     PropertyDict result;

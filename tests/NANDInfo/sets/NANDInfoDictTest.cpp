@@ -1,5 +1,5 @@
 #include "NANDInfo/parsers/ORUStatsContext.h"
-#include "NANDInfo/sets/NANDInfo.h"
+#include "NANDInfo/sets/NANDInfoDict.h"
 #include "common/TextForm.h"
 #include "support/ControllerTest.h"
 

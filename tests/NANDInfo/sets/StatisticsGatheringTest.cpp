@@ -1,8 +1,9 @@
 #include <algorithm>
 
+#include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/ORUStatsContext.h"
-#include "NANDInfo/parsers/StatisticsBufferBuilder.h"
-#include "NANDInfo/sets/NANDInfo.h"
+#include "NANDInfo/sets/StatisticsGathering.h"
+#include "buffers/DeviceBuffers.h"
 #include "support/ControllerTest.h"
 #include "support/WatchedRegistry.h"
 

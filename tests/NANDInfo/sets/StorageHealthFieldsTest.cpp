@@ -1,7 +1,7 @@
 #include "NANDInfo/sets/StorageHealthFields.h"
 
 #include "NANDInfo/StatisticsDevice.h"
-#include "support/SnapshotBuilder.h"
+#include "buffers/DeviceBuffers.h"
 #include "vesprun.h"
 
 namespace vesprun {

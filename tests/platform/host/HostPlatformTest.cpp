@@ -3,6 +3,7 @@
 #include <fcntl.h>
 
 #include <cerrno>
+#include <fstream>
 #include <future>
 #include <stdexcept>
 #include <thread>
@@ -38,6 +39,16 @@ TEST(HostPlatform, LogKeepsLevelsDownToTheDescribedOne) {
             "{\"time\":\"2024-03-05T09:15:02.5Z\",\"level\":\"error\",\"message\":\"first 1\"}\n"
             "{\"time\":\"2024-03-05T09:15:02.5Z\",\"level\":\"notice\","
             "\"message\":\"a \\\"quoted\\\"\\nline \xC3\xA9\"}\n");
+}
+
+TEST(HostPlatform, SaysOnStandardErrorWhatCannotBeLogged) {
+  TestDevice device("{}");
+  device.write("outbox", "");
+  testing::internal::CaptureStderr();
+  logMessage(LogLevel::Error, "a \x1B line\n");
+  EXPECT_THAT(testing::internal::GetCapturedStderr(),
+              testing::MatchesRegex(
+                  "vesprun: a \\\\x1b line \\(not logged: /[^\n]*/outbox: File exists\\)\n"));
 }
 
 TEST(HostKernel, ReadsOnlyVariablesOfTheAskedWidth) {

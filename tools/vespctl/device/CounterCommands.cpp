@@ -8,7 +8,7 @@
 
 #include "Command.h"
 #include "Complaints.h"
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/host/counters/CounterLines.h"
 #include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/QuotedText.h"
@@ -139,6 +139,10 @@ void importLines(const CounterArguments& arguments) {
     if (std::exchange(isRepeated, true)) {
       lines.clear();
       if (!lines.seekg(0)) {
+        // Lines from a pipe are gone. Whether the database is damaged, reading it can tell as well.
+        using Days = std::numeric_limits<std::int32_t>;
+        const auto ignore = [](std::string_view) { return true; };
+        exportCounterLines(store, Days::min(), Days::max(), ignore, error);
         error = "import again";
         return false;
       }

@@ -197,7 +197,9 @@ void addMessageCommands(CLI::App& vespctl) {
   }
 
   CLI::App* daily = send->add_subcommand("daily", "Asks for the daily tasks of a day");
-  daily->add_option("DAY", arguments->day, "The day number")->required();
+  daily->add_option("DAY", arguments->day, "The day number")
+      ->required()
+      ->transform(decimal<std::int64_t>());
   daily->callback([arguments] { sendDocument(arguments->device, dailyDocument(arguments->day)); });
 
   CLI::App* raw = send->add_subcommand("raw", "Sends a ptree document as it is");

@@ -6,8 +6,9 @@
 #include <iomanip>
 #include <string>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "common/TextForm.h"
+#include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {
 namespace {
@@ -24,13 +25,13 @@ std::string text(const PropertyDict& log, const char* key) {
   if (value == nullptr) {
     return "(absent)";
   }
-  return value->date() != nullptr ? dateText(*value->date()) : textForm(*value);
+  return value->date() != nullptr ? dateText(*value->date()) : printableText(textForm(*value));
 }
 
 std::size_t longestKey(const PropertyDict& dict) {
   std::size_t longest = 0;
   for (const auto& entry : dict) {
-    longest = std::max(longest, entry.first.size());
+    longest = std::max(longest, printableText(entry.first).size());
   }
   return longest;
 }
@@ -39,7 +40,8 @@ void showEntries(std::ostream& out, const char* title, const PropertyDict& entri
   out << "\n  " << title << " (" << entries.size() << ")\n";
   const auto width = static_cast<int>(longestKey(entries));
   for (const auto& [key, value] : entries) {
-    out << "    " << std::left << std::setw(width) << key << "  " << textForm(value) << '\n';
+    out << "    " << std::left << std::setw(width) << printableText(key) << "  "
+        << printableText(textForm(value)) << '\n';
   }
 }
 
@@ -66,8 +68,8 @@ void showHistogram(std::ostream& out, const PropertyDict& histogram) {
     // Also a log that is not ours is shown: its counts may be anything.
     const double share = value > 0 ? value / largest : 0.0;
     const auto length = share <= 1 ? static_cast<std::size_t>(std::ceil(share * kLongestBar)) : 0;
-    out << "      " << std::right << std::setw(width) << label << "  " << std::string(length, '#')
-        << ' ' << textForm(count) << '\n';
+    out << "      " << std::right << std::setw(width) << printableText(label) << "  "
+        << std::string(length, '#') << ' ' << printableText(textForm(count)) << '\n';
   }
 }
 
@@ -80,7 +82,7 @@ void showDistributions(std::ostream& out, const PropertyDict& distributions,
     }
     const PropertyArray& statistics = *value.array();
     const double count = figure(statistics, 4);
-    out << "    " << key << "\n      count " << rounded(count) << ", min "
+    out << "    " << printableText(key) << "\n      count " << rounded(count) << ", min "
         << rounded(figure(statistics, 0)) << ", mean " << rounded(figure(statistics, 2)) << ", max "
         << rounded(figure(statistics, 1)) << ", standard deviation "
         << rounded(count > 0 ? std::sqrt(figure(statistics, 3) / count) : 0.0) << '\n';
@@ -95,7 +97,7 @@ void showDailyLog(std::ostream& out, const PropertyDict& log) {
       << text(log, "TBLogCreationDate") << "\n  whitelist  " << text(log, "TBWhitelistDigest")
       << "\n  tasking    " << text(log, "TBTaskID") << ", " << text(log, "TBTaskDigest") << '\n';
   if (const PropertyValue* apps = log.find("TBActivatedAppInfo")) {
-    out << "  apps       " << textForm(*apps) << '\n';
+    out << "  apps       " << printableText(textForm(*apps)) << '\n';
   }
   showEntries(out, "Metadata", section(log, "TBMetadata"));
   showEntries(out, "Scalars", section(log, "TBScalars"));

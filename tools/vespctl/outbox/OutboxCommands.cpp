@@ -10,6 +10,8 @@
 #include "outbox/DailyLogView.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeReader.h"
+#include "platform/host/documents/QuotedText.h"
+#include "platform/host/files/FolderNames.h"
 #include "platform/host/files/WholeFile.h"
 
 namespace vesprun {
@@ -17,7 +19,7 @@ namespace {
 
 std::string entryText(const PropertyDict& line, const char* key) {
   const PropertyValue* value = line.find(key);
-  return value != nullptr ? textForm(*value) : "";
+  return value != nullptr ? printableText(textForm(*value)) : "";
 }
 
 /// One shown line for each line of the file; what cannot be read is said where it stands.
@@ -53,7 +55,7 @@ void showEvents(const DeviceDirectory& directory, bool inFull) {
               << (fields != nullptr ? fields->size() : 0) << " fields\n";
     if (inFull && fields != nullptr) {
       for (const auto& [key, value] : *fields) {
-        std::cout << "    " << key << " = " << textForm(value) << '\n';
+        std::cout << "    " << printableText(key + " = " + textForm(value)) << '\n';
       }
     }
   });
@@ -77,7 +79,7 @@ void showRecords(const DeviceDirectory& directory, bool inFull) {
     const PropertyValue* value = line.find("record");
     const PropertyDict* record = value != nullptr ? value->dict() : nullptr;
     std::cout << entryText(line, "time") << "  type " << entryText(line, "type") << "  "
-              << (record != nullptr ? recordText(*record, inFull) : "") << '\n';
+              << (record != nullptr ? printableText(recordText(*record, inFull)) : "") << '\n';
   });
 }
 
@@ -89,10 +91,11 @@ void showNotifications(const DeviceDirectory& directory) {
 
 void showSystemLog(const DeviceDirectory& directory) {
   showLines(directory.hostPath("outbox/log.jsonl"), [](const PropertyDict& line) {
-    std::string message = entryText(line, "message");
+    const PropertyValue* value = line.find("message");
+    std::string message = value != nullptr ? textForm(*value) : "";
     message.erase(message.find_last_not_of('\n') + 1);  // some messages end their own line
-    std::cout << entryText(line, "time") << "  " << entryText(line, "level") << "  " << message
-              << '\n';
+    std::cout << entryText(line, "time") << "  " << entryText(line, "level") << "  "
+              << printableText(message) << '\n';
   });
 }
 
@@ -105,7 +108,7 @@ void showText(const std::string& content, bool inFull) {
     std::istringstream parts(line);
     const char* indentation = "  ";
     for (std::string part; std::getline(parts, part, ';');) {
-      fields.push_back(std::exchange(indentation, "    ") + part);
+      fields.push_back(std::exchange(indentation, "    ") + printableText(part));
     }
   }
   const std::size_t shown = inFull ? fields.size() : std::min(fields.size(), kShownFields);
@@ -118,7 +121,7 @@ void showText(const std::string& content, bool inFull) {
 }
 
 void showLog(const std::filesystem::path& file, bool inFull) {
-  std::cout << file.filename().string() << '\n';
+  std::cout << printableText(file.filename().string()) << '\n';
   std::string error;
   const std::optional<std::string> content = readWholeFile(file, error);
   if (!content) {
@@ -129,7 +132,7 @@ void showLog(const std::filesystem::path& file, bool inFull) {
   std::string headerError;
   if (const std::optional<std::string> text = readWholeFile(header, headerError)) {
     const std::optional<PropertyValue> value = valueFromJsonText(*text, headerError);
-    std::cout << "  header     " << (value ? textForm(*value) : headerError) << '\n';
+    std::cout << "  header     " << printableText(value ? textForm(*value) : headerError) << '\n';
   }
   if (file.extension() != ".ptree") {
     showText(*content, inFull);
@@ -139,28 +142,22 @@ void showLog(const std::filesystem::path& file, bool inFull) {
   if (log && log->dict() != nullptr) {
     showDailyLog(std::cout, *log->dict());
   } else {
-    std::cout << "  cannot be read: " << (log ? "not a dictionary" : error) << '\n';
+    std::cout << "  cannot be read: " << printableText(log ? "not a dictionary" : error) << '\n';
   }
 }
 
 void showLogs(const DeviceDirectory& directory, bool inFull) {
   const std::string folder = directory.hostPath("outbox/logs");
-  std::vector<std::filesystem::path> files;
-  std::error_code error;
-  for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
-       entry.increment(error)) {
-    const std::filesystem::path extension = entry->path().extension();
-    if (entry->path().filename().string().front() != '.' &&
-        (extension == ".ptree" || extension == ".log")) {
-      files.push_back(entry->path());
+  std::string error;
+  const std::optional<std::vector<std::string>> names = namesInFolder(folder, error);
+  if (!names) {
+    throw CommandFailure(error);
+  }
+  for (const std::string& name : *names) {
+    const std::filesystem::path file = folder + '/' + name;
+    if (name.front() != '.' && (file.extension() == ".ptree" || file.extension() == ".log")) {
+      showLog(file, inFull);
     }
-  }
-  if (error && error != std::errc::no_such_file_or_directory) {
-    throw CommandFailure(folder + ": " + error.message());
-  }
-  std::sort(files.begin(), files.end());
-  for (const std::filesystem::path& file : files) {
-    showLog(file, inFull);
   }
 }
 

@@ -9,7 +9,7 @@
 #include <system_error>
 
 #include "Command.h"
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeReader.h"
 #include "platform/host/files/WholeFile.h"

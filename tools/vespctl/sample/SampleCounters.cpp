@@ -1,5 +1,6 @@
 #include "sample/SampleCounters.h"
 
+#include <algorithm>
 #include <chrono>
 #include <fstream>
 #include <sstream>
@@ -8,95 +9,91 @@
 namespace vesprun {
 namespace {
 
-/// /proc/meminfo: "MemTotal:       16384256 kB".
-void readMemory(std::vector<ScalarReading>& readings) {
-  std::ifstream stream("/proc/meminfo");
-  std::string name;
-  std::int64_t value = 0;
+/// Calls `take` with the words of every line of a file of the kernel.
+template <typename Take>
+void forEachLine(const char* file, const Take& take) {
+  std::ifstream stream(file);
   for (std::string line; std::getline(stream, line);) {
-    if (std::istringstream(line) >> name >> value && name.back() == ':') {
-      name.pop_back();
-      readings.push_back({"host.memory." + name, value});
-    }
+    std::istringstream words(line);
+    take(words);
   }
 }
 
-/// /proc/diskstats: major, minor and name, then reads, merged reads, sectors read, ms reading,
-/// writes, merged writes, sectors written, ms writing.
-void readDisks(std::vector<ScalarReading>& readings) {
-  std::ifstream stream("/proc/diskstats");
-  for (std::string line; std::getline(stream, line);) {
-    std::istringstream fields(line);
-    int major = 0;
-    int minor = 0;
+/// "MemTotal:       16384256 kB".
+void readMemory(std::vector<ScalarReading>& readings) {
+  forEachLine("/proc/meminfo", [&](std::istream& words) {
     std::string name;
-    std::int64_t reads = 0;
-    std::int64_t readsMerged = 0;
-    std::int64_t sectorsRead = 0;
-    std::int64_t millisecondsReading = 0;
-    std::int64_t writes = 0;
-    std::int64_t writesMerged = 0;
-    std::int64_t sectorsWritten = 0;
-    if (fields >> major >> minor >> name >> reads >> readsMerged >> sectorsRead >>
-            millisecondsReading >> writes >> writesMerged >> sectorsWritten &&
-        reads + writes > 0) {
-      readings.push_back({"host.disk." + name + ".reads", reads});
-      readings.push_back({"host.disk." + name + ".sectorsRead", sectorsRead});
-      readings.push_back({"host.disk." + name + ".writes", writes});
-      readings.push_back({"host.disk." + name + ".sectorsWritten", sectorsWritten});
+    std::int64_t value = 0;
+    if (words >> name >> value && name.back() == ':') {
+      name.pop_back();
+      readings.push_back({"host.memory." + name, value});
     }
-  }
+  });
+}
+
+/// Major, minor and name, then reads, merged reads, sectors read, ms reading, writes, merged
+/// writes, sectors written, ms writing.
+void readDisks(std::vector<ScalarReading>& readings) {
+  forEachLine("/proc/diskstats", [&](std::istream& words) {
+    std::string skipped;
+    std::string name;
+    std::int64_t figures[7] = {};
+    words >> skipped >> skipped >> name;
+    for (std::int64_t& figure : figures) {
+      words >> figure;
+    }
+    if (words && figures[0] + figures[4] > 0) {
+      const std::string key = "host.disk." + name;
+      readings.push_back({key + ".reads", figures[0]});
+      readings.push_back({key + ".sectorsRead", figures[2]});
+      readings.push_back({key + ".writes", figures[4]});
+      readings.push_back({key + ".sectorsWritten", figures[6]});
+    }
+  });
 }
 
 std::int64_t availableMemory() {
   std::vector<ScalarReading> readings;
   readMemory(readings);
-  for (const auto& [key, value] : readings) {
-    if (key == "host.memory.MemAvailable") {
-      return value;
-    }
-  }
-  return 0;
+  const auto found = std::ranges::find(readings, "host.memory.MemAvailable", &ScalarReading::key);
+  return found != readings.end() ? found->value : 0;
 }
 
 std::int64_t contextSwitches() { return readSchedulerFigure("ctxt").value_or(0); }
 
 }  // namespace
 
-// /proc/net/dev: "  eth0: bytes packets ..." with eight figures received, then those sent.
+// "  eth0: bytes packets ..." with eight figures received, then those sent.
 std::vector<InterfaceReading> readInterfaces() {
   std::vector<InterfaceReading> interfaces;
-  std::ifstream stream("/proc/net/dev");
-  for (std::string line; std::getline(stream, line);) {
-    const auto colon = line.find(':');
-    if (colon == std::string::npos) {
-      continue;  // the headings
-    }
-    std::istringstream words(line.substr(0, colon) + ' ' + line.substr(colon + 1));
+  forEachLine("/proc/net/dev", [&](std::istream& words) {
     std::string name;
     std::int64_t figures[9] = {};
-    words >> name;
+    words >> std::ws;
+    if (!std::getline(words, name, ':') || words.eof()) {
+      return;  // the headings
+    }
     for (std::int64_t& figure : figures) {
       words >> figure;
     }
     if (words) {
       interfaces.push_back({name, figures[0], figures[8]});
     }
-  }
+  });
   return interfaces;
 }
 
-// A line of /proc/stat such as "ctxt 123456".
+// A line such as "ctxt 123456".
 std::optional<std::int64_t> readSchedulerFigure(std::string_view name) {
-  std::ifstream stream("/proc/stat");
-  std::string found;
-  std::int64_t value = 0;
-  for (std::string line; std::getline(stream, line);) {
-    if (std::istringstream(line) >> found >> value && found == name) {
-      return value;
+  std::optional<std::int64_t> figure;
+  forEachLine("/proc/stat", [&](std::istream& words) {
+    std::string found;
+    std::int64_t value = 0;
+    if (words >> found >> value && found == name) {
+      figure = value;
     }
-  }
-  return std::nullopt;
+  });
+  return figure;
 }
 
 std::vector<ScalarReading> readKernelCounters() {

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/host/device/DeviceDirectory.h"
 
 namespace vesprun {

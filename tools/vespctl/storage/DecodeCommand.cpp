@@ -10,73 +10,63 @@
 #include "NANDInfo/parsers/ORUFTLParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
+#include "NANDInfo/parsers/ORUStatKeyTable.h"
 #include "NANDInfo/parsers/VendorCounterParsers.h"
 #include "common/LittleEndian.h"
+#include "platform/host/documents/JsonForm.h"
 
 namespace vesprun {
 namespace {
 
 using Buffer = std::span<const std::uint8_t>;
 
-PropertyValue numbersOf(std::span<const std::uint64_t> numbers) {
-  return PropertyArray(numbers.begin(), numbers.end());
-}
-
-PropertyDict decoded(PropertyValue result, const GenericParserCxt& fields) {
-  PropertyArray pairs;
-  pairs.reserve(fields.size());
+/// Field by field: there can be a million. Names need no escape in JSON.
+void printFields(const PropertyValue& result, const GenericParserCxt& fields) {
+  std::cout << "{\"result\":" << jsonText(result)
+            << ",\"error\":" << jsonText(PropertyValue(GetAPIErrorMessage())) << ",\"fields\":[";
+  const char* separator = "";
   for (const GenericParserCxt::Field field : fields) {
-    pairs.emplace_back(PropertyArray{field.name, field.value});
+    std::cout << separator << "[\"" << field.name << "\"," << field.value << ']';
+    separator = ",";
   }
-  return {
-      {"result", std::move(result)}, {"error", GetAPIErrorMessage()}, {"fields", std::move(pairs)}};
+  std::cout << ']';
 }
 
-PropertyDict decodeBase(Buffer buffer) {
+void decodeBase(Buffer buffer) {
   ORUStatsContext ctx;
   const bool result = ORUParseBufferToCxt(ctx, buffer);
-  PropertyDict answer = decoded(result, ctx.fields);
-  answer.set("summary",
-             PropertyDict{{"exportVersion", ctx.exportVersion},
-                          {"driverVersion", ctx.driverVersion},
-                          {"numVirtualBlocks", ctx.numVirtualBlocks},
-                          {"blocksPerVirtualBlock", ctx.blocksPerVirtualBlock},
-                          {"pagesPerVirtualBlock", ctx.pagesPerVirtualBlock},
-                          {"bytesPerPage", ctx.bytesPerPage},
-                          {"hostReads", ctx.hostReads},
-                          {"hostWrites", ctx.hostWrites},
-                          {"numFreeVirtualBlocks", ctx.numFreeVirtualBlocks},
-                          {"wearLevMoves", ctx.wearLevMoves},
-                          {"nandReads", ctx.nandReads},
-                          {"nandWrites", ctx.nandWrites},
-                          {"bandErases", ctx.bandErases},
-                          {"IND_pool_free", ctx.IND_pool_free},
-                          {"IND_pool_count", ctx.IND_pool_count},
-                          {"utilFormatTime", ctx.utilFormatTime},
-                          {"numSleepOps", ctx.numSleepOps},
-                          {"maxHighEnduranceBlockErases", ctx.maxHighEnduranceBlockErases},
-                          {"readCountHisto", numbersOf(ctx.readCountHisto)}});
-  return answer;
+  PropertyDict summary;
+  for (const ORUSummaryField& field : kORUSummaryFields) {
+    summary.set(findORUStatKey(field.id)->name, field.get(ctx));
+    if (field.narrow == &ORUStatsContext::exportVersion) {
+      summary.set("driverVersion", ctx.driverVersion);
+    }
+  }
+  summary.set("readCountHisto",
+              PropertyArray(ctx.readCountHisto.begin(), ctx.readCountHisto.end()));
+  printFields(result, ctx.fields);
+  std::cout << ",\"summary\":" << jsonText(summary) << "}\n";
 }
 
 template <auto parse>
-PropertyDict decodeGeneric(Buffer buffer) {
+void decodeGeneric(Buffer buffer) {
   GenericParserCxt ctx;
   const std::uint32_t result = parse(ctx, buffer);
-  return decoded(result, ctx);
+  printFields(result, ctx);
+  std::cout << "}\n";
 }
 
 template <auto parse>
-PropertyDict decodeCounters(Buffer buffer) {
+void decodeCounters(Buffer buffer) {
   NandChannelCounters counters{};
   parse(buffer.first<kCounterRegionSize>(), counters);
-  return {{"words", PropertyArray(counters.begin(), counters.end())}};
+  printJson(PropertyDict{{"words", PropertyArray(counters.begin(), counters.end())}});
 }
 
 struct Layout {
   const char* name;
-  PropertyDict (*decode)(Buffer buffer);
-  std::size_t size = 0;  ///< bytes that the file must have; 0: any number but none
+  void (*decode)(Buffer buffer);
+  std::size_t size = 0;  ///< bytes that the file must have; 0: any number
 };
 
 constexpr Layout kLayouts[] = {
@@ -131,9 +121,6 @@ void decode(const Arguments& arguments) {
     throw CLI::ValidationError("--thread", "goes with the layout snapshot, which needs it");
   }
   const std::string content = readInput(arguments.file);
-  if (content.empty()) {
-    throw CommandFailure(inputName(arguments.file) + ": is empty");
-  }
   const Buffer buffer(reinterpret_cast<const std::uint8_t*>(content.data()), content.size());
   if (isSnapshot) {
     printSnapshot(buffer, *arguments.thread);
@@ -143,7 +130,7 @@ void decode(const Arguments& arguments) {
     throw CommandFailure(inputName(arguments.file) + ": has " + std::to_string(buffer.size()) +
                          " bytes, not " + std::to_string(layout->size));
   }
-  printJson(layout->decode(buffer));
+  layout->decode(buffer);
 }
 
 }  // namespace

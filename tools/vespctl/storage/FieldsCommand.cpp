@@ -1,10 +1,10 @@
 #include <algorithm>
 #include <functional>
 #include <iostream>
-#include <sstream>
 #include <vector>
 
 #include "Command.h"
+#include "NANDInfo/parsers/NandChannelCounters.h"
 #include "NANDInfo/parsers/ORUMSPKeyTable.h"
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
 #include "NANDInfo/tables/EventFields.h"
@@ -15,64 +15,63 @@
 namespace vesprun {
 namespace {
 
-/// The words that ask for a list, and its rows as text.
+/// The words that ask for a list, and what prints its rows.
 struct List {
   std::string name;
-  std::function<std::string()> rows;
+  std::function<void()> print;
 };
 
-std::string statKeys() {
-  std::ostringstream rows;
+void printNames(const FieldTable& table) {
+  table.forEach([](std::string_view name, const FieldRange&) { std::cout << name << '\n'; });
+}
+
+void printDigits(const FieldTable& table) {
+  table.forEach([](std::string_view name, const FieldRange& range) {
+    std::cout << name << '\t' << int{range.digits} << '\n';
+  });
+}
+
+void printStatKeys() {
   for (const ORUStatKey& key : ORUStatKeyTable) {
-    rows << key.id << '\t' << key.name << '\t' << key.count << '\n';
+    std::cout << key.id << '\t' << key.name << '\t' << key.count << '\n';
   }
-  return rows.str();
 }
 
-std::string mspKeys() {
-  std::ostringstream rows;
+void printMSPKeys() {
   for (const ORUMSPKey& key : ORUMSPKeyTable) {
-    rows << key.key << '\t' << key.name << '\t' << key.count << '\t' << key.width() << '\n';
+    std::cout << key.key << '\t' << key.name << '\t' << key.count << '\t' << key.width() << '\n';
   }
-  return rows.str();
 }
 
-std::string namesIn(const FieldTable& table) {
-  std::string rows;
-  table.forEach([&](std::string_view name, const FieldRange&) { rows.append(name) += '\n'; });
-  return rows;
+void printCounterFields() {
+  for (const CounterField& field : kCounterFields) {
+    if (!field.name.empty()) {
+      std::cout << field.first << '\t' << field.name << '\t' << field.count << '\n';
+    }
+  }
 }
 
-std::string digitsIn(const FieldTable& table) {
-  std::string rows;
-  table.forEach([&](std::string_view name, const FieldRange& range) {
-    rows.append(name) += '\t' + std::to_string(range.digits) + '\n';
+void printLegacyKeys() {
+  keyMap.forEach([](std::string_view name, const FieldRange&) {
+    std::cout << name << '\t' << legacyKeyOf(name).value() << '\n';
   });
-  return rows;
-}
-
-std::string legacyKeys() {
-  std::string rows;
-  keyMap.forEach([&](std::string_view name, const FieldRange&) {
-    rows.append(name) += '\t' + legacyKeyOf(name).value() + '\n';
-  });
-  return rows;
 }
 
 std::vector<List> lists() {
   std::vector<List> lists = {
-      {"stat-keys", statKeys},
-      {"msp-keys", mspKeys},
-      {"legacy-key-map", legacyKeys},
-      {"ftl-digits", [] { return digitsIn(WhitelistedRawNANDFTLCounters_SigDigDict); }},
-      {"msp-digits", [] { return digitsIn(WhitelistedRawNANDMSPCounters_SigDigDict); }},
-      {"storage-stats-digits", [] { return digitsIn(WhitelistedStorageStats_SigDigDict); }},
-      {"ftl-stats-for-msp", [] { return namesIn(FTLStats4MSPStats); }},
-      {"magazine-accumulating", [] { return namesIn(PrivacyApprovedSMagNANDFTLCounters_Accum); }},
-      {"magazine-dynamic", [] { return namesIn(PrivacyApprovedSMagNANDFTLCounters_Dynamic); }}};
-  for (const EventFields& event : EventHubConfigDetails) {
+      {"stat-keys", printStatKeys},
+      {"msp-keys", printMSPKeys},
+      {"counter-record", printCounterFields},
+      {"legacy-key-map", printLegacyKeys},
+      {"ftl-digits", [] { printDigits(WhitelistedRawNANDFTLCounters_SigDigDict); }},
+      {"msp-digits", [] { printDigits(WhitelistedRawNANDMSPCounters_SigDigDict); }},
+      {"storage-stats-digits", [] { printDigits(WhitelistedStorageStats_SigDigDict); }},
+      {"ftl-stats-for-msp", [] { printNames(FTLStats4MSPStats); }},
+      {"magazine-accumulating", [] { printNames(PrivacyApprovedSMagNANDFTLCounters_Accum); }},
+      {"magazine-dynamic", [] { printNames(PrivacyApprovedSMagNANDFTLCounters_Dynamic); }}};
+  for (const StorageEvent& event : EventHubConfigDetails) {
     lists.push_back(
-        {"event " + std::string(event.event), [table = event.fields] { return namesIn(*table); }});
+        {"event " + std::string(event.event), [table = event.fields] { printNames(*table); }});
   }
   return lists;
 }
@@ -91,7 +90,7 @@ void printList(const std::string& name) {
   if (list == known.end()) {
     throw CLI::ValidationError("LIST", "there is no list \"" + name + '"');
   }
-  std::cout << list->rows();
+  list->print();
 }
 
 }  // namespace

@@ -5,12 +5,10 @@
 
 #include "Command.h"
 #include "NANDInfo/controller/NandExporter.h"
-#include "NANDInfo/events/EventExtraction.h"
 #include "NANDInfo/lists/StructuredLog.h"
 #include "NANDInfo/lists/StructuredLogState.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/sets/HealthSets.h"
-#include "NANDInfo/sets/NANDInfo.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/files/FileDescriptor.h"
 #include "platform/host/files/SystemError.h"
@@ -92,11 +90,14 @@ constexpr NandVerb kVerbs[] = {
      [](const NandArguments&) { return valueOf(CopyVMFreezerNANDInfo()); }},
     {"magazine", "What happened since a snapshot of the stats magazine",
      [](CLI::App& verb, NandArguments& arguments) {
-       verb.add_option("HOURS", arguments.hours, "How long ago the snapshot was taken")->required();
+       verb.add_option("HOURS", arguments.hours, "How long ago the snapshot was taken")
+           ->required()
+           ->transform(decimal<std::uint64_t>());
        verb.add_flag("--raw", arguments.raw,
                      "The counters as the snapshot has them, not what they grew by");
        verb.add_option("--mode", arguments.mode,
-                       "0: counters that accumulate, 1: instantaneous values, 2: both");
+                       "0: counters that accumulate, 1: instantaneous values, 2: both")
+           ->transform(decimal<std::uint32_t>());
      },
      [](const NandArguments& arguments) {
        return valueOf(CopySMagNANDFTLInfo(arguments.hours, arguments.raw ? 0 : 1, arguments.mode));
@@ -115,7 +116,8 @@ constexpr NandVerb kVerbs[] = {
      }},
     {"events", "Sends the storage statistics as analytics events, and shows what was sent",
      [](CLI::App& verb, NandArguments& arguments) {
-       verb.add_option("--from-step", arguments.fromStep, "The step to begin with, 0 to 6");
+       verb.add_option("--from-step", arguments.fromStep, "The step to begin with, 0 to 6")
+           ->transform(decimal<std::uint32_t>());
        verb.add_flag("--no-monthly", arguments.noMonthly, "Leaves out the step of a month");
      },
      [](const NandArguments& arguments) {

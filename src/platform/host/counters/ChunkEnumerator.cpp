@@ -2,29 +2,23 @@
 
 #include <bit>
 #include <cstring>
-#include <span>
 
 namespace vesprun {
 
 static_assert(std::endian::native == std::endian::little, "chunks are little-endian");
 
-ChunkEnumerator::ChunkEnumerator(const SqliteConnection& connection)
-    : _connection(connection),
-      _chunks(connection,
-              "SELECT samples, sequence FROM chunk WHERE distribution = ? ORDER BY sequence") {}
-
 void ChunkEnumerator::start(std::int64_t distribution) {
   _distribution = distribution;
-  _chunks.reset();
-  _chunks.bind(1, distribution);
+  _placedAt = -1;
+  _sequence = 0;
   _next = _count = 0;
-  _nextSequence = 0;
+  _taken = 0;
   _exhausted = false;
 }
 
 void ChunkEnumerator::rethrowFailure() const {
   if (_failure) {
-    std::rethrow_exception(_failure);
+    throw *_failure;
   }
 }
 
@@ -40,8 +34,9 @@ bool ChunkEnumerator::getNextValueSecondsInDayOffset(double& value, std::int32_t
       if (secondsInDay != nullptr) {
         loadOffsets();
       }
-    } catch (const SqliteFailure&) {
-      _failure = std::current_exception();
+    } catch (const SqliteFailure& failure) {
+      _failure = SqliteFailure{failure.code, failure.text + ", after " + std::to_string(_taken) +
+                                                 " values of the last of"};
       return false;
     }
   }
@@ -50,43 +45,83 @@ bool ChunkEnumerator::getNextValueSecondsInDayOffset(double& value, std::int32_t
     std::memcpy(secondsInDay, _offsets + _next * sizeof *secondsInDay, sizeof *secondsInDay);
   }
   ++_next;
+  ++_taken;
   return true;
 }
 
+// `length` knows the size of a column without reading it.
+std::span<const std::uint8_t> ChunkEnumerator::chunk(std::int64_t sequence) {
+  const SqliteConnection& connection = _store.connection();
+  if (_opening != _store.opening()) {
+    _chunks.emplace(connection,
+                    "SELECT samples, sequence, length(offsets) FROM chunk "
+                    "WHERE distribution = ? AND sequence >= ? ORDER BY sequence");
+    _chunkOffsets.reset();
+    _opening = _store.opening();
+    _placedAt = -1;
+  }
+  if (_placedAt != sequence) {
+    _chunks->reset();
+    _chunks->bind(1, _distribution).bind(2, sequence);
+  }
+  _placedAt = sequence + 1;
+  if (!_chunks->step()) {
+    return {};
+  }
+  const std::span<const std::uint8_t> values = _chunks->bytes(0);
+  if (_chunks->integer(1) != sequence) {
+    connection.failAsCorrupt("a chunk of samples is missing");
+  }
+  const std::size_t count = values.size() / sizeof(double);
+  if (count == 0 || values.size() % sizeof(double) != 0 ||
+      _chunks->integer(2) != static_cast<std::int64_t>(count * sizeof(std::int32_t))) {
+    connection.failAsCorrupt("a chunk of samples has a wrong length");
+  }
+  return values;
+}
+
 bool ChunkEnumerator::loadChunk() {
-  do {
-    if (_exhausted || !_chunks.step()) {
-      _exhausted = true;
-      return false;
+  const auto values = _store.readTwice([this] {
+    const auto found = _exhausted ? std::span<const std::uint8_t>() : chunk(_sequence);
+    if (!found.empty() && _sequence != 0 && _count != CounterStore::kSamplesPerChunk) {
+      _store.connection().failAsCorrupt("a chunk of samples is too short");
     }
-    const std::span<const std::uint8_t> values = _chunks.bytes(0);
-    if (values.size() % sizeof(double) != 0) {
-      _connection.failAsCorrupt("a chunk of samples has a wrong length");
-    }
-    if (_chunks.integer(1) != _nextSequence++) {
-      _connection.failAsCorrupt("a chunk of samples is missing");
-    }
-    _values = values.data();
-    _offsets = nullptr;
-    _count = values.size() / sizeof(double);
-    _next = 0;
-  } while (_count == 0);
+    return found;
+  });
+  _exhausted = values.empty();
+  if (_exhausted) {
+    return false;
+  }
+  _values = values.data();
+  _offsets = nullptr;
+  _count = values.size() / sizeof(double);
+  _next = 0;
+  ++_sequence;
   return true;
 }
 
 // By a statement of their own: a column that a row names is read with the row.
 void ChunkEnumerator::loadOffsets() {
-  if (!_chunkOffsets) {
-    _chunkOffsets.emplace(_connection,
-                          "SELECT offsets FROM chunk WHERE distribution = ? AND sequence = ?");
-  }
-  _chunkOffsets->reset();
-  const bool found = _chunkOffsets->bind(1, _distribution).bind(2, _chunks.integer(1)).step();
-  const auto offsets = found ? _chunkOffsets->bytes(0) : std::span<const std::uint8_t>();
-  if (offsets.size() != _count * sizeof(std::int32_t)) {
-    _connection.failAsCorrupt("a chunk of offsets has a wrong length");
-  }
-  _offsets = offsets.data();
+  _offsets = _store.readTwice([this] {
+    if (_opening != _store.opening()) {  // the values went with the earlier connection
+      const auto values = chunk(_sequence - 1);
+      if (values.size() != _count * sizeof(double)) {
+        _store.connection().failAsCorrupt("a chunk of samples changes while it is read");
+      }
+      _values = values.data();
+    }
+    if (!_chunkOffsets) {
+      _chunkOffsets.emplace(_store.connection(),
+                            "SELECT offsets FROM chunk WHERE distribution = ? AND sequence = ?");
+    }
+    _chunkOffsets->reset();
+    const bool found = _chunkOffsets->bind(1, _distribution).bind(2, _sequence - 1).step();
+    const auto offsets = found ? _chunkOffsets->bytes(0) : std::span<const std::uint8_t>();
+    if (offsets.size() != _count * sizeof(std::int32_t)) {
+      _store.connection().failAsCorrupt("a chunk of offsets has a wrong length");
+    }
+    return offsets.data();
+  });
 }
 
 }  // namespace vesprun

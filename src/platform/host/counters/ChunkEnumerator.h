@@ -2,19 +2,19 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <exception>
 #include <optional>
+#include <span>
 
 #include "platform/Tallybook.h"
-#include "platform/host/counters/SqliteConnection.h"
+#include "platform/host/counters/CounterStore.h"
 
 namespace vesprun {
 
 /// Takes the values out of the chunks of one distribution after another.
 class ChunkEnumerator final : public TBHistoryDistributionEnumerator {
  public:
-  /// `connection` must outlive the object. Throws `SqliteFailure`.
-  explicit ChunkEnumerator(const SqliteConnection& connection);
+  /// `store` must outlive the object.
+  explicit ChunkEnumerator(CounterStore& store) : _store(store) {}
 
   /// Begins with the distribution of that row number.
   void start(std::int64_t distribution);
@@ -23,23 +23,28 @@ class ChunkEnumerator final : public TBHistoryDistributionEnumerator {
   /// values knows nothing of SQLite.
   bool getNextValueSecondsInDayOffset(double& value, std::int32_t* secondsInDay) override;
 
+  /// Throws that failure; its text then says how many values came before.
   void rethrowFailure() const;
 
  private:
+  std::span<const std::uint8_t> chunk(std::int64_t sequence);
   bool loadChunk();
   void loadOffsets();
 
-  const SqliteConnection& _connection;
-  SqliteStatement _chunks;
+  CounterStore& _store;
+  int _opening = 0;  ///< the one of the store that the statements belong to
+  std::optional<SqliteStatement> _chunks;
+  std::int64_t _placedAt = -1;                   ///< the chunk that its next step leads to
   std::optional<SqliteStatement> _chunkOffsets;  ///< made when someone asks for an offset
   std::int64_t _distribution = 0;
-  std::int64_t _nextSequence = 0;
+  std::int64_t _sequence = 0;  ///< of the next chunk
   const std::uint8_t* _values = nullptr;
   const std::uint8_t* _offsets = nullptr;
   std::size_t _next = 0;
   std::size_t _count = 0;
+  std::uint64_t _taken = 0;  ///< of all chunks
   bool _exhausted = true;
-  std::exception_ptr _failure;
+  std::optional<SqliteFailure> _failure;
 };
 
 }  // namespace vesprun

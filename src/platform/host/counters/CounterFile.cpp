@@ -33,7 +33,7 @@ bool exists(const std::string& path) {
 
 bool CounterFile::write(const std::function<bool(CounterStore&)>& work, std::string& error,
                         std::optional<Damage>& damage) {
-  return use(SqliteTransaction::Kind::Writing, work, error, damage);
+  return use(CounterStore::Access::Writing, work, error, damage);
 }
 
 bool CounterFile::read(const std::function<void(CounterStore&)>& work, std::string& error,
@@ -42,12 +42,12 @@ bool CounterFile::read(const std::function<void(CounterStore&)>& work, std::stri
     work(store);
     return true;
   };
-  return use(SqliteTransaction::Kind::Reading, reading, error, damage);
+  return use(CounterStore::Access::Reading, reading, error, damage);
 }
 
-bool CounterFile::use(SqliteTransaction::Kind kind, const std::function<bool(CounterStore&)>& work,
+bool CounterFile::use(CounterStore::Access access, const std::function<bool(CounterStore&)>& work,
                       std::string& error, std::optional<Damage>& damage) {
-  const bool writes = kind == SqliteTransaction::Kind::Writing;
+  const bool writes = access == CounterStore::Access::Writing;
   const std::string folder = _directory.hostPath(kFolder);
   const std::string path = folder + '/' + kName;
   struct stat status {};
@@ -78,16 +78,34 @@ bool CounterFile::use(SqliteTransaction::Kind kind, const std::function<bool(Cou
     error = path + ": not a regular file";
     return false;
   }
-  try {
-    CounterStore store(path, _longestWait);
-    SqliteTransaction transaction(store.connection(), kind);
+  // SQLite would wait at a pipe for ever.
+  for (const char* companion : kCompanions) {
+    struct stat beside {};
+    if (stat((path + companion).c_str(), &beside) == 0 && !S_ISREG(beside.st_mode)) {
+      error = path + companion + ": not a regular file";
+      return false;
+    }
+  }
+  const auto attempt = [&] {
+    CounterStore store(path, _longestWait, access);
     if (!work(store)) {
       return false;
     }
     if (writes) {
-      transaction.commit();
+      store.commit();
     }
     return true;
+  };
+  try {
+    try {
+      return attempt();
+    } catch (const SqliteFailure& failure) {
+      // What reads has been read twice already.
+      if (!writes || !failure.isCorruption()) {
+        throw;
+      }
+    }
+    return attempt();
   } catch (const SqliteFailure& failure) {
     error = failure.text;
     if (failure.isCorruption()) {

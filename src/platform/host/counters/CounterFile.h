@@ -30,9 +30,10 @@ class CounterFile {
     std::string text;  ///< names the file and the trouble
   };
 
-  /// Runs `work` on the tables in one transaction; a file that is missing is made first. True when
-  /// the transaction was committed. False when `work` said so or failed, with its or our text in
-  /// `error`, and in `damage` when the file is damaged: nothing was changed.
+  /// Runs `work` on the tables in one transaction, and once more when it came across damage; a file
+  /// that is missing is made first. True when the transaction was committed. False when `work` said
+  /// so or failed, with its or our text in `error`, and in `damage` when the file was found damaged
+  /// twice: nothing was changed.
   bool write(const std::function<bool(CounterStore&)>& work, std::string& error,
              std::optional<Damage>& damage);
 
@@ -47,7 +48,7 @@ class CounterFile {
   std::optional<std::string> replace(const Damage& damage, std::string& error);
 
  private:
-  bool use(SqliteTransaction::Kind kind, const std::function<bool(CounterStore&)>& work,
+  bool use(CounterStore::Access access, const std::function<bool(CounterStore&)>& work,
            std::string& error, std::optional<Damage>& damage);
   bool make(std::string& error);
   bool makeLocked(std::string& error);

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cstring>
 #include <limits>
+#include <utility>
 
 #include "common/PropertyValue.h"
 #include "platform/host/counters/ChunkEnumerator.h"
@@ -41,35 +42,6 @@ constexpr const char* kSchema = R"(
   PRAGMA application_id = 0x56455350;
   PRAGMA user_version = 1;
 )";
-
-/// Gives `deliver` the rows of day, key and a third column, which `statement` selects between two
-/// days in the order of days and keys, for which the key begins with `keyPrefix`; until it sets its
-/// last argument. Sees to it that all rows come in order and with keys that can have been written.
-template <typename Deliver>
-void forEachRow(const SqliteConnection& connection, const char* statement,
-                std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
-                const Deliver& deliver) {
-  SqliteStatement rows(connection, statement);
-  rows.bind(1, minDay).bind(2, maxDay);
-  std::int64_t lastDay = std::numeric_limits<std::int64_t>::min();
-  std::string lastKey;
-  bool stop = false;
-  while (!stop && rows.step()) {
-    const std::int64_t day = rows.integer(0);
-    const std::string_view key = rows.text(1);
-    if (!isXmlText(key)) {
-      connection.failAsCorrupt("a key is no text");
-    }
-    if (day < lastDay || (day == lastDay && key <= lastKey)) {
-      connection.failAsCorrupt("rows are out of order");
-    }
-    lastDay = day;
-    lastKey = key;
-    if (key.starts_with(keyPrefix)) {
-      deliver(key, static_cast<std::int32_t>(day), rows.integer(2), stop);
-    }
-  }
-}
 
 void appendBytes(Bytes& bytes, const void* value, std::size_t size) {
   const std::size_t end = bytes.size();
@@ -116,19 +88,24 @@ struct CounterStore::Writer {
   SqliteStatement putChunk;
 };
 
-CounterStore::CounterStore(const std::string& path, std::chrono::milliseconds longestWait)
-    : _connection(path, longestWait) {
+CounterStore::CounterStore(std::string path, std::chrono::milliseconds longestWait, Access access)
+    : _path(std::move(path)), _longestWait(longestWait), _access(access) {
+  readTwice([this] { open(); });
+}
+
+void CounterStore::open() {
+  ++_opening;
+  _connection = SqliteConnection(_path, _longestWait);
+  const bool mayBeWritten = !_connection.isReadOnly();
   if (_connection.queryInteger("PRAGMA application_id") != kApplicationIdentifier ||
       _connection.queryInteger("PRAGMA user_version") != kSchemaVersion) {
     _connection.failAsCorrupt("not a counter database of this version");
   }
   // SQLite takes an unknown format version for a database of the future and never writes to it.
-  std::uint8_t header[20];
-  _connection.readHeader(header);
-  constexpr std::uint8_t kNewestFormat = 2;
-  if (header[18] > kNewestFormat) {
+  if (mayBeWritten && _connection.isReadOnly()) {
     _connection.failAsCorrupt("the header is damaged");
   }
+  _connection.execute(_access == Access::Writing ? "BEGIN IMMEDIATE" : "BEGIN");
 }
 
 std::string CounterStore::emptyDatabase() {
@@ -216,19 +193,82 @@ void CounterStore::appendSamples(std::int32_t day, std::string_view key,
   }
 }
 
+/// Gives `deliver` the rows of day, key and a third column that `select` gives between two days in
+/// the order of days and keys, from a day and key on, for which the key begins with `keyPrefix`;
+/// until it sets its last argument. Sees to it that all rows come in order and with keys that can
+/// have been written.
+template <typename Deliver>
+void CounterStore::forEachRow(const char* what, const char* select, std::string_view keyPrefix,
+                              std::int32_t minDay, std::int32_t maxDay, const Deliver& deliver) {
+  std::optional<SqliteStatement> rows;
+  int opening = 0;
+  std::uint64_t count = 0;
+  std::int64_t lastDay = minDay;
+  std::string lastKey;
+  std::int64_t third = 0;
+  const auto next = [&] {
+    const bool begins = opening != _opening;  // where it broke off: the last row may come again
+    if (begins) {
+      rows.emplace(_connection, select);
+      rows->bind(1, lastDay).bind(2, std::string_view(lastKey)).bind(3, maxDay);
+      opening = _opening;
+    }
+    bool found = rows->step();
+    if (begins && count != 0 && found && rows->integer(0) == lastDay && rows->text(1) == lastKey) {
+      found = rows->step();
+    }
+    if (!found) {
+      return false;
+    }
+    const std::int64_t day = rows->integer(0);
+    const std::string_view key = rows->text(1);
+    if (!isXmlText(key)) {
+      _connection.failAsCorrupt("a key is no text");
+    }
+    if (day < lastDay || (day == lastDay && (count == 0 ? key < lastKey : key <= lastKey))) {
+      _connection.failAsCorrupt("rows are out of order");
+    }
+    third = rows->integer(2);
+    lastDay = day;
+    lastKey = key;
+    ++count;
+    return true;
+  };
+  bool stop = false;
+  bool isDelivering = false;
+  try {
+    while (!stop && readTwice(next)) {
+      isDelivering = true;
+      if (std::string_view(lastKey).starts_with(keyPrefix)) {
+        deliver(lastKey, static_cast<std::int32_t>(lastDay), third, stop);
+      }
+      isDelivering = false;
+    }
+  } catch (const SqliteFailure& failure) {
+    std::string text = failure.text + (isDelivering ? " " : ", after ");
+    text += std::to_string(count) + ' ' + what;
+    if (count != 0) {
+      text += " up to " + quotedText(lastKey) + " of day " + std::to_string(lastDay);
+    }
+    throw SqliteFailure{failure.code, std::move(text)};
+  }
+}
+
 void CounterStore::readScalars(std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
                                const TBHistory::ScalarRowHandler& handler) {
-  forEachRow(_connection,
-             "SELECT day, key, value FROM scalar WHERE day BETWEEN ? AND ? ORDER BY day, key",
+  forEachRow("scalars",
+             "SELECT day, key, value FROM scalar WHERE (day, key) >= (?, ?) AND day <= ? "
+             "ORDER BY day, key",
              keyPrefix, minDay, maxDay, handler);
 }
 
 void CounterStore::readDistributions(std::string_view keyPrefix, std::int32_t minDay,
                                      std::int32_t maxDay,
                                      const TBHistory::DistributionRowHandler& handler) {
-  ChunkEnumerator values(_connection);
-  forEachRow(_connection,
-             "SELECT day, key, id FROM distribution WHERE day BETWEEN ? AND ? ORDER BY day, key",
+  ChunkEnumerator values(*this);
+  forEachRow("distributions",
+             "SELECT day, key, id FROM distribution WHERE (day, key) >= (?, ?) AND day <= ? "
+             "ORDER BY day, key",
              keyPrefix, minDay, maxDay,
              [&](std::string_view key, std::int32_t day, std::int64_t id, bool& stop) {
                values.start(id);
@@ -238,18 +278,20 @@ void CounterStore::readDistributions(std::string_view keyPrefix, std::int32_t mi
 }
 
 std::optional<std::int32_t> CounterStore::nextDay(std::int64_t day) {
-  SqliteStatement next(_connection,
-                       "SELECT min(day) FROM (SELECT min(day) AS day FROM scalar WHERE day > ?1 "
-                       "UNION ALL SELECT min(day) FROM distribution WHERE day > ?1)");
-  next.bind(1, day);
-  if (!next.step() || next.isNull(0)) {
-    return std::nullopt;
-  }
-  const std::int64_t found = next.integer(0);
-  if (found <= day || found > std::numeric_limits<std::int32_t>::max()) {
-    _connection.failAsCorrupt("a day is out of range");
-  }
-  return static_cast<std::int32_t>(found);
+  return readTwice([&]() -> std::optional<std::int32_t> {
+    SqliteStatement next(_connection,
+                         "SELECT min(day) FROM (SELECT min(day) AS day FROM scalar WHERE day > ?1 "
+                         "UNION ALL SELECT min(day) FROM distribution WHERE day > ?1)");
+    next.bind(1, day);
+    if (!next.step() || next.isNull(0)) {
+      return std::nullopt;
+    }
+    const std::int64_t found = next.integer(0);
+    if (found <= day || found > std::numeric_limits<std::int32_t>::max()) {
+      _connection.failAsCorrupt("a day is out of range");
+    }
+    return static_cast<std::int32_t>(found);
+  });
 }
 
 }  // namespace vesprun

@@ -30,7 +30,8 @@ struct Sample {
   std::int32_t secondsInDay;
 };
 
-/// The tables of the counter database, in one open file. Every operation throws `SqliteFailure`.
+/// The tables of the counter database, in one open file and one transaction. Every operation throws
+/// `SqliteFailure`. What fails to be read is read once more, from a newly opened file, first.
 ///
 /// Scalars are rows of day, key and value. The samples of a distribution are packed into chunks:
 /// their values as little-endian doubles, and their offsets as little-endian 32-bit integers in a
@@ -39,13 +40,18 @@ class CounterStore {
  public:
   static constexpr std::size_t kSamplesPerChunk = 4096;
 
+  enum class Access { Reading, Writing };
+
   /// Opens an existing file. What another process has locked is waited for, `longestWait` at most.
-  CounterStore(const std::string& path, std::chrono::milliseconds longestWait);
+  CounterStore(std::string path, std::chrono::milliseconds longestWait, Access access);
 
   /// The content of a new database file. Throws `SqliteFailure`.
   static std::string emptyDatabase();
 
-  SqliteConnection& connection() { return _connection; }
+  /// Makes everything that was written durable; without it, nothing of it is kept.
+  void commit() { _connection.commit(); }
+
+  const SqliteConnection& connection() const { return _connection; }
 
   // Keys are those that `isCounterKey` allows.
 
@@ -55,8 +61,9 @@ class CounterStore {
   /// Appends samples to a distribution, in order.
   void appendSamples(std::int32_t day, std::string_view key, std::span<const Sample> samples);
 
-  /// Delivers rows as `TBHistory` does. Damage among the values of a distribution ends them for the
-  /// handler, and is thrown when the handler has returned.
+  /// Delivers rows as `TBHistory` does. A failure among the values of a distribution ends them for
+  /// the handler, and is thrown when the handler has returned. The text of a failure says how far
+  /// the reading came.
   void readScalars(std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
                    const TBHistory::ScalarRowHandler& handler);
   void readDistributions(std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
@@ -66,13 +73,40 @@ class CounterStore {
   /// that the first day can be asked for too.
   std::optional<std::int32_t> nextDay(std::int64_t day);
 
+  /// Runs `step`, which reads, and again when it failed: statements made before belong to an
+  /// earlier `opening` then and are of no more use. Not when a lock was waited for, nor in a
+  /// transaction that writes.
+  template <typename Step>
+  auto readTwice(const Step& step) {
+    try {
+      return step();
+    } catch (const SqliteFailure& failure) {
+      if (_access == Access::Writing || failure.isBusy()) {
+        throw;
+      }
+    }
+    open();
+    return step();
+  }
+
+  /// Changes when the file is opened again.
+  int opening() const { return _opening; }
+
  private:
   /// Statements that write, prepared when the first one is needed.
   struct Writer;
 
+  void open();
+  template <typename Deliver>
+  void forEachRow(const char* what, const char* select, std::string_view keyPrefix,
+                  std::int32_t minDay, std::int32_t maxDay, const Deliver& deliver);
   Writer& writer();
   std::int64_t distributionForWriting(std::int32_t day, std::string_view key);
 
+  std::string _path;
+  std::chrono::milliseconds _longestWait;
+  Access _access;
+  int _opening = 0;
   SqliteConnection _connection;
   std::shared_ptr<Writer> _writer;
 };

@@ -2,7 +2,7 @@
 
 #include <optional>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/PreferenceNames.h"
 
 namespace vesprun {
@@ -10,10 +10,11 @@ class HostTallybook::History final : public TBHistory {
  public:
   explicit History(HostTallybook& tallybook) : _tallybook(tallybook) {}
 
-  void scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+  bool scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
       std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
       const ScalarRowHandler& rowHandler) override {
-    read([&](CounterStore& store) { store.readScalars(keyPrefix, minDay, maxDay, rowHandler); });
+    return read(
+        [&](CounterStore& store) { store.readScalars(keyPrefix, minDay, maxDay, rowHandler); });
   }
 
   void distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
@@ -25,11 +26,13 @@ class HostTallybook::History final : public TBHistory {
   }
 
  private:
-  void read(const std::function<void(CounterStore&)>& work) {
+  bool read(const std::function<void(CounterStore&)>& work) {
     std::string error;
-    if (!_tallybook.read(work, error)) {
+    const bool done = _tallybook.read(work, error);
+    if (!done) {
       _tallybook._log.write(LogLevel::Error, "counters cannot be read: " + error);
     }
+    return done;
   }
 
   HostTallybook& _tallybook;
@@ -41,11 +44,13 @@ HostTallybook::HostTallybook(const DeviceDirectory& directory, Clock& clock,
     : _clock(clock), _preferences(preferences), _log(log), _file(directory, clock, longestWait) {}
 
 HostTallybook::~HostTallybook() {
-  std::string error;
-  if (!flush(error)) {
-    _log.write(LogLevel::Error,
-               "changes of " + std::to_string(_pending.size()) + " counters are lost: " + error);
-  }
+  runGuarded(_log, "counters", [this] {
+    std::string error;
+    if (!flush(error)) {
+      _log.write(LogLevel::Error,
+                 "changes of " + std::to_string(_pending.size()) + " counters are lost: " + error);
+    }
+  });
 }
 
 std::int32_t HostTallybook::TBDaysSince1970() { return daysSince1970(_clock.now()); }
@@ -106,21 +111,34 @@ bool HostTallybook::flush(std::string& error) {
     }
     return true;
   };
-  if (write(apply, error)) {
-    return true;
+  // Without allocating: memory may just have run out.
+  const auto keepChanges = [&] {
+    const std::scoped_lock guard(_pendingMutex);
+    for (auto& [place, change] : changes) {
+      if (const auto later = _pending.find(place); later != _pending.end()) {
+        change = later->second.isSet
+                     ? later->second
+                     : PendingScalar{change.isSet, wrappingSum(change.value, later->second.value)};
+      }
+    }
+    changes.merge(_pending);
+    _pending.swap(changes);
+  };
+  try {
+    if (write(apply, error)) {
+      return true;
+    }
+  } catch (...) {
+    keepChanges();
+    throw;
   }
-  const std::scoped_lock guard(_pendingMutex);
-  // What came meanwhile is later than what could not be written.
-  for (const auto& [place, later] : _pending) {
-    PendingScalar& change = changes.try_emplace(place, PendingScalar{false, 0}).first->second;
-    change =
-        later.isSet ? later : PendingScalar{change.isSet, wrappingSum(change.value, later.value)};
-  }
-  _pending = std::move(changes);
+  keepChanges();
   return false;
 }
 
-std::unique_ptr<TBHistory> HostTallybook::openHistory() { return std::make_unique<History>(*this); }
+std::unique_ptr<TBHistory> HostTallybook::initWithDefaultPath() {
+  return std::make_unique<History>(*this);
+}
 
 bool HostTallybook::write(const std::function<bool(CounterStore&)>& work, std::string& error) {
   std::optional<CounterFile::Damage> damage;

@@ -24,12 +24,12 @@ namespace vesprun {
 /// The counter database in `var/mobile/Library/Tallybook/TBDataStore.sqlitedb`. It is opened when
 /// something is read or written, and not before.
 ///
-/// A file found damaged, or of another shape, is moved aside with its journal under a name with the
-/// time ("TBDataStore.sqlitedb.corrupt-20240305T091502Z"), an empty one takes its place, the
-/// integer preference "DatabaseCorruptionCount" of "com.quill.aggregated" goes up by one, an error
-/// line says so, and the work goes on. Locks that last, permissions and full disks are no damage:
-/// an error line says what failed, and what was to be written stays collected. Several processes
-/// may use the database at once.
+/// A file found damaged twice in a row, or of another shape, is moved aside with its journal under
+/// a name with the time ("TBDataStore.sqlitedb.corrupt-20240305T091502Z"), an empty one takes its
+/// place, the integer preference "DatabaseCorruptionCount" of "com.quill.aggregated" goes up by
+/// one, an error line says so, and the work goes on. Locks that last, permissions, full disks and
+/// all other errors of the system are not damage: an error line says what failed, and what was to
+/// be written stays collected. Several processes may use the database at once.
 class HostTallybook final : public Tallybook {
  public:
   /// What the references name must outlive the object. While other processes keep the database
@@ -46,17 +46,18 @@ class HostTallybook final : public Tallybook {
   void TBClientCheckpoint() override;
   void TBClientSetValueForScalarKey(std::string_view key, std::int64_t value) override;
   void TBClientAddValueForScalarKey(std::string_view key, std::int64_t value) override;
-  std::unique_ptr<TBHistory> openHistory() override;
+  std::unique_ptr<TBHistory> initWithDefaultPath() override;
 
   // What tools need beside. Each writes or reads at once, all or nothing; false, with a text in
   // `error`, when that failed.
 
-  /// Runs `work` on the tables in one transaction. When the first attempt finds the database
-  /// damaged, `work` runs again on the new one. A false result takes everything back.
+  /// Runs `work` on the tables in one transaction. When it finds the database damaged, `work` runs
+  /// again on the same file, and at last on a new one. A false result takes everything back.
   bool write(const std::function<bool(CounterStore&)>& work, std::string& error);
 
   /// Runs `work` on the tables as they stand at one moment; without a database it is not run. False
-  /// also when the database is damaged: `work` has then seen the rows before the damage.
+  /// also when the database cannot be read to its end: `work` has then seen the rows before that
+  /// point, which `error` names.
   bool read(const std::function<void(CounterStore&)>& work, std::string& error);
 
  private:

@@ -1,10 +1,70 @@
 #include "platform/host/counters/SqliteConnection.h"
 
+#include <new>
+
 namespace vesprun {
 namespace {
 
 // No cell of ours is near this size; a damaged one may claim to be.
 constexpr int kLongestCell = 16 * 1024 * 1024;
+
+/// SQLite's own file system under another name, with one difference: SQLite takes a read that fails
+/// with EIO for damage of the file, and here it stays an error of reading.
+class ErrorKeepingFileSystem {
+ public:
+  /// Registered with SQLite for as long as the program, or the library, is loaded.
+  static const char* name() {
+    static ErrorKeepingFileSystem fileSystem;
+    return fileSystem._methods.zName;
+  }
+
+  ErrorKeepingFileSystem(const ErrorKeepingFileSystem&) = delete;
+  ErrorKeepingFileSystem& operator=(const ErrorKeepingFileSystem&) = delete;
+
+ private:
+  /// Behind each open file of the original file system.
+  struct Methods {
+    sqlite3_io_methods methods;
+    const sqlite3_io_methods* original;
+  };
+
+  ErrorKeepingFileSystem() : _methods(*original()) {
+    _methods.zName = "vesprun";
+    _methods.pNext = nullptr;
+    _methods.szOsFile += static_cast<int>(sizeof(Methods));
+    _methods.xOpen = open;
+    sqlite3_vfs_register(&_methods, 0);
+  }
+  ~ErrorKeepingFileSystem() { sqlite3_vfs_unregister(&_methods); }
+
+  static sqlite3_vfs* original() {
+    static sqlite3_vfs* const found = sqlite3_vfs_find(nullptr);
+    return found;
+  }
+
+  static Methods* methodsOf(sqlite3_file* file) {
+    void* behind = reinterpret_cast<std::uint8_t*>(file) + original()->szOsFile;
+    return static_cast<Methods*>(behind);
+  }
+
+  static int open(sqlite3_vfs* /*self*/, const char* name, sqlite3_file* file, int flags,
+                  int* flagsTaken) {
+    const int result = original()->xOpen(original(), name, file, flags, flagsTaken);
+    if (result == SQLITE_OK) {
+      Methods* const methods = new (methodsOf(file)) Methods{*file->pMethods, file->pMethods};
+      methods->methods.xRead = read;
+      file->pMethods = &methods->methods;
+    }
+    return result;
+  }
+
+  static int read(sqlite3_file* file, void* bytes, int length, sqlite3_int64 offset) {
+    const int result = methodsOf(file)->original->xRead(file, bytes, length, offset);
+    return result == SQLITE_IOERR_CORRUPTFS ? SQLITE_IOERR_READ : result;
+  }
+
+  sqlite3_vfs _methods;
+};
 
 }  // namespace
 
@@ -25,9 +85,9 @@ bool SqliteFailure::isCorruption() const {
 SqliteConnection::SqliteConnection(const std::string& path, std::chrono::milliseconds longestWait)
     : _path(path) {
   sqlite3* database = nullptr;
-  const int result =
-      sqlite3_open_v2(path.c_str(), &database,
-                      SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE, nullptr);
+  const int result = sqlite3_open_v2(
+      path.c_str(), &database, SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE,
+      ErrorKeepingFileSystem::name());
   _database.reset(database);
   if (result != SQLITE_OK) {
     fail(result);
@@ -52,17 +112,11 @@ std::int64_t SqliteConnection::queryInteger(const char* sql) {
   return statement.step() ? statement.integer(0) : 0;
 }
 
-// Through SQLite's own descriptor: closing another one would drop its locks.
-void SqliteConnection::readHeader(std::span<std::uint8_t> header) const {
-  sqlite3_file* file = nullptr;
-  int result = sqlite3_file_control(handle(), "main", SQLITE_FCNTL_FILE_POINTER, &file);
-  if (result == SQLITE_OK) {
-    result = file->pMethods->xRead(file, header.data(), static_cast<int>(header.size()), 0);
-  }
-  if (result == SQLITE_IOERR_SHORT_READ) {
-    failAsCorrupt("the file is too short");
-  }
-  if (result != SQLITE_OK) {
+void SqliteConnection::commit() {
+  const int result = sqlite3_exec(handle(), "COMMIT", nullptr, nullptr, nullptr);
+  // When these fail the journal is gone, and with it the way back.
+  if (result != SQLITE_OK && result != SQLITE_IOERR_DIR_FSYNC && result != SQLITE_IOERR_UNLOCK &&
+      result != SQLITE_IOERR_RDLOCK) {
     fail(result);
   }
 }
@@ -158,22 +212,6 @@ void SqliteStatement::requireType(int column, int type) const {
   if (sqlite3_column_type(_statement.get(), column) != type) {
     _connection.failAsCorrupt("a cell is not of its column's type");
   }
-}
-
-SqliteTransaction::SqliteTransaction(SqliteConnection& connection, Kind kind)
-    : _connection(connection) {
-  _connection.execute(kind == Kind::Writing ? "BEGIN IMMEDIATE" : "BEGIN");
-}
-
-SqliteTransaction::~SqliteTransaction() {
-  if (_open) {
-    sqlite3_exec(_connection.handle(), "ROLLBACK", nullptr, nullptr, nullptr);
-  }
-}
-
-void SqliteTransaction::commit() {
-  _connection.execute("COMMIT");
-  _open = false;
 }
 
 }  // namespace vesprun

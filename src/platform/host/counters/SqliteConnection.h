@@ -20,11 +20,16 @@ struct SqliteFailure {
   /// True when the file is not, or no longer, a sound database of the expected shape; false for
   /// trouble around it: locks, permissions, a full disk.
   bool isCorruption() const;
+
+  /// True when another process kept the file locked for as long as the connection waits.
+  bool isBusy() const { return (code & 0xFF) == SQLITE_BUSY; }
 };
 
-/// An open SQLite database file, set up to distrust what it finds in it.
+/// An open SQLite database file, set up to distrust what it finds in it. An error of the system is
+/// never taken for damage of the file.
 class SqliteConnection {
  public:
+  SqliteConnection() = default;
   /// Opens an existing file, for reading only when it cannot be written, or a database in memory
   /// (":memory:"). What another process has locked is waited for, `longestWait` at most. Throws
   /// `SqliteFailure`.
@@ -36,8 +41,12 @@ class SqliteConnection {
   /// The integer that a one-row query gives.
   std::int64_t queryInteger(const char* sql);
 
-  /// The first bytes of the file, which must have as many.
-  void readHeader(std::span<std::uint8_t> header) const;
+  /// Commits the transaction that `BEGIN` began. One that is not committed ends with the
+  /// connection.
+  void commit();
+
+  /// Known for sure when something has been read.
+  bool isReadOnly() const { return sqlite3_db_readonly(handle(), "main") != 0; }
 
   sqlite3* handle() const { return _database.get(); }
 
@@ -85,24 +94,6 @@ class SqliteStatement {
 
   const SqliteConnection& _connection;
   std::unique_ptr<sqlite3_stmt, Finalize> _statement;
-};
-
-/// A transaction; rolled back unless it was committed.
-class SqliteTransaction {
- public:
-  enum class Kind { Reading, Writing };
-
-  /// One that writes is the only one of its kind from its start on.
-  SqliteTransaction(SqliteConnection& connection, Kind kind);
-  ~SqliteTransaction();
-  SqliteTransaction(const SqliteTransaction&) = delete;
-  SqliteTransaction& operator=(const SqliteTransaction&) = delete;
-
-  void commit();
-
- private:
-  SqliteConnection& _connection;
-  bool _open = true;
 };
 
 }  // namespace vesprun

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <map>
 #include <optional>
@@ -42,7 +43,6 @@ struct DevicePropertyDescription {
   std::optional<std::string> inverseDeviceID;  ///< absent: no answer
 };
 
-/// Blocks of a file system, as `statfs` counts them.
 struct SubmissionDescription {
   bool enabled = true;
   bool fails = false;
@@ -154,6 +154,9 @@ struct DeviceDescription {
   std::vector<ChannelDescription> channels;
   AnswerDescription<UsageDescription> usage;  ///< absent: an empty reply at once
 };
+
+/// The longest `device.json`, in bytes: 16 MiB.
+inline constexpr std::size_t kLongestDeviceDescription = std::size_t{16} << 20;
 
 /// Reads the text of a `device.json`. Nothing, with a text in `error` that names the entry or the
 /// line, when it is not one.

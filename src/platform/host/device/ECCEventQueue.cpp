@@ -1,77 +1,105 @@
 #include "platform/host/device/ECCEventQueue.h"
 
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <cerrno>
 #include <cstdio>
-#include <cstring>
-#include <filesystem>
 #include <optional>
-#include <system_error>
+#include <string>
+#include <utility>
 #include <vector>
 
+#include "platform/host/files/FolderNames.h"
 #include "platform/host/files/SystemError.h"
-#include "platform/host/files/WholeFile.h"
 
 namespace vesprun {
-namespace {
 
-std::vector<std::string> eventFiles(const std::string& folder, std::error_code& error) {
-  std::vector<std::string> files;
-  for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
-       entry.increment(error)) {
-    if (entry->path().extension() == ".bin") {
-      files.push_back(entry->path());
-    }
+ECCEventQueue::Outcome ECCEventQueue::take(const std::string& path, std::span<std::uint8_t> buffer,
+                                           std::string& error) {
+  const auto failed = [&](Outcome outcome) {
+    error = systemError(path);
+    return outcome;
+  };
+  // A pipe under the name must not stop the reader for ever.
+  FileDescriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
+  if (!file.isOpen()) {
+    const bool lasts = errno == EACCES || errno == EPERM || errno == ELOOP || errno == ENXIO;
+    return errno == ENOENT ? Outcome::Skipped : failed(lasts ? Outcome::Unusable : Outcome::Failed);
   }
-  std::sort(files.begin(), files.end());
-  return files;
+  if (flock(file.get(), LOCK_EX | LOCK_NB) != 0) {
+    return errno == EWOULDBLOCK ? Outcome::Skipped : failed(Outcome::Failed);
+  }
+  struct stat status {};
+  if (fstat(file.get(), &status) != 0) {
+    return failed(Outcome::Failed);
+  }
+  if (status.st_nlink == 0) {
+    return Outcome::Skipped;  // whoever had the lock before has removed it
+  }
+  if (!S_ISREG(status.st_mode) || status.st_size != kEventLength) {
+    error = path + (S_ISREG(status.st_mode)
+                        ? ": " + std::to_string(status.st_size) +
+                              " bytes are not an ECC event of " + std::to_string(kEventLength)
+                        : ": not a regular file");
+    return Outcome::Unusable;
+  }
+  const ssize_t count = pread(file.get(), buffer.data(), kEventLength, 0);
+  if (count != static_cast<ssize_t>(kEventLength)) {
+    return failed(Outcome::Failed);
+  }
+  _taken = std::move(file);
+  _takenPath = path;
+  return Outcome::Taken;
 }
 
-}  // namespace
-
 int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length) {
+  _taken = FileDescriptor();
   const std::string folder = _directory.hostPath("kernel/ecc");
-  std::error_code failure;
-  const std::vector<std::string> files = eventFiles(folder, failure);
-  if (failure && failure != std::errc::no_such_file_or_directory) {
-    _log.write(LogLevel::Error, folder + ": " + failure.message());
+  std::string error;
+  const std::optional<std::vector<std::string>> names = namesInFolder(folder, error);
+  if (!names) {
+    _log.write(LogLevel::Error, error);
     return EIO;
   }
+  std::vector<std::string> files;
+  for (const std::string& name : *names) {
+    if (name.ends_with(".bin") && name != ".bin") {
+      files.push_back(folder + '/' + name);
+    }
+  }
+  if (!files.empty() && buffer.size() != kEventLength) {
+    return EINVAL;
+  }
   for (const std::string& path : files) {
-    std::string error;
-    bool missing = false;
-    const std::optional<std::string> event = readWholeFile(path, error, &missing);
-    if (missing) {
-      continue;  // another process took it
-    }
-    if (event && event->size() != kEventLength) {
-      error = path + ": " + std::to_string(event->size()) + " bytes are not an ECC event of " +
-              std::to_string(kEventLength);
-    }
-    if (!event || event->size() != kEventLength) {
-      if (!setAside(path, error)) {
+    switch (take(path, buffer, error)) {
+      case Outcome::Taken:
+        length = kEventLength;
+        return 0;
+      case Outcome::Skipped:
+        break;
+      case Outcome::Unusable:
+        if (!setAside(path, error)) {
+          return EIO;
+        }
+        break;
+      case Outcome::Failed:
+        _log.write(LogLevel::Error, error);
         return EIO;
-      }
-      continue;
     }
-    if (buffer.size() != kEventLength) {
-      return EINVAL;
-    }
-    // Whoever deletes the file has the event: one that stays would be delivered for ever.
-    if (unlink(path.c_str()) != 0) {
-      if (errno == ENOENT) {
-        continue;
-      }
-      _log.write(LogLevel::Error, systemError(path));
-      return EIO;
-    }
-    std::memcpy(buffer.data(), event->data(), kEventLength);
-    length = kEventLength;
-    return 0;
   }
   return ENOENT;
+}
+
+bool ECCEventQueue::removeTaken() {
+  const FileDescriptor taken = std::exchange(_taken, FileDescriptor());
+  if (!taken.isOpen() || unlink(_takenPath.c_str()) == 0 || errno == ENOENT) {
+    return true;
+  }
+  _log.write(LogLevel::Error, systemError(_takenPath));
+  return false;
 }
 
 bool ECCEventQueue::setAside(const std::string& path, const std::string& why) {

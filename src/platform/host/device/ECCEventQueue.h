@@ -6,6 +6,7 @@
 
 #include "platform/SystemLog.h"
 #include "platform/host/device/DeviceDirectory.h"
+#include "platform/host/files/FileDescriptor.h"
 
 namespace vesprun {
 
@@ -19,20 +20,30 @@ class ECCEventQueue {
   ECCEventQueue(const DeviceDirectory& directory, SystemLog& log)
       : _directory(directory), _log(log) {}
 
-  /// Takes the oldest event out of the queue. 0, and the bytes in `buffer`; otherwise an error
-  /// number: ENOENT when the queue is empty, EINVAL when the buffer is not of an event's length,
-  /// EIO, and an error in the system log, when the folder cannot be read or a file is in the way
-  /// that cannot be removed.
+  /// Takes the oldest event that no other process has taken; its file stays, locked, until
+  /// `removeTaken`. What was taken before and not removed is back in the queue. 0, and the bytes in
+  /// `buffer`; otherwise an error number: ENOENT when the queue is empty, EINVAL when the buffer is
+  /// not of an event's length, EIO, and an error in the system log, when the folder or an event
+  /// cannot be read now or a file is in the way that cannot be renamed.
   ///
-  /// A file that is not an event (of another length, or not to be read) is renamed to
-  /// NAME.bin.unusable, an error in the system log says why, and the next one is taken.
+  /// A file that never is an event (of another kind or length, or not for this process to read) is
+  /// renamed to NAME.bin.unusable, an error in the system log says why, and the next one is taken.
   int takeNext(std::span<std::uint8_t> buffer, std::size_t& length);
 
+  /// Deletes the file of the event that was taken last. False, with an error in the system log,
+  /// when that failed: the event is then taken again.
+  bool removeTaken();
+
  private:
+  enum class Outcome { Taken, Skipped, Unusable, Failed };
+
+  Outcome take(const std::string& path, std::span<std::uint8_t> buffer, std::string& error);
   bool setAside(const std::string& path, const std::string& why);
 
   const DeviceDirectory& _directory;
   SystemLog& _log;
+  std::string _takenPath;
+  FileDescriptor _taken;  ///< holds the lock of its file
 };
 
 }  // namespace vesprun

@@ -1,11 +1,15 @@
 #include "platform/host/device/LiveSystem.h"
 
 #include <sys/statvfs.h>
+#include <sys/sysinfo.h>
 #include <sys/utsname.h>
 #include <unistd.h>
 
 #include <algorithm>
+#include <array>
 #include <cctype>
+#include <cinttypes>
+#include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
@@ -17,16 +21,17 @@
 #include <utility>
 
 #include "common/LittleEndian.h"
+#include "platform/host/files/FolderNames.h"
 
 namespace vesprun::live {
 namespace {
 
-/// The entries "NAME=value" or "Name: value kB" of a text file.
-std::map<std::string, std::string> readEntries(const std::string& file, char separator) {
+/// The entries NAME=value or NAME="value" of /etc/os-release.
+std::map<std::string, std::string> osRelease() {
   std::map<std::string, std::string> entries;
-  std::ifstream stream(file);
+  std::ifstream stream("/etc/os-release");
   for (std::string line; std::getline(stream, line);) {
-    const auto end = line.find(separator);
+    const auto end = line.find('=');
     if (end == std::string::npos) {
       continue;
     }
@@ -85,24 +90,20 @@ std::optional<LocaleName> processLocale(const char* category) {
 
 void appendDesktopEntries(const std::filesystem::path& folder, bool user,
                           std::vector<ApplicationDescription>& applications) {
-  std::error_code error;
-  std::vector<std::string> bundles;
-  for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
-       entry.increment(error)) {
-    if (entry->path().extension() == ".desktop") {
-      bundles.push_back(entry->path().stem());
+  std::string error;
+  for (const std::string& name :
+       namesInFolder(folder, error).value_or(std::vector<std::string>())) {
+    const std::filesystem::path file(name);
+    if (file.extension() == ".desktop") {
+      applications.push_back({file.stem(), user});
     }
-  }
-  std::sort(bundles.begin(), bundles.end());
-  for (std::string& bundle : bundles) {
-    applications.push_back({std::move(bundle), user});
   }
 }
 
 }  // namespace
 
 std::string osVersion() {
-  const auto entries = readEntries("/etc/os-release", '=');
+  const auto entries = osRelease();
   const auto name = entries.find("PRETTY_NAME");
   if (name != entries.end()) {
     return name->second;
@@ -112,7 +113,7 @@ std::string osVersion() {
 }
 
 std::string osBuild() {
-  const auto entries = readEntries("/etc/os-release", '=');
+  const auto entries = osRelease();
   for (const char* name : {"BUILD_ID", "VERSION_ID"}) {
     if (const auto entry = entries.find(name); entry != entries.end()) {
       return entry->second;
@@ -123,14 +124,12 @@ std::string osBuild() {
 }
 
 std::optional<Bytes> swapUsage() {
-  const auto entries = readEntries("/proc/meminfo", ':');
-  const auto total = entries.find("SwapTotal");
-  const auto free = entries.find("SwapFree");
-  if (total == entries.end() || free == entries.end()) {
+  struct sysinfo system {};
+  if (sysinfo(&system) != 0) {
     return std::nullopt;
   }
-  const std::uint64_t totalBytes = std::strtoull(total->second.c_str(), nullptr, 10) * 1024;
-  const std::uint64_t freeBytes = std::strtoull(free->second.c_str(), nullptr, 10) * 1024;
+  const std::uint64_t totalBytes = std::uint64_t{system.totalswap} * system.mem_unit;
+  const std::uint64_t freeBytes = std::uint64_t{system.freeswap} * system.mem_unit;
   Bytes record;
   appendLittleEndian(record, totalBytes, 8);
   appendLittleEndian(record, freeBytes, 8);
@@ -142,6 +141,11 @@ std::optional<Bytes> swapUsage() {
 
 std::optional<std::string> bootSessionIdentifier() {
   std::string identifier = upperCase(firstLineOf("/proc/sys/kernel/random/boot_id"));
+  // The service sees nothing but processes in /proc; the system hands it this file as a credential.
+  if (const char* credentials = std::getenv("CREDENTIALS_DIRECTORY");
+      identifier.empty() && credentials != nullptr) {
+    identifier = upperCase(firstLineOf(std::string(credentials) + "/boot_id"));
+  }
   return identifier.empty() ? std::nullopt : std::optional(std::move(identifier));
 }
 
@@ -152,7 +156,17 @@ std::string hardwareModel() {
   return uname(&system) == 0 ? system.machine : "";
 }
 
-std::string newIdentifier() { return upperCase(firstLineOf("/proc/sys/kernel/random/uuid")); }
+std::string newIdentifier() {
+  std::array<std::uint64_t, 2> bits{};
+  std::array<char, 37> text{};
+  if (getentropy(bits.data(), sizeof(bits)) == 0) {
+    std::snprintf(text.data(), text.size(),
+                  "%08" PRIX64 "-%04" PRIX64 "-4%03" PRIX64 "-%04" PRIX64 "-%012" PRIX64,
+                  bits[0] >> 32, bits[0] >> 16 & 0xFFFF, bits[0] & 0xFFF,
+                  0x8000 | (bits[1] >> 48 & 0x3FFF), bits[1] & 0xFFFF'FFFF'FFFF);
+  }
+  return text.data();
+}
 
 std::optional<FileSystemStatistics> volume(const std::string& path) {
   struct statvfs status {};
@@ -195,10 +209,10 @@ std::vector<std::string> preferredLanguages() {
 
 std::vector<std::string> localizations() {
   std::vector<std::string> languages;
-  std::error_code error;
-  for (std::filesystem::directory_iterator entry("/usr/share/locale", error), end;
-       !error && entry != end; entry.increment(error)) {
-    if (const auto locale = parseLocaleName(entry->path().filename().string())) {
+  std::string error;
+  for (const std::string& name :
+       namesInFolder("/usr/share/locale", error).value_or(std::vector<std::string>())) {
+    if (const auto locale = parseLocaleName(name)) {
       languages.push_back(languageTag(*locale));
     }
   }

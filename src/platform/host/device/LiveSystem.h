@@ -23,7 +23,7 @@ std::optional<std::string> bootSessionIdentifier();
 
 std::string machineIdentifier();  ///< of this installation; empty when it has none
 std::string hardwareModel();      ///< the machine's architecture, for example "x86_64"
-std::string newIdentifier();      ///< a random UUID in upper case
+std::string newIdentifier();      ///< a random UUID in upper case; empty without a source of them
 
 /// The file system that a path lies on; nothing when it cannot be measured.
 std::optional<FileSystemStatistics> volume(const std::string& path);

@@ -6,11 +6,13 @@
 #include <charconv>
 #include <cstdint>
 #include <cstdio>
-#include <filesystem>
+#include <optional>
+#include <vector>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/files/AtomicFile.h"
+#include "platform/host/files/FolderNames.h"
 
 namespace vesprun {
 namespace {
@@ -30,20 +32,17 @@ class OutboxLogFile : public LogFileHandle {
 
 /// One more than the largest number that a file name in the folder begins with.
 std::optional<std::uint64_t> nextNumber(const std::string& folder, std::string& error) {
+  const std::optional<std::vector<std::string>> names = namesInFolder(folder, error);
+  if (!names) {
+    return std::nullopt;
+  }
   std::uint64_t largest = 0;
-  std::error_code failure;
-  for (std::filesystem::directory_iterator entry(folder, failure), end; !failure && entry != end;
-       entry.increment(failure)) {
-    const std::string name = entry->path().filename();
+  for (const std::string& name : *names) {
     std::uint64_t number = 0;
     const auto [rest, problem] = std::from_chars(name.data(), name.data() + name.size(), number);
     if (problem == std::errc() && *rest == '-') {
       largest = std::max(largest, number);
     }
-  }
-  if (failure) {
-    error = folder + ": " + failure.message();
-    return std::nullopt;
   }
   return largest + 1;
 }

@@ -10,84 +10,109 @@
 #include <utility>
 #include <vector>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
+#include "common/TextForm.h"
 #include "platform/host/documents/Base64.h"
 #include "platform/host/documents/NestedPlace.h"
 #include "platform/host/documents/QuotedText.h"
+#include "platform/host/documents/XmlText.h"
 
 namespace vesprun {
 namespace {
 
 using Json = nlohmann::ordered_json;
 
-Json tagged(const char* name, Json content) {
-  Json object = Json::object();
-  object.emplace(name, std::move(content));
-  return object;
+}  // namespace
+
+// What a string has beyond escapes and sound text is left to the library.
+void appendJsonText(std::string_view string, std::string& text) {
+  static constexpr std::string_view kEscaped = "\b\f\n\r\t\"\\";
+  static constexpr std::string_view kEscapes = "bfnrt\"\\";
+  const std::size_t begin = text.size();
+  text += '"';
+  for (std::size_t at = 0; at < string.size();) {
+    if (const auto escape = kEscaped.find(string[at]); escape != std::string_view::npos) {
+      text.append(1, '\\').append(1, kEscapes[escape]);
+      ++at;
+      continue;
+    }
+    const std::size_t length = xmlCharacterLength(string.substr(at));
+    if (length == 0) {
+      text.resize(begin);
+      text += Json(string).dump(-1, ' ', false, Json::error_handler_t::replace);
+      return;
+    }
+    text.append(string, at, length);
+    at += length;
+  }
+  text += '"';
 }
 
-Json jsonOf(const Number& number) {
+namespace {
+
+void append(const PropertyValue& value, std::string& text);
+
+void appendTagged(const char* name, std::string_view string, std::string& text) {
+  text.append("{\"").append(name).append("\":");
+  appendJsonText(string, text);
+  text += '}';
+}
+
+void append(const Number& number, std::string& text) {
   if (!number.isFloatingPoint()) {
-    return number.isSigned() ? Json(number.asInt64()) : Json(number.asUInt64());
+    text += textForm(number);
+    return;
   }
   const double real = number.asDouble();
   if (!std::isfinite(real)) {
-    return tagged("real", std::isnan(real) ? "nan" : real < 0 ? "-inf" : "inf");
+    appendTagged("real", textForm(number), text);
+    return;
   }
   if (number.kind() == NumberKind::Double) {
-    return real;
+    text += Json(real).dump();
+    return;
   }
-  char text[32];
-  const char* end = std::to_chars(text, text + sizeof text, static_cast<float>(real)).ptr;
+  char digits[32];
+  const char* end = std::to_chars(digits, digits + sizeof digits, static_cast<float>(real)).ptr;
   double fewestDigits = real;
-  std::from_chars(text, end, fewestDigits);
-  return tagged("float", fewestDigits);
+  std::from_chars(digits, end, fewestDigits);
+  text.append("{\"float\":").append(Json(fewestDigits).dump()).append("}");
 }
 
-Json jsonOf(const PropertyValue& value);
-
-Json jsonOf(const PropertyDict& dict) {
-  // The library's own insertion searches all earlier names; ours are known to be different.
-  Json::object_t object;
-  object.reserve(dict.size());
-  std::vector<Json::object_t::value_type>& entries = object;
+void append(const PropertyDict& dict, std::string& text) {
+  text += '{';
   for (const auto& [key, entry] : dict) {
-    entries.emplace_back(key, jsonOf(entry));
+    text.append(text.back() == '{' ? "" : ",");
+    appendJsonText(key, text);
+    text += ':';
+    append(entry, text);
   }
-  return object;
+  text += '}';
 }
 
-Json jsonOf(const PropertyValue& value) {
+void append(const PropertyValue& value, std::string& text) {
   if (const PropertyDict* dict = value.dict()) {
-    return jsonOf(*dict);
-  }
-  if (const PropertyArray* array = value.array()) {
-    Json::array_t elements;
-    elements.reserve(array->size());
+    append(*dict, text);
+  } else if (const PropertyArray* array = value.array()) {
+    text += '[';
     for (const PropertyValue& element : *array) {
-      elements.push_back(jsonOf(element));
+      text.append(&element == array->data() ? "" : ",");
+      append(element, text);
     }
-    return elements;
-  }
-  if (const std::string* string = value.string()) {
-    return *string;
-  }
-  if (const Number* number = value.number()) {
-    return jsonOf(*number);
-  }
-  if (const bool* boolean = value.boolean()) {
-    return *boolean;
-  }
-  if (const Bytes* data = value.data()) {
-    std::string text;
+    text += ']';
+  } else if (const std::string* string = value.string()) {
+    appendJsonText(*string, text);
+  } else if (const Number* number = value.number()) {
+    append(*number, text);
+  } else if (const bool* boolean = value.boolean()) {
+    text += *boolean ? "true" : "false";
+  } else if (const Bytes* data = value.data()) {
+    text += "{\"data\":\"";
     appendBase64(*data, text);
-    return tagged("data", std::move(text));
+    text += "\"}";
+  } else {
+    appendTagged("date", dateText(value.date() != nullptr ? *value.date() : Date{}), text);
   }
-  return tagged("date", dateText(value.date() != nullptr ? *value.date() : Date{}));
-}
-
-std::string textOf(const Json& json, int indentation) {
-  return json.dump(indentation, ' ', false, Json::error_handler_t::replace);
 }
 
 PropertyValue integerValue(std::uint64_t integer) {
@@ -148,53 +173,78 @@ std::optional<PropertyValue> untagged(PropertyDict dict, std::string& error) {
   return dict;
 }
 
-/// Builds the library's tree as its parser meets the parts: stricter than the library does, with
-/// the digits of integers still at hand, and without its search for each name among the earlier.
-class TreeBuilder final : public nlohmann::json_sax<Json> {
+/// Builds values as the library's parser meets the parts: stricter than the library's own tree, and
+/// with the digits of integers still at hand.
+class ValueBuilder final : public nlohmann::json_sax<Json> {
  public:
-  explicit TreeBuilder(std::string& error) : _error(error) {}
+  ValueBuilder(bool plain, std::string& error) : _plain(plain), _error(error) {}
 
-  Json takeResult() { return std::move(_result); }
+  /// Nothing when a part that is JSON has no value; the first such part is the error.
+  std::optional<PropertyValue> takeResult() {
+    if (!_valueError.empty()) {
+      _error = std::move(_valueError);
+      return std::nullopt;
+    }
+    return std::move(_result);
+  }
 
-  bool null() override { return add(nullptr); }
+  bool add(PropertyValue value) {
+    if (_open.empty()) {
+      _result = std::move(value);
+    } else if (Container& container = _open.back(); container.isObject) {
+      container.dict.set(container.name, std::move(value));
+    } else {
+      container.array.push_back(std::move(value));
+    }
+    return true;
+  }
+
+  bool null() override {
+    if (_plain) {
+      return add(Bytes{});
+    }
+    return addInvalid("null is no value");
+  }
   bool boolean(bool value) override { return add(value); }
   bool number_integer(number_integer_t value) override { return add(value); }
-  bool number_unsigned(number_unsigned_t value) override { return add(value); }
+  bool number_unsigned(number_unsigned_t value) override { return add(integerValue(value)); }
   bool number_float(number_float_t value, const std::string& text) override {
     if (text.find_first_of(".eE") == std::string::npos) {
       return fail("the integer " + text.substr(0, 40) + " does not fit 64 bits");
     }
     return add(value);
   }
-  bool string(std::string& value) override { return add(std::move(value)); }
+  bool string(std::string& value) override { return add(std::string_view(value)); }
   bool binary(Json::binary_t& /*value*/) override { return fail("binary data"); }
   bool start_object(std::size_t /*count*/) override { return open(true); }
   bool key(std::string& name) override {
-    _open.back().name = std::move(name);
+    Container& object = _open.back();
+    if (object.dict.contains(name) && (!object.twice || name < *object.twice)) {
+      object.twice = name;
+    }
+    object.name = std::move(name);
     return true;
   }
   bool end_object() override {
-    Container& container = _open.back();
-    std::vector<std::string_view> names;
-    names.reserve(container.entries.size());
-    for (const auto& entry : container.entries) {
-      names.emplace_back(entry.first);
-    }
-    std::sort(names.begin(), names.end());
-    if (const auto twice = std::adjacent_find(names.begin(), names.end()); twice != names.end()) {
-      container.name = *twice;
+    Container& object = _open.back();
+    if (object.twice) {
+      object.name = *std::move(object.twice);
       return fail("there twice");
     }
-    Json::object_t object;
-    static_cast<Entries&>(object) = std::move(container.entries);
+    PropertyDict dict = std::move(object.dict);
     _open.pop_back();
-    return add(std::move(object));
+    if (_plain) {
+      return add(std::move(dict));
+    }
+    std::string fault;
+    std::optional<PropertyValue> value = untagged(std::move(dict), fault);
+    return value ? add(*std::move(value)) : addInvalid(fault);
   }
   bool start_array(std::size_t /*count*/) override { return open(false); }
   bool end_array() override {
-    Json::array_t elements = std::move(_open.back().elements);
+    PropertyArray array = std::move(_open.back().array);
     _open.pop_back();
-    return add(std::move(elements));
+    return add(std::move(array));
   }
   bool parse_error(std::size_t /*position*/, const std::string& /*token*/,
                    const nlohmann::detail::exception& exception) override {
@@ -208,120 +258,108 @@ class TreeBuilder final : public nlohmann::json_sax<Json> {
   }
 
  private:
-  using Entries = std::vector<Json::object_t::value_type>;
   struct Container {
     bool isObject;
-    std::string name;
-    Entries entries;
-    Json::array_t elements;
+    std::string name{};
+    PropertyDict dict{};
+    PropertyArray array{};
+    std::optional<std::string> twice{};  ///< the first of the names that came again
   };
 
   bool open(bool isObject) {
     if (_open.size() == kMostNestedLevels) {
       return fail(kNestedTooDeeply);
     }
-    _open.push_back({isObject, {}, {}, {}});
+    _open.push_back({isObject});
     return true;
   }
 
-  bool add(Json value) {
-    if (_open.empty()) {
-      _result = std::move(value);
-    } else if (Container& container = _open.back(); container.isObject) {
-      container.entries.emplace_back(container.name, std::move(value));
-    } else {
-      container.elements.push_back(std::move(value));
+  /// Goes on, since what is no JSON further down is the error then.
+  bool addInvalid(const std::string& why) {
+    if (_valueError.empty()) {
+      _valueError = placed(why);
     }
-    return true;
+    return add(false);
   }
 
   bool fail(const std::string& message) {
+    _error = placed(message);
+    return false;
+  }
+
+  std::string placed(const std::string& message) const {
     NestedPlace place;
     for (auto container = _open.rbegin(); container != _open.rend(); ++container) {
       if (container->isObject) {
         place.addOuterKey(container->name);
       } else {
-        place.addOuterIndex(container->elements.size());
+        place.addOuterIndex(container->array.size());
       }
     }
-    _error = place.with(message);
-    return false;
+    return place.with(message);
   }
 
+  bool _plain;
   std::string& _error;
+  std::string _valueError;
   std::vector<Container> _open;
-  Json _result;
+  std::optional<PropertyValue> _result;
 };
 
-std::optional<PropertyValue> valueOf(const Json& json, NestedPlace& place, std::string& error) {
-  if (json.is_object()) {
-    PropertyDict dict;
-    for (const auto& [name, content] : json.get_ref<const Json::object_t&>()) {
-      std::optional<PropertyValue> value = valueOf(content, place, error);
-      if (!value) {
-        place.addOuterKey(name);
-        return std::nullopt;
-      }
-      dict.set(name, *std::move(value));
+std::optional<PropertyValue> read(std::string_view text, bool plain, std::string& error) {
+  ValueBuilder builder(plain, error);
+  return Json::sax_parse(text.begin(), text.end(), &builder) ? builder.takeResult() : std::nullopt;
+}
+
+/// Hands a plain value to a builder once more.
+void replay(const PropertyValue& plain, ValueBuilder& builder) {
+  if (const PropertyDict* dict = plain.dict()) {
+    builder.start_object(dict->size());
+    for (const auto& [name, content] : *dict) {
+      std::string copy = name;
+      builder.key(copy);
+      replay(content, builder);
     }
-    return untagged(std::move(dict), error);
-  }
-  if (json.is_array()) {
-    PropertyArray array;
-    for (const Json& content : json) {
-      std::optional<PropertyValue> value = valueOf(content, place, error);
-      if (!value) {
-        place.addOuterIndex(array.size());
-        return std::nullopt;
-      }
-      array.push_back(*std::move(value));
+    builder.end_object();
+  } else if (const PropertyArray* array = plain.array()) {
+    builder.start_array(array->size());
+    for (const PropertyValue& content : *array) {
+      replay(content, builder);
     }
-    return array;
+    builder.end_array();
+  } else if (plain.data() != nullptr) {
+    builder.null();
+  } else {
+    builder.add(plain);
   }
-  if (json.is_string()) {
-    return json.get_ref<const std::string&>();
-  }
-  if (json.is_boolean()) {
-    return json.get<bool>();
-  }
-  if (json.is_number_unsigned()) {
-    return integerValue(json.get<std::uint64_t>());
-  }
-  if (json.is_number_integer()) {
-    return json.get<std::int64_t>();
-  }
-  if (json.is_number_float()) {
-    return json.get<double>();
-  }
-  error = "null is no value";
-  return std::nullopt;
 }
 
 }  // namespace
 
-std::string jsonText(const PropertyValue& value) { return textOf(jsonOf(value), -1); }
-std::string jsonText(const PropertyDict& dict) { return textOf(jsonOf(dict), -1); }
-std::string indentedJsonText(const PropertyValue& value) { return textOf(jsonOf(value), 2); }
-
-std::optional<Json> jsonFromText(std::string_view text, std::string& error) {
-  TreeBuilder builder(error);
-  return Json::sax_parse(text.begin(), text.end(), &builder) ? std::optional(builder.takeResult())
-                                                             : std::nullopt;
+std::string jsonText(const PropertyValue& value) {
+  std::string text;
+  append(value, text);
+  return text;
 }
 
-std::optional<PropertyValue> valueFromJson(const Json& json, std::string& error) {
-  NestedPlace place;
-  std::string fault;
-  std::optional<PropertyValue> value = valueOf(json, place, fault);
-  if (!value) {
-    error = place.with(fault);
-  }
-  return value;
+std::string jsonText(const PropertyDict& dict) {
+  std::string text;
+  append(dict, text);
+  return text;
+}
+
+std::optional<PropertyValue> plainValueFromJsonText(std::string_view text, std::string& error) {
+  return read(text, true, error);
+}
+
+std::optional<PropertyValue> valueFromPlain(const PropertyValue& plain, std::string& error) {
+  ValueBuilder builder(false, error);
+  replay(plain, builder);
+  return builder.takeResult();
 }
 
 std::optional<PropertyValue> valueFromJsonText(std::string_view text, std::string& error) {
-  const std::optional<Json> json = jsonFromText(text, error);
-  return json ? valueFromJson(*json, error) : std::nullopt;
+  return read(text, false, error);
 }
 
 }  // namespace vesprun

@@ -1,6 +1,5 @@
 #pragma once
 
-#include <nlohmann/json_fwd.hpp>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -19,26 +18,27 @@ namespace vesprun {
 /// - `{"data":"AQID"}`: bytes, in base64;
 /// - `{"date":"2024-03-05T09:15:02Z"}`: a date.
 ///
-/// Bytes of a string that are no UTF-8 become U+FFFD. `jsonText` is one line without white space,
-/// `indentedJsonText` has a line for each entry, two spaces for each level. Neither ends the line.
+/// Bytes of a string that are not UTF-8 become U+FFFD. One line without white space and without an
+/// end.
 std::string jsonText(const PropertyValue& value);
 std::string jsonText(const PropertyDict& dict);
-std::string indentedJsonText(const PropertyValue& value);
 
-/// What a JSON text holds. Nothing, with a text in `error` that names the line or the entry, for
-/// what is no JSON, a name that an object has twice, an integer outside the 64-bit range (signed or
-/// unsigned), any other number that no double can hold, and containers nested deeper than 200.
-std::optional<nlohmann::ordered_json> jsonFromText(std::string_view text, std::string& error);
+/// Appends the JSON form of a string.
+void appendJsonText(std::string_view string, std::string& text);
 
-/// The value that such JSON stands for. Nothing, with a text in `error` that names the entry, for a
-/// null and for one of the four objects whose text is not of its kind.
+/// The value that a JSON text stands for. Nothing, with a text in `error` that names the line or
+/// the entry, for what is no JSON, a name that an object has twice, an integer outside the 64-bit
+/// range (signed or unsigned), any other number that no double can hold, containers nested deeper
+/// than 200, a null, and one of the four objects whose text is not of its kind.
 ///
 /// An integer is a signed 64-bit number when it fits, else an unsigned one. An object with one
 /// entry is one of the four only when the entry is of the type that they have (a number for
 /// "float", a string for the others); any other object is a dictionary.
-std::optional<PropertyValue> valueFromJson(const nlohmann::ordered_json& json, std::string& error);
-
-/// Both in one.
 std::optional<PropertyValue> valueFromJsonText(std::string_view text, std::string& error);
+
+/// The same in two steps, for a reader that decides itself which objects are dictionaries. In a
+/// plain value each object is a dictionary, and empty data stands for null.
+std::optional<PropertyValue> plainValueFromJsonText(std::string_view text, std::string& error);
+std::optional<PropertyValue> valueFromPlain(const PropertyValue& plain, std::string& error);
 
 }  // namespace vesprun

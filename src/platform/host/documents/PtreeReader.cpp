@@ -1,19 +1,43 @@
 #include "platform/host/documents/PtreeReader.h"
 
+#include <expat.h>
+
 #include <algorithm>
+#include <array>
 #include <charconv>
 #include <cstdint>
-#include <pugixml.hpp>
+#include <exception>
+#include <memory>
+#include <new>
 #include <utility>
+#include <vector>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/host/documents/Base64.h"
-#include "platform/host/documents/PtreeSyntax.h"
+#include "platform/host/documents/NestedPlace.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/documents/RealText.h"
+#include "platform/host/documents/XmlText.h"
 
 namespace vesprun {
 namespace {
+
+enum class Element { Dict, Array, Key, String, Integer, Real, True, False, Data, Date };
+
+constexpr std::array<std::string_view, 10> kElementNames = {
+    "dict", "array", "key", "string", "integer", "real", "true", "false", "data", "date"};
+
+constexpr std::size_t kPieceSize = 256 * 1024;
+constexpr std::string_view kWhiteSpace = " \t\n\r";
+constexpr const char* kNoPtree = "the document does not begin with <ptree>";
+constexpr const char* kNoXmlVersion = "the XML declaration does not say version 1.0";
+constexpr const char* kNoVersion = "<ptree> does not say version=\"1.0\"";
+constexpr const char* kTextOutside = "text outside of a value";
+
+struct Fault {
+  std::size_t line = 0;  ///< 0: no fault
+  std::string message;
+};
 
 std::optional<Number> parseInteger(std::string_view text) {
   const char* end = text.data() + text.size();
@@ -30,133 +54,425 @@ std::optional<Number> parseInteger(std::string_view text) {
   return std::nullopt;
 }
 
-/// Turns the elements, whose syntax has been checked, into values. Offsets count from the root
-/// element.
-class TreeReader {
+/// Builds the value while expat goes through the document.
+class PtreeParser {
  public:
-  explicit TreeReader(PtreeFault& fault) : _fault(fault) {}
-
-  // Recursion is as deep as the containers are, which the syntax check has limited.
-  std::optional<PropertyValue> value(const pugi::xml_node& node) {
-    const std::string_view text = node.value();
-    const std::optional<PtreeElement> element = ptreeElement(node.name());
-    switch (element.value_or(PtreeElement::Key)) {
-      case PtreeElement::Dict:
-        return dict(node);
-      case PtreeElement::Array:
-        return array(node);
-      case PtreeElement::String:
-        return PropertyValue(text);
-      case PtreeElement::Integer:
-        return scalar(node, parseInteger(text), "is no integer of 64 bits");
-      case PtreeElement::Real:
-        return scalar(node, parseReal(text), "is no real number that a double can hold");
-      case PtreeElement::True:
-      case PtreeElement::False:
-        return text.empty() ? std::optional(PropertyValue(*element == PtreeElement::True))
-                            : fault(node, '<' + std::string(node.name()) + "> is not empty");
-      case PtreeElement::Data:
-        return scalar(node, parseBase64(text), "is not base64");
-      case PtreeElement::Date:
-        return scalar(node, parseDateText(text), "is not a date");
-      case PtreeElement::Key:
-        break;
+  PtreeParser() : _expat(XML_ParserCreate("UTF-8")) {
+    if (!_expat) {
+      throw std::bad_alloc();
     }
-    return fault(node, "not a value");
+    XML_SetUserData(_expat.get(), this);
+    XML_SetXmlDeclHandler(_expat.get(), [](void* self, const XML_Char* version,
+                                           const XML_Char* encoding, int /*standalone*/) {
+      handle(self, [&](PtreeParser& parser) { parser.takeDeclaration(version, encoding); });
+    });
+    XML_SetElementHandler(
+        _expat.get(),
+        [](void* self, const XML_Char* name, const XML_Char** attributes) {
+          handle(self, [&](PtreeParser& parser) { parser.takeStart(name, attributes); });
+        },
+        [](void* self, const XML_Char* /*name*/) {
+          handle(self, [](PtreeParser& parser) { parser.takeEnd(); });
+        });
+    XML_SetCharacterDataHandler(_expat.get(), [](void* self, const XML_Char* text, int length) {
+      handle(self, [&](PtreeParser& parser) {
+        parser.takeText({text, static_cast<std::size_t>(length)});
+      });
+    });
+    XML_SetDefaultHandler(_expat.get(), [](void* self, const XML_Char* token, int length) {
+      handle(self, [&](PtreeParser& parser) {
+        parser.takeOther({token, static_cast<std::size_t>(length)});
+      });
+    });
+  }
+
+  std::optional<PropertyValue> read(std::string_view document, std::string& error) {
+    if (document.size() > kLongestPtree) {
+      _fault = {1, "the document is longer than 256 MiB"};
+    } else if (document.substr(0, 2).find_first_of(std::string_view("\0\xFE\xFF", 3)) !=
+               std::string_view::npos) {
+      _fault = {1, kNoPtree};  // UTF-16, which expat would read
+    }
+    for (bool isLast = false; _fault.line == 0 && !isLast;) {
+      // Expat looks at the whole of an unfinished token again with every piece.
+      const std::string_view piece = document.substr(0, std::max(kPieceSize, _taken - _tokenStart));
+      document.remove_prefix(piece.size());
+      isLast = document.empty();
+      takePiece(piece, isLast);
+      _taken += piece.size();
+    }
+    if (_fault.line == 0) {
+      _fault = std::move(_valueFault);
+    }
+    if (_fault.line != 0) {
+      error = "line " + std::to_string(_fault.line) + ": " + _fault.message;
+      return std::nullopt;
+    }
+    return std::move(_value);
   }
 
  private:
-  std::optional<PropertyValue> fault(const pugi::xml_node& node, std::string message) {
-    _fault = {static_cast<std::size_t>(std::max<std::ptrdiff_t>(node.offset_debug(), 0)),
-              std::move(message)};
-    return std::nullopt;
+  struct Container {
+    bool isDict;
+    bool awaitsValue = false;  ///< a dictionary after a key
+    std::size_t keyLine = 0;
+    std::string key{};
+    PropertyDict dict{};
+    PropertyArray array{};
+  };
+  struct Free {
+    void operator()(XML_Parser parser) const { XML_ParserFree(parser); }
+  };
+
+  /// Runs a handler; no exception may cross expat's own code.
+  template <typename Work>
+  static void handle(void* self, Work work) {
+    PtreeParser& parser = *static_cast<PtreeParser*>(self);
+    if (parser._fault.line != 0 || parser._exception) {
+      return;  // expat delivers what belongs to the same token
+    }
+    const XML_Parser expat = parser._expat.get();
+    parser._tokenStart =
+        static_cast<std::size_t>(XML_GetCurrentByteIndex(expat) + XML_GetCurrentByteCount(expat));
+    try {
+      work(parser);
+    } catch (Fault& fault) {
+      parser._fault = std::move(fault);
+    } catch (...) {
+      parser._exception = std::current_exception();
+    }
+    if (parser._fault.line != 0 || parser._exception) {
+      XML_StopParser(expat, XML_FALSE);
+    }
+  }
+
+  void takePiece(std::string_view piece, bool isLast) {
+    // Not even for an empty piece is a buffer of 0 bytes to be had.
+    void* buffer = XML_GetBuffer(_expat.get(), static_cast<int>(piece.size()) + 1);
+    if (buffer == nullptr) {
+      throw std::bad_alloc();
+    }
+    piece.copy(static_cast<char*>(buffer), piece.size());
+    const XML_Status status =
+        XML_ParseBuffer(_expat.get(), static_cast<int>(piece.size()), isLast ? 1 : 0);
+    if (_exception) {
+      std::rethrow_exception(_exception);
+    }
+    if (status == XML_STATUS_OK || _fault.line != 0) {
+      return;
+    }
+    const XML_Error error = XML_GetErrorCode(_expat.get());
+    if (error == XML_ERROR_NO_MEMORY) {
+      throw std::bad_alloc();
+    }
+    try {
+      explain(error);
+    } catch (Fault& fault) {
+      _fault = std::move(fault);
+    }
+  }
+
+  std::size_t line() const { return XML_GetCurrentLineNumber(_expat.get()) - _linesIntoToken; }
+  [[noreturn]] void fail(std::string message) const { throw Fault{line(), std::move(message)}; }
+
+  /// Notes a text that is not what its element says; faults of the grammar go before it.
+  void failValue(std::size_t line, std::string message) {
+    if (_valueFault.line == 0) {
+      _valueFault = {line, std::move(message)};
+    }
+  }
+
+  void takeDeclaration(std::string_view version, const XML_Char* encoding) const {
+    if (version != "1.0") {
+      fail(kNoXmlVersion);
+    }
+    const auto sameLetter = [](char c, char upper) {
+      return c == upper || (c >= 'a' && c <= 'z' && c - 'a' + 'A' == upper);
+    };
+    constexpr std::string_view kUtf8 = "UTF-8";
+    if (const std::string_view name = encoding != nullptr ? encoding : kUtf8;
+        !std::equal(name.begin(), name.end(), kUtf8.begin(), kUtf8.end(), sameLetter)) {
+      fail("the encoding is not UTF-8");
+    }
+  }
+
+  void takeStart(std::string_view name, const XML_Char** attributes) {
+    if (_rootLine == 0) {
+      if (name != "ptree") {
+        fail(kNoPtree);
+      }
+      if (attributes[0] == nullptr || std::string_view(attributes[0]) != "version" ||
+          std::string_view(attributes[1]) != "1.0") {
+        fail(kNoVersion);
+      }
+      if (attributes[2] != nullptr) {
+        fail("malformed <ptree> tag");
+      }
+      _rootLine = line();
+      return;
+    }
+    const Element element = place(name);
+    if (attributes[0] != nullptr) {
+      fail('<' + std::string(name) + "> cannot have attributes");
+    }
+    if (element != Element::Dict && element != Element::Array) {
+      _inText = true;
+      _element = element;
+      _elementLine = line();
+      _text.clear();
+    } else if (_open.size() == kMostNestedLevels) {
+      fail(kNestedTooDeeply);
+    } else {
+      _open.push_back({element == Element::Dict});
+    }
+  }
+
+  /// The element of a name, which must be allowed at this place.
+  Element place(std::string_view name) {
+    if (_inText) {
+      fail("an element inside <" + std::string(expectedEnd()) + '>');
+    }
+    const auto* known = std::find(kElementNames.begin(), kElementNames.end(), name);
+    if (known == kElementNames.end()) {
+      fail(name.empty() ? "malformed tag" : "unknown element " + quotedText(name));
+    }
+    const auto element = static_cast<Element>(known - kElementNames.begin());
+    const bool isKey = element == Element::Key;
+    if (_open.empty() && std::exchange(_hasValue, true)) {
+      fail("more than one value");
+    }
+    if (_open.empty() || !_open.back().isDict) {
+      if (isKey) {
+        fail("a key where a value is expected");
+      }
+      return element;
+    }
+    Container& dict = _open.back();
+    if (isKey && dict.awaitsValue) {
+      failAtKey(dict);
+    }
+    if (!isKey && !dict.awaitsValue) {
+      fail("a value without a key");
+    }
+    dict.awaitsValue = isKey;
+    return element;
+  }
+
+  [[noreturn]] static void failAtKey(const Container& dict) {
+    throw Fault{dict.keyLine, "the key " + quotedText(dict.key) + " has no value"};
+  }
+
+  std::string_view expectedEnd() const {
+    return _inText               ? kElementNames[static_cast<std::size_t>(_element)]
+           : _open.empty()       ? "ptree"
+           : _open.back().isDict ? "dict"
+                                 : "array";
+  }
+
+  void takeEnd() {
+    if (std::exchange(_inText, false)) {
+      if (_element == Element::Key) {
+        _open.back().key = _text;
+        _open.back().keyLine = _elementLine;
+      } else {
+        add(textValue());
+      }
+    } else if (_open.empty()) {
+      _finished = true;
+      if (!_hasValue) {
+        failValue(_rootLine, "a document without a value");
+      }
+    } else {
+      Container& container = _open.back();
+      if (container.awaitsValue) {
+        failAtKey(container);
+      }
+      PropertyValue value = container.isDict ? PropertyValue(std::move(container.dict))
+                                             : PropertyValue(std::move(container.array));
+      _open.pop_back();
+      add(std::move(value));
+    }
+  }
+
+  void add(PropertyValue value) {
+    if (_open.empty()) {
+      _value = std::move(value);
+    } else if (_open.back().isDict) {
+      _open.back().dict.set(_open.back().key, std::move(value));
+    } else {
+      _open.back().array.push_back(std::move(value));
+    }
+  }
+
+  PropertyValue textValue() {
+    switch (_element) {
+      case Element::Integer:
+        return parsed(parseInteger(_text), "is no integer of 64 bits");
+      case Element::Real:
+        return parsed(parseReal(_text), "is no real number that a double can hold");
+      case Element::Data:
+        return parsed(parseBase64(_text), "is not base64");
+      case Element::Date:
+        return parsed(parseDateText(_text), "is not a date");
+      case Element::True:
+      case Element::False:
+        if (!_text.empty()) {
+          failValue(_elementLine,
+                    '<' + std::string(kElementNames[static_cast<std::size_t>(_element)]) +
+                        "> is not empty");
+        }
+        return _element == Element::True;
+      default:
+        return std::string_view(_text);
+    }
   }
 
   template <typename T>
-  std::optional<PropertyValue> scalar(const pugi::xml_node& node, std::optional<T> parsed,
-                                      const char* complaint) {
-    return parsed ? std::optional(PropertyValue(*std::move(parsed)))
-                  : fault(node, quotedText(node.value()) + ' ' + complaint);
+  PropertyValue parsed(std::optional<T> content, const char* complaint) {
+    if (!content) {
+      failValue(_elementLine, quotedText(_text) + ' ' + complaint);
+      return false;
+    }
+    return *std::move(content);
   }
 
-  std::optional<PropertyValue> dict(const pugi::xml_node& node) {
-    PropertyDict dict;
-    for (pugi::xml_node key = elementFrom(node.first_child()); key;) {
-      const pugi::xml_node entry = elementFrom(key.next_sibling());
-      std::optional<PropertyValue> read = value(entry);
-      if (!read) {
-        return std::nullopt;
+  void takeText(std::string_view text) {
+    if (_inText) {
+      _text += text;
+      return;
+    }
+    // White space that a reference stands for is longer in the document, more than a line end is.
+    const auto length = static_cast<std::size_t>(XML_GetCurrentByteCount(_expat.get()));
+    if (text.find_first_not_of(kWhiteSpace) != std::string_view::npos || length > text.size() + 1) {
+      fail(kTextOutside);
+    }
+  }
+
+  /// Comments, white space outside of the root element and all markup that has no place here.
+  void takeOther(std::string_view token) const {
+    if (token.starts_with("<!--") || token.find_first_not_of(kWhiteSpace) == token.npos) {
+      return;
+    }
+    if (_finished) {
+      fail("something follows the end of the document");
+    }
+    failAtMarkup(token);
+  }
+
+  void failAtMarkup(std::string_view token) const {
+    if (token.starts_with("<![CDATA[")) {
+      fail("a ptree document holds no CDATA sections");
+    }
+    if (token.starts_with("<!--")) {
+      fail("a malformed comment");
+    }
+    if (token.starts_with("<!")) {
+      fail("a ptree document has no DOCTYPE");
+    }
+    if (token.starts_with("<?")) {
+      fail("a ptree document holds no processing instructions");
+    }
+  }
+
+  /// Fails with a text for what expat has refused, in the words of ptree documents.
+  [[noreturn]] void explain(XML_Error error) {
+    int offset = 0;
+    int size = 0;
+    const char* context = XML_GetInputContext(_expat.get(), &offset, &size);
+    const std::string_view input(context, context != nullptr ? static_cast<std::size_t>(size) : 0);
+    // Expat points into the token that it cannot read; all before it have been handled.
+    const std::size_t faultInToken =
+        static_cast<std::size_t>(XML_GetCurrentByteIndex(_expat.get())) - _tokenStart;
+    const auto at = static_cast<std::size_t>(offset);
+    const std::string_view token = input.substr(at - std::min(at, faultInToken));
+    const std::string_view upToFault = token.substr(0, faultInToken);
+    _linesIntoToken =
+        static_cast<std::size_t>(std::count(upToFault.begin(), upToFault.end(), '\n'));
+    if (_finished) {
+      fail("something follows the end of the document");
+    }
+    if (_rootLine == 0) {
+      const std::string_view tag = token.substr(0, token.find('>'));
+      const bool saysVersion = tag.find("\"1.0\"") != tag.npos || tag.find("'1.0'") != tag.npos;
+      if (token.starts_with("<?xml") && error != XML_ERROR_MISPLACED_XML_PI) {
+        fail(saysVersion ? "malformed XML declaration" : kNoXmlVersion);
       }
-      dict.set(key.value(), *std::move(read));
-      key = elementFrom(entry.next_sibling());
+      failAtMarkup(token);
+      fail(!token.starts_with('<') || nameAt(token.substr(1)) != "ptree" ? kNoPtree
+           : saysVersion                                                 ? "malformed <ptree> tag"
+                                                                         : kNoVersion);
     }
-    return dict;
+    if (error == XML_ERROR_NO_ELEMENTS) {
+      fail("the document ends early");
+    }
+    if (token.starts_with("</")) {
+      const std::string_view name = nameAt(token.substr(2));
+      fail(name == expectedEnd() ? "malformed tag"
+                                 : '<' + std::string(expectedEnd()) + "> is not ended by " +
+                                       quotedText("</" + std::string(name) + '>'));
+    }
+    if (token.starts_with('<')) {
+      failAtMarkup(token);
+      failAtStartTag(token.substr(1));
+    }
+    if (!_inText) {
+      fail(kTextOutside);
+    }
+    if (token.starts_with('&')) {
+      const bool malformed = error == XML_ERROR_INVALID_TOKEN && !token.starts_with("&#;") &&
+                             !token.starts_with("&#x;");
+      fail(!token.starts_with("&#") ? "an unknown entity"
+           : malformed              ? "a malformed character reference"
+                                    : "a reference to a character that XML does not allow");
+    }
+    fail(xmlCharacterLength(token.substr(upToFault.size())) == 0
+             ? "a character that is not UTF-8 or that XML does not allow"
+             : "\"]]>\" in a text");
   }
 
-  std::optional<PropertyValue> array(const pugi::xml_node& node) {
-    PropertyArray array;
-    for (pugi::xml_node element = elementFrom(node.first_child()); element;
-         element = elementFrom(element.next_sibling())) {
-      std::optional<PropertyValue> read = value(element);
-      if (!read) {
-        return std::nullopt;
-      }
-      array.push_back(*std::move(read));
-    }
-    return array;
+  [[noreturn]] void failAtStartTag(std::string_view tag) {
+    const std::string_view name = nameAt(tag);
+    place(name);
+    const std::string_view rest = tag.substr(name.size());
+    const std::string_view next =
+        rest.substr(std::min(rest.find_first_not_of(kWhiteSpace), rest.size()));
+    fail(next.size() != rest.size() && !next.starts_with('/')
+             ? '<' + std::string(name) + "> cannot have attributes"
+             : "malformed tag");
   }
 
-  /// The node, or the next one that is an element: what lies between is white space.
-  static pugi::xml_node elementFrom(pugi::xml_node node) {
-    while (node && node.type() != pugi::node_element) {
-      node = node.next_sibling();
-    }
-    return node;
+  static std::string_view nameAt(std::string_view text) {
+    constexpr std::size_t kLongest = 64;
+    const auto* end = std::find_if(text.begin(), text.end(), [](char c) {
+      return !((c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') ||
+               c == '_' || c == ':' || c == '-' || c == '.' ||
+               static_cast<std::uint8_t>(c) >= 0x80);
+    });
+    return text.substr(0, std::min(static_cast<std::size_t>(end - text.begin()), kLongest));
   }
 
-  PtreeFault& _fault;
+  std::unique_ptr<XML_ParserStruct, Free> _expat;
+  Fault _fault;
+  Fault _valueFault;
+  std::exception_ptr _exception;
+  std::size_t _taken = 0;           ///< bytes of the document
+  std::size_t _tokenStart = 0;      ///< of the token after the last one that was handled
+  std::size_t _rootLine = 0;        ///< 0 before the root element
+  std::size_t _linesIntoToken = 0;  ///< where a fault lies
+  bool _hasValue = false;
+  bool _finished = false;
+  bool _inText = false;  ///< in an element that holds no others
+  Element _element{};    ///< that element
+  std::size_t _elementLine = 0;
+  std::string _text;
+  std::vector<Container> _open;
+  std::optional<PropertyValue> _value;
 };
-
-std::string lineMessage(std::string_view document, const PtreeFault& fault) {
-  const std::string_view before = document.substr(0, fault.offset);
-  const auto line = 1 + std::count(before.begin(), before.end(), '\n');
-  return "line " + std::to_string(line) + ": " + fault.message;
-}
 
 }  // namespace
 
 std::optional<PropertyValue> readPtree(std::string_view bytes, std::string& error) {
-  PtreeFault fault;
-  const std::optional<std::size_t> rootStart = checkPtreeSyntax(bytes, fault);
-  if (!rootStart) {
-    error = lineMessage(bytes, fault);
-    return std::nullopt;
-  }
-  const std::string_view body = bytes.substr(*rootStart);
-  // White space is a text only where an element holds nothing else. A text is kept in its element,
-  // which saves a node for each.
-  constexpr unsigned kOptions = pugi::parse_escapes | pugi::parse_eol |
-                                pugi::parse_ws_pcdata_single | pugi::parse_embed_pcdata;
-  pugi::xml_document document;
-  const pugi::xml_parse_result result =
-      document.load_buffer(body.data(), body.size(), kOptions, pugi::encoding_utf8);
-  std::optional<PropertyValue> value;
-  if (result) {
-    const pugi::xml_node root = document.child("ptree");
-    const pugi::xml_node first = root.find_child(
-        [](const pugi::xml_node& child) { return child.type() == pugi::node_element; });
-    fault = {static_cast<std::size_t>(std::max<std::ptrdiff_t>(root.offset_debug(), 0)),
-             "a document without a value"};
-    value = first ? TreeReader(fault).value(first) : std::nullopt;
-  } else {
-    fault = {static_cast<std::size_t>(std::max<std::ptrdiff_t>(result.offset, 0)),
-             result.description()};
-  }
-  if (!value) {
-    fault.offset += *rootStart;
-    error = lineMessage(bytes, fault);
-  }
-  return value;
+  return PtreeParser().read(bytes, error);
 }
 
 }  // namespace vesprun

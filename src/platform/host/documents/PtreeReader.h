@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstddef>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -8,11 +9,16 @@
 
 namespace vesprun {
 
+/// The longest ptree document that is read, in bytes: 256 MiB.
+inline constexpr std::size_t kLongestPtree = std::size_t{256} << 20;
+
 /// Reads a ptree document in its XML form. Nothing when the bytes are not one; `error` then says
 /// why, beginning with the line ("line 12: ...").
 ///
 /// - UTF-8 only, with or without byte order mark and XML declaration; `<ptree version="1.0">` holds
 ///   one value, dictionaries and arrays at most 200 deep.
+/// - Comments are skipped wherever XML allows them. DOCTYPE, CDATA sections and processing
+///   instructions are refused.
 /// - `integer`: an optional minus and decimal digits, nothing else, from −2^63 to 2^64−1; a signed
 ///   64-bit number when it fits, else an unsigned one.
 /// - `real`: a decimal number that a double can hold, "inf", "-inf" or "nan"; a double.
@@ -20,6 +26,9 @@ namespace vesprun {
 /// - A repeated key keeps its first place and its last value.
 /// - White space counts in keys and strings, also where there is nothing else; in numbers and dates
 ///   it is refused, between elements it is skipped. `true` and `false` are empty.
+///
+/// The document, its value and the reading together take less than eight times the document's size;
+/// measured with documents of the smallest elements.
 std::optional<PropertyValue> readPtree(std::string_view bytes, std::string& error);
 
 }  // namespace vesprun

@@ -5,7 +5,7 @@
 #include <cstddef>
 #include <string_view>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/host/documents/Base64.h"
 #include "platform/host/documents/NestedPlace.h"
 #include "platform/host/documents/QuotedText.h"

@@ -5,8 +5,11 @@
 
 namespace vesprun {
 
-/// A piece of somebody's text for a message of one line: in double quotes, cut after some forty
-/// characters, with "\xNN" for every byte that is no printable character.
+/// Somebody's text for a terminal: "\xNN" for every byte of a control character and every byte
+/// that is not UTF-8. It is one line.
+std::string printableText(std::string_view text);
+
+/// The same for a message: in double quotes, cut after 40 characters.
 std::string quotedText(std::string_view text);
 
 }  // namespace vesprun

@@ -17,16 +17,11 @@ namespace {
 
 constexpr mode_t kOwnerOnly = 0600;
 constexpr std::size_t kPieceSize = 64 * 1024;
-// A document that replaces another stands here, complete, for the moment between its two steps.
-constexpr const char* kReplacementName = ".replacement";
 constexpr int kMostUnfinished = 100;
 
 FileDescriptor openFolder(const std::string& folder) {
   return FileDescriptor(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
 }
-
-/// The path under which a nameless file of this process can be linked into a folder.
-std::string procPath(int descriptor) { return "/proc/self/fd/" + std::to_string(descriptor); }
 
 }  // namespace
 
@@ -53,7 +48,7 @@ std::optional<AtomicFile> AtomicFile::create(const std::string& folder, std::str
     error = systemError(folder);
     return std::nullopt;
   }
-  if (!file.openUnnamed() && !file.openUnfinished(error)) {
+  if (!file.openUnfinished(error)) {
     return std::nullopt;
   }
   if (fchmod(file._file.get(), kOwnerOnly) != 0) {  // whatever the process's file mode mask says
@@ -61,17 +56,6 @@ std::optional<AtomicFile> AtomicFile::create(const std::string& folder, std::str
     return std::nullopt;
   }
   return file;
-}
-
-bool AtomicFile::openUnnamed() {
-  FileDescriptor file(
-      openat(_folderDescriptor.get(), ".", O_TMPFILE | O_WRONLY | O_CLOEXEC, kOwnerOnly));
-  // Without /proc a nameless file could never get a name.
-  if (!file.isOpen() || access(procPath(file.get()).c_str(), F_OK) != 0) {
-    return false;
-  }
-  _file = std::move(file);
-  return true;
 }
 
 bool AtomicFile::openUnfinished(std::string& error) {
@@ -144,14 +128,6 @@ bool AtomicFile::makeDurable(const std::string& name, std::string& error) {
   return _failure.empty();
 }
 
-bool AtomicFile::link(const std::string& name) const {
-  const int folder = _folderDescriptor.get();
-  return _unfinishedName.empty()
-             ? linkat(AT_FDCWD, procPath(_file.get()).c_str(), folder, name.c_str(),
-                      AT_SYMLINK_FOLLOW) == 0
-             : linkat(folder, _unfinishedName.c_str(), folder, name.c_str(), 0) == 0;
-}
-
 bool AtomicFile::syncFolder(std::string& error) const {
   if (fsync(_folderDescriptor.get()) != 0) {
     error = systemError(_folder);
@@ -160,64 +136,35 @@ bool AtomicFile::syncFolder(std::string& error) const {
   return true;
 }
 
-bool AtomicFile::replace(const std::string& name, std::string& error, const FolderLock* held) {
+bool AtomicFile::replace(const std::string& name, std::string& error) {
   if (!makeDurable(name, error)) {
     return false;
   }
   const int folder = _folderDescriptor.get();
-  if (!_unfinishedName.empty()) {
-    if (renameat(folder, _unfinishedName.c_str(), folder, name.c_str()) != 0) {
-      error = systemError(pathOf(name));
-      return false;
-    }
-    _unfinishedName.clear();
-    return syncFolder(error);
-  }
-  if (held == nullptr && !takeLock(folder, LOCK_EX, kLongestLockWait, _folder, error)) {
-    return false;
-  }
-  const bool replaced = replaceThroughHiddenName(name, error);
-  if (held == nullptr) {
-    flock(folder, LOCK_UN);
-  }
-  return replaced && syncFolder(error);
-}
-
-bool AtomicFile::replaceThroughHiddenName(const std::string& name, std::string& error) const {
-  const int folder = _folderDescriptor.get();
-  if (link(name)) {
-    return true;
-  }
-  if (errno != EEXIST) {
+  if (renameat(folder, _unfinishedName.c_str(), folder, name.c_str()) != 0) {
     error = systemError(pathOf(name));
     return false;
   }
-  // Under the folder's lock such a name can only be what a killed process left.
-  if ((unlinkat(folder, kReplacementName, 0) != 0 && errno != ENOENT) || !link(kReplacementName)) {
-    error = systemError(pathOf(kReplacementName));
-    return false;
-  }
-  if (renameat(folder, kReplacementName, folder, name.c_str()) != 0) {
-    error = systemError(pathOf(name));
-    unlinkat(folder, kReplacementName, 0);
-    return false;
-  }
-  return true;
+  _unfinishedName.clear();
+  return syncFolder(error);
 }
 
 AtomicFile::Added AtomicFile::addNew(const std::string& name, std::string& error) {
   if (!makeDurable(name, error)) {
     return Added::Failed;
   }
-  if (!link(name)) {
+  // Not renamed, which would replace a file of that name.
+  const int folder = _folderDescriptor.get();
+  if (linkat(folder, _unfinishedName.c_str(), folder, name.c_str(), 0) != 0) {
     if (errno == EEXIST) {
       return Added::NameTaken;
     }
     error = systemError(pathOf(name));
     return Added::Failed;
   }
+  unlinkat(folder, std::exchange(_unfinishedName, {}).c_str(), 0);
   if (!syncFolder(error)) {
-    unlinkat(_folderDescriptor.get(), name.c_str(), 0);
+    unlinkat(folder, name.c_str(), 0);
     return Added::Failed;
   }
   return Added::Done;

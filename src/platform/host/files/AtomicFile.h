@@ -5,14 +5,12 @@
 #include <string_view>
 
 #include "platform/host/files/FileDescriptor.h"
-#include "platform/host/files/FileLock.h"
 
 namespace vesprun {
 
-/// A whole document on its way into a folder. It appears under its name complete and durable, or
-/// not at all: a process killed at any moment leaves no part of it under any name where the file
-/// system knows nameless files. Elsewhere such a part may stay as ".unfinished-N" until a later
-/// document is written over it.
+/// A whole document on its way into a folder, written under the name ".unfinished-N". It appears
+/// under its own name complete and durable, or not at all. What a process that was killed left
+/// behind is written over by a later document.
 ///
 /// Files are readable and writable for their owner alone. Dropping the object before it got a name
 /// drops the document. Error texts name the path and the cause.
@@ -29,11 +27,10 @@ class AtomicFile {
   /// name, and `replace` and `addNew` repeat the reason.
   bool append(std::string_view bytes);
 
-  /// Gives the document its name in the folder, in place of the file that has it. Takes the
-  /// folder's lock for a moment, unless the caller shows that it holds it already. False, with a
-  /// text in `error`, when that failed: the earlier file is still there, unless only making the
-  /// new name durable failed.
-  bool replace(const std::string& name, std::string& error, const FolderLock* held = nullptr);
+  /// Gives the document its name in the folder, in place of the file that has it. False, with a
+  /// text in `error`, when that failed: the earlier file is still there, unless only making the new
+  /// name durable failed.
+  bool replace(const std::string& name, std::string& error);
 
   enum class Added { Done, NameTaken, Failed };
 
@@ -44,19 +41,16 @@ class AtomicFile {
  private:
   AtomicFile(std::string folder, FileDescriptor folderDescriptor);
 
-  bool openUnnamed();
   bool openUnfinished(std::string& error);
   bool writeOut(std::string_view bytes);
   bool makeDurable(const std::string& name, std::string& error);
-  bool link(const std::string& name) const;
   bool syncFolder(std::string& error) const;
-  bool replaceThroughHiddenName(const std::string& name, std::string& error) const;
   std::string pathOf(const std::string& name) const { return _folder + '/' + name; }
 
   std::string _folder;
   FileDescriptor _folderDescriptor;
   FileDescriptor _file;
-  std::string _unfinishedName;  ///< empty while the file has no name at all
+  std::string _unfinishedName;  ///< empty when the document has its own name
   std::string _pending;         ///< bytes not handed to the kernel yet
   std::string _failure;         ///< the first reason why an `append` failed
 };

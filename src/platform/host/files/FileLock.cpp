@@ -11,7 +11,7 @@
 namespace vesprun {
 
 bool takeLock(int descriptor, int operation, std::chrono::milliseconds longestWait,
-              const std::string& path, std::string& error) {
+              const std::string& path, std::string& error, bool* busy) {
   constexpr std::chrono::milliseconds kPause(1);
   const auto end = std::chrono::steady_clock::now() + longestWait;
   while (flock(descriptor, operation | LOCK_NB) != 0) {
@@ -21,6 +21,9 @@ bool takeLock(int descriptor, int operation, std::chrono::milliseconds longestWa
     }
     if (std::chrono::steady_clock::now() >= end) {
       error = path + ": another process keeps it locked";
+      if (busy != nullptr) {
+        *busy = true;
+      }
       return false;
     }
     std::this_thread::sleep_for(kPause);
@@ -29,14 +32,14 @@ bool takeLock(int descriptor, int operation, std::chrono::milliseconds longestWa
 }
 
 std::optional<FolderLock> FolderLock::take(const std::string& folder, std::string& error, Kind kind,
-                                           std::chrono::milliseconds longestWait) {
+                                           std::chrono::milliseconds longestWait, bool* busy) {
   FileDescriptor descriptor(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
   if (!descriptor.isOpen()) {
     error = systemError(folder);
     return std::nullopt;
   }
   if (!takeLock(descriptor.get(), kind == Kind::Shared ? LOCK_SH : LOCK_EX, longestWait, folder,
-                error)) {
+                error, busy)) {
     return std::nullopt;
   }
   return FolderLock(std::move(descriptor));

@@ -13,11 +13,23 @@
 
 namespace vesprun {
 
-bool JsonLines::open() {
-  // Reading, to see how the last line ends; not blocking, in case it is no file.
-  _file = FileDescriptor(
-      ::open(_path.c_str(), O_RDWR | O_APPEND | O_CREAT | O_CLOEXEC | O_NONBLOCK, 0600));
-  return _file.isOpen();
+bool JsonLines::open(std::string& error) {
+  // Reading, to see how the last line ends; not blocking, in case it is no file. A link could lead
+  // the lines out of the device.
+  FileDescriptor file(::open(
+      _path.c_str(), O_RDWR | O_APPEND | O_CREAT | O_CLOEXEC | O_NONBLOCK | O_NOFOLLOW, 0600));
+  struct stat status {};
+  if (!file.isOpen() || fstat(file.get(), &status) != 0 ||
+      ((status.st_mode & 0777) != 0600 && fchmod(file.get(), 0600) != 0)) {
+    error = errno == ELOOP ? _path + ": a symbolic link" : systemError(_path);
+    return false;
+  }
+  if (!S_ISREG(status.st_mode)) {
+    error = _path + ": not a regular file";
+    return false;
+  }
+  _file = std::move(file);
+  return true;
 }
 
 bool JsonLines::append(std::string_view line, std::string& error) {
@@ -29,8 +41,7 @@ bool JsonLines::append(std::string_view line, std::string& error) {
   struct stat status {};
   // A file that was deleted meanwhile would take the line with it.
   const bool usable = _file.isOpen() && fstat(_file.get(), &status) == 0 && status.st_nlink != 0;
-  if (!usable && !open()) {
-    error = systemError(_path);
+  if (!usable && !open(error)) {
     return false;
   }
   const bool locked = takeLock(_file.get(), LOCK_EX, _wait, _path, error);

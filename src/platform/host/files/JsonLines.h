@@ -11,8 +11,8 @@
 namespace vesprun {
 
 /// Appends lines to a file that several processes and threads may append to at once. Each line is
-/// one write, so that lines never mix. The file is made with its first line, for its owner alone,
-/// and stays open.
+/// one write, so that lines never mix. The file is made with its first line and stays open. It is
+/// for its owner alone, also when it was not before, and nothing but a regular file.
 class JsonLines {
  public:
   /// What another process has locked is waited for, `longestWait` at most; after one wait in vain,
@@ -26,7 +26,7 @@ class JsonLines {
   bool append(std::string_view line, std::string& error);
 
  private:
-  bool open();
+  bool open(std::string& error);
   bool appendLocked(std::string_view line, std::string& error);
 
   std::string _path;

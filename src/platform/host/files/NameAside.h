@@ -3,7 +3,7 @@
 #include <string>
 #include <string_view>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/Clock.h"
 
 namespace vesprun {

@@ -7,4 +7,8 @@ namespace vesprun {
 /// To be called before anything is opened.
 void holdStandardStreams();
 
+/// From now on, memory that runs out where no exception may leave, such as in a destructor, ends
+/// the process with `status` and one line on standard error. `program` stays for ever.
+void exitWithoutMemory(const char* program, int status);
+
 }  // namespace vesprun

@@ -26,9 +26,15 @@ class UnixPeer final : public PeerConnection {
   void setMessageHandler(MessageHandler handler) override { _handler = std::move(handler); }
   void start() override { _started = true; }
 
-  /// When it came, or last sent anything.
-  std::chrono::steady_clock::time_point lastHeard() const { return _lastHeard; }
   void noteHeard() { _lastHeard = std::chrono::steady_clock::now(); }
+  void noteMessage() { _hasSentMessage = true; }
+
+  /// Whether this one makes room before `other` does: first those that have sent no whole message,
+  /// then those that came or last sent anything longer ago.
+  bool isLessWorth(const UnixPeer& other) const {
+    return std::pair(_hasSentMessage, _lastHeard) <
+           std::pair(other._hasSentMessage, other._lastHeard);
+  }
 
   int descriptor() const { return _socket.get(); }
   bool isStarted() const { return _started; }
@@ -44,6 +50,7 @@ class UnixPeer final : public PeerConnection {
   MessageHandler _handler;
   MessageAssembler _assembler;
   std::chrono::steady_clock::time_point _lastHeard = std::chrono::steady_clock::now();
+  bool _hasSentMessage = false;
   bool _started = false;
 };
 
@@ -105,11 +112,11 @@ class UnixServiceListener final : public ServiceListener {
       return;
     }
     if (_peers.size() == kMostPeers) {
-      const auto quietest =
+      const auto least =
           std::min_element(_peers.begin(), _peers.end(), [](const auto& left, const auto& right) {
-            return left.second->lastHeard() < right.second->lastHeard();
+            return left.second->isLessWorth(*right.second);
           });
-      drop(*PeerPointer(quietest->second), "others wait, and it has been silent longest");
+      drop(*PeerPointer(least->second), "others wait, and it has been silent longest");
     }
     const auto peer = std::make_shared<UnixPeer>(std::move(socket));
     _peers.emplace(peer->descriptor(), peer);
@@ -150,6 +157,7 @@ class UnixServiceListener final : public ServiceListener {
         drop(*peer, error);
         return;
       }
+      peer->noteMessage();
       queueWork([peer, message = *std::move(message)] { peer->deliver(message); });
     }
     if (progress == MessageAssembler::Progress::TooLong) {

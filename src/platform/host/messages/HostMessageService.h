@@ -15,7 +15,8 @@ namespace vesprun {
 /// A new peer is one event of the main loop, and so is each message. A peer that is another user
 /// (unless that is root), sends what is no message, or ends in the middle of one loses its
 /// connection, and the system log says why. At most 16 peers are served at a time; one more takes
-/// the place of the one that has been silent longest. A message that arrived whole is delivered
+/// the place of one that has sent no whole message, or else of any: the one that has been silent
+/// longest. A message that arrived whole is delivered
 /// even if its peer is gone by then.
 ///
 /// All references must outlive the listeners, and a listener must not be destroyed by one of its

@@ -15,8 +15,8 @@ bool isPartOfPath(std::string_view name) {
 }  // namespace
 
 HostPreferences::HostPreferences(const DeviceDirectory& device, Clock& clock, SystemLog& log,
-                                 std::string_view user)
-    : _device(device), _clock(clock), _log(log) {
+                                 std::string_view user, std::chrono::milliseconds longestWait)
+    : _device(device), _clock(clock), _log(log), _longestWait(longestWait) {
   if (isPartOfPath(user)) {
     _folder = "var/" + std::string(user) + "/Library/Preferences";
   } else {
@@ -30,7 +30,7 @@ HostPreferences::HostPreferences(const DeviceDirectory& device, Clock& clock, Sy
 
 HostPreferences::~HostPreferences() {
   for (auto& [domain, file] : _files) {
-    file.synchronize();
+    runGuarded(_log, "preferences", [&changed = file] { changed.synchronize(); });
   }
 }
 
@@ -48,7 +48,7 @@ PreferenceFile* HostPreferences::file(std::string_view domain) {
     return nullptr;
   }
   const auto added =
-      _files.try_emplace(std::string(domain), _device, _clock, _log, _folder, domain);
+      _files.try_emplace(std::string(domain), _device, _clock, _log, _folder, domain, _longestWait);
   return &added.first->second;
 }
 

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <chrono>
 #include <functional>
 #include <map>
 #include <mutex>
@@ -12,6 +13,7 @@
 #include "platform/Preferences.h"
 #include "platform/SystemLog.h"
 #include "platform/host/device/DeviceDirectory.h"
+#include "platform/host/files/FileLock.h"
 #include "platform/host/preferences/PreferenceFile.h"
 
 namespace vesprun {
@@ -31,9 +33,11 @@ struct PreferenceFolder {
 class HostPreferences final : public Preferences {
  public:
   /// The preferences of a user: var/USER/Library/Preferences. What the references name must outlive
-  /// the object; the log must stand being written to by several threads.
+  /// the object; the log must stand being written to by several threads. While another process
+  /// changes something in the folder, `LGSPreferencesSynchronize` waits for `longestWait` at most.
   HostPreferences(const DeviceDirectory& device, Clock& clock, SystemLog& log,
-                  std::string_view user = "mobile");
+                  std::string_view user = "mobile",
+                  std::chrono::milliseconds longestWait = kLongestLockWait);
 
   /// Those of another folder, such as Library/Logsmith.
   HostPreferences(const DeviceDirectory& device, Clock& clock, SystemLog& log,
@@ -63,6 +67,7 @@ class HostPreferences final : public Preferences {
   Clock& _clock;
   SystemLog& _log;
   std::string _folder;  ///< empty when the user's name was refused
+  std::chrono::milliseconds _longestWait = kLongestLockWait;
   std::mutex _mutex;
   std::map<std::string, PreferenceFile, std::less<>> _files;
   std::set<std::string, std::less<>> _refused;  ///< domains

@@ -9,6 +9,7 @@
 #include "platform/host/documents/PtreeReader.h"
 #include "platform/host/documents/PtreeWriter.h"
 #include "platform/host/files/AtomicFile.h"
+#include "platform/host/files/FileLock.h"
 #include "platform/host/files/NameAside.h"
 #include "platform/host/files/SystemError.h"
 #include "platform/host/files/WholeFile.h"
@@ -16,13 +17,15 @@
 namespace vesprun {
 
 PreferenceFile::PreferenceFile(const DeviceDirectory& device, Clock& clock, SystemLog& log,
-                               std::string folder, std::string_view domain)
+                               std::string folder, std::string_view domain,
+                               std::chrono::milliseconds longestWait)
     : _device(device),
       _clock(clock),
       _log(log),
       _folder(std::move(folder)),
       _name(std::string(domain) + ".ptree"),
-      _path(device.hostPath(_folder) + '/' + _name) {}
+      _path(device.hostPath(_folder) + '/' + _name),
+      _longestWait(longestWait) {}
 
 PreferenceFile::Content PreferenceFile::read() const {
   Content content;
@@ -114,7 +117,8 @@ bool PreferenceFile::writeChanges(std::string& error) {
   if (!folder) {
     return false;
   }
-  const std::optional<FolderLock> lock = FolderLock::take(*folder, error);
+  const std::optional<FolderLock> lock =
+      FolderLock::take(*folder, error, FolderLock::Kind::Exclusive, _longestWait);
   if (!lock) {
     return false;
   }
@@ -144,7 +148,7 @@ bool PreferenceFile::writeChanges(std::string& error) {
     return false;
   }
   file->append(document);  // a failure is told by `replace`
-  return file->replace(_name, error, &*lock);
+  return file->replace(_name, error);
 }
 
 bool PreferenceFile::keepAside(std::string& error) const {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <chrono>
 #include <map>
 #include <optional>
 #include <string>
@@ -20,9 +21,10 @@ namespace vesprun {
 /// that cannot be read at all is never written over. Both are told in the system log.
 class PreferenceFile {
  public:
-  /// `folder` is a path of the device; it is made with the first document.
+  /// `folder` is a path of the device; it is made with the first document. While another process
+  /// keeps it locked, a change waits for `longestWait` at most.
   PreferenceFile(const DeviceDirectory& device, Clock& clock, SystemLog& log, std::string folder,
-                 std::string_view domain);
+                 std::string_view domain, std::chrono::milliseconds longestWait);
 
   std::optional<PropertyValue> get(std::string_view key);
 
@@ -61,6 +63,7 @@ class PreferenceFile {
   std::string _folder;
   std::string _name;
   std::string _path;  ///< of the document, on the host
+  std::chrono::milliseconds _longestWait;
   std::optional<PropertyDict> _stored;
   std::map<std::string, std::optional<PropertyValue>> _changes;
   std::string _reported;  ///< the last complaint about the document, which is made once

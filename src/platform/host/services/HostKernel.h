@@ -16,6 +16,7 @@ class HostKernel : public Kernel {
 
   int sysctlbyname(const std::string& name, std::span<std::uint8_t> buffer,
                    std::size_t& length) override;
+  bool acknowledgeECCEvent() override { return _eccEvents.removeTaken(); }
   std::uint64_t pageSize() override;
   std::uint64_t monotonicTicks() override;
   std::optional<TickRatio> tickRatio() override;

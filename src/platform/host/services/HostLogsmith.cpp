@@ -19,8 +19,8 @@ PropertyDict HostLogsmith::CopySystemVersionDictionary() {
   return {{"ProductBuildVersion", described ? *described : live::osBuild()}};
 }
 
-void HostLogsmith::FLLogStructuredData(std::int32_t type, const PropertyDict& record) {
-  _outbox.append("records.jsonl", {{"type", type}, {"record", record}});
+bool HostLogsmith::FLLogStructuredData(std::int32_t type, const PropertyDict& record) {
+  return _outbox.append("records.jsonl", {{"type", type}, {"record", record}});
 }
 
 }  // namespace vesprun

@@ -18,7 +18,7 @@ class HostLogsmith : public Logsmith {
                                 const PropertyDict* header, const LogWriter& writer) override;
   std::string LGSOSVersion() override;
   PropertyDict CopySystemVersionDictionary() override;
-  void FLLogStructuredData(std::int32_t type, const PropertyDict& record) override;
+  bool FLLogStructuredData(std::int32_t type, const PropertyDict& record) override;
   void FLDumpAllOldStructuredDataLogs() override {}
   void rollTendmarkLogs() override {}
 

@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <chrono>
 #include <condition_variable>
-#include <exception>
 #include <mutex>
 #include <system_error>
 #include <thread>
@@ -56,13 +55,7 @@ class HostMurmur::Replies {
         return;
       }
     }
-    try {
-      handler(&usage.records);
-    } catch (const std::exception& failure) {
-      _log.write(LogLevel::Error, std::string("usage feed: ") + failure.what());
-    } catch (...) {
-      _log.write(LogLevel::Error, "usage feed: the handler of a reply failed");
-    }
+    runGuarded(_log, "usage feed", [&] { handler(&usage.records); });
   }
 
   const AnswerDescription<UsageDescription>& _description;

@@ -1,10 +1,12 @@
 #include "platform/host/services/HostSystemLog.h"
 
 #include <cstdio>
+#include <exception>
 #include <string>
 
-#include "common/Date.h"
+#include "common/Calendar.h"
 #include "platform/host/documents/JsonForm.h"
+#include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {
 namespace {
@@ -37,12 +39,30 @@ void HostSystemLog::write(LogLevel level, std::string_view message) {
   if (!keeps(level)) {
     return;
   }
-  const PropertyDict line{
-      {"time", dateText(_clock.now())}, {"level", levelName(level)}, {"message", message}};
   std::string error;
-  if (!_directory.makeFolder("outbox", error) || !_lines.append(jsonText(line), error)) {
-    const std::string text(message);
-    std::fprintf(stderr, "vesprun: %s (not logged: %s)\n", text.c_str(), error.c_str());
+  try {
+    // Put together here: a message may hold a long list, which no value should copy.
+    std::string line =
+        jsonText(PropertyDict{{"time", dateText(_clock.now())}, {"level", levelName(level)}});
+    line.back() = ',';
+    line.reserve(line.size() + message.size() + message.size() / 8 + 32);
+    line += "\"message\":";
+    appendJsonText(message, line);
+    line += '}';
+    if (_directory.makeFolder("outbox", error) && _lines.append(line, error)) {
+      return;
+    }
+  } catch (const std::exception&) {
+    error.clear();
+  }
+  while (message.ends_with('\n')) {
+    message.remove_suffix(1);
+  }
+  try {
+    std::fprintf(stderr, "vesprun: %s (not logged: %s)\n", printableText(message).c_str(),
+                 error.empty() ? "out of memory" : printableText(error).c_str());
+  } catch (const std::exception&) {
+    std::fputs("vesprun: out of memory\n", stderr);
   }
 }
 

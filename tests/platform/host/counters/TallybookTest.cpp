@@ -14,8 +14,8 @@ namespace vesprun {
 namespace {
 
 using namespace std::string_literals;
-using ::testing::AnyOf, ::testing::ElementsAre, ::testing::HasSubstr, ::testing::IsEmpty,
-    ::testing::MatchesRegex, ::testing::SizeIs, ::testing::StartsWith;
+using ::testing::AnyOf, ::testing::Contains, ::testing::ElementsAre, ::testing::HasSubstr,
+    ::testing::IsEmpty, ::testing::MatchesRegex, ::testing::SizeIs, ::testing::StartsWith;
 
 constexpr const char* kFolder = "var/mobile/Library/Tallybook";
 constexpr const char* kFile = "var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
@@ -70,7 +70,7 @@ std::string scalar(std::int64_t value) {
   return "scalar\t19787\tk\t" + std::to_string(value) + '\n';
 }
 
-TEST_F(TallybookTest, collectsUntilTheCheckpointAndMakesNothingWithoutNeed) {
+TEST_F(TallybookTest, CollectsUntilTheCheckpointAndMakesNothingWithoutNeed) {
   {
     HostTallybook tallybook(device, clock, preferences, log);
     EXPECT_EQ(tallybook.TBDaysSince1970(), kToday);
@@ -92,13 +92,13 @@ TEST_F(TallybookTest, collectsUntilTheCheckpointAndMakesNothingWithoutNeed) {
   EXPECT_THAT(log.messages, IsEmpty());
 }
 
-TEST_F(TallybookTest, deliversDaysInclusivelyByDayThenKeyBytes) {
+TEST_F(TallybookTest, DeliversDaysInclusivelyByDayThenKeyBytes) {
   ASSERT_TRUE(
       import("scalar\t3\tb\t1\nscalar\t1\tz\t2\nscalar\t2\t\xC3\xA9\t3\nscalar\t2\tZ\t4\n"
              "scalar\t2\ta\t5\nscalar\t4\ta\t6\nscalar\t-1\ta\t7\n"
              "sample\t3\td\t1\t0\nsample\t2\te\t2\t7\nsample\t2\te\t3\t-7\n"));
   HostTallybook tallybook(device, clock, preferences, log);
-  const std::unique_ptr<TBHistory> history = tallybook.openHistory();
+  const std::unique_ptr<TBHistory> history = tallybook.initWithDefaultPath();
   std::vector<std::string> rows;
   const auto found = [&](std::string_view prefix, std::int32_t from, std::int32_t to,
                          std::size_t most = 99) {
@@ -130,7 +130,7 @@ TEST_F(TallybookTest, deliversDaysInclusivelyByDayThenKeyBytes) {
   EXPECT_THAT(rows, ElementsAre("2e7", "2e-7", "3d0"));
 }
 
-TEST_F(TallybookTest, readsBackWhatItDumps) {
+TEST_F(TallybookTest, ReadsBackWhatItDumps) {
   std::string text =
       "scalar\t19786\t\t-9223372036854775808\n"
       "scalar\t19786\ta\tb\r\"\xF0\x9F\x98\x80\t9223372036854775807\n"
@@ -157,7 +157,7 @@ TEST_F(TallybookTest, readsBackWhatItDumps) {
   EXPECT_EQ(dump(19788), "");
 }
 
-TEST_F(TallybookTest, keepsNothingOfAnImportWithABadLine) {
+TEST_F(TallybookTest, KeepsNothingOfAnImportWithABadLine) {
   const std::string good = "scalar\t19787\tk\t1\nsample\t19787\tk\t1\t1\n";
   ASSERT_TRUE(import(good));
   for (const std::string bad :
@@ -172,7 +172,7 @@ TEST_F(TallybookTest, keepsNothingOfAnImportWithABadLine) {
   }
 }
 
-TEST_F(TallybookTest, refusesKeysThatNoDocumentCarries) {
+TEST_F(TallybookTest, RefusesKeysThatNoDocumentCarries) {
   const std::string longest(1024 * 1024, 'k');
   for (const std::string& key : {"a\xFF"s, "a\0b"s, longest + 'k'}) {
     add(key, 1);
@@ -185,7 +185,7 @@ TEST_F(TallybookTest, refusesKeysThatNoDocumentCarries) {
   EXPECT_EQ(dump(), "scalar\t19787\t" + longest + "\t1\n");
 }
 
-TEST_F(TallybookTest, losesNoIncrementOfProcessesAndThreadsThatWriteAtOnce) {
+TEST_F(TallybookTest, LosesNoIncrementOfProcessesAndThreadsThatWriteAtOnce) {
   constexpr int kRounds = 20;
   const auto work = [&](HostTallybook& tallybook) {
     for (int i = 0; i < kRounds; ++i) {
@@ -211,7 +211,7 @@ TEST_F(TallybookTest, losesNoIncrementOfProcessesAndThreadsThatWriteAtOnce) {
   EXPECT_THAT(log.messages, IsEmpty());
 }
 
-TEST_F(TallybookTest, keepsEveryCommittedCounterOfAKilledWriter) {
+TEST_F(TallybookTest, KeepsEveryCommittedCounterOfAKilledWriter) {
   std::mt19937 random(7);
   std::int64_t committed = 0;
   for (int round = 0; round < 12; ++round) {
@@ -260,7 +260,7 @@ std::string damaged(std::string content, int number, std::mt19937& random) {
   return content;
 }
 
-TEST_F(TallybookTest, movesDamagedFilesAsideAndGoesOn) {
+TEST_F(TallybookTest, MovesDamagedFilesAsideAndGoesOn) {
   std::string text;
   for (int i = 0; i < 12'400; ++i) {
     const std::string name = "com.quill.key" + std::to_string(i / 31);
@@ -281,7 +281,7 @@ TEST_F(TallybookTest, movesDamagedFilesAsideAndGoesOn) {
     log.messages.clear();
     {
       HostTallybook tallybook(device, clock, preferences, log);
-      const std::unique_ptr<TBHistory> history = tallybook.openHistory();
+      const std::unique_ptr<TBHistory> history = tallybook.initWithDefaultPath();
       const auto ignore = [](std::string_view, std::int32_t, std::int64_t, bool&) {};
       const auto readAll = [](std::string_view, std::int32_t,
                               TBHistoryDistributionEnumerator& values, bool&) {
@@ -315,7 +315,7 @@ TEST_F(TallybookTest, movesDamagedFilesAsideAndGoesOn) {
   EXPECT_GT(found, 20);
 }
 
-TEST_F(TallybookTest, movesForeignFilesAsideWithTheirJournals) {
+TEST_F(TallybookTest, MovesForeignFilesAsideWithTheirJournals) {
   const auto database = [&](const char* sql) {
     const std::string path = folder.path("other");
     folder.write("other", "");
@@ -347,7 +347,156 @@ TEST_F(TallybookTest, movesForeignFilesAsideWithTheirJournals) {
   EXPECT_EQ(corruptions(), count);
 }
 
-TEST_F(TallybookTest, neverTakesALockForDamage) {
+/// Lets the calls of `pread` by SQLite that `which` picks, by their number from 1 and their place
+/// in the file, give `result`, with EIO.
+class FailingReads {
+ public:
+  using Which = std::function<bool(int number, off_t place)>;
+
+  explicit FailingReads(Which which, ssize_t result = -1) {
+    _which = std::move(which);
+    _result = result;
+    _number = 0;
+    _fileSystem->xSetSystemCall(_fileSystem, "pread64",
+                                reinterpret_cast<sqlite3_syscall_ptr>(&FailingReads::read));
+  }
+  ~FailingReads() { _fileSystem->xSetSystemCall(_fileSystem, "pread64", nullptr); }
+
+  static int count() { return _number; }
+
+ private:
+  static ssize_t read(int file, void* bytes, std::size_t length, off_t place) {
+    errno = EIO;
+    return _which(++_number, place) ? _result : pread(file, bytes, length, place);
+  }
+
+  sqlite3_vfs* _fileSystem = sqlite3_vfs_find("unix");
+  static inline Which _which;
+  static inline ssize_t _result;
+  static inline int _number;
+};
+
+TEST_F(TallybookTest, NeverTakesAnErrorOfReadingForDamage) {
+  std::string text;
+  for (int i = 0; i < 12'000; ++i) {
+    text += (i < 2000 ? "scalar\t19786\tkey" + std::to_string(i)
+                      : "sample\t19786\tkey" + std::to_string(i / 5000) + "\t1") +
+            "\t1\n";
+  }
+  ASSERT_TRUE(import(text));
+  text = dump();
+  int count = 1;
+  for (int number = 1; number <= count; ++number) {
+    const auto once = [number](int read, off_t) { return read == number; };
+    {
+      const FailingReads failing(once);
+      EXPECT_EQ(dump(), text) << number;  // since it is read again
+      count = FailingReads::count();
+    }
+    const FailingReads failing(once, 0);  // as if the file had ended there
+    HostTallybook tallybook(device, clock, preferences, log);
+    const auto appendNothing = [](CounterStore& store) {
+      store.appendSamples(19786, "key2", {});
+      return true;
+    };
+    EXPECT_TRUE(tallybook.write(appendNothing, error)) << error;
+  }
+  constexpr off_t kPage = 16384;
+  const auto size = static_cast<off_t>(folder.read(kFile).size());
+  for (off_t bad = 0; bad < size; bad += kPage) {
+    {
+      const FailingReads failing([bad](int, off_t place) { return place / kPage == bad / kPage; });
+      HostTallybook tallybook(device, clock, preferences, log);
+      tallybook.initWithDefaultPath()
+          ->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+              "", 0, kToday, [](std::string_view, std::int32_t, std::int64_t, bool&) {});
+      const auto ignore = [](std::string_view) { return true; };
+      const auto readAll = [&](CounterStore& store) {
+        exportCounterLines(store, 0, kToday, ignore, error);
+      };
+      if (!tallybook.read(readAll, error)) {  // not every page is needed
+        EXPECT_THAT(error, HasSubstr("disk I/O error"));
+      }
+    }
+    EXPECT_EQ(dump(), text) << bad;
+  }
+  EXPECT_THAT(log.messages, Contains(MatchesRegex("counters cannot be read: .*: disk I/O error, "
+                                                  "after [0-9]+ scalars up to \"key[0-9]*\" of "
+                                                  "day 19786")));
+  EXPECT_EQ(corruptions(), 0);
+}
+
+TEST_F(TallybookTest, NoticesAChunkThatIsCutShort) {
+  std::string text;
+  for (int i = 0; i < 10'000; ++i) {
+    text += "sample\t19786\tk\t1\t1\n";
+  }
+  for (const auto& [change, cause] : std::vector<std::pair<const char*, const char*>>{
+           {"UPDATE chunk SET samples = substr(samples, 1, 100)", "has a wrong length"},
+           {"UPDATE chunk SET samples = substr(samples, 1, 800) WHERE sequence = 2",
+            "has a wrong length, after 8192 values of the last of 1 distributions up to \"k\""},
+           {"UPDATE chunk SET samples = x'', offsets = x'' WHERE sequence = 2",
+            "has a wrong length"},
+           {"UPDATE chunk SET samples = substr(samples, 1, 800), offsets = substr(offsets, 1, 400) "
+            "WHERE sequence = 0",
+            "is too short, after 100 values"},
+           {"DELETE FROM chunk WHERE sequence = 1", "is missing, after 4096 values"}}) {
+    unlink(folder.path(kFile).c_str());
+    ASSERT_TRUE(import(text));
+    SqliteConnection(folder.path(kFile), kShortWait).execute(change);
+    log.messages.clear();
+    int count = 0;
+    HostTallybook tallybook(device, clock, preferences, log);
+    tallybook.initWithDefaultPath()
+        ->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+            "", 0, kToday,
+            [&](std::string_view, std::int32_t, TBHistoryDistributionEnumerator& values, bool&) {
+              for (double value = 0; values.getNextValueSecondsInDayOffset(value, nullptr);) {
+                ++count;
+              }
+            });
+    EXPECT_LT(count, 10'000);
+    ASSERT_THAT(log.messages, SizeIs(2)) << change;
+    EXPECT_THAT(log.messages[1], HasSubstr(std::string("a chunk of samples ") + cause));
+  }
+}
+
+TEST_F(TallybookTest, RefusesPipesInPlaceOfItsFiles) {
+  add("k", 1);
+  for (const char* end : {"-journal", "-wal", "-shm"}) {
+    const std::string path = folder.path(kFile) + end;
+    ASSERT_EQ(mkfifo(path.c_str(), 0600), 0);
+    log.messages.clear();
+    add("k", 1);
+    EXPECT_THAT(log.messages, ElementsAre(HasSubstr(path + ": not a regular file")));
+    unlink(path.c_str());
+    EXPECT_EQ(dump(), scalar(1));
+  }
+}
+
+TEST_F(TallybookTest, KeepsWhatItCollectedWhenMemoryRunsOut) {
+  class FailingPreferences final : public Preferences {
+    std::optional<PropertyValue> LGSPreferencesGetValue(std::string_view /*key*/,
+                                                        std::string_view /*domain*/) override {
+      throw std::bad_alloc();
+    }
+    void LGSPreferencesSetValue(std::optional<std::string_view> /*key*/,
+                                std::optional<PropertyValue> /*value*/,
+                                std::string_view /*domain*/) override {}
+    bool LGSPreferencesSynchronize(std::string_view /*domain*/) override { return true; }
+  } failing;
+  HostTallybook tallybook(device, clock, failing, log);
+  tallybook.TBClientAddValueForScalarKey("k", 1);
+  folder.write(kFile, "damaged");
+  EXPECT_THROW(tallybook.TBClientCheckpoint(), std::bad_alloc);
+  tallybook.TBClientAddValueForScalarKey("k", 1);
+  tallybook.TBClientCheckpoint();
+  EXPECT_EQ(dump(), scalar(2));
+  folder.write(kFile, "damaged");
+  HostTallybook(device, clock, failing, log).TBClientAddValueForScalarKey("k", 1);
+}
+
+TEST_F(TallybookTest, NeverTakesALockForDamage) {
   add("k", 1);
   HostTallybook tallybook(device, clock, preferences, log, kShortWait);
   tallybook.TBClientAddValueForScalarKey("k", 1);
@@ -367,7 +516,7 @@ TEST_F(TallybookTest, neverTakesALockForDamage) {
   EXPECT_EQ(dump(), scalar(3));
 }
 
-TEST_F(TallybookTest, neverTakesPermissionsOrAFullDiskForDamage) {
+TEST_F(TallybookTest, NeverTakesPermissionsOrAFullDiskForDamage) {
   add("k", 1);
   const auto waits = [&](HostTallybook& tallybook) {
     EXPECT_THAT(log.messages, IsEmpty());

@@ -1,6 +1,7 @@
-#include <cmath>
-
 #include <gmock/gmock.h>
+
+#include <algorithm>
+#include <cmath>
 #include <limits>
 
 #include "platform/host/documents/PtreeReader.h"
@@ -65,7 +66,7 @@ PropertyDict everything() {
           {"list", PropertyArray{PropertyDict{{"in", 1}}, PropertyArray{}, PropertyDict{}, "x"}}};
 }
 
-TEST(PtreeWriter, writesTabIndentedDocuments) {
+TEST(PtreeWriter, WritesTabIndentedDocuments) {
   EXPECT_EQ(writtenOf(PropertyDict{{"name", "text"},
                                    {"list", PropertyArray{std::uint8_t{7}, 2.0, 0.25F, true}},
                                    {"empty", PropertyDict{}},
@@ -98,7 +99,7 @@ TEST(PtreeWriter, writesTabIndentedDocuments) {
 )");
 }
 
-TEST(PtreeWriter, namesThePlaceOfWhatADocumentCannotCarry) {
+TEST(PtreeWriter, NamesThePlaceOfWhatADocumentCannotCarry) {
   std::string document = "before";
   std::string error;
   const auto refuses = [&](const PropertyValue& value) {
@@ -122,7 +123,7 @@ TEST(PtreeWriter, namesThePlaceOfWhatADocumentCannotCarry) {
               HasSubstr("\xE2\x80\xA6: nested deeper than 200 levels"));
 }
 
-TEST(PtreeReader, readsBackEveryKindOfValue) {
+TEST(PtreeReader, ReadsBackEveryKindOfValue) {
   const PropertyDict original = everything();
   const PropertyValue read = readOf(writtenOf(original));
   EXPECT_EQ(read, PropertyValue(original));
@@ -139,7 +140,7 @@ TEST(PtreeReader, readsBackEveryKindOfValue) {
   EXPECT_EQ(kindOf("<real>2</real>"), NumberKind::Double);
 }
 
-TEST(PtreeReader, takesWhatOtherWritersMayWrite) {
+TEST(PtreeReader, TakesWhatOtherWritersMayWrite) {
   const PropertyValue one(PropertyArray{1});
   for (const std::string start :
        {"", "\xEF\xBB\xBF", "\n", "<?xml version='1.0'?>",
@@ -163,7 +164,36 @@ TEST(PtreeReader, takesWhatOtherWritersMayWrite) {
   EXPECT_EQ(repeated.dict()->begin()->first, "a");
 }
 
-TEST(PtreeReader, refusesWhatTheGrammarDoesNotKnow) {
+TEST(PtreeReader, SkipsCommentsWhereverXmlAllowsThem) {
+  EXPECT_EQ(readOf("<?xml version=\"1.0\"?><!-- a > b --><ptree version=\"1.0\"><!----><dict><!--"
+                   "<x>&y;--><key>a<!--b-->c</key><!-- \xC3\xA4 -->\n<array><!-- \n -->"
+                   "<true><!-- - --></true><integer>1<!--2-->3</integer></array></dict><!-- -->"
+                   "</ptree>\n<!-- end -->\n"),
+            PropertyValue(PropertyDict{{"ac", PropertyArray{true, 13}}}));
+  EXPECT_THAT(readingError(inPtree("<!-- a\n\n --><string>\n<!--\n-->&b;</string>")),
+              StartsWith("line 5: an unknown entity"));
+}
+
+/// Longer than a piece of the document that the parser is given at once.
+TEST(PtreeReader, ReadsLongTextsAndMarkupWhole) {
+  std::string text;
+  for (int line = 0; text.size() < 3'000'000; ++line) {
+    text += std::to_string(line) + "\r\n\xE2\x82\xAC";
+  }
+  std::string expected = text;
+  std::erase(expected, '\r');
+  EXPECT_TRUE(readOf(inPtree("<string>" + text + "<!--" + text + "--></string>")) ==
+              PropertyValue(expected));
+  const auto lines = std::count(text.begin(), text.end(), '\n');
+  EXPECT_EQ(readingError(inPtree("<string>" + text + "&bad;</string>")),
+            "line " + std::to_string(lines + 1) + ": an unknown entity");
+  EXPECT_EQ(readingError(inPtree("<array " + text + "/>")),
+            "line 1: <array> cannot have attributes");
+  EXPECT_EQ(readingError(std::string(kLongestPtree + 1, ' ')),
+            "line 1: the document is longer than 256 MiB");
+}
+
+TEST(PtreeReader, RefusesWhatTheGrammarDoesNotKnow) {
   const std::pair<const char*, std::vector<const char*>> cases[] = {
       {"line 1: the key \"a\" has no value", {"<dict><key>a</key></dict>"}},
       {"the key \"a\" has no value", {"<dict><key>a</key><key>b</key><true/></dict>"}},
@@ -173,7 +203,7 @@ TEST(PtreeReader, refusesWhatTheGrammarDoesNotKnow) {
       {"a document without a value", {""}},
       {"more than one value", {"<true/><true/>"}},
       {"an element inside <string>", {"<string><true/></string>"}},
-      {"comments", {"<string>a<!-- b --></string>"}},
+      {"malformed comment", {"<string>a<!-- b -- c --></string>", "<!-- a --->", "<!-- a"}},
       {"DOCTYPE", {"<!DOCTYPE ptree><true/>"}},
       {"CDATA", {"<string><![CDATA[a]]></string>"}},
       {"processing instructions", {"<?php ?><true/>"}},
@@ -210,12 +240,12 @@ TEST(PtreeReader, refusesWhatTheGrammarDoesNotKnow) {
   }
 }
 
-TEST(PtreeReader, refusesWhatIsNoPtreeDocument) {
+TEST(PtreeReader, RefusesWhatIsNoPtreeDocument) {
   for (const char* document :
        {"", "plain", "<", "<ptree>", "<ptree version=\"1.0\"/>", "<ptreeversion=\"1.0\"><true/>",
         "<ptree><true/></ptree>", "<ptree version=\"2.0\"><true/></ptree>",
-        "<ptree version=\"1.0\" x=\"y\"><true/></ptree>", "<dict></dict>",
-        "<!-- a --><ptree version=\"1.0\"><true/></ptree>", "<?xml?><ptree version=\"1.0\">",
+        "<ptree version=\"1.0\" x=\"y\"><true/></ptree>", "<dict></dict>", "<!-- a --><true/>",
+        "<?xml?><ptree version=\"1.0\">",
         "<?xml version=\"1.1\"?><ptree version=\"1.0\"><true/></ptree>",
         "<?xml version=\"1.0\" encoding=\"UTF-16\"?><ptree version=\"1.0\"><true/></ptree>",
         "<?xml version=\"1.0\"encoding=\"UTF-8\"?><ptree version=\"1.0\"><true/></ptree>",
@@ -223,10 +253,22 @@ TEST(PtreeReader, refusesWhatIsNoPtreeDocument) {
         "<ptree version=\"1.0\"><true/></ptree>x", " <?xml version=\"1.0\"?>"}) {
     EXPECT_THAT(readingError(document), StartsWith("line 1: ")) << document;
   }
-  EXPECT_THAT(readingError(std::string("<\0p\0t\0", 6)), StartsWith("line 1: "));
+  for (const char* trailing : {"x", "<ptree version=\"1.0\"/>", "<!-- a --><?x?>", "&amp;", "<!"}) {
+    EXPECT_EQ(readingError(inPtree("<true/>") + "\n" + trailing),
+              "line 2: something follows the end of the document");
+  }
+  EXPECT_EQ(readingError("<!DOCTYPE a [<!ENTITY b \"c\">]>" + inPtree("<string>&b;</string>")),
+            "line 1: a ptree document has no DOCTYPE");
+  std::string utf16;
+  for (const char c : inPtree("<true/>")) {
+    utf16 += {c, '\0'};
+  }
+  for (const std::string& document : {utf16, "\xFF\xFE" + utf16}) {
+    EXPECT_EQ(readingError(document), "line 1: the document does not begin with <ptree>");
+  }
 }
 
-TEST(PtreeReader, namesTheLine) {
+TEST(PtreeReader, NamesTheLine) {
   const std::string start = "<?xml version=\"1.0\"?>\r\n<ptree version=\"1.0\">\n<dict>\n";
   EXPECT_THAT(readingError(start + "<key>a</key>\n<integer>1x</integer>\n</dict></ptree>"),
               StartsWith("line 5: \"1x\" is no integer"));
@@ -234,13 +276,14 @@ TEST(PtreeReader, namesTheLine) {
               StartsWith("line 8: an unknown entity"));
   EXPECT_THAT(readingError(start + "<key>a</key>\n</dict>\n</ptree>"),
               StartsWith("line 4: the key"));
+  EXPECT_EQ(readingError(start + "<key\n\nid></key>"), "line 4: <key> cannot have attributes");
   EXPECT_EQ(readingError(start + "\n\n"), "line 6: the document ends early");
   EXPECT_EQ(readingError(nestedArrays(201)), "line 1: nested deeper than 200 levels");
   EXPECT_THAT(readingError(nestedArrays(1'000'000)), HasSubstr("nested"));
   readOf(nestedArrays(200));
 }
 
-TEST(PtreeReader, refusesADocumentCutAtAnyByte) {
+TEST(PtreeReader, RefusesADocumentCutAtAnyByte) {
   const std::string document = writtenOf(everything());
   const std::size_t end = document.size() - 1;  // without the last line feed it is complete
   for (std::size_t size = 0; size < end; ++size) {

@@ -7,7 +7,7 @@
 namespace vesprun {
 namespace {
 
-TEST(XmlText, takesEveryWidthOfCharacterAtItsEnds) {
+TEST(XmlText, TakesEveryWidthOfCharacterAtItsEnds) {
   for (const char* text :
        {"", "plain", "\t\n\r ", "\x7F", "\xC2\x80", "\xDF\xBF", "\xE0\xA0\x80", "\xED\x9F\xBF",
         "\xEE\x80\x80", "\xEF\xBF\xBD", "\xF0\x90\x80\x80", "\xF4\x8F\xBF\xBF"}) {
@@ -15,7 +15,7 @@ TEST(XmlText, takesEveryWidthOfCharacterAtItsEnds) {
   }
 }
 
-TEST(XmlText, refusesControlsSurrogatesNonCharactersAndMalformedUtf8) {
+TEST(XmlText, RefusesControlsSurrogatesNonCharactersAndMalformedUtf8) {
   for (const char* text :
        {"\x01", "\x1F", "\xEF\xBF\xBE", "\xEF\xBF\xBF", "\xED\xA0\x80", "\xED\xBF\xBF", "\x80",
         "\xC0\xAF", "\xC1\xBF", "\xE0\x9F\xBF", "\xF0\x8F\xBF\xBF", "\xF4\x90\x80\x80", "\xF5",

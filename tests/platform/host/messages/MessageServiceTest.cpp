@@ -6,7 +6,7 @@
 #include "platform/host/messages/HostMessageService.h"
 #include "platform/host/messages/MessageFraming.h"
 #include "platform/host/messages/ServiceSocket.h"
-#include "platform/host/services/HostPtreeSerialization.h"
+#include "platform/host/services/ForwardingServices.h"
 #include "support/HostServiceTest.h"
 
 namespace vesprun {
@@ -169,6 +169,24 @@ TEST_F(MessageServiceTest, APeerBeyondTheLimitTakesThePlaceOfTheQuietest) {
   EXPECT_FALSE(isEnded(stallers[0]));
 }
 
+TEST_F(MessageServiceTest, APeerThatHasSentAMessageOutlivesThoseThatHaveNot) {
+  const std::unique_ptr<ServiceListener> listener = listen();
+  const FileDescriptor client = peer();
+  send(client, frame(text("first")));
+  eventsUntilQuiet();
+  std::vector<FileDescriptor> others;
+  for (int i = 0; i < 40; ++i) {
+    others.push_back(peer());
+    send(others.back(), "\x01");
+    eventsUntilQuiet();
+  }
+  EXPECT_TRUE(isEnded(others[24]));
+  EXPECT_FALSE(isEnded(others[25]));
+  send(client, frame(text("second")));
+  eventsUntilQuiet();
+  EXPECT_THAT(received, ElementsAre("first", "second"));
+}
+
 TEST_F(MessageServiceTest, TurnsAwayWhoIsNotStartedOrIsAnotherUser) {
   std::unique_ptr<ServiceListener> listener = listen();
   listener->setPeerHandler([](PeerConnection&) {});
@@ -218,6 +236,16 @@ TEST_F(MessageServiceTest, TheSocketFileIsItsOwnersAndGoesWithTheListener) {
   log.messages.clear();
   EXPECT_EQ(listen(), nullptr);
   EXPECT_THAT(log.messages, ElementsAre(folder.path(kSocket) + ": Address already in use"));
+}
+
+TEST_F(MessageServiceTest, SaysThatItsFolderCannotBeOpened) {
+  folder.write("run/other", "");
+  ASSERT_TRUE(hasSucceeded(startProcess([&] {
+    const rlimit none{0, 0};
+    setrlimit(RLIMIT_NOFILE, &none);
+    EXPECT_EQ(listen(), nullptr);
+    EXPECT_THAT(log.messages, ElementsAre(folder.path("run") + ": Too many open files"));
+  })));
 }
 
 TEST_F(MessageServiceTest, TakesOverFromAKilledProcessUnderAPathTooLongForASocketAddress) {

@@ -23,7 +23,7 @@ class PreferencesTest : public HostServiceTest {
   HostPreferences preferences{device, clock, log};
 };
 
-TEST_F(PreferencesTest, areThereForTheNextProcess) {
+TEST_F(PreferencesTest, AreThereForTheNextProcess) {
   {
     HostPreferences here(device, clock, log);
     here.LGSPreferencesSetValue("first", 1, "a");
@@ -47,7 +47,7 @@ TEST_F(PreferencesTest, areThereForTheNextProcess) {
   EXPECT_THAT(log.messages, IsEmpty());
 }
 
-TEST_F(PreferencesTest, areNotWrittenWithoutADifference) {
+TEST_F(PreferencesTest, AreNotWrittenWithoutADifference) {
   preferences.LGSPreferencesSetValue("absent", std::nullopt, "a");
   EXPECT_TRUE(preferences.LGSPreferencesSynchronize("a"));
   EXPECT_THAT(folder.names(kFolder), IsEmpty());
@@ -61,7 +61,7 @@ TEST_F(PreferencesTest, areNotWrittenWithoutADifference) {
   EXPECT_THAT(folder.read(kFile), HasSubstr("<real>1</real>"));
 }
 
-TEST_F(PreferencesTest, keepWhatOtherProcessesChanged) {
+TEST_F(PreferencesTest, KeepWhatOtherProcessesChanged) {
   HostPreferences there(device, clock, log);
   EXPECT_EQ(preferences.LGSPreferencesGetValue("x", "a"), std::nullopt);
   there.LGSPreferencesSetValue("x", 1, "a");
@@ -78,7 +78,7 @@ TEST_F(PreferencesTest, keepWhatOtherProcessesChanged) {
   EXPECT_EQ(found(), (PropertyDict{{"x", 1}, {"y", 2}, {"z", 2}}));
 }
 
-TEST_F(PreferencesTest, loseNothingToProcessesAndThreadsThatWriteAtOnce) {
+TEST_F(PreferencesTest, LoseNothingToProcessesAndThreadsThatWriteAtOnce) {
   constexpr int kKeys = 15;
   const auto write = [](HostPreferences& here, const std::string& writer) {
     for (int key = 0; key < kKeys; ++key) {
@@ -97,7 +97,7 @@ TEST_F(PreferencesTest, loseNothingToProcessesAndThreadsThatWriteAtOnce) {
   EXPECT_EQ(found().size(), 4U * kKeys);
 }
 
-TEST_F(PreferencesTest, keepADocumentThatIsNoneBesideTheNewOne) {
+TEST_F(PreferencesTest, KeepADocumentThatIsNoneBesideTheNewOne) {
   for (const std::string malformed :
        {"<ptree version=\"1.0\">\n<dict>\n<key>first", "<ptree version=\"1.0\"><true/></ptree>"}) {
     log.messages.clear();
@@ -119,7 +119,7 @@ TEST_F(PreferencesTest, keepADocumentThatIsNoneBesideTheNewOne) {
   EXPECT_THAT(folder.read(std::string(kFolder) + '/' + names[1]), StartsWith("<ptree"));
 }
 
-TEST_F(PreferencesTest, neverWriteOverWhatCannotBeRead) {
+TEST_F(PreferencesTest, NeverWriteOverWhatCannotBeRead) {
   folder.write(std::string(kFile) + "/inside", "a folder in place of the document");
   EXPECT_EQ(preferences.LGSPreferencesGetValue("first", "a"), std::nullopt);
   preferences.LGSPreferencesSetValue("first", 1, "a");
@@ -128,11 +128,47 @@ TEST_F(PreferencesTest, neverWriteOverWhatCannotBeRead) {
   EXPECT_THAT(folder.names(kFile), ElementsAre("inside"));
   unlink(folder.path(std::string(kFile) + "/inside").c_str());
   rmdir(folder.path(kFile).c_str());
+  ASSERT_EQ(symlink("a.ptree", folder.path(kFile).c_str()), 0);
+  EXPECT_FALSE(preferences.LGSPreferencesSynchronize("a"));
+  EXPECT_THAT(log.messages.back(), HasSubstr("a.ptree: Too many levels of symbolic links"));
+  EXPECT_EQ(modeOf(kFile) & S_IFMT, mode_t{S_IFLNK});
+  unlink(folder.path(kFile).c_str());
   EXPECT_TRUE(preferences.LGSPreferencesSynchronize("a"));  // the change has waited
   EXPECT_EQ(found(), (PropertyDict{{"first", 1}}));
 }
 
-TEST_F(PreferencesTest, refuseNamesThatLeadElsewhereAndValuesThatNoDocumentCarries) {
+TEST_F(PreferencesTest, AreNotWrittenWhileAnotherProcessKeepsTheFolder) {
+  HostPreferences here(device, clock, log, "mobile", std::chrono::milliseconds(20));
+  folder.write(kFile, kOneKey);
+  here.LGSPreferencesSetValue("first", 2, "a");
+  {
+    const auto kept = FolderLock::take(folder.path(kFolder), error);
+    EXPECT_FALSE(here.LGSPreferencesSynchronize("a"));
+    EXPECT_THAT(log.messages,
+                ElementsAre(folder.path(kFolder) + ": another process keeps it locked"));
+    EXPECT_EQ(folder.read(kFile), kOneKey);
+  }
+  EXPECT_TRUE(here.LGSPreferencesSynchronize("a"));
+  EXPECT_EQ(found(), (PropertyDict{{"first", 2}}));
+}
+
+TEST_F(PreferencesTest, EndWithoutAWordWhenNotEvenTheLogCanBeWritten) {
+  class FullLog final : public SystemLog {
+    bool keeps(LogLevel /*level*/) const override { return true; }
+    void write(LogLevel /*level*/, std::string_view /*message*/) override {
+      throw std::bad_alloc();
+    }
+  } full;
+  folder.write(std::string(kFile) + "/inside", "a folder in place of the document");
+  {
+    HostPreferences here(device, clock, full);
+    here.LGSPreferencesSetValue("first", 1, "a");
+    here.LGSPreferencesSetValue("first", 1, "b");
+  }
+  EXPECT_THAT(folder.names(kFolder), ElementsAre("a.ptree", "b.ptree"));
+}
+
+TEST_F(PreferencesTest, RefuseNamesThatLeadElsewhereAndValuesThatNoDocumentCarries) {
   for (const std::string& domain : {""s, "../a"s, "."s, ".a"s, "a/b"s, "a\0b"s}) {
     log.messages.clear();
     preferences.LGSPreferencesSetValue("k", 1, domain);

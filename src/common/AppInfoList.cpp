@@ -1,0 +1,69 @@
+#include "common/AppInfoList.h"
+
+#include <cstdint>
+#include <string>
+#include <string_view>
+#include <utility>
+
+#include "common/HexText.h"
+
+namespace vesprun {
+namespace {
+
+std::int64_t appInteger(const PropertyDict& dict, std::string_view key) {
+  const PropertyValue* value = dict.find(key);
+  const Number* number = value != nullptr ? value->number() : nullptr;
+  return number != nullptr ? number->asInt64() : 0;
+}
+
+std::string appText(const PropertyDict& dict, std::string_view key) {
+  const PropertyValue* value = dict.find(key);
+  const std::string* text = value != nullptr ? value->string() : nullptr;
+  return text != nullptr ? *text : "";
+}
+
+std::string appUUID(const PropertyDict& dict, std::string_view key) {
+  constexpr std::size_t kLength = 16;
+  const PropertyValue* value = dict.find(key);
+  const Bytes* bytes = value != nullptr ? value->data() : nullptr;
+  if (bytes == nullptr || bytes->size() != kLength) {
+    return "";
+  }
+  std::string text;
+  for (std::size_t i = 0; i < kLength; ++i) {
+    if (i == 4 || i == 6 || i == 8 || i == 10) {
+      text += '-';
+    }
+    appendHex(text, (*bytes)[i], kUpperHexDigits);
+  }
+  return text;
+}
+
+}  // namespace
+
+void AppInfoList::forEach(const std::function<void(PropertyDict app)>& visit) const {
+  if (_appData == nullptr) {
+    return;
+  }
+  for (const PropertyValue& element : *_appData) {
+    if (const PropertyDict* app = element.dict()) {
+      PropertyDict info;
+      info.reserve(5);
+      info.set("bundle", appText(*app, "bundle_id"));
+      info.set("version", appText(*app, "version"));
+      info.set("adamID", appInteger(*app, "adam_id"));
+      info.set("arch", appInteger(*app, "arch"));
+      info.set("uuid", appUUID(*app, "uuid"));
+      visit(std::move(info));
+    }
+  }
+}
+
+PropertyArray AppInfoList::array() const {
+  PropertyArray apps;
+  apps.reserve(_appData != nullptr ? _appData->size() : 0);
+  forEach([&apps](PropertyDict app) { apps.emplace_back(std::move(app)); });
+  return apps;
+}
+
+}  // namespace vesprun

@@ -1,0 +1,51 @@
+#include "driver/DailyStorageAndDeviceStats.h"
+
+#include <optional>
+
+#include "NANDInfo/CopyNANDInfo.h"
+#include "NANDInfo/VMFreezer.h"
+#include "NANDInfo/lists/StructuredLog.h"
+#include "driver/NANDInfoScalars.h"
+#include "platform/Guarded.h"
+#include "platform/Platform.h"
+#include "telemetry/DataUsage.h"
+#include "telemetry/DiskUsage.h"
+#include "telemetry/KernelECCEvents.h"
+#include "telemetry/ReportingChannels.h"
+
+namespace vesprun {
+namespace {
+
+void logDiskUsage() {
+  const std::optional<PropertyValue> answer = platform().orrery().OrreryCopyAnswer("DiskUsage");
+  Tallybook& tallybook = platform().tallybook();
+  tallybook.TBClientSetValueForScalarKey(
+      "com.quill.homeshell.DiskUsageUserTotalBlocks",
+      diskUsageInMebibytes(answer, kDiskUsageTotalDiskCapacity).value_or(-1));
+  tallybook.TBClientSetValueForScalarKey(
+      "com.quill.homeshell.DiskUsageUserBlocksFree",
+      diskUsageInMebibytes(answer, kDiskUsageTotalDataAvailable).value_or(-1));
+}
+
+void logNANDInfo() {
+  std::optional<PropertyDict> info = CopyNANDInfoWithOptions({});
+  if (!info) {
+    logMessage(LogLevel::Default, "failed to get NAND info dict");
+    return;
+  }
+  info->merge(CopyVMFreezerNANDInfo());
+  SetNANDInfoScalars(*info);
+}
+
+}  // namespace
+
+void LogDailyStorageAndDeviceStats() {
+  runGuarded(logDiskUsage);
+  runGuarded([] { DumpStorageStructuredLog(false); });
+  runGuarded(logNANDInfo);
+  runGuarded(LogKernelECCEvents);
+  runGuarded([] { CollectDataUsage(); });
+  runGuarded(LogTaplineChannelScalars);
+}
+
+}  // namespace vesprun

@@ -1,0 +1,92 @@
+#pragma once
+
+#include <functional>
+#include <map>
+#include <string>
+#include <utility>
+
+#include "platform/ServicesClient.h"
+#include "platform/SystemConfiguration.h"
+#include "platform/UserDefaults.h"
+#include "platform/host/device/DeviceDescription.h"
+#include "platform/host/preferences/HostPreferences.h"
+
+// The services that keep their values as `HostPreferences`. What their references name must outlive
+// them.
+
+namespace vesprun {
+
+/// The preferences of each user as documents in var/USER/Library/Preferences. What is refused is
+/// reported once for each user and domain.
+class HostServicesClient final : public LGSServicesClient {
+ public:
+  HostServicesClient(const DeviceDirectory& device, Clock& clock, SystemLog& log)
+      : _device(device), _clock(clock), _log(log) {}
+
+  void setPreferenceForUserInDomainToValue(std::optional<std::string_view> key,
+                                           std::string_view user, std::string_view domain,
+                                           std::optional<PropertyValue> value) override {
+    _users.try_emplace(std::string(user), _device, _clock, _log, user)
+        .first->second.LGSPreferencesSetValue(key, std::move(value), domain);
+  }
+  void deletePreferenceForUserInDomain(std::optional<std::string_view> key, std::string_view user,
+                                       std::string_view domain) override {
+    setPreferenceForUserInDomainToValue(key, user, domain, std::nullopt);
+  }
+  void synchronizeAllUsers() override { _users.clear(); }  // each writes when it goes
+
+ private:
+  const DeviceDirectory& _device;
+  Clock& _clock;
+  SystemLog& _log;
+  std::map<std::string, HostPreferences, std::less<>> _users;
+};
+
+/// The configuration as documents in Library/Logsmith.
+class HostSystemConfiguration final : public LGSSystemConfiguration {
+ public:
+  HostSystemConfiguration(const DeviceDescription& description, const DeviceDirectory& device,
+                          Clock& clock, SystemLog& log)
+      : _description(description),
+        _values(device, clock, log, PreferenceFolder{"Library/Logsmith"}) {}
+
+  std::optional<PropertyValue> getPrefsKeyForDomainWithOptions(std::string_view key,
+                                                               std::string_view domain,
+                                                               std::uint32_t /*options*/) override {
+    return _values.LGSPreferencesGetValue(key, domain);
+  }
+  void setPrefsKeyValueForDomainWithSync(std::optional<std::string_view> key,
+                                         std::optional<PropertyValue> value,
+                                         std::string_view domain, bool sync) override {
+    _values.LGSPreferencesSetValue(key, std::move(value), domain);
+    if (sync) {
+      _values.LGSPreferencesSynchronize(domain);
+    }
+  }
+  PropertyArray getLogBlacklist() override { return _description.logBlacklist; }
+
+ private:
+  const DeviceDescription& _description;
+  HostPreferences _values;
+};
+
+/// The store as one more domain among the mobile user's preferences.
+class HostUserDefaults final : public UserDefaults {
+ public:
+  explicit HostUserDefaults(Preferences& preferences) : _preferences(preferences) {}
+
+  std::optional<PropertyValue> valueForKey(std::string_view key) override {
+    return _preferences.LGSPreferencesGetValue(key, kDomain);
+  }
+  void setValueForKey(std::optional<PropertyValue> value, std::string_view key) override {
+    _preferences.LGSPreferencesSetValue(key, std::move(value), kDomain);
+  }
+  bool synchronize() override { return _preferences.LGSPreferencesSynchronize(kDomain); }
+
+ private:
+  static constexpr std::string_view kDomain = "vesprun";
+
+  Preferences& _preferences;
+};
+
+}  // namespace vesprun

@@ -1,0 +1,51 @@
+#include "platform/host/device/LiveSystem.h"
+
+#include <gmock/gmock.h>
+#include <sys/sysinfo.h>
+#include <unistd.h>
+
+#include <cstdlib>
+
+#include "common/LittleEndian.h"
+
+namespace vesprun {
+namespace {
+
+using ::testing::ElementsAre, ::testing::IsEmpty;
+
+TEST(LiveSystem, TheSwapRecordIsTotalFreeUsedAndPageSize) {
+  const std::optional<Bytes> record = live::swapUsage();
+  struct sysinfo system {};
+  ASSERT_EQ(sysinfo(&system), 0);
+  ASSERT_TRUE(record);
+  ASSERT_EQ(record->size(), 32U);
+  const auto field = [&](std::size_t at) {
+    return loadLittleEndian<std::uint64_t>(record->data() + at);
+  };
+  EXPECT_EQ(field(0), std::uint64_t{system.totalswap} * system.mem_unit);
+  EXPECT_EQ(field(8) + field(16), field(0));
+  EXPECT_NEAR(static_cast<double>(field(8)), static_cast<double>(system.freeswap) * system.mem_unit,
+              64e6);                                                        // it may move
+  EXPECT_EQ(field(24), static_cast<std::uint64_t>(sysconf(_SC_PAGESIZE)));  // and a flag of 0
+}
+
+TEST(LiveSystem, PrefersTheLanguagesOfTheProcess) {
+  for (const char* name : {"LANGUAGE", "LC_ALL", "LC_MESSAGES", "LANG"}) {
+    unsetenv(name);
+  }
+  EXPECT_THAT(live::preferredLanguages(), IsEmpty());
+  setenv("LANG", "de_CH.UTF-8", 1);
+  EXPECT_THAT(live::preferredLanguages(), ElementsAre("de-CH"));
+  setenv("LC_MESSAGES", "fr", 1);
+  EXPECT_THAT(live::preferredLanguages(), ElementsAre("fr"));
+  setenv("LC_ALL", "C", 1);
+  EXPECT_THAT(live::preferredLanguages(), IsEmpty());
+  setenv("LANGUAGE", "en_GB.UTF-8@euro::POSIX:pt_BR", 1);
+  EXPECT_THAT(live::preferredLanguages(), ElementsAre("en-GB", "pt-BR"));
+  for (const char* name : {"LANGUAGE", "LC_ALL", "LC_MESSAGES", "LANG"}) {
+    unsetenv(name);
+  }
+}
+
+}  // namespace
+}  // namespace vesprun
