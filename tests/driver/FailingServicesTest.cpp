@@ -1,7 +1,7 @@
 #include <sys/socket.h>
 
-#include <cstdlib>
 #include <filesystem>
+#include <utility>
 
 #include "buffers/DeviceBuffers.h"
 #include "driver/ActiveAppInfoListener.h"
@@ -16,38 +16,15 @@
 #include "platform/host/messages/ServiceSocket.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
 #include "support/FailingPlatform.h"
+#include "support/ScarceMemory.h"
 #include "support/TestDevice.h"
-
-namespace {
-
-/// The allocation of this thread that fails, counted down while it is not 0.
-thread_local std::size_t gAllocationsLeft = 0;
-
-void* allocate(std::size_t size) {
-  if (gAllocationsLeft != 0 && --gAllocationsLeft == 0) {
-    return nullptr;
-  }
-  return std::malloc(size == 0 ? 1 : size);
-}
-
-}  // namespace
-
-void* operator new(std::size_t size) {
-  void* memory = allocate(size);
-  return memory != nullptr ? memory : throw std::bad_alloc();
-}
-void* operator new(std::size_t size, const std::nothrow_t& /*tag*/) noexcept {
-  return allocate(size);
-}
-void operator delete(void* memory) noexcept { std::free(memory); }
-void operator delete(void* memory, std::size_t /*size*/) noexcept { std::free(memory); }
 
 namespace vesprun {
 namespace {
 
 namespace fs = std::filesystem;
 
-constexpr const char* kService = "com.quill.aggregated.vesprun";
+constexpr const char* kServiceName = "com.quill.aggregated.vesprun";
 
 // Every service has something to do on it.
 constexpr std::string_view kFullDevice =
@@ -110,17 +87,15 @@ class FailingServices : public ::testing::Test {
     fs::copy(original.path(), device.path(),
              fs::copy_options::recursive | fs::copy_options::overwrite_existing);
     startActiveAppInfoAfresh();
-    gAllocationsLeft = allocation;
-    runOn(device, faults, work);
-    const bool failed = gAllocationsLeft == 0 && (allocation != 0 || !faults.failed().empty());
-    gAllocationsLeft = 0;
+    const bool ranOut = runOn(device, faults, allocation, work);
+    const bool failed = ranOut || !faults.failed().empty();
     device.endProcess();
     expectWholeFiles(device);
 
     device.platform();
     runDailyDriver(std::vector<const char*>{"vesprun", "-d"});
     EXPECT_EQ(device.platform().preferences().LGSPreferencesGetIntegerValue(
-                  "LastCrashLogSerializationDateInDaysSince1970", kService),
+                  "LastCrashLogSerializationDateInDaysSince1970", kServiceName),
               TestDevice::kToday - 1);
     device.endProcess();
     expectWholeFiles(device);
@@ -156,22 +131,26 @@ class FailingServices : public ::testing::Test {
 <key>Key</key><string>k</string><key>Value</key><true/></dict>
 </array></dict></dict></ptree>)";
 
+  /// True when the allocation to fail, 0 for none, was reached. Services that note their calls
+  /// would allocate as well, so they are watched only when none fails.
   template <typename Work>
-  static void runOn(TestDevice& device, Faults& faults, const Work& work) {
+  static bool runOn(TestDevice& device, Faults& faults, std::size_t allocation, const Work& work) {
     std::unique_ptr<Platform> failing;  // ends after the threads of the device's own platform
     try {
       std::string error;
       const std::unique_ptr<HostPlatform> host = HostPlatform::open(device.path(), error);
       if (!host) {
-        return;
+        return false;
       }
       failing = failingPlatform(*host, faults);
-      const InstalledPlatform installed(*failing);
+      const InstalledPlatform installed(allocation != 0 ? *host : *failing);
+      allocationsLeft = allocation;
       work(*host);
       EXPECT_EQ(host->describedRegistry().openObjects(), 0U);
       EXPECT_EQ(host->describedRegistry().openConnections(), 0U);
     } catch (const std::bad_alloc&) {  // told on the standard error stream
     }
+    return std::exchange(allocationsLeft, 0) == 0 && allocation != 0;
   }
 
   static void expectWholeFiles(const TestDevice& device) {
@@ -256,7 +235,7 @@ class FailingListener : public FailingServices {
     FileDescriptor peer;
     dynamic_cast<HostMainLoop&>(host.mainLoop()).queueWork([&] {
       std::string error;
-      peer = connectToService(host.directory(), kService, 5, error);
+      peer = connectToService(host.directory(), kServiceName, 5, error);
       for (const int operation : {0, 2}) {
         std::string document;
         EXPECT_TRUE(writePtree(PropertyDict{{"operation", operation}}, document, error)) << error;

@@ -40,7 +40,7 @@ constexpr std::size_t kChunkSize = 12U * 1024;
 constexpr std::int64_t kChunksOfKey = std::int64_t{1} << 32;
 
 // What a load keeps in memory and writes in one transaction.
-constexpr std::size_t kBatchSize = 32U * 1024 * 1024;
+constexpr std::size_t kBatchBytes = 32U * 1024 * 1024;
 constexpr std::size_t kBatchTails = 20000;
 
 // One load waits for another, which commits batch by batch.
@@ -262,8 +262,8 @@ bool SqliteStore::replacesEarlier(const ExportedLine& line, std::int64_t device)
 
 void SqliteStore::add(const ExportedLine& line) {
   guarded([&] {
-    if (!_transaction) {
-      _transaction.emplace(*_database, SqliteTransaction::Kind::Writing);
+    if (!_inBatch) {
+      beginBatch();
     }
     const std::int64_t device = numberOf("device", KeyKind::Scalar, line.device);
     if (replacesEarlier(line, device)) {
@@ -303,7 +303,7 @@ void SqliteStore::add(const ExportedLine& line) {
       }
     }
     _batchSize += line.text.size();
-    if (_batchSize >= kBatchSize || _tails.size() >= kBatchTails) {
+    if (_batchSize >= kBatchBytes || _tails.size() >= kBatchTails) {
       commitBatch();
     }
   });
@@ -343,6 +343,11 @@ void SqliteStore::write(Tail& tail) {
       .run();
 }
 
+void SqliteStore::beginBatch() {
+  _database->execute("BEGIN IMMEDIATE");
+  _inBatch = true;
+}
+
 void SqliteStore::commitBatch() {
   // In the order of the file.
   std::vector<std::int64_t> keys;
@@ -354,8 +359,8 @@ void SqliteStore::commitBatch() {
   for (const std::int64_t key : keys) {
     write(_tails.at(key));
   }
-  _transaction->commit();
-  _transaction.reset();
+  _database->commit();
+  _inBatch = false;
   _tails.clear();
   _numbers.clear();  // another load may go on from here
   _batchSize = 0;
@@ -363,7 +368,7 @@ void SqliteStore::commitBatch() {
 
 void SqliteStore::finish() {
   guarded([&] {
-    if (_transaction) {
+    if (_inBatch) {
       commitBatch();
     }
     if (_database->queryInteger("SELECT lines > (SELECT count(*) FROM line) FROM replaced") != 0) {
@@ -374,7 +379,7 @@ void SqliteStore::finish() {
 
 /// Leaves out of the chunks what replaced lines said.
 void SqliteStore::writeAnew() {
-  _transaction.emplace(*_database, SqliteTransaction::Kind::Writing);
+  beginBatch();
   const std::vector<Line> lines = linesThatHold({});
   SqliteStatement remove(*_database, "DELETE FROM chunk WHERE number >= ? AND number < ?");
   SqliteStatement keys(*_database, "SELECT number, kind FROM key");
@@ -452,7 +457,7 @@ void SqliteStore::visitEntries(std::int64_t key, const std::vector<Line>& lines,
 
 void SqliteStore::visitKeys(const std::function<void(const ReportedKey&)>& visit) {
   guarded([&] {
-    SqliteTransaction reading(*_database, SqliteTransaction::Kind::Reading);
+    _database->execute("BEGIN");  // one state of the store, until it is closed
     const std::vector<Line> lines = linesThatHold({});
     std::vector<std::int32_t> days;
     std::int64_t devices = 0;
@@ -493,7 +498,7 @@ void SqliteStore::visitKeys(const std::function<void(const ReportedKey&)>& visit
 void SqliteStore::visitScalars(std::string_view key, const DayRange& days,
                                const std::function<void(std::int32_t, std::int64_t)>& visit) {
   guarded([&] {
-    SqliteTransaction reading(*_database, SqliteTransaction::Kind::Reading);
+    _database->execute("BEGIN");  // one state of the store, until it is closed
     if (const auto number = findKey(KeyKind::Scalar, key)) {
       visitEntries<std::int64_t>(
           *number, linesThatHold(days),
@@ -506,7 +511,7 @@ void SqliteStore::visitDistributions(
     std::string_view key, const DayRange& days,
     const std::function<void(std::int32_t, const Distribution&)>& visit) {
   guarded([&] {
-    SqliteTransaction reading(*_database, SqliteTransaction::Kind::Reading);
+    _database->execute("BEGIN");  // one state of the store, until it is closed
     const auto number = findKey(KeyKind::Distribution, key);
     if (!number) {
       return;

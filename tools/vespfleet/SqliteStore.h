@@ -60,6 +60,7 @@ class SqliteStore : public FleetStore {
   void write(Tail& tail);
   Tail& tailOf(std::int64_t key);
   std::int64_t numberOf(const char* table, KeyKind kind, std::string_view text);
+  void beginBatch();
   void commitBatch();
   void writeAnew();
   std::vector<Line> linesThatHold(const DayRange& days);
@@ -71,8 +72,8 @@ class SqliteStore : public FleetStore {
 
   std::string _path;
   std::unique_ptr<SqliteConnection> _database;
-  std::unique_ptr<Statements> _statements;  ///< of a store that is loaded
-  std::optional<SqliteTransaction> _transaction;
+  std::unique_ptr<Statements> _statements;                 ///< of a store that is loaded
+  bool _inBatch = false;                                   ///< and so in a transaction
   std::unordered_map<std::string, std::int64_t> _numbers;  ///< of names met in this batch
   std::unordered_map<std::int64_t, Tail> _tails;
   std::size_t _batchSize = 0;  ///< bytes of text

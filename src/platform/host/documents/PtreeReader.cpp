@@ -27,7 +27,7 @@ enum class Element { Dict, Array, Key, String, Integer, Real, True, False, Data,
 constexpr std::array<std::string_view, 10> kElementNames = {
     "dict", "array", "key", "string", "integer", "real", "true", "false", "data", "date"};
 
-constexpr std::size_t kPieceSize = 256 * 1024;
+constexpr std::size_t kParsedPiece = 256 * 1024;
 constexpr std::string_view kWhiteSpace = " \t\n\r";
 constexpr const char* kNoPtree = "the document does not begin with <ptree>";
 constexpr const char* kNoXmlVersion = "the XML declaration does not say version 1.0";
@@ -95,7 +95,8 @@ class PtreeParser {
     }
     for (bool isLast = false; _fault.line == 0 && !isLast;) {
       // Expat looks at the whole of an unfinished token again with every piece.
-      const std::string_view piece = document.substr(0, std::max(kPieceSize, _taken - _tokenStart));
+      const std::string_view piece =
+          document.substr(0, std::max(kParsedPiece, _taken - _tokenStart));
       document.remove_prefix(piece.size());
       isLast = document.empty();
       takePiece(piece, isLast);

@@ -16,7 +16,7 @@ namespace vesprun {
 namespace {
 
 constexpr mode_t kOwnerOnly = 0600;
-constexpr std::size_t kPieceSize = 64 * 1024;
+constexpr std::size_t kWrittenPiece = 64 * 1024;
 constexpr int kMostUnfinished = 100;
 
 FileDescriptor openFolder(const std::string& folder) {
@@ -96,7 +96,7 @@ bool AtomicFile::append(std::string_view bytes) {
   if (!_failure.empty()) {
     return false;
   }
-  if (_pending.size() + bytes.size() < kPieceSize) {
+  if (_pending.size() + bytes.size() < kWrittenPiece) {
     _pending += bytes;
     return true;
   }

@@ -17,7 +17,7 @@ namespace vesprun {
 namespace {
 
 constexpr std::size_t kMostPeers = 16;
-constexpr std::size_t kPieceSize = 64 * 1024;
+constexpr std::size_t kReceivedPiece = 64 * 1024;
 
 class UnixPeer final : public PeerConnection {
  public:
@@ -187,7 +187,7 @@ class UnixServiceListener final : public ServiceListener {
   PeerHandler _handler;
   bool _started = false;
   std::map<int, PeerPointer> _peers;
-  std::array<char, kPieceSize> _piece{};
+  std::array<char, kReceivedPiece> _piece{};
   std::shared_ptr<bool> _alive = std::make_shared<bool>(true);
 };
 
