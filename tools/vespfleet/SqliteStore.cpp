@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <chrono>
 #include <filesystem>
+#include <map>
 #include <span>
 #include <tuple>
 
@@ -136,6 +137,29 @@ PackedDistribution readValue(PackedReader& entries) {
     value.counts.emplace_back(label, entries.varint());
   }
   return value;
+}
+
+/// What is read of a value when only its line matters.
+template <KeyKind kind>
+struct PassedOver {};
+
+template <>
+PassedOver<KeyKind::Scalar> readValue(PackedReader& entries) {
+  entries.varint();
+  return {};
+}
+
+template <>
+PassedOver<KeyKind::Distribution> readValue(PackedReader& entries) {
+  for (int number = 0; number < 4; ++number) {
+    entries.real();
+  }
+  entries.varint();
+  for (std::uint64_t labels = entries.varint(); labels > 1; --labels) {
+    entries.varint();
+    entries.varint();
+  }
+  return {};
 }
 
 }  // namespace
@@ -383,12 +407,13 @@ void SqliteStore::writeAnew() {
   const std::vector<Line> lines = linesThatHold({});
   SqliteStatement remove(*_database, "DELETE FROM chunk WHERE number >= ? AND number < ?");
   SqliteStatement keys(*_database, "SELECT number, kind FROM key");
-  const auto keep = [&]<typename Value>(std::int64_t key, Value* /*kind*/) {
+  while (keys.step()) {
+    const std::int64_t key = keys.integer(0);
     std::vector<std::pair<std::int64_t, std::string>> kept;
-    visitEntries<Value>(key, lines,
-                        [&](const Line& line, const Value& /*value*/, std::string_view packed) {
-                          kept.emplace_back(line.number, packed);
-                        });
+    visitPackedEntries(static_cast<KeyKind>(keys.integer(1)), key, lines,
+                       [&kept](const Line& line, std::string_view packed) {
+                         kept.emplace_back(line.number, packed);
+                       });
     remove.bind(1, key * kChunksOfKey).bind(2, (key + 1) * kChunksOfKey).run();
     for (const auto& [line, packed] : kept) {
       append(key, line, packed);
@@ -396,13 +421,6 @@ void SqliteStore::writeAnew() {
     if (const auto tail = _tails.find(key); tail != _tails.end()) {
       write(tail->second);
       _tails.erase(tail);
-    }
-  };
-  while (keys.step()) {
-    if (static_cast<KeyKind>(keys.integer(1)) == KeyKind::Scalar) {
-      keep(keys.integer(0), static_cast<std::int64_t*>(nullptr));
-    } else {
-      keep(keys.integer(0), static_cast<PackedDistribution*>(nullptr));
     }
   }
   _database->execute("UPDATE replaced SET lines = 0");
@@ -455,39 +473,45 @@ void SqliteStore::visitEntries(std::int64_t key, const std::vector<Line>& lines,
   }
 }
 
+/// The same without reading the values.
+template <typename Visit>
+void SqliteStore::visitPackedEntries(KeyKind kind, std::int64_t key, const std::vector<Line>& lines,
+                                     const Visit& visit) {
+  const auto pass = [&visit](const Line& line, const auto& /*value*/, std::string_view packed) {
+    visit(line, packed);
+  };
+  if (kind == KeyKind::Scalar) {
+    visitEntries<PassedOver<KeyKind::Scalar>>(key, lines, pass);
+  } else {
+    visitEntries<PassedOver<KeyKind::Distribution>>(key, lines, pass);
+  }
+}
+
 void SqliteStore::visitKeys(const std::function<void(const ReportedKey&)>& visit) {
   guarded([&] {
     _database->execute("BEGIN");  // one state of the store, until it is closed
-    const std::vector<Line> lines = linesThatHold({});
-    std::vector<std::int32_t> days;
+    std::vector<Line> lines = linesThatHold({});
+    std::map<std::int32_t, std::int32_t> places;  // of days
     std::int64_t devices = 0;
-    for (const Line& line : lines) {
-      days.push_back(line.day);
+    for (Line& line : lines) {
+      line.day = places.try_emplace(line.day, places.size()).first->second;
       devices = std::max(devices, line.device);
     }
-    std::sort(days.begin(), days.end());
-    days.erase(std::unique(days.begin(), days.end()), days.end());
 
     SqliteStatement keys(*_database, "SELECT number, name, kind FROM key ORDER BY name, kind");
     // The number of the last key that was met on a device, on a day.
     std::vector<std::int64_t> keyOfDevice(static_cast<std::size_t>(devices) + 1, -1);
-    std::vector<std::int64_t> keyOfDay(days.size(), -1);
+    std::vector<std::int64_t> keyOfDay(places.size(), -1);
     while (keys.step()) {
       const std::int64_t key = keys.integer(0);
       ReportedKey reported{std::string(keys.text(1)), static_cast<KeyKind>(keys.integer(2)), 0, 0};
-      const auto meet = [&](const Line& line, const auto& /*value*/, std::string_view /*packed*/) {
-        const auto day = std::lower_bound(days.begin(), days.end(), line.day) - days.begin();
-        std::int64_t& onDay = keyOfDay[static_cast<std::size_t>(day)];
+      visitPackedEntries(reported.kind, key, lines, [&](const Line& line, std::string_view) {
+        std::int64_t& onDay = keyOfDay[static_cast<std::size_t>(line.day)];
         std::int64_t& onDevice = keyOfDevice[static_cast<std::size_t>(line.device)];
         reported.days += onDay != key ? 1 : 0;
         reported.devices += onDevice != key ? 1 : 0;
         onDay = onDevice = key;
-      };
-      if (reported.kind == KeyKind::Scalar) {
-        visitEntries<std::int64_t>(key, lines, meet);
-      } else {
-        visitEntries<PackedDistribution>(key, lines, meet);
-      }
+      });
       if (reported.devices > 0) {
         visit(reported);
       }

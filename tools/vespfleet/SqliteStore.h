@@ -67,6 +67,9 @@ class SqliteStore : public FleetStore {
   std::optional<std::int64_t> findKey(KeyKind kind, std::string_view key);
   template <typename Value, typename Visit>
   void visitEntries(std::int64_t key, const std::vector<Line>& lines, const Visit& visit);
+  template <typename Visit>
+  void visitPackedEntries(KeyKind kind, std::int64_t key, const std::vector<Line>& lines,
+                          const Visit& visit);
   template <typename Task>
   auto guarded(const Task& task);
 
