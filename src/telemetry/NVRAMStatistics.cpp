@@ -44,7 +44,7 @@ PropertyDict readNVRAMStatistics() {
 }  // namespace
 
 PropertyDict gatherNVRAMStats() {
-  const PropertyDict statistics = readNVRAMStatistics();
+  PropertyDict statistics = readNVRAMStatistics();
   if (!statistics.empty()) {
     platform().eventHub().EventHubSendEventLazy(kNVRAMEvent, [statistics] { return statistics; });
   }

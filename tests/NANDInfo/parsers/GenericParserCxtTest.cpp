@@ -1,5 +1,7 @@
 #include "NANDInfo/parsers/GenericParserCxt.h"
 
+#include <gmock/gmock.h>
+
 #include "FieldsOf.h"
 #include "NANDInfo/lists/HexText.h"
 #include "platform/DictionaryHelpers.h"

@@ -1,5 +1,7 @@
 #include "NANDInfo/parsers/KernelSnapshot.h"
 
+#include <gmock/gmock.h>
+
 #include "buffers/DeviceBuffers.h"
 
 namespace vesprun {

@@ -1,5 +1,7 @@
 #include "NANDInfo/parsers/VendorCounterParsers.h"
 
+#include <gmock/gmock.h>
+
 #include <map>
 #include <numeric>
 

@@ -18,7 +18,7 @@ void ChunkEnumerator::start(std::int64_t distribution) {
 
 void ChunkEnumerator::rethrowFailure() const {
   if (_failure) {
-    throw *_failure;
+    throw SqliteFailure(*_failure);
   }
 }
 
