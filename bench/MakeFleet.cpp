@@ -95,6 +95,7 @@ int main(int argc, char** argv) {
   const Fleet fleet{std::atoi(argv[2]), std::atoi(argv[3]), std::atoi(argv[4]),
                     std::strtoull(argv[5], nullptr, 10)};
   std::vector<std::string> keys;
+  keys.reserve(static_cast<std::size_t>(fleet.keys));
   for (int key = 0; key < fleet.keys; ++key) {
     keys.push_back(keyName(key));
   }

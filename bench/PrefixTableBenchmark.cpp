@@ -39,6 +39,7 @@ std::vector<std::string> keys(int prefixCount) {
 void lookUp(benchmark::State& state) {
   const int prefixCount = static_cast<int>(state.range(0));
   std::vector<std::string> prefixes;
+  prefixes.reserve(static_cast<std::size_t>(prefixCount));
   for (int i = 0; i < prefixCount; ++i) {
     prefixes.push_back(prefix(i));
   }
