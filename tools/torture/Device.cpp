@@ -86,54 +86,73 @@ void writeFile(const fs::path& path, const std::string& content) {
   }
 }
 
-int runPlain(const std::vector<std::string>& command, const std::string& folder, std::string& output,
-             const std::string& input) {
+Companion::Companion(const std::vector<std::string>& command, const std::string& folder,
+                     const std::string& input)
+    : _output(std::tmpfile()) {
   std::vector<char*> arguments;
   for (const std::string& argument : command) {
     arguments.push_back(const_cast<char*>(argument.c_str()));  // NOLINT: execv changes nothing
   }
   arguments.push_back(nullptr);
   FILE* in = std::tmpfile();
-  FILE* out = std::tmpfile();
-  if (in == nullptr || out == nullptr) {
+  if (in == nullptr || _output == nullptr) {
     throw std::runtime_error("no temporary file can be made");
   }
   std::fwrite(input.data(), 1, input.size(), in);
   std::rewind(in);
-  const pid_t child = fork();
-  if (child == 0) {
+  _child = fork();
+  if (_child == 0) {
     dup2(fileno(in), STDIN_FILENO);
-    dup2(fileno(out), STDOUT_FILENO);
-    dup2(fileno(out), STDERR_FILENO);
+    dup2(fileno(_output), STDOUT_FILENO);
+    dup2(fileno(_output), STDERR_FILENO);
     alarm(60);
     if (chdir(folder.c_str()) == 0) {
       execv(arguments[0], arguments.data());
     }
     _exit(126);
   }
-  int status = 0;
-  while (waitpid(child, &status, 0) < 0 && errno == EINTR) {
-  }
-  output.clear();
-  std::rewind(out);
-  char piece[65536];
-  for (std::size_t got = 0; (got = std::fread(piece, 1, sizeof piece, out)) > 0;) {
-    output.append(piece, got);
-  }
   std::fclose(in);
-  std::fclose(out);
-  return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
 }
 
-Device::Device(const Programs& programs, fs::path folder)
-    : _programs(&programs), _path(std::move(folder)) {
+Companion::~Companion() {
+  status();
+  std::fclose(_output);
+}
+
+bool Companion::endsWithin(int milliseconds) {
+  for (int waited = 0; !_ended && waited <= milliseconds; ++waited) {
+    _ended = waitpid(_child, &_status, WNOHANG) == _child;
+    if (!_ended) {
+      usleep(1000);
+    }
+  }
+  return _ended;
+}
+
+int Companion::status() {
+  while (!_ended) {
+    _ended = waitpid(_child, &_status, 0) == _child || errno != EINTR;
+  }
+  return WIFEXITED(_status) ? WEXITSTATUS(_status) : -1;
+}
+
+std::string Companion::output() const {
+  std::string text;
+  std::rewind(_output);
+  char piece[65536];
+  for (std::size_t got = 0; (got = std::fread(piece, 1, sizeof piece, _output)) > 0;) {
+    text.append(piece, got);
+  }
+  return text;
+}
+
+Device::Device(const Programs& programs, const fs::path& folder)
+    : _programs(&programs), _path(folder.string()) {
   std::string output;
   if (control("init", {"--sample"}, output) != 0 || control("counters", {"dump"}, output) != 0) {
     throw std::runtime_error("no device can be made: " + output);
   }
-  auto description = nlohmann::ordered_json::parse(readFile(_path + "/device.json"));
-  description.merge_patch(nlohmann::ordered_json::parse(kDescription));
-  writeFile(_path + "/device.json", description.dump());
+  describe(kDescription);
   setDay(kFirstDay);
   writeFile(_path + "/Library/Logsmith/com.quill.Ferrywell.ptree", kTasking);
   fs::remove(_path + "/var/mobile/Library/Tallybook/TBDataStore.sqlitedb");
@@ -148,29 +167,36 @@ Device::Device(const Programs& programs, fs::path folder)
   }
 }
 
-Device::Device(const Device& original, fs::path folder)
-    : _programs(original._programs), _path(std::move(folder)) {
+Device::Device(const Device& original, const fs::path& folder)
+    : _programs(original._programs), _path(folder.string()) {
   fs::remove_all(_path);
   fs::copy(original._path, _path, fs::copy_options::recursive);
 }
 
-void Device::setDay(int day) {
+void Device::describe(const std::string& change) {
   auto description = nlohmann::ordered_json::parse(readFile(_path + "/device.json"));
-  description["clock"] = clockOf(day);
+  description.merge_patch(nlohmann::ordered_json::parse(change));
   writeFile(_path + "/device.json", description.dump());
 }
 
+void Device::setDay(int day) { describe(R"({"clock": ")" + clockOf(day) + R"("})"); }
+
 int Device::control(const std::string& command, const std::vector<std::string>& rest,
                     std::string& output, const std::string& input) const {
-  std::vector<std::string> line{_programs->vespctl, command, _path};
-  line.insert(line.end(), rest.begin(), rest.end());
-  return runPlain(line, "/", output, input);
+  Companion program(controlCommand(command, rest), "/", input);
+  const int status = program.status();
+  output = program.output();
+  return status;
 }
 
-int Device::runDaily() const {
-  std::string output;
-  return runPlain(dailyCommand(), _path, output);
+std::vector<std::string> Device::controlCommand(const std::string& command,
+                                                const std::vector<std::string>& rest) const {
+  std::vector<std::string> line{_programs->vespctl, command, _path};
+  line.insert(line.end(), rest.begin(), rest.end());
+  return line;
 }
+
+int Device::runDaily() const { return Companion(dailyCommand(), _path).status(); }
 
 Sight Device::look() const {
   Sight sight;

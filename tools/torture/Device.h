@@ -1,5 +1,8 @@
 #pragma once
 
+#include <sys/types.h>
+
+#include <cstdio>
 #include <filesystem>
 #include <map>
 #include <string>
@@ -29,16 +32,20 @@ struct Sight {
 class Device {
  public:
   /// Sets the device up in a new folder.
-  Device(const Programs& programs, std::filesystem::path folder);
+  Device(const Programs& programs, const std::filesystem::path& folder);
   /// A copy of it in another folder, in place of what is there.
-  Device(const Device& original, std::filesystem::path folder);
+  Device(const Device& original, const std::filesystem::path& folder);
 
   const std::string& path() const { return _path; }
   void setDay(int day);
+  /// Lays a JSON object over the device's description; null removes an entry.
+  void describe(const std::string& change);
 
   /// Runs `vespctl COMMAND DIR REST...`; its exit status, and what it printed in `output`.
   int control(const std::string& command, const std::vector<std::string>& rest, std::string& output,
               const std::string& input = {}) const;
+  std::vector<std::string> controlCommand(const std::string& command,
+                                          const std::vector<std::string>& rest) const;
   /// The daily run, without a fault; its exit status.
   int runDaily() const;
   std::vector<std::string> dailyCommand() const { return {_programs->vesprun, "-d"}; }
@@ -52,9 +59,29 @@ class Device {
   std::string _path;
 };
 
-/// Starts a program in `folder` with `input` on its standard input; its exit status, -1 for a signal.
-int runPlain(const std::vector<std::string>& command, const std::string& folder, std::string& output,
-             const std::string& input = {});
+/// A program that runs beside this one in `folder`, with `input` on its standard input, for a minute
+/// at most.
+class Companion {
+ public:
+  Companion(const std::vector<std::string>& command, const std::string& folder,
+            const std::string& input = {});
+  Companion(const Companion&) = delete;
+  Companion& operator=(const Companion&) = delete;
+  ~Companion();
+
+  /// True when it ended within the time.
+  bool endsWithin(int milliseconds);
+  /// Waits for its end; the exit status, -1 for a signal.
+  int status();
+  /// What it printed on both streams.
+  std::string output() const;
+
+ private:
+  FILE* _output;
+  pid_t _child;
+  int _status = 0;
+  bool _ended = false;
+};
 
 std::string readFile(const std::filesystem::path& path);
 void writeFile(const std::filesystem::path& path, const std::string& content);

@@ -217,11 +217,12 @@ std::vector<Case> failingCalls(const Programs& programs, const fs::path& folder,
     const std::size_t one = errors.empty() ? 0 : random() % errors.size();
     for (std::size_t each = 0; each < errors.size(); ++each) {
       if (full || each == one) {
-        add(strerrorname_np(errors[each]), {.kind = Fault::Kind::Error, .error = errors[each]});
+        add(strerrorname_np(errors[each]),
+            {.kind = Fault::Kind::Error, .number = call.number, .error = errors[each]});
       }
     }
     if (transfersBytes(call.number) && started) {
-      add("short", {.kind = Fault::Kind::Short});
+      add("short", {.kind = Fault::Kind::Short, .number = call.number});
     }
     add("kill", {.kind = Fault::Kind::Kill});
   }
@@ -251,12 +252,262 @@ std::vector<Case> fullDisk(const Programs& programs, const fs::path& folder, std
   return cases;
 }
 
+/// Another program that changes the device while the daily run goes on.
+struct Neighbour {
+  std::string name;
+  std::vector<std::string> command;
+  std::vector<std::string> question;  ///< what `vespctl` is asked afterwards, without the device
+  std::string answer;
+};
+
+Faults runBeside(const Reference& reference, const fs::path& folder, std::size_t call,
+                 const Neighbour& neighbour) {
+  Device device(reference.device, folder);
+  std::unique_ptr<Companion> companion;
+  const bool isDaily = neighbour.command.empty();
+  const auto start = [&] {
+    companion = std::make_unique<Companion>(
+        isDaily ? device.dailyCommand()
+                : device.controlCommand(neighbour.command.front(),
+                                        {neighbour.command.begin() + 1, neighbour.command.end()}),
+        device.path());
+    // A neighbour that waits for a lock of the paused run goes on after it.
+    companion->endsWithin(30);
+  };
+  const Outcome outcome = runTraced(
+      device.dailyCommand(), device.path(),
+      {.kind = Fault::Kind::Pause, .call = call, .whilePaused = start});
+  Faults faults = judgeRun(outcome, false, true);
+  if (!companion) {
+    return faults;
+  }
+  if (companion->status() != 0) {
+    faults.push_back("the neighbour failed: " + companion->output());
+  }
+  std::string answer;
+  if (!isDaily) {
+    device.control(neighbour.question.front(),
+                   {neighbour.question.begin() + 1, neighbour.question.end()}, answer);
+    if (answer.find(neighbour.answer) == std::string::npos) {
+      faults.push_back("what the neighbour wrote is lost");
+    }
+  }
+  if (neighbour.name == "counters") {
+    return faults += device.look().faults;
+  }
+  faults += finishTheDays(device);
+  const Sight sight = device.look();
+  faults += judge(sight, reference, true);
+  if (dailyLogs(sight).size() != 2) {
+    faults.push_back(std::to_string(dailyLogs(sight).size()) + " logs of two days");
+  }
+  return faults;
+}
+
+std::vector<Case> neighbours(const Programs& programs, const fs::path& folder, std::uint32_t seed,
+                             bool full) {
+  const auto reference = makeReference(programs, folder / "neighbours");
+  const std::string day = std::to_string(kFirstDay);
+  const std::vector<Neighbour> others = {
+      {"daily run", {}, {}, {}},
+      {"preferences",
+       {"prefs", "set", "com.quill.aggregated.vesprun", "torture", "7"},
+       {"prefs", "get", "com.quill.aggregated.vesprun", "torture"},
+       "7"},
+      {"counters",
+       {"counters", "add", "host.torture", "7"},
+       {"counters", "dump"},
+       "scalar\t" + day + "\thost.torture\t7\n"},
+  };
+  std::vector<Case> cases;
+  const std::size_t step = full ? 3 : 23;
+  for (std::size_t call = firstOwnCall(*reference) + seed % step; call < reference->calls.size();
+       call += step) {
+    for (const Neighbour& neighbour : others) {
+      cases.push_back({neighbour.name + " beside call " + std::to_string(call),
+                       [=](const fs::path& work) {
+                         return runBeside(*reference, work, call, neighbour);
+                       }});
+    }
+  }
+  return cases;
+}
+
+/// A command that is all or nothing: after any fault its change is there whole or not at all.
+std::vector<Case> imports(const Programs& programs, const fs::path& folder, std::uint32_t seed,
+                          bool full) {
+  const auto original = std::make_shared<Device>(programs, folder / "imports");
+  std::string rows;
+  for (int row = 0; row < 300; ++row) {
+    rows += "scalar\t" + std::to_string(kFirstDay) + "\thost.imported." + std::to_string(row) +
+            "\t" + std::to_string(row) + '\n';
+  }
+  writeFile(original->path() + "/rows", rows);
+  const std::vector<std::string> rest{"import", original->path() + "/rows"};
+  Device device(*original, folder / "imports-reference");
+  const Outcome reference = runTraced(device.controlCommand("counters", rest), device.path());
+  const std::vector<std::string> before = original->look().counters;
+  const std::vector<std::string> after = device.look().counters;
+  std::vector<Case> cases;
+  std::mt19937 random(seed);
+  const auto judgeImport = [=](const fs::path& work, const Fault& fault) {
+    Device changed(*original, work);
+    const Outcome outcome = runTraced(changed.controlCommand("counters", rest), changed.path(),
+                                      fault);
+    Faults faults = judgeRun(outcome, fault.kind == Fault::Kind::Kill, false);
+    const Sight sight = changed.look();
+    faults += sight.faults;
+    if (sight.counters != before && sight.counters != after) {
+      faults.emplace_back("some lines are there and some are not");
+    }
+    if (outcome.status == 0 && sight.counters != after) {
+      faults.emplace_back("it said done, and nothing is there");
+    }
+    if (outcome.status > 0 && outcome.standardError.empty()) {
+      faults.emplace_back("it failed without a word");
+    }
+    return faults;
+  };
+  for (std::size_t index = 0; index < reference.calls.size(); ++index) {
+    const int number = reference.calls[index].number;
+    const std::vector<int>& errors = fittingErrors(number);
+    const std::size_t one = errors.empty() ? 0 : random() % errors.size();
+    const std::string place = ":" + nameOfCall(number) + ":" + std::to_string(index + 1);
+    for (std::size_t each = 0; each < errors.size(); ++each) {
+      if (full || each == one) {
+        const Fault fault{.kind = Fault::Kind::Error, .call = index + 1, .number = number,
+                          .error = errors[each]};
+        cases.push_back({std::string("import:") + strerrorname_np(errors[each]) + place,
+                         [=](const fs::path& work) { return judgeImport(work, fault); }});
+      }
+    }
+    const Fault fault{.kind = Fault::Kind::Kill, .call = index + 1};
+    cases.push_back({"import:kill" + place,
+                     [=](const fs::path& work) { return judgeImport(work, fault); }});
+  }
+  return cases;
+}
+
+std::string damaged(std::string content, const std::string& how, std::mt19937& random) {
+  if (content.empty()) {
+    return how == "noise" ? std::string(100, '\xff') : content;
+  }
+  if (how == "cut") {
+    content.resize(random() % content.size());
+  } else if (how == "flipped") {
+    content[random() % content.size()] ^= static_cast<char>(1U << (random() % 8));
+  } else if (how == "torn") {
+    // A block that was never written.
+    const std::size_t from = random() % content.size();
+    content.replace(from, std::min<std::size_t>(512, content.size() - from), 512, '\0');
+  } else {
+    std::ranges::generate(content, [&] { return static_cast<char>(random()); });
+  }
+  return content;
+}
+
+std::vector<Case> damages(const Programs& programs, const fs::path& folder, std::uint32_t seed,
+                          bool full) {
+  const auto original = std::make_shared<Device>(programs, folder / "damages");
+  original->runDaily();
+  original->setDay(kFirstDay + 1);
+  std::vector<Case> cases;
+  for (const fs::directory_entry& entry : fs::recursive_directory_iterator(original->path())) {
+    const std::string name = fs::relative(entry.path(), original->path()).string();
+    if (!entry.is_regular_file() || name.starts_with("outbox/logs/")) {
+      continue;
+    }
+    for (const char* how : {"cut", "flipped", "torn", "noise"}) {
+      for (std::uint32_t time = 0; time < (full ? 20U : 2U); ++time) {
+        const std::uint32_t ownSeed = seed * 31 + time;
+        cases.push_back(
+            {name + " " + how + " " + std::to_string(time), [=](const fs::path& work) {
+               Device device(*original, work);
+               std::mt19937 random(ownSeed);
+               const fs::path path = fs::path(device.path()) / name;
+               writeFile(path, damaged(readFile(path), how, random));
+               Faults faults;
+               for (int run = 0; run < 2; ++run) {
+                 if (const int status = device.runDaily(); status != 0) {
+                   faults.push_back("exit status " + std::to_string(status));
+                 }
+               }
+               for (const std::string& fault : device.look().faults) {
+                 if (!fault.starts_with(name) && !fault.starts_with("the counters")) {
+                   faults.push_back(fault);
+                 }
+               }
+               return faults;
+             }});
+      }
+    }
+  }
+  return cases;
+}
+
+/// A clock that mostly goes on by a day, and sometimes stays, goes back or jumps ahead.
+Faults liveThrough(const Device& original, const fs::path& folder, std::uint32_t seed, int days) {
+  Device device(original, folder);
+  std::mt19937 random(seed);
+  Faults faults;
+  std::vector<std::string> expected;
+  int day = kFirstDay + static_cast<int>(random() % 3650);
+  int stored = kFirstDay - 1;
+  for (int lived = 0; lived < days && faults.empty(); ++lived) {
+    const auto jump = random() % 100;
+    day += jump < 80 ? 1 : jump < 88 ? 0 : jump < 94 ? -static_cast<int>(random() % 40)
+                                                     : static_cast<int>(random() % 400);
+    device.setDay(day);
+    std::string output;
+    if (device.control("counters", {"set", "host.memory.MemFree", "65536"}, output) != 0 ||
+        device.control("counters", {"set", "host.memory.MemFree", "65536", "--day",
+                                    std::to_string(day - 1)}, output) != 0) {
+      faults.push_back("a counter cannot be set: " + output);
+    }
+    if (device.runDaily() != 0) {
+      faults.emplace_back("the run failed");
+    }
+    if (day - 1 > stored) {
+      stored = day - 1;
+      expected.push_back(std::to_string(day - 1));
+    }
+    if (dailyLogs(device.look()).size() != expected.size()) {
+      faults.push_back("day " + std::to_string(day) + ", the " + std::to_string(lived) +
+                       ". start: " + std::to_string(dailyLogs(device.look()).size()) +
+                       " logs instead of " + std::to_string(expected.size()));
+    }
+  }
+  return faults;
+}
+
+std::vector<Case> years(const Programs& programs, const fs::path& folder, std::uint32_t seed,
+                        bool full) {
+  const auto original = std::make_shared<Device>(programs, folder / "years");
+  original->describe(R"({"registry": null})");
+  original->runDaily();
+  for (const fs::directory_entry& entry :
+       fs::directory_iterator(original->path() + "/outbox/logs")) {
+    fs::remove(entry.path());
+  }
+  std::vector<Case> cases;
+  for (std::uint32_t year = 0; year < (full ? 100U : 10U); ++year) {
+    cases.push_back({"year " + std::to_string(year), [=](const fs::path& work) {
+                       return liveThrough(*original, work, seed * 1000 + year, 365);
+                     }});
+  }
+  return cases;
+}
+
 }  // namespace
 
 std::vector<Scenario> scenarios() {
   return {
       {"every call of a daily run fails or is its last", failingCalls},
       {"the disk gets full during a daily run", fullDisk},
+      {"others write during a daily run", neighbours},
+      {"every call of an import fails or is its last", imports},
+      {"files are damaged", damages},
+      {"the clock jumps through ten years", years},
   };
 }
 

@@ -69,7 +69,7 @@ const std::vector<CallRow>& callRows() {
       {SYS_brk, "brk", Paths::None, {ENOMEM}},
       {SYS_mprotect, "mprotect", Paths::None, {ENOMEM}},
       {SYS_clone3, "clone3", Paths::None, {EAGAIN}},
-      {SYS_getrandom, "getrandom", Paths::None, {EAGAIN}},
+      {SYS_getrandom, "getrandom", Paths::None, {}},
       {SYS_uname, "uname", Paths::None, {}},
       {SYS_socket, "socket", Paths::None, {EMFILE}},
       {SYS_bind, "bind", Paths::None, {EADDRINUSE}},
@@ -305,7 +305,8 @@ void Tracer::atEntry(pid_t thread) {
     record(thread, registers, pending);
   } else if (_fault.kind == Fault::Kind::DiskFull) {
     limitGrowth(thread, registers, pending);
-  } else if (_count != _fault.call) {
+  } else if (_count < _fault.call || _outcome.happened ||
+             (_fault.number != 0 && _fault.number != pending.number)) {
     return;
   } else if (_fault.kind == Fault::Kind::Error) {
     replaceCall(thread, registers, pending, _fault.error);
@@ -360,7 +361,7 @@ Outcome Tracer::run() {
   const TimeLimit limit;
   while (true) {
     int status = 0;
-    const pid_t thread = waitpid(-1, &status, __WALL);
+    const pid_t thread = waitpid(-_child, &status, __WALL);
     if (thread < 0) {
       if (errno == EINTR && TimeLimit::expired()) {
         _outcome.late = true;
@@ -437,7 +438,8 @@ Outcome runTraced(const std::vector<std::string>& command, const std::string& fo
     dup2(output.descriptor(), STDOUT_FILENO);
     dup2(errors.descriptor(), STDERR_FILENO);
     setenv("MALLOC_TOP_PAD_", "0", 1);  // more often a call for memory that can fail
-    if (chdir(folder.c_str()) == 0 && ptrace(PTRACE_TRACEME, 0, nullptr, nullptr) == 0) {
+    // A group of its own: other children of this process are not the tracer's.
+    if (setpgid(0, 0) == 0 && chdir(folder.c_str()) == 0 && ptrace(PTRACE_TRACEME, 0, nullptr, nullptr) == 0) {
       raise(SIGSTOP);
       execv(arguments[0], arguments.data());
     }

@@ -19,6 +19,8 @@ struct Fault {
   };
   Kind kind = Kind::None;
   std::size_t call = 0;  ///< counted from 1, over all threads
+  /// When not 0: the first call of this kind from there on. Threads do not always take turns alike.
+  int number = 0;
   int error = 0;
   std::uint64_t room = 0;
   std::function<void()> whilePaused = {};
