@@ -21,10 +21,10 @@ inline constexpr int kFirstDay = 19787;
 
 /// What can be seen of a device from outside.
 struct Sight {
-  std::map<std::string, std::string> logs;     ///< name in the outbox to content
-  std::vector<std::string> counters;           ///< rows as `vespctl counters dump` writes them
-  std::vector<std::string> files;              ///< all other names
-  std::vector<std::string> faults;             ///< what must never be seen
+  std::map<std::string, std::string> logs;  ///< name in the outbox to content
+  std::vector<std::string> counters;        ///< rows as `vespctl counters dump` writes them
+  std::vector<std::string> files;           ///< all other names
+  std::vector<std::string> faults;          ///< what must never be seen
 };
 
 /// A device directory with something to do for every step of the day, whose clock stands still, and
@@ -59,8 +59,8 @@ class Device {
   std::string _path;
 };
 
-/// A program that runs beside this one in `folder`, with `input` on its standard input, for a minute
-/// at most.
+/// A program that runs beside this one in `folder`, with `input` on its standard input, for a
+/// minute at most.
 class Companion {
  public:
   Companion(const std::vector<std::string>& command, const std::string& folder,

@@ -133,7 +133,7 @@ std::string pathAt(pid_t process, std::uint64_t folder, std::uint64_t address) {
 }
 
 /// Which bytes and names would be lost if the power went now. Lines of `.jsonl` files are appended
-/// without waiting for the disk, and what SQLite deletes need not be gone for good.
+/// without waiting for the disk.
 class Durability {
  public:
   explicit Durability(std::string folder) : _folder(std::move(folder)) {}
@@ -156,14 +156,19 @@ class Durability {
     }
     _dirtyFolders.insert(to.substr(0, to.rfind('/')));
   }
-  void removed(const std::string& path) { _dirtyFiles.erase(path); }
+  void removed(const std::string& path) {
+    _dirtyFiles.erase(path);
+    if (counts(path) && path.ends_with("-journal")) {  // its end is the end of the transaction
+      _dirtyFolders.insert(path.substr(0, path.rfind('/')));
+    }
+  }
 
   std::vector<std::string> atTheEnd() {
     for (const std::string& path : _dirtyFiles) {
       _faults.push_back(path + " was written and never flushed");
     }
     for (const std::string& path : _dirtyFolders) {
-      _faults.push_back("a name was given in " + path + ", which was never flushed");
+      _faults.push_back(path + " lost or gained a name and was never flushed");
     }
     return _faults;
   }
@@ -326,8 +331,8 @@ void Tracer::atExit(pid_t thread) {
   const Pending& pending = _pending[thread];
   if (pending.error != 0) {
     // A program break that cannot grow is answered by the one that was.
-    registers.rax = pending.number == SYS_brk ? _break
-                                              : static_cast<unsigned long long>(-pending.error);
+    registers.rax =
+        pending.number == SYS_brk ? _break : static_cast<unsigned long long>(-pending.error);
     setRegisters(thread, registers);
   } else if (pending.number == SYS_brk) {
     _break = registers.rax;
@@ -439,7 +444,8 @@ Outcome runTraced(const std::vector<std::string>& command, const std::string& fo
     dup2(errors.descriptor(), STDERR_FILENO);
     setenv("MALLOC_TOP_PAD_", "0", 1);  // more often a call for memory that can fail
     // A group of its own: other children of this process are not the tracer's.
-    if (setpgid(0, 0) == 0 && chdir(folder.c_str()) == 0 && ptrace(PTRACE_TRACEME, 0, nullptr, nullptr) == 0) {
+    if (setpgid(0, 0) == 0 && chdir(folder.c_str()) == 0 &&
+        ptrace(PTRACE_TRACEME, 0, nullptr, nullptr) == 0) {
       raise(SIGSTOP);
       execv(arguments[0], arguments.data());
     }

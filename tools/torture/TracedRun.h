@@ -29,22 +29,23 @@ struct Fault {
 /// One system call of a run without a fault.
 struct Call {
   int number = 0;
-  std::string path;  ///< of its descriptor or first path, when it is a file
+  std::string path;        ///< of its descriptor or first path, when it is a file
   std::uint64_t size = 0;  ///< bytes that a write asks for
 };
 
 struct Outcome {
   int status = -1;  ///< exit status; -1 when a signal ended the program
   int signal = 0;
-  bool late = false;       ///< stopped, since it took longer than the limit
+  bool late = false;  ///< stopped, since it took longer than the limit
   std::string standardError;
-  std::vector<Call> calls;                ///< recorded only without a fault
-  std::vector<std::string> notDurable;    ///< likewise: names given to bytes that were not flushed
-  bool happened = false;                  ///< the fault came to pass
+  std::vector<Call> calls;              ///< recorded only without a fault
+  std::vector<std::string> notDurable;  ///< likewise: names given to bytes that were not flushed
+  bool happened = false;                ///< the fault came to pass
 };
 
 /// Runs `command` in `folder` with every system call watched. Files below it are the ones whose
-/// disk gets full and whose durability counts. Throws `std::runtime_error` when tracing is not possible.
+/// disk gets full and whose durability counts. Throws `std::runtime_error` when tracing is not
+/// possible.
 Outcome runTraced(const std::vector<std::string>& command, const std::string& folder,
                   const Fault& fault = {});
 

@@ -1,7 +1,7 @@
-#include <CLI/CLI.hpp>
 #include <sys/mman.h>
 #include <sys/wait.h>
 #include <unistd.h>
+#include <CLI/CLI.hpp>
 
 #include <atomic>
 #include <cstdio>
@@ -74,8 +74,8 @@ int torture(const Options& options) {
     throw std::runtime_error(name + ": " + std::strerror(errno));
   }
   const fs::path folder = name;
-  void* shared = mmap(nullptr, sizeof(Counts), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS,
-                      -1, 0);
+  void* shared =
+      mmap(nullptr, sizeof(Counts), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
   if (shared == MAP_FAILED) {
     throw std::runtime_error(std::string("mmap: ") + std::strerror(errno));
   }
@@ -120,7 +120,8 @@ int torture(const Options& options) {
 }  // namespace vesprun::torture
 
 int main(int argc, char** argv) {
-  CLI::App app("Runs vesprun and vespctl under every fault that a system can show them.", "torture");
+  CLI::App app("Runs vesprun and vespctl under every fault that a system can show them.",
+               "torture");
   vesprun::torture::Options options;
   app.add_option("--seed", options.seed, "Where the random choices begin");
   app.add_flag("--full", options.full, "Every error of every call and every byte of a full disk");
