@@ -249,9 +249,11 @@ class Tracer {
 
 void Tracer::replaceCall(pid_t thread, user_regs_struct& registers, Pending& pending, int error) {
   pending.error = error;
-  registers.orig_rax = static_cast<unsigned long long>(-1);
-  setRegisters(thread, registers);
   _outcome.happened = true;
+  if (pending.number != SYS_close) {  // which closes, whatever it answers
+    registers.orig_rax = static_cast<unsigned long long>(-1);
+    setRegisters(thread, registers);
+  }
 }
 
 void Tracer::shorten(pid_t thread, user_regs_struct& registers, std::uint64_t size) {

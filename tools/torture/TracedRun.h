@@ -11,7 +11,7 @@ namespace vesprun::torture {
 struct Fault {
   enum class Kind {
     None,
-    Error,     ///< the call is not made and answers `error`
+    Error,     ///< the call answers `error` and is not made
     Short,     ///< a read or write that transfers half of what it was asked to, at least one byte
     Kill,      ///< SIGKILL in place of the call
     Pause,     ///< `whilePaused` runs before the call is made
