@@ -73,7 +73,8 @@ constexpr std::string_view kindName(FigureKind kind) {
 void printLinuxFigures() {
   for (const LinuxFigure& figure : linuxFigures) {
     std::cout << figure.file << '\t' << figure.field << '\t' << figure.key << '\t' << figure.unit
-              << '\t' << kindName(figure.kind) << '\t' << figure.why << '\n';
+              << '\t' << figure.divisor << '\t' << kindName(figure.kind) << '\t' << figure.why
+              << '\n';
   }
 }
 

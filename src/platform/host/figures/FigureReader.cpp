@@ -8,9 +8,9 @@
 #include <algorithm>
 #include <cerrno>
 #include <charconv>
+#include <cstdio>
 #include <cstring>
 #include <ctime>
-#include <limits>
 #include <memory>
 #include <optional>
 
@@ -81,15 +81,6 @@ std::optional<std::int64_t> numberOf(std::string_view word) {
   return number;
 }
 
-std::optional<std::int64_t> clockSeconds(std::string_view field) {
-  timespec awake{};
-  timespec all{};
-  if (clock_gettime(CLOCK_MONOTONIC, &awake) != 0 || clock_gettime(CLOCK_BOOTTIME, &all) != 0) {
-    return std::nullopt;
-  }
-  return field == "awake" ? awake.tv_sec : all.tv_sec - awake.tv_sec;
-}
-
 /// A device's name as a part of a key: never an address, of few characters, and short.
 std::string nameInKey(std::string_view name) {
   const auto isHexDigit = [](char c) { return ('0' <= c && c <= '9') || ('a' <= c && c <= 'f'); };
@@ -113,19 +104,11 @@ class FigureReader {
   FigureReader(const std::string& root, FigureReadings& readings)
       : _root(root), _readings(readings) {}
 
-  /// Reads figures of one file.
-  void read(std::span<const LinuxFigure* const> figures) {
+  /// Reads the figures of one file.
+  void read(std::span<const LinuxFigure> figures) {
     _figures = figures;
-    const std::string_view file = figures.front()->file;
-    if (file == kClockFile) {
-      for (const LinuxFigure* figure : figures) {
-        if (const auto seconds = _root.empty() ? clockSeconds(figure->field) : std::nullopt) {
-          add(*figure, std::string(file), {}, *seconds);
-        }
-      }
-      return;
-    }
     _isListed = true;
+    const std::string_view file = figures.front().file;
     expand("", file, {});
     if (_isListed && file.find('<') != std::string_view::npos) {
       _readings.listed.insert(file);
@@ -156,7 +139,12 @@ class FigureReader {
     const std::size_t end = pattern.find('>', start) + 1;
     const DeviceClass& deviceClass = *std::ranges::find(
         linuxDeviceClasses, pattern.substr(start, end - start), &DeviceClass::name);
-    for (const std::string& name : std::vector(devicesIn(folder, deviceClass))) {
+    const std::optional<std::vector<std::string>>& names = devicesIn(folder, deviceClass);
+    if (!names) {
+      _isListed = false;
+      return;
+    }
+    for (const std::string& name : *names) {
       Device inner = device;
       inner.isThere = true;
       if (!deviceClass.namedBy.empty()) {
@@ -182,23 +170,23 @@ class FigureReader {
 
   void readFile(const std::string& path, const Device& device) {
     const std::optional<std::string_view> content = text(path);
-    for (const LinuxFigure* figure : _figures) {
+    for (const LinuxFigure& figure : _figures) {
       std::optional<std::int64_t> value;
       if (content) {
-        const std::string_view word = fieldOf(*content, figure->field);
+        const std::string_view word = fieldOf(*content, figure.field);
         value = numberOf(word);
         if (value) {
-          *value /= figure->divisor;
+          *value /= figure.divisor;
         }
-        if (!value || *value < figure->lowest || *value > figure->highest) {
-          complain(path, std::string(figure->field) + (word.empty() ? " is missing"
-                                                       : value      ? " is out of range"
-                                                                    : " is no number"));
+        if (!value || *value < figure.lowest || *value > figure.highest) {
+          complain(path, std::string(figure.field) + (word.empty() ? " is missing"
+                                                      : value      ? " is out of range"
+                                                                   : " is no number"));
           value.reset();
         }
       }
-      if (value || (device.isThere && figure->kind == FigureKind::Counter)) {
-        add(*figure, path, device, value.value_or(kUnread));
+      if (value || (device.isThere && figure.kind == FigureKind::Counter)) {
+        add(figure, path, device, value.value_or(kUnread));
       }
     }
   }
@@ -215,6 +203,9 @@ class FigureReader {
 
   /// The content of a file as far as it is to be read, which stays until the next call.
   std::optional<std::string_view> text(const std::string& path) {
+    if (path == kClockFile) {
+      return clockText();
+    }
     // Opening must not wait for who writes to a pipe.
     const FileDescriptor file(
         open((_root + path).c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
@@ -249,6 +240,21 @@ class FigureReader {
     return content;
   }
 
+  /// The clocks of the running system as a file of /proc might have them.
+  std::optional<std::string_view> clockText() {
+    timespec awake{};
+    timespec all{};
+    if (!_root.empty() || clock_gettime(CLOCK_MONOTONIC, &awake) != 0 ||
+        clock_gettime(CLOCK_BOOTTIME, &all) != 0) {
+      return std::nullopt;
+    }
+    const int size =
+        std::snprintf(_buffer.get(), kLongestFile, "awake %lld\nasleep %lld\n",
+                      static_cast<long long>(awake.tv_sec),
+                      static_cast<long long>(std::max(all.tv_sec - awake.tv_sec, time_t{0})));
+    return std::string_view(_buffer.get(), static_cast<std::size_t>(size));
+  }
+
   std::optional<std::string_view> failed(const std::string& path) {
     // Missing, or gone between opening and reading.
     if (errno != ENOENT && errno != ENOTDIR && errno != ENODEV) {
@@ -257,38 +263,39 @@ class FigureReader {
     return std::nullopt;
   }
 
-  const std::vector<std::string>& devicesIn(const std::string& folder,
-                                            const DeviceClass& deviceClass) {
-    if (_lastFolder == folder && _lastClass == &deviceClass) {
-      _isListed = _isListed && _lastIsListed;
-      return _lastDevices;
+  /// The names of the devices of a class in a folder; nothing when not all can be known.
+  const std::optional<std::vector<std::string>>& devicesIn(const std::string& folder,
+                                                           const DeviceClass& deviceClass) {
+    const auto [entry, isNew] = _devices.try_emplace(folder + std::string(deviceClass.name));
+    if (isNew) {
+      entry->second = listDevices(folder, deviceClass.patterns);
     }
-    _lastFolder = folder;
-    _lastClass = &deviceClass;
-    _lastDevices.clear();
+    return entry->second;
+  }
+
+  std::optional<std::vector<std::string>> listDevices(const std::string& folder,
+                                                      std::string_view patterns) {
     struct Close {
       void operator()(DIR* stream) const { closedir(stream); }
     };
     const std::unique_ptr<DIR, Close> stream(opendir((_root + folder).c_str()));
-    _lastIsListed = stream != nullptr;
     if (!stream) {
       failed(folder);
+      return std::nullopt;
     }
-    for (const dirent* entry = nullptr; stream && (entry = readdir(stream.get())) != nullptr;) {
-      if (!matchesPatterns(entry->d_name, deviceClass.patterns)) {
+    std::vector<std::string> names;
+    while (const dirent* entry = readdir(stream.get())) {
+      if (!matchesPatterns(entry->d_name, patterns)) {
         continue;
       }
-      if (_lastDevices.size() == kMostDevices) {
+      if (names.size() == kMostDevices) {
         complain(folder, "more than 128 devices");
-        _lastDevices.clear();
-        _lastIsListed = false;
-        break;
+        return std::nullopt;
       }
-      _lastDevices.emplace_back(entry->d_name);
+      names.emplace_back(entry->d_name);
     }
-    std::ranges::sort(_lastDevices);
-    _isListed = _isListed && _lastIsListed;
-    return _lastDevices;
+    std::ranges::sort(names);
+    return names;
   }
 
   void complain(const std::string& path, std::string problem) {
@@ -297,13 +304,10 @@ class FigureReader {
 
   const std::string& _root;
   FigureReadings& _readings;
-  std::span<const LinuxFigure* const> _figures;
+  std::span<const LinuxFigure> _figures;
   bool _isListed = false;
   std::unique_ptr<char[]> _buffer{new char[kLongestFile + 1]};  // what is not read is not touched
-  std::string _lastFolder;
-  const DeviceClass* _lastClass = nullptr;
-  std::vector<std::string> _lastDevices;
-  bool _lastIsListed = false;
+  std::map<std::string, std::optional<std::vector<std::string>>> _devices;  ///< by folder and class
 };
 
 }  // namespace
@@ -312,23 +316,17 @@ FigureReadings readFigures(const std::string& root,
                            const std::function<bool(const LinuxFigure&)>& wanted) {
   FigureReadings readings;
   FigureReader reader(root, readings);
-  std::vector<const LinuxFigure*> ofFile;
-  for (const LinuxFigure& figure : linuxFigures) {
-    if (!wanted(figure)) {
-      continue;
+  for (std::span<const LinuxFigure> rest = linuxFigures; !rest.empty();) {
+    const LinuxFigure& first = rest.front();
+    const auto isOfOther = [&](const LinuxFigure& figure) { return figure.file != first.file; };
+    const auto figures =
+        rest.first(static_cast<std::size_t>(std::ranges::find_if(rest, isOfOther) - rest.begin()));
+    rest = rest.subspan(figures.size());
+    if (first.kind == FigureKind::Boots) {
+      readings.boot = reader.boot(first.file);
+    } else if (wanted(first)) {
+      reader.read(figures);
     }
-    if (figure.kind == FigureKind::Boots) {
-      readings.boot = reader.boot(figure.file);
-      continue;
-    }
-    if (!ofFile.empty() && ofFile.front()->file != figure.file) {
-      reader.read(ofFile);
-      ofFile.clear();
-    }
-    ofFile.push_back(&figure);
-  }
-  if (!ofFile.empty()) {
-    reader.read(ofFile);
   }
   return readings;
 }
@@ -336,11 +334,10 @@ FigureReadings readFigures(const std::string& root,
 void mergeFigure(std::map<std::string, std::int64_t>& figures, const LinuxFigure& figure,
                  const std::string& key, std::int64_t value) {
   const auto [entry, isNew] = figures.try_emplace(key, value);
-  if (isNew) {
-    return;
+  if (!isNew) {
+    entry->second =
+        figure.kind == FigureKind::Gauge ? std::max(entry->second, value) : entry->second + value;
   }
-  entry->second =
-      figure.kind == FigureKind::Gauge ? std::max(entry->second, value) : entry->second + value;
 }
 
 }  // namespace vesprun

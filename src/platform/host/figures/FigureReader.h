@@ -31,12 +31,12 @@ struct FigureReadings {
   std::map<std::string, std::string> problems;  ///< what was left out though it is there, by path
 };
 
-/// Reads the wanted figures of the system below `root` (empty: the running one).
+/// Reads the figures of the system below `root` (empty: the running one), of the files for which
+/// `wanted` takes their first figure.
 FigureReadings readFigures(const std::string& root,
                            const std::function<bool(const LinuxFigure&)>& wanted);
 
-/// Figures by key: the sum of those with one key, of gauges the highest. One whose sum is out of
-/// range is left out.
+/// Adds a figure to those by key: the sum of those with one key counts, of gauges the highest.
 void mergeFigure(std::map<std::string, std::int64_t>& figures, const LinuxFigure& figure,
                  const std::string& key, std::int64_t value);
 

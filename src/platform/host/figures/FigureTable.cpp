@@ -11,7 +11,7 @@ constexpr std::int64_t kHighestCount = std::int64_t{1} << 48;
 
 constexpr LinuxFigure counter(std::string_view file, std::string_view field, std::string_view key,
                               std::string_view unit, std::int64_t divisor, std::string_view why) {
-  return {file, field, key, unit, FigureKind::Counter, divisor, 0, kHighestCount, why, {}};
+  return {file, field, key, unit, FigureKind::Counter, divisor, 0, kHighestCount, why};
 }
 
 constexpr std::int32_t kMebibytes[] = {64, 256, 1024, 2048, 4096, 8192, 16384, 65536};
@@ -43,50 +43,30 @@ constexpr LinuxFigure endOfLife(std::string_view file, std::string_view key) {
 constexpr const char* kStat = "/proc/stat";
 constexpr const char* kVmstat = "/proc/vmstat";
 constexpr const char* kDisk = "/sys/block/<disk>/stat";
-constexpr const char* kBusy = "how busy the processors are, and with what";
-constexpr const char* kStalled = "time in which work waited for what the machine lacks";
-constexpr const char* kDiskWork = "how much a disk has to do";
-constexpr const char* kDiskTime = "how long a disk takes";
-constexpr const char* kTraffic = "how much goes over the network";
-constexpr const char* kLinkFaults = "a bad cable, driver or radio link";
 
 constexpr LinuxFigure kFigures[] = {
-    {"/proc/sys/kernel/random/boot_id",
-     "1",
-     "linux.time.boots",
-     "count",
-     FigureKind::Boots,
-     1,
-     0,
-     1,
-     "starts of the system",
-     {}},
+    {"/proc/sys/kernel/random/boot_id", "1", "linux.time.boots", "count", FigureKind::Boots, 1, 0,
+     1, "starts of the system"},
     counter("/proc/uptime", "1", "linux.time.upSeconds", "s", 1, "time since the start"),
-    counter("clock", "awake", "linux.time.awakeSeconds", "s", 1, "time in use"),
-    counter("clock", "asleep", "linux.time.asleepSeconds", "s", 1, "time suspended"),
+    counter("clock", "awake 1", "linux.time.awakeSeconds", "s", 1, "time in use"),
+    counter("clock", "asleep 1", "linux.time.asleepSeconds", "s", 1, "time suspended"),
     counter("/sys/power/suspend_stats/success", "1", "linux.time.suspends", "count", 1,
             "how often it goes to sleep"),
     counter("/sys/power/suspend_stats/fail", "1", "linux.time.failedSuspends", "count", 1,
             "drivers that keep it awake"),
     // Bit 5: the watchdog caused the last start.
-    {"/sys/class/watchdog/<watchdog>/bootstatus",
-     "1",
-     "linux.time.watchdogResets",
-     "count",
-     FigureKind::Counter,
-     32,
-     0,
-     1,
-     "starts after the machine hung, which were no clean shutdown",
-     {}},
+    {"/sys/class/watchdog/<watchdog>/bootstatus", "1", "linux.time.watchdogResets", "count",
+     FigureKind::Counter, 32, 0, 1, "starts after the machine hung, which were no clean shutdown"},
 
     // Not the time waiting for disks, which the kernel lets run backwards.
-    counter(kStat, "cpu 1", "linux.cpu.userSeconds", "s", 100, kBusy),
-    counter(kStat, "cpu 2", "linux.cpu.niceSeconds", "s", 100, kBusy),
-    counter(kStat, "cpu 3", "linux.cpu.systemSeconds", "s", 100, kBusy),
-    counter(kStat, "cpu 4", "linux.cpu.idleSeconds", "s", 100, kBusy),
-    counter(kStat, "cpu 6", "linux.cpu.interruptSeconds", "s", 100, kBusy),
-    counter(kStat, "cpu 7", "linux.cpu.softInterruptSeconds", "s", 100, kBusy),
+    counter(kStat, "cpu 1", "linux.cpu.userSeconds", "s", 100, "work of programs"),
+    counter(kStat, "cpu 2", "linux.cpu.niceSeconds", "s", 100,
+            "work of programs that give way to others"),
+    counter(kStat, "cpu 3", "linux.cpu.systemSeconds", "s", 100, "work of the kernel for programs"),
+    counter(kStat, "cpu 4", "linux.cpu.idleSeconds", "s", 100, "what the processors have left"),
+    counter(kStat, "cpu 6", "linux.cpu.interruptSeconds", "s", 100, "work for devices"),
+    counter(kStat, "cpu 7", "linux.cpu.softInterruptSeconds", "s", 100,
+            "work for devices that could wait, the network most of all"),
     counter(kStat, "cpu 8", "linux.cpu.stolenSeconds", "s", 100, "time that the host took away"),
     counter(kStat, "ctxt 1", "linux.cpu.contextSwitches", "count", 1, "how much runs at once"),
     counter(kStat, "processes 1", "linux.cpu.forks", "count", 1, "how much is started"),
@@ -113,39 +93,39 @@ constexpr LinuxFigure kFigures[] = {
             "linux.memory.uncorrectedErrors", "count", 1, "memory that is bad"),
 
     counter("/proc/pressure/cpu", "some total=", "linux.pressure.cpuSomeMilliseconds", "ms", 1000,
-            kStalled),
+            "work that waited for a processor"),
     counter("/proc/pressure/memory", "some total=", "linux.pressure.memorySomeMilliseconds", "ms",
-            1000, kStalled),
+            1000, "work that waited for memory"),
     counter("/proc/pressure/memory", "full total=", "linux.pressure.memoryFullMilliseconds", "ms",
-            1000, kStalled),
+            1000, "time in which all work waited for memory"),
     counter("/proc/pressure/io", "some total=", "linux.pressure.ioSomeMilliseconds", "ms", 1000,
-            kStalled),
+            "work that waited for a disk"),
     counter("/proc/pressure/io", "full total=", "linux.pressure.ioFullMilliseconds", "ms", 1000,
-            kStalled),
+            "time in which all work waited for a disk"),
 
     // Sectors are of 512 bytes, whatever the disk's own are.
-    counter(kDisk, "1", "linux.disk.reads.", "count", 1, kDiskWork),
-    counter(kDisk, "3", "linux.disk.readKiB.", "KiB", 2, kDiskWork),
-    counter(kDisk, "4", "linux.disk.readMilliseconds.", "ms", 1, kDiskTime),
-    counter(kDisk, "5", "linux.disk.writes.", "count", 1, kDiskWork),
+    counter(kDisk, "1", "linux.disk.reads.", "count", 1, "how often a disk is read"),
+    counter(kDisk, "3", "linux.disk.readKiB.", "KiB", 2, "how much is read"),
+    counter(kDisk, "4", "linux.disk.readMilliseconds.", "ms", 1, "how long reads take"),
+    counter(kDisk, "5", "linux.disk.writes.", "count", 1, "how often a disk is written"),
     counter(kDisk, "7", "linux.disk.writtenKiB.", "KiB", 2, "how fast a disk wears"),
-    counter(kDisk, "8", "linux.disk.writeMilliseconds.", "ms", 1, kDiskTime),
-    counter(kDisk, "10", "linux.disk.busyMilliseconds.", "ms", 1, kDiskTime),
+    counter(kDisk, "8", "linux.disk.writeMilliseconds.", "ms", 1, "how long writes take"),
+    counter(kDisk, "10", "linux.disk.busyMilliseconds.", "ms", 1, "how much a disk has left"),
 
     counter("/sys/class/net/<interface>/statistics/rx_bytes", "1", "linux.network.receivedKiB.",
-            "KiB", 1024, kTraffic),
+            "KiB", 1024, "how much comes over the network"),
     counter("/sys/class/net/<interface>/statistics/tx_bytes", "1", "linux.network.sentKiB.", "KiB",
-            1024, kTraffic),
+            1024, "how much goes over the network"),
     counter("/sys/class/net/<interface>/statistics/rx_packets", "1",
-            "linux.network.receivedPackets.", "count", 1, kTraffic),
+            "linux.network.receivedPackets.", "count", 1, "in how many pieces it comes"),
     counter("/sys/class/net/<interface>/statistics/tx_packets", "1", "linux.network.sentPackets.",
-            "count", 1, kTraffic),
+            "count", 1, "in how many pieces it goes"),
     counter("/sys/class/net/<interface>/statistics/rx_errors", "1", "linux.network.receiveErrors.",
-            "count", 1, kLinkFaults),
+            "count", 1, "a bad cable, driver or radio link"),
     counter("/sys/class/net/<interface>/statistics/tx_errors", "1", "linux.network.sendErrors.",
-            "count", 1, kLinkFaults),
+            "count", 1, "a bad driver or device"),
     counter("/sys/class/net/<interface>/carrier_down_count", "1", "linux.network.linkLosses.",
-            "count", 1, kLinkFaults),
+            "count", 1, "a cable or radio link that comes and goes"),
 
     temperature("/sys/class/thermal/<zone>/temp", "linux.temperature.zoneCelsius.",
                 "parts that run hot"),
@@ -155,18 +135,18 @@ constexpr LinuxFigure kFigures[] = {
     usedLife("/sys/block/<card>/device/life_time", "1", "linux.emmc.usedLifeATenths",
              "wear of the storage"),
     usedLife("/sys/block/<card>/device/life_time", "2", "linux.emmc.usedLifeBTenths",
-             "wear of the storage"),
+             "wear of its other cells"),
     endOfLife("/sys/block/<card>/device/pre_eol_info", "linux.emmc.endOfLifeLevel"),
     usedLife("/sys/bus/platform/devices/<ufs>/health_descriptor/life_time_estimation_a", "1",
              "linux.ufs.usedLifeATenths", "wear of the storage"),
     usedLife("/sys/bus/platform/devices/<ufs>/health_descriptor/life_time_estimation_b", "1",
-             "linux.ufs.usedLifeBTenths", "wear of the storage"),
+             "linux.ufs.usedLifeBTenths", "wear of its other cells"),
     endOfLife("/sys/bus/platform/devices/<ufs>/health_descriptor/eol_info",
               "linux.ufs.endOfLifeLevel"),
     counter("/sys/class/nvme/<nvme>/device/aer_dev_correctable", "TOTAL_ERR_COR 1",
             "linux.nvme.correctedErrors", "count", 1, "a bad link to the storage"),
     counter("/sys/class/nvme/<nvme>/device/aer_dev_nonfatal", "TOTAL_ERR_NONFATAL 1",
-            "linux.nvme.nonfatalErrors", "count", 1, "a bad link to the storage"),
+            "linux.nvme.nonfatalErrors", "count", 1, "transfers that were lost"),
     counter("/sys/class/nvme/<nvme>/device/aer_dev_fatal", "TOTAL_ERR_FATAL 1",
             "linux.nvme.fatalErrors", "count", 1, "storage that was lost and reset"),
 };

@@ -27,8 +27,8 @@ struct LinuxFigure {
   std::int64_t divisor;  ///< the file's number over this is in the unit; what is left is cut
   std::int64_t lowest;   ///< in the unit; what lies outside means something else than a figure
   std::int64_t highest;
-  std::string_view why;                  ///< what it is good for
-  std::span<const std::int32_t> bounds;  ///< of the histogram of a gauge
+  std::string_view why;                    ///< what it is good for
+  std::span<const std::int32_t> bounds{};  ///< of the histogram of a gauge
 };
 
 /// The devices that stand in a path for a name such as "<disk>".
