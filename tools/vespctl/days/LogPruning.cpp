@@ -140,34 +140,38 @@ void LogPruning::remove(const std::vector<Log>& logs) {
     unlinkFiles(*log);
   }
   numbers.remember(*newest, false, error);
+  std::ranges::stable_sort(_removed, {}, [](const std::string& name) { return *logNumber(name); });
 }
 
 /// Removes the logs that need no note, which on a full disk makes room for notes, and gives the
 /// others when their notes are durable. Throws `CommandFailure`.
 std::vector<const LogPruning::Log*> LogPruning::noteDailyLogs(const std::vector<Log>& logs) {
-  const auto isNamedDaily = [](const Log& log) { return isDailyLogName(log.files.front()); };
-  std::map<std::string, SubmittedLog> daily;
-  std::map<std::string, std::string> unread;
-  if (std::ranges::any_of(logs, isNamedDaily)) {
-    const auto unreadable = forEachSubmittedLog(_directory, [&daily](SubmittedLog&& log) {
-      log.document = {};
-      daily.emplace(log.name, std::move(log));
-    });
-    for (const UnreadableLog& log : unreadable) {
-      if (!log.wasRead) {
-        unread.emplace(log.name, log.why);
-      }
-    }
-  }
-  std::vector<const Log*> due;
+  std::vector<const Log*> named;
   for (const Log& log : logs) {
-    const std::string& name = log.files.front();
-    if (unread.contains(name)) {  // most likely a daily log
-      _problems.push_back(unread[name]);
-    } else if (daily.contains(name)) {
-      due.push_back(&log);
+    if (isDailyLogName(log.files.front())) {
+      named.push_back(&log);
     } else {
       unlinkFiles(log);
+    }
+  }
+  if (named.empty()) {
+    return {};
+  }
+  std::map<std::string, SubmittedLog> daily;
+  const auto unreadable = forEachSubmittedLog(_directory, [&daily](SubmittedLog&& log) {
+    log.document = {};
+    daily.emplace(log.name, std::move(log));
+  });
+  std::vector<const Log*> due;
+  for (const Log* const log : named) {
+    const std::string& name = log->files.front();
+    const auto fault = std::ranges::find(unreadable, name, &UnreadableLog::name);
+    if (daily.contains(name)) {
+      due.push_back(log);
+    } else if (fault == unreadable.end() || fault->wasRead) {
+      unlinkFiles(*log);
+    } else {  // most likely a daily log
+      _problems.push_back(fault->why);
     }
   }
   JsonLines notes(_directory.hostPath(kPrunedLogsFile));
