@@ -1,0 +1,26 @@
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "common/Date.h"
+#include "page/PageData.h"
+
+namespace vesprun {
+
+/// A key of the counter database that the whitelist keeps back.
+struct KeptBack {
+  bool isDistribution;
+  std::string key;
+};
+
+/// The whole HTML document. It needs nothing but itself: no file, no network, no script.
+///
+/// `device` is a name for people, `now` the device's time.
+std::string pageText(const std::string& device, const Date& now, const PageData& data,
+                     const std::vector<KeptBack>& keptBack);
+
+/// The style sheet, from page.css.
+std::string_view pageStyle();
+
+}  // namespace vesprun

@@ -1,0 +1,66 @@
+#include <sys/stat.h>
+
+#include <cstdio>
+#include <filesystem>
+#include <iostream>
+#include <system_error>
+
+#include "Command.h"
+#include "page/Page.h"
+#include "platform/host/documents/QuotedText.h"
+#include "platform/host/files/AtomicFile.h"
+
+namespace vesprun {
+namespace {
+
+/// Writes the file whole or not at all. What a link leads to is replaced, not the link.
+void writePage(const std::string& file, const std::string& page) {
+  std::error_code failure;
+  std::filesystem::path path(file);
+  if (std::filesystem::exists(path, failure)) {
+    if (!std::filesystem::is_regular_file(path, failure)) {
+      throw CommandFailure(file + ": not a regular file");
+    }
+    path = std::filesystem::canonical(path, failure);
+  }
+  if (failure) {
+    throw CommandFailure(file + ": " + failure.message());
+  }
+  std::string error;
+  if (!replaceFile(path.string(), page, error)) {
+    throw CommandFailure(error);
+  }
+}
+
+void makePage(const std::string& directory, const std::string& file) {
+  const auto device = openDevice(directory);
+  const PageData data(device->directory());
+  for (const std::vector<UnreadableLog>* list : {&data.submitted.unreadable, &data.unreadable}) {
+    for (const auto& [name, why] : *list) {
+      std::fprintf(stderr, "vespctl: %s: %s\n", printableText(name).c_str(),
+                   printableText(why).c_str());
+    }
+  }
+  std::error_code ignored;
+  const auto absolute = std::filesystem::canonical(device->directory().path(), ignored);
+  const std::string page = pageText(absolute.filename().string(), device->clock().now(), data, {});
+  if (file.empty() || file == "-") {
+    std::cout << page;
+  } else {
+    writePage(file, page);
+  }
+}
+
+}  // namespace
+
+void addPageCommand(CLI::App& vespctl) {
+  const auto directory = std::make_shared<std::string>();
+  const auto file = std::make_shared<std::string>();
+  CLI::App* command =
+      vespctl.add_subcommand("page", "Writes one HTML page of all that the device reported");
+  command->add_option("DIR", *directory, "The device directory")->required();
+  command->add_option("FILE", *file, "Where to write it, instead of standard output");
+  command->callback([directory, file] { makePage(*directory, *file); });
+}
+
+}  // namespace vesprun
