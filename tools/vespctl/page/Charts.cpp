@@ -10,7 +10,7 @@ namespace {
 
 // Coordinates are whole numbers on this grid, which keeps a page of many lines small.
 constexpr double kWidth = 300;
-constexpr double kHeight = 60;
+constexpr double kHeight = 99;
 constexpr double kMargin = 5;
 
 /// Maps one range onto another; the middle when the range is a single value.
@@ -37,7 +37,7 @@ std::string place(std::int64_t x, std::int64_t y) {
 std::string picture(const char* kind, const std::string& label, const std::string& content) {
   std::string text = "<svg class=";
   text += kind;
-  return text + " viewBox=\"0 0 300 60\" preserveAspectRatio=none role=img aria-label=\"" + label +
+  return text + " viewBox=\"0 0 300 99\" preserveAspectRatio=none role=img aria-label=\"" + label +
          "\">" + content + "</svg>";
 }
 
@@ -101,7 +101,7 @@ std::string sparkline(const std::vector<Point>& all, double longestStep, const s
       points.begin(), points.end(),
       [](const Point& left, const Point& right) { return left.value < right.value; });
   const Scale across(all.front().day, all.back().day, kMargin, kWidth - kMargin);
-  const Scale up(low->value, high->value, kHeight - 2 * kMargin, 2 * kMargin);
+  const Scale up(low->value, high->value, kHeight - 3 * kMargin, 3 * kMargin);
   std::string steps;
   for (const auto& [from, to] : runsOf(points, longestStep)) {
     steps += lineThrough(points, from, to, across, up);
@@ -162,10 +162,10 @@ std::string bandChart(const std::vector<BandPoint>& points, const std::string& l
 
 std::string bar(double length, double mark) {
   const Scale across(0, 1, 0, kWidth);
-  return "<svg class=b viewBox=\"0 0 300 60\" preserveAspectRatio=none aria-hidden=true><rect "
+  return "<svg class=b viewBox=\"0 0 300 99\" preserveAspectRatio=none aria-hidden=true><rect "
          "width=\"" +
-         std::to_string(across(length)) + "\" height=60 />" +
-         (mark > 0 ? path("t", "M" + place(across(mark), 0) + "v60") : "") + "</svg>";
+         std::to_string(across(length)) + "\" height=99/>" +
+         (mark > 0 ? path("t", "M" + place(across(mark), 0) + "v99") : "") + "</svg>";
 }
 
 std::string dayStrip(const std::vector<double>& days, const std::string& label) {
@@ -181,10 +181,10 @@ std::string dayStrip(const std::vector<double>& days, const std::string& label) 
     const std::int64_t start = across(day);
     if (start > end) {
       end = std::max(start + 1, across(day + cell));
-      steps += "M" + place(start, 0) + 'H' + std::to_string(end) + "V60H" + std::to_string(start);
+      steps += "M" + place(start, 0) + 'H' + std::to_string(end) + "V99H" + std::to_string(start);
     }
   }
-  return "<svg class=s viewBox=\"0 0 3000 60\" preserveAspectRatio=none role=img aria-label=\"" +
+  return "<svg class=s viewBox=\"0 0 3000 99\" preserveAspectRatio=none role=img aria-label=\"" +
          label + "\"><path d=\"" + steps + "\"/></svg>";
 }
 

@@ -157,7 +157,7 @@ class PageWriter {
       html +=
           fold(counted(count - kShownReports, "earlier report"), tableHead + older + "</table>");
     }
-    html += "<p>" + counted(digests.size(), "whitelist") + ":</p><ul>";
+    html += "<p>Digests of the whitelist:</p><ul>";
     for (const auto& [digest, times] : digests) {
       html += "<li>" + foldedName(digest, "") + " <small>" + counted(times, "report") + "</small>";
     }
@@ -227,11 +227,18 @@ class PageWriter {
       return section("storage", "Storage", "<p>No figure of the storage has been submitted.</p>");
     }
     const auto level = static_cast<int>(worst());
-    std::string html = std::string("<p class=\"verdict ") + kClasses[level] + "\">" +
-                       kVerdicts[level] + "</p>\n<ul class=health>\n";
+    double newest = 0;
     for (const HealthStatement& statement : _health) {
+      newest = std::max(newest, std::floor(statement.day));
+    }
+    std::string html = std::string("<p class=\"verdict ") + kClasses[level] + "\">" +
+                       kVerdicts[level] + " <small>Figures of " + momentText(newest) +
+                       "</small></p>\n<ul class=health>\n";
+    for (const HealthStatement& statement : _health) {
+      const double day = std::floor(statement.day);
       html += std::string("<li class=") + kClasses[static_cast<int>(statement.level)] + '>' +
-              statement.text + " <small>" + momentText(std::floor(statement.day)) + "</small>\n";
+              statement.text + (day < newest ? " <small>" + momentText(day) + "</small>" : "") +
+              '\n';
     }
     return section("storage", "Storage", html + "</ul>\n");
   }
@@ -271,7 +278,7 @@ class PageWriter {
 
   static std::string seriesTable(const char* count, const std::string& rows) {
     return std::string(
-               "<table class=series><thead><tr><th>Key<th>Course<th>Newest<th>Lowest<th>"
+               "<table class=series><thead><tr><th>Key<th>Over the days<th>Newest<th>Lowest<th>"
                "Highest<th>") +
            count + "</thead>" + rows + "</table>";
   }
