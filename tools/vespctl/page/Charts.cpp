@@ -90,7 +90,8 @@ double valueItself(double value) { return value; }
 
 }  // namespace
 
-std::string sparkline(const std::vector<Point>& all, double longestStep, const std::string& label) {
+std::string sparkline(const std::vector<Point>& all, Period period, double longestStep,
+                      const std::string& label) {
   std::vector<Point> points;
   std::copy_if(all.begin(), all.end(), std::back_inserter(points),
                [](const Point& point) { return std::isfinite(point.value); });
@@ -100,7 +101,7 @@ std::string sparkline(const std::vector<Point>& all, double longestStep, const s
   const auto [low, high] = std::minmax_element(
       points.begin(), points.end(),
       [](const Point& left, const Point& right) { return left.value < right.value; });
-  const Scale across(all.front().day, all.back().day, kMargin, kWidth - kMargin);
+  const Scale across(period.first, period.last, kMargin, kWidth - kMargin);
   const Scale up(low->value, high->value, kHeight - 3 * kMargin, 3 * kMargin);
   std::string steps;
   for (const auto& [from, to] : runsOf(points, longestStep)) {
@@ -121,7 +122,8 @@ bool isLogarithmic(const std::vector<BandPoint>& points) {
   return low > 0 && high / low >= kLeastRatio;
 }
 
-std::string bandChart(const std::vector<BandPoint>& points, const std::string& label) {
+std::string bandChart(const std::vector<BandPoint>& points, Period period,
+                      const std::string& label) {
   if (points.empty()) {
     return "";
   }
@@ -132,7 +134,7 @@ std::string bandChart(const std::vector<BandPoint>& points, const std::string& l
     low = std::min(low, shown(point.low));
     high = std::max(high, shown(point.high));
   }
-  const Scale across(points.front().day, points.back().day, kMargin, kWidth - kMargin);
+  const Scale across(period.first, period.last, kMargin, kWidth - kMargin);
   const Scale up(low, high, kHeight - 1, 1);
   std::string area;
   std::string line;

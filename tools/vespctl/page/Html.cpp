@@ -100,7 +100,7 @@ std::string htmlText(std::string_view text) {
     const char32_t value = decoded(character);
     const bool isByte = length == 0 && value > 0x7F;
     if (isByte || isUnseen(value)) {
-      std::snprintf(escape, sizeof escape, isByte ? "\\x%02X" : "\\u{%X}",
+      std::snprintf(escape, sizeof escape, isByte ? "\\x%02x" : "\\u{%X}",
                     static_cast<unsigned>(value));
       html += escape;
     } else {

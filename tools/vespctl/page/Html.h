@@ -10,7 +10,7 @@
 namespace vesprun {
 
 /// Somebody's text between tags or in a quoted attribute: it can neither end there nor begin a tag.
-/// A byte that is not UTF-8 becomes "\xNN", and a character that is invisible or changes the
+/// A byte that is not UTF-8 becomes "\xnn", and a character that is invisible or changes the
 /// direction of others "\u{N}".
 std::string htmlText(std::string_view text);
 

@@ -82,8 +82,8 @@ class PageWriter {
              const std::vector<KeptBack>& keptBack)
       : _device(device), _now(now), _data(data), _keptBack(keptBack), _health(storageHealth(data)) {
     if (!data.days.empty()) {
-      _firstDay = data.days.begin()->first;
-      _lastDay = data.days.rbegin()->first;
+      _period = {static_cast<double>(data.days.begin()->first),
+                 static_cast<double>(data.days.rbegin()->first)};
     }
   }
 
@@ -107,9 +107,10 @@ class PageWriter {
 
   std::string overview() const {
     const std::string period =
-        _data.days.empty() ? "Nothing has been reported yet."
-                           : "Reports of " + dayText(_firstDay) +
-                                 (_firstDay == _lastDay ? "" : " to " + dayText(_lastDay)) + ".";
+        _data.days.empty()
+            ? "Nothing has been reported yet."
+            : "Reports of " + momentText(_period.first) +
+                  (_period.first == _period.last ? "" : " to " + momentText(_period.last)) + ".";
     std::string html = "<header><p>Device reports</p><h1>" + htmlName(_device) + "</h1><p>" +
                        period + " Page made " + minuteText(_now) + " UTC.</p></header>\n<nav>";
     const auto add = [&html](const char* anchor, const std::string& number, const char* what) {
@@ -137,8 +138,8 @@ class PageWriter {
     for (const auto& [day, log] : _data.days) {
       days.push_back(day);
     }
-    const std::string first = dayText(_firstDay);
-    const std::string last = dayText(_lastDay);
+    const std::string first = momentText(_period.first);
+    const std::string last = momentText(_period.last);
     html += dayStrip(days, "days with a report from " + first + " to " + last) +
             "<p class=ends><span>" + first + "</span><span>" + last + "</span></p>" + missingDays();
     std::string newest;
@@ -179,7 +180,7 @@ class PageWriter {
   std::string missingDays() const {
     std::string gaps;
     std::size_t count = 0;
-    std::int64_t before = _firstDay;
+    std::int64_t before = _data.days.begin()->first;
     for (const auto& [day, log] : _data.days) {
       if (day - before > 1 && ++count <= kMostGaps) {
         const std::string from = dayText(static_cast<std::int32_t>(before + 1));
@@ -254,7 +255,7 @@ class PageWriter {
   }
 
   /// A row with the line of a number over the days.
-  static std::string seriesRow(std::string_view key, const PageData::Series& series,
+  static std::string seriesRow(std::string_view key, const PageData::Series& series, Period period,
                                double longestStep) {
     std::vector<Point> points;
     points.reserve(series.size());
@@ -269,7 +270,7 @@ class PageWriter {
     const std::string highest = figure(*high);
     const std::string newest = figure(series.back().value);
     return "<tr><td>" + foldedName(key, valueList(series)) + "<td>" +
-           sparkline(points, longestStep,
+           sparkline(points, period, longestStep,
                      counted(series.size(), "value") + " from " + lowest + " to " + highest +
                          ", the newest " + newest) +
            "<td>" + newest + "<td>" + lowest + "<td>" + highest + "<td>" + figure(series.size()) +
@@ -288,7 +289,7 @@ class PageWriter {
     const auto rows = [&](const std::vector<std::size_t>& places) {
       std::string html;
       for (const std::size_t place : places) {
-        html += seriesRow(keys[place], _data.scalars.find(keys[place])->second, 1);
+        html += seriesRow(keys[place], _data.scalars.find(keys[place])->second, _period, 1);
       }
       return seriesTable("Days", html);
     };
@@ -316,8 +317,8 @@ class PageWriter {
     return count > 0 ? std::sqrt(day.squaredDeviations / count) : 0;
   }
 
-  static std::string distribution(std::string_view key,
-                                  const std::vector<PageData::DistributionDay>& days) {
+  std::string distribution(std::string_view key,
+                           const std::vector<PageData::DistributionDay>& days) const {
     const PageData::DistributionDay& newest = days.back();
     std::string rows;
     std::vector<BandPoint> points;
@@ -344,7 +345,7 @@ class PageWriter {
   }
 
   /// Lowest, mean and highest value of each day.
-  static std::string course(const std::vector<BandPoint>& points) {
+  std::string course(const std::vector<BandPoint>& points) const {
     if (points.empty()) {
       return "";
     }
@@ -358,9 +359,9 @@ class PageWriter {
     return "<figure><figcaption>Lowest, mean and highest of each day" +
            std::string(isLogarithmic(points) ? ", logarithmic" : "") +
            "</figcaption><p class=ends>" + figure(high) + "</p>" +
-           bandChart(points, counted(points.size(), "day") + " with values from " + ends) +
+           bandChart(points, _period, counted(points.size(), "day") + " with values from " + ends) +
            "<p class=ends>" + figure(low) + "</p><p class=\"ends dates\"><span>" +
-           momentText(points.front().day) + "</span><span>" + momentText(points.back().day) +
+           momentText(_period.first) + "</span><span>" + momentText(_period.last) +
            "</span></p></figure>";
   }
 
@@ -476,7 +477,7 @@ class PageWriter {
         ++zeroCount;
         zeros += (zeros.empty() ? "" : ", ") + htmlName(field);
       } else {
-        rows += seriesRow(field, series, HUGE_VAL);
+        rows += seriesRow(field, series, {events.front().day, events.back().day}, HUGE_VAL);
       }
     }
     return (rows.empty() ? "" : seriesTable("Events", rows)) +
@@ -520,9 +521,9 @@ class PageWriter {
       }
     }
     const char* const explanation =
-        html.empty() ? "<p>The whitelist lets every key of the counter database through.</p>"
-                     : "<p>These keys are in the counter database, and the whitelist keeps them on "
-                       "the device. Their values are not on this page.</p>";
+        html.empty() ? "<p>Every key of the counter database may leave the device.</p>"
+                     : "<p>These keys are in the counter database and do not leave the device. "
+                       "Their values are not on this page.</p>";
     return section("left-out", "Kept back", explanation + html);
   }
 
@@ -531,8 +532,7 @@ class PageWriter {
   const PageData& _data;
   const std::vector<KeptBack>& _keptBack;
   std::vector<HealthStatement> _health;
-  std::int32_t _firstDay = 0;
-  std::int32_t _lastDay = 0;
+  Period _period{0, 0};  ///< from the first to the last day with a report
 };
 
 }  // namespace

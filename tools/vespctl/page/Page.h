@@ -4,15 +4,10 @@
 #include <vector>
 
 #include "common/Date.h"
+#include "page/KeptBack.h"
 #include "page/PageData.h"
 
 namespace vesprun {
-
-/// A key of the counter database that the whitelist keeps back.
-struct KeptBack {
-  bool isDistribution;
-  std::string key;
-};
 
 /// The whole HTML document. It needs nothing but itself: no file, no network, no script.
 ///

@@ -43,7 +43,8 @@ void makePage(const std::string& directory, const std::string& file) {
   }
   std::error_code ignored;
   const auto absolute = std::filesystem::canonical(device->directory().path(), ignored);
-  const std::string page = pageText(absolute.filename().string(), device->clock().now(), data, {});
+  const std::string page =
+      pageText(absolute.filename().string(), device->clock().now(), data, keysKeptBack(*device));
   if (file.empty() || file == "-") {
     std::cout << page;
   } else {

@@ -175,9 +175,8 @@ void addUse(Statements& statements) {
     const double share = full->value / kBasisPoints;
     const auto capacity = statements.find({"HLT_OR_Capacity_GB"});
     statements.add(share >= kFullnessToLookAt ? Level::Look : Level::Plain,
-                   "The storage" +
-                       (capacity ? " of " + figure(capacity->value) + "\u202FGB" : "") + " is " +
-                       percent(std::round(share)) + " full.",
+                   "The storage" + (capacity ? " of " + figure(capacity->value) + "\u202FGB" : "") +
+                       " is " + percent(std::round(share)) + " full.",
                    full->day);
   }
   if (const auto amplification = statements.find({"UserWamp"})) {
