@@ -166,7 +166,7 @@ std::string bar(double length, double mark) {
   const Scale across(0, 1, 0, kWidth);
   return "<svg class=b viewBox=\"0 0 300 99\" preserveAspectRatio=none aria-hidden=true><rect "
          "width=\"" +
-         std::to_string(across(length)) + "\" height=99/>" +
+         std::to_string(across(length)) + "\" height=\"99\"/>" +
          (mark > 0 ? path("t", "M" + place(across(mark), 0) + "v99") : "") + "</svg>";
 }
 
