@@ -83,9 +83,12 @@ TEST_F(PageTest, ShowsTheCourseOfEachKeyOverTheDays) {
         "1970-01-05: <b>1</b> values from <b>500</b> to <b>500</b>",
         "<tr><td>1970-01-02<td>2<td>5<td>27.5<td>50<td>22.5\n", ", logarithmic</figcaption>",
         // Empty on the newest day, but not on the others.
-        "<bdi>(-inf, 10]</bdi><td>", "<rect width=\"300\" height=\"99\"/><path class=t "}) {
+        "(-inf, 10]</bdi>", "(10, 100]</bdi>", "(100, inf)</bdi>",
+        "<rect width=\"300\" height=\"99\"/><path class=t "}) {
     EXPECT_THAT(output, HasSubstr(shown));
   }
+  EXPECT_LT(output.find("(-inf, 10]</bdi>"), output.find("(10, 100]</bdi>"));
+  EXPECT_LT(output.find("(10, 100]</bdi>"), output.find("(100, inf)</bdi>"));
   const std::size_t keptBack = output.find("<section id=left-out>");
   EXPECT_THAT(output.substr(keptBack),
               AllOf(HasSubstr("<h3>3 scalars</h3>"), HasSubstr("<h3>1 distribution</h3>"),
@@ -101,13 +104,16 @@ TEST_F(PageTest, SaysHowTheStorageIs) {
   writeLog("9999-165-StorageStatus.log", "1970-01-02", "UserWamp:9;com.quill.NANDInfo.numPfail:7");
   writeLog("10000-165-StorageStatus.log", "1970-01-03",
            "UserWamp:2.5;com.quill.NANDInfo.numGrownBad:0;com.quill.NANDInfo.numPfail:1;"
-           "com.quill.NANDInfo.UserPartitionPEPercentUsed:79;com.quill.NANDInfo.numEfail:-1");
+           "com.quill.NANDInfo.UserPartitionPEPercentUsed:60;com.quill.NANDInfo.numEfail:-1");
   const std::string event =
       "{\"time\":\"1970-01-04T00:00:00Z\",\"event\":"
       "\"com.quill.massStorage.NANDInfo.";
-  folder.write("device/outbox/events.jsonl",
-               event + "FTLCounters_1\",\"payload\":{\"numGrownBad\":3,\"hostWrites\":1000}}\n" +
-                   event + "SM.Daily.FTLCounters_1\",\"payload\":{\"hostWrites\":25.0}}\n");
+  folder.write(
+      "device/outbox/events.jsonl",
+      event + R"(FTLCounters_1","payload":{"hostWrites":500,"zero":0}})" + '\n' + event +
+          R"(FTLCounters_1","payload":{"numGrownBad":3,"hostWrites":1000,"percentUsed":79,)" +
+          R"("zero":0}})" + '\n' + event +
+          R"(SM.Daily.FTLCounters_1","payload":{"hostWrites":25.0}})" + '\n');
   EXPECT_THAT(page(), AllOf(HasSubstr("<b>look at</b> storage"),
                             HasSubstr("class=\"verdict look\">Some figures deserve a look."),
                             HasSubstr("<li class=look>3 blocks went bad in use."),
@@ -115,6 +121,9 @@ TEST_F(PageTest, SaysHowTheStorageIs) {
                             HasSubstr("<li class=good>79\u202F% of the rated erase cycles"),
                             HasSubstr("user partition is 2.5. <small>1970-01-03</small>"),
                             HasSubstr("last day is 2.5\u202F% of all"),
+                            HasSubstr("2 values from 500 to 1\u202F000"),
+                            HasSubstr("1 field always 0</summary><p class=names><bdi>zero</bdi>"),
+
                             Not(HasSubstr("erase operation")), HasSubstr("<bdi>log 165-Storage")));
   folder.write("device/outbox/events.jsonl",
                event +
@@ -160,8 +169,9 @@ TEST_F(PageTest, NoTextOfOthersBecomesMarkup) {
   const std::string html = page();
   EXPECT_THAT(html, AllOf(HasSubstr("s.&lt;script&gt;alert(1)&lt;/script&gt;</bdi>"),
                           HasSubstr("<bdi>d.&quot;&gt;&lt;img"), HasSubstr("<bdi>s.\\u{202E}cod"),
-                          HasSubstr("s.&amp;lt;b&amp;gt;"), HasSubstr("<bdi>s.שלום</bdi>"),
-                          HasSubstr("\\u{0}\\u{1B}"), HasSubstr("\\u{E0041}"),
+                          HasSubstr("s.&amp;lt;b&amp;gt;"), HasSubstr("&#39; onclick=&#39;"),
+                          HasSubstr("<bdi>s.שלום</bdi>"), HasSubstr("\\u{0}\\u{1B}"),
+                          HasSubstr("\\u{E0041}"),
                           HasSubstr(std::string(5000, 'k') + "&lt;i&gt;</bdi></p>"),
                           HasSubstr("5\u202F003 bytes"),
                           HasSubstr("default-src 'none'; style-src 'unsafe-inline'")));

@@ -1,6 +1,7 @@
 #include "page/Page.h"
 
 #include <algorithm>
+#include <charconv>
 #include <cmath>
 #include <set>
 
@@ -371,43 +372,40 @@ class PageWriter {
     double all = 0;     ///< on all days together
   };
 
-  /// The buckets of all days. An empty bucket is in no histogram, so each day may know others; a
-  /// new one comes behind the one that it follows on its day.
+  /// The lower boundary in a label "(1, 10]", by which buckets are ordered.
+  static double lowerBoundary(std::string_view label) {
+    double boundary = HUGE_VAL;
+    if (label.starts_with('(')) {
+      std::from_chars(label.data() + 1, label.data() + label.size(), boundary);
+    }
+    return std::isnan(boundary) ? HUGE_VAL : boundary;
+  }
+
+  /// The buckets of all days. An empty bucket is in no histogram, so each day may know others.
   static std::vector<Bucket> bucketsOf(const std::vector<PageData::DistributionDay>& days,
                                        std::int32_t& newestDay) {
     std::vector<Bucket> buckets;
+    std::map<std::string_view, std::size_t> known;
     bool isNewest = true;
     for (auto day = days.rbegin(); day != days.rend(); ++day) {
       if (day->histogram == nullptr) {
         continue;
       }
-      std::map<std::string_view, std::size_t> known;
-      for (std::size_t i = 0; i < buckets.size(); ++i) {
-        known[buckets[i].label] = i;
-      }
-      std::vector<Bucket> merged;
-      std::vector<std::vector<Bucket>> behind(buckets.size() + 1);
-      std::size_t last = 0;
       for (const auto& [label, value] : *day->histogram) {
         const double count = std::max(value.number()->asDouble(), 0.0);
-        const auto found = known.find(label);
-        if (found == known.end()) {
-          behind[last].push_back({label, isNewest ? count : 0, count});
-        } else {
-          buckets[found->second].all += count;
-          last = found->second + 1;
+        const auto [place, isNew] = known.try_emplace(label, buckets.size());
+        if (isNew) {
+          buckets.push_back({label, 0, 0});
         }
+        buckets[place->second].newest += isNewest ? count : 0;
+        buckets[place->second].all += count;
       }
-      for (std::size_t i = 0; i < behind.size(); ++i) {
-        if (i > 0) {
-          merged.push_back(buckets[i - 1]);
-        }
-        merged.insert(merged.end(), behind[i].begin(), behind[i].end());
-      }
-      buckets = std::move(merged);
       newestDay = isNewest ? day->day : newestDay;
       isNewest = false;
     }
+    std::stable_sort(buckets.begin(), buckets.end(), [](const Bucket& left, const Bucket& right) {
+      return lowerBoundary(left.label) < lowerBoundary(right.label);
+    });
     return buckets;
   }
 
