@@ -80,6 +80,7 @@ TEST_F(PageTest, ShowsTheCourseOfEachKeyOverTheDays) {
         "d=\"M5 84L102 84M295 15h0\"/><path class=e d=\"M295 15h0\"/></svg>",
         // At its day of the period.
         "2 values from 7 to 7, the newest 7\"><path class=m d=\"M5 50L102 50\"/>",
+        "<td>7 <small>1970-01-03</small><td>",
         "1970-01-05: <b>1</b> values from <b>500</b> to <b>500</b>",
         "<tr><td>1970-01-02<td>2<td>5<td>27.5<td>50<td>22.5\n", ", logarithmic</figcaption>",
         // Empty on the newest day, but not on the others.

@@ -255,7 +255,7 @@ class PageWriter {
     return html + "</p>";
   }
 
-  /// A row with the line of a number over the days.
+  /// A row with the line of a number over the days. One that ended early says when.
   static std::string seriesRow(std::string_view key, const PageData::Series& series, Period period,
                                double longestStep) {
     std::vector<Point> points;
@@ -270,12 +270,15 @@ class PageWriter {
     const std::string lowest = figure(*low);
     const std::string highest = figure(*high);
     const std::string newest = figure(series.back().value);
+    const std::string ended = series.back().day < period.last
+                                  ? " <small>" + momentText(series.back().day) + "</small>"
+                                  : "";
     return "<tr><td>" + foldedName(key, valueList(series)) + "<td>" +
            sparkline(points, period, longestStep,
                      counted(series.size(), "value") + " from " + lowest + " to " + highest +
                          ", the newest " + newest) +
-           "<td>" + newest + "<td>" + lowest + "<td>" + highest + "<td>" + figure(series.size()) +
-           '\n';
+           "<td>" + newest + ended + "<td>" + lowest + "<td>" + highest + "<td>" +
+           figure(series.size()) + '\n';
   }
 
   static std::string seriesTable(const char* count, const std::string& rows) {
