@@ -6,7 +6,7 @@
 namespace vesprun {
 namespace {
 
-constexpr std::size_t kLongList = 40;
+constexpr std::size_t kLongPart = 40;
 constexpr std::size_t kSmallPart = 4;
 constexpr int kDeepest = 6;
 
@@ -19,7 +19,7 @@ class Grouping {
   void part(Places places, int depth) {
     const std::size_t prefix = commonPrefix(places);
     const std::string_view first = _keys[places.front()];
-    if (places.size() <= kLongList || depth == kDeepest) {
+    if (places.size() <= kLongPart || depth == kDeepest) {
       groups.push_back({std::string(first.substr(0, prefix)), false, std::move(places)});
       return;
     }

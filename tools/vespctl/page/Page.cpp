@@ -200,8 +200,8 @@ class PageWriter {
   std::string unreadableFiles() const {
     std::string html;
     for (const auto* list : {&_data.submitted.unreadable, &_data.unreadable}) {
-      for (const auto& [name, why] : *list) {
-        html += "<li>" + htmlName(name) + ": " + htmlText(why);
+      for (const UnreadableLog& file : *list) {
+        html += "<li>" + htmlName(file.name) + ": " + htmlText(file.why);
       }
     }
     return html.empty() ? "" : "<p class=act>Not on this page:</p><ul>" + html + "</ul>";

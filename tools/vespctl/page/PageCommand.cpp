@@ -1,13 +1,11 @@
 #include <sys/stat.h>
 
-#include <cstdio>
 #include <filesystem>
 #include <iostream>
 #include <system_error>
 
 #include "Command.h"
 #include "page/Page.h"
-#include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/AtomicFile.h"
 
 namespace vesprun {
@@ -35,12 +33,8 @@ void writePage(const std::string& file, const std::string& page) {
 void makePage(const std::string& directory, const std::string& file) {
   const auto device = openDevice(directory);
   const PageData data(device->directory());
-  for (const std::vector<UnreadableLog>* list : {&data.submitted.unreadable, &data.unreadable}) {
-    for (const auto& [name, why] : *list) {
-      std::fprintf(stderr, "vespctl: %s: %s\n", printableText(name).c_str(),
-                   printableText(why).c_str());
-    }
-  }
+  nameUnreadable(data.submitted.unreadable);
+  nameUnreadable(data.unreadable);
   std::error_code ignored;
   const auto absolute = std::filesystem::canonical(device->directory().path(), ignored);
   const std::string page =

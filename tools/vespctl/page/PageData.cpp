@@ -121,7 +121,7 @@ void PageData::takeLogs(const DeviceDirectory& directory) {
       storageLog = parseStorageLog(name, *content);
       newest = number;
     } else {
-      unreadable.push_back({name, error});
+      unreadable.push_back({name, error, false});
     }
   }
 }
@@ -147,7 +147,8 @@ void PageData::takeEvents(const DeviceDirectory& directory) {
         }
       });
   if (malformed > 0) {
-    unreadable.push_back({"events.jsonl", std::to_string(malformed) + " lines cannot be read"});
+    unreadable.push_back(
+        {"events.jsonl", std::to_string(malformed) + " lines cannot be read", true});
   }
 }
 
@@ -158,7 +159,8 @@ void PageData::takeRecords(const DeviceDirectory& directory) {
         ++others["record of type " + (type != nullptr ? textForm(*type) : "?")];
       });
   if (malformed > 0) {
-    unreadable.push_back({"records.jsonl", std::to_string(malformed) + " lines cannot be read"});
+    unreadable.push_back(
+        {"records.jsonl", std::to_string(malformed) + " lines cannot be read", true});
   }
 }
 
