@@ -119,15 +119,15 @@ std::string htmlName(std::string_view name) {
   }
   const std::string_view head = name.substr(0, characterStart(name, kShownHead));
   const std::string_view tail = name.substr(characterStart(name, name.size() - kShownTail));
-  return "<bdi>" + htmlText(head) + "</bdi> <small>… " + figure(name.size()) +
+  return "<bdi>" + htmlText(head) + "</bdi> <small>… " + numeral(name.size()) +
          " bytes …</small> <bdi>" + htmlText(tail) + "</bdi>";
 }
 
-std::string figure(const Number& number) {
-  return number.isFloatingPoint() ? figure(number.asDouble()) : grouped(textForm(number));
+std::string numeral(const Number& number) {
+  return number.isFloatingPoint() ? numeral(number.asDouble()) : grouped(textForm(number));
 }
 
-std::string figure(double value) {
+std::string numeral(double value) {
   constexpr double kLeastWithoutFraction = 1e5;
   constexpr double kLeastWithExponent = 1e15;
   const double size = std::abs(value);
@@ -137,10 +137,10 @@ std::string figure(double value) {
   return grouped(digits);
 }
 
-std::string figure(std::size_t count) { return grouped(std::to_string(count)); }
+std::string numeral(std::size_t count) { return grouped(std::to_string(count)); }
 
-std::string counted(std::size_t count, const char* noun) {
-  return figure(count) + ' ' + noun + (count == 1 ? "" : "s");
+std::string countedNoun(std::size_t count, const char* noun) {
+  return numeral(count) + ' ' + noun + (count == 1 ? "" : "s");
 }
 
 std::string dayText(std::int32_t day) {

@@ -20,12 +20,12 @@ std::string htmlName(std::string_view name);
 bool isLongName(std::string_view name);
 
 /// An integer with its digits in groups of three, a fraction with six digits.
-std::string figure(const Number& number);
-std::string figure(double value);
-std::string figure(std::size_t count);
+std::string numeral(const Number& number);
+std::string numeral(double value);
+std::string numeral(std::size_t count);
 
 /// "1 day", "2 days".
-std::string counted(std::size_t count, const char* noun);
+std::string countedNoun(std::size_t count, const char* noun);
 
 /// "2024-03-05" and "2024-03-05 09:15".
 std::string dayText(std::int32_t day);

@@ -61,7 +61,7 @@ std::string inGroups(const std::vector<std::string_view>& keys, bool areOpen, Wr
     std::string title =
         group.title.empty() ? (group.isRest ? "others" : "all") : htmlName(group.title);
     title += group.isRest && !group.title.empty() ? " others" : "";
-    html += fold(title + " <small>" + figure(group.keys.size()) + "</small>", write(group.keys),
+    html += fold(title + " <small>" + numeral(group.keys.size()) + "</small>", write(group.keys),
                  areOpen);
   }
   return html;
@@ -121,12 +121,12 @@ class PageWriter {
     for (const auto& [name, events] : _data.events) {
       sent += events.count;
     }
-    add("reports", figure(_data.days.size()), "days reported");
+    add("reports", numeral(_data.days.size()), "days reported");
     add("storage", verdictMark(), "storage");
-    add("scalars", figure(_data.scalars.size()), "scalars");
-    add("distributions", figure(_data.distributions.size()), "distributions");
-    add("events", figure(sent), "events");
-    add("left-out", figure(_keptBack.size()), "keys kept back");
+    add("scalars", numeral(_data.scalars.size()), "scalars");
+    add("distributions", numeral(_data.distributions.size()), "distributions");
+    add("events", numeral(sent), "events");
+    add("left-out", numeral(_keptBack.size()), "keys kept back");
     return html + "</nav>\n<main>\n";
   }
 
@@ -156,12 +156,13 @@ class PageWriter {
         "UTC<th>Scalars<th>Distributions<th>Whitelist<th>Log</thead>";
     html += tableHead + newest + "</table>\n";
     if (!older.empty()) {
-      html +=
-          fold(counted(count - kShownReports, "earlier report"), tableHead + older + "</table>");
+      html += fold(countedNoun(count - kShownReports, "earlier report"),
+                   tableHead + older + "</table>");
     }
     html += "<p>Digests of the whitelist:</p><ul>";
     for (const auto& [digest, times] : digests) {
-      html += "<li>" + foldedName(digest, "") + " <small>" + counted(times, "report") + "</small>";
+      html +=
+          "<li>" + foldedName(digest, "") + " <small>" + countedNoun(times, "report") + "</small>";
     }
     return section("reports", "Reports", html + "</ul>");
   }
@@ -172,8 +173,8 @@ class PageWriter {
     const std::string& digest = *document.findString("TBWhitelistDigest");
     return "<tr><td>" + dayText(log.day) + "<td>" + std::to_string(log.revision) + "<td>" +
            minuteText(*document.findDate("TBLogCreationDate")) + "<td>" +
-           figure(document.findDict("TBScalars")->size()) + "<td>" +
-           figure(document.findDict("TBDistributions")->size()) + "<td>" +
+           numeral(document.findDict("TBScalars")->size()) + "<td>" +
+           numeral(document.findDict("TBDistributions")->size()) + "<td>" +
            htmlName(digest.substr(0, kShownDigest)) + "<td>" +
            htmlText(log.name.substr(0, log.name.find('-'))) + '\n';
   }
@@ -193,7 +194,8 @@ class PageWriter {
     return count == 0
                ? ""
                : "<p>No report of " + gaps +
-                     (count > kMostGaps ? " and " + counted(count - kMostGaps, "later gap") : "") +
+                     (count > kMostGaps ? " and " + countedNoun(count - kMostGaps, "later gap")
+                                        : "") +
                      ".</p>";
   }
 
@@ -267,18 +269,18 @@ class PageWriter {
       low = value.asDouble() < low->asDouble() ? &value : low;
       high = value.asDouble() > high->asDouble() ? &value : high;
     }
-    const std::string lowest = figure(*low);
-    const std::string highest = figure(*high);
-    const std::string newest = figure(series.back().value);
+    const std::string lowest = numeral(*low);
+    const std::string highest = numeral(*high);
+    const std::string newest = numeral(series.back().value);
     const std::string ended = series.back().day < period.last
                                   ? " <small>" + momentText(series.back().day) + "</small>"
                                   : "";
     return "<tr><td>" + foldedName(key, valueList(series)) + "<td>" +
            sparkline(points, period, longestStep,
-                     counted(series.size(), "value") + " from " + lowest + " to " + highest +
+                     countedNoun(series.size(), "value") + " from " + lowest + " to " + highest +
                          ", the newest " + newest) +
            "<td>" + newest + ended + "<td>" + lowest + "<td>" + highest + "<td>" +
-           figure(series.size()) + '\n';
+           numeral(series.size()) + '\n';
   }
 
   static std::string seriesTable(const char* count, const std::string& rows) {
@@ -327,9 +329,9 @@ class PageWriter {
     std::string rows;
     std::vector<BandPoint> points;
     for (const PageData::DistributionDay& day : days) {
-      rows += "<tr><td>" + dayText(day.day) + "<td>" + figure(day.count) + "<td>" +
-              figure(day.minimum) + "<td>" + figure(day.mean) + "<td>" + figure(day.maximum) +
-              "<td>" + figure(deviation(day)) + '\n';
+      rows += "<tr><td>" + dayText(day.day) + "<td>" + numeral(day.count) + "<td>" +
+              numeral(day.minimum) + "<td>" + numeral(day.mean) + "<td>" + numeral(day.maximum) +
+              "<td>" + numeral(deviation(day)) + '\n';
       const bool isDrawn = day.count.asInt64() > 0 && std::isfinite(day.minimum) &&
                            std::isfinite(day.mean) && std::isfinite(day.maximum);
       if (isDrawn) {
@@ -337,10 +339,10 @@ class PageWriter {
       }
     }
     return "<article><h3>" + foldedName(key, "") + "</h3><p class=newest>" + dayText(newest.day) +
-           ": <b>" + figure(newest.count) + "</b> values from <b>" + figure(newest.minimum) +
-           "</b> to <b>" + figure(newest.maximum) + "</b>, mean <b>" + figure(newest.mean) +
-           "</b>, standard deviation <b>" + figure(deviation(newest)) + "</b></p><div class=pair>" +
-           histogram(days) + course(points) + "</div>" +
+           ": <b>" + numeral(newest.count) + "</b> values from <b>" + numeral(newest.minimum) +
+           "</b> to <b>" + numeral(newest.maximum) + "</b>, mean <b>" + numeral(newest.mean) +
+           "</b>, standard deviation <b>" + numeral(deviation(newest)) +
+           "</b></p><div class=pair>" + histogram(days) + course(points) + "</div>" +
            fold("Day by day",
                 "<table class=days><thead><tr><th>Day<th>Values<th>Lowest<th>Mean<th>Highest"
                 "<th>Deviation</thead>" +
@@ -359,12 +361,13 @@ class PageWriter {
       low = std::min(low, point.low);
       high = std::max(high, point.high);
     }
-    const std::string ends = figure(low) + " to " + figure(high);
+    const std::string ends = numeral(low) + " to " + numeral(high);
     return "<figure><figcaption>Lowest, mean and highest of each day" +
            std::string(isLogarithmic(points) ? ", logarithmic" : "") +
-           "</figcaption><p class=ends>" + figure(high) + "</p>" +
-           bandChart(points, _period, counted(points.size(), "day") + " with values from " + ends) +
-           "<p class=ends>" + figure(low) + "</p><p class=\"ends dates\"><span>" +
+           "</figcaption><p class=ends>" + numeral(high) + "</p>" +
+           bandChart(points, _period,
+                     countedNoun(points.size(), "day") + " with values from " + ends) +
+           "<p class=ends>" + numeral(low) + "</p><p class=\"ends dates\"><span>" +
            momentText(_period.first) + "</span><span>" + momentText(_period.last) +
            "</span></p></figure>";
   }
@@ -436,7 +439,7 @@ class PageWriter {
       html += "<tr><th>" + foldedName(bucket.label, "") + "<td>" +
               bar(share(share(bucket.newest, newest), longest),
                   days.size() > 1 ? share(share(bucket.all, all), longest) : 0) +
-              "<td>" + figure(bucket.newest) + '\n';
+              "<td>" + numeral(bucket.newest) + '\n';
     }
     return html + "</table></figure>";
   }
@@ -445,7 +448,7 @@ class PageWriter {
     std::string html;
     for (const auto& [name, events] : _data.events) {
       const std::string title =
-          htmlName(name) + " <small>" + figure(events.count) + " sent" +
+          htmlName(name) + " <small>" + numeral(events.count) + " sent" +
           (events.newest.back().day > 0 ? ", the last " + momentText(events.newest.back().day)
                                         : "") +
           "</small>";
@@ -484,7 +487,7 @@ class PageWriter {
     return (rows.empty() ? "" : seriesTable("Events", rows)) +
            (texts.empty() ? "" : "<table class=texts>" + texts + "</table>") +
            (zeros.empty() ? ""
-                          : fold(counted(zeroCount, "field") + " always 0",
+                          : fold(countedNoun(zeroCount, "field") + " always 0",
                                  "<p class=names>" + zeros + "</p>"));
   }
 
@@ -494,7 +497,7 @@ class PageWriter {
     }
     std::string html = "<ul>";
     for (const auto& [what, count] : _data.others) {
-      html += "<li>" + htmlName(what) + " <small>" + figure(count) + "</small>";
+      html += "<li>" + htmlName(what) + " <small>" + numeral(count) + "</small>";
     }
     return section("others", "Other logs and records", html + "</ul>");
   }
@@ -517,7 +520,7 @@ class PageWriter {
         return items + "</ul>";
       };
       if (!keys.empty()) {
-        html += "<h3>" + counted(keys.size(), isDistribution ? "distribution" : "scalar") +
+        html += "<h3>" + countedNoun(keys.size(), isDistribution ? "distribution" : "scalar") +
                 "</h3>" + inGroups(keys, _keptBack.size() <= kLongList, list);
       }
     }

@@ -104,7 +104,7 @@ class Statements {
                    const std::string& some) {
     if (const auto fact = find(names)) {
       const auto count = static_cast<std::size_t>(std::min(fact->value, 1e18));
-      add(count == 0 ? Level::Good : ifAny, count == 0 ? none : counted(count, noun) + some,
+      add(count == 0 ? Level::Good : ifAny, count == 0 ? none : countedNoun(count, noun) + some,
           fact->day);
     }
   }
@@ -115,7 +115,7 @@ class Statements {
   Facts _facts;
 };
 
-std::string percent(double value) { return figure(value) + "\u202F%"; }
+std::string percentText(double value) { return numeral(value) + "\u202F%"; }
 
 void addWear(Statements& statements) {
   const auto addUsed = [&statements](Statements::Names names, const char* where) {
@@ -123,7 +123,7 @@ void addWear(Statements& statements) {
       statements.add(used->value >= kWearToActOn    ? Level::Act
                      : used->value >= kWearToLookAt ? Level::Look
                                                     : Level::Good,
-                     percent(used->value) + " of the rated erase cycles of the " + where +
+                     percentText(used->value) + " of the rated erase cycles of the " + where +
                          " partition are used.",
                      used->day);
     }
@@ -134,22 +134,23 @@ void addWear(Statements& statements) {
   const auto intermediate = statements.find({"HLT_averageSLCPECycles"});
   if (user && intermediate) {
     statements.add(Level::Plain,
-                   "A TLC block has been erased " + figure(user->value) +
-                       " times on average, an SLC block " + figure(intermediate->value) + " times.",
+                   "A TLC block has been erased " + numeral(user->value) +
+                       " times on average, an SLC block " + numeral(intermediate->value) +
+                       " times.",
                    user->day, intermediate->day);
   }
   if (const auto spare = statements.find({"spareAvailablePercent"})) {
     statements.add(spare->value <= kSpareToActOn    ? Level::Act
                    : spare->value <= kSpareToLookAt ? Level::Look
                                                     : Level::Good,
-                   percent(spare->value) + " of the spare blocks are available.", spare->day);
+                   percentText(spare->value) + " of the spare blocks are available.", spare->day);
   }
 }
 
 void addFaults(Statements& statements) {
   const auto factory = statements.find({"numFactoryBad", "numFactoryBadBlocks"});
   const std::string since =
-      factory ? "; " + figure(factory->value) + " were bad from the factory." : ".";
+      factory ? "; " + numeral(factory->value) + " were bad from the factory." : ".";
   statements.addFailures({"numGrownBad"}, Level::Look, "No block has gone bad in use" + since,
                          "block", " went bad in use" + since);
   statements.addFailures({"numPfail"}, Level::Look, "No program operation has failed.",
@@ -175,14 +176,15 @@ void addUse(Statements& statements) {
     const double share = full->value / kBasisPoints;
     const auto capacity = statements.find({"HLT_OR_Capacity_GB"});
     statements.add(share >= kFullnessToLookAt ? Level::Look : Level::Plain,
-                   "The storage" + (capacity ? " of " + figure(capacity->value) + "\u202FGB" : "") +
-                       " is " + percent(std::round(share)) + " full.",
+                   "The storage" +
+                       (capacity ? " of " + numeral(capacity->value) + "\u202FGB" : "") + " is " +
+                       percentText(std::round(share)) + " full.",
                    full->day);
   }
   if (const auto amplification = statements.find({"UserWamp"})) {
     statements.add(
         Level::Plain,
-        "The write amplification of the user partition is " + figure(amplification->value) + ".",
+        "The write amplification of the user partition is " + numeral(amplification->value) + ".",
         amplification->day);
   }
   const auto written = statements.find({"hostWrites", "NumLogicalWrites", "HLT_hostWrites"});
@@ -191,7 +193,7 @@ void addUse(Statements& statements) {
     if (growth && written && written->value > 0) {
       statements.add(Level::Plain,
                      "Writing of the last " + std::string(period) + " is " +
-                         percent(std::round(growth->value / written->value * 1e4) / 1e2) +
+                         percentText(std::round(growth->value / written->value * 1e4) / 1e2) +
                          " of all that the system has ever written.",
                      growth->day);
     }
@@ -201,7 +203,7 @@ void addUse(Statements& statements) {
   addGrowth({"SM.Monthly.hostWrites"}, "thirty days");
   if (const auto hours = statements.find({"powerOnHours", "PowerOnHours"})) {
     statements.add(Level::Plain,
-                   "The storage has been powered for " + figure(hours->value) + " hours.",
+                   "The storage has been powered for " + numeral(hours->value) + " hours.",
                    hours->day);
   }
 }
