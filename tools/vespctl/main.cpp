@@ -26,6 +26,8 @@ int runCommandLine(int argc, char** argv) {
   addFieldsCommand(vespctl);
   addDecodeCommand(vespctl);
   addExportCommand(vespctl);
+  addOutlookCommands(vespctl);
+  addWhitelistCommands(vespctl);
   allowOneCommand(vespctl);
   try {
     vespctl.parse(argc, argv);
