@@ -231,7 +231,7 @@ std::optional<std::vector<WhitelistFinding>> checkWhitelist(std::string_view byt
       entries.push_back({name, value});
     }
   };
-  const std::optional<PropertyValue> document = readPtree(bytes, error, take);
+  const std::optional<PropertyValue> document = readPtreeEntries(bytes, error, take);
   if (!document || document->dict() == nullptr) {
     error = document ? "the root is not a dictionary" : error;
     return std::nullopt;

@@ -490,11 +490,11 @@ class PtreeParser {
 }  // namespace
 
 std::optional<PropertyValue> readPtree(std::string_view bytes, std::string& error) {
-  return readPtree(bytes, error, {});
+  return readPtreeEntries(bytes, error, {});
 }
 
-std::optional<PropertyValue> readPtree(std::string_view bytes, std::string& error,
-                                       const PtreeEntryVisitor& visit) {
+std::optional<PropertyValue> readPtreeEntries(std::string_view bytes, std::string& error,
+                                              const PtreeEntryVisitor& visit) {
   return PtreeParser(visit).read(bytes, error);
 }
 

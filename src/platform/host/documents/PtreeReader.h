@@ -40,7 +40,7 @@ using PtreeEntryVisitor =
 
 /// The same, and `visit` gets each entry in the order of the document, an entry that a later one
 /// with its key replaces as well. Also of a document that turns out to be none.
-std::optional<PropertyValue> readPtree(std::string_view bytes, std::string& error,
-                                       const PtreeEntryVisitor& visit);
+std::optional<PropertyValue> readPtreeEntries(std::string_view bytes, std::string& error,
+                                              const PtreeEntryVisitor& visit);
 
 }  // namespace vesprun
