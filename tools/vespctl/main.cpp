@@ -18,6 +18,7 @@ int runCommandLine(int argc, char** argv) {
                    "vespctl");
   addDeviceCommands(vespctl);
   addCounterCommands(vespctl);
+  addCollectCommand(vespctl);
   addPreferenceCommands(vespctl);
   addMessageCommands(vespctl);
   addNandCommands(vespctl);
@@ -28,6 +29,7 @@ int runCommandLine(int argc, char** argv) {
   addExportCommand(vespctl);
   addOutlookCommands(vespctl);
   addWhitelistCommands(vespctl);
+  addPruneCommand(vespctl);
   allowOneCommand(vespctl);
   try {
     vespctl.parse(argc, argv);
