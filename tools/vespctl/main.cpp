@@ -28,6 +28,8 @@ int runCommandLine(int argc, char** argv) {
   addDecodeCommand(vespctl);
   addExportCommand(vespctl);
   addPageCommand(vespctl);
+  addOutlookCommands(vespctl);
+  addWhitelistCommands(vespctl);
   addPruneCommand(vespctl);
   allowOneCommand(vespctl);
   try {

@@ -4,7 +4,7 @@
 #include <vector>
 
 #include "common/Date.h"
-#include "page/KeptBack.h"
+#include "outlook/KeptBack.h"
 #include "page/PageData.h"
 
 namespace vesprun {

@@ -2,9 +2,11 @@
 
 #include <filesystem>
 #include <iostream>
+#include <limits>
 #include <system_error>
 
 #include "Command.h"
+#include "outlook/LookedAtDevice.h"
 #include "page/Page.h"
 #include "platform/host/files/AtomicFile.h"
 
@@ -31,14 +33,20 @@ void writePage(const std::string& file, const std::string& page) {
 }
 
 void makePage(const std::string& directory, const std::string& file) {
-  const auto device = openDevice(directory);
-  const PageData data(device->directory());
+  using Days = std::numeric_limits<std::int32_t>;
+  const LookedAtDevice looked(directory);
+  const PageData data(looked.device->directory());
+  const auto keptBack = keysKeptBack(Days::min(), Days::max());
+  if (!keptBack) {
+    looked.complaints.fail(kUnreadableCounters);
+  }
+  looked.complaints.print();
   nameUnreadable(data.submitted.unreadable);
   nameUnreadable(data.unreadable);
   std::error_code ignored;
-  const auto absolute = std::filesystem::canonical(device->directory().path(), ignored);
+  const auto absolute = std::filesystem::canonical(looked.device->directory().path(), ignored);
   const std::string page =
-      pageText(absolute.filename().string(), device->clock().now(), data, keysKeptBack(*device));
+      pageText(absolute.filename().string(), platform().clock().now(), data, *keptBack);
   if (file.empty() || file == "-") {
     std::cout << page;
   } else {
