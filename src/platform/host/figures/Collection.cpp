@@ -103,7 +103,7 @@ class Collection {
     for (auto& [path, problem] : _readings.problems) {
       const Mark* told = known(path);
       if (told == nullptr || told->text != problem) {
-        lines.push_back(path + ": " + problem + ", left out");
+        lines.push_back("left out: " + path + ": " + problem);
       }
       _next[path].text = std::move(problem);
     }
