@@ -1,13 +1,10 @@
-#include <gmock/gmock.h>
-#include <sys/wait.h>
+#include "vespctl/VespctlTest.h"
 
 #include <algorithm>
-#include <cstdlib>
 #include <map>
 #include <sstream>
 
 #include "platform/host/figures/FigureTable.h"
-#include "support/TemporaryFolder.h"
 
 namespace vesprun {
 namespace {
@@ -17,30 +14,6 @@ using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 using ::testing::Not;
 using ::testing::StartsWith;
-
-/// The program itself, on the device directory "$D", which `init` has made.
-class VespctlTest : public ::testing::Test {
- protected:
-  VespctlTest() { EXPECT_EQ(run("init \"$D\""), 0) << error; }
-
-  /// What follows `vespctl` in a shell; the exit status, with what was printed in `output` and
-  /// `error`.
-  int run(const std::string& arguments) {
-    const std::string script = "D='" + folder.path("device") + "'; cd '" + folder.path() +
-                               "'; '" VESPCTL_PROGRAM "' " + arguments;
-    folder.write("script", script);
-    const int status = std::system(("bash '" + folder.path("script") + "' >'" +
-                                    folder.path("output") + "' 2>'" + folder.path("error") + '\'')
-                                       .c_str());
-    output = folder.read("output");
-    error = folder.read("error");
-    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-  }
-
-  TemporaryFolder folder;
-  std::string output;
-  std::string error;
-};
 
 TEST_F(VespctlTest, SaysWhatIsWrongWithItsArguments) {
   const struct {

@@ -27,6 +27,7 @@ int runCommandLine(int argc, char** argv) {
   addFieldsCommand(vespctl);
   addDecodeCommand(vespctl);
   addExportCommand(vespctl);
+  addPruneCommand(vespctl);
   allowOneCommand(vespctl);
   try {
     vespctl.parse(argc, argv);
