@@ -97,12 +97,12 @@ class Collection {
     }
   }
 
-  /// Lines for what is left out and has not been told yet.
+  /// Lines for what is left out and was not reported before.
   std::vector<std::string> complaints() {
     std::vector<std::string> lines;
     for (auto& [path, problem] : _readings.problems) {
-      const Mark* told = known(path);
-      if (told == nullptr || told->text != problem) {
+      const Mark* reported = known(path);
+      if (reported == nullptr || reported->text != problem) {
         lines.push_back("left out: " + path + ": " + problem);
       }
       _next[path].text = std::move(problem);
@@ -140,7 +140,7 @@ class Collection {
           mark->device != 0 && reading.device != 0 && mark->device != reading.device;
       return isOther || reading.value < mark->value ? 0 : mark->value;
     }
-    // What began with this boot or, as a device that was not there the last time, after it.
+    // It began with this boot or, as a device that was not there the last time, after that.
     const bool isNewDevice = mark == nullptr && known(placeOf(*reading.figure)) != nullptr;
     return _isWholeBoot || isNewDevice ? std::optional(0) : std::nullopt;
   }
