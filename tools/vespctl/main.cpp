@@ -26,6 +26,8 @@ int runCommandLine(int argc, char** argv) {
   addFieldsCommand(vespctl);
   addDecodeCommand(vespctl);
   addExportCommand(vespctl);
+  addDaysCommand(vespctl);
+  addCatchUpCommand(vespctl);
   addPruneCommand(vespctl);
   allowOneCommand(vespctl);
   try {

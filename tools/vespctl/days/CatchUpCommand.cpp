@@ -69,7 +69,7 @@ Submission submitReport(std::int32_t day) {
   }
   PropertyDict scalars = *document->find("TBScalars")->dict();
   for (const std::string_view key : ownScalarKeys()) {
-    scalars.erase(key);
+    scalars.remove(key);
   }
   document->set("TBScalars", std::move(scalars));
   const std::optional<std::string> bytes = serializeDailyLog(*document);

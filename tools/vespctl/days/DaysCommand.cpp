@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "Command.h"
+#include "Complaints.h"
 #include "common/Calendar.h"
 #include "outbox/SubmittedLogs.h"
 #include "platform/PreferenceNames.h"
@@ -27,10 +28,15 @@ std::string dateOf(std::int32_t day) {
 }
 
 void showDays(const std::string& directory, std::uint32_t last) {
-  ReadOnlyDevice device(directory);
+  std::string error;
+  Complaints complaints;
+  const auto device = HostPlatform::openReadOnly(directory, complaints, error);
+  if (!device) {
+    throw CommandFailure(error);
+  }
   const std::int32_t today = device->tallybook().TBDaysSince1970();
-  const auto first = static_cast<std::int32_t>(
-      std::max<std::int64_t>(std::numeric_limits<std::int32_t>::min(), std::int64_t{today} - last + 1));
+  const auto first = static_cast<std::int32_t>(std::max<std::int64_t>(
+      std::numeric_limits<std::int32_t>::min(), std::int64_t{today} - last + 1));
   std::map<std::int32_t, Day> days;
   const auto addLog = [&](SubmittedLog&& log) {
     if (log.day >= first && log.day <= today) {
@@ -39,15 +45,13 @@ void showDays(const std::string& directory, std::uint32_t last) {
   };
   nameUnreadable(forEachSubmittedLog(device->directory(), addLog));
   const auto countKeys = [&](CounterStore& store) {
-    store.readScalars("", first, today, [&](std::string_view, std::int32_t day, std::int64_t, bool&) {
-      ++days[day].scalars;
-    });
-    store.readDistributions("", first, today,
-                            [&](std::string_view, std::int32_t day, auto&, bool&) {
-                              ++days[day].distributions;
-                            });
+    store.readScalars(
+        "", first, today,
+        [&](std::string_view, std::int32_t day, std::int64_t, bool&) { ++days[day].scalars; });
+    store.readDistributions(
+        "", first, today,
+        [&](std::string_view, std::int32_t day, auto&, bool&) { ++days[day].distributions; });
   };
-  std::string error;
   if (last != 0 && !device->counters().read(countKeys, error)) {
     throw CommandFailure(error);
   }
@@ -62,10 +66,11 @@ void showDays(const std::string& directory, std::uint32_t last) {
   const std::int64_t stored =
       device->preferences().LGSPreferencesGetIntegerValue(kStoredDayKey, kOwnDomain);
   if (stored >= today) {
-    std::fprintf(stderr,
-                 "vespctl: the day of the last run, %lld, is ahead of the clock: until it has passed "
-                 "no run reports a day by itself, but catch-up does\n",
-                 static_cast<long long>(stored));
+    std::fprintf(
+        stderr,
+        "vespctl: the day of the last run, %lld, is ahead of the clock: until it has passed "
+        "no run reports a day by itself, but catch-up does\n",
+        static_cast<long long>(stored));
   }
 }
 
