@@ -65,6 +65,7 @@ void allowOneCommand(CLI::App& subject, bool needed = true);
 // Each subject adds its commands to vespctl in a file of its own.
 void addDeviceCommands(CLI::App& vespctl);
 void addCounterCommands(CLI::App& vespctl);
+void addCollectCommand(CLI::App& vespctl);
 void addPreferenceCommands(CLI::App& vespctl);
 void addMessageCommands(CLI::App& vespctl);
 void addNandCommands(CLI::App& vespctl);

@@ -18,6 +18,7 @@ int runCommandLine(int argc, char** argv) {
                    "vespctl");
   addDeviceCommands(vespctl);
   addCounterCommands(vespctl);
+  addCollectCommand(vespctl);
   addPreferenceCommands(vespctl);
   addMessageCommands(vespctl);
   addNandCommands(vespctl);
