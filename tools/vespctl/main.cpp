@@ -30,6 +30,8 @@ int runCommandLine(int argc, char** argv) {
   addDaysCommand(vespctl);
   addCatchUpCommand(vespctl);
   addPruneCommand(vespctl);
+  addOutlookCommands(vespctl);
+  addWhitelistCommands(vespctl);
   allowOneCommand(vespctl);
   try {
     vespctl.parse(argc, argv);

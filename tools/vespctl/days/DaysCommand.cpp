@@ -30,10 +30,7 @@ std::string dateOf(std::int32_t day) {
 void showDays(const std::string& directory, std::uint32_t last) {
   std::string error;
   Complaints complaints;
-  const auto device = HostPlatform::openReadOnly(directory, complaints, error);
-  if (!device) {
-    throw CommandFailure(error);
-  }
+  const auto device = openDeviceReadOnly(directory, complaints);
   const std::int32_t today = device->tallybook().TBDaysSince1970();
   const auto first = static_cast<std::int32_t>(std::max<std::int64_t>(
       std::numeric_limits<std::int32_t>::min(), std::int64_t{today} - last + 1));
