@@ -31,7 +31,7 @@ class DaysTest : public VespctlTest {
         "device/Library/Application Support/Tallybook/Whitelist_Stagebox.ptree",
         R"(<?xml version="1.0" encoding="UTF-8"?><ptree version="1.0"><dict><key>G</key><dict>
 <key>ScalarKeys</key><dict><key>s</key><dict/><key>com.quill.kernel.swapusage</key><dict/></dict>
-<key>DistributionKeys</key><dict><key>d</key><dict/></dict></dict></dict></ptree>)");
+<key>DistributionKeys</key><dict><key>d</key><dict><key>intervals</key><array><real>0.5</real></array></dict></dict></dict></dict></ptree>)");
     setTime("2024-03-05T09:15:02Z");
   }
 
@@ -151,8 +151,8 @@ TEST_F(DaysTest, CatchUpSubmitsWhatTheRunOfEachDayWouldHave) {
   std::filesystem::rename(folder.path("kept"), folder.path("device"));
   setTime("2024-03-07T04:00:00Z");
   const std::string events = folder.read("device/outbox/events.jsonl");
-  EXPECT_EQ(print("(flock \"$D\" sh -c 'sleep 0.5; touch released' & sleep 0.1; '" VESPCTL_PROGRAM
-                  "' catch-up \"$D\" --last 3; test -e released)"),
+  EXPECT_EQ(print("days \"$D\" --last 0; (flock \"$D\" sh -c 'sleep 0.5; touch released' & sleep "
+                  "0.1; '" VESPCTL_PROGRAM "' catch-up \"$D\" --last 3; test -e released)"),
             "[19785,19786,19787]\n")
       << "after the run that is at work";
   EXPECT_EQ(documents(false), ofRuns);
