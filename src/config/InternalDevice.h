@@ -6,7 +6,4 @@ namespace vesprun {
 /// answer holds until the process ends.
 bool TBIsInternalDevice();
 
-/// Lets the next `TBIsInternalDevice` ask again, as in a new process. For tests.
-void forgetInternalDeviceAnswer();
-
 }  // namespace vesprun

@@ -22,7 +22,4 @@ void handleNewPeer(PeerConnection& peer);
 /// Of all messages with another operation than 2 only the first in the life of the process counts.
 void handlePeerMessage(const PropertyValue& message);
 
-/// For tests: nothing requested and no message come yet, as at the start of a process.
-void startActiveAppInfoAfresh();
-
 }  // namespace vesprun

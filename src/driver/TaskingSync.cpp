@@ -44,8 +44,7 @@ OptionalValue entryOf(const OptionalValue& holder, std::string_view key) {
 }
 
 std::optional<std::string_view> textEntry(const PropertyDict& record, std::string_view key) {
-  const PropertyValue* entry = record.find(key);
-  const std::string* text = entry != nullptr ? entry->string() : nullptr;
+  const std::string* text = record.findString(key);
   return text != nullptr ? std::optional<std::string_view>(*text) : std::nullopt;
 }
 

@@ -22,20 +22,6 @@ class SystemLog {
   virtual void write(LogLevel level, std::string_view message) = 0;
 };
 
-/// Runs `work` and logs what it throws, such as memory running out, after "WHAT: ": for destructors
-/// and threads, where it would end the process.
-template <typename Work>
-void runGuarded(SystemLog& log, const char* what, const Work& work) noexcept {
-  try {
-    try {
-      work();
-    } catch (const std::exception& failure) {
-      log.write(LogLevel::Error, std::string(what) + ": " + failure.what());
-    }
-  } catch (...) {  // not even the log can be written
-  }
-}
-
 /// Forms a printf-style message and writes it to the installed platform's log. Nothing is formed
 /// when the level is not kept. A text form of a value ("%@") is passed as %s.
 [[gnu::format(printf, 2, 3)]] void logMessage(LogLevel level, const char* format, ...);

@@ -7,7 +7,4 @@ namespace vesprun {
 /// until then every call tries anew.
 bool resolveSupportLibraryFunctions();
 
-/// Lets the next call ask the library again, as in a new process. For tests.
-void forgetSupportLibraryFunctions();
-
 }  // namespace vesprun

@@ -22,8 +22,8 @@ constexpr std::string_view kBaselineDomain = "com.quill.logsmith.vesprun";
 constexpr std::array<std::string_view, 4> kUsageCounters = {"wifiInBytes", "wifiOutBytes",
                                                             "wwanInBytes", "wwanOutBytes"};
 
-std::int64_t counterOf(const PropertyValue* value) {
-  return value != nullptr && value->number() != nullptr ? value->number()->asInt64() : 0;
+std::int64_t numberOrZero(const Number* number) {
+  return number != nullptr ? number->asInt64() : 0;
 }
 
 /// What a process is called in counter keys.
@@ -33,14 +33,10 @@ struct UsageName {
 };
 
 std::optional<UsageName> nameOf(const PropertyDict& record) {
-  const auto text = [&record](std::string_view key) {
-    const PropertyValue* value = record.find(key);
-    return value != nullptr ? value->string() : nullptr;
-  };
-  if (const std::string* bundle = text("bundleName")) {
+  if (const std::string* bundle = record.findString("bundleName")) {
     return UsageName{"", *bundle};
   }
-  if (const std::string* process = text("procName")) {
+  if (const std::string* process = record.findString("procName")) {
     return UsageName{"com.quill.", *process};
   }
   return std::nullopt;
@@ -50,8 +46,7 @@ std::optional<UsageName> nameOf(const PropertyDict& record) {
 /// counters.
 class BaselineEntry {
  public:
-  explicit BaselineEntry(const PropertyValue* stored)
-      : _values(stored != nullptr ? stored->array() : nullptr) {}
+  explicit BaselineEntry(const PropertyArray* stored) : _values(stored) {}
 
   bool isSince(const Date& date) const {
     return _values != nullptr && !_values->empty() && _values->front().date() != nullptr &&
@@ -59,7 +54,7 @@ class BaselineEntry {
   }
 
   std::int64_t counter(std::size_t index) const {
-    return index + 1 < _values->size() ? counterOf(&(*_values)[index + 1]) : 0;
+    return index + 1 < _values->size() ? numberOrZero((*_values)[index + 1].number()) : 0;
   }
 
  private:
@@ -121,12 +116,8 @@ struct CountingMark {
   }
   static std::optional<CountingMark> of(const std::optional<PropertyValue>& stored) {
     const PropertyDict* dict = stored ? stored->dict() : nullptr;
-    const auto number = [dict](std::string_view key) {
-      const PropertyValue* value = dict != nullptr ? dict->find(key) : nullptr;
-      return value != nullptr ? value->number() : nullptr;
-    };
-    const Number* day = number("day");
-    const Number* fingerprint = number("fingerprint");
+    const Number* day = dict != nullptr ? dict->findNumber("day") : nullptr;
+    const Number* fingerprint = dict != nullptr ? dict->findNumber("fingerprint") : nullptr;
     if (day == nullptr || fingerprint == nullptr) {
       return std::nullopt;
     }
@@ -204,18 +195,17 @@ class UsageReply {
  private:
   void count(const PropertyDict& record) {
     const std::optional<UsageName> name = nameOf(record);
-    const PropertyValue* sinceValue = record.find(kUsageSinceKey);
-    const Date* since = sinceValue != nullptr ? sinceValue->date() : nullptr;
+    const Date* since = record.findDate(kUsageSinceKey);
     if (!name || since == nullptr) {
       return;
     }
-    const BaselineEntry before(_baseline.find(name->name));
+    const BaselineEntry before(_baseline.findArray(name->name));
     const bool goesOn = before.isSince(*since);
     const bool isRecent = daysSince1970(*since) >= _yesterday;
     const std::size_t additionsBefore = _additions.size();
     PropertyArray after{*since};
     for (std::size_t i = 0; i < kUsageCounters.size(); ++i) {
-      const std::int64_t value = counterOf(record.find(kUsageCounters[i]));
+      const std::int64_t value = numberOrZero(record.findNumber(kUsageCounters[i]));
       after.emplace_back(value);
       if (goesOn) {
         addGrowth(kUsageCounters[i], *name, value, before.counter(i));

@@ -1,11 +1,12 @@
 #include "telemetry/DiskInfo.h"
 
+#include <bit>
+
 #include <cstdint>
 #include <optional>
 
 #include "platform/Platform.h"
 #include "telemetry/DiskUsage.h"
-#include "telemetry/UserCapacity.h"
 
 namespace vesprun {
 namespace {
@@ -57,6 +58,18 @@ PropertyDict askForDiskUsage() {
 }
 
 }  // namespace
+
+std::uint32_t GetUserCapacityInGB(std::uint64_t userCapacityMB) {
+  const auto capacity = static_cast<std::uint32_t>(userCapacityMB);
+  constexpr std::uint32_t kFirst1536 = 0x150000;
+  if (capacity >= kFirst1536 && capacity < kFirst1536 + 385 * 1024) {
+    return 1536;
+  }
+  if (capacity == 0) {
+    return 0;
+  }
+  return static_cast<std::uint32_t>((std::uint64_t{1} << std::bit_width(capacity)) / 1024);
+}
 
 PropertyDict GetDiskInfo() {
   PropertyDict measured = measureFileSystem();

@@ -1,5 +1,7 @@
 #pragma once
 
+#include <cstdint>
+
 #include "common/PropertyDict.h"
 
 namespace vesprun {
@@ -14,5 +16,10 @@ namespace vesprun {
 /// or finds no capacity or less than 1/10,000 in use, the answer to "DiskUsage" is given instead
 /// (unsigned 32-bit capacities, the others signed 64-bit).
 PropertyDict GetDiskInfo();
+
+/// The nominal capacity in GB of a user area of so many MB, of which the low 32 bits count: 1536
+/// from 1,376,256 to 1,770,495 MB, else the power of two MB above it in units of 1024 MB. The power
+/// of two is worked out in 64 bits, so it goes on up to 4,194,304 GB.
+std::uint32_t GetUserCapacityInGB(std::uint64_t userCapacityMB);
 
 }  // namespace vesprun

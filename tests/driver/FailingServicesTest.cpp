@@ -4,6 +4,7 @@
 #include <utility>
 
 #include "buffers/DeviceBuffers.h"
+#include "common/ProcessState.h"
 #include "driver/ActiveAppInfoListener.h"
 #include "driver/DailyDriver.h"
 #include "platform/Guarded.h"
@@ -55,7 +56,7 @@ constexpr std::string_view kListeningDevice =
 class FailingServices : public ::testing::Test {
  protected:
   explicit FailingServices(std::string_view description = kFullDevice) : original(description) {
-    startActiveAppInfoAfresh();
+    ProcessState::startAfresh();
     original.writeWhitelistJson(R"({"G": {"ScalarKeys": {"listed": {}},
                                           "DistributionKeys": {"listed": {"intervals": [1]}}}})");
     original.write("kernel/ecc/1.bin", Bytes(72));
@@ -86,7 +87,7 @@ class FailingServices : public ::testing::Test {
     device.endProcess();
     fs::copy(original.path(), device.path(),
              fs::copy_options::recursive | fs::copy_options::overwrite_existing);
-    startActiveAppInfoAfresh();
+    ProcessState::startAfresh();
     const bool ranOut = runOn(device, faults, allocation, work);
     const bool failed = ranOut || !faults.failed().empty();
     device.endProcess();
@@ -135,7 +136,7 @@ class FailingServices : public ::testing::Test {
   /// would allocate as well, so they are watched only when none fails.
   template <typename Work>
   static bool runOn(TestDevice& device, Faults& faults, std::size_t allocation, const Work& work) {
-    std::unique_ptr<Platform> failing;  // ends after the threads of the device's own platform
+    std::shared_ptr<Platform> failing;  // ends after the threads of the device's own platform
     try {
       std::string error;
       const std::unique_ptr<HostPlatform> host = HostPlatform::open(device.path(), error);

@@ -1,4 +1,4 @@
-#include "driver/NANDInfoScalars.h"
+#include "driver/DailyStorageAndDeviceStats.h"
 
 #include "telemetry/TodaysScalars.h"
 

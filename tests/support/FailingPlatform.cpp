@@ -377,74 +377,70 @@ struct FailingUserDefaults : Failing<UserDefaults> {
   bool synchronize() override { return !fails(__func__) && real.synchronize(); }
 };
 
-class FailingPlatform : public Platform {
- public:
-  FailingPlatform(HostPlatform& real, Faults& operations) : host(real), faults(operations) {}
-
-  Clock& clock() override { return _clock; }
-  DailyWorkLock& dailyWorkLock() override { return _dailyWorkLock; }
-  DeviceRegistry& deviceRegistry() override { return _deviceRegistry; }
-  DiagnosticHeader& diagnosticHeader() override { return _diagnosticHeader; }
-  EventHub& eventHub() override { return _eventHub; }
-  FileSystem& fileSystem() override { return _fileSystem; }
-  InstalledApplications& installedApplications() override { return _installedApplications; }
-  Kernel& kernel() override { return _kernel; }
-  Languages& languages() override { return _languages; }
-  Logsmith& logsmith() override { return _logsmith; }
-  MainLoop& mainLoop() override { return _mainLoop; }
-  MessageDigest& messageDigest() override { return _messageDigest; }
-  MessageService& messageService() override { return _messageService; }
-  Murmur& murmur() override { return _murmur; }
-  NotificationCenter& notificationCenter() override { return _notificationCenter; }
-  Orrery& orrery() override { return _orrery; }
-  Preferences& preferences() override { return _preferences; }
-  ProcessInformation& processInformation() override { return _processInformation; }
-  PtreeSerialization& ptreeSerialization() override { return _ptreeSerialization; }
-  Reclaimer& reclaimer() override { return _reclaimer; }
-  LGSServicesClient& servicesClient() override { return _servicesClient; }
-  SupportLibrary& supportLibrary() override { return _supportLibrary; }
-  LGSSystemConfiguration& systemConfiguration() override { return _systemConfiguration; }
-  SystemLog& systemLog() override { return _systemLog; }
-  Tallybook& tallybook() override { return _tallybook; }
-  Tapline& tapline() override { return _tapline; }
-  UserDefaults& userDefaults() override { return _userDefaults; }
-
- private:
+struct FailingPlatform {
   HostPlatform& host;
   Faults& faults;
-  FailingClock _clock{host.clock(), faults};
-  FailingDailyWorkLock _dailyWorkLock{host.dailyWorkLock(), faults};
-  FailingRegistry _deviceRegistry{host.deviceRegistry(), faults};
-  FailingDiagnosticHeader _diagnosticHeader{host.diagnosticHeader(), faults};
-  FailingEventHub _eventHub{host.eventHub(), faults};
-  FailingFileSystem _fileSystem{host.fileSystem(), faults};
-  FailingInstalledApplications _installedApplications{host.installedApplications(), faults};
-  FailingKernel _kernel{host.kernel(), faults};
-  FailingLanguages _languages{host.languages(), faults};
-  FailingLogsmith _logsmith{host.logsmith(), faults};
-  FailingMainLoop _mainLoop{host.mainLoop(), faults};
-  FailingMessageDigest _messageDigest{host.messageDigest(), faults};
-  FailingMessageService _messageService{host.messageService(), faults};
-  FailingMurmur _murmur{host.murmur(), faults};
-  FailingNotificationCenter _notificationCenter{host.notificationCenter(), faults};
-  FailingOrrery _orrery{host.orrery(), faults};
-  FailingPreferences _preferences{host.preferences(), faults};
-  FailingProcessInformation _processInformation{host.processInformation(), faults};
-  FailingPtreeSerialization _ptreeSerialization{host.ptreeSerialization(), faults};
-  FailingReclaimer _reclaimer{host.reclaimer(), faults};
-  FailingServicesClient _servicesClient{host.servicesClient(), faults};
-  FailingSupportLibrary _supportLibrary{host.supportLibrary(), faults};
-  FailingSystemConfiguration _systemConfiguration{host.systemConfiguration(), faults};
-  FailingSystemLog _systemLog{host.systemLog(), faults};
-  FailingTallybook _tallybook{host.tallybook(), faults};
-  FailingTapline _tapline{host.tapline(), faults};
-  FailingUserDefaults _userDefaults{host.userDefaults(), faults};
+  FailingClock clock{host.clock(), faults};
+  FailingDailyWorkLock dailyWorkLock{host.dailyWorkLock(), faults};
+  FailingRegistry deviceRegistry{host.deviceRegistry(), faults};
+  FailingDiagnosticHeader diagnosticHeader{host.diagnosticHeader(), faults};
+  FailingEventHub eventHub{host.eventHub(), faults};
+  FailingFileSystem fileSystem{host.fileSystem(), faults};
+  FailingInstalledApplications installedApplications{host.installedApplications(), faults};
+  FailingKernel kernel{host.kernel(), faults};
+  FailingLanguages languages{host.languages(), faults};
+  FailingLogsmith logsmith{host.logsmith(), faults};
+  FailingMainLoop mainLoop{host.mainLoop(), faults};
+  FailingMessageDigest messageDigest{host.messageDigest(), faults};
+  FailingMessageService messageService{host.messageService(), faults};
+  FailingMurmur murmur{host.murmur(), faults};
+  FailingNotificationCenter notificationCenter{host.notificationCenter(), faults};
+  FailingOrrery orrery{host.orrery(), faults};
+  FailingPreferences preferences{host.preferences(), faults};
+  FailingProcessInformation processInformation{host.processInformation(), faults};
+  FailingPtreeSerialization ptreeSerialization{host.ptreeSerialization(), faults};
+  FailingReclaimer reclaimer{host.reclaimer(), faults};
+  FailingServicesClient servicesClient{host.servicesClient(), faults};
+  FailingSupportLibrary supportLibrary{host.supportLibrary(), faults};
+  FailingSystemConfiguration systemConfiguration{host.systemConfiguration(), faults};
+  FailingSystemLog systemLog{host.systemLog(), faults};
+  FailingTallybook tallybook{host.tallybook(), faults};
+  FailingTapline tapline{host.tapline(), faults};
+  FailingUserDefaults userDefaults{host.userDefaults(), faults};
+  Platform platform{clock,
+                    dailyWorkLock,
+                    deviceRegistry,
+                    diagnosticHeader,
+                    eventHub,
+                    fileSystem,
+                    installedApplications,
+                    kernel,
+                    languages,
+                    logsmith,
+                    mainLoop,
+                    messageDigest,
+                    messageService,
+                    murmur,
+                    notificationCenter,
+                    orrery,
+                    preferences,
+                    processInformation,
+                    ptreeSerialization,
+                    reclaimer,
+                    servicesClient,
+                    supportLibrary,
+                    systemConfiguration,
+                    systemLog,
+                    tallybook,
+                    userDefaults,
+                    tapline};
 };
 
 }  // namespace
 
-std::unique_ptr<Platform> failingPlatform(HostPlatform& host, Faults& faults) {
-  return std::make_unique<FailingPlatform>(host, faults);
+std::shared_ptr<Platform> failingPlatform(HostPlatform& host, Faults& faults) {
+  const auto failing = std::make_shared<FailingPlatform>(host, faults);
+  return {failing, &failing->platform};
 }
 
 }  // namespace vesprun

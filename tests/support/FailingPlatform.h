@@ -58,6 +58,6 @@ class Faults {
 
 /// The platform of a device with calls that fail. It outlives the device's platform, whose threads
 /// may still call it at the end.
-std::unique_ptr<Platform> failingPlatform(HostPlatform& host, Faults& faults);
+std::shared_ptr<Platform> failingPlatform(HostPlatform& host, Faults& faults);
 
 }  // namespace vesprun

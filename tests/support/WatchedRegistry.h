@@ -23,11 +23,11 @@ class WatchedRegistry : public DeviceRegistry {
 
   explicit WatchedRegistry(HostPlatform& device)
       : _device(&device), _registry(device.describedRegistry()) {
-    _device->interposeDeviceRegistry(this);
+    _device->deviceRegistry = *this;
   }
   ~WatchedRegistry() override {
     if (_device != nullptr) {
-      _device->interposeDeviceRegistry(nullptr);
+      _device->deviceRegistry = _registry;
     }
   }
 

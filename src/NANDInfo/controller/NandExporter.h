@@ -67,9 +67,6 @@ inline constexpr std::uint32_t kMethodNotOffered = 0xFFFFFFFF;
 /// every field 0. One table for the process, without a lock: look-ups must not overlap.
 extern std::array<nand_exporter_t, 4> nand_exporters_tunnel;
 
-/// Forgets the handles in the table, as in a new process; nothing is closed or released.
-void forgetNandExporterHandles();
-
 /// The first object of the registry, hidden from matching or not, that conforms to the class. The
 /// caller releases it. 0: none.
 RegistryHandle FindServiceUsingIterator(const std::string& className);

@@ -3,10 +3,9 @@
 #include <algorithm>
 #include <cstdio>
 
-#include "NANDInfo/lists/StructuredLogState.h"
+#include "NANDInfo/lists/ListRecord.h"
 #include "common/LittleEndian.h"
 #include "platform/DictionaryHelpers.h"
-#include "platform/Platform.h"
 
 namespace vesprun {
 namespace {
@@ -58,10 +57,6 @@ struct DefectRecord {
 
 PropertyValue signedNumber(std::uint32_t word) { return static_cast<std::int32_t>(word); }
 
-void log(const PropertyDict& record) {
-  platform().logsmith().FLLogStructuredData(kListRecordType, record);
-}
-
 void logHeader(std::uint32_t factoryCount, const PropertyValue* properties) {
   PropertyDict record{{"Factory Count", signedNumber(factoryCount)}};
   const PropertyDict* characteristics = properties != nullptr ? properties->dict() : nullptr;
@@ -70,7 +65,7 @@ void logHeader(std::uint32_t factoryCount, const PropertyValue* properties) {
   if (description != nullptr) {
     record.set("com.quill.NANDInfo.nandDesc", description->asInt32());
   }
-  log(record);
+  logListRecord(record);
 }
 
 void logDefect(const DefectRecord& defect, bool modeAdjustsReason) {
@@ -84,7 +79,7 @@ void logDefect(const DefectRecord& defect, bool modeAdjustsReason) {
       {"Page", signedNumber(defect.page)},
   };
   setNumberValueForType(record, "Temperature", &defect.temperature, PVNumberType::Int8);
-  log(record);
+  logListRecord(record);
 }
 
 }  // namespace

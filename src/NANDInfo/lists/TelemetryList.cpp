@@ -8,11 +8,9 @@
 #include <optional>
 #include <string>
 
-#include "NANDInfo/lists/HexText.h"
-#include "NANDInfo/lists/StructuredLogState.h"
+#include "NANDInfo/lists/ListRecord.h"
 #include "NANDInfo/parsers/VendorCounterParsers.h"
 #include "platform/DictionaryHelpers.h"
-#include "platform/Platform.h"
 
 namespace vesprun {
 namespace {
@@ -130,12 +128,12 @@ std::optional<Characteristics> readCharacteristics(const PropertyValue* properti
     return std::nullopt;
   }
   const CounterLayout layout = counterLayout(*chip, *manufacturer);
-  const PropertyValue* busCount = characteristics->find("num-bus");
-  if (busCount == nullptr || busCount->number() == nullptr) {
+  const Number* busCount = characteristics->findNumber("num-bus");
+  if (busCount == nullptr) {
     std::fputs("ERROR: could not determine the number of channels\n", stderr);
     return std::nullopt;
   }
-  return Characteristics{layout, busCount->number()->asInt32()};
+  return Characteristics{layout, busCount->asInt32()};
 }
 
 PropertyDict busRecord(const std::uint8_t* busEntry, const NandChannelCounters& counters,
@@ -157,6 +155,34 @@ PropertyDict busRecord(const std::uint8_t* busEntry, const NandChannelCounters& 
 }
 
 }  // namespace
+
+std::uint8_t hexStringToByte(std::string_view text, std::uint32_t length) {
+  unsigned value = 0;
+  for (char c : text.substr(0, std::min<std::size_t>(length, 2))) {
+    if (c >= 'A' && c <= 'Z') {
+      c = static_cast<char>(c - 'A' + 'a');
+    }
+    value *= 16;
+    if (c >= '0' && c <= '9') {
+      value += static_cast<unsigned>(c - '0');
+    } else if (c >= 'a' && c <= 'f') {
+      value += static_cast<unsigned>(c - 'a') + 10;
+    } else {
+      std::printf("unrecognized hex character: %c", c);
+    }
+  }
+  return static_cast<std::uint8_t>(value);
+}
+
+std::uint32_t hexStringToInt32(std::string_view text, std::uint32_t length) {
+  std::uint32_t value = 0;
+  for (std::string_view rest = text.substr(0, std::min<std::size_t>(length, 8)); !rest.empty();) {
+    const std::size_t byte = (rest.size() - 1) / 2;
+    value |= std::uint32_t{hexStringToByte(rest, 2)} << (8 * byte);
+    rest.remove_prefix(std::min<std::size_t>(rest.size(), 2));
+  }
+  return value;
+}
 
 bool LogNANDTelemetryList(std::span<const std::uint8_t> buffer,
                           const PropertyValue* characteristics, std::string_view /*className*/) {
@@ -182,8 +208,7 @@ bool LogNANDTelemetryList(std::span<const std::uint8_t> buffer,
   for (std::size_t bus = 0; bus < busCount; ++bus) {
     const auto region = buffer.subspan(bus * kCounterRegionSize).first<kCounterRegionSize>();
     read->layout.parse(region, *counters);
-    platform().logsmith().FLLogStructuredData(
-        kListRecordType, busRecord(busEntries + bus * kBusEntrySize, *counters, read->layout));
+    logListRecord(busRecord(busEntries + bus * kBusEntrySize, *counters, read->layout));
   }
   return true;
 }

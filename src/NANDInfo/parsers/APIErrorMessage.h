@@ -16,7 +16,4 @@ inline constexpr std::string_view kNANDInfoErrorMessageKey = "com.quill.NANDInfo
 /// recorded, even an empty one, further calls do nothing and do not look at their arguments.
 [[gnu::format(printf, 1, 2)]] void SetAPIErrorMessage(const char* format, ...) noexcept;
 
-/// Makes the process as new: nothing recorded. For tests; the job itself never forgets.
-void forgetAPIErrorMessage();
-
 }  // namespace vesprun

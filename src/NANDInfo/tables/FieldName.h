@@ -1,5 +1,7 @@
 #pragma once
 
+#include <array>
+#include <charconv>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
@@ -39,7 +41,14 @@ constexpr FieldName splitFieldName(std::string_view name) {
 }
 
 /// Sets `name` to the stem followed by the number, when it is one, in decimal.
-void assignFieldName(std::string& name, std::string_view stem, std::uint32_t number);
+inline void assignFieldName(std::string& name, std::string_view stem, std::uint32_t number) {
+  name = stem;
+  if (number != FieldName::kNoNumber) {
+    std::array<char, 10> digits;
+    const auto [end, error] = std::to_chars(digits.data(), digits.data() + digits.size(), number);
+    name.append(digits.data(), end);
+  }
+}
 
 /// The same value when a table is compiled and when it is searched. Takes eight bytes at a time, as
 /// names are long and looked up by the thousand.

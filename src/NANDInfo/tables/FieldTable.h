@@ -110,6 +110,20 @@ class FieldTable {
   std::size_t _fieldCount;
 };
 
+inline const FieldRange* FieldTable::find(const FieldName& name) const {
+  const std::size_t mask = _slots.size() - 1;
+  std::size_t slot = hashOfStem(name.stem) & mask;
+  while (_slots[slot] != 0 && _ranges[_slots[slot] - 1U].stem != name.stem) {
+    slot = (slot + 1) & mask;
+  }
+  for (std::size_t range = _slots[slot]; range != 0; range = _nextOfStem[range - 1]) {
+    if (_ranges[range - 1].contains(name.number)) {
+      return &_ranges[range - 1];
+    }
+  }
+  return nullptr;
+}
+
 template <const auto& kRanges>
 inline constexpr FieldIndex<kRanges.size()> kFieldIndexOf(kRanges);
 

@@ -21,45 +21,15 @@ class HostPlatform : public Platform {
   /// whole process, in its environment variable TZ, until the platform is destroyed.
   static std::unique_ptr<HostPlatform> open(const std::string& path, std::string& error);
 
-  ~HostPlatform() override;
+  ~HostPlatform();
 
   const DeviceDirectory& directory() const;
   const DeviceDescription& description() const;
   /// The counter database with the operations that only tools need.
   HostTallybook& counters();
-  /// The described registry, which knows which handles are out.
+  /// The described registry, which knows which handles are out; `deviceRegistry` may be another one
+  /// that watches the calls to it.
   HostDeviceRegistry& describedRegistry();
-  /// From now on `deviceRegistry` is this one, which outlives the platform: it stands between the
-  /// program and the described registry, to watch the calls or to make some fail. Null: none.
-  void interposeDeviceRegistry(DeviceRegistry* registry);
-
-  Clock& clock() override;
-  DailyWorkLock& dailyWorkLock() override;
-  DeviceRegistry& deviceRegistry() override;
-  DiagnosticHeader& diagnosticHeader() override;
-  EventHub& eventHub() override;
-  FileSystem& fileSystem() override;
-  InstalledApplications& installedApplications() override;
-  Kernel& kernel() override;
-  Languages& languages() override;
-  Logsmith& logsmith() override;
-  MainLoop& mainLoop() override;
-  MessageDigest& messageDigest() override;
-  MessageService& messageService() override;
-  Murmur& murmur() override;
-  NotificationCenter& notificationCenter() override;
-  Orrery& orrery() override;
-  Preferences& preferences() override;
-  ProcessInformation& processInformation() override;
-  PtreeSerialization& ptreeSerialization() override;
-  Reclaimer& reclaimer() override;
-  LGSServicesClient& servicesClient() override;
-  SupportLibrary& supportLibrary() override;
-  LGSSystemConfiguration& systemConfiguration() override;
-  SystemLog& systemLog() override;
-  Tallybook& tallybook() override;
-  UserDefaults& userDefaults() override;
-  Tapline& tapline() override;
 
  private:
   struct Services;

@@ -139,8 +139,8 @@ class NewNotifications {
       std::string ignored;
       const std::optional<PropertyValue> line = valueFromJsonText(rest.substr(0, end), ignored);
       const PropertyDict* dict = line ? line->dict() : nullptr;
-      const PropertyValue* posted = dict != nullptr ? dict->find("name") : nullptr;
-      if (posted != nullptr && *posted == PropertyValue(name)) {
+      const std::string* posted = dict != nullptr ? dict->findString("name") : nullptr;
+      if (posted != nullptr && *posted == name) {
         return true;
       }
       rest.remove_prefix(end + 1);

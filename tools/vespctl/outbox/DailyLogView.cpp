@@ -16,8 +16,8 @@ namespace {
 const PropertyDict kEmpty;
 
 const PropertyDict& section(const PropertyDict& log, const char* key) {
-  const PropertyValue* value = log.find(key);
-  return value != nullptr && value->dict() != nullptr ? *value->dict() : kEmpty;
+  const PropertyDict* value = log.findDict(key);
+  return value != nullptr ? *value : kEmpty;
 }
 
 std::string text(const PropertyDict& log, const char* key) {

@@ -49,8 +49,7 @@ void showLines(const std::string& file, Show show) {
 
 void showEvents(const DeviceDirectory& directory, bool inFull) {
   showLines(directory.hostPath("outbox/events.jsonl"), [inFull](const PropertyDict& event) {
-    const PropertyValue* payload = event.find("payload");
-    const PropertyDict* fields = payload != nullptr ? payload->dict() : nullptr;
+    const PropertyDict* fields = event.findDict("payload");
     std::cout << entryText(event, "time") << "  " << entryText(event, "event") << "  "
               << (fields != nullptr ? fields->size() : 0) << " fields\n";
     if (inFull && fields != nullptr) {
@@ -76,8 +75,7 @@ std::string recordText(const PropertyDict& record, bool inFull) {
 
 void showRecords(const DeviceDirectory& directory, bool inFull) {
   showLines(directory.hostPath("outbox/records.jsonl"), [inFull](const PropertyDict& line) {
-    const PropertyValue* value = line.find("record");
-    const PropertyDict* record = value != nullptr ? value->dict() : nullptr;
+    const PropertyDict* record = line.findDict("record");
     std::cout << entryText(line, "time") << "  type " << entryText(line, "type") << "  "
               << (record != nullptr ? printableText(recordText(*record, inFull)) : "") << '\n';
   });

@@ -4,9 +4,9 @@
 #include <iostream>
 
 #include "Command.h"
+#include "NANDInfo/StructuredLogState.h"
 #include "NANDInfo/controller/NandExporter.h"
 #include "NANDInfo/lists/StructuredLog.h"
-#include "NANDInfo/lists/StructuredLogState.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/sets/HealthSets.h"
 #include "platform/host/documents/JsonForm.h"

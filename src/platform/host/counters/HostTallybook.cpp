@@ -3,6 +3,7 @@
 #include <optional>
 
 #include "common/Calendar.h"
+#include "platform/Guarded.h"
 #include "platform/PreferenceNames.h"
 
 namespace vesprun {

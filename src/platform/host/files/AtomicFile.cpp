@@ -19,10 +19,6 @@ constexpr mode_t kOwnerOnly = 0600;
 constexpr std::size_t kWrittenPiece = 64 * 1024;
 constexpr int kMostUnfinished = 100;
 
-FileDescriptor openFolder(const std::string& folder) {
-  return FileDescriptor(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-}
-
 }  // namespace
 
 AtomicFile::AtomicFile(std::string folder, FileDescriptor folderDescriptor)

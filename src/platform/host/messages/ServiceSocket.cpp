@@ -21,10 +21,6 @@ constexpr const char* kFolder = "run";
 constexpr int kWaitingPeers = 16;
 constexpr mode_t kOwnerOnly = 0600;
 
-FileDescriptor openFolder(const std::string& path) {
-  return FileDescriptor(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-}
-
 /// The address of a socket file. A path that is too long for one is replaced by a way through the
 /// open folder.
 std::optional<sockaddr_un> addressOf(const std::string& path, int folder, const std::string& name) {

@@ -35,8 +35,6 @@ class PreferenceFile {
   /// refused in the system log, so that it cannot hold up the other changes.
   void set(std::string_view key, std::optional<PropertyValue> value);
 
-  bool hasChanges() const { return !_changes.empty(); }
-
   /// Makes the changes to the document as it is now, whoever wrote it, and writes it durably if
   /// that makes a difference. False, with an error in the system log, when that failed; the changes
   /// then stay for the next attempt. What was read is read anew afterwards.
@@ -54,14 +52,12 @@ class PreferenceFile {
   const PropertyDict& stored();
   bool writeChanges(std::string& error);
   bool keepAside(std::string& error) const;
-  static void apply(const std::map<std::string, std::optional<PropertyValue>>& changes,
-                    PropertyDict& values);
+  void applyChanges(PropertyDict& values) const;
 
   const DeviceDirectory& _device;
   Clock& _clock;
   SystemLog& _log;
   std::string _folder;
-  std::string _name;
   std::string _path;  ///< of the document, on the host
   std::chrono::milliseconds _longestWait;
   std::optional<PropertyDict> _stored;

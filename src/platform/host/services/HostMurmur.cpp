@@ -9,6 +9,8 @@
 #include <utility>
 #include <vector>
 
+#include "platform/Guarded.h"
+
 namespace vesprun {
 
 /// The threads that replies come from. Feeds, and so the handlers that hold them, share it: it may
