@@ -1,10 +1,12 @@
 #include "sample/SampleDevice.h"
 
+#include <cstdlib>
 #include <string_view>
 #include <vector>
 
 #include "Command.h"
 #include "common/Calendar.h"
+#include "platform/host/counters/CounterLines.h"
 #include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeWriter.h"
@@ -69,13 +71,21 @@ void recordCounters(HostPlatform& device) {
   }
 }
 
+/// The time that the controller's statistics tell of: now, unless SOURCE_DATE_EPOCH asks for the same
+/// bytes each time.
+Date sampleTime(Clock& clock) {
+  const char* const epoch = std::getenv("SOURCE_DATE_EPOCH");
+  std::int64_t seconds = 0;
+  return epoch != nullptr && parseWholeText(epoch, seconds) ? Date{seconds, 0} : clock.now();
+}
+
 }  // namespace
 
 void fillSampleDevice(const std::string& directory) {
   const std::unique_ptr<HostPlatform> device = openDevice(directory);
   writeWhitelist(device->directory());
   recordCounters(*device);
-  describeSampleDevice(device->directory(), device->clock().now());
+  describeSampleDevice(device->directory(), sampleTime(device->clock()));
 }
 
 }  // namespace vesprun
