@@ -7,8 +7,8 @@
 
 namespace vesprun {
 
-/// Runs `work` and logs what it throws, such as memory running out, after "WHAT: ": for destructors
-/// and threads, where it would end the process.
+/// Runs `work` and logs what it throws as "WHAT: ...": for destructors and threads, where an
+/// exception would end the process.
 template <typename Work>
 void runGuarded(SystemLog& log, const char* what, const Work& work) noexcept {
   try {
@@ -21,7 +21,7 @@ void runGuarded(SystemLog& log, const char* what, const Work& work) noexcept {
   }
 }
 
-/// The guard of a job that must go on whatever happens.
+/// For a job that must go on even when memory runs out.
 template <typename Step>
 void runGuarded(const Step& step) noexcept {
   runGuarded(platform().systemLog(), "unexpected failure", step);

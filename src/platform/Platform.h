@@ -30,7 +30,7 @@
 
 namespace vesprun {
 
-/// The services of the platform that the program runs on: `platform().clock()` is the clock.
+/// The services of the running platform: `platform().clock()` is the clock.
 struct Platform {
   /// The object that offers a service, which must outlive the platform.
   template <typename T>
@@ -74,10 +74,10 @@ struct Platform {
 
 bool platformIsInstalled();
 
-/// The installed platform. Without one the process ends, with a line on the standard error stream.
+/// Without an installed platform the process ends with a line on standard error.
 Platform& platform();
 
-/// Installs a platform for as long as it lives; a process has exactly one at a time.
+/// Installs a platform as long as it lives. A process has one at a time.
 class InstalledPlatform {
  public:
   explicit InstalledPlatform(Platform& installed);

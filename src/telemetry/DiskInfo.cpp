@@ -13,7 +13,7 @@ namespace {
 
 constexpr const char* kUserVolume = "/private/var";
 
-/// Arithmetic is modulo 2^64, as everywhere with byte counts of a file system.
+/// Byte counts of a file system are computed modulo 2^64.
 PropertyDict measureFileSystem() {
   std::uint64_t available = 0;
   std::uint64_t fullness = 0;
@@ -47,7 +47,7 @@ PropertyDict askForDiskUsage() {
   const std::int64_t totalAvailable = mebibytes(kDiskUsageTotalDataAvailable);
   const std::int64_t available = mebibytes(kDiskUsageAmountDataAvailable);
   const std::uint32_t capacity = GetUserCapacityInGB(static_cast<std::uint32_t>(total));
-  // Counts of 44 bits leave room for the factor.
+  // Counts have 44 bits: the factor fits.
   const std::int64_t fullness = total >= 1 ? (total - totalAvailable) * 10'000 / total : 0;
   return {{"HLT_OR_Capacity_GB", capacity},
           {"HLT_Capacity_GB", capacity},

@@ -8,20 +8,20 @@
 
 namespace vesprun {
 
-/// Takes the errors that a service logs, which become the command's own.
+/// Collects the errors that a service logs, for the command to report.
 class Complaints final : public SystemLog {
  public:
-  /// `also` gets all that is logged too, unless it is null.
+  /// `also`, unless null, gets all that is logged.
   explicit Complaints(SystemLog* also = nullptr) : _also(also) {}
 
   bool keeps(LogLevel level) const override;
   void write(LogLevel level, std::string_view message) override;
 
-  /// Throws `CommandFailure` with the first of them.
+  /// Throws the first error as `CommandFailure`.
   void failIfAny() const;
-  /// Throws `CommandFailure` with all of them and, unless the last one says so already, `error`.
+  /// Throws all errors and, unless the last one begins with it, `error`.
   [[noreturn]] void fail(const std::string& error) const;
-  /// Each on standard error, of a command that is done nevertheless.
+  /// Prints them, when the command succeeded nevertheless.
   void print() const;
 
  private:

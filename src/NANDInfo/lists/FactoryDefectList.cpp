@@ -10,13 +10,13 @@
 namespace vesprun {
 namespace {
 
-// The header: a word that is not read, the factory count, the number of records.
+// The header: an unused word, the factory count, the number of records.
 constexpr std::size_t kFactoryCountOffset = 4;
 constexpr std::size_t kRecordCountOffset = 8;
 constexpr std::size_t kListHeaderSize = 12;
 constexpr std::size_t kRecordSize = 32;
 
-/// A defect as it lies in the buffer, 32 bytes.
+/// A defect record, 32 bytes.
 struct DefectRecord {
   std::uint16_t bus;
   std::uint16_t chipEnable;
@@ -39,7 +39,7 @@ struct DefectRecord {
         temperature(static_cast<std::int8_t>(bytes[24])),
         mode(loadLittleEndian<std::uint32_t>(bytes + 28)) {}
 
-  /// The reason with what the mode adds to it; wraps as 32 bits do.
+  /// The reason adjusted by the mode, in 32 bits.
   std::uint32_t adjustedReason() const {
     switch (mode) {
       case 0:

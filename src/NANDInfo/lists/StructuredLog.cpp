@@ -23,17 +23,16 @@
 namespace vesprun {
 namespace {
 
-// The size query of a request for a list is a word of flags, with the kind of the list in bits 2 to
-// 9.
+// A list request's size query is a word of flags, with the kind of the list in bits 2 to 9.
 constexpr std::uint32_t kSizePhase = 1;
 constexpr std::uint32_t kCallersFlag = 2;
 constexpr unsigned kKindShift = 2;
 
-/// Takes a list as the controller gave it, the controller's properties and its class name. False
-/// when the list could not be handled.
+/// Handles a list as the controller sent it, with the controller's properties and class name. False
+/// on failure.
 using ListHandler = bool (*)(std::span<const std::uint8_t>, const PropertyValue*, std::string_view);
 
-/// A type of list, of which a controller may have several kinds.
+/// A type of list; a controller may have several kinds.
 struct ListType {
   nand_exporter_t::SelectorGetter nand_exporter_t::*getter;
   ListHandler handler;
@@ -50,7 +49,6 @@ constexpr std::array<ListType, 3> kListTypes{{
      "Defects list retrieval is not supported\n"},
 }};
 
-/// One list to fetch.
 struct HandlerEntry {
   nand_exporter_t::SelectorGetter getter;
   ListHandler handler;
@@ -93,8 +91,8 @@ void decideOnValidityList() {
   gNeedValidityList = isAboveWriteAmplificationThreshold(amplification.user) || forced;
 }
 
-/// A list, in a buffer of the size that the controller stated first; what it did not deliver of it
-/// is zero. Without memory when there is none. `index` is the list's place in the log.
+/// A list in a buffer of the size stated first; undelivered bytes are zero. Empty on failure.
+/// `index` is for the error text.
 TunnelBuffer fetchList(const Controller& controller, const TunnelSelector& selector,
                        std::uint32_t flags, int index) {
   DeviceRegistry& registry = platform().deviceRegistry();
@@ -114,7 +112,7 @@ TunnelBuffer fetchList(const Controller& controller, const TunnelSelector& selec
   if (size == 0) {
     return {};
   }
-  // Need not be aligned to a page: the driver copies into it.
+  // Page alignment is not needed: the driver copies.
   TunnelBuffer list(size);
   if (!list) {
     std::fprintf(stderr, "Could not malloc %zu bytes", std::size_t{size});

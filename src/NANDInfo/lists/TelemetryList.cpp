@@ -20,19 +20,19 @@ constexpr std::size_t kWordSize = 4;
 constexpr std::size_t kBusEntrySize = 32;
 constexpr std::uint64_t kBytesPerBus = kCounterRegionSize + kBusEntrySize;
 
-/// The words of a bus entry, in order; a last one is not used.
+/// The words of a bus entry; the last one is unused.
 constexpr std::array<const char*, 7> kBusEntryKeys{"RD",  "PE",         "Max_PE_rate", "t0",
                                                    "Ret", "block_type", "num_pages"};
 static_assert((kBusEntryKeys.size() + 1) * kWordSize == kBusEntrySize);
 
-/// Everything that depends on the flash in use.
+/// What depends on the flash in use.
 struct CounterLayout {
   void (*parse)(CounterRegion, NandChannelCounters&);
   std::size_t readStages = 23;
   std::size_t dspParameters = 12;
   CounterFieldId chipsOwnBins = CounterFieldId::NotUsed;
 
-  /// How many elements of a field are logged.
+  /// Logged elements of a field.
   std::size_t count(CounterFieldId id) const {
     switch (id) {
       case CounterFieldId::ReadStage:
@@ -55,7 +55,7 @@ struct Characteristics {
   std::int32_t busCount;
 };
 
-/// The first four hexadecimal digits, and the eight behind them without the last two.
+/// Four hexadecimal digits, then eight, of which the last two do not count.
 std::uint64_t manufacturerKey(std::string_view text) {
   constexpr std::uint32_t kVendorDigits = 4;
   constexpr std::uint32_t kPartDigits = 8;
@@ -88,8 +88,8 @@ CounterLayout counterLayout(std::string_view chip, std::string_view manufacturer
   return vendorLayout(key);
 }
 
-/// Null, with a line on the standard error stream, which says `ifNoText` when it is no text, when
-/// the characteristic is missing or unusable.
+/// Null, with a line on standard error, when the characteristic is missing or not a text
+/// (`ifNoText`).
 const std::string* readText(const PropertyDict& characteristics, const char* key,
                             const char* ifNoText) {
   const PropertyValue* value = characteristics.find(key);
@@ -186,7 +186,7 @@ std::uint32_t hexStringToInt32(std::string_view text, std::uint32_t length) {
 
 bool LogNANDTelemetryList(std::span<const std::uint8_t> buffer,
                           const PropertyValue* characteristics, std::string_view /*className*/) {
-  // One for all buses: a layout writes the same words each time.
+  // One object for all buses: a layout always writes the same words.
   const std::unique_ptr<NandChannelCounters> counters(new (std::nothrow) NandChannelCounters());
   if (!counters) {
     std::fprintf(stderr, "ERROR: Could not malloc %zu bytes\n", sizeof *counters);

@@ -21,7 +21,8 @@
 
 namespace vesprun {
 
-// Destroyed from the last to the first: what writes at its end comes after what it needs for that.
+// Destroyed from the last to the first: a service that writes at its end follows those that it
+// needs.
 struct HostPlatform::Services {
   Services(DeviceDirectory deviceDirectory, DeviceDescription deviceDescription,
            ProcessTimeZone processTimeZone)

@@ -12,23 +12,23 @@ namespace vesprun {
 class HostDeviceRegistry;
 class HostTallybook;
 
-/// The platform of one device directory on the running Linux system. What the services hold back is
-/// written when it is destroyed.
+/// The platform of a device directory on Linux. When it is destroyed, its services write what they
+/// held back.
 class HostPlatform : public Platform {
  public:
-  /// Reads the description of the device. Nothing, with a text in `error` that names the place,
-  /// when the folder or its `device.json` cannot be used. A described time zone is that of the
-  /// whole process, in its environment variable TZ, until the platform is destroyed.
+  /// Reads the device's description. Null, with the place in `error`, when the folder or its
+  /// `device.json` cannot be used. A described time zone is set for the whole process, in TZ, until
+  /// the platform is destroyed.
   static std::unique_ptr<HostPlatform> open(const std::string& path, std::string& error);
 
   ~HostPlatform();
 
   const DeviceDirectory& directory() const;
   const DeviceDescription& description() const;
-  /// The counter database with the operations that only tools need.
+  /// With the operations that only tools need.
   HostTallybook& counters();
-  /// The described registry, which knows which handles are out; `deviceRegistry` may be another one
-  /// that watches the calls to it.
+  /// Counts the handles that are out; a test may put a registry of its own before it as
+  /// `deviceRegistry`.
   HostDeviceRegistry& describedRegistry();
 
  private:

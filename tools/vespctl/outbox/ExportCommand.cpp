@@ -43,7 +43,7 @@ Digest authenticationCode(std::string_view key, std::string_view message) {
   return sha256(block + text(sha256(inner.append(message))));
 }
 
-/// A name for the device that stays the same and does not hold its identifier.
+/// A constant name for the device that does not reveal its identifier.
 std::string pseudonymOf(const std::string& systemIdentifier) {
   constexpr std::size_t kBytes = 16;
   const Digest code = authenticationCode(systemIdentifier, "vesprun exported device");

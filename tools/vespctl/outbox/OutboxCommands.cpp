@@ -22,7 +22,7 @@ std::string entryText(const PropertyDict& line, const char* key) {
   return value != nullptr ? printableText(textForm(*value)) : "";
 }
 
-/// One shown line for each line of the file; what cannot be read is said where it stands.
+/// Shows each line of the file; says which ones cannot be read.
 template <typename Show>
 void showLines(const std::string& file, Show show) {
   std::string error;
@@ -60,7 +60,7 @@ void showEvents(const DeviceDirectory& directory, bool inFull) {
   });
 }
 
-/// The text form of a record, or of its first entries and the number of the others.
+/// The text form of a record, possibly cut short.
 std::string recordText(const PropertyDict& record, bool inFull) {
   constexpr std::size_t kShownEntries = 8;
   if (inFull || record.size() <= kShownEntries) {
@@ -97,7 +97,7 @@ void showSystemLog(const DeviceDirectory& directory) {
   });
 }
 
-/// A text log: the lines, those with fields parted by semicolons as a line for each field.
+/// A text log; fields parted by semicolons get a line each.
 void showText(const std::string& content, bool inFull) {
   constexpr std::size_t kShownFields = 24;
   std::vector<std::string> fields;

@@ -19,7 +19,6 @@ namespace {
 
 constexpr std::string_view kNameAfterNumber = "-193-log-aggregated.ptree";
 
-/// The number in the name of a daily log.
 std::optional<std::uint64_t> numberOf(std::string_view name) {
   std::uint64_t number = 0;
   const auto [end, error] = std::from_chars(name.data(), name.data() + name.size(), number);
@@ -42,7 +41,7 @@ bool isInteger(const PropertyValue& value) {
   return value.number() != nullptr && !value.number()->isFloatingPoint();
 }
 
-/// What keeps a document from being a daily log; null when it is one.
+/// Null for a sound daily log.
 const char* faultOf(const PropertyDict& log) {
   if (log.findDate("TBStartDate") == nullptr || log.findDate("TBLogCreationDate") == nullptr) {
     return "a date is missing";
@@ -77,7 +76,7 @@ const char* faultOf(const PropertyDict& log) {
   return nullptr;
 }
 
-/// The highest revision of each day among the logs that were pruned.
+/// The highest revision of each day among pruned logs.
 std::map<std::int32_t, std::int64_t> prunedRevisions(const DeviceDirectory& directory) {
   std::map<std::int32_t, std::int64_t> revisions;
   std::string error;

@@ -9,7 +9,7 @@
 
 namespace vesprun {
 
-/// A submitted daily log in the outbox, with what every reader of it needs.
+/// A submitted daily log in the outbox.
 struct SubmittedLog {
   std::string name;       ///< of its file
   std::int32_t day = 0;   ///< that it reports
@@ -17,7 +17,7 @@ struct SubmittedLog {
   PropertyDict document;
 };
 
-/// Why a file with the name of a daily log is none.
+/// A file with the name of a daily log that is not one.
 struct UnreadableLog {
   std::string name;
   std::string why;
@@ -29,7 +29,7 @@ struct SubmittedLogs {
 };
 
 /// The daily logs in the outbox. A log's revision is one more than the highest of its day so far,
-/// of logs that were pruned as well. Throws `CommandFailure` when the outbox cannot be read.
+/// pruned logs included. Throws `CommandFailure` when the outbox cannot be read.
 SubmittedLogs readSubmittedLogs(const DeviceDirectory& directory);
 
 }  // namespace vesprun

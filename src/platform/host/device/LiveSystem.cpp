@@ -57,7 +57,7 @@ std::string upperCase(std::string text) {
   return text;
 }
 
-/// "en_GB.UTF-8@euro" as {"en", "GB"}; nothing for the locales that name no language.
+/// "en_GB.UTF-8@euro" is {"en", "GB"}; nothing for locales without a language.
 struct LocaleName {
   std::string language;
   std::string country;
@@ -141,7 +141,7 @@ std::optional<Bytes> swapUsage() {
 
 std::optional<std::string> bootSessionIdentifier() {
   std::string identifier = upperCase(firstLineOf("/proc/sys/kernel/random/boot_id"));
-  // The service sees nothing but processes in /proc; the system hands it this file as a credential.
+  // The sandboxed service cannot read /proc/sys; systemd passes the file as a credential.
   if (const char* credentials = std::getenv("CREDENTIALS_DIRECTORY");
       identifier.empty() && credentials != nullptr) {
     identifier = upperCase(firstLineOf(std::string(credentials) + "/boot_id"));

@@ -59,7 +59,7 @@ AtomicFile::Added addHeader(const std::string& folder, const std::string& name,
   if (!file) {
     return AtomicFile::Added::Failed;
   }
-  file->append(jsonText(header) + '\n');  // a failure is told by `addNew`
+  file->append(jsonText(header) + '\n');  // `addNew` reports a failure
   return file->addNew(name, error);
 }
 
@@ -100,7 +100,7 @@ bool Outbox::writeLog(std::string_view type, std::string_view name, const Proper
   }
   OutboxLogFile handle(*file);
   writer(handle);
-  // Two submissions at once must not share a number: a header would stand beside the other's log.
+  // Two submissions at once must not share a number, or a header would go with the other's log.
   const std::optional<FolderLock> lock = FolderLock::take(*folder, error);
   if (!lock) {
     return false;
@@ -110,7 +110,7 @@ bool Outbox::writeLog(std::string_view type, std::string_view name, const Proper
   for (std::uint64_t number = first.value_or(0); added == AtomicFile::Added::NameTaken; ++number) {
     const std::string base = baseName(number, type, name);
     const std::string headerName = base + ".header.json";
-    // First, so that a log which is there has its header beside it.
+    // The header first: a log that is there has its header.
     if (header != nullptr) {
       added = addHeader(*folder, headerName, *header, error);
       if (added != AtomicFile::Added::Done) {

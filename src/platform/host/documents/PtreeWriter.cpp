@@ -114,7 +114,7 @@ class TreeWriter {
         break;
       }
       const char c = text[plain];
-      // A reader takes a bare carriage return for a line feed.
+      // XML readers turn a bare carriage return into a line feed.
       _document += c == '&' ? "&amp;" : c == '<' ? "&lt;" : c == '>' ? "&gt;" : "&#13;";
       text.remove_prefix(plain + 1);
     }
@@ -132,7 +132,7 @@ class TreeWriter {
     if (number.isFloatingPoint()) {
       name = "real";
       const double real = number.asDouble();
-      // The sign of a NaN says nothing.
+      // A NaN's sign means nothing.
       last = std::to_chars(text, end, std::isnan(real) ? std::abs(real) : real).ptr;
     } else if (number.isSigned()) {
       last = std::to_chars(text, end, number.asInt64()).ptr;

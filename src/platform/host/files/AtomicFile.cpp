@@ -47,7 +47,7 @@ std::optional<AtomicFile> AtomicFile::create(const std::string& folder, std::str
   if (!file.openUnfinished(error)) {
     return std::nullopt;
   }
-  if (fchmod(file._file.get(), kOwnerOnly) != 0) {  // whatever the process's file mode mask says
+  if (fchmod(file._file.get(), kOwnerOnly) != 0) {  // whatever the umask
     error = systemError(folder);
     return std::nullopt;
   }
@@ -63,8 +63,8 @@ bool AtomicFile::openUnfinished(std::string& error) {
       error = systemError(pathOf(name));
       return false;
     }
-    // Its writer holds the lock while it lives; what a killed one left is written over. The name
-    // may have gone to another file while this one was being opened.
+    // Its writer holds the lock while it lives; a file without one is left from a kill and
+    // overwritten. Between open and lock the name may have gone to another file.
     struct stat opened {};
     struct stat named {};
     if (flock(file.get(), LOCK_EX | LOCK_NB) != 0 || fstat(file.get(), &opened) != 0 ||
@@ -72,7 +72,7 @@ bool AtomicFile::openUnfinished(std::string& error) {
         opened.st_ino != named.st_ino) {
       continue;
     }
-    if (opened.st_nlink != 1) {  // killed after the document got its name: that one is finished
+    if (opened.st_nlink != 1) {  // killed after the document got its name
       unlinkat(_folderDescriptor.get(), name.c_str(), 0);
       continue;
     }
@@ -149,7 +149,7 @@ AtomicFile::Added AtomicFile::addNew(const std::string& name, std::string& error
   if (!makeDurable(name, error)) {
     return Added::Failed;
   }
-  // Not renamed, which would replace a file of that name.
+  // Linked: a rename would replace a file of that name.
   const int folder = _folderDescriptor.get();
   if (linkat(folder, _unfinishedName.c_str(), folder, name.c_str(), 0) != 0) {
     if (errno == EEXIST) {

@@ -14,8 +14,8 @@
 namespace vesprun {
 
 bool JsonLines::open(std::string& error) {
-  // Reading, to see how the last line ends; not blocking, in case it is no file. A link could lead
-  // the lines out of the device.
+  // Opened for reading as well, to see how the last line ends, and without blocking, in case of a
+  // pipe. A link could lead out of the device.
   FileDescriptor file(::open(
       _path.c_str(), O_RDWR | O_APPEND | O_CREAT | O_CLOEXEC | O_NONBLOCK | O_NOFOLLOW, 0600));
   struct stat status {};
@@ -39,13 +39,13 @@ bool JsonLines::append(std::string_view line, std::string& error) {
   }
   const std::scoped_lock guard(_mutex);
   struct stat status {};
-  // A file that was deleted meanwhile would take the line with it.
+  // A deleted file would take the line with it.
   const bool usable = _file.isOpen() && fstat(_file.get(), &status) == 0 && status.st_nlink != 0;
   if (!usable && !open(error)) {
     return false;
   }
   const bool locked = takeLock(_file.get(), LOCK_EX, _wait, _path, error);
-  // Only one line waits for whoever keeps the file; the others would together wait for ever.
+  // One line waits for the holder; otherwise the lines would add up to an endless wait.
   _wait = locked ? _longestWait : std::chrono::milliseconds::zero();
   if (!locked) {
     return false;

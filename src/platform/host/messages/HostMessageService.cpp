@@ -29,8 +29,7 @@ class UnixPeer final : public PeerConnection {
   void noteHeard() { _lastHeard = std::chrono::steady_clock::now(); }
   void noteMessage() { _hasSentMessage = true; }
 
-  /// Whether this one makes room before `other` does: first those that have sent no whole message,
-  /// then those that came or last sent anything longer ago.
+  /// Less worth: first a peer that has sent no whole message, then the one silent longest.
   bool isLessWorth(const UnixPeer& other) const {
     return std::pair(_hasSentMessage, _lastHeard) <
            std::pair(other._hasSentMessage, other._lastHeard);
@@ -81,7 +80,7 @@ class UnixServiceListener final : public ServiceListener {
  private:
   using PeerPointer = std::shared_ptr<UnixPeer>;
 
-  /// Queues work that is dropped if the listener is gone by then.
+  /// Drops the work if the listener is gone by then.
   void queueWork(HostMainLoop::Work work) {
     _mainLoop.queueWork([alive = std::weak_ptr<bool>(_alive), work = std::move(work)] {
       if (!alive.expired()) {
@@ -101,7 +100,7 @@ class UnixServiceListener final : public ServiceListener {
     FileDescriptor socket = _socket.accept(error);
     if (!error.empty()) {
       tell("no peer can be accepted: " + error);
-      // It would fail again at once; the next peer that goes makes room.
+      // It would fail again at once, until another peer goes.
       _mainLoop.unwatch(_socket.descriptor());
     }
     if (!socket.isOpen()) {
@@ -170,7 +169,7 @@ class UnixServiceListener final : public ServiceListener {
       tell("a peer is dropped: " + std::string(why));
     }
     const int descriptor = peer.descriptor();
-    // Its queued messages may keep the object for a while; the connection ends now.
+    // Queued messages may keep the object for a while; end the connection now.
     shutdown(descriptor, SHUT_RDWR);
     _mainLoop.unwatch(descriptor);
     _peers.erase(descriptor);

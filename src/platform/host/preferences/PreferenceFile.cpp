@@ -121,7 +121,7 @@ bool PreferenceFile::writeChanges(std::string& error) {
     error = content.error;
     return false;
   }
-  // Compared as documents: unlike values, those also differ when only the kind of a number does.
+  // Compared as documents, which also differ when only the kind of a number does.
   std::string before;
   std::string document;
   if (!writePtree(content.values, before, error)) {
@@ -145,7 +145,7 @@ bool PreferenceFile::keepAside(std::string& error) const {
   constexpr int kMostInOneSecond = 1000;
   for (int number = 1; number <= kMostInOneSecond; ++number) {
     const std::string name = number == 1 ? aside : aside + '-' + std::to_string(number);
-    // A second name, which never replaces a file: at no moment is the domain's file missing.
+    // A second name never replaces a file, and the domain's file is never missing.
     if (link(_path.c_str(), name.c_str()) == 0) {
       _log.write(LogLevel::Error, _path + ": kept as " + name);
       return true;

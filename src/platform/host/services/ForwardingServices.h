@@ -32,7 +32,6 @@
 
 namespace vesprun {
 
-/// What is described, or else the live answer.
 template <typename T, typename Live>
 T describedOr(const std::optional<T>& described, Live live) {
   return described ? *described : live();

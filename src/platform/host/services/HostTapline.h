@@ -7,8 +7,7 @@
 
 namespace vesprun {
 
-/// The described reporting channels, in the order of their description. A reading is always the
-/// described value.
+/// The described channels, in order, each with a constant reading.
 class HostTapline final : public Tapline {
  public:
   explicit HostTapline(const std::vector<ChannelDescription>& channels) : _channels(channels) {}
