@@ -8,7 +8,6 @@
 #include <optional>
 #include <span>
 #include <string_view>
-#include <vector>
 
 #include "NANDInfo/StructuredLogState.h"
 #include "NANDInfo/controller/Controller.h"
@@ -48,27 +47,6 @@ constexpr std::array<ListType, 3> kListTypes{{
     {&nand_exporter_t::getDefectsListSelectors, LogFactoryDefectList, 1,
      "Defects list retrieval is not supported\n"},
 }};
-
-struct HandlerEntry {
-  nand_exporter_t::SelectorGetter getter;
-  ListHandler handler;
-  std::uint32_t kind;
-};
-
-std::vector<HandlerEntry> handlerList(const nand_exporter_t& exporter) {
-  std::vector<HandlerEntry> entries;
-  for (const ListType& type : kListTypes) {
-    const nand_exporter_t::SelectorGetter getter = exporter.*type.getter;
-    if (getter == nullptr) {
-      std::fputs(type.whenNotOffered, stderr);
-      continue;
-    }
-    for (std::uint32_t kind = 0; kind < type.kindCount; ++kind) {
-      entries.push_back({getter, type.handler, kind});
-    }
-  }
-  return entries;
-}
 
 void decideOnValidityList() {
   gCurrentUserWamp = 0.0;
@@ -146,17 +124,24 @@ bool DumpStorageStructuredLog(bool callersFlag) {
     std::fputs("failed to create dictionary", stderr);
     return false;
   }
+  for (const ListType& type : kListTypes) {
+    if (exporter.*type.getter == nullptr) {
+      std::fputs(type.whenNotOffered, stderr);
+    }
+  }
   bool result = true;
   int index = 0;
-  for (const HandlerEntry& entry : handlerList(exporter)) {
-    const TunnelSelector* selector = entry.getter();
-    const std::uint32_t flags = (callersFlag ? kCallersFlag : 0) | entry.kind << kKindShift;
-    if (selector == nullptr) {
-      result = false;
-    } else if (const TunnelBuffer list = fetchList(controller, *selector, flags, index)) {
-      result = entry.handler(list.bytes(list.size()), &*properties, exporter.name) && result;
+  for (const ListType& type : kListTypes) {
+    const std::uint32_t kinds = exporter.*type.getter != nullptr ? type.kindCount : 0;
+    for (std::uint32_t kind = 0; kind < kinds; ++kind, ++index) {
+      const TunnelSelector* selector = (exporter.*type.getter)();
+      const std::uint32_t flags = (callersFlag ? kCallersFlag : 0) | kind << kKindShift;
+      if (selector == nullptr) {
+        result = false;
+      } else if (const TunnelBuffer list = fetchList(controller, *selector, flags, index)) {
+        result = type.handler(list.bytes(list.size()), &*properties, exporter.name) && result;
+      }
     }
-    ++index;
   }
   return result;
 }

@@ -32,27 +32,21 @@ std::optional<PropertyDict> copyMagazineSnapshot(std::uint64_t hours) {
   return snapshot;
 }
 
-struct Selection {
-  bool accumulating;
-  bool instantaneous;
-
-  explicit Selection(std::uint32_t mode)
-      : accumulating(mode == 0 || mode == 2), instantaneous(mode == 1 || mode == 2) {}
-};
-
 void addFields(const PropertyDict& newest, const PropertyDict& old, bool asDeltas,
-               Selection selection, PropertyDict& result) {
+               std::uint32_t mode, PropertyDict& result) {
+  const bool accumulating = mode == 0 || mode == 2;
+  const bool instantaneous = mode == 1 || mode == 2;
   for (const auto& [name, value] : old) {
     const Number* newestNumber = newest.findNumber(name);
     const Number* oldNumber = value.number();
     if (newestNumber == nullptr || oldNumber == nullptr) {
       continue;
     }
-    if (selection.accumulating && PrivacyApprovedSMagNANDFTLCounters_Accum.contains(name)) {
+    if (accumulating && PrivacyApprovedSMagNANDFTLCounters_Accum.contains(name)) {
       const double then = oldNumber->asDouble();
       result.set(name, asDeltas ? newestNumber->asDouble() - then : then);
     }
-    if (selection.instantaneous && PrivacyApprovedSMagNANDFTLCounters_Dynamic.contains(name)) {
+    if (instantaneous && PrivacyApprovedSMagNANDFTLCounters_Dynamic.contains(name)) {
       result.set(name, value);
     }
   }
@@ -69,7 +63,7 @@ void addDeltas(const PropertyDict& newest, const PropertyDict& old, bool deltaWa
   const double deltaDays =
       (newestStamp->asDouble() - oldStamp->asDouble()) / static_cast<double>(kSecondsPerDay);
   result.set("HLT_SM_deltaDays", deltaDays);
-  addFields(newest, old, deltaWanted && deltaDays > 0, Selection(mode), result);
+  addFields(newest, old, deltaWanted && deltaDays > 0, mode, result);
 }
 
 /// Adds `erases` / (`end` - `begin`) if all three are known.

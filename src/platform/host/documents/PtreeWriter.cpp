@@ -80,9 +80,7 @@ class TreeWriter {
       return fail(kNestedTooDeeply);
     }
     indent();
-    _document += '<';
-    _document += name;
-    _document += empty ? "/>\n" : ">\n";
+    tag("<", name, empty ? "/>\n" : ">\n");
     ++_level;
     return true;
   }
@@ -91,10 +89,12 @@ class TreeWriter {
     --_level;
     if (!empty) {
       indent();
-      _document += "</";
-      _document += name;
-      _document += ">\n";
+      tag("</", name, ">\n");
     }
+  }
+
+  void tag(const char* start, std::string_view name, const char* end) {
+    _document.append(start).append(name).append(end);
   }
 
   void indent() { _document.append(_level, '\t'); }
@@ -104,9 +104,7 @@ class TreeWriter {
       return fail("the " + std::string(name) + ' ' + quotedText(text) +
                   " holds what XML cannot carry");
     }
-    _document += '<';
-    _document += name;
-    _document += '>';
+    tag("<", name, ">");
     while (true) {
       const std::size_t plain = text.find_first_of("&<>\r");
       _document += text.substr(0, plain);
@@ -118,9 +116,7 @@ class TreeWriter {
       _document += c == '&' ? "&amp;" : c == '<' ? "&lt;" : c == '>' ? "&gt;" : "&#13;";
       text.remove_prefix(plain + 1);
     }
-    _document += "</";
-    _document += name;
-    _document += ">\n";
+    tag("</", name, ">\n");
     return true;
   }
 
@@ -139,13 +135,9 @@ class TreeWriter {
     } else {
       last = std::to_chars(text, end, number.asUInt64()).ptr;
     }
-    _document += '<';
-    _document += name;
-    _document += '>';
+    tag("<", name, ">");
     _document.append(text, last);
-    _document += "</";
-    _document += name;
-    _document += ">\n";
+    tag("</", name, ">\n");
   }
 
   bool writeDate(const Date& date) {
