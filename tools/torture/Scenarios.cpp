@@ -332,7 +332,66 @@ std::vector<Case> neighbours(const Programs& programs, const fs::path& folder, s
   return cases;
 }
 
-/// A command that is all or nothing: after any fault its change is there whole or not at all.
+/// A `vespctl` command on a device; `judge` says what is wrong after a run with a fault.
+struct Command {
+  std::string name;
+  std::shared_ptr<Device> original;
+  std::string command;
+  std::vector<std::string> rest;
+  std::function<Faults(Device& device, const Outcome& outcome, bool killed)> judge;
+};
+
+Faults runCommand(const Command& command, const fs::path& folder, const Fault& fault,
+                  bool started) {
+  Device device(*command.original, folder);
+  const bool killed = fault.kind == Fault::Kind::Kill;
+  const Outcome outcome =
+      runTraced(device.controlCommand(command.command, command.rest), device.path(), fault);
+  Faults faults = judgeRun(outcome, killed, started, 1);
+  if (outcome.status == 1 && outcome.standardError.empty()) {
+    faults.emplace_back("it failed without a word");
+  }
+  return faults += command.judge(device, outcome, killed);
+}
+
+// Each call fails in one way or, when wanted, in all, and is the last one.
+std::vector<Case> casesOf(const Command& command, const fs::path& folder, std::uint32_t seed,
+                          bool full) {
+  Device device(*command.original, folder / "reference");
+  const Outcome reference =
+      runTraced(device.controlCommand(command.command, command.rest), device.path());
+  Faults wrong = reference.notDurable;
+  wrong += judgeRun(reference, false, true);
+  wrong += command.judge(device, reference, false);
+  if (!wrong.empty()) {
+    throw std::runtime_error(command.name + " without any fault: " + wrong.front());
+  }
+  const std::size_t own = firstOwnCall(reference.calls);
+  std::vector<Case> cases;
+  std::mt19937 random(seed);
+  for (std::size_t index = 0; index < reference.calls.size(); ++index) {
+    const int number = reference.calls[index].number;
+    const auto add = [&](const std::string& what, Fault fault) {
+      fault.call = index + 1;
+      const bool started = index >= own;
+      cases.push_back(
+          {command.name + ":" + what + ":" + nameOfCall(number) + ":" + std::to_string(index + 1),
+           [=](const fs::path& work) { return runCommand(command, work, fault, started); }});
+    };
+    const std::vector<int>& errors = fittingErrors(number);
+    const std::size_t one = errors.empty() ? 0 : random() % errors.size();
+    for (std::size_t each = 0; each < errors.size(); ++each) {
+      if (full || each == one) {
+        add(strerrorname_np(errors[each]),
+            {.kind = Fault::Kind::Error, .number = number, .error = errors[each]});
+      }
+    }
+    add("kill", {.kind = Fault::Kind::Kill});
+  }
+  return cases;
+}
+
+/// All lines or none, and never "done" without them.
 std::vector<Case> imports(const Programs& programs, const fs::path& folder, std::uint32_t seed,
                           bool full) {
   const auto original = std::make_shared<Device>(programs, folder / "imports");
@@ -343,49 +402,91 @@ std::vector<Case> imports(const Programs& programs, const fs::path& folder, std:
   }
   writeFile(original->path() + "/rows", rows);
   const std::vector<std::string> rest{"import", original->path() + "/rows"};
-  Device device(*original, folder / "imports-reference");
-  const Outcome reference = runTraced(device.controlCommand("counters", rest), device.path());
   const std::vector<std::string> before = original->look().counters;
+  Device device(*original, folder / "imported");
+  std::string output;
+  device.control("counters", rest, output);
   const std::vector<std::string> after = device.look().counters;
-  std::vector<Case> cases;
-  std::mt19937 random(seed);
-  const std::size_t own = firstOwnCall(reference.calls);
-  const auto judgeImport = [=](const fs::path& work, const Fault& fault) {
-    Device changed(*original, work);
-    const Outcome outcome =
-        runTraced(changed.controlCommand("counters", rest), changed.path(), fault);
-    Faults faults = judgeRun(outcome, fault.kind == Fault::Kind::Kill, fault.call > own, 1);
+  const auto judge = [=](Device& changed, const Outcome& outcome, bool /*killed*/) {
     const Sight sight = changed.look();
-    faults += sight.faults;
+    Faults faults = sight.faults;
     if (sight.counters != before && sight.counters != after) {
       faults.emplace_back("some lines are there and some are not");
     }
     if (outcome.status == 0 && sight.counters != after) {
       faults.emplace_back("it said done, and nothing is there");
     }
-    if (outcome.status > 0 && outcome.standardError.empty()) {
-      faults.emplace_back("it failed without a word");
+    return faults;
+  };
+  return casesOf({"import", original, "counters", rest, judge}, folder, seed, full);
+}
+
+/// Recorded files of a small machine that has counted for `hours`.
+void recordMachine(const fs::path& root, std::uint64_t hours) {
+  const std::string n = std::to_string(hours * 3600);
+  const std::string ticks = std::to_string(hours * 360000);
+  writeFile(root / "proc/sys/kernel/random/boot_id", "6f0c1e2d-0000-4000-8000-000000000001\n");
+  writeFile(root / "proc/uptime", n + ".00 " + n + ".00\n");
+  writeFile(root / "proc/stat", "cpu  " + ticks + " 0 " + ticks + " " + ticks + " 0 0 0 0 0 0\n" +
+                                    "ctxt " + n + "\nprocesses " + n + "\n");
+  writeFile(root / "proc/meminfo", "MemTotal: 9000000 kB\nMemAvailable: 4000000 kB\n");
+  writeFile(root / "proc/vmstat", "pgpgin " + n + "\npgpgout " + n + "\noom_kill 3\n");
+  writeFile(root / "proc/pressure/io",
+            "some avg10=0.00 avg60=0.00 avg300=0.00 total=" + n +
+                "000\nfull avg10=0.00 avg60=0.00 avg300=0.00 total=" + n + "000\n");
+  for (const char* disk : {"sda", "sdb"}) {
+    const fs::path block = root / "sys/block" / disk;
+    writeFile(block / "stat", n + " 0 " + n + " 1 " + n + " 0 " + n + " 1 0 " + n + " 2\n");
+    writeFile(block / "diskseq", "1\n");
+  }
+  const fs::path statistics = root / "sys/class/net/eth0/statistics";
+  for (const char* name : {"rx_bytes", "tx_bytes", "rx_packets", "tx_packets"}) {
+    writeFile(statistics / name, n + '\n');
+  }
+  writeFile(root / "sys/class/net/eth0/ifindex", "2\n");
+  writeFile(root / "sys/class/thermal/thermal_zone0/type", "cpu\n");
+  writeFile(root / "sys/class/thermal/thermal_zone0/temp", "41000\n");
+}
+
+/// Growth is counted once, whichever of three collections fails.
+std::vector<Case> collections(const Programs& programs, const fs::path& folder, std::uint32_t seed,
+                              bool full) {
+  const auto original = std::make_shared<Device>(programs, folder / "collections");
+  const auto stage = [=](int number) {
+    return (folder / ("machine-" + std::to_string(number))).string();
+  };
+  for (int number = 1; number <= 3; ++number) {
+    recordMachine(stage(number), static_cast<std::uint64_t>(number * number));
+  }
+  const auto collect = [=](Device& device, int number) {
+    Faults faults;
+    std::string output;
+    if (device.control("collect", {"--root", stage(number)}, output) != 0) {
+      faults.push_back("a collection failed: " + output);
     }
     return faults;
   };
-  for (std::size_t index = 0; index < reference.calls.size(); ++index) {
-    const int number = reference.calls[index].number;
-    const std::vector<int>& errors = fittingErrors(number);
-    const std::size_t one = errors.empty() ? 0 : random() % errors.size();
-    const std::string place = ":" + nameOfCall(number) + ":" + std::to_string(index + 1);
-    for (std::size_t each = 0; each < errors.size(); ++each) {
-      if (full || each == one) {
-        const Fault fault{
-            .kind = Fault::Kind::Error, .call = index + 1, .number = number, .error = errors[each]};
-        cases.push_back({std::string("import:") + strerrorname_np(errors[each]) + place,
-                         [=](const fs::path& work) { return judgeImport(work, fault); }});
-      }
-    }
-    const Fault fault{.kind = Fault::Kind::Kill, .call = index + 1};
-    cases.push_back(
-        {"import:kill" + place, [=](const fs::path& work) { return judgeImport(work, fault); }});
-  }
-  return cases;
+  const auto figures = [](const Sight& sight) {
+    std::vector<std::string> rows = sight.counters;
+    std::erase_if(rows, [](const std::string& row) {
+      return !row.starts_with("scalar") || row.find("\tlinux.") == std::string::npos;
+    });
+    return rows;
+  };
+  collect(*original, 1);
+  Device device(*original, folder / "collected");
+  collect(device, 2);
+  collect(device, 3);
+  const std::vector<std::string> expected = figures(device.look());
+  const auto judge = [=](Device& changed, const Outcome& /*outcome*/, bool /*killed*/) {
+    Faults faults = collect(changed, 3);
+    const Sight sight = changed.look();
+    faults += sight.faults;
+    faults += missingFrom(expected, figures(sight), "growth is not what it was");
+    faults += missingFrom(figures(sight), expected, "growth from nowhere");
+    return faults;
+  };
+  return casesOf({"collect", original, "collect", {"--root", stage(2)}, judge}, folder, seed, full);
 }
 
 std::string damaged(std::string content, const std::string& how, std::mt19937& random) {
@@ -508,6 +609,7 @@ std::vector<Scenario> scenarios() {
       {"the disk gets full during a daily run", fullDisk},
       {"others write during a daily run", neighbours},
       {"every call of an import fails or is its last", imports},
+      {"every call of a collection fails or is its last", collections},
       {"files are damaged", damages},
       {"the clock jumps through ten years", years},
   };

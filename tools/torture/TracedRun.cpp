@@ -133,7 +133,7 @@ std::string pathAt(pid_t process, std::uint64_t folder, std::uint64_t address) {
 }
 
 /// Which bytes and names would be lost if the power went now. Lines of `.jsonl` files are appended
-/// without waiting for the disk.
+/// without waiting for the disk, and the newest log number is only remembered to save a search.
 class Durability {
  public:
   explicit Durability(std::string folder) : _folder(std::move(folder)) {}
@@ -175,7 +175,8 @@ class Durability {
 
  private:
   bool counts(const std::string& path) const {
-    return path.starts_with(_folder + '/') && !path.ends_with(".jsonl");
+    return path.starts_with(_folder + '/') && !path.ends_with(".jsonl") &&
+           !path.ends_with("/.log-number");
   }
 
   std::string _folder;

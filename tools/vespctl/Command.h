@@ -63,6 +63,7 @@ void allowOneCommand(CLI::App& subject, bool needed = true);
 // Each in the file of its subject.
 void addDeviceCommands(CLI::App& vespctl);
 void addCounterCommands(CLI::App& vespctl);
+void addCollectCommand(CLI::App& vespctl);
 void addPreferenceCommands(CLI::App& vespctl);
 void addMessageCommands(CLI::App& vespctl);
 void addNandCommands(CLI::App& vespctl);
@@ -71,5 +72,6 @@ void addPtreeCommands(CLI::App& vespctl);
 void addFieldsCommand(CLI::App& vespctl);
 void addDecodeCommand(CLI::App& vespctl);
 void addExportCommand(CLI::App& vespctl);
+void addPruneCommand(CLI::App& vespctl);
 
 }  // namespace vesprun

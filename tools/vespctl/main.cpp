@@ -18,6 +18,7 @@ int runCommandLine(int argc, char** argv) {
                    "vespctl");
   addDeviceCommands(vespctl);
   addCounterCommands(vespctl);
+  addCollectCommand(vespctl);
   addPreferenceCommands(vespctl);
   addMessageCommands(vespctl);
   addNandCommands(vespctl);
@@ -26,6 +27,7 @@ int runCommandLine(int argc, char** argv) {
   addFieldsCommand(vespctl);
   addDecodeCommand(vespctl);
   addExportCommand(vespctl);
+  addPruneCommand(vespctl);
   allowOneCommand(vespctl);
   try {
     vespctl.parse(argc, argv);

@@ -5,12 +5,12 @@
 #include <vector>
 
 #include "Command.h"
+#include "collect/StarterWhitelist.h"
 #include "common/Calendar.h"
 #include "platform/host/counters/CounterLines.h"
 #include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeWriter.h"
-#include "platform/host/files/AtomicFile.h"
 #include "sample/SampleCounters.h"
 #include "sample/SampleData.h"
 #include "sample/SampleDescription.h"
@@ -18,19 +18,15 @@
 namespace vesprun {
 namespace {
 
-constexpr std::string_view kWhitelistFolder = "Library/Application Support/Tallybook";
-constexpr std::string_view kWhitelistFile = "Whitelist_Stagebox.ptree";
-
-void writeWhitelist(const DeviceDirectory& directory) {
+void writeSampleWhitelist(const DeviceDirectory& directory) {
   std::string document;
   std::string error;
   const std::optional<PropertyValue> whitelist =
       valueFromJsonText(sampleData().at("whitelist").dump(), error);
-  const auto folder = directory.makeFolder(kWhitelistFolder, error);
-  if (!folder || !whitelist || !writePtree(*whitelist, document, error) ||
-      !replaceFile(*folder + '/' + std::string(kWhitelistFile), document, error)) {
+  if (!whitelist || !writePtree(*whitelist, document, error)) {
     throw CommandFailure(error);
   }
+  writeWhitelist(directory, document);
 }
 
 /// The readings of one moment stand for a day, those of a burst for its hours.
@@ -83,7 +79,7 @@ Date sampleTime(Clock& clock) {
 
 void fillSampleDevice(const std::string& directory) {
   const std::unique_ptr<HostPlatform> device = openDevice(directory);
-  writeWhitelist(device->directory());
+  writeSampleWhitelist(device->directory());
   recordCounters(*device);
   describeSampleDevice(device->directory(), sampleTime(device->clock()));
 }

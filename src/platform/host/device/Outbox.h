@@ -26,7 +26,8 @@ class Outbox {
   bool append(const std::string& file, const PropertyDict& entries);
 
   /// Submits a log as `logs/NNNN-TYPE-NAME.EXTENSION`, numbered from 0001, and its header, if any.
-  /// The log appears last and complete, or not at all: false. No existing file is touched.
+  /// The log appears last and complete, or not at all: false. No existing file is touched. The
+  /// files' modification time is the device's.
   bool submitLog(std::string_view type, std::string_view name, const PropertyDict* header,
                  const Logsmith::LogWriter& writer);
 

@@ -4,6 +4,7 @@
 #include <string>
 #include <string_view>
 
+#include "common/Date.h"
 #include "platform/host/files/FileDescriptor.h"
 
 namespace vesprun {
@@ -24,6 +25,9 @@ class AtomicFile {
 
   /// False when the bytes cannot be written; `replace` and `addNew` then fail with the same reason.
   bool append(std::string_view bytes);
+
+  /// Instead of the moment of the last byte, where the file system can keep it.
+  void setModificationTime(const Date& time) { _modified = time; }
 
   /// Gives the document its name, replacing the file that has it. On failure the earlier file is
   /// still there, unless only making the new name durable failed.
@@ -50,9 +54,13 @@ class AtomicFile {
   std::string _unfinishedName;  ///< empty after the document got its own name
   std::string _pending;         ///< not yet written
   std::string _failure;         ///< the first failure of `append`
+  std::optional<Date> _modified;
 };
 
 /// Replaces the file at `path` with a whole document.
 bool replaceFile(const std::string& path, std::string_view content, std::string& error);
+
+/// Makes durable which names a folder has.
+bool flushFolder(const std::string& folder, std::string& error);
 
 }  // namespace vesprun
