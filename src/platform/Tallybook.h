@@ -22,7 +22,7 @@ class TBHistoryDistributionEnumerator {
 /// The rows of the counter database. Both queries deliver the rows from `minDay` to `maxDay`, both
 /// included, whose key begins with `keyPrefix`, by day and then by key (byte order). Setting `stop`
 /// ends the query after the row. Of a damaged database they deliver the rows and values before the
-/// damage, which the service reports in the system log.
+/// damage, which the service reports in the system log, and give false.
 class TBHistory {
  public:
   using ScalarRowHandler =
@@ -33,12 +33,11 @@ class TBHistory {
 
   virtual ~TBHistory() = default;
 
-  /// False when the database could not be read to its end.
   virtual bool scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
       std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
       const ScalarRowHandler& rowHandler) = 0;
 
-  virtual void distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+  virtual bool distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
       std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
       const DistributionRowHandler& rowHandler) = 0;
 };

@@ -24,6 +24,9 @@ class CommandFailure : public std::runtime_error {
 /// Throws `CommandFailure` when the directory cannot be used; so do the next two.
 std::unique_ptr<HostPlatform> openDevice(const std::string& directory);
 
+/// Without changing anything on the device; see `HostPlatform::openReadOnly`.
+std::unique_ptr<HostPlatform> openDeviceReadOnly(const std::string& directory, SystemLog& log);
+
 /// The directory alone, without its description.
 DeviceDirectory openDirectory(const std::string& directory);
 
@@ -72,6 +75,9 @@ void addPtreeCommands(CLI::App& vespctl);
 void addFieldsCommand(CLI::App& vespctl);
 void addDecodeCommand(CLI::App& vespctl);
 void addExportCommand(CLI::App& vespctl);
+void addPageCommand(CLI::App& vespctl);
+void addOutlookCommands(CLI::App& vespctl);
+void addWhitelistCommands(CLI::App& vespctl);
 void addPruneCommand(CLI::App& vespctl);
 
 }  // namespace vesprun

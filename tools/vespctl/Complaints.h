@@ -8,11 +8,13 @@
 
 namespace vesprun {
 
-/// Collects the errors that a service logs, for the command to report.
+/// Collects errors that a service logs, or messages down to another level, for the command to
+/// report. A message repeated at once counts once.
 class Complaints final : public SystemLog {
  public:
   /// `also`, unless null, gets all that is logged.
-  explicit Complaints(SystemLog* also = nullptr) : _also(also) {}
+  explicit Complaints(SystemLog* also = nullptr, LogLevel least = LogLevel::Error)
+      : _also(also), _least(least) {}
 
   bool keeps(LogLevel level) const override;
   void write(LogLevel level, std::string_view message) override;
@@ -26,6 +28,7 @@ class Complaints final : public SystemLog {
 
  private:
   SystemLog* _also;
+  LogLevel _least;
   std::vector<std::string> _messages;
 };
 

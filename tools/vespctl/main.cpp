@@ -27,6 +27,9 @@ int runCommandLine(int argc, char** argv) {
   addFieldsCommand(vespctl);
   addDecodeCommand(vespctl);
   addExportCommand(vespctl);
+  addPageCommand(vespctl);
+  addOutlookCommands(vespctl);
+  addWhitelistCommands(vespctl);
   addPruneCommand(vespctl);
   allowOneCommand(vespctl);
   try {

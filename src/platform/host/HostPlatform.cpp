@@ -25,16 +25,18 @@ namespace vesprun {
 // needs.
 struct HostPlatform::Services {
   Services(DeviceDirectory deviceDirectory, DeviceDescription deviceDescription,
-           ProcessTimeZone processTimeZone)
+           ProcessTimeZone processTimeZone, SystemLog* log)
       : directory(std::move(deviceDirectory)),
         description(std::move(deviceDescription)),
-        timeZone(std::move(processTimeZone)) {}
+        timeZone(std::move(processTimeZone)),
+        systemLog(log != nullptr ? *log : logFile) {}
 
   DeviceDirectory directory;
   DeviceDescription description;
   ProcessTimeZone timeZone;
   HostClock clock{description.clock};
-  HostSystemLog systemLog{directory, clock, description.logLevel};
+  HostSystemLog logFile{directory, clock, description.logLevel};
+  SystemLog& systemLog;
   Outbox outbox{directory, clock, systemLog};
   HostDailyWorkLock dailyWorkLock{directory,
                                   systemLog};  // freed when what follows has been written
@@ -97,6 +99,16 @@ HostPlatform::HostPlatform(std::unique_ptr<Services> services)
 HostPlatform::~HostPlatform() = default;
 
 std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, std::string& error) {
+  return open(path, nullptr, error);
+}
+
+std::unique_ptr<HostPlatform> HostPlatform::openReadOnly(const std::string& path, SystemLog& log,
+                                                         std::string& error) {
+  return open(path, &log, error);
+}
+
+std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, SystemLog* log,
+                                                 std::string& error) {
   std::optional<DeviceDirectory> directory = DeviceDirectory::open(path, error);
   if (!directory) {
     return nullptr;
@@ -119,8 +131,9 @@ std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, std::s
     error = file + ": timeZone: unknown time zone " + quotedText(*description.timeZone);
     return nullptr;
   }
-  auto services = std::make_unique<Services>(*std::move(directory), std::move(description),
-                                             std::move(timeZone));
+  auto services =
+      std::make_unique<Services>(log != nullptr ? directory->readOnly() : *std::move(directory),
+                                 std::move(description), std::move(timeZone), log);
   return std::unique_ptr<HostPlatform>(new HostPlatform(std::move(services)));
 }
 

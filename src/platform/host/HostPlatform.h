@@ -21,6 +21,11 @@ class HostPlatform : public Platform {
   /// the platform is destroyed.
   static std::unique_ptr<HostPlatform> open(const std::string& path, std::string& error);
 
+  /// The same without changing anything on the device, which need not be writable: changes of
+  /// preferences hold for this platform alone, and `log`, which outlives it, is the system log.
+  static std::unique_ptr<HostPlatform> openReadOnly(const std::string& path, SystemLog& log,
+                                                    std::string& error);
+
   ~HostPlatform();
 
   const DeviceDirectory& directory() const;
@@ -35,6 +40,10 @@ class HostPlatform : public Platform {
   struct Services;
 
   explicit HostPlatform(std::unique_ptr<Services> services);
+
+  /// Read-only with a `log`.
+  static std::unique_ptr<HostPlatform> open(const std::string& path, SystemLog* log,
+                                            std::string& error);
 
   std::unique_ptr<Services> _services;
 };

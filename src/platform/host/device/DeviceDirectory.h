@@ -12,6 +12,10 @@ class DeviceDirectory {
   /// Nothing, with a text in `error`, unless `path` is a folder.
   static std::optional<DeviceDirectory> open(const std::string& path, std::string& error);
 
+  /// The same folder, in which no service changes anything.
+  DeviceDirectory readOnly() const;
+  bool isReadOnly() const { return _isReadOnly; }
+
   /// Without a final slash.
   const std::string& path() const { return _path; }
 
@@ -19,13 +23,15 @@ class DeviceDirectory {
   std::string hostPath(std::string_view devicePath) const;
 
   /// The host path of a device folder, which is created with those above it if missing. Nothing,
-  /// with a text in `error`, on failure.
+  /// with a text in `error`, on failure. All writing into a folder begins here, so that a read-only
+  /// device need only refuse it here.
   std::optional<std::string> makeFolder(std::string_view devicePath, std::string& error) const;
 
  private:
   explicit DeviceDirectory(std::string path) : _path(std::move(path)) {}
 
   std::string _path;
+  bool _isReadOnly = false;
 };
 
 }  // namespace vesprun
