@@ -2,8 +2,7 @@
 
 namespace vesprun {
 
-/// True on a device with an internal build ("InternalBuild"). The platform is asked once; the
-/// answer holds until the process ends.
+/// True on an internal build ("InternalBuild"). The platform is asked once.
 bool TBIsInternalDevice();
 
 }  // namespace vesprun
