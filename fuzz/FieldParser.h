@@ -7,6 +7,7 @@
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/GenericParserCxt.h"
 #include "Require.h"
+#include "common/ProcessState.h"
 
 namespace vesprun {
 
@@ -16,7 +17,7 @@ template <typename Parser>
 int requireFieldsOf(Parser parse, const char* name, std::size_t width, const std::uint8_t* bytes,
                     std::size_t size) {
   const ExactCopy buffer(bytes, size);
-  forgetAPIErrorMessage();
+  ProcessState::startAfresh();
   GenericParserCxt ctx;
   const std::uint32_t taken = parse(ctx, buffer.span());
   require(taken == ctx.size(), "fields taken are fields appended");

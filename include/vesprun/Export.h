@@ -1,4 +1,4 @@
 #pragma once
 
-/// Marks what the shared library gives to other programs.
+/// Visible to users of the shared library.
 #define VESPRUN_EXPORT [[gnu::visibility("default")]]

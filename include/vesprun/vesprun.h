@@ -12,16 +12,15 @@
 #include "NANDInfo/VMFreezer.h"
 #include "NANDInfo/WhitelistedFieldSets.h"
 
-// The entry points of vesprun for other programs: the storage controller's statistics as
-// dictionaries, and the analytics events made of them.
+// Entry points for other programs: the storage controller's statistics as dictionaries, and the
+// analytics events made of them.
 //
-// A program opens one `Device` and calls the operations from one thread. None of them throws: what
-// fails leaves its text with `GetAPIErrorMessage`. Without an open device, or when memory runs out,
-// an operation returns its empty result: an empty dictionary, nothing, or false. Dictionaries that
-// are returned belong to the caller.
+// Open one `Device` and call from one thread. Nothing throws: failures leave their text with
+// `GetAPIErrorMessage`. Without an open device, or when memory runs out, the result is empty: an
+// empty dictionary, nothing, or false. The caller owns returned dictionaries.
 //
-// Every operation closes the connection that it opened to the storage controller and releases its
-// registry handles before it returns, but for `openORUConnection`.
+// Every operation closes its connection to the storage controller and releases its registry handles
+// before it returns, except `openORUConnection`.
 //
-// Values are header-only; a program is built with the same C++ library and the same version of
-// tsl::ordered_map as the shared library.
+// Values are header-only: build with the same C++ library and version of tsl::ordered_map as the
+// shared library.

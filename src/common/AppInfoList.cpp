@@ -11,21 +11,18 @@ namespace vesprun {
 namespace {
 
 std::int64_t appInteger(const PropertyDict& dict, std::string_view key) {
-  const PropertyValue* value = dict.find(key);
-  const Number* number = value != nullptr ? value->number() : nullptr;
+  const Number* number = dict.findNumber(key);
   return number != nullptr ? number->asInt64() : 0;
 }
 
 std::string appText(const PropertyDict& dict, std::string_view key) {
-  const PropertyValue* value = dict.find(key);
-  const std::string* text = value != nullptr ? value->string() : nullptr;
+  const std::string* text = dict.findString(key);
   return text != nullptr ? *text : "";
 }
 
 std::string appUUID(const PropertyDict& dict, std::string_view key) {
   constexpr std::size_t kLength = 16;
-  const PropertyValue* value = dict.find(key);
-  const Bytes* bytes = value != nullptr ? value->data() : nullptr;
+  const Bytes* bytes = dict.findData(key);
   if (bytes == nullptr || bytes->size() != kLength) {
     return "";
   }

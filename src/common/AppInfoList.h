@@ -6,16 +6,15 @@
 
 namespace vesprun {
 
-/// The actively used apps, in the order of a message's "app_data". For each a dictionary: "bundle",
-/// "version", "adamID" (64-bit), "arch" (64-bit) and "uuid" (upper case, 8-4-4-4-12). It is made
-/// when it is asked for, since a message of small elements would grow a hundredfold.
+/// The actively used apps in the order of a message's "app_data", each a dictionary: "bundle",
+/// "version", "adamID" (64-bit), "arch" (64-bit) and "uuid" (upper case, 8-4-4-4-12). Each is made
+/// on demand: a message of small elements would grow a hundredfold.
 ///
-/// An element that is not a dictionary is skipped. A field that is missing or of another type, and
-/// a "uuid" of other than 16 bytes, becomes the empty text, or 0. As everywhere in a message, a
-/// fraction counts as the integer that it truncates to.
+/// Elements that are not dictionaries are skipped. A field that is missing or of another type, or a
+/// "uuid" of other than 16 bytes, is the empty text or 0. A fraction is truncated.
 class AppInfoList {
  public:
-  /// `appData`, which must outlive the list, may be null or of another type than array: no apps.
+  /// `appData` must outlive the list; null and other types than arrays have no apps.
   explicit AppInfoList(const PropertyValue* appData)
       : _appData(appData != nullptr ? appData->array() : nullptr) {}
 

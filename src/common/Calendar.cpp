@@ -8,8 +8,8 @@
 namespace vesprun {
 namespace {
 
-// std::chrono's calendar ends at the year 32767, day numbers do not: it counts within one era of
-// 400 years, whose days are always as many.
+// std::chrono's calendar ends at the year 32767, day numbers do not: it counts within an era of 400
+// years, which all have the same number of days.
 constexpr std::int64_t kDaysPerEra = 146097;
 constexpr std::int64_t kYearsPerEra = 400;
 constexpr std::int64_t kLargestYear = 10'000'000;  // beyond every 32-bit day number
@@ -44,7 +44,7 @@ bool hasDateForm(std::string_view text) {
 }  // namespace
 
 double secondsBetween(const Date& earlier, const Date& later) {
-  // Subtracting as doubles never overflows; whole seconds of today's dates are exact.
+  // Doubles cannot overflow, and hold today's whole seconds exactly.
   const double seconds = static_cast<double>(later.seconds) - static_cast<double>(earlier.seconds);
   return seconds +
          (static_cast<double>(later.nanoseconds) - static_cast<double>(earlier.nanoseconds)) * 1e-9;

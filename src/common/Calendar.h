@@ -11,20 +11,20 @@ namespace vesprun {
 
 inline constexpr std::int64_t kSecondsPerDay = 86400;
 
-/// `later` − `earlier` in seconds, as a double.
+/// `later` − `earlier` in seconds.
 double secondsBetween(const Date& earlier, const Date& later);
 
-/// The first instant (UTC) of a day number. Defined for every 32-bit number.
+/// The first instant (UTC) of any 32-bit day number.
 Date startOfDay(std::int32_t daysSince1970);
 
-/// The day number (UTC) that `date` lies in, cut to the range of a signed 32-bit number.
+/// The day number (UTC), cut to 32 bits.
 std::int32_t daysSince1970(const Date& date);
 
-/// "2024-03-05T09:15:02Z", with a fraction of up to nine digits when there is one. Years have at
-/// least four digits and a sign only when negative.
+/// "2024-03-05T09:15:02Z", with up to nine digits of a fraction. Years have at least four digits
+/// and a sign only when negative.
 std::string dateText(const Date& date);
 
-/// Reads what `dateText` writes; nothing for any other text or for a date that does not exist.
+/// Reads the form of `dateText`; nothing for any other text or a date that does not exist.
 std::optional<Date> parseDateText(std::string_view text);
 
 }  // namespace vesprun

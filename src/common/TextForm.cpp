@@ -18,8 +18,8 @@ std::string decimalText(T value) {
   return {text, std::to_chars(text, text + sizeof text, value).ptr};
 }
 
-/// The fewest digits that read back to `value`, with an exponent only where plain digits would need
-/// leading or trailing zeros that say nothing.
+/// The fewest digits that read back to `value`; an exponent only where plain digits would pad with
+/// zeros.
 template <std::floating_point T>
 std::string shortestText(T value) {
   if (std::isnan(value)) {

@@ -9,19 +9,17 @@
 
 namespace vesprun {
 
-/// The text that stands for a value in log lines and labels ("%@"):
-/// - a string is itself;
-/// - an integer is decimal, a boolean "1" or "0";
-/// - a double or float is the shortest text that reads back to the same number, without a fraction
-///   when it has none ("10", "0.25", "1e+30"), and "inf", "-inf" or "nan";
-/// - a date is "2024-03-05 09:15:02 +0000";
-/// - data is "<0a1bff>";
-/// - an array is "(a, b)" and a dictionary "{key = value; key = value}", in order.
+/// The text of a value in log lines and labels ("%@"):
+/// - a string as it is, an integer in decimal, a boolean "1" or "0";
+/// - a fraction as the shortest text that reads back to it, without a fraction part if it has none
+///   ("10", "0.25", "1e+30"), or "inf", "-inf", "nan";
+/// - a date "2024-03-05 09:15:02 +0000", data "<0a1bff>";
+/// - an array "(a, b)", a dictionary "{key = value; key = value}", in order.
 std::string textForm(const PropertyValue& value);
 
 std::string textForm(const Number& number);
 
-/// The text form of a value that may be missing, which is "(null)" then.
+/// "(null)" for a missing value.
 std::string textFormOrNull(const std::optional<PropertyValue>& value);
 
 /// Two lowercase digits for each byte.

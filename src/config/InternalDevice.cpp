@@ -2,12 +2,14 @@
 
 #include <optional>
 
+#include "common/ProcessState.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
 namespace {
 
 std::optional<bool> gIsInternalDevice;
+const ProcessState kAnswerState([] { gIsInternalDevice.reset(); });
 
 }  // namespace
 
@@ -17,7 +19,5 @@ bool TBIsInternalDevice() {
   }
   return *gIsInternalDevice;
 }
-
-void forgetInternalDeviceAnswer() { gIsInternalDevice.reset(); }
 
 }  // namespace vesprun

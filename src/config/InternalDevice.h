@@ -2,11 +2,7 @@
 
 namespace vesprun {
 
-/// True on a device with an internal build ("InternalBuild"). The platform is asked once; the
-/// answer holds until the process ends.
+/// True on an internal build ("InternalBuild"). The platform is asked once.
 bool TBIsInternalDevice();
-
-/// Lets the next `TBIsInternalDevice` ask again, as in a new process. For tests.
-void forgetInternalDeviceAnswer();
 
 }  // namespace vesprun

@@ -8,11 +8,10 @@
 
 namespace vesprun {
 
-// What a whitelist's options dictionary asks for. Options with an entry of the wrong type cannot be
-// read, and their key must stay out of the log: no value may go out finer than was meant.
+// Options of whitelisted keys. If an entry has a wrong type, the key must stay out of the log: no
+// value may leave finer than was meant.
 
-/// How coarse a scalar is reported. Both are read as unsigned 64-bit integers, as `Number`
-/// converts; a boolean does not count as a number.
+/// How coarse a scalar is reported: unsigned 64-bit integers, converted as `Number` does.
 struct ScalarOptions {
   // The whitelist's names: of the lists of such keys and prefixes in a group, and of the options.
   static constexpr std::string_view kKeyList = "ScalarKeys";
@@ -23,7 +22,7 @@ struct ScalarOptions {
   std::optional<std::uint64_t> bucketInterval;     ///< "bucket_interval"
   std::optional<std::uint64_t> significantDigits;  ///< "sig_fig"
 
-  /// Nothing when an entry is there but not a number.
+  /// Nothing when an entry is not a number; booleans are not.
   static std::optional<ScalarOptions> read(const PropertyDict& options);
 
   bool operator==(const ScalarOptions&) const = default;
@@ -36,7 +35,7 @@ struct DistributionOptions {
 
   const PropertyArray* intervals = nullptr;  ///< "intervals", in the dictionary; null: absent
 
-  /// Nothing when "intervals" is there but not an array of numbers.
+  /// Nothing when "intervals" is not an array of numbers.
   static std::optional<DistributionOptions> read(const PropertyDict& options);
 
   /// Whether all values get the same bucket and label.

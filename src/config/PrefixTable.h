@@ -8,17 +8,16 @@
 
 namespace vesprun {
 
-/// Answers a key by the first prefix, in the order given, that it begins with; the empty prefix
-/// fits every key.
+/// Finds the first prefix, in the given order, with which a key begins; the empty one fits every
+/// key.
 ///
-/// The prefixes are sorted, and each knows the longest other one that it begins with. The longest
-/// prefix of a key is then the last one not above the key, or else one that this one begins with.
+/// The prefixes are sorted, and each knows the longest other one that it begins with. A key's
+/// longest prefix is then the last one not above the key, or one that this one begins with.
 class PrefixTable {
  public:
-  /// Different prefixes, whose texts must outlive the table; fewer than 2^32.
+  /// Fewer than 2^32 different prefixes, whose texts outlive the table.
   explicit PrefixTable(const std::vector<std::string_view>& prefixes = {});
 
-  /// The place of the first prefix in order with which `key` begins.
   std::optional<std::size_t> find(std::string_view key) const;
 
  private:

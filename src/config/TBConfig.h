@@ -19,33 +19,32 @@ struct PassedOverGroup {
   DecidedBy by;  ///< Key or Prefix
 };
 
-/// The whitelist: which counter keys the daily log may carry, and with which options.
+/// The whitelist: which counters the daily log may carry, and with which options.
 ///
-/// The file is a ptree document: a dictionary of groups, each a dictionary in which "ScalarKeys",
-/// "ScalarKeyPrefixes", "DistributionKeys" and "DistributionKeyPrefixes" are tables of key or
-/// prefix to options dictionary. The groups that count are taken in document order, and a key or
-/// prefix that is named again takes the later options in its earlier place.
+/// A ptree document: a dictionary of groups, each with the tables "ScalarKeys",
+/// "ScalarKeyPrefixes", "DistributionKeys" and "DistributionKeyPrefixes" from key or prefix to
+/// options. Groups are taken in document order; a key or prefix named again keeps its place and
+/// takes the later options.
 ///
-/// A group or table that is not a dictionary is skipped, with an error line that names it. A key or
-/// prefix whose options cannot be read is held back: no look-up answers it, not even on an internal
-/// device or through a prefix. Each table gets one error line for all of them, which names the
-/// first. A file above 256 MiB is not read.
+/// Groups and tables that are not dictionaries are skipped with an error line. A key or prefix with
+/// unreadable options is held back, even on an internal device or from a prefix; each table gets
+/// one error line, with the number of them and the first. A file above 256 MiB is not read.
 class TBConfig {
  public:
-  /// Reads the whitelist file. Null, with an error line in the system log, when it cannot be read
-  /// or parsed; so for `fromBytes`.
+  /// Null, with an error line, when the whitelist file cannot be read or parsed; so for
+  /// `fromBytes`.
   static std::unique_ptr<TBConfig> init();
   static std::unique_ptr<TBConfig> fromBytes(std::string_view bytes);
 
-  /// The options for a key, those of the exact key before those of the first prefix in table order;
-  /// null when the key must be left out. On an internal device a key that is named nowhere has
-  /// empty options. Valid as long as the configuration.
+  /// The options of the exact key, else of the first prefix in table order; null when the key must
+  /// be left out. An internal device has empty options for a key that is named nowhere. Valid as
+  /// long as the configuration.
   const ScalarOptions* configOptionsForScalarKey(std::string_view key) const;
   const DistributionOptions* configOptionsForDistributionKey(std::string_view key) const;
 
   // For both kinds, `ScalarOptions` and `DistributionOptions`:
 
-  /// The same with the reason, and without debug lines.
+  /// The same with the reason and without debug lines.
   template <typename Options>
   WhitelistDecision<Options> decide(std::string_view key) const;
 
@@ -54,7 +53,7 @@ class TBConfig {
   template <typename Options>
   std::vector<PassedOverGroup> groupsPassedOver(std::string_view key) const;
 
-  /// MD5 over the bytes of the whitelist file: 32 lowercase hexadecimal digits.
+  /// MD5 of the file: 32 lowercase hexadecimal digits.
   const std::string& configFileDigest() const { return _configFileDigest; }
 
  private:

@@ -6,19 +6,19 @@
 
 namespace vesprun {
 
-/// A named group of the whitelist document, which it lies in.
+/// A group of the whitelist document.
 struct WhitelistKeyGroup {
   enum class Standing { Taken, InternalDevicesOnly, DisabledByTasking };
 
-  /// Whether the group counts on this device: on an internal one every group does. On others
-  /// "InternalTesting" does not, nor a group whose preference in "com.quill.da" is there and false.
+  /// On an internal device every group counts. On others "InternalTesting" does not, nor a group
+  /// with a false preference in "com.quill.da".
   Standing standing(bool isInternalDevice) const;
 
   /// True for the group that counts on internal devices alone.
   bool isForInternalDevices() const { return name == "InternalTesting"; }
 
   const std::string& name;
-  const PropertyValue& lists;  ///< a dictionary, or else the group is to be skipped
+  const PropertyValue& lists;  ///< skipped unless it is a dictionary
 };
 
 }  // namespace vesprun

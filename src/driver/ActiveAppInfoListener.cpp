@@ -5,6 +5,7 @@
 #include <string_view>
 
 #include "common/AppInfoList.h"
+#include "common/ProcessState.h"
 #include "common/TextForm.h"
 #include "driver/DailyTasks.h"
 #include "platform/Guarded.h"
@@ -22,9 +23,13 @@ enum Operation : std::uint32_t { kLoggingStatus = 0, kDailyTasks = 1, kActiveApp
 
 std::atomic_flag gMessageGateClosed;  // for every operation but kActiveAppInfo
 
+const ProcessState kMessageState([] {
+  aaiRequested = false;
+  gMessageGateClosed.clear();
+});
+
 std::int64_t integerField(const PropertyDict& dict, std::string_view key) {
-  const PropertyValue* value = dict.find(key);
-  const Number* number = value != nullptr ? value->number() : nullptr;
+  const Number* number = dict.findNumber(key);
   return number != nullptr ? number->asInt64() : 0;
 }
 
@@ -78,11 +83,6 @@ void handleNewPeer(PeerConnection& peer) {
   peer.setMessageHandler(
       [](const PropertyValue& message) { runGuarded([&message] { handlePeerMessage(message); }); });
   peer.start();
-}
-
-void startActiveAppInfoAfresh() {
-  aaiRequested = false;
-  gMessageGateClosed.clear();
 }
 
 }  // namespace vesprun

@@ -47,7 +47,7 @@ void runListenerMode(double quietSeconds) {
     listener->start();
   }
   auto result = MainLoop::SliceResult::HandledEvent;
-  // A slice that fails has most likely used up its event, such as a message too large to be read.
+  // A failed slice has probably used up its event, such as a message too large to read.
   for (int failures = 0; result == MainLoop::SliceResult::HandledEvent && failures < kMostFailures;
        ++failures) {
     runGuarded([&] {

@@ -4,24 +4,23 @@
 
 namespace vesprun {
 
-/// The main loop of the listener mode ends after so many seconds without a message.
+/// The listener mode ends after so many seconds without a message.
 inline constexpr double kQuietSeconds = 10.0;
 
-/// The job of one process, on the installed platform. `commandLine` is the process's own, the
-/// program name first. Only the argument behind it counts:
+/// The job of a process on the installed platform. `commandLine` begins with the program name,
+/// without which nothing runs. Only the next argument counts:
 ///
 /// - none: `runListenerMode`;
 /// - "-d": the day check, without app info;
-/// - "-f", "-t": the daily tasks for yesterday, for today; the stored day is left alone;
-/// - any other: the system log says so, and nothing runs.
+/// - "-f", "-t": the daily tasks for yesterday or today; the stored day stays;
+/// - any other: a line in the system log.
 ///
-/// Without even a program name nothing runs. Failures are told in the system log; nothing is thrown
-/// and there is no result: the exit status of the job is always 0.
+/// Failures go to the system log; the job's exit status is always 0.
 void runDailyDriver(std::span<const char* const> commandLine) noexcept;
 
-/// Offers the service of the active-app-info messages and runs the main loop until a slice of
-/// `quietSeconds` has passed without an event. If app info was requested and never came, runs the
-/// day check without it. A service that cannot be offered changes nothing else.
+/// Offers the service for active-app-info messages and runs the main loop until `quietSeconds` pass
+/// without an event. Then runs the day check if requested app info never came. A service that
+/// cannot be offered changes nothing else.
 void runListenerMode(double quietSeconds = kQuietSeconds);
 
 }  // namespace vesprun

@@ -5,7 +5,8 @@
 #include "NANDInfo/CopyNANDInfo.h"
 #include "NANDInfo/VMFreezer.h"
 #include "NANDInfo/lists/StructuredLog.h"
-#include "driver/NANDInfoScalars.h"
+#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "common/TextForm.h"
 #include "platform/Guarded.h"
 #include "platform/Platform.h"
 #include "telemetry/DataUsage.h"
@@ -38,6 +39,24 @@ void logNANDInfo() {
 }
 
 }  // namespace
+
+void SetNANDInfoScalars(const PropertyDict& info) {
+  if (const PropertyValue* error = info.find("com.quill.NANDInfo.Error")) {
+    const PropertyValue* message = info.find(kNANDInfoErrorMessageKey);
+    logMessage(LogLevel::Default, "error reading nand info, error %s with message %s",
+               textForm(*error).c_str(),
+               message != nullptr ? textForm(*message).c_str() : "(null)");
+    return;
+  }
+  Tallybook& tallybook = platform().tallybook();
+  for (const auto& [key, value] : info) {
+    if (const Number* number = value.number()) {
+      tallybook.TBClientSetValueForScalarKey(key, number->asInt64());
+    } else if (const bool* boolean = value.boolean()) {
+      tallybook.TBClientSetValueForScalarKey(key, *boolean ? 1 : 0);
+    }
+  }
+}
 
 void LogDailyStorageAndDeviceStats() {
   runGuarded(logDiskUsage);

@@ -12,7 +12,7 @@
 namespace vesprun {
 namespace {
 
-/// Longer than a day's work takes; a holder that has stopped must not hold up the others for ever.
+/// Longer than a day's work takes; a stopped holder must not block the others for ever.
 constexpr double kLongestWaitForOthers = 300;
 
 bool isAlone() { return platform().dailyWorkLock().lock(kLongestWaitForOthers); }
@@ -40,9 +40,9 @@ void runTasks(std::int32_t day, const AppInfoList* appInfo) {
   runGuarded(checkpoint);
 }
 
-/// Whether the day's tasks are still to be run, for a process that keeps the others off.
+/// For a process that holds the lock.
 bool isStillDue(std::int32_t day) {
-  // Lets go of what was read before another process may have stored the day.
+  // Forgets what was read before another process may have stored the day.
   platform().preferences().LGSPreferencesSynchronize(kOwnDomain);
   return !isDoneFor(day);
 }

@@ -6,21 +6,20 @@
 
 namespace vesprun {
 
-/// The day before a day number, in 32 bits: before the smallest number comes the largest.
+/// In 32 bits: before the smallest number comes the largest.
 std::int32_t dayBefore(std::int32_t day);
 
-/// Runs the daily tasks for yesterday unless they have run for it, or for a later day, already;
-/// then stores yesterday as the day of the last run. A process that ends during the tasks leaves
-/// the stored day as it was, so that the next one runs them again. `appInfo` may be null: none.
+/// Runs the daily tasks for yesterday unless they have run for it or a later day, then stores
+/// yesterday as the day of the last run. A process that ends earlier leaves the stored day, so that
+/// the next one runs them again. `appInfo` may be null.
 ///
-/// Of several processes one does the work, and the others wait for it and find it done. One that
-/// has waited for minutes gives up; the system log then says so.
+/// One process does the work; the others wait and find it done. One that has waited for minutes
+/// gives up with a line in the system log.
 void runDayCheck(const AppInfoList* appInfo);
 
-/// Runs the daily tasks for a day, whether or not they have run for it, when no other process is
-/// at them (see `runDayCheck`). Every task is run, whatever the earlier ones did. `appInfo`, null
-/// for none, goes into the daily log. When this returns, the counters that the tasks wrote are
-/// durable.
+/// Runs the daily tasks for a day, whether or not they have run, unless another process is at them
+/// (see `runDayCheck`). Every task runs, whatever the earlier ones did. When this returns, their
+/// counters are durable. `appInfo` goes into the daily log and may be null.
 void runDailyTasks(std::int32_t day, const AppInfoList* appInfo);
 
 }  // namespace vesprun

@@ -36,7 +36,7 @@ void storeValue(std::string_view key, OptionalValue value) {
   platform().preferences().LGSPreferencesSetValue(key, std::move(value), kOwnDomain);
 }
 
-/// None when there is no such entry, or no dictionary to hold it.
+/// Nothing without a dictionary or the entry.
 OptionalValue entryOf(const OptionalValue& holder, std::string_view key) {
   const PropertyDict* dict = holder ? holder->dict() : nullptr;
   const PropertyValue* entry = dict != nullptr ? dict->find(key) : nullptr;
@@ -44,12 +44,11 @@ OptionalValue entryOf(const OptionalValue& holder, std::string_view key) {
 }
 
 std::optional<std::string_view> textEntry(const PropertyDict& record, std::string_view key) {
-  const PropertyValue* entry = record.find(key);
-  const std::string* text = entry != nullptr ? entry->string() : nullptr;
+  const std::string* text = record.findString(key);
   return text != nullptr ? std::optional<std::string_view>(*text) : std::nullopt;
 }
 
-/// One setting of a payload; what it lacks, or has in another type, is missing here.
+/// A setting of a payload; entries of a wrong type count as missing.
 struct TaskingRecord {
   explicit TaskingRecord(const PropertyValue& element) {
     if (const PropertyDict* record = element.dict()) {
@@ -122,7 +121,7 @@ void applyTasking(const OptionalValue& tasking, const OptionalValue& build, Doma
   changed.emplace(kOwnDomain);
 }
 
-/// The own domain, which says what was applied, comes last.
+/// The own domain last: it says what was applied.
 void synchronize(DomainSet changed) {
   platform().servicesClient().synchronizeAllUsers();
   const bool own = changed.erase(std::string(kOwnDomain)) != 0;
@@ -169,7 +168,7 @@ void syncTasking(const OptionalValue& build) {
   platform().notificationCenter().PostNotification("com.quill.da.tasking_changed");
 }
 
-/// A text that is the same for equal values, -0.0 and 0 too, and seldom so for others.
+/// Equal for equal values (-0.0 and 0 too), and seldom for others.
 std::string bucketOf(const PropertyValue& value) {
   if (const Number* number = value.number()) {
     return std::to_string(number->asDouble() + 0.0);

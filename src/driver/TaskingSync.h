@@ -2,20 +2,18 @@
 
 namespace vesprun {
 
-/// Records a change of the OS build, applies the scheduled tasking when it or the build is new,
-/// after undoing the one before it, and announces the disabled log types as events.
+/// Records a change of the OS build; when the scheduled tasking or the build is new, undoes the
+/// earlier tasking and applies this one; announces the disabled log types as events.
 ///
-/// A tasking is current when its identifier and the build it was applied under equal the stored
-/// ones as values; a build that is missing on both sides is the same. A value that is missing
-/// stands in the log lines as "(null)".
+/// A tasking is current when its identifier and its build equal the stored ones; a build missing on
+/// both sides is equal. The log shows a missing value as "(null)".
 ///
-/// The records of a payload are taken in their order, and what one lacks is missing in the call to
-/// the platform too: without "Value" the key is removed; a "Domain", "User" or "Key" that is
-/// missing or no text leads to an error line of the platform and to nothing else, as does a record
-/// that is no dictionary. A payload that is no array is stored as it is and has no records.
+/// Records are taken in order. Without "Value" the key is removed; a missing or non-text "Domain",
+/// "User" or "Key", or a record that is not a dictionary, leads to an error line of the platform
+/// and nothing else. A payload that is not an array is stored as it is and has no records.
 ///
-/// The mobile user's domains are written before the program's own, which tells what was applied: a
-/// run that is killed in between is made up for by the next.
+/// The mobile user's domains are written before the program's own, which says what was applied: the
+/// next run makes up for one that is killed in between.
 void syncTaskingAndOSChange();
 
 }  // namespace vesprun

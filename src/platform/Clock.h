@@ -13,8 +13,7 @@ class Clock {
 
   virtual Date now() = 0;
 
-  /// `date` in the device's time zone, as "yyyy-MM-dd HH:mm:ss Z": digits in the "en_US_POSIX"
-  /// locale, the zone as an offset such as +0100.
+  /// `date` in the device's time zone: "yyyy-MM-dd HH:mm:ss Z" with an offset such as +0100.
   virtual std::string localDateText(const Date& date) = 0;
 };
 

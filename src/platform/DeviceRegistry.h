@@ -15,24 +15,24 @@ using RegistryResult = std::uint32_t;
 
 inline constexpr RegistryResult kRegistrySuccess = 0;
 
-/// The device registry: a tree of driver objects, and the user-client connections to them. Every
-/// look-up of an object gives a handle of its own, even when the object was found before. Whoever
-/// is given a handle gives it back: objects with `DevRegObjectRelease`, connections with
-/// `DevRegServiceClose`. `RegistryObject` does so by itself.
+/// The device registry: a tree of driver objects, and the user-client connections to them. Each
+/// look-up gives a new handle, even for an object that was found before. The caller returns objects
+/// with `DevRegObjectRelease` (or lets `RegistryObject` do it) and connections with
+/// `DevRegServiceClose`.
 class DeviceRegistry {
  public:
   enum class SearchDirection { Parents, Children };
 
   virtual ~DeviceRegistry() = default;
 
-  /// The first service of the class, or of one that conforms to it, that can be matched. 0: none.
+  /// The first service that can be matched and is of the class, or of one that conforms to it; else
+  /// 0.
   virtual RegistryHandle DevRegServiceGetMatchingService(const std::string& className) = 0;
 
-  /// The root of the registry, which stands above every entry. 0 when it cannot be had.
+  /// The root of the registry; 0 when there is none.
   virtual RegistryHandle DevRegRegistryGetRootEntry() = 0;
 
-  /// An iterator over everything below an entry in the service plane, parents before their
-  /// children. 0 when it cannot be made.
+  /// An iterator over everything below an entry in the service plane, parents first; 0 on failure.
   virtual RegistryHandle DevRegRegistryEntryCreateIterator(RegistryHandle entry) = 0;
 
   /// The next object of an iterator; 0 at its end.
@@ -41,30 +41,30 @@ class DeviceRegistry {
   /// Is the object of the class, or of one that conforms to it?
   virtual bool DevRegObjectConformsTo(RegistryHandle object, const std::string& className) = 0;
 
-  /// Gives a handle back. Nothing happens for 0.
+  /// Returns a handle. Nothing happens for 0.
   virtual void DevRegObjectRelease(RegistryHandle object) = 0;
 
-  /// A property of the entry itself, else of the nearest one above it or of the first one below it
-  /// in the service plane.
+  /// A property of the entry, else of the nearest one above it or the first one below it in the
+  /// service plane.
   virtual std::optional<PropertyValue> DevRegRegistryEntrySearchProperty(
       RegistryHandle entry, const std::string& key, SearchDirection direction) = 0;
 
   /// Opens a user client of type 0 for this process. On failure `connection` is 0.
   virtual RegistryResult DevRegServiceOpen(RegistryHandle service, RegistryHandle& connection) = 0;
 
-  /// Closes a connection; it is gone whatever the result. Closing 0 is an error without an effect.
+  /// Closes a connection, which is gone whatever the result. For 0: an error, and nothing happens.
   virtual RegistryResult DevRegServiceClose(RegistryHandle connection) = 0;
 
-  /// Calls a method with a structure in and a structure out (either may be empty). On success
-  /// `outputLength` becomes the length that the driver reports, which may differ from the number of
-  /// bytes it wrote into `output`; it never writes past its end. Untouched on failure.
+  /// Calls a method with a structure in and a structure out; either may be empty. On success
+  /// `outputLength` is the length that the driver reports, which may differ from what it wrote; it
+  /// never writes past `output`. On failure `outputLength` is untouched.
   virtual RegistryResult DevRegConnectCallStructMethod(RegistryHandle connection,
                                                        std::uint32_t method,
                                                        std::span<const std::uint8_t> input,
                                                        std::span<std::uint8_t> output,
                                                        std::uint64_t& outputLength) = 0;
 
-  /// Calls a method with one scalar in and one scalar out, which is untouched on failure.
+  /// Calls a method with one scalar in and one out; `output` is untouched on failure.
   virtual RegistryResult DevRegConnectCallScalarMethod(RegistryHandle connection,
                                                        std::uint32_t method, std::uint64_t input,
                                                        std::uint64_t& output) = 0;

@@ -4,12 +4,12 @@
 
 namespace vesprun {
 
-/// The values that every diagnostic log has in its header.
+/// The header values of every diagnostic log.
 class DiagnosticHeader {
  public:
   virtual ~DiagnosticHeader() = default;
 
-  /// The identifier of this device, with a word of what it is in front when `withDescription`.
+  /// The device's identifier; `withDescription` puts a word before it that says what it identifies.
   virtual std::string GetSysIDWithDescription(bool withDescription) = 0;
 
   virtual std::string GetHardwareModel() = 0;

@@ -7,23 +7,21 @@
 
 namespace vesprun {
 
-/// The platform's codes of the kinds of number that are read from memory.
+/// The platform's codes for kinds of number in memory.
 enum class PVNumberType : std::uint32_t { Int8 = 1, Int64 = 4, Int = 9, Double = 13 };
 
 /// The value under `key`, or the 32-bit number 0 when there is none.
 PropertyValue GetNumberFromDictionarySafe(const PropertyDict& dict, std::string_view key);
 
-/// Stores under `key` the number of kind `kind` that lies at `value`, aligned or not, replacing any
-/// earlier value. No number can be made of a null `value` or of another kind: that is logged, at
-/// level error, and the dictionary stays as it is.
+/// Stores under `key` the number of that kind at `value`, aligned or not. A null `value` or an
+/// unknown kind is logged at level error, and the dictionary stays as it is.
 void setNumberValueForType(PropertyDict& dict, std::string_view key, const void* value,
                            PVNumberType kind);
 
-/// The same, at the end of an array.
+/// The same, appended to an array.
 void appendNumberValueForType(PropertyArray& array, const void* value, PVNumberType kind);
 
-/// Stores `value` under `key` in `destination`. Shaped for a walk over another dictionary's
-/// entries.
+/// Stores `value` under `key`, for a walk over another dictionary's entries.
 void CopyDictionary(std::string_view key, const PropertyValue& value, PropertyDict& destination);
 
 }  // namespace vesprun

@@ -20,8 +20,9 @@ class EventHub {
   /// True when the service wants the event.
   virtual bool EventHubIsEventUsed(std::string_view event) = 0;
 
-  /// Offers an event. `build` is called, before this returns, only when the service wants the event
-  /// and can send. True when the service took the offer (also when it does not want the event).
+  /// Offers an event. `build` is called before this returns, and only when the service wants the
+  /// event and can send. True when the service took the offer, even of an event that it does not
+  /// want.
   virtual bool EventHubSendEventLazy(std::string_view event, const PayloadBuilder& build) = 0;
 };
 

@@ -10,7 +10,7 @@ namespace vesprun {
 struct FileSystemStatistics {
   std::uint32_t blockSize;        ///< bytes
   std::uint64_t blocks;           ///< all of them
-  std::uint64_t availableBlocks;  ///< those that a user without privileges can still fill
+  std::uint64_t availableBlocks;  ///< left for users without privileges
 };
 
 /// The device's files, by absolute path on the device.
@@ -18,13 +18,13 @@ class FileSystem {
  public:
   virtual ~FileSystem() = default;
 
-  /// The whole content; nothing when the file is missing or cannot be read.
+  /// Nothing when the file is missing or cannot be read.
   virtual std::optional<std::string> readFile(const std::string& path) = 0;
 
-  /// The size in bytes (`stat`); nothing when the file cannot be examined.
+  /// In bytes; nothing when the file cannot be examined.
   virtual std::optional<std::uint64_t> fileSize(const std::string& path) = 0;
 
-  /// The file system that a path lies on; nothing when it cannot be measured.
+  /// The file system of a path; nothing when it cannot be measured.
   virtual std::optional<FileSystemStatistics> statfs(const std::string& path) = 0;
 };
 

@@ -1,23 +1,30 @@
 #pragma once
 
 #include <exception>
+#include <string>
 
-#include "platform/SystemLog.h"
+#include "platform/Platform.h"
 
 namespace vesprun {
 
-/// Runs a step and logs what it throws: the guard of a job that must go on whatever happens, such
-/// as memory running out.
-template <typename Step>
-void runGuarded(Step step) noexcept {
+/// Runs `work` and logs what it throws as "WHAT: ...": for destructors and threads, where an
+/// exception would end the process.
+template <typename Work>
+void runGuarded(SystemLog& log, const char* what, const Work& work) noexcept {
   try {
     try {
-      step();
+      work();
     } catch (const std::exception& failure) {
-      logMessage(LogLevel::Error, "unexpected failure: %s", failure.what());
+      log.write(LogLevel::Error, std::string(what) + ": " + failure.what());
     }
   } catch (...) {  // not even the log can be written
   }
+}
+
+/// For a job that must go on even when memory runs out.
+template <typename Step>
+void runGuarded(const Step& step) noexcept {
+  runGuarded(platform().systemLog(), "unexpected failure", step);
 }
 
 }  // namespace vesprun

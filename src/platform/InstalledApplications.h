@@ -14,7 +14,7 @@ class InstalledApplications {
 
   virtual ~InstalledApplications() = default;
 
-  /// Visits every installed application bundle once (the platform's bundle-type code 1).
+  /// Visits every installed bundle once (the platform's bundle-type code 1).
   virtual void EnumerateInstalledBundles(const Visitor& visitor) = 0;
 };
 

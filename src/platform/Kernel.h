@@ -15,36 +15,35 @@ struct TickRatio {
   std::uint32_t denominator;
 };
 
-/// What the kernel tells of itself.
+/// The kernel's own figures.
 class Kernel {
  public:
   virtual ~Kernel() = default;
 
-  /// Reads the variable `name` into `buffer`. On success returns 0 and sets `length` to the bytes
-  /// written. Otherwise returns the system error number (never 0), and `buffer` is untouched. A
-  /// variable whose size differs from the buffer's is not read, but for text, which must fit with
-  /// its final NUL.
+  /// Reads a variable into `buffer`. 0 on success, with the bytes written in `length`; otherwise a
+  /// system error number, and `buffer` is untouched. The variable must be of the buffer's size;
+  /// text must fit with its final NUL.
   ///
-  /// "kern.next_ecc_event" (72 bytes) is a queue: each successful read takes one event out of it.
-  /// An empty queue is error 2. Where the platform can keep an event, one that was read and not
-  /// acknowledged is in the queue again when the process has ended.
+  /// "kern.next_ecc_event" (72 bytes) is a queue: each read takes one event, and an empty queue is
+  /// error 2. Where the platform can keep events, one that was read and not acknowledged is in the
+  /// queue again after the process.
   virtual int sysctlbyname(const std::string& name, std::span<std::uint8_t> buffer,
                            std::size_t& length) = 0;
 
-  /// Lets go of the ECC event that was read last. False when it will be read again.
+  /// Removes the ECC event that was read last. False when it will be read again.
   virtual bool acknowledgeECCEvent() = 0;
 
   /// Bytes of a memory page.
   virtual std::uint64_t pageSize() = 0;
 
-  /// A counter that rises steadily while the system is awake.
+  /// Rises while the system is awake.
   virtual std::uint64_t monotonicTicks() = 0;
 
-  /// Nothing when the kernel does not tell.
+  /// Nothing when it is unknown.
   virtual std::optional<TickRatio> tickRatio() = 0;
 
-  /// Captures a snapshot of the kernel: typed items, one behind the other. `captureFlags` says what
-  /// it is to hold. Nothing when it cannot be had.
+  /// A snapshot of the kernel as a row of typed items, with the content that `captureFlags` asks
+  /// for; nothing on failure.
   virtual std::optional<Bytes> captureSnapshot(std::uint32_t captureFlags) = 0;
 };
 

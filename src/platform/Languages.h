@@ -11,17 +11,17 @@ class Languages {
  public:
   virtual ~Languages() = default;
 
-  /// The user's languages, the most wanted first.
+  /// By the user's preference, most wanted first.
   virtual std::vector<std::string> preferredLanguages() = 0;
 
   /// The languages that the system is localized for.
   virtual std::vector<std::string> systemLocalizations() = 0;
 
-  /// Those of `available` that serve a user with these preferences best, the best first.
+  /// The best of `available` for a user with these preferences, best first.
   virtual std::vector<std::string> bestLocalizations(const std::vector<std::string>& available,
                                                      const std::vector<std::string>& preferred) = 0;
 
-  /// The country code of the current locale; nothing when there is no locale or it names none.
+  /// The country code of the current locale, if it names one.
   virtual std::optional<std::string> localeCountryCode() = 0;
 };
 

@@ -9,12 +9,12 @@
 
 namespace vesprun {
 
-/// The file of a log under submission. It becomes visible, complete, when the writer has returned.
+/// The file of a log under submission; it appears, complete, when its writer has returned.
 class LogFileHandle {
  public:
   virtual ~LogFileHandle() = default;
 
-  /// Appends the bytes. False when they could not be written; the submission then fails.
+  /// False when the bytes could not be written; the submission then fails.
   virtual bool write(std::string_view bytes) = 0;
 };
 
@@ -28,21 +28,21 @@ class Logsmith {
   /// True when the user allows diagnostic logs to be submitted.
   virtual bool DiagnosticLogSubmissionEnabled() = 0;
 
-  /// Creates a log file, has `writer` fill it once, and hands it to submission. `header` may be
-  /// null. False when the service refuses the log or its file could not be written: no log appears.
+  /// Has `writer` fill a new log file and submits it. `header` may be null. False, and no log
+  /// appears, when the service refuses it or the file could not be written.
   virtual bool LGSWriteLogForSubmission(std::string_view logType, std::string_view logName,
                                         const PropertyDict* header, const LogWriter& writer) = 0;
 
-  /// The text that names the running OS version.
+  /// The name of the running OS version.
   virtual std::string LGSOSVersion() = 0;
 
-  /// Tells of the running OS; "ProductBuildVersion", a string, identifies its build.
+  /// Describes the running OS; "ProductBuildVersion", a string, identifies its build.
   virtual PropertyDict CopySystemVersionDictionary() = 0;
 
-  /// Records one structured-data log record under a type code. False when it could not be kept.
+  /// Records structured data under a type code. False when it could not be kept.
   virtual bool FLLogStructuredData(std::int32_t type, const PropertyDict& record) = 0;
 
-  /// Housekeeping of old structured-data logs and of service-plan logs.
+  /// Clears up old structured-data logs and service-plan logs.
   virtual void FLDumpAllOldStructuredDataLogs() = 0;
   virtual void rollTendmarkLogs() = 0;
 };

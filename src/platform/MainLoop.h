@@ -9,8 +9,7 @@ class MainLoop {
 
   virtual ~MainLoop() = default;
 
-  /// Waits until one event (a delivered message) has been handled or `seconds` have passed without
-  /// one, and tells which.
+  /// Waits for one event (a delivered message), `seconds` at most.
   virtual SliceResult runMainLoopSlice(double seconds) = 0;
 };
 

@@ -13,13 +13,13 @@ namespace vesprun {
 /// The endpoint that offers the usage feed.
 inline constexpr std::string_view kUsageServiceEndpoint = "com.quill.murmur.usage";
 
-/// The entry of a usage record that holds the date from which its counters count.
+/// The entry of a usage record with the date since which its counters count.
 inline constexpr std::string_view kUsageSinceKey = "since";
 
-/// What the names of a usage query are.
+/// The kind of name in a usage query.
 enum class UsageNameKind { Process, Bundle };
 
-/// The connection to a usage service that feeds are made on.
+/// A connection to a usage service.
 class UsageWorkspace {
  public:
   virtual ~UsageWorkspace() = default;
@@ -28,27 +28,24 @@ class UsageWorkspace {
 /// Network usage by process.
 class UsageFeed {
  public:
-  /// Given the usage records, dictionaries as a rule, or null when the reply is missing. The array
-  /// is valid during the call.
+  /// Called with the usage records, usually dictionaries, or null when the reply is missing. The
+  /// array lives as long as the call.
   using ReplyHandler = std::function<void(const PropertyArray* records)>;
 
   virtual ~UsageFeed() = default;
 
-  /// Asks for what the named processes (none: all of them) have sent and received so far, and
-  /// returns at once. `reply` is called once, on a thread of the feed, at any later time or never;
-  /// it is destroyed there too.
+  /// Asks for the usage so far of the named processes (none: all), and returns at once. `reply` is
+  /// called once, later or never, on a thread of the feed, where it is also destroyed.
   virtual void usageToDateForNameKindReply(const std::set<std::string>& names, UsageNameKind kind,
                                            ReplyHandler reply) = 0;
 };
 
 /// The platform's usage feed.
 ///
-/// A reply may come while the process ends. The platform therefore ends this service before any
-/// other: it waits for a handler that is running, and drops the handlers that are still to be
-/// called. A handler is safe when it uses only services that may be called from any thread
-/// (`Tallybook`, `Preferences`, `PtreeSerialization`,
-/// `SystemLog`), by references that it was made with: which platform
-/// is installed may change before it runs.
+/// A reply may come while the process ends. The platform therefore ends this service first: it
+/// waits for a running handler and drops the others. A handler may use only services that are safe
+/// from any thread (`Tallybook`, `Preferences`, `PtreeSerialization`, `SystemLog`), by references
+/// taken before: another platform may be installed by then.
 class Murmur {
  public:
   virtual ~Murmur() = default;

@@ -17,7 +17,7 @@ class Orrery {
  public:
   virtual ~Orrery() = default;
 
-  /// The answer to a question such as "DiskUsage"; nothing when the platform has none.
+  /// The answer to a question such as "DiskUsage", if the platform has one.
   virtual std::optional<PropertyValue> OrreryCopyAnswer(std::string_view question) = 0;
 
   /// True when the answer is the boolean true.

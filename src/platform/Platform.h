@@ -30,47 +30,54 @@
 
 namespace vesprun {
 
-/// Gathers the services of the platform that the program runs on. A service may be made when it is
-/// first asked for, and lives as long as the platform.
-class Platform {
- public:
-  virtual ~Platform() = default;
+/// The services of the running platform: `platform().clock()` is the clock.
+struct Platform {
+  /// The object that offers a service, which must outlive the platform.
+  template <typename T>
+  class Service {
+   public:
+    Service(T& service) : _service(&service) {}  // NOLINT(google-explicit-constructor)
+    T& operator()() const { return *_service; }
 
-  virtual Clock& clock() = 0;
-  virtual DailyWorkLock& dailyWorkLock() = 0;
-  virtual DeviceRegistry& deviceRegistry() = 0;
-  virtual DiagnosticHeader& diagnosticHeader() = 0;
-  virtual EventHub& eventHub() = 0;
-  virtual FileSystem& fileSystem() = 0;
-  virtual InstalledApplications& installedApplications() = 0;
-  virtual Kernel& kernel() = 0;
-  virtual Languages& languages() = 0;
-  virtual Logsmith& logsmith() = 0;
-  virtual MainLoop& mainLoop() = 0;
-  virtual MessageDigest& messageDigest() = 0;
-  virtual MessageService& messageService() = 0;
-  virtual Murmur& murmur() = 0;
-  virtual NotificationCenter& notificationCenter() = 0;
-  virtual Orrery& orrery() = 0;
-  virtual Preferences& preferences() = 0;
-  virtual ProcessInformation& processInformation() = 0;
-  virtual PtreeSerialization& ptreeSerialization() = 0;
-  virtual Reclaimer& reclaimer() = 0;
-  virtual LGSServicesClient& servicesClient() = 0;
-  virtual SupportLibrary& supportLibrary() = 0;
-  virtual LGSSystemConfiguration& systemConfiguration() = 0;
-  virtual SystemLog& systemLog() = 0;
-  virtual Tallybook& tallybook() = 0;
-  virtual UserDefaults& userDefaults() = 0;
-  virtual Tapline& tapline() = 0;
+   private:
+    T* _service;
+  };
+
+  Service<Clock> clock;
+  Service<DailyWorkLock> dailyWorkLock;
+  Service<DeviceRegistry> deviceRegistry;
+  Service<DiagnosticHeader> diagnosticHeader;
+  Service<EventHub> eventHub;
+  Service<FileSystem> fileSystem;
+  Service<InstalledApplications> installedApplications;
+  Service<Kernel> kernel;
+  Service<Languages> languages;
+  Service<Logsmith> logsmith;
+  Service<MainLoop> mainLoop;
+  Service<MessageDigest> messageDigest;
+  Service<MessageService> messageService;
+  Service<Murmur> murmur;
+  Service<NotificationCenter> notificationCenter;
+  Service<Orrery> orrery;
+  Service<Preferences> preferences;
+  Service<ProcessInformation> processInformation;
+  Service<PtreeSerialization> ptreeSerialization;
+  Service<Reclaimer> reclaimer;
+  Service<LGSServicesClient> servicesClient;
+  Service<SupportLibrary> supportLibrary;
+  Service<LGSSystemConfiguration> systemConfiguration;
+  Service<SystemLog> systemLog;
+  Service<Tallybook> tallybook;
+  Service<UserDefaults> userDefaults;
+  Service<Tapline> tapline;
 };
 
 bool platformIsInstalled();
 
-/// The installed platform. Without one the process ends, with a line on the standard error stream.
+/// Without an installed platform the process ends with a line on standard error.
 Platform& platform();
 
-/// Installs a platform for as long as it lives; a process has exactly one at a time.
+/// Installs a platform as long as it lives. A process has one at a time.
 class InstalledPlatform {
  public:
   explicit InstalledPlatform(Platform& installed);

@@ -7,7 +7,7 @@
 
 namespace vesprun {
 
-/// Owns a handle of a registry object, and gives it back to the installed platform's registry.
+/// Owns a handle and returns it to the installed platform's registry.
 class RegistryObject {
  public:
   explicit RegistryObject(RegistryHandle handle = 0) : _handle(handle) {}
@@ -24,7 +24,7 @@ class RegistryObject {
 
   explicit operator bool() const { return _handle != 0; }
   RegistryHandle get() const { return _handle; }
-  /// The handle, for a caller that gives it back itself.
+  /// Passes the handle to a caller who returns it.
   RegistryHandle take() { return std::exchange(_handle, 0); }
 
  private:

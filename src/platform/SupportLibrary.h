@@ -12,8 +12,7 @@ class SupportLibrary {
   /// False when the library cannot be loaded.
   virtual bool load() = 0;
 
-  /// True when the loaded library offers the named function. What it does is the same operation
-  /// of `Preferences`.
+  /// True when the loaded library has the function; `Preferences` does its work.
   virtual bool offers(std::string_view symbol) = 0;
 };
 

@@ -8,28 +8,28 @@
 
 namespace vesprun {
 
-/// The diagnostics service's own configuration: one dictionary of values for each domain. A change
-/// is seen by this process at once.
+/// The diagnostics service's own configuration, a dictionary for each domain. This process sees a
+/// change at once.
 ///
-/// A domain may be named by somebody else's data. The empty name, which also stands for a missing
-/// one, and any other that cannot be a domain's are refused with an error in the system log.
+/// A domain may come from foreign data. An empty (or missing) and an impossible name are refused
+/// with an error in the system log.
 class LGSSystemConfiguration {
  public:
   virtual ~LGSSystemConfiguration() = default;
 
-  /// The configured value, or none. `options` is 0: no option is in use.
+  /// `options` is 0: none is in use.
   virtual std::optional<PropertyValue> getPrefsKeyForDomainWithOptions(std::string_view key,
                                                                        std::string_view domain,
                                                                        std::uint32_t options) = 0;
 
-  /// Sets `value`, or removes the key when there is none. With `sync` the domain's changes are
-  /// durable when this returns, else when the domain is next written or at the latest when the
-  /// process ends. A missing `key` is refused like a bad domain.
+  /// Sets a value, or removes the key when there is none. With `sync` the domain is durable when
+  /// this returns, else when it is next written or the process ends. A missing key is refused like
+  /// a bad domain.
   virtual void setPrefsKeyValueForDomainWithSync(std::optional<std::string_view> key,
                                                  std::optional<PropertyValue> value,
                                                  std::string_view domain, bool sync) = 0;
 
-  /// The log types that are disabled unless the user's preferences say otherwise, in order.
+  /// Log types that are disabled unless the user's preferences say otherwise, in order.
   virtual PropertyArray getLogBlacklist() = 0;
 };
 

@@ -7,37 +7,22 @@
 
 namespace vesprun {
 
-/// From the gravest to the least; a log that keeps one level keeps all graver ones.
+/// Gravest first; a log that keeps one level keeps all graver ones.
 enum class LogLevel : std::uint8_t { Error, Default, Notice, Info, Debug };
 
-/// The platform's system log. Writing never fails as far as the caller can tell, and is possible
-/// from any thread.
+/// The system log. Writing never fails for the caller and is safe from any thread.
 class SystemLog {
  public:
   virtual ~SystemLog() = default;
 
-  /// False when a message of this level would be dropped: its text need not be formed.
+  /// False when messages of this level are dropped, so that their text need not be formed.
   virtual bool keeps(LogLevel level) const = 0;
 
   virtual void write(LogLevel level, std::string_view message) = 0;
 };
 
-/// Runs `work` and logs what it throws, such as memory running out, after "WHAT: ": for destructors
-/// and threads, where it would end the process.
-template <typename Work>
-void runGuarded(SystemLog& log, const char* what, const Work& work) noexcept {
-  try {
-    try {
-      work();
-    } catch (const std::exception& failure) {
-      log.write(LogLevel::Error, std::string(what) + ": " + failure.what());
-    }
-  } catch (...) {  // not even the log can be written
-  }
-}
-
-/// Forms a printf-style message and writes it to the installed platform's log. Nothing is formed
-/// when the level is not kept. A text form of a value ("%@") is passed as %s.
+/// Writes a printf-style message to the installed platform's log; formed only if its level is kept.
+/// Pass a value's text form ("%@") as %s.
 [[gnu::format(printf, 2, 3)]] void logMessage(LogLevel level, const char* format, ...);
 
 }  // namespace vesprun

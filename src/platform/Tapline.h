@@ -10,20 +10,20 @@ namespace vesprun {
 /// The format of a channel that holds one integer.
 inline constexpr std::int64_t kTaplineFormatSimple = 1;
 
-/// What a filter or a visitor says of a channel.
+/// The answer of a filter or visitor.
 enum class TaplineResult : std::int32_t {
   Continue = 0,  ///< keep the channel; go on
   Remove = 16    ///< take the channel out of the set
 };
 
-/// One reporting channel, and in a sample its reading.
+/// A reporting channel, or its reading in a sample.
 class TaplineChannel {
  public:
   virtual ~TaplineChannel() = default;
 
   virtual std::int64_t TaplineChannelGetFormat() const = 0;
   virtual std::string TaplineChannelGetChannelName() const = 0;
-  /// The reading of a channel of the simple format, in a sample; 0 for any other.
+  /// The reading, in a sample, of a channel of the simple format; else 0.
   virtual std::int64_t TaplineSimpleGetIntegerValue() const = 0;
 };
 
@@ -34,34 +34,34 @@ class TaplineChannels {
 
   virtual ~TaplineChannels() = default;
 
-  /// Removes every channel for which `filter` says so.
+  /// Removes the channels for which `filter` answers so.
   virtual void TaplinePrune(const Visitor& filter) = 0;
 
-  /// Visits the channels in order, until the visitor returns anything but `Continue`.
+  /// Visits the channels in order until the visitor answers other than `Continue`.
   virtual void TaplineIterate(const Visitor& visitor) const = 0;
 };
 
-/// Reads the channels that were subscribed to.
+/// Reads subscribed channels.
 class TaplineSubscription {
  public:
   virtual ~TaplineSubscription() = default;
 
-  /// One reading of every subscribed channel; null when none can be taken.
+  /// A reading of every subscribed channel; null when none can be taken.
   virtual std::unique_ptr<TaplineChannels> TaplineCreateSamples() = 0;
 };
 
-/// The kernel's reporting-channel library. Every result belongs to the caller.
+/// The kernel's reporting channels. The caller owns every result.
 class Tapline {
  public:
   virtual ~Tapline() = default;
 
-  /// The channels that are in one of the categories of a mask; null when there are none. What the
-  /// selections mean is up to the platform: 1 and 0 select every such channel.
+  /// The channels in any category of the mask; null when there are none. Selections are the
+  /// platform's own: 1 and 0 select every such channel.
   virtual std::unique_ptr<TaplineChannels> TaplineCopyChannelsInCategories(
       std::uint64_t categoryMask, std::uint64_t firstSelection, std::uint64_t secondSelection) = 0;
 
-  /// Subscribes to channels; null when that failed. `subscribed` becomes the set of those that the
-  /// subscription reads, and may stay null.
+  /// Subscribes to channels; null on failure. `subscribed` becomes the set that the subscription
+  /// reads, and may stay null.
   virtual std::unique_ptr<TaplineSubscription> TaplineCreateSubscription(
       const TaplineChannels& wanted, std::unique_ptr<TaplineChannels>& subscribed) = 0;
 };

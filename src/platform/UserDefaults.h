@@ -7,18 +7,18 @@
 
 namespace vesprun {
 
-/// The process's own store of values that outlive it. A change is seen by this process at once and
-/// is written when the store is synchronized, or at the latest when the process ends.
+/// The process's own stored values. This process sees a change at once; it is written when the
+/// store is synchronized, or when the process ends.
 class UserDefaults {
  public:
   virtual ~UserDefaults() = default;
 
   virtual std::optional<PropertyValue> valueForKey(std::string_view key) = 0;
 
-  /// Sets `value`, or removes the key when there is none.
+  /// Sets a value, or removes the key when there is none.
   virtual void setValueForKey(std::optional<PropertyValue> value, std::string_view key) = 0;
 
-  /// Writes the changes durably. False when that failed; the system log says why, and the changes
+  /// Writes the changes durably. False on failure: the system log has the reason, and the changes
   /// stay for the next attempt.
   virtual bool synchronize() = 0;
 };

@@ -7,11 +7,11 @@
 
 namespace vesprun {
 
-/// Minimum, maximum, mean and sum of squared deviations of values that are seen once, in order
-/// (Welford's algorithm, in double precision). All are 0.0 before the first value.
+/// Minimum, maximum, mean and sum of squared deviations in one pass (Welford's algorithm, in double
+/// precision); 0.0 before the first value.
 ///
-/// The count is a signed 32-bit number and stops at its highest, 2^31 − 1: later values still count
-/// in everything else, with the weight of that one.
+/// The count is a signed 32-bit number and stops at 2^31 − 1: further values count everywhere else,
+/// with the weight of that one.
 class DistributionStats {
  public:
   void add(double value) {
@@ -31,8 +31,8 @@ class DistributionStats {
     _squaredDeviations += deviation * (value - _mean);
   }
 
-  /// Minimum, maximum, mean, sum of squared deviations (not divided by the count) as doubles, count
-  /// as a signed 32-bit number.
+  /// Minimum, maximum, mean, sum of squared deviations (not divided by the count) as doubles; the
+  /// count as a signed 32-bit number.
   PropertyArray toArray() const { return {_minimum, _maximum, _mean, _squaredDeviations, _count}; }
 
  private:

@@ -10,8 +10,7 @@
 
 namespace vesprun {
 
-/// The boundaries of a histogram, made ready for many look-ups: n numbers, read as doubles, bound
-/// n + 1 buckets.
+/// The boundaries of a histogram, prepared for many look-ups: n doubles bound n + 1 buckets.
 class HistogramBoundaries {
  public:
   explicit HistogramBoundaries(const PropertyArray& intervals);
@@ -24,12 +23,12 @@ class HistogramBoundaries {
   std::vector<double> _highest;  ///< of the boundaries up to each; NaN before the first number
 };
 
-/// The index of the first boundary, in array order, that is not below `value`; n when there is
-/// none, as for NaN.
+/// The index of the first boundary, in array order, that is not below `value`; n if there is none,
+/// as for NaN.
 inline std::uint32_t determineHistBucketForValueWithIntervals(
     double value, const HistogramBoundaries& intervals) {
-  // The first boundary that reaches a value is also the first place where the running maximum
-  // does, and that one is sorted. Written without jumps: values come in no order.
+  // The first boundary that reaches a value is where the sorted running maximum first does.
+  // Branchless: values come in any order.
   std::size_t bucket = 0;
   for (std::size_t rest = intervals._highest.size(); rest > 0;) {
     const std::size_t half = (rest + 1) / 2;
@@ -39,10 +38,9 @@ inline std::uint32_t determineHistBucketForValueWithIntervals(
   return static_cast<std::uint32_t>(bucket);
 }
 
-/// Label to count (unsigned 64-bit), in bucket order, for the buckets that are not empty; nothing
-/// when all are. Bucket i is "(lower, upper]", the last one "(lower, inf)", the first one's lower
-/// boundary "-inf"; boundaries are written as the numbers that they are (`textForm`). `counts` has
-/// one more element than `intervals`.
+/// Label to count (unsigned 64-bit) of non-empty buckets, in order; nothing if all are empty.
+/// Bucket i is "(lower, upper]", the last one "(lower, inf)", the first lower boundary "-inf", with
+/// boundaries in text form. `counts` has one element more than `intervals`.
 std::optional<PropertyDict> histogramDictForIntervalsWithHistCounts(
     const PropertyArray& intervals, std::span<const std::uint64_t> counts);
 

@@ -30,13 +30,13 @@ std::uint64_t read64OrAllOnes(const char* name) {
 
 double gibibytes(std::uint64_t bytes) { return static_cast<double>(bytes) * 0x1p-30; }
 
-/// A number when it holds, else nothing.
+/// The number if it holds, else nothing.
 template <typename Holds>
 std::optional<std::uint64_t> onlyIf(std::optional<std::uint64_t> number, Holds holds) {
   return number && holds(*number) ? number : std::nullopt;
 }
 
-/// What must be there for a row to be offered: a number, which its value may need.
+/// Conditions of rows: numbers, which the row's value may need.
 struct Gates {
   std::optional<std::uint64_t> always = 0;
   std::optional<std::uint64_t> corruptions =
@@ -51,12 +51,12 @@ struct Gates {
       read64("kern.memorystatus_freezer_below_threshold_count");
   std::optional<std::uint64_t> refreezes =
       onlyIf(read64("kern.memorystatus_freezer_refreeze_count"), [](auto count) {
-        // All ones marks a failed read, whoever made it.
+        // All ones is a failed read.
         return count >= 10 && count != std::numeric_limits<std::uint64_t>::max();
       });
 };
 
-/// How a row's value comes from its variable and the number of its gate.
+/// How a row's value is made from its variable and its gate's number.
 enum class Value {
   Read32,       ///< 2^32 − 1 when the read fails
   Read64,       ///< −1 when the read fails

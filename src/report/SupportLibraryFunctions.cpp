@@ -1,11 +1,13 @@
 #include "report/SupportLibraryFunctions.h"
 
+#include "common/ProcessState.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
 namespace {
 
 bool gBothResolved = false;
+const ProcessState kResolvedState([] { gBothResolved = false; });
 
 }  // namespace
 
@@ -29,7 +31,5 @@ bool resolveSupportLibraryFunctions() {
   gBothResolved = reads && writes;
   return gBothResolved;
 }
-
-void forgetSupportLibraryFunctions() { gBothResolved = false; }
 
 }  // namespace vesprun

@@ -18,11 +18,10 @@ namespace vesprun {
 std::int32_t firstDayOfReport(std::int32_t day);
 
 /// One day's aggregated log: collects the whitelisted counters, adds its own sources, and submits
-/// the document. Made for one run and used once. Without a whitelist it stays empty and submits
-/// nothing.
+/// the document. Used once. Without a whitelist it stays empty.
 ///
-/// A later value for a key replaces the earlier one. Nothing here fails: what a service does not
-/// answer is left out or stands in the log as the failure value that is stated below.
+/// A later value for a key replaces the earlier one. Nothing fails: what a service does not answer
+/// is left out or has the failure value stated below.
 class TBReport {
  public:
   using ScalarProducer = std::function<std::int64_t()>;
@@ -33,12 +32,12 @@ class TBReport {
   /// With a whitelist that has been read; null: none.
   explicit TBReport(std::unique_ptr<TBConfig> config);
 
-  /// Reads the history of day `day` and the day before it, then `serializeWithDateAndAppInfo`.
-  /// `appInfo` may be null.
+  /// Reads the rows of `day` and the day before, then `serializeWithDateAndAppInfo`. `appInfo` may
+  /// be null.
   void writeLogForYesterdayWithAppInfo(std::int32_t day, const AppInfoList* appInfo);
 
-  /// Unless scalars, distributions and histograms are all empty: runs the log's own sources, and
-  /// submits the document of `day`, into which the outputs are moved.
+  /// If there are scalars, distributions or histograms: runs the own sources and submits the
+  /// document of `day`, moving the outputs into it.
   void serializeWithDateAndAppInfo(std::int32_t day, const AppInfoList* appInfo);
 
   // The steps of these two, to look at a report that is not submitted.
@@ -56,20 +55,19 @@ class TBReport {
   std::optional<PropertyDict> makeDocument(std::int32_t day, const AppInfoList* appInfo,
                                            SideEffects sideEffects);
 
-  /// The options with which the whitelist lets a scalar through; null when it does not.
+  /// The whitelist's options for a scalar; null keeps it out.
   const ScalarOptions* optionsForScalarKey(std::string_view key) const;
 
-  /// Stores `value`, rounded as the options ask (`roundScalar`), and returns what was stored.
+  /// Stores the rounded value (`roundScalar`) and returns it.
   std::int64_t addScalarForKeyWithOptions(std::int64_t value, std::string_view key,
                                           const ScalarOptions& options);
 
-  /// Runs the producer and adds what it yields, only when the key is whitelisted.
+  /// Runs the producer only for a whitelisted key.
   void addScalarForKeyByExecutingBlock(std::string_view key, const ScalarProducer& producer);
 
-  /// Goes once through the values and stores their statistics and, when the options name
-  /// "intervals", their histogram; an empty histogram removes the key's earlier one. Memory is one
-  /// counter and one boundary for each bucket. When there is none to be had, a log line says so and
-  /// the statistics are stored alone.
+  /// Stores the statistics of the values and, if the options have "intervals", their histogram; an
+  /// empty histogram removes the key's earlier one. Needs a counter and a boundary for each bucket;
+  /// without memory for them a log line says so and only the statistics are stored.
   void computeAndAddDistributionForKeyWithOptions(TBHistoryDistributionEnumerator& values,
                                                   std::string_view key,
                                                   const DistributionOptions& options);

@@ -22,36 +22,30 @@ constexpr std::string_view kBaselineDomain = "com.quill.logsmith.vesprun";
 constexpr std::array<std::string_view, 4> kUsageCounters = {"wifiInBytes", "wifiOutBytes",
                                                             "wwanInBytes", "wwanOutBytes"};
 
-std::int64_t counterOf(const PropertyValue* value) {
-  return value != nullptr && value->number() != nullptr ? value->number()->asInt64() : 0;
+std::int64_t numberOrZero(const Number* number) {
+  return number != nullptr ? number->asInt64() : 0;
 }
 
-/// What a process is called in counter keys.
+/// A process's name in counter keys.
 struct UsageName {
   std::string prefix;
   std::string name;
 };
 
 std::optional<UsageName> nameOf(const PropertyDict& record) {
-  const auto text = [&record](std::string_view key) {
-    const PropertyValue* value = record.find(key);
-    return value != nullptr ? value->string() : nullptr;
-  };
-  if (const std::string* bundle = text("bundleName")) {
+  if (const std::string* bundle = record.findString("bundleName")) {
     return UsageName{"", *bundle};
   }
-  if (const std::string* process = text("procName")) {
+  if (const std::string* process = record.findString("procName")) {
     return UsageName{"com.quill.", *process};
   }
   return std::nullopt;
 }
 
-/// What a baseline remembers of a process: the date from which its counters count, and the
-/// counters.
+/// A process in the baseline: the date since which its counters count, and the counters.
 class BaselineEntry {
  public:
-  explicit BaselineEntry(const PropertyValue* stored)
-      : _values(stored != nullptr ? stored->array() : nullptr) {}
+  explicit BaselineEntry(const PropertyArray* stored) : _values(stored) {}
 
   bool isSince(const Date& date) const {
     return _values != nullptr && !_values->empty() && _values->front().date() != nullptr &&
@@ -59,15 +53,14 @@ class BaselineEntry {
   }
 
   std::int64_t counter(std::size_t index) const {
-    return index + 1 < _values->size() ? counterOf(&(*_values)[index + 1]) : 0;
+    return index + 1 < _values->size() ? numberOrZero((*_values)[index + 1].number()) : 0;
   }
 
  private:
   const PropertyArray* _values;
 };
 
-/// The services that a reply is handled with. They are asked for before the feed is: a late reply
-/// may find another platform installed, or none.
+/// Taken before the feed is asked: a late reply may find another platform, or none.
 struct Services {
   Tallybook& tallybook = platform().tallybook();
   Preferences& preferences = platform().preferences();
@@ -82,13 +75,13 @@ struct Services {
   bool synchronize() const { return preferences.LGSPreferencesSynchronize(kBaselineDomain); }
 };
 
-// The counters and the baseline lie in two files, and a process can be killed, or a write can fail,
-// between the two. So the baseline is written first, with a mark beside it: the baseline before it,
-// and a fingerprint of the data-usage counters before the growth was added. Counters reach the
-// database all or none. As long as the fingerprint has not changed, the growth is not counted, and
-// the earlier baseline still holds. The mark goes when the counters are durable.
+// Counters and baseline lie in two files, and a process can be killed, or a write can fail, in
+// between. So the baseline is written first, with a mark: the baseline before it, and a fingerprint
+// of the data-usage counters before the growth. Counters reach the database all or none: as long as
+// the fingerprint holds, the growth is not counted and the earlier baseline applies. The mark goes
+// when the counters are durable.
 
-/// The data-usage counters of a day and later as one number; nothing when they cannot be read.
+/// The data-usage counters from a day on as one number; nothing when they cannot be read.
 std::optional<std::uint64_t> fingerprintSince(Tallybook& tallybook, std::int32_t day) {
   std::uint64_t hash = 0xCBF29CE484222325;  // FNV-1a
   const auto take = [&hash](std::uint64_t value) { hash = (hash ^ value) * 0x100000001B3; };
@@ -106,7 +99,7 @@ std::optional<std::uint64_t> fingerprintSince(Tallybook& tallybook, std::int32_t
   return done ? std::optional(hash) : std::nullopt;
 }
 
-/// What is kept beside a baseline until its growth is counted.
+/// Kept beside a baseline until its growth is counted.
 struct CountingMark {
   std::int32_t day;
   std::uint64_t fingerprint;
@@ -121,12 +114,8 @@ struct CountingMark {
   }
   static std::optional<CountingMark> of(const std::optional<PropertyValue>& stored) {
     const PropertyDict* dict = stored ? stored->dict() : nullptr;
-    const auto number = [dict](std::string_view key) {
-      const PropertyValue* value = dict != nullptr ? dict->find(key) : nullptr;
-      return value != nullptr ? value->number() : nullptr;
-    };
-    const Number* day = number("day");
-    const Number* fingerprint = number("fingerprint");
+    const Number* day = dict != nullptr ? dict->findNumber("day") : nullptr;
+    const Number* fingerprint = dict != nullptr ? dict->findNumber("fingerprint") : nullptr;
     if (day == nullptr || fingerprint == nullptr) {
       return std::nullopt;
     }
@@ -136,7 +125,7 @@ struct CountingMark {
   }
 };
 
-/// Goes back to the earlier baseline when an earlier run ended before its growth was counted. False
+/// Returns to the earlier baseline when an earlier run ended before its growth was counted. False
 /// when the counters cannot be read.
 bool settleEarlierRun(const Services& services) {
   if (const std::optional<CountingMark> mark = CountingMark::of(services.stored(kMarkKey))) {
@@ -152,13 +141,12 @@ bool settleEarlierRun(const Services& services) {
   return true;
 }
 
-/// Handles one reply of the feed.
 class UsageReply {
  public:
   UsageReply(const Services& services, CountingMark mark)
       : _services(services), _mark(std::move(mark)) {}
 
-  /// Takes the counters and sets the baseline.
+  /// Adds the growth and sets the baseline.
   void handle(const PropertyArray* records) {
     _yesterday = std::int64_t{_services.tallybook.TBDaysSince1970()} - 1;
     _mark.baselineBefore = _services.stored(kBaselineKey);
@@ -177,7 +165,7 @@ class UsageReply {
       _services.store(kMarkKey, _mark.dict());
     }
     if (!_services.synchronize()) {
-      // The growth is left to the next run: without a baseline it would be counted again.
+      // Without a baseline the next run would count the growth again: leave it to that run.
       _services.store(kBaselineKey, std::move(_mark.baselineBefore));
       _services.store(kMarkKey, std::nullopt);
       _hasGrowth = false;
@@ -188,7 +176,7 @@ class UsageReply {
     }
   }
 
-  /// Makes what was counted durable; may wait for the database.
+  /// Makes the counters durable; may wait for the database.
   void finish() const {
     if (!_hasGrowth) {
       return;
@@ -204,18 +192,17 @@ class UsageReply {
  private:
   void count(const PropertyDict& record) {
     const std::optional<UsageName> name = nameOf(record);
-    const PropertyValue* sinceValue = record.find(kUsageSinceKey);
-    const Date* since = sinceValue != nullptr ? sinceValue->date() : nullptr;
+    const Date* since = record.findDate(kUsageSinceKey);
     if (!name || since == nullptr) {
       return;
     }
-    const BaselineEntry before(_baseline.find(name->name));
+    const BaselineEntry before(_baseline.findArray(name->name));
     const bool goesOn = before.isSince(*since);
     const bool isRecent = daysSince1970(*since) >= _yesterday;
     const std::size_t additionsBefore = _additions.size();
     PropertyArray after{*since};
     for (std::size_t i = 0; i < kUsageCounters.size(); ++i) {
-      const std::int64_t value = counterOf(record.find(kUsageCounters[i]));
+      const std::int64_t value = numberOrZero(record.findNumber(kUsageCounters[i]));
       after.emplace_back(value);
       if (goesOn) {
         addGrowth(kUsageCounters[i], *name, value, before.counter(i));
@@ -277,7 +264,7 @@ void CollectDataUsage(std::chrono::nanoseconds replyTimeout) {
   const auto fingerprint =
       settleEarlierRun(services) ? fingerprintSince(services.tallybook, today) : std::nullopt;
   if (!fingerprint) {
-    return;  // what lies in the database cannot be told; the next run counts the growth
+    return;  // unknown counters: the next run counts the growth
   }
   const auto workspace = platform().murmur().createUsageWorkspace(kUsageServiceEndpoint);
   const auto feed = platform().murmur().createUsageFeed(workspace);

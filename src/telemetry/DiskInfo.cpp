@@ -1,18 +1,19 @@
 #include "telemetry/DiskInfo.h"
 
+#include <bit>
+
 #include <cstdint>
 #include <optional>
 
 #include "platform/Platform.h"
 #include "telemetry/DiskUsage.h"
-#include "telemetry/UserCapacity.h"
 
 namespace vesprun {
 namespace {
 
 constexpr const char* kUserVolume = "/private/var";
 
-/// Arithmetic is modulo 2^64, as everywhere with byte counts of a file system.
+/// Byte counts of a file system are computed modulo 2^64.
 PropertyDict measureFileSystem() {
   std::uint64_t available = 0;
   std::uint64_t fullness = 0;
@@ -46,7 +47,7 @@ PropertyDict askForDiskUsage() {
   const std::int64_t totalAvailable = mebibytes(kDiskUsageTotalDataAvailable);
   const std::int64_t available = mebibytes(kDiskUsageAmountDataAvailable);
   const std::uint32_t capacity = GetUserCapacityInGB(static_cast<std::uint32_t>(total));
-  // Counts of 44 bits leave room for the factor.
+  // Counts have 44 bits: the factor fits.
   const std::int64_t fullness = total >= 1 ? (total - totalAvailable) * 10'000 / total : 0;
   return {{"HLT_OR_Capacity_GB", capacity},
           {"HLT_Capacity_GB", capacity},
@@ -57,6 +58,18 @@ PropertyDict askForDiskUsage() {
 }
 
 }  // namespace
+
+std::uint32_t GetUserCapacityInGB(std::uint64_t userCapacityMB) {
+  const auto capacity = static_cast<std::uint32_t>(userCapacityMB);
+  constexpr std::uint32_t kFirst1536 = 0x150000;
+  if (capacity >= kFirst1536 && capacity < kFirst1536 + 385 * 1024) {
+    return 1536;
+  }
+  if (capacity == 0) {
+    return 0;
+  }
+  return static_cast<std::uint32_t>((std::uint64_t{1} << std::bit_width(capacity)) / 1024);
+}
 
 PropertyDict GetDiskInfo() {
   PropertyDict measured = measureFileSystem();

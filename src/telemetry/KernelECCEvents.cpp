@@ -46,7 +46,7 @@ void LogKernelECCEvents() {
   };
   int systemError = readNext();
   for (int logged = 0; systemError == 0 && logged < kMostEventsOfARun; ++logged) {
-    // An event without a record is not acknowledged: it waits for the next run.
+    // Not acknowledged without a record: the event waits for the next run.
     if (!platform().logsmith().FLLogStructuredData(kECCEventRecordType, describe(event)) ||
         !kernel.acknowledgeECCEvent()) {
       return;

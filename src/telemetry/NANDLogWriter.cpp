@@ -26,8 +26,7 @@ constexpr double kSecondsBetweenLogs = 604'800.0;
 
 constexpr std::size_t kListCount = 16;
 
-/// The validity list as it lies in a buffer of 32-bit words: the number of entries, the number of
-/// word pairs, the pairs, the entries.
+/// The validity list in 32-bit words: number of entries, number of pairs, the pairs, the entries.
 class ValidityList {
  public:
   static constexpr std::uint64_t kWordSize = 4;
@@ -35,7 +34,7 @@ class ValidityList {
   static constexpr std::uint64_t kWordsPerPair = 2;
   static constexpr std::uint64_t kWordsPerEntry = 5;
 
-  /// Nothing when the buffer has no entry or does not hold all that it states.
+  /// Nothing without entries, or when the buffer does not hold all.
   static std::optional<ValidityList> read(std::span<const std::uint8_t> buffer) {
     if (buffer.size() < kHeaderWords * kWordSize) {
       return std::nullopt;
@@ -50,7 +49,7 @@ class ValidityList {
     return ValidityList(buffer.subspan(firstEntry * kWordSize, entries * kEntrySize));
   }
 
-  /// The values of each list, in buffer order.
+  /// In buffer order.
   std::array<PropertyArray, kListCount> valuesByList() const {
     std::array<PropertyArray, kListCount> lists;
     for (std::size_t at = 0; at < _entries.size(); at += kEntrySize) {
@@ -71,9 +70,9 @@ class ValidityList {
   std::span<const std::uint8_t> _entries;
 };
 
-/// With two decimals, whatever the locale; without a sign when it is NaN.
+/// Independent of the locale; NaN without a sign.
 std::string twoDecimals(double value) {
-  std::array<char, 512> text;  // the largest double has 309 digits before the point
+  std::array<char, 512> text;  // a double has up to 309 digits before the point
   const double shown = std::isnan(value) ? std::fabs(value) : value;
   const auto [end, error] =
       std::to_chars(text.data(), text.data() + text.size(), shown, std::chars_format::fixed, 2);
@@ -84,7 +83,7 @@ bool isNumber(const PropertyValue& value) {
   return value.number() != nullptr || value.boolean() != nullptr;
 }
 
-/// The elements' texts, joined by commas; nothing when none of them is a number.
+/// The elements joined by commas; nothing without a number among them.
 std::optional<std::string> joinedElements(const PropertyArray& array) {
   std::string text;
   bool holdsNumber = false;
@@ -95,7 +94,7 @@ std::optional<std::string> joinedElements(const PropertyArray& array) {
   return holdsNumber ? std::optional(std::move(text)) : std::nullopt;
 }
 
-/// How a field's value is written; nothing when it is not.
+/// Nothing for a field that is left out.
 std::optional<std::string> fieldText(const PropertyValue& value) {
   if (const Number* number = value.number(); number != nullptr && number->isFloatingPoint()) {
     return twoDecimals(number->asDouble());
@@ -142,7 +141,7 @@ bool wasLoggedLately(const Date& now) {
 
 void submitLog(std::string_view logType, const PropertyDict& fields, const Date& now) {
   const std::string text = logText(platform().clock().localDateText(now), fields);
-  // A submission that fails also counts: the next one is due in 7 days.
+  // A failed submission counts: the next one is due in 7 days.
   platform().logsmith().LGSWriteLogForSubmission(
       logType, kLogName, nullptr, [&text](LogFileHandle& file) { file.write(text); });
   platform().userDefaults().setValueForKey(now, kLastLoggedKey);

@@ -2,8 +2,8 @@
 
 namespace vesprun {
 
-/// Sets the scalar "com.quill.tapline.NAME" of today for every simple integer channel in category
-/// 256 of the kernel's reporting channels. What cannot be read is left out without a message.
+/// Sets the scalar "com.quill.tapline.NAME" of today for every simple channel in category 256. What
+/// cannot be read is silently left out.
 void LogTaplineChannelScalars();
 
 }  // namespace vesprun

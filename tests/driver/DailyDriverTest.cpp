@@ -16,7 +16,6 @@
 #include "platform/host/messages/MessageFraming.h"
 #include "platform/host/messages/ServiceSocket.h"
 #include "support/HostServiceTest.h"
-#include "support/WatchedRegistry.h"
 #include "telemetry/TodaysScalars.h"
 
 namespace vesprun {
@@ -173,22 +172,6 @@ TEST_F(DailyDriverTest, TheTasksReportCountAndSynchronize) {
   EXPECT_TRUE(document.contains("TBActivatedAppInfo"));
   EXPECT_EQ(writtenScalars(device, "com.quill.tapline."), (Scalars{{"com.quill.tapline.c", 3}}));
   EXPECT_THAT(device.log(), Contains(kOSChange));
-}
-
-TEST_F(DailyDriverTest, ATaskThatThrowsStopsNoOther) {
-  struct Exhausted : WatchedRegistry {
-    using WatchedRegistry::WatchedRegistry;
-    RegistryHandle DevRegServiceGetMatchingService(const std::string& /*className*/) override {
-      throw std::bad_alloc();
-    }
-  };
-  TestDevice device(kTaskDevice);
-  const Exhausted registry(device.platform());
-  runDayCheck(nullptr);
-  EXPECT_THAT(device.log(), Contains("error: unexpected failure: std::bad_alloc"));
-  EXPECT_EQ(device.log().back(), kOSChange);
-  EXPECT_THAT(writtenScalars(device, "com.quill.homeshell."), SizeIs(2));
-  EXPECT_EQ(storedDay(device), PropertyValue(kYesterday));
 }
 
 TEST_F(DailyDriverTest, MessagesLeadToWhatTheirStateAllows) {

@@ -2,7 +2,6 @@
 
 #include "buffers/DeviceBuffers.h"
 #include "support/ControllerTest.h"
-#include "support/WatchedRegistry.h"
 #include "telemetry/TodaysScalars.h"
 
 namespace vesprun {
@@ -62,22 +61,31 @@ TEST_F(DailyStorageAndDeviceStatsTest, GoesOnAfterEachFailure) {
   EXPECT_EQ(device().lines("records.jsonl").size(), 1U);
 }
 
-TEST_F(DailyStorageAndDeviceStatsTest, MemoryThatRunsOutInOneStepStopsNoOther) {
-  struct Exhausted : WatchedRegistry {
-    using WatchedRegistry::WatchedRegistry;
-    RegistryHandle DevRegServiceGetMatchingService(const std::string& /*className*/) override {
-      ++asked;
-      throw std::bad_alloc();
-    }
-    int asked = 0;
-  };
-  start("", session("0A") + R"(, "channels": [{"name": "c", "value": 3}])");
-  device().write("kernel/ecc/1.bin", std::string(72, '\0'));
-  Exhausted registry(device().platform());
-  errorsOf(LogDailyStorageAndDeviceStats);
-  EXPECT_GE(registry.asked, 2) << "for the structured log and the NAND info";
-  EXPECT_THAT(todaysScalars(device()), Contains(Pair("com.quill.tapline.c", 3)));
-  EXPECT_EQ(device().lines("records.jsonl").size(), 1U);
+TEST(NANDInfoScalars, WritesNumbersAndBooleansUnlessThereIsAnError) {
+  TestDevice device;
+  PropertyDict info{{"number", 7U},
+                    {"wide", ~std::uint64_t{0}},
+                    {"fraction", -2.9},
+                    {"yes", true},
+                    {"no", false},
+                    {"text", "8"},
+                    {"data", Bytes{1}},
+                    {"date", Date{1}},
+                    {"dict", PropertyDict()},
+                    {"array", PropertyArray{1}}};
+  SetNANDInfoScalars(info);
+  const Scalars written{{"number", 7}, {"wide", -1}, {"fraction", -2}, {"yes", 1}, {"no", 0}};
+  EXPECT_EQ(todaysScalars(device), written);
+  info.set("number", 8);
+  info.set("com.quill.NANDInfo.Error", -1);
+  SetNANDInfoScalars(info);
+  info.set("com.quill.NANDInfo.ErrorMessage", "not found");
+  SetNANDInfoScalars(info);
+  EXPECT_EQ(todaysScalars(device), written);
+  EXPECT_THAT(
+      device.log(),
+      testing::ElementsAre("default: error reading nand info, error -1 with message (null)",
+                           "default: error reading nand info, error -1 with message not found"));
 }
 
 }  // namespace

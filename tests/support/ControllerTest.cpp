@@ -1,6 +1,7 @@
 #include "support/ControllerTest.h"
 
 #include "buffers/DeviceBuffers.h"
+#include "common/ProcessState.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
 #include "support/WatchedRegistry.h"
 
@@ -26,7 +27,7 @@ void ControllerTest::endDevice() {
     expectNothingHeld();
     _device.reset();
   }
-  startProcessAfresh();
+  ProcessState::startAfresh();
 }
 
 void ControllerTest::expectNothingHeld() {

@@ -3,17 +3,12 @@
 #include <filesystem>
 #include <sstream>
 
-#include "NANDInfo/controller/NandExporter.h"
-#include "NANDInfo/lists/StructuredLogState.h"
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "common/ProcessState.h"
 #include "common/TextForm.h"
-#include "config/InternalDevice.h"
-#include "driver/ActiveAppInfoListener.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeReader.h"
 #include "platform/host/documents/PtreeWriter.h"
 #include "platform/host/files/WholeFile.h"
-#include "report/SupportLibraryFunctions.h"
 
 namespace vesprun {
 
@@ -29,15 +24,6 @@ PropertyDict dictionaryOf(const Parse& parse, const std::string& text) {
 }
 
 }  // namespace
-
-void startProcessAfresh() {
-  forgetAPIErrorMessage();
-  forgetInternalDeviceAnswer();
-  forgetNandExporterHandles();
-  forgetStructuredLogState();
-  forgetSupportLibraryFunctions();
-  startActiveAppInfoAfresh();
-}
 
 TestDevice::TestDevice(std::string_view description) {
   write("device.json", description);
@@ -78,7 +64,7 @@ HostPlatform& TestDevice::platform() {
 void TestDevice::endProcess() {
   _installed.reset();
   _platform.reset();
-  startProcessAfresh();
+  ProcessState::startAfresh();
 }
 
 std::vector<PropertyDict> TestDevice::lines(std::string_view file) const {

@@ -13,9 +13,6 @@
 
 namespace vesprun {
 
-/// Makes all that lives as long as the process as it is in a new one.
-void startProcessAfresh();
-
 /// A real device directory in a temporary folder, and its platform, which is installed. The folder
 /// goes with it.
 class TestDevice : public TemporaryFolder {

@@ -8,8 +8,8 @@
 
 namespace vesprun {
 
-/// Stands between the program and a device's registry for as long as it lives: notes every call
-/// that can fail, and makes one of them fail.
+/// Sits between the program and a device's registry as long as it lives, notes every call that can
+/// fail, and makes one of them fail.
 class WatchedRegistry : public DeviceRegistry {
  public:
   struct Call {
@@ -22,14 +22,10 @@ class WatchedRegistry : public DeviceRegistry {
   static constexpr RegistryResult kFailure = 0xE00002D8;
 
   explicit WatchedRegistry(HostPlatform& device)
-      : _device(&device), _registry(device.describedRegistry()) {
-    _device->interposeDeviceRegistry(this);
+      : _device(device), _registry(device.describedRegistry()) {
+    _device.deviceRegistry = *this;
   }
-  ~WatchedRegistry() override {
-    if (_device != nullptr) {
-      _device->interposeDeviceRegistry(nullptr);
-    }
-  }
+  ~WatchedRegistry() override { _device.deviceRegistry = _registry; }
 
   /// The call to fail, counted from 1; 0: none. Calls are counted anew.
   void failCall(std::size_t number) {
@@ -94,22 +90,15 @@ class WatchedRegistry : public DeviceRegistry {
                : _registry.DevRegConnectCallScalarMethod(connection, method, input, output);
   }
 
- protected:
-  /// Stands nowhere by itself.
-  explicit WatchedRegistry(DeviceRegistry& registry) : _registry(registry) {}
-
-  /// Asked about each call when it has been noted.
-  virtual bool isToFail(const Call& /*call*/) { return _calls.size() == _failing; }
-
  private:
   /// Notes the call; true when it is the one to fail.
   bool fails(std::string operation, RegistryHandle handle = 0, std::uint32_t method = 0,
              std::span<const std::uint8_t> input = {}) {
     _calls.push_back({std::move(operation), method, Bytes(input.begin(), input.end()), handle});
-    return isToFail(_calls.back());
+    return _calls.size() == _failing;
   }
 
-  HostPlatform* _device = nullptr;
+  HostPlatform& _device;
   DeviceRegistry& _registry;
   std::vector<Call> _calls;
   std::size_t _failing = 0;

@@ -1,7 +1,6 @@
 #include "telemetry/DiskInfo.h"
 
 #include "telemetry/TodaysScalars.h"
-#include "telemetry/UserCapacity.h"
 
 namespace vesprun {
 namespace {

@@ -4,7 +4,7 @@
 
 #include <limits>
 
-#include "NANDInfo/lists/StructuredLogState.h"
+#include "NANDInfo/StructuredLogState.h"
 #include "buffers/DeviceBuffers.h"
 #include "support/TestDevice.h"
 

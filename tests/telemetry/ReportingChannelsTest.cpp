@@ -21,6 +21,33 @@ TEST(ReportingChannels, OnlySimpleChannelsOfTheCategoryAreWritten) {
   }
 }
 
+TEST(ReportingChannels, NothingIsWrittenWithoutASubscriptionOrASample) {
+  struct Unreadable final : Tapline {
+    struct Subscription final : TaplineSubscription {
+      std::unique_ptr<TaplineChannels> TaplineCreateSamples() override { return nullptr; }
+    };
+    explicit Unreadable(Tapline& real) : tapline(real) {}
+    std::unique_ptr<TaplineChannels> TaplineCopyChannelsInCategories(
+        std::uint64_t mask, std::uint64_t first, std::uint64_t second) override {
+      return tapline.TaplineCopyChannelsInCategories(mask, first, second);
+    }
+    std::unique_ptr<TaplineSubscription> TaplineCreateSubscription(
+        const TaplineChannels& /*wanted*/,
+        std::unique_ptr<TaplineChannels>& /*subscribed*/) override {
+      return std::exchange(subscription, nullptr);
+    }
+    Tapline& tapline;
+    std::unique_ptr<TaplineSubscription> subscription = std::make_unique<Subscription>();
+  };
+  TestDevice device(deviceWith(R"("channels": [{"name": "c", "value": 3}])"));
+  Unreadable unreadable(device.platform().tapline());
+  device.platform().tapline = unreadable;
+  LogTaplineChannelScalars();
+  LogTaplineChannelScalars();
+  EXPECT_EQ(unreadable.subscription, nullptr);
+  EXPECT_EQ(todaysScalars(device), Scalars{});
+}
+
 TEST(ReportingChannels, LiveOnesAreThoseOfTheRunningSystem) {
   TestDevice device(deviceWith(R"("channels": "live")"));
   LogTaplineChannelScalars();

@@ -16,7 +16,7 @@
 namespace vesprun {
 
 // Buffers as the storage controller and the kernel send them, for sample devices, tests, fuzzers
-// and benchmarks. Nothing is checked: a header can claim what it likes.
+// and benchmarks. Nothing is checked.
 
 /// Base and FTL statistics.
 class StatisticsBufferBuilder {
@@ -39,7 +39,7 @@ class StatisticsBufferBuilder {
 /// Statistics of an MSP.
 class MSPBufferBuilder {
  public:
-  /// A record of these elements, each as wide as the key's group has them.
+  /// A record of these elements, each as wide as the key's group.
   MSPBufferBuilder& add(std::uint16_t key, std::span<const std::uint64_t> elements);
   MSPBufferBuilder& add(std::uint16_t key, std::initializer_list<std::uint64_t> elements) {
     return add(key, std::span(elements.begin(), elements.size()));
@@ -55,8 +55,8 @@ class MSPBufferBuilder {
   Bytes _bytes;
 };
 
-/// A full record of every known statistic, in the order of the table. Elements that `valuesOf` does
-/// not give are 0.
+/// A full record of every known statistic in table order. Elements that `valuesOf` leaves out are
+/// 0.
 Bytes everyStatistic(const std::function<std::vector<std::uint64_t>(const ORUStatKey&)>& valuesOf);
 Bytes everyMSPStatistic(
     const std::function<std::vector<std::uint64_t>(const ORUMSPKey&)>& valuesOf);
@@ -68,9 +68,9 @@ class SnapshotBuilder {
   SnapshotBuilder& begin(std::uint64_t id) { return item(19, Bytes(4), id); }
   SnapshotBuilder& end(std::uint64_t id) { return item(20, {}, id); }
   SnapshotBuilder& bufferEnd() { return item(0xF19158ED, {}); }
-  /// `size`: of the item, with zeros behind the text; 0 for no more than the text.
+  /// `size` of the item, padded with zeros; 0: the text's.
   SnapshotBuilder& name(std::string_view text, std::size_t size = 0);
-  /// I/O statistics: requests and bytes, each read and written.
+  /// Requests and bytes, each read and written.
   SnapshotBuilder& ioStatistics(const std::array<std::uint64_t, 4>& counters);
   SnapshotBuilder& written(std::uint64_t count) { return ioStatistics({0, 0, 0, count}); }
   SnapshotBuilder& thread(std::uint64_t id, std::string_view text, std::uint64_t count) {
@@ -86,12 +86,12 @@ inline Bytes bytesOf(std::initializer_list<std::uint32_t> words) {
   return bytesOf(std::span(words.begin(), words.size()));
 }
 
-/// A telemetry list: the counters of each bus, 1,024 words, then an entry of eight words for each.
+/// A telemetry list: 1,024 counter words for each bus, then an entry of eight words for each.
 using ListWord = std::function<std::uint32_t(std::uint32_t bus, std::uint32_t word)>;
 Bytes telemetryList(std::uint32_t busCount, const ListWord& counter, const ListWord& entry);
 
-/// One in which word i of a bus's counters is i; the words of bus entry b are b, 10 + b, 20 + b and
-/// so on, but for the last two: 0xFFFFFFFF.
+/// Word i of each bus's counters is i; bus entry b is b, 10 + b, 20 + b and so on, the last two
+/// words 0xFFFFFFFF.
 Bytes telemetryList(std::uint32_t busCount);
 
 }  // namespace vesprun

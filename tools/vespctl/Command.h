@@ -15,34 +15,32 @@
 
 namespace vesprun {
 
-/// Ends the command with exit status 1 and one line, the text, on standard error.
+/// Ends the command with exit status 1 and its text on standard error.
 class CommandFailure : public std::runtime_error {
  public:
   using std::runtime_error::runtime_error;
 };
 
-/// The platform of a device directory. Throws `CommandFailure` when there is none.
+/// Throws `CommandFailure` when the directory cannot be used; so do the next two.
 std::unique_ptr<HostPlatform> openDevice(const std::string& directory);
 
-/// The same, to look at the device and change nothing on it; see `HostPlatform::openReadOnly`.
+/// Without changing anything on the device; see `HostPlatform::openReadOnly`.
 std::unique_ptr<HostPlatform> openDeviceReadOnly(const std::string& directory, SystemLog& log);
 
-/// A device directory without what stands in its description. Throws `CommandFailure` when there is
-/// none.
+/// The directory alone, without its description.
 DeviceDirectory openDirectory(const std::string& directory);
 
-/// The whole of a file or pipe, "-" for standard input. Throws `CommandFailure` when it cannot be
-/// read.
+/// The content of a file or pipe; "-" is standard input.
 std::string readInput(const std::string& file);
 
-/// How a file that was given is called in a message: "-" is "standard input".
+/// A file's name in messages: "-" is "standard input".
 std::string inputName(const std::string& file);
 
-/// Prints a value in its JSON form and ends the line.
+/// Prints the JSON form and a line end.
 void printJson(const PropertyValue& value);
 
-/// Takes a decimal integer that fits `T`, and nothing else: leading zeros mean nothing, and no
-/// unsigned number has a sign.
+/// Accepts only a decimal integer that fits `T`; leading zeros are fine, a sign only if `T` has
+/// one.
 template <std::integral T>
 CLI::Validator decimal() {
   return CLI::Validator(
@@ -61,11 +59,11 @@ CLI::Validator decimal() {
       "");
 }
 
-/// Allows one command of those that `subject` has by now, and refuses any other word by naming
-/// them. That none is given is refused, too, when one is `needed`.
+/// Allows one of `subject`'s commands, and names them all to refuse any other word, or none when
+/// one is `needed`.
 void allowOneCommand(CLI::App& subject, bool needed = true);
 
-// Each subject adds its commands to vespctl in a file of its own.
+// Each in the file of its subject.
 void addDeviceCommands(CLI::App& vespctl);
 void addCounterCommands(CLI::App& vespctl);
 void addCollectCommand(CLI::App& vespctl);

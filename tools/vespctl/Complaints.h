@@ -8,22 +8,22 @@
 
 namespace vesprun {
 
-/// Takes what a service logs, which becomes the command's own: errors, or down to another level. A
-/// message that is repeated at once counts once.
+/// Collects errors that a service logs, or messages down to another level, for the command to
+/// report. A message repeated at once counts once.
 class Complaints final : public SystemLog {
  public:
-  /// `also` gets all that is logged too, unless it is null.
+  /// `also`, unless null, gets all that is logged.
   explicit Complaints(SystemLog* also = nullptr, LogLevel least = LogLevel::Error)
       : _also(also), _least(least) {}
 
   bool keeps(LogLevel level) const override;
   void write(LogLevel level, std::string_view message) override;
 
-  /// Throws `CommandFailure` with the first of them.
+  /// Throws the first error as `CommandFailure`.
   void failIfAny() const;
-  /// Throws `CommandFailure` with all of them and, unless the last one says so already, `error`.
+  /// Throws all errors and, unless the last one begins with it, `error`.
   [[noreturn]] void fail(const std::string& error) const;
-  /// Each on standard error, of a command that is done nevertheless.
+  /// Prints them, when the command succeeded nevertheless.
   void print() const;
 
  private:

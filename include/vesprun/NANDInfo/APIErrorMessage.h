@@ -6,8 +6,8 @@
 
 namespace vesprun {
 
-/// The first error text of the process, or "NA". By convention it begins with the name of the
-/// operation that failed. Needs no device; empty when memory runs out.
+/// The first error text of the process, or "NA". By convention it begins with the failed
+/// operation's name. Needs no device; empty when memory runs out.
 VESPRUN_EXPORT std::string GetAPIErrorMessage() noexcept;
 
 }  // namespace vesprun

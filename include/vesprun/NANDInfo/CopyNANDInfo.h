@@ -7,21 +7,19 @@
 
 namespace vesprun {
 
-// The legacy NAND info: keys that begin with "com.quill.NANDInfo.", in a fixed order, to numbers of
-// the type that their figure has: signed 32-bit for the driver version, unsigned 32-bit for the
-// export version and the geometry, unsigned 64-bit for all others.
+// The legacy NAND info: keys "com.quill.NANDInfo.…" in a fixed order, to numbers: the driver
+// version signed 32-bit, export version and geometry unsigned 32-bit, all others unsigned 64-bit.
 
-/// The legacy NAND info with its version fields and the purgeable space. When the statistics cannot
-/// be had, a dictionary with "com.quill.NANDInfo.Error" and "com.quill.NANDInfo.ErrorMessage".
+/// With version fields and purgeable space. Without statistics: "com.quill.NANDInfo.Error" and
+/// "com.quill.NANDInfo.ErrorMessage".
 VESPRUN_EXPORT PropertyDict CopyNANDInfo() noexcept;
 
-/// `CopyNANDInfo` for the daily log; empty on a day on which the statistics go to analytics events
-/// alone, every other day (UTC). `options` is not consulted.
+/// For the daily log; empty every other day (UTC), when the statistics go to analytics events
+/// alone. `options` is ignored.
 VESPRUN_EXPORT std::optional<PropertyDict> CopyNANDInfoWithOptions(
     const PropertyDict& options) noexcept;
 
-/// Sets the legacy NAND info without its version fields in `info`, replacing what has the same
-/// keys. Nothing happens when the statistics cannot be had.
+/// Sets the legacy NAND info without version fields in `info`. Nothing happens without statistics.
 VESPRUN_EXPORT void DumpNANDInfo(PropertyDict& info) noexcept;
 
 }  // namespace vesprun

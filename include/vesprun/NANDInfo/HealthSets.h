@@ -5,20 +5,20 @@
 
 namespace vesprun {
 
-// A few figures on the storage's health, made from the FTL fields of now. Every key begins with
-// "com.quill.NANDInfo.Health.", every value is a signed number: "MaxPercentageNANDUsed" and
-// "MaxE2EErrors" of 32 bits and "HostReadErrors" of 64, at least 0; "NumGrownBadBlocks",
-// "SpareAvailablePercent" and "NumDieFailures" of 64 bits, -1 when not known. None of them, with
-// the error recorded, when the fields cannot be had.
+// Figures on the storage's health, from the current FTL fields. Keys begin with
+// "com.quill.NANDInfo.Health."; values are signed. "MaxPercentageNANDUsed", "MaxE2EErrors" (32
+// bits) and "HostReadErrors" (64) are at least 0; "NumGrownBadBlocks", "SpareAvailablePercent" and
+// "NumDieFailures" (64) are -1 when unknown. Without FTL fields there are none, and the error is
+// recorded.
 
-/// For service plans, with "HLT_APIErrorMessage": everything but the spare blocks.
+/// For service plans: all but the spare blocks, with "HLT_APIErrorMessage".
 VESPRUN_EXPORT PropertyDict CopyTendmarkNANDInfo() noexcept;
 
-/// For updates over the air: everything but the spare blocks and the die failures.
+/// For updates over the air: all but the spare blocks and the die failures.
 VESPRUN_EXPORT PropertyDict CopyOTANANDInfo() noexcept;
 
-/// For labs, with "HLT_APIErrorMessage": everything but the die failures, and "IsNANDRetirable", 1
-/// when the spare blocks are being used up or the expected life is over, else 0.
+/// For labs: all but the die failures, with "HLT_APIErrorMessage" and "IsNANDRetirable", 1 when
+/// spare blocks are being used up or the expected life is over, else 0.
 VESPRUN_EXPORT PropertyDict CopyInternalLabNANDInfo() noexcept;
 
 }  // namespace vesprun

@@ -7,30 +7,28 @@
 
 namespace vesprun {
 
-// The stats magazine: snapshots of the FTL fields, one every four hours.
+// The stats magazine: FTL fields, saved every four hours.
 
-/// What happened between the stats-magazine snapshot of `hours` hours ago and the newest one. Of
-/// `hours` the low 32 bits count.
+/// What happened since the snapshot of `hours` hours ago (low 32 bits).
 ///
-/// Counters that accumulate are doubles, reported when `mode` is 0 or 2: with `deltaWanted` (not 0)
-/// what they grew by, but as the old snapshot has them when no time lies between the two; without
-/// it always as the old one has them. Instantaneous values are the old snapshot's, unchanged,
-/// reported when `mode` is 1 or 2.
+/// Accumulating counters, doubles, are reported if `mode` is 0 or 2: their growth with
+/// `deltaWanted` (not 0) if time lies between the snapshots, else the old values. Instantaneous
+/// values of the old snapshot are reported if `mode` is 1 or 2.
 ///
-/// In this order: "com.quill.NANDInfo.IsStatMagSupported"; when both snapshots have a time stamp
+/// In this order: "com.quill.NANDInfo.IsStatMagSupported"; if both snapshots have a time stamp
 /// "HLT_SM_deltaDays", a double, and the fields that both have, in the old one's order; the fields
-/// derived from those of the newest snapshot; the average P/E cycles "of the period", doubles made
-/// from the erase counters above and the partitions of now; "HLT_APIErrorMessage". When the newest
-/// snapshot is missing, the old one's fields take the place of the deltas.
+/// derived from the newest snapshot; the period's average P/E cycles, doubles made from the erase
+/// counters above and the current partitions; "HLT_APIErrorMessage". Without the newest snapshot,
+/// the old one's fields replace the deltas.
 VESPRUN_EXPORT PropertyDict CopySMagNANDFTLInfo(std::uint64_t hours, std::uint32_t deltaWanted,
                                                 std::uint32_t mode) noexcept;
 
-/// The write amplification of garbage collection in each of the last six periods of four hours, the
-/// latest first, estimated from the validity curve at the period's beginning: a double, or the
-/// 32-bit number 0 when nothing was collected in the period or that is not known.
+/// The write amplification of garbage collection in the last six periods of four hours, latest
+/// first, estimated from the validity curve at each period's beginning: a double, or the 32-bit
+/// number 0 when nothing was collected or it is unknown.
 ///
-/// When the newest snapshot says that there is no stats magazine, the error text as
-/// "com.quill.NANDInfo.ErrorMessage" instead. Else empty with `skipHistory` (not 0).
+/// If the newest snapshot has no stats magazine: the error text as
+/// "com.quill.NANDInfo.ErrorMessage". Else empty with `skipHistory` (not 0).
 VESPRUN_EXPORT PropertyDict CopySMagNANDFTLCustomHistoryInfo(std::uint32_t skipHistory) noexcept;
 
 }  // namespace vesprun

@@ -7,21 +7,20 @@ namespace vesprun {
 
 struct nand_exporter_t;
 
-/// A connection to the storage controller for other programs; theirs to keep between
-/// `openORUConnection` and `closeORUConnection`.
+/// A connection to the storage controller, the caller's from `openORUConnection` to
+/// `closeORUConnection`.
 struct ORUConnection {
   RegistryHandle service = 0;
   RegistryHandle connection = 0;
   nand_exporter_t* exporter = nullptr;  ///< the library's own entry for the controller's class
 };
 
-/// Opens the storage controller. The connection's handle is written into the exporter, too, and
-/// stays there when the connection is closed. False, with lines on the standard error stream and
-/// nothing left open, when there is no controller, when it refuses, or when it offers no base
-/// statistics.
+/// Opens the storage controller. The handle also stays in the exporter, even after closing. False,
+/// with lines on standard error and nothing left open, when there is no controller, it refuses, or
+/// it has no base statistics.
 VESPRUN_EXPORT bool openORUConnection(ORUConnection& connection) noexcept;
 
-/// Closes the record's connection and releases its service, if any, and forgets them.
+/// Closes the connection and releases the service, if any, and forgets them.
 VESPRUN_EXPORT void closeORUConnection(ORUConnection& connection) noexcept;
 
 }  // namespace vesprun

@@ -6,16 +6,16 @@
 
 namespace vesprun {
 
-// What the structured storage log of the daily job decides by and finds out. All are 0 in a new
-// process; only `gForceCollectionSet` is for others to set.
+// Inputs and results of the daily structured storage log, 0 in a new process. Others may set only
+// `gForceCollectionSet`.
 
-/// Not 0: the validity list is always collected.
+/// Not 0: always collect the validity list.
 VESPRUN_EXPORT extern std::uint8_t gForceCollectionSet;
-/// Not 0: the validity list is wanted in this run.
+/// Not 0: the validity list is wanted now.
 VESPRUN_EXPORT extern std::uint8_t gNeedValidityList;
-/// Write amplification of the user partition, a value of single precision.
+/// Write amplification of the user partition, in single precision.
 VESPRUN_EXPORT extern double gCurrentUserWamp;
-/// And of the intermediate partition.
+/// Of the intermediate partition.
 VESPRUN_EXPORT extern double gCurrentSysWamp;
 
 }  // namespace vesprun

@@ -5,10 +5,9 @@
 
 namespace vesprun {
 
-/// The bytes that the kernel's swap-out thread has written, from a kernel snapshot: the same
-/// unsigned 64-bit number as "HLT_VMFreezer_bytesWritten" and
-/// "com.quill.NANDInfo.VMFreezer.NumPhysicalWrites", 0 when the thread has no such counter. Empty
-/// when there is no snapshot, or no such thread in it.
+/// The bytes written by the kernel's swap-out thread, from a kernel snapshot: one unsigned 64-bit
+/// number as "HLT_VMFreezer_bytesWritten" and "com.quill.NANDInfo.VMFreezer.NumPhysicalWrites", 0
+/// without that counter. Empty without the snapshot or the thread.
 VESPRUN_EXPORT PropertyDict CopyVMFreezerNANDInfo() noexcept;
 
 }  // namespace vesprun

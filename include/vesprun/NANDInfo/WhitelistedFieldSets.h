@@ -8,29 +8,27 @@
 
 namespace vesprun {
 
-/// The FTL fields of now with "HLT_APIErrorMessage", unfiltered. Nothing when `enabled` is 0 or on
-/// failure.
+/// The current FTL fields with "HLT_APIErrorMessage", unfiltered. Nothing on failure or when
+/// `enabled` is 0.
 VESPRUN_EXPORT std::optional<PropertyDict> CopyNANDFTLInfo(bool useStatKeyParser,
                                                            std::uint32_t enabled) noexcept;
 
-// The sets of storage statistics that may leave the device. Each is cut down to the fields of its
-// table and, with `round`, its numbers keep the digits that the table gives. A set holds what could
-// be had, and "HLT_APIErrorMessage", the first error text of the process.
+// Storage statistics that may leave the device: the fields of each set's table, as far as they can
+// be had, with `round` cut to the table's digits, and "HLT_APIErrorMessage", the first error text
+// of the process.
 
-/// The FTL fields of now and the fields derived from them. Without the former the error text is all
-/// there is.
+/// The current FTL fields and those derived from them; only the error text without the former.
 VESPRUN_EXPORT PropertyDict CopyWhitelistedNANDFTLInfo(bool round) noexcept;
 
-/// Nothing. Other programs may look for it.
+/// Nothing. Other programs look the name up.
 VESPRUN_EXPORT std::optional<PropertyDict> CopyWhitelistedNANDFTLCountersInfo() noexcept;
 
-/// The set of each MSP under its index ("0", "1" and so on), beside the error text. With each come,
-/// unrounded, the fields derived for the storage as a whole and the 16-bit parts of the firmware's
-/// version, "fw_version_identifier_0" (the lowest) to "fw_version_identifier_3".
+/// The set of each MSP by index ("0", "1", ...), and the error text beside them. Each also has,
+/// unrounded, the derived fields of the whole storage and the 16-bit parts of the firmware version,
+/// "fw_version_identifier_0" (lowest) to "fw_version_identifier_3".
 VESPRUN_EXPORT PropertyDict CopyWhitelistedNANDMSPInfo(bool round) noexcept;
 
-/// Six derived fields, each when it can be had, and the sizes and update counts of the stored
-/// images, 0 where the service does not know.
+/// Six derived fields, and the sizes and update counts of the stored images, 0 when unknown.
 VESPRUN_EXPORT PropertyDict CopyWhitelistedStorageStats(bool round) noexcept;
 
 }  // namespace vesprun

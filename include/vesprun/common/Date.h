@@ -5,8 +5,8 @@
 
 namespace vesprun {
 
-/// An instant, in seconds since 1970-01-01 00:00 UTC (leap seconds not counted) and nanoseconds
-/// after that second. `nanoseconds` is always 0 to 999,999,999, also before 1970.
+/// Seconds since 1970-01-01 00:00 UTC without leap seconds, and nanoseconds after that second, 0 to
+/// 999,999,999 (before 1970 as well).
 struct Date {
   std::int64_t seconds = 0;
   std::uint32_t nanoseconds = 0;

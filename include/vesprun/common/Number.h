@@ -27,8 +27,7 @@ inline constexpr double kTwoTo64 = 18446744073709551616.0;
 
 }  // namespace detail
 
-/// A double as a signed 64-bit integer: truncated toward zero, saturating at the ends of the range,
-/// 0 for NaN.
+/// Truncates toward zero, saturates at the ends of the range; NaN is 0.
 inline std::int64_t saturatingTruncate(double value) {
   if (std::isnan(value)) {
     return 0;
@@ -49,12 +48,11 @@ concept NumberType = std::same_as<T, std::int8_t> || std::same_as<T, std::int16_
     std::same_as<T, std::uint32_t> || std::same_as<T, std::uint64_t> || std::same_as<T, float> ||
     std::same_as<T, double>;
 
-/// A number that remembers which C type it was made from.
+/// A number that knows the C type it was made from.
 ///
-/// The readers convert as follows. An integer read as another integer type keeps its low bits
-/// (two's complement). A fraction read as an integer is truncated toward zero and saturates at the
-/// ends of the 64-bit type, and then keeps its low bits; NaN is 0. Any number can be read as a
-/// double.
+/// Read as an integer, an integer keeps its low bits (two's complement); a fraction is truncated
+/// toward zero, saturates at 64 bits and then keeps its low bits; NaN is 0. Any number can be read
+/// as a double.
 class Number {
  public:
   template <NumberType T>
@@ -70,7 +68,7 @@ class Number {
   constexpr bool isFloatingPoint() const {
     return _kind == NumberKind::Float || _kind == NumberKind::Double;
   }
-  /// True for a signed integer kind; the floating-point kinds are neither signed nor unsigned.
+  /// Fractions are neither signed nor unsigned.
   constexpr bool isSigned() const { return _kind <= NumberKind::Int64; }
 
   std::int64_t asInt64() const;
@@ -79,7 +77,7 @@ class Number {
   std::uint32_t asUInt32() const { return static_cast<std::uint32_t>(asUInt64()); }
   double asDouble() const;
 
-  /// True when both have the same mathematical value, whatever their kinds. NaN equals nothing.
+  /// Equal in mathematical value, whatever the kinds. NaN equals nothing.
   friend bool operator==(const Number& left, const Number& right);
 
  private:
@@ -125,7 +123,7 @@ inline std::uint64_t Number::asUInt64() const {
   if (_real >= detail::kTwoTo64) {
     return std::numeric_limits<std::uint64_t>::max();
   }
-  // A negative fraction takes the bits of its signed reading, as a negative integer does.
+  // As for negative integers: the bits of the signed reading.
   return _real >= 0 ? static_cast<std::uint64_t>(_real)
                     : static_cast<std::uint64_t>(saturatingTruncate(_real));
 }

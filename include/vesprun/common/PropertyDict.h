@@ -16,8 +16,8 @@
 
 namespace vesprun {
 
-/// A dictionary of `PropertyValue` with string keys. Entries keep the order in which their keys
-/// were first set; setting a key again replaces its value in place. Look-up takes constant time.
+/// A dictionary of `PropertyValue` by string. Entries keep the order in which keys were first set;
+/// setting a key again replaces its value in place. Look-up takes constant time.
 class PropertyDict {
   struct KeyHash {
     using is_transparent = void;
@@ -45,7 +45,7 @@ class PropertyDict {
   PropertyDict& operator=(PropertyDict&&) noexcept = default;
   ~PropertyDict() = default;
 
-  /// The value under `key`, or null. Valid until the dictionary is changed.
+  /// Null if there is none. Valid until the dictionary is changed.
   const PropertyValue* find(std::string_view key) const {
     if (_many) {
       const auto entry = _many->find(key);
@@ -56,7 +56,7 @@ class PropertyDict {
   }
   bool contains(std::string_view key) const { return find(key) != nullptr; }
 
-  // The same for one type: null too when the value is of another.
+  // Null also for a value of another type.
   const PropertyDict* findDict(std::string_view key) const {
     return find<PropertyDict>(key, &PropertyValue::dict);
   }
@@ -82,13 +82,13 @@ class PropertyDict {
       }
       makeMap(kMostFew + 1);
     }
-    // Most keys are new: one search finds that out and where they go.
+    // One search both finds out whether the key is new, as most are, and where it goes.
     auto [entry, isNew] = _many->try_emplace(std::string(key), std::move(value));
     if (!isNew) {
       entry.value() = std::move(value);  // which was not taken
     }
   }
-  /// Removes the entry, keeping the order of the others; false when there was none.
+  /// Keeps the order of the others; false when there was none.
   bool remove(std::string_view key) {
     if (_many) {
       return _many->erase(key) != 0;
@@ -138,7 +138,7 @@ class PropertyDict {
     return value != nullptr ? (value->*typed)() : nullptr;
   }
 
-  // There are many small dictionaries: they do without a hash table.
+  // Most dictionaries are small and need no hash table.
   static constexpr std::size_t kMostFew = 8;
 
   const Entries& entries() const { return _many ? _many->values_container() : _few; }

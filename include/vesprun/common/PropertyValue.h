@@ -18,13 +18,12 @@ class PropertyValue;
 using PropertyArray = std::vector<PropertyValue>;
 using Bytes = std::vector<std::uint8_t>;
 
-/// The dynamically typed value that the whole system exchanges: dictionary, array, string, number,
-/// boolean, byte data or date. A value owns everything in it; copying copies deeply, moving is
-/// cheap. It takes 16 bytes, and nothing else when it is an empty dictionary, array, string or
-/// data.
+/// A dynamically typed value: dictionary, array, string, number, boolean, data or date. It owns its
+/// content; copies are deep, moves cheap. It takes 16 bytes, and no others for an empty dictionary,
+/// array, string or data.
 ///
-/// The readers `dict()` to `date()` return a pointer to the content, or null when the value is of
-/// another type. The pointer is valid until the value is changed, moved or destroyed.
+/// The readers `dict()` to `date()` return null for another type. Their pointer is valid until the
+/// value is changed, moved or destroyed.
 class PropertyValue {
  public:
   PropertyValue(PropertyDict dict);  // NOLINT(google-explicit-constructor): a value is any of these
@@ -65,15 +64,14 @@ class PropertyValue {
   const Bytes* data() const { return content<Bytes>(Type::Data); }
   const Date* date() const { return content<Date>(Type::Date); }
 
-  /// Equal type and content. Numbers compare by value, not by kind; dictionaries compare as sets of
-  /// entries, whatever their order.
+  /// Equal in type and content. Numbers compare by value, whatever the kind; dictionaries
+  /// regardless of order.
   friend bool operator==(const PropertyValue& left, const PropertyValue& right);
 
  private:
   enum class Type : std::uint8_t { Number, Boolean, Dict, Array, String, Data, Date };
 
-  // What is neither a number nor a boolean lies in a box on the heap, whose address is kept as the
-  // number; 0 when it is empty.
+  // Other types lie in a box on the heap, whose address is kept as the number; 0 when it is empty.
   template <typename T>
   PropertyValue(Type type, T content) : _number(0U), _type(type) {
     if (content != T()) {

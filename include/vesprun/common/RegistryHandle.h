@@ -4,8 +4,7 @@
 
 namespace vesprun {
 
-/// A handle of a registry object (an entry or an iterator) or of a user-client connection of the
-/// device registry; 0 is none.
+/// A handle of a registry object or user-client connection; 0: none.
 using RegistryHandle = std::uint32_t;
 
 }  // namespace vesprun

@@ -5,8 +5,8 @@
 
 namespace vesprun {
 
-/// The storage controller as `findNandExporter` finds it, and one user client of it; both are given
-/// back at its end. Failures are lines on the standard error stream.
+/// The storage controller as `findNandExporter` finds it and one user client of it, both returned
+/// at the end. Failures are lines on standard error.
 class Controller {
  public:
   Controller() : _service(findNandExporter(_exporter)) {}
@@ -14,13 +14,13 @@ class Controller {
   Controller(const Controller&) = delete;
   Controller& operator=(const Controller&) = delete;
 
-  /// False when there is no controller, in a line that begins with `complainer`, or when it
-  /// refuses.
+  /// False when it refuses, or, with a line that begins with `complainer`, when there is no
+  /// controller.
   bool open(const char* complainer = "");
-  /// Closes it, unless it is closed; false when that fails.
+  /// False when closing fails; nothing to close is fine.
   bool close();
 
-  /// The controller's table entry; the ending one without a controller.
+  /// Its table entry; the ending one without a controller.
   nand_exporter_t& exporter() const { return *_exporter; }
   RegistryHandle service() const { return _service.get(); }
   RegistryHandle connection() const { return _connection; }

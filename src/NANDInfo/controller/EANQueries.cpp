@@ -7,7 +7,7 @@ constexpr const char* kServiceClass = "QuillNVMeEAN";
 constexpr std::uint32_t kImageSizeMethod = 3;
 constexpr std::uint32_t kUpdateCountMethod = 7;
 
-/// The two names are those in the text of a connection and of a call that failed.
+/// The log names the two failures by different names.
 std::uint64_t ask(std::uint32_t method, const char* name, const char* callName,
                   std::uint32_t code) {
   const auto character = [code](unsigned index) {

@@ -8,8 +8,8 @@
 
 namespace vesprun {
 
-/// Runs the body of an operation that other programs call. Without an open device, or when the body
-/// throws (memory that runs out), the error is recorded and the result is the empty one.
+/// Runs an operation that other programs call. Without an open device, or when the body throws (out
+/// of memory), the error is recorded and the result is empty.
 template <typename Body>
 std::invoke_result_t<Body&> runEntryPoint(const char* operation, Body body) noexcept {
   if (!platformIsInstalled()) {

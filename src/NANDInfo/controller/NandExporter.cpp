@@ -7,6 +7,7 @@
 #include "NANDInfo/parsers/ORUFTLParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
+#include "common/ProcessState.h"
 #include "platform/RegistryObject.h"
 
 namespace vesprun {
@@ -60,12 +61,16 @@ std::array<nand_exporter_t, 4> nand_exporters_tunnel{
     nand_exporter_t{},
 };
 
-void forgetNandExporterHandles() {
+namespace {
+
+const ProcessState kHandleState([] {
   for (nand_exporter_t& entry : nand_exporters_tunnel) {
     entry.connection = 0;
     entry.service = 0;
   }
-}
+});
+
+}  // namespace
 
 RegistryHandle FindServiceUsingIterator(const std::string& className) {
   DeviceRegistry& registry = platform().deviceRegistry();

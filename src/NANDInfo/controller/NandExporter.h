@@ -12,8 +12,7 @@ namespace vesprun {
 class GenericParserCxt;
 struct ORUStatsContext;
 
-/// The tunnel opcodes of one command: the one sent to ask for the size of the answer, and the one
-/// sent to fetch it.
+/// The opcodes that ask for an answer's size and fetch it.
 struct TunnelSelector {
   std::uint32_t sizeOpcode;
   std::uint32_t dataOpcode;
@@ -29,16 +28,16 @@ inline constexpr TunnelSelector snapshotSelectors{22, 22};
 inline constexpr TunnelSelector snapshotHeaderSelectors{145, 145};
 inline constexpr TunnelSelector bandStatsSelector{11, 11};
 
-/// One class of storage controller and the way to talk to it. A getter or parser that a controller
-/// does not offer is null. Only `connection` and `service` change at run time.
+/// A class of storage controller and how to talk to it. Getters and parsers that it does not offer
+/// are null. Only `connection` and `service` change at run time.
 struct nand_exporter_t {
   using SelectorGetter = const TunnelSelector* (*)();
-  /// Fills a context from a buffer, outside of which it never reads. False or 0 is failure.
+  /// Fills a context from a buffer, never reading outside. False or 0 is failure.
   using StatsParser = bool (*)(ORUStatsContext&, std::span<const std::uint8_t>);
   using FieldParser = std::uint32_t (*)(GenericParserCxt&, std::span<const std::uint8_t>);
 
   const char* name;                     ///< registry class of the driver
-  const char* propertyKey;              ///< registry property with the controller's characteristics
+  const char* propertyKey;              ///< registry property of the characteristics
   RegistryHandle connection;            ///< user client, see `findNandExporterNew`
   RegistryHandle service;               ///< its service, see `findNandExporterNew`
   std::uint32_t contentDeletionMethod;  ///< `kMethodNotOffered` when there is none
@@ -63,31 +62,28 @@ struct nand_exporter_t {
 
 inline constexpr std::uint32_t kMethodNotOffered = 0xFFFFFFFF;
 
-/// The known controllers in the order in which they are looked for, then an ending entry with
-/// every field 0. One table for the process, without a lock: look-ups must not overlap.
+/// The known controllers in search order, then an ending entry of zeros. One table for the process,
+/// without a lock: look-ups must not overlap.
 extern std::array<nand_exporter_t, 4> nand_exporters_tunnel;
 
-/// Forgets the handles in the table, as in a new process; nothing is closed or released.
-void forgetNandExporterHandles();
-
-/// The first object of the registry, hidden from matching or not, that conforms to the class. The
-/// caller releases it. 0: none.
+/// The first object of the registry, matchable or not, that conforms to the class; 0 if none does.
+/// The caller releases it.
 RegistryHandle FindServiceUsingIterator(const std::string& className);
 
-/// The service of the first known controller that is present, matched by class or, when no class
-/// matches, found by walking the registry. `exporter` becomes its table entry. 0 when there is
-/// none; `exporter` is then the ending entry. Opens nothing; the caller releases the service.
+/// The service of the first known controller, matched by class or else found by walking the
+/// registry; the caller releases it. `exporter` becomes its table entry. 0 and the ending entry
+/// when there is none. Opens nothing.
 RegistryHandle findNandExporter(nand_exporter_t*& exporter);
 
-/// Opens the first known controller that can be matched and opened. True: the entry `exporter`
-/// holds the connection and the service, for the caller to give back with `ReleaseIOInterfaces`.
-/// False: none, and `exporter` is the ending entry without handles.
+/// Opens the first known controller that can be matched and opened. True: `exporter` holds the
+/// connection and the service, until `ReleaseIOInterfaces`. False: `exporter` is the ending entry,
+/// without handles.
 bool findNandExporterNew(nand_exporter_t*& exporter);
 
-/// Closes the entry's connection and releases its service, if any, and forgets them.
+/// Closes the connection and releases the service, if any, and forgets them.
 void ReleaseIOInterfaces(nand_exporter_t& exporter);
 
-/// The same for handles that lie elsewhere.
+/// The same for other handles.
 void closeAndForget(RegistryHandle& connection, RegistryHandle& service);
 
 }  // namespace vesprun

@@ -8,7 +8,7 @@
 
 namespace vesprun {
 
-// calloc takes large blocks straight from the system: zero, and without touching them.
+// calloc gets large blocks zeroed from the system, without touching them.
 TunnelBuffer::TunnelBuffer(std::size_t size)
     : _bytes(static_cast<std::uint8_t*>(std::calloc(std::max<std::size_t>(size, 1), 1))),
       _size(size) {}

@@ -11,8 +11,7 @@
 
 namespace vesprun {
 
-/// The struct input of both phases of a tunnel command, as it lies in memory: little-endian, at
-/// these offsets.
+/// The struct input of both phases of a tunnel command: little-endian, at these offsets.
 struct TunnelRequest {
   std::uint32_t opcode = 0;        ///< 0
   std::uint32_t sizeQuery = 0;     ///< 4: 1 when the size is asked for, else 0; flags for a list
@@ -26,18 +25,18 @@ struct TunnelRequest {
 };
 static_assert(std::endian::native == std::endian::little);
 
-/// Bytes that a driver fills: zero at first, and of the size that the driver asks for, which may be
-/// close to 4 GiB. Memory that nobody touches is not used up.
+/// Zeroed bytes for a driver to fill, of the size that it asks for, which may be close to 4 GiB.
+/// Untouched memory is not used up.
 class TunnelBuffer {
  public:
   TunnelBuffer() = default;
-  /// Without memory (see `operator bool`) when the size cannot be had.
+  /// Empty (see `operator bool`) when there is no memory.
   explicit TunnelBuffer(std::size_t size);
 
   explicit operator bool() const { return _bytes != nullptr; }
   std::size_t size() const { return _bytes ? _size : 0; }
   std::span<std::uint8_t> bytes() { return {_bytes.get(), size()}; }
-  /// The first `length` bytes, or all when it has fewer.
+  /// At most the first `length` bytes.
   std::span<const std::uint8_t> bytes(std::uint64_t length) const;
 
  private:
@@ -49,13 +48,12 @@ class TunnelBuffer {
   std::size_t _size = 0;
 };
 
-/// Asks the controller for the size of its answer, then for the answer. `request` carries the
-/// argument; everything else in it is set here. `length` goes into the request when it comes in.
+/// Asks the controller for the answer's size, then for the answer. `request` brings the argument,
+/// `length` goes into the request; everything else is set here.
 ///
-/// True: `buffer` is a new block of exactly the stated size and `length` what the driver reports,
-/// but never more than that size, so that nobody reads outside. False, with the error recorded:
-/// the block is not handed out; when the size could not be had, `buffer` becomes empty and `length`
-/// 0, else both are as they were.
+/// True: `buffer` is a new block of the stated size, and `length` the driver's, cut to that size so
+/// that nobody reads outside. False, with the error recorded: when the size could not be had,
+/// `buffer` becomes empty and `length` 0, else both stay.
 bool executeTunnelCommand(RegistryHandle connection, const nand_exporter_t& exporter,
                           const TunnelSelector* selector, TunnelRequest& request,
                           TunnelBuffer& buffer, std::uint64_t& length);

@@ -12,7 +12,7 @@
 namespace vesprun {
 namespace {
 
-/// What each step sends. The last one only has a name.
+/// The last step has only a name.
 constexpr std::array kEH_Extraction_Step_Names{
     "FTL big view",       "MSP stats",           "storage stats",        "NVRAM stat",
     "FTL statsMag daily", "FTL statsMag weekly", "FTL statsMag monthly", "FTL counters"};
@@ -20,7 +20,7 @@ constexpr std::array kEH_Extraction_Step_Names{
 constexpr std::uint32_t kDailyStep = 4;
 constexpr std::uint32_t kMonthlyStep = 6;
 
-/// Nothing for a step that is only a name.
+/// Nothing for a step that has only a name.
 std::optional<PropertyDict> resultOfStep(std::uint32_t step) {
   switch (step) {
     case 0:

@@ -6,23 +6,22 @@
 
 namespace vesprun {
 
-// The steps of the event extraction that send storage statistics, unrounded. The result is what the
-// step sent: the payloads that the event service took in one dictionary, possibly none; or only
-// "com.quill.NANDInfo.ErrorMessage" when there was nothing to send.
+// Steps of the event extraction. They send unrounded statistics and return what was sent: the
+// payloads that the event service took in one dictionary, or only "com.quill.NANDInfo.ErrorMessage"
+// when there was nothing to send.
 
-/// The event of FTL counters, then the two of FTL histograms.
+/// One event of FTL counters, two of FTL histograms.
 PropertyDict createAndLogFTLStatFieldsToEventHubForEvent();
 
-/// One event for each MSP: the fields of its set with "msp_index", the text of its index, and
-/// "total_nof_msps", how many there are. The result has the last payload that was taken, under
-/// "msp_index". An event that is not taken is recorded as an error.
+/// An event for each MSP: the fields of its set, "msp_index" (text) and "total_nof_msps". The
+/// result has the last payload taken as "msp_index"; an event that is not taken is recorded as an
+/// error.
 PropertyDict createAndLogMSPFieldsToEventHubForEvent();
 
-/// The event of the storage statistics.
 PropertyDict createAndLogStorageStatsToEventHubForEvent();
 
-/// What the stats magazine holds of a period: of a day (view 0), with the history of
-/// `CopySMagNANDFTLCustomHistoryInfo`, of a week (1) or of a month (2).
+/// The stats magazine's view of a day (0, with `CopySMagNANDFTLCustomHistoryInfo`), a week (1) or a
+/// month (2).
 PropertyDict createAndLogSMagFTLFieldsToEventHubForEvent(std::uint32_t view);
 
 }  // namespace vesprun

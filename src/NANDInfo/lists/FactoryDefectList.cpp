@@ -3,21 +3,20 @@
 #include <algorithm>
 #include <cstdio>
 
-#include "NANDInfo/lists/StructuredLogState.h"
+#include "NANDInfo/lists/ListRecord.h"
 #include "common/LittleEndian.h"
 #include "platform/DictionaryHelpers.h"
-#include "platform/Platform.h"
 
 namespace vesprun {
 namespace {
 
-// The header: a word that is not read, the factory count, the number of records.
+// The header: an unused word, the factory count, the number of records.
 constexpr std::size_t kFactoryCountOffset = 4;
 constexpr std::size_t kRecordCountOffset = 8;
 constexpr std::size_t kListHeaderSize = 12;
 constexpr std::size_t kRecordSize = 32;
 
-/// A defect as it lies in the buffer, 32 bytes.
+/// A defect record, 32 bytes.
 struct DefectRecord {
   std::uint16_t bus;
   std::uint16_t chipEnable;
@@ -40,7 +39,7 @@ struct DefectRecord {
         temperature(static_cast<std::int8_t>(bytes[24])),
         mode(loadLittleEndian<std::uint32_t>(bytes + 28)) {}
 
-  /// The reason with what the mode adds to it; wraps as 32 bits do.
+  /// The reason adjusted by the mode, in 32 bits.
   std::uint32_t adjustedReason() const {
     switch (mode) {
       case 0:
@@ -58,10 +57,6 @@ struct DefectRecord {
 
 PropertyValue signedNumber(std::uint32_t word) { return static_cast<std::int32_t>(word); }
 
-void log(const PropertyDict& record) {
-  platform().logsmith().FLLogStructuredData(kListRecordType, record);
-}
-
 void logHeader(std::uint32_t factoryCount, const PropertyValue* properties) {
   PropertyDict record{{"Factory Count", signedNumber(factoryCount)}};
   const PropertyDict* characteristics = properties != nullptr ? properties->dict() : nullptr;
@@ -70,7 +65,7 @@ void logHeader(std::uint32_t factoryCount, const PropertyValue* properties) {
   if (description != nullptr) {
     record.set("com.quill.NANDInfo.nandDesc", description->asInt32());
   }
-  log(record);
+  logListRecord(record);
 }
 
 void logDefect(const DefectRecord& defect, bool modeAdjustsReason) {
@@ -84,7 +79,7 @@ void logDefect(const DefectRecord& defect, bool modeAdjustsReason) {
       {"Page", signedNumber(defect.page)},
   };
   setNumberValueForType(record, "Temperature", &defect.temperature, PVNumberType::Int8);
-  log(record);
+  logListRecord(record);
 }
 
 }  // namespace

@@ -8,14 +8,12 @@
 
 namespace vesprun {
 
-/// Logs a controller's list of factory defects as structured records of type 176: one with "Factory
-/// Count" and, when the controller's properties have it, "com.quill.NANDInfo.nandDesc"; then one
-/// for each defect that lies wholly within the buffer. All numbers are signed 32-bit, but for
-/// "Temperature", which is signed 8-bit.
+/// Logs a controller's factory defects as structured records of type 176: one with "Factory Count"
+/// and, if the controller's properties have it, "com.quill.NANDInfo.nandDesc"; then one for each
+/// defect wholly in the buffer. Numbers are signed 32-bit, "Temperature" signed 8-bit.
 ///
-/// `properties` (may be null or anything but a dictionary) and `className` are the controller's.
-/// Always true. A buffer too short for the factory count has nothing to log, one too short for the
-/// record count no records.
+/// `properties` may be null or no dictionary. Always true: a buffer without the factory count logs
+/// nothing, one without the record count no defects.
 bool LogFactoryDefectList(std::span<const std::uint8_t> buffer, const PropertyValue* properties,
                           std::string_view className);
 

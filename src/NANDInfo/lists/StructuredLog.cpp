@@ -8,12 +8,11 @@
 #include <optional>
 #include <span>
 #include <string_view>
-#include <vector>
 
+#include "NANDInfo/StructuredLogState.h"
 #include "NANDInfo/controller/Controller.h"
 #include "NANDInfo/controller/TunnelCommand.h"
 #include "NANDInfo/lists/FactoryDefectList.h"
-#include "NANDInfo/lists/StructuredLogState.h"
 #include "NANDInfo/lists/TelemetryList.h"
 #include "NANDInfo/lists/WriteAmplification.h"
 #include "NANDInfo/sets/StatisticsGathering.h"
@@ -23,17 +22,16 @@
 namespace vesprun {
 namespace {
 
-// The size query of a request for a list is a word of flags, with the kind of the list in bits 2 to
-// 9.
+// A list request's size query is a word of flags, with the kind of the list in bits 2 to 9.
 constexpr std::uint32_t kSizePhase = 1;
 constexpr std::uint32_t kCallersFlag = 2;
 constexpr unsigned kKindShift = 2;
 
-/// Takes a list as the controller gave it, the controller's properties and its class name. False
-/// when the list could not be handled.
+/// Handles a list as the controller sent it, with the controller's properties and class name. False
+/// on failure.
 using ListHandler = bool (*)(std::span<const std::uint8_t>, const PropertyValue*, std::string_view);
 
-/// A type of list, of which a controller may have several kinds.
+/// A type of list; a controller may have several kinds.
 struct ListType {
   nand_exporter_t::SelectorGetter nand_exporter_t::*getter;
   ListHandler handler;
@@ -49,28 +47,6 @@ constexpr std::array<ListType, 3> kListTypes{{
     {&nand_exporter_t::getDefectsListSelectors, LogFactoryDefectList, 1,
      "Defects list retrieval is not supported\n"},
 }};
-
-/// One list to fetch.
-struct HandlerEntry {
-  nand_exporter_t::SelectorGetter getter;
-  ListHandler handler;
-  std::uint32_t kind;
-};
-
-std::vector<HandlerEntry> handlerList(const nand_exporter_t& exporter) {
-  std::vector<HandlerEntry> entries;
-  for (const ListType& type : kListTypes) {
-    const nand_exporter_t::SelectorGetter getter = exporter.*type.getter;
-    if (getter == nullptr) {
-      std::fputs(type.whenNotOffered, stderr);
-      continue;
-    }
-    for (std::uint32_t kind = 0; kind < type.kindCount; ++kind) {
-      entries.push_back({getter, type.handler, kind});
-    }
-  }
-  return entries;
-}
 
 void decideOnValidityList() {
   gCurrentUserWamp = 0.0;
@@ -93,8 +69,8 @@ void decideOnValidityList() {
   gNeedValidityList = isAboveWriteAmplificationThreshold(amplification.user) || forced;
 }
 
-/// A list, in a buffer of the size that the controller stated first; what it did not deliver of it
-/// is zero. Without memory when there is none. `index` is the list's place in the log.
+/// A list in a buffer of the size stated first; undelivered bytes are zero. Empty on failure.
+/// `index` is for the error text.
 TunnelBuffer fetchList(const Controller& controller, const TunnelSelector& selector,
                        std::uint32_t flags, int index) {
   DeviceRegistry& registry = platform().deviceRegistry();
@@ -114,7 +90,7 @@ TunnelBuffer fetchList(const Controller& controller, const TunnelSelector& selec
   if (size == 0) {
     return {};
   }
-  // Need not be aligned to a page: the driver copies into it.
+  // Page alignment is not needed: the driver copies.
   TunnelBuffer list(size);
   if (!list) {
     std::fprintf(stderr, "Could not malloc %zu bytes", std::size_t{size});
@@ -148,17 +124,24 @@ bool DumpStorageStructuredLog(bool callersFlag) {
     std::fputs("failed to create dictionary", stderr);
     return false;
   }
+  for (const ListType& type : kListTypes) {
+    if (exporter.*type.getter == nullptr) {
+      std::fputs(type.whenNotOffered, stderr);
+    }
+  }
   bool result = true;
   int index = 0;
-  for (const HandlerEntry& entry : handlerList(exporter)) {
-    const TunnelSelector* selector = entry.getter();
-    const std::uint32_t flags = (callersFlag ? kCallersFlag : 0) | entry.kind << kKindShift;
-    if (selector == nullptr) {
-      result = false;
-    } else if (const TunnelBuffer list = fetchList(controller, *selector, flags, index)) {
-      result = entry.handler(list.bytes(list.size()), &*properties, exporter.name) && result;
+  for (const ListType& type : kListTypes) {
+    const std::uint32_t kinds = exporter.*type.getter != nullptr ? type.kindCount : 0;
+    for (std::uint32_t kind = 0; kind < kinds; ++kind, ++index) {
+      const TunnelSelector* selector = (exporter.*type.getter)();
+      const std::uint32_t flags = (callersFlag ? kCallersFlag : 0) | kind << kKindShift;
+      if (selector == nullptr) {
+        result = false;
+      } else if (const TunnelBuffer list = fetchList(controller, *selector, flags, index)) {
+        result = type.handler(list.bytes(list.size()), &*properties, exporter.name) && result;
+      }
     }
-    ++index;
   }
   return result;
 }

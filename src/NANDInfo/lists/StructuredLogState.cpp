@@ -1,4 +1,6 @@
-#include "NANDInfo/lists/StructuredLogState.h"
+#include "NANDInfo/StructuredLogState.h"
+
+#include "common/ProcessState.h"
 
 namespace vesprun {
 
@@ -7,11 +9,14 @@ std::uint8_t gNeedValidityList = 0;
 double gCurrentUserWamp = 0.0;
 double gCurrentSysWamp = 0.0;
 
-void forgetStructuredLogState() {
+namespace {
+
+const ProcessState kStructuredLogState([] {
   gForceCollectionSet = 0;
   gNeedValidityList = 0;
   gCurrentUserWamp = 0.0;
   gCurrentSysWamp = 0.0;
-}
+});
 
+}  // namespace
 }  // namespace vesprun

@@ -8,11 +8,9 @@
 #include <optional>
 #include <string>
 
-#include "NANDInfo/lists/HexText.h"
-#include "NANDInfo/lists/StructuredLogState.h"
+#include "NANDInfo/lists/ListRecord.h"
 #include "NANDInfo/parsers/VendorCounterParsers.h"
 #include "platform/DictionaryHelpers.h"
-#include "platform/Platform.h"
 
 namespace vesprun {
 namespace {
@@ -22,19 +20,19 @@ constexpr std::size_t kWordSize = 4;
 constexpr std::size_t kBusEntrySize = 32;
 constexpr std::uint64_t kBytesPerBus = kCounterRegionSize + kBusEntrySize;
 
-/// The words of a bus entry, in order; a last one is not used.
+/// The words of a bus entry; the last one is unused.
 constexpr std::array<const char*, 7> kBusEntryKeys{"RD",  "PE",         "Max_PE_rate", "t0",
                                                    "Ret", "block_type", "num_pages"};
 static_assert((kBusEntryKeys.size() + 1) * kWordSize == kBusEntrySize);
 
-/// Everything that depends on the flash in use.
+/// What depends on the flash in use.
 struct CounterLayout {
   void (*parse)(CounterRegion, NandChannelCounters&);
   std::size_t readStages = 23;
   std::size_t dspParameters = 12;
   CounterFieldId chipsOwnBins = CounterFieldId::NotUsed;
 
-  /// How many elements of a field are logged.
+  /// Logged elements of a field.
   std::size_t count(CounterFieldId id) const {
     switch (id) {
       case CounterFieldId::ReadStage:
@@ -57,7 +55,7 @@ struct Characteristics {
   std::int32_t busCount;
 };
 
-/// The first four hexadecimal digits, and the eight behind them without the last two.
+/// Four hexadecimal digits, then eight, of which the last two do not count.
 std::uint64_t manufacturerKey(std::string_view text) {
   constexpr std::uint32_t kVendorDigits = 4;
   constexpr std::uint32_t kPartDigits = 8;
@@ -90,8 +88,8 @@ CounterLayout counterLayout(std::string_view chip, std::string_view manufacturer
   return vendorLayout(key);
 }
 
-/// Null, with a line on the standard error stream, which says `ifNoText` when it is no text, when
-/// the characteristic is missing or unusable.
+/// Null, with a line on standard error, when the characteristic is missing or not a text
+/// (`ifNoText`).
 const std::string* readText(const PropertyDict& characteristics, const char* key,
                             const char* ifNoText) {
   const PropertyValue* value = characteristics.find(key);
@@ -130,12 +128,12 @@ std::optional<Characteristics> readCharacteristics(const PropertyValue* properti
     return std::nullopt;
   }
   const CounterLayout layout = counterLayout(*chip, *manufacturer);
-  const PropertyValue* busCount = characteristics->find("num-bus");
-  if (busCount == nullptr || busCount->number() == nullptr) {
+  const Number* busCount = characteristics->findNumber("num-bus");
+  if (busCount == nullptr) {
     std::fputs("ERROR: could not determine the number of channels\n", stderr);
     return std::nullopt;
   }
-  return Characteristics{layout, busCount->number()->asInt32()};
+  return Characteristics{layout, busCount->asInt32()};
 }
 
 PropertyDict busRecord(const std::uint8_t* busEntry, const NandChannelCounters& counters,
@@ -158,9 +156,37 @@ PropertyDict busRecord(const std::uint8_t* busEntry, const NandChannelCounters& 
 
 }  // namespace
 
+std::uint8_t hexStringToByte(std::string_view text, std::uint32_t length) {
+  unsigned value = 0;
+  for (char c : text.substr(0, std::min<std::size_t>(length, 2))) {
+    if (c >= 'A' && c <= 'Z') {
+      c = static_cast<char>(c - 'A' + 'a');
+    }
+    value *= 16;
+    if (c >= '0' && c <= '9') {
+      value += static_cast<unsigned>(c - '0');
+    } else if (c >= 'a' && c <= 'f') {
+      value += static_cast<unsigned>(c - 'a') + 10;
+    } else {
+      std::printf("unrecognized hex character: %c", c);
+    }
+  }
+  return static_cast<std::uint8_t>(value);
+}
+
+std::uint32_t hexStringToInt32(std::string_view text, std::uint32_t length) {
+  std::uint32_t value = 0;
+  for (std::string_view rest = text.substr(0, std::min<std::size_t>(length, 8)); !rest.empty();) {
+    const std::size_t byte = (rest.size() - 1) / 2;
+    value |= std::uint32_t{hexStringToByte(rest, 2)} << (8 * byte);
+    rest.remove_prefix(std::min<std::size_t>(rest.size(), 2));
+  }
+  return value;
+}
+
 bool LogNANDTelemetryList(std::span<const std::uint8_t> buffer,
                           const PropertyValue* characteristics, std::string_view /*className*/) {
-  // One for all buses: a layout writes the same words each time.
+  // One object for all buses: a layout always writes the same words.
   const std::unique_ptr<NandChannelCounters> counters(new (std::nothrow) NandChannelCounters());
   if (!counters) {
     std::fprintf(stderr, "ERROR: Could not malloc %zu bytes\n", sizeof *counters);
@@ -182,8 +208,7 @@ bool LogNANDTelemetryList(std::span<const std::uint8_t> buffer,
   for (std::size_t bus = 0; bus < busCount; ++bus) {
     const auto region = buffer.subspan(bus * kCounterRegionSize).first<kCounterRegionSize>();
     read->layout.parse(region, *counters);
-    platform().logsmith().FLLogStructuredData(
-        kListRecordType, busRecord(busEntries + bus * kBusEntrySize, *counters, read->layout));
+    logListRecord(busRecord(busEntries + bus * kBusEntrySize, *counters, read->layout));
   }
   return true;
 }

@@ -8,18 +8,25 @@
 
 namespace vesprun {
 
-/// Logs a controller's telemetry list as one structured record of type 176 for each NAND bus, all
-/// numbers signed 32-bit: wear figures of the bus, then its decoded counters.
+/// Logs a telemetry list as a structured record of type 176 for each NAND bus, in signed 32-bit
+/// numbers: wear figures of the bus, then its decoded counters.
 ///
-/// `characteristics` is the controller's dictionary: "chip-id" (at most 63 bytes) and
-/// "manufacturer-id" (hexadecimal digits; digits that are not there count as none) select the
-/// layout of the counters, "num-bus" the number of buses. With 0 buses, or fewer, there is nothing
-/// to log. `className` is not used.
+/// Of the controller's `characteristics`, "chip-id" (at most 63 bytes) and "manufacturer-id"
+/// (hexadecimal digits, possibly fewer than 12) select the layout of the counters; "num-bus" is the
+/// number of buses, of which 0 or fewer log nothing.
 ///
-/// False, with a line on the standard error stream and nothing logged, when a characteristic is
-/// missing or unusable, when the buffer does not hold all buses, or when there is no memory for
-/// the counters.
+/// False, with a line on standard error and nothing logged, when a characteristic is missing or
+/// unusable, the buffer does not hold all buses, or memory runs out.
 bool LogNANDTelemetryList(std::span<const std::uint8_t> buffer,
                           const PropertyValue* characteristics, std::string_view className);
+
+/// The value of up to two leading characters, at most `length`, as hexadecimal digits. Any other
+/// character prints "unrecognized hex character: %c", in lower case, to standard output and counts
+/// as 0.
+std::uint8_t hexStringToByte(std::string_view text, std::uint32_t length);
+
+/// The same for eight characters, in pairs from the left: "12345678" is 0x12345678. A last odd one
+/// is a byte of its own: "123" is 0x1203.
+std::uint32_t hexStringToInt32(std::string_view text, std::uint32_t length);
 
 }  // namespace vesprun

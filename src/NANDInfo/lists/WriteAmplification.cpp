@@ -26,7 +26,7 @@ double threshold() {
   return value > 0.0 && value < kThresholdLimit ? value : kDefaultThreshold;
 }
 
-/// Blocks written by that many erases of a band, for each block that the host wrote.
+/// Blocks written by so many band erases, for each block that the host wrote.
 float writesPerHostWrite(std::uint64_t erases, std::uint64_t blocksPerBand,
                          std::uint64_t hostWrites) {
   return static_cast<float>(static_cast<double>(erases) * static_cast<double>(blocksPerBand) /
@@ -36,7 +36,7 @@ float writesPerHostWrite(std::uint64_t erases, std::uint64_t blocksPerBand,
 }  // namespace
 
 WriteAmplification writeAmplification(const ORUStatsContext& statistics) {
-  // The geometry is multiplied in its own 32 bits and wraps there.
+  // The geometry multiplies, and wraps, in its own 32 bits.
   const std::uint32_t bytesPerBand = statistics.pagesPerVirtualBlock * statistics.bytesPerPage;
   std::uint64_t slcBlocksPerBand = 0;
   std::uint64_t intermediateErases = 0;

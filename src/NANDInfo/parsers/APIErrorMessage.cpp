@@ -6,10 +6,13 @@
 #include <new>
 #include <optional>
 
+#include "common/ProcessState.h"
+
 namespace vesprun {
 namespace {
 
 std::optional<std::array<char, 1024>> GlobalAPIErrorMessage;
+const ProcessState kErrorMessageState([] { GlobalAPIErrorMessage.reset(); });
 
 }  // namespace
 
@@ -31,7 +34,5 @@ std::string GetAPIErrorMessage() noexcept {
     return {};
   }
 }
-
-void forgetAPIErrorMessage() { GlobalAPIErrorMessage.reset(); }
 
 }  // namespace vesprun

@@ -6,17 +6,14 @@
 
 namespace vesprun {
 
-/// Sets of fields carry the first error text of the process under this key.
+/// The first error text of the process in sets of fields.
 inline constexpr std::string_view kAPIErrorMessageKey = "HLT_APIErrorMessage";
-/// What cannot be had at all is a dictionary with the reason under this key.
+/// The reason, in place of a result that cannot be had.
 inline constexpr std::string_view kNANDInfoErrorMessageKey = "com.quill.NANDInfo.ErrorMessage";
 
-/// Records the first error text of the process, formatted in the manner of printf and cut to 1023
-/// bytes. By convention it begins with the name of the operation that failed. Once a text has been
-/// recorded, even an empty one, further calls do nothing and do not look at their arguments.
+/// Records the first error text of the process, printf-style and cut to 1023 bytes. By convention
+/// it begins with the failed operation's name. Once there is a text, even an empty one, further
+/// calls do nothing.
 [[gnu::format(printf, 1, 2)]] void SetAPIErrorMessage(const char* format, ...) noexcept;
-
-/// Makes the process as new: nothing recorded. For tests; the job itself never forgets.
-void forgetAPIErrorMessage();
 
 }  // namespace vesprun

@@ -12,10 +12,8 @@
 
 namespace vesprun {
 
-/// What the parsers of statistics buffers fill: an ordered list of named unsigned 64-bit fields.
-/// Names may repeat; nothing is looked up while fields are appended.
-///
-/// All names lie one behind the other in one text, so that a field costs no allocation of its own.
+/// The result of the statistics parsers: an ordered list of named unsigned 64-bit fields, possibly
+/// with repeated names. All names share one text, so that a field needs no allocation of its own.
 class GenericParserCxt {
  public:
   static constexpr std::size_t kMaxNameLength = 98;  ///< longer names are cut
@@ -24,11 +22,11 @@ class GenericParserCxt {
     std::string_view name;  ///< valid until the context is changed
     std::uint64_t value;
 
-    /// The value in decimal.
+    /// In decimal.
     std::string text() const { return std::to_string(value); }
   };
 
-  /// Walks the fields in the order in which they were appended.
+  /// In the order in which fields were appended.
   class const_iterator {
    public:
     using iterator_category = std::input_iterator_tag;
@@ -57,7 +55,7 @@ class GenericParserCxt {
 
   std::size_t size() const { return _entries.size(); }
   bool empty() const { return _entries.empty(); }
-  /// The field at `index`, which is below `size()`.
+  /// `index` is below `size()`.
   Field operator[](std::size_t index) const {
     const std::size_t begin = index == 0 ? 0 : _entries[index - 1].nameEnd;
     const Entry& entry = _entries[index];
@@ -66,27 +64,26 @@ class GenericParserCxt {
   const_iterator begin() const { return {*this, 0}; }
   const_iterator end() const { return {*this, size()}; }
 
-  /// Appends a field named `prefix` and then `suffix`, cut to `kMaxNameLength` together. False, and
-  /// the context is as it was, when memory runs out.
+  /// Appends a field named `prefix` + `suffix`, cut to `kMaxNameLength`. False, and nothing
+  /// appended, when memory runs out.
   bool append(std::string_view prefix, std::string_view suffix, std::uint64_t value) noexcept;
   bool append(std::string_view name, std::uint64_t value) noexcept {
     return append({}, name, value);
   }
-  /// Appends `count` fields, each named `name` and its index in decimal, from 0: the little-endian
-  /// values of `width` bytes, 1 to 8, that lie end to end at `source`. False when memory ran out
-  /// for some of them, which are missing.
+  /// Appends `count` fields, named `name` + index from 0: the little-endian values of `width`
+  /// bytes, 1 to 8, at `source`. False when memory ran out for some, which are missing.
   bool appendArray(std::string_view name, const std::uint8_t* source, std::size_t width,
                    std::size_t count) noexcept;
-  /// Empties the context and gives its memory back.
+  /// Empties the context and frees its memory.
   void release() { *this = GenericParserCxt(); }
 
  private:
   struct Entry {
-    std::size_t nameEnd = 0;  ///< in `_names`; the name begins where the one before it ends
+    std::size_t nameEnd = 0;  ///< in `_names`; begins at the end of the one before
     std::uint64_t value = 0;
   };
 
-  /// May leave a part of the array when it throws.
+  /// May leave a part of the array behind when it throws.
   void appendAtOnce(std::string_view name, const std::uint8_t* source, std::size_t width,
                     std::size_t count);
 
@@ -94,32 +91,28 @@ class GenericParserCxt {
   std::vector<Entry> _entries;
 };
 
-/// Appends one field, named by `prefix` and then `suffix`, cut to 98 characters together. False,
-/// and nothing is appended, when memory runs out.
+/// Appends a field named `prefix` + `suffix`, cut to 98 characters. False, and nothing appended,
+/// when memory runs out.
 bool AddSingleValueToGenericContext(GenericParserCxt& ctx, std::string_view prefix,
                                     std::string_view suffix, std::uint64_t value);
 
-/// The most elements that one call of `AddMultipleFieldsToGenericContext` takes.
 inline constexpr std::uint32_t kMaxFieldsOfOneCall = 65'535;
 
-/// Appends the `count` little-endian elements of `width` bytes each that lie end to end at
-/// `source`, which holds at least as many bytes; it need not be aligned. One element is named
-/// `name`; of several, each is named `name` and its index in decimal, from 0. Names are cut to 98
-/// characters.
+/// Appends the `count` little-endian elements of `width` bytes at `source`, at any address. A
+/// single element is named `name`, several `name` + index from 0, cut to 98 characters.
 ///
-/// True, and nothing is appended, when `width` or `count` is 0. False, and nothing is appended,
-/// when `width` is above 8, or `count` above `kMaxFieldsOfOneCall`: such an array is refused as a
-/// whole, for a part of it would pass for all of it. False, too, when memory runs out for some
-/// elements, which are missing.
+/// True, and nothing appended, when `width` or `count` is 0. False, and nothing appended, when
+/// `width` is above 8, or `count` above `kMaxFieldsOfOneCall`: a part of the array would pass for
+/// all of it. False also when memory runs out for some elements, which are missing.
 bool AddMultipleFieldsToGenericContext(GenericParserCxt& ctx, std::string_view name,
                                        const std::uint8_t* source, std::uint32_t width,
                                        std::uint32_t count);
 
-/// Empties the context, which can be filled again.
+/// Empties the context for further use.
 void ReleaseGenericParserCxt(GenericParserCxt& ctx);
 
-/// A dictionary from field name to value, an unsigned 64-bit number, of the fields whose name
-/// `keeps` accepts. A repeated name keeps its first place and its last value.
+/// The fields whose names `keeps` accepts as a dictionary of unsigned 64-bit numbers. A repeated
+/// name keeps its first place and its last value.
 template <std::predicate<std::string_view> Filter>
 PropertyDict CreateDictFromCxt(const GenericParserCxt& ctx, const Filter& keeps) {
   PropertyDict dict;

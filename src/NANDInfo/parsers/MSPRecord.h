@@ -17,8 +17,8 @@ namespace vesprun {
 /// at any address.
 struct MSPRecordHeader {
   static constexpr std::size_t kSize = 2 + 2;
-  static constexpr std::uint16_t kFiller = 0x2FFE;     ///< a record that only takes up room
-  static constexpr std::uint16_t kEndMarker = 0x2FFF;  ///< nothing behind it counts
+  static constexpr std::uint16_t kFiller = 0x2FFE;     ///< padding
+  static constexpr std::uint16_t kEndMarker = 0x2FFF;  ///< ends the records
 
   std::uint16_t key;
   std::uint16_t length;
@@ -29,20 +29,20 @@ struct MSPRecordHeader {
   std::uint32_t encode() const { return std::uint32_t{length} << 16 | key; }
 };
 
-/// Walks the records of an MSP buffer, which it never reads outside of.
+/// Walks the records of an MSP buffer without reading outside.
 class MSPRecordReader {
  public:
   explicit MSPRecordReader(std::span<const std::uint8_t> buffer) : _rest(buffer) {}
 
   bool holdsHeader() const { return _rest.size() >= MSPRecordHeader::kSize; }
-  /// Takes the next header, which there must be, and moves behind it.
+  /// Reads the next header, which must be there.
   MSPRecordHeader readHeader() {
     return MSPRecordHeader::decodeFrom(
         loadLittleEndian<std::uint32_t>(read(MSPRecordHeader::kSize).data()));
   }
-  /// True when the payload of the header just read lies within the buffer.
+  /// True when the buffer holds the payload of the header just read.
   bool holds(const MSPRecordHeader& header) const { return header.length <= _rest.size(); }
-  /// Takes the next `size` bytes, which there must be, and moves behind them.
+  /// Reads the next `size` bytes, which must be there.
   std::span<const std::uint8_t> read(std::size_t size) {
     const std::span<const std::uint8_t> bytes = _rest.first(size);
     _rest = _rest.subspan(size);

@@ -14,7 +14,7 @@ namespace {
 
 constexpr std::uint32_t kNoId = 0xFFFF;
 
-/// How many fields of a record were taken; nothing when the walk has to end.
+/// The number of fields taken; nothing ends the walk.
 using Taken = std::optional<std::uint32_t>;
 
 bool append(GenericParserCxt& ctx, std::string_view name, const std::uint8_t* payload,

@@ -9,8 +9,7 @@
 namespace vesprun {
 namespace {
 
-/// Adds the elements that both the payload and the statistic have. False when the context takes
-/// none of them.
+/// Adds the elements that both payload and statistic have. False when the context takes none.
 bool take(GenericParserCxt& ctx, const ORUMSPKey& key, std::span<const std::uint8_t> payload,
           std::uint32_t& total) {
   const auto size = static_cast<std::uint32_t>(payload.size());
@@ -41,7 +40,7 @@ std::uint32_t ORUMSPParseBufferToCxt(GenericParserCxt& ctx, std::span<const std:
   MSPRecordReader reader(buffer);
   while (reader.holdsHeader()) {
     const MSPRecordHeader header = reader.readHeader();
-    // Without payload, even the end marker ends nothing.
+    // Even an end marker does not count without payload.
     if (header.length == 0) {
       continue;
     }

@@ -15,7 +15,7 @@ constexpr std::uint32_t kReadCountHisto = 265;
 // so that a buffer of headers alone could give 256 fields for each word: 1,024 words may.
 constexpr std::size_t kMostSharedFields = 1024 * 256;
 
-/// By id, the summary field of the statistic; null when it has none.
+/// By id; null for statistics outside the summary.
 constexpr auto kSummaryFieldOfId = [] {
   std::array<const ORUSummaryField*, 57> fields{};
   for (const ORUSummaryField& field : kORUSummaryFields) {
@@ -40,7 +40,7 @@ void appendStatistic(ORUStatsContext& ctx, const ORUStatKey& key,
     }
     return;
   }
-  // Even a lone element that is left of an array keeps its index.
+  // A lone remaining element keeps its index, too.
   ctx.fields.appendArray(key.name, reader.data(), StatisticsRecordReader::kWordSize, present);
   if (key.id == kReadCountHisto) {
     for (std::size_t i = 0; i < present; ++i) {

@@ -7,13 +7,12 @@
 
 namespace vesprun {
 
-/// What the base parser fills: every decoded value, and the few that reports name. A summary field
-/// that no record fills stays 0.
+/// The base parser's result: all decoded values, and a summary, 0 where no record fills it.
 struct ORUStatsContext {
   GenericParserCxt fields;  ///< in buffer order
 
   std::uint32_t exportVersion = 0;  ///< 0 again when a parse fails
-  std::int32_t driverVersion = 0;   ///< -1 from the start of a parse on; no statistic fills it
+  std::int32_t driverVersion = 0;   ///< -1 once a parse has begun
   std::uint32_t numVirtualBlocks = 0;
   std::uint32_t blocksPerVirtualBlock = 0;
   std::uint32_t pagesPerVirtualBlock = 0;
@@ -33,7 +32,7 @@ struct ORUStatsContext {
   std::array<std::uint64_t, 5> readCountHisto{};
 };
 
-/// A summary field that keeps the value of one statistic, and is called as that one is.
+/// A summary field, named as the statistic whose value it keeps.
 struct ORUSummaryField {
   std::uint16_t id;
   std::uint32_t ORUStatsContext::*narrow;  ///< null when the field is 64 bits wide
@@ -47,7 +46,7 @@ struct ORUSummaryField {
   std::uint64_t get(const ORUStatsContext& ctx) const {
     return narrow != nullptr ? ctx.*narrow : ctx.*wide;
   }
-  /// A narrow field takes the low 32 bits.
+  /// A narrow field keeps the low 32 bits.
   void set(ORUStatsContext& ctx, std::uint64_t value) const {
     if (narrow != nullptr) {
       ctx.*narrow = static_cast<std::uint32_t>(value);
@@ -78,7 +77,7 @@ inline constexpr ORUSummaryField kORUSummaryFields[] = {
     {45, &ORUStatsContext::maxHighEnduranceBlockErases},
 };
 
-/// Empties the field list and sets every summary field to 0.
+/// Empties the fields and zeroes the summary.
 void ORUReleaseContext(ORUStatsContext& ctx);
 
 }  // namespace vesprun

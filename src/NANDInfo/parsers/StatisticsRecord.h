@@ -17,7 +17,7 @@ namespace vesprun {
 /// Records lie back to back, with no buffer header and no padding. One to seven bytes at the end of
 /// a buffer, too few for a word, are ignored.
 struct StatisticsRecordHeader {
-  /// Larger ids are no ids of records; this one still is.
+  /// The largest valid id.
   static constexpr std::uint32_t kLargestId = 0x30000000;
 
   std::uint32_t id;
@@ -29,8 +29,7 @@ struct StatisticsRecordHeader {
   std::uint64_t encode() const { return std::uint64_t{count} << 32 | id; }
 };
 
-/// Walks the words of a statistics buffer, which it never reads outside of. The buffer need not be
-/// aligned.
+/// Walks the words of a statistics buffer, at any address, without reading outside.
 class StatisticsRecordReader {
  public:
   static constexpr std::size_t kWordSize = sizeof(std::uint64_t);
@@ -38,27 +37,26 @@ class StatisticsRecordReader {
   explicit StatisticsRecordReader(std::span<const std::uint8_t> buffer)
       : _rest(buffer.first(buffer.size() / kWordSize * kWordSize)) {}
 
-  /// The number of whole words from the current one to the end of the buffer.
+  /// Whole words from the current one on.
   std::size_t remaining() const { return _rest.size() / kWordSize; }
 
-  /// The word `index` words behind the current one; `index` is below `remaining()`.
+  /// The word at `index` from here, which is below `remaining()`.
   std::uint64_t word(std::size_t index) const {
     return loadLittleEndian<std::uint64_t>(_rest.data() + index * kWordSize);
   }
-  /// The current word and all behind it.
   const std::uint8_t* data() const { return _rest.data(); }
 
-  /// Takes the current word, which there must be, as a header and moves behind it.
+  /// Reads the current word, which must be there, as a header.
   StatisticsRecordHeader readHeader() {
     const auto header = StatisticsRecordHeader::decodeFrom(word(0));
     skip(1);
     return header;
   }
-  /// True when the header just read has a valid id and its payload lies within the buffer.
+  /// True when the header just read has a valid id and the buffer holds its payload.
   bool holds(const StatisticsRecordHeader& header) const {
     return header.id <= StatisticsRecordHeader::kLargestId && header.count <= remaining();
   }
-  /// Moves `words` words on; there are at least as many.
+  /// There must be as many.
   void skip(std::size_t words) { _rest = _rest.subspan(words * kWordSize); }
 
  private:

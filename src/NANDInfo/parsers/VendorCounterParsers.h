@@ -11,12 +11,12 @@ namespace vesprun {
 inline constexpr std::size_t kCounterRegionWords = 1024;
 inline constexpr std::size_t kCounterRegionSize = kCounterRegionWords * sizeof(std::uint32_t);
 
-/// The raw counters of one NAND bus: 32-bit little-endian words, at any address.
+/// The raw counters of a NAND bus: 32-bit little-endian words at any address.
 using CounterRegion = std::span<const std::uint8_t, kCounterRegionSize>;
 
-// Where a counter stands in its region depends on the flash part. Each of these copies the words of
-// one layout into `out`, sets to 0 what the layout is known not to have, and leaves all other words
-// as they are: the caller fills `out` with zeros first.
+// The place of a counter depends on the flash. Each parser copies the words of one layout into
+// `out`, zeroes those that the layout certainly lacks, and leaves the others: the caller zeroes
+// `out` first.
 
 /// The layout of the KX3 chip.
 void parseCountersAlgoGeneric(CounterRegion region, NandChannelCounters& out);
@@ -27,7 +27,7 @@ void parseCounters1y(CounterRegion region, NandChannelCounters& out);
 void parseCounters1xSandisk(CounterRegion region, NandChannelCounters& out);
 void parseCounters1xHynix(CounterRegion region, NandChannelCounters& out);
 
-/// The work of the first two.
+/// Used by the first two.
 void parseOnlyAlgoGenericCounters(CounterRegion region, NandChannelCounters& out);
 void parseOnlyAlgoGenericCountersKX4(CounterRegion region, NandChannelCounters& out);
 

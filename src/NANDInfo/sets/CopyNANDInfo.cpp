@@ -14,8 +14,7 @@
 namespace vesprun {
 namespace {
 
-/// The parity of the hexadecimal digit that the boot session identifier begins with; 0 for any
-/// other character, lower-case letters included.
+/// The parity of a hexadecimal digit; 0 for other characters, including lower-case letters.
 std::uint8_t parityOf(std::uint8_t character) {
   if (character >= '0' && character <= '9') {
     return character & 1;

@@ -4,8 +4,8 @@
 
 namespace vesprun {
 
-/// Is this a day on which the statistics go to analytics events alone? It alternates from day
-/// (UTC) to day, in a phase that the boot session decides; false when the session is not known.
+/// Do today's statistics go to analytics events alone? Alternates by day (UTC), in a phase that
+/// depends on the boot session; false when that is unknown.
 bool NandInfoShouldLogAllToEH();
 
 }  // namespace vesprun

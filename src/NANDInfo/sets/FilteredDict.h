@@ -7,20 +7,16 @@
 
 namespace vesprun {
 
-/// `x` rounded half up to `sig` significant decimal digits. The digits are counted through the
-/// base-ten logarithm in double precision, so a number just below a power of ten that a double
-/// cannot hold counts one digit more. Nothing is left of a number that would lose 19 digits: the
-/// result is 0. A result of 2^64 or more wraps, as unsigned 64-bit arithmetic does.
+/// `x` rounded half up to `sig` significant digits. Digits are counted by log10 in double
+/// precision, so a number just below a large power of ten counts one more. A number that would lose
+/// 19 digits becomes 0; results of 2^64 or more wrap.
 std::uint64_t roundSig(std::uint64_t x, std::uint64_t sig);
 
-/// The entries of `source` whose keys are in `keys`, values unchanged, in the order of `source`.
-/// Without a list (null) a copy of the whole source.
+/// The entries of `source` that `keys` lists, in the order of `source`. Null lists all.
 PropertyDict CreateFilteredDict(const PropertyDict& source, const FieldTable* keys);
 
-/// The entries of `source` whose keys are in `digits`, in the order of `source`. With `round` each
-/// number, read as an unsigned 64-bit integer, is replaced by the unsigned 64-bit integer that
-/// keeps the digits the table gives. Every other value, booleans included, stays as it is. Without
-/// a table (null) a copy of the whole source, nothing rounded.
+/// The same; with `round`, numbers are read as unsigned 64-bit integers and keep the digits that
+/// the table gives.
 PropertyDict CreateFilteredDict_SigDig(const PropertyDict& source, const FieldTable* digits,
                                        bool round);
 

@@ -38,7 +38,7 @@ constexpr auto kInternalLabKeys =
                                kSpareAvailablePercent, kNumGrownBadBlocks});
 constinit const FieldTable kInternalLabFields = fieldTable<kInternalLabKeys, 5>();
 
-/// The number as a signed 32-bit one, but at least 0, which it also is when missing.
+/// As a signed 32-bit number; 0 when negative or missing.
 std::int32_t atLeastZero(const PropertyDict& fields, std::string_view name) {
   const Number* number = fields.findNumber(name);
   return number != nullptr ? std::max(number->asInt32(), 0) : 0;

@@ -4,8 +4,7 @@
 
 namespace vesprun {
 
-/// All figures on the storage's health, of which the sets for other programs are made. Empty, with
-/// the error recorded, when the FTL fields cannot be had.
+/// All health figures; empty, with the error recorded, without the FTL fields.
 PropertyDict gatherNANDHealthInfo();
 
 }  // namespace vesprun

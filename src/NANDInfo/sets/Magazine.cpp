@@ -19,8 +19,8 @@ namespace {
 constexpr std::string_view kMetaKey = "magazineInstanceMeta";
 constexpr std::string_view kTimeStampKey = "HLT_magazineTimeStamp";
 
-/// The snapshot of about `hours` hours ago; 0: the newest. When it carries the magazine's own data,
-/// it gets its time stamp in seconds. Nothing, with the error recorded, when it cannot be had.
+/// The snapshot of `hours` hours ago (0: the newest), with its time stamp in seconds if it carries
+/// the magazine's own data. Nothing, with the error recorded, on failure.
 std::optional<PropertyDict> copyMagazineSnapshot(std::uint64_t hours) {
   std::optional<PropertyDict> snapshot =
       gatherORUFTLData(false, false, static_cast<std::uint32_t>(hours));
@@ -32,28 +32,21 @@ std::optional<PropertyDict> copyMagazineSnapshot(std::uint64_t hours) {
   return snapshot;
 }
 
-/// Which of the fields are reported.
-struct Selection {
-  bool accumulating;
-  bool instantaneous;
-
-  explicit Selection(std::uint32_t mode)
-      : accumulating(mode == 0 || mode == 2), instantaneous(mode == 1 || mode == 2) {}
-};
-
 void addFields(const PropertyDict& newest, const PropertyDict& old, bool asDeltas,
-               Selection selection, PropertyDict& result) {
+               std::uint32_t mode, PropertyDict& result) {
+  const bool accumulating = mode == 0 || mode == 2;
+  const bool instantaneous = mode == 1 || mode == 2;
   for (const auto& [name, value] : old) {
     const Number* newestNumber = newest.findNumber(name);
     const Number* oldNumber = value.number();
     if (newestNumber == nullptr || oldNumber == nullptr) {
       continue;
     }
-    if (selection.accumulating && PrivacyApprovedSMagNANDFTLCounters_Accum.contains(name)) {
+    if (accumulating && PrivacyApprovedSMagNANDFTLCounters_Accum.contains(name)) {
       const double then = oldNumber->asDouble();
       result.set(name, asDeltas ? newestNumber->asDouble() - then : then);
     }
-    if (selection.instantaneous && PrivacyApprovedSMagNANDFTLCounters_Dynamic.contains(name)) {
+    if (instantaneous && PrivacyApprovedSMagNANDFTLCounters_Dynamic.contains(name)) {
       result.set(name, value);
     }
   }
@@ -70,10 +63,10 @@ void addDeltas(const PropertyDict& newest, const PropertyDict& old, bool deltaWa
   const double deltaDays =
       (newestStamp->asDouble() - oldStamp->asDouble()) / static_cast<double>(kSecondsPerDay);
   result.set("HLT_SM_deltaDays", deltaDays);
-  addFields(newest, old, deltaWanted && deltaDays > 0, Selection(mode), result);
+  addFields(newest, old, deltaWanted && deltaDays > 0, mode, result);
 }
 
-/// Adds `erases` / (`end` - `begin`) as `average` when all three are known.
+/// Adds `erases` / (`end` - `begin`) if all three are known.
 void addAverageCycles(const Number* erases, const Number* begin, const Number* end,
                       std::string_view average, PropertyDict& result) {
   if (erases == nullptr || begin == nullptr || end == nullptr) {
@@ -106,8 +99,8 @@ constexpr std::array<std::string_view, 6> kHLT_instantaneous_gc_wamp_array{
     "HLT_instantaneous_gc_wamp_0", "HLT_instantaneous_gc_wamp_1", "HLT_instantaneous_gc_wamp_2",
     "HLT_instantaneous_gc_wamp_3", "HLT_instantaneous_gc_wamp_4", "HLT_instantaneous_gc_wamp_5"};
 
-/// Did garbage collection write anything from `older` to `newer`? Only time stamps that say that
-/// time has passed make the difference of the counters count.
+/// Did garbage collection write anything between the two? Counts only if their stamps say that time
+/// passed.
 bool collectedGarbage(const PropertyDict& newer, const PropertyDict& older) {
   const Number* newerStamp = newer.findNumber(kTimeStampKey);
   const Number* olderStamp = older.findNumber(kTimeStampKey);
@@ -118,11 +111,11 @@ bool collectedGarbage(const PropertyDict& newer, const PropertyDict& older) {
          newerWrites->asDouble() - olderWrites->asDouble() >= 1;
 }
 
-/// What is invalid in a band of validity step `step`, as a share of the band. Below 0 from step 31.
+/// The invalid share of a band of that validity step; negative from step 31.
 double invalidShare(unsigned step) { return 1 - 0.033 * step; }
 
-/// Takes bands from the validity curve, step by step, until they make one free band; what had to be
-/// written for it follows from the step at which that is reached.
+/// Adds up bands along the validity curve until they make one free band. The step reached decides
+/// how much had to be written.
 double writeAmplification(const PropertyDict& snapshot) {
   constexpr unsigned kLastStep = 32;
   double missing = 1.0;

@@ -11,7 +11,7 @@
 namespace vesprun {
 namespace {
 
-/// Figures that are made from several fields.
+/// Figures that combine several fields.
 struct DerivedFigures {
   static constexpr std::uint64_t kNotSeen = 0xFFFFFFFF;
 
@@ -47,7 +47,7 @@ constexpr DerivedField kDerivedFields[] = {
     {"mspBootBlockEraseFail2", Use::CountNonzero, &DerivedFigures::failedErases},
 };
 
-/// Takes the field up into the figures; false when none of them is made from it.
+/// Adds a field to the figures; false when it belongs to none.
 bool takeUp(const GenericParserCxt::Field& field, DerivedFigures& figures) {
   const auto* derived =
       std::find_if(std::begin(kDerivedFields), std::end(kDerivedFields),
@@ -70,7 +70,7 @@ bool takeUp(const GenericParserCxt::Field& field, DerivedFigures& figures) {
   return true;
 }
 
-/// Durations are coarse: 3 significant digits of their low 32 bits.
+/// Durations keep 3 significant digits of their low 32 bits.
 bool isRounded(std::string_view name) {
   return name == "maxMemLowDuration" || name == "maxMemChokeDuration";
 }
@@ -96,7 +96,7 @@ PropertyDict CreateNANDInfoDict(const ORUStatsContext& context, bool omitVersion
   info.set("com.quill.NANDInfo.NumPhysicalErases", context.bandErases);
   info.set("com.quill.NANDInfo.NodesFree", context.IND_pool_free);
   info.set("com.quill.NANDInfo.NodesTotal", context.IND_pool_count);
-  // Weeks, in spite of the name that the key has.
+  // Weeks, despite the key's name.
   info.set("com.quill.NANDInfo.formatDaysSince2000", weeksSince2000(context.utilFormatTime));
   info.set("com.quill.NANDInfo.NumSleepOps", context.numSleepOps);
   info.set("com.quill.NANDInfo.HighEnduranceBlockEraseCount", context.maxHighEnduranceBlockErases);

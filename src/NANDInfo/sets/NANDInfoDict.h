@@ -5,8 +5,8 @@
 
 namespace vesprun {
 
-/// The legacy NAND info (see `CopyNANDInfo`) from the base statistics; sums and differences wrap.
-/// `omitVersionFields` leaves out the two versions and the demo mode.
+/// The legacy NAND info (`CopyNANDInfo`) from the base statistics; sums and differences wrap.
+/// `omitVersionFields` leaves out the versions and the demo mode.
 PropertyDict CreateNANDInfoDict(const ORUStatsContext& context, bool omitVersionFields);
 
 }  // namespace vesprun

@@ -14,7 +14,7 @@
 namespace vesprun {
 namespace {
 
-/// What `findNandExporterNew` opened, given back at the end.
+/// Closes what `findNandExporterNew` opened.
 class OpenExporter {
  public:
   OpenExporter() = default;
@@ -26,7 +26,7 @@ class OpenExporter {
     }
   }
 
-  /// False when there is no controller that opens.
+  /// False when no controller opens.
   bool open() { return findNandExporterNew(_exporter); }
   const nand_exporter_t* operator->() const { return _exporter; }
   const nand_exporter_t& operator*() const { return *_exporter; }
@@ -35,7 +35,6 @@ class OpenExporter {
   nand_exporter_t* _exporter = nullptr;
 };
 
-/// The answer to one command.
 struct Answer {
   TunnelBuffer buffer;
   std::uint64_t length = 0;
@@ -51,7 +50,7 @@ bool fetch(RegistryHandle connection, const nand_exporter_t& exporter,
                               answer.buffer, answer.length);
 }
 
-/// How many MSPs answer, up to `kMostMSPs`.
+/// Up to `kMostMSPs`.
 std::uint32_t countMSPs(const nand_exporter_t& exporter) {
   constexpr std::uint32_t kMostMSPs = 10;
   std::uint32_t count = 0;

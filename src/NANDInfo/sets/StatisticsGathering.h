@@ -9,26 +9,24 @@
 
 namespace vesprun {
 
-// Fetches the controller's statistics and has them parsed. Failures are recorded as the first error
-// text (`SetAPIErrorMessage`) where nothing else is said.
+// Fetches and parses the controller's statistics. Failures are recorded with `SetAPIErrorMessage`
+// unless stated otherwise.
 
 inline constexpr std::string_view kIsStatMagSupportedKey = "com.quill.NANDInfo.IsStatMagSupported";
 
-/// The FTL fields, each an unsigned 64-bit number: those of now, or those of a stats-magazine
-/// snapshot `argument` hours back (not used with `useStatsSelector`). With them come two 32-bit
-/// numbers that are 1 or 0: "com.quill.NANDInfo.IsQNS1Controller" and `kIsStatMagSupportedKey`.
-/// Nothing on failure.
+/// The FTL fields, unsigned 64-bit numbers: those of now (`useStatsSelector`), or of the
+/// stats-magazine snapshot `argument` hours back. Two 32-bit numbers, 1 or 0, come with them:
+/// "com.quill.NANDInfo.IsQNS1Controller" and `kIsStatMagSupportedKey`. Nothing on failure.
 std::optional<PropertyDict> gatherORUFTLData(bool useStatKeyParser, bool useStatsSelector,
                                              std::uint32_t argument);
 
-/// The fields of each MSP under its index ("0", "1", up to "9"): those gathered before any failure.
-/// Nothing when none answers or the controller has no such statistics.
+/// The fields of each MSP by index ("0" to "9"), as far as they could be gathered. Nothing when no
+/// MSP answers or the controller has no such statistics.
 std::optional<PropertyDict> gatherORUMSPData();
 
-/// Fills a context, zeroed by the caller, with the base statistics. `exporter` becomes the
-/// controller's table entry, or the ending one. False, with lines on the standard error stream when
-/// the controller cannot be used, when the context was not filled or the connection did not close;
-/// fields read before that may then remain in it.
+/// Fills a zeroed context with the base statistics. `exporter` becomes the controller's table
+/// entry, or the ending one. False, with lines on standard error when the controller cannot be
+/// used, if the context was not filled or closing failed; it may then hold some fields.
 bool GatherNANDStats(nand_exporter_t*& exporter, ORUStatsContext& context);
 
 }  // namespace vesprun

@@ -39,8 +39,8 @@ std::uint64_t mostBootBlockRefreshes(const PropertyDict& ftl) {
   return most;
 }
 
-/// Adds up one kind of failure over `blocks` boot blocks of each MSP, from the one that comes
-/// `first` after the MSP's primary one.
+/// The failures of `blocks` boot blocks of each MSP, beginning `first` blocks after its primary
+/// one.
 std::uint64_t bootBlockFailures(const PropertyDict& ftl, std::string_view stem,
                                 std::uint64_t blocksPerMSP, unsigned first, unsigned blocks) {
   std::int64_t sum = 0;

@@ -21,7 +21,7 @@ constexpr std::string_view kHealthFieldsOfStorageStats[] = {
     "HLT_formatWeeksSince2000", "HLT_OR_Capacity_GB", "HLT_averageSLCPECycles",
     "HLT_averageTLCPECycles",   "HLT_hostWrites",     "HLT_OR_Diskfullness_BP"};
 
-/// A figure of the image with that four-character code.
+/// A figure of the image with that code.
 struct ImageFigure {
   std::string_view field;
   std::uint64_t (*query)(std::uint32_t code);

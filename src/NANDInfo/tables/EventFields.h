@@ -7,7 +7,7 @@
 
 namespace vesprun {
 
-// The fields that each analytics event may carry, under the name of the event's view.
+// The fields of each analytics event, by its view.
 extern const FieldTable massStorage_NANDInfo_FTLCounters_1;              ///< 443
 extern const FieldTable massStorage_NANDInfo_FTLHistograms_1;            ///< 990
 extern const FieldTable massStorage_NANDInfo_FTLHistograms_2;            ///< 104
@@ -19,12 +19,12 @@ extern const FieldTable massStorage_NANDInfo_SM_Monthly_FTLCounters_1;   ///< 33
 
 struct StorageEvent {
   const char* event;
-  const char* view;    ///< its name in the log line on its outcome; null: the outcome is not logged
+  const char* view;    ///< named in the log line on the outcome; null: no line
   std::uint32_t step;  ///< of the extraction
   const FieldTable* fields;
 };
 
-/// Every storage event, in the order in which they are sent.
+/// Every storage event in sending order.
 inline constexpr std::array<StorageEvent, 8> EventHubConfigDetails{{
     {"com.quill.massStorage.NANDInfo.FTLCounters_1", "massStorage_NANDInfo_FTLCounters_1", 0,
      &massStorage_NANDInfo_FTLCounters_1},
@@ -47,7 +47,7 @@ inline constexpr std::array<StorageEvent, 8> EventHubConfigDetails{{
      &massStorage_NANDInfo_SM_Monthly_FTLCounters_1},
 }};
 
-/// The first event of a step; a step that sends none does not compile.
+/// Does not compile for a step without an event.
 consteval const StorageEvent& eventOfStep(std::uint32_t step) {
   for (const StorageEvent& event : EventHubConfigDetails) {
     if (event.step == step) {

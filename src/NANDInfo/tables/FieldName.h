@@ -1,5 +1,7 @@
 #pragma once
 
+#include <array>
+#include <charconv>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
@@ -10,8 +12,8 @@
 
 namespace vesprun {
 
-/// The name of a statistics field, taken apart: "bandsMaxTempHisto_21" is the stem
-/// "bandsMaxTempHisto_" and the number 21.
+/// A field name in two parts: "bandsMaxTempHisto_21" is the stem "bandsMaxTempHisto_" and the
+/// number 21.
 struct FieldName {
   static constexpr std::uint32_t kNoNumber = std::numeric_limits<std::uint32_t>::max();
 
@@ -19,9 +21,8 @@ struct FieldName {
   std::uint32_t number = kNoNumber;
 };
 
-/// Splits off the decimal number at the end of a name. A name has no number when it ends in no
-/// digit, in more than nine of them, or in digits that begin with a needless zero; so each name is
-/// split in one way, and putting the parts together gives the name again.
+/// Splits off a final decimal number of at most nine digits without leading zeros, so that each
+/// name splits in one way and its parts make the name again.
 constexpr FieldName splitFieldName(std::string_view name) {
   std::size_t stemLength = name.size();
   while (stemLength > 0 && name[stemLength - 1] >= '0' && name[stemLength - 1] <= '9') {
@@ -38,11 +39,18 @@ constexpr FieldName splitFieldName(std::string_view name) {
   return {name.substr(0, stemLength), number};
 }
 
-/// Sets `name` to the stem followed by the number, when it is one, in decimal.
-void assignFieldName(std::string& name, std::string_view stem, std::uint32_t number);
+/// Puts the parts together.
+inline void assignFieldName(std::string& name, std::string_view stem, std::uint32_t number) {
+  name = stem;
+  if (number != FieldName::kNoNumber) {
+    std::array<char, 10> digits;
+    const auto [end, error] = std::to_chars(digits.data(), digits.data() + digits.size(), number);
+    name.append(digits.data(), end);
+  }
+}
 
-/// The same value when a table is compiled and when it is searched. Takes eight bytes at a time, as
-/// names are long and looked up by the thousand.
+/// Equal at compile time and at run time. Takes eight bytes at a time: names are long and looked up
+/// by the thousand.
 constexpr std::size_t hashOfStem(std::string_view stem) {
   std::uint64_t hash = stem.size();
   while (!stem.empty()) {

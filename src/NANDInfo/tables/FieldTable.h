@@ -12,8 +12,8 @@
 
 namespace vesprun {
 
-/// Consecutively numbered fields, or a single one: a row of a field table. `digits` is the number
-/// of significant decimal digits that the fields keep, in the tables that say so.
+/// A row of a field table: consecutively numbered fields, or a single one, with the significant
+/// digits that they keep, where the table says so.
 struct FieldRange {
   std::string_view stem;
   std::uint32_t first;  ///< `FieldName::kNoNumber`, as `last`, for a name without a number
@@ -41,11 +41,11 @@ struct FieldRange {
       : stem(name.stem), first(name.number), last(name.number), digits(digitCount) {}
 };
 
-/// Hash index over the stems of a table's ranges, made when the table is compiled. Ranges of one
-/// stem are chained in table order. A name that is in the table twice does not compile.
+/// A compile-time hash index over the stems of a table's ranges; ranges of one stem are chained in
+/// table order. A duplicate name does not compile.
 template <std::size_t RangeCount>
 struct FieldIndex {
-  // Entries are positions of ranges, counted from 1; 0 is none.
+  // Positions of ranges, counted from 1; 0: none.
   std::array<std::uint16_t, std::bit_ceil(2 * RangeCount)> slots{};
   std::array<std::uint16_t, RangeCount> nextOfStem{};
   std::size_t fieldCount = 0;
@@ -68,8 +68,8 @@ struct FieldIndex {
   }
 };
 
-/// An ordered, constant set of field names, each with its digit count. It refers to its ranges and
-/// their index, which are constants; nothing is built when a program starts.
+/// An ordered set of field names with their digits. Ranges and index are constants; nothing is
+/// built at start.
 class FieldTable {
  public:
   template <std::size_t RangeCount>
@@ -80,18 +80,16 @@ class FieldTable {
         _nextOfStem(index.nextOfStem),
         _fieldCount(index.fieldCount) {}
 
-  /// The number of names.
   constexpr std::size_t size() const { return _fieldCount; }
 
-  /// The range that `name` belongs to, or null. Takes the same time whatever the table's size, and
-  /// no memory.
+  /// The range of `name`, or null, in constant time and without memory.
   const FieldRange* find(std::string_view name) const { return find(splitFieldName(name)); }
   const FieldRange* find(const FieldName& name) const;
   bool contains(std::string_view name) const { return find(name) != nullptr; }
 
   std::span<const FieldRange> ranges() const { return _ranges; }
 
-  /// Calls `visit(name, range)` for every name in table order. The name lives as long as the call.
+  /// Calls `visit(name, range)` for each name in table order. The name lives as long as the call.
   template <typename Visit>
   void forEach(Visit&& visit) const {
     std::string name;
@@ -110,10 +108,24 @@ class FieldTable {
   std::size_t _fieldCount;
 };
 
+inline const FieldRange* FieldTable::find(const FieldName& name) const {
+  const std::size_t mask = _slots.size() - 1;
+  std::size_t slot = hashOfStem(name.stem) & mask;
+  while (_slots[slot] != 0 && _ranges[_slots[slot] - 1U].stem != name.stem) {
+    slot = (slot + 1) & mask;
+  }
+  for (std::size_t range = _slots[slot]; range != 0; range = _nextOfStem[range - 1]) {
+    if (_ranges[range - 1].contains(name.number)) {
+      return &_ranges[range - 1];
+    }
+  }
+  return nullptr;
+}
+
 template <const auto& kRanges>
 inline constexpr FieldIndex<kRanges.size()> kFieldIndexOf(kRanges);
 
-/// The table of an array of ranges that hold `kFieldCount` names.
+/// The table of ranges that hold `kFieldCount` names.
 template <const auto& kRanges, std::size_t kFieldCount>
 constexpr FieldTable fieldTable() {
   static_assert(kFieldIndexOf<kRanges>.fieldCount == kFieldCount);

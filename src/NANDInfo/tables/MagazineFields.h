@@ -4,10 +4,10 @@
 
 namespace vesprun {
 
-/// 731: the counters of a stats-magazine snapshot that accumulate, reported as deltas.
+/// 731: the accumulating counters of a stats-magazine snapshot, reported as deltas.
 extern const FieldTable PrivacyApprovedSMagNANDFTLCounters_Accum;
 
-/// 41: the values of a stats-magazine snapshot that are instantaneous, reported as they stand.
+/// 41: its instantaneous values, reported unchanged.
 extern const FieldTable PrivacyApprovedSMagNANDFTLCounters_Dynamic;
 
 }  // namespace vesprun

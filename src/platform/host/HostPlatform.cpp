@@ -1,6 +1,5 @@
 #include "platform/host/HostPlatform.h"
 
-#include <mutex>
 #include <optional>
 #include <utility>
 
@@ -14,22 +13,16 @@
 #include "platform/host/registry/HostDeviceRegistry.h"
 #include "platform/host/services/ForwardingServices.h"
 #include "platform/host/services/HostClock.h"
-#include "platform/host/services/HostDailyWorkLock.h"
-#include "platform/host/services/HostDiagnosticHeader.h"
-#include "platform/host/services/HostEventHub.h"
-#include "platform/host/services/HostFileSystem.h"
 #include "platform/host/services/HostKernel.h"
 #include "platform/host/services/HostLanguages.h"
-#include "platform/host/services/HostLogsmith.h"
-#include "platform/host/services/HostMessageDigest.h"
 #include "platform/host/services/HostMurmur.h"
-#include "platform/host/services/HostOrrery.h"
 #include "platform/host/services/HostSystemLog.h"
 #include "platform/host/services/HostTapline.h"
 
 namespace vesprun {
 
-// Destroyed from the last to the first: what writes at its end comes after what it needs for that.
+// Destroyed from the last to the first: a service that writes at its end follows those that it
+// needs.
 struct HostPlatform::Services {
   Services(DeviceDirectory deviceDirectory, DeviceDescription deviceDescription,
            ProcessTimeZone processTimeZone, SystemLog* log)
@@ -37,17 +30,6 @@ struct HostPlatform::Services {
         description(std::move(deviceDescription)),
         timeZone(std::move(processTimeZone)),
         systemLog(log != nullptr ? *log : logFile) {}
-
-  DeviceRegistry& deviceRegistry() {
-    return interposedRegistry != nullptr ? *interposedRegistry : describedRegistry();
-  }
-
-  /// Laid out when it is first asked for, from whichever thread.
-  HostDeviceRegistry& describedRegistry() {
-    std::call_once(registryOnce,
-                   [this] { registry.emplace(description.registry, directory, systemLog); });
-    return *registry;
-  }
 
   DeviceDirectory directory;
   DeviceDescription description;
@@ -60,9 +42,7 @@ struct HostPlatform::Services {
                                   systemLog};  // freed when what follows has been written
   HostPreferences preferences{directory, clock, systemLog};
   HostTallybook tallybook{directory, clock, preferences, systemLog};
-  std::once_flag registryOnce;
-  std::optional<HostDeviceRegistry> registry;
-  DeviceRegistry* interposedRegistry = nullptr;
+  HostDeviceRegistry deviceRegistry{description.registry, directory, systemLog};
   HostDiagnosticHeader diagnosticHeader{description.system};
   HostEventHub eventHub{description.events, outbox};
   HostFileSystem fileSystem{directory, description.userVolume, systemLog};
@@ -86,7 +66,35 @@ struct HostPlatform::Services {
   HostMurmur murmur{description.usage, systemLog};  // last: a reply may use all of the above
 };
 
-HostPlatform::HostPlatform(std::unique_ptr<Services> services) : _services(std::move(services)) {}
+HostPlatform::HostPlatform(std::unique_ptr<Services> services)
+    : Platform{services->clock,
+               services->dailyWorkLock,
+               services->deviceRegistry,
+               services->diagnosticHeader,
+               services->eventHub,
+               services->fileSystem,
+               services->installedApplications,
+               services->kernel,
+               services->languages,
+               services->logsmith,
+               services->mainLoop,
+               services->messageDigest,
+               services->messageService,
+               services->murmur,
+               services->notificationCenter,
+               services->orrery,
+               services->preferences,
+               services->processInformation,
+               services->ptreeSerialization,
+               services->reclaimer,
+               services->servicesClient,
+               services->supportLibrary,
+               services->systemConfiguration,
+               services->systemLog,
+               services->tallybook,
+               services->userDefaults,
+               services->tapline},
+      _services(std::move(services)) {}
 
 HostPlatform::~HostPlatform() = default;
 
@@ -132,41 +140,6 @@ std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, System
 const DeviceDirectory& HostPlatform::directory() const { return _services->directory; }
 const DeviceDescription& HostPlatform::description() const { return _services->description; }
 HostTallybook& HostPlatform::counters() { return _services->tallybook; }
-HostDeviceRegistry& HostPlatform::describedRegistry() { return _services->describedRegistry(); }
-void HostPlatform::interposeDeviceRegistry(DeviceRegistry* registry) {
-  _services->interposedRegistry = registry;
-}
-
-Clock& HostPlatform::clock() { return _services->clock; }
-DeviceRegistry& HostPlatform::deviceRegistry() { return _services->deviceRegistry(); }
-DailyWorkLock& HostPlatform::dailyWorkLock() { return _services->dailyWorkLock; }
-DiagnosticHeader& HostPlatform::diagnosticHeader() { return _services->diagnosticHeader; }
-EventHub& HostPlatform::eventHub() { return _services->eventHub; }
-FileSystem& HostPlatform::fileSystem() { return _services->fileSystem; }
-InstalledApplications& HostPlatform::installedApplications() {
-  return _services->installedApplications;
-}
-Kernel& HostPlatform::kernel() { return _services->kernel; }
-Languages& HostPlatform::languages() { return _services->languages; }
-Logsmith& HostPlatform::logsmith() { return _services->logsmith; }
-MainLoop& HostPlatform::mainLoop() { return _services->mainLoop; }
-MessageDigest& HostPlatform::messageDigest() { return _services->messageDigest; }
-MessageService& HostPlatform::messageService() { return _services->messageService; }
-Murmur& HostPlatform::murmur() { return _services->murmur; }
-NotificationCenter& HostPlatform::notificationCenter() { return _services->notificationCenter; }
-Orrery& HostPlatform::orrery() { return _services->orrery; }
-Preferences& HostPlatform::preferences() { return _services->preferences; }
-ProcessInformation& HostPlatform::processInformation() { return _services->processInformation; }
-PtreeSerialization& HostPlatform::ptreeSerialization() { return _services->ptreeSerialization; }
-Reclaimer& HostPlatform::reclaimer() { return _services->reclaimer; }
-LGSServicesClient& HostPlatform::servicesClient() { return _services->servicesClient; }
-SupportLibrary& HostPlatform::supportLibrary() { return _services->supportLibrary; }
-LGSSystemConfiguration& HostPlatform::systemConfiguration() {
-  return _services->systemConfiguration;
-}
-SystemLog& HostPlatform::systemLog() { return _services->systemLog; }
-Tallybook& HostPlatform::tallybook() { return _services->tallybook; }
-Tapline& HostPlatform::tapline() { return _services->tapline; }
-UserDefaults& HostPlatform::userDefaults() { return _services->userDefaults; }
+HostDeviceRegistry& HostPlatform::describedRegistry() { return _services->deviceRegistry; }
 
 }  // namespace vesprun

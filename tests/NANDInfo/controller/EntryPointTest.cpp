@@ -1,4 +1,5 @@
 #include "NANDInfo/controller/EntryPoint.h"
+#include "common/ProcessState.h"
 
 #include "buffers/DeviceBuffers.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
@@ -52,7 +53,7 @@ class EntryPointTest : public ControllerTest {};
 TEST_F(EntryPointTest, AnswersNothingWithoutADevice) {
   EXPECT_EQ(GetAPIErrorMessage(), "NA");
   for (const EntryPoint& entry : kEntryPoints) {
-    forgetAPIErrorMessage();
+    ProcessState::startAfresh();
     EXPECT_TRUE(entry.answersNothing()) << entry.name;
     EXPECT_EQ(GetAPIErrorMessage(), std::string(entry.name) + ": no device is open");
   }

@@ -1,4 +1,5 @@
 #include "NANDInfo/controller/TunnelCommand.h"
+#include "common/ProcessState.h"
 
 #include <cstring>
 
@@ -68,7 +69,7 @@ TEST_F(TunnelCommandTest, NothingIsSentWithoutConnectionMethodOrSelector) {
                         {1, 8, 0, nullptr, "executeTunnelCommand: Invalid exporter"},
                         {1, 8, 8, nullptr, "executeTunnelCommand: Invalid opType Selector"}};
   for (const Case& call : cases) {
-    forgetAPIErrorMessage();
+    ProcessState::startAfresh();
     exporter.tunnelSizeMethod = call.sizeMethod;
     exporter.tunnelDataMethod = call.dataMethod;
     TunnelRequest request{1, 2, 3, 4, 5};

@@ -9,6 +9,7 @@
 #include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
 #include "buffers/DeviceBuffers.h"
+#include "common/ProcessState.h"
 #include "support/ScarceMemory.h"
 
 namespace vesprun {
@@ -17,7 +18,7 @@ namespace {
 /// What `parse` does while no allocation is larger than `most`.
 template <typename Parse>
 auto whileScarce(std::size_t most, const Parse& parse) {
-  forgetAPIErrorMessage();
+  ProcessState::startAfresh();
   largestAllocation = most;
   const auto result = parse();
   largestAllocation = SIZE_MAX;

@@ -10,6 +10,7 @@
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
 #include "buffers/DeviceBuffers.h"
+#include "common/ProcessState.h"
 
 namespace vesprun {
 namespace {
@@ -39,7 +40,7 @@ struct Outcome {
 
 template <auto parse>
 Outcome outcomeOf(std::span<const std::uint8_t> buffer) {
-  forgetAPIErrorMessage();
+  ProcessState::startAfresh();
   GenericParserCxt ctx;
   const std::uint32_t result = parse(ctx, buffer);
   return {result, fieldsOf(ctx), GetAPIErrorMessage()};
@@ -49,7 +50,7 @@ constexpr auto ftlStatKey = outcomeOf<ORUFTLParseStatKeyBufferToCxt>;
 constexpr auto msp = outcomeOf<ORUMSPParseBufferToCxt>;
 
 Outcome base(std::span<const std::uint8_t> buffer) {
-  forgetAPIErrorMessage();
+  ProcessState::startAfresh();
   ORUStatsContext ctx;
   const bool result = ORUParseBufferToCxt(ctx, buffer);
   return {result, fieldsOf(ctx.fields), GetAPIErrorMessage()};

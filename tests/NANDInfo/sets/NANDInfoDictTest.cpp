@@ -45,6 +45,7 @@ TEST_F(NANDInfoDictTest, SummaryInOrderWithItsWidths) {
   }
   context.hostReads = 0xFFFF'FFFF'FFFF'FFFF;
   context.blocksPerVirtualBlock = 15;
+  context.utilFormatTime = ~std::uint64_t{0};
   context.readCountHisto = {16, 17, 18, 19, 20};
   platform().preferences().LGSPreferencesSetValue("StoreDemoMode", true, "com.quill.demo-settings");
   std::string text;
@@ -61,23 +62,12 @@ TEST_F(NANDInfoDictTest, SummaryInOrderWithItsWidths) {
             "NumVirtualBlocks u32 1\nPagesPerVirtualBlock u32 2\nBytesPerPage u32 3\n"
             "NumLogicalReads 18446744073709551615\nNumLogicalWrites 5\nNumFreeVirtualBlocks 6\n"
             "NumWearLevelOps 7\nNumPhysicalReads 8\nNumPhysicalWrites 9\nNumPhysicalErases 10\n"
-            "NodesFree 11\nNodesTotal 12\nformatDaysSince2000 0\nNumSleepOps 13\n"
+            "NodesFree 11\nNodesTotal 12\nformatDaysSince2000 30500568903377\nNumSleepOps 13\n"
             "HighEnduranceBlockEraseCount 14\nBlocksPerVirtualBlock u32 15\n"
             "ReadsBeforeErasure0 16\nReadsBeforeErasure50000 17\nReadsBeforeErasure100000 18\n"
             "ReadsBeforeErasure150000 19\nReadsBeforeErasure200000 20\n"
             "NumMaintenanceRequests 0\nMaintenanceRequestsFailedRead 0\n"
             "MaintenanceRequestsFailedProg 0\nMaintenanceRequestsFailedErase 0\n");
-}
-
-TEST_F(NANDInfoDictTest, FormatTimeInWeeks) {
-  constexpr std::uint64_t kStart = 946684800;
-  const std::pair<std::uint64_t, const char*> cases[] = {
-      {kStart - 1, "0"}, {kStart + 604799, "0"}, {kStart + 604800, "1"}, {~0ULL, "30500568903377"}};
-  for (const auto& [time, weeks] : cases) {
-    ORUStatsContext context;
-    context.utilFormatTime = time;
-    EXPECT_EQ(figure(CreateNANDInfoDict(context, true), "formatDaysSince2000"), weeks);
-  }
 }
 
 TEST_F(NANDInfoDictTest, FieldsUnderTheirKeys) {

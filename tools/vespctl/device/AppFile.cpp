@@ -36,7 +36,7 @@ std::optional<Bytes> uuidBytes(std::string_view text) {
   return bytes;
 }
 
-/// The value as the message carries it; nothing, with what it should have been in `wanted`.
+/// The value for the message; nothing, with the expectation in `wanted`, for a wrong one.
 std::optional<PropertyValue> messageValue(const std::string& name, const PropertyValue& value,
                                           std::string& wanted) {
   if (name == "bundle_id" || name == "version") {

@@ -26,7 +26,7 @@ struct CounterArguments {
   std::string file;
 };
 
-/// Throws the error of a wrong usage when the text is no such number.
+/// A bad number is an error of usage.
 template <typename T>
 T parseArgument(const char* argument, const std::string& text, const char* what) {
   T value = 0;
@@ -40,8 +40,7 @@ std::int32_t parseDay(const char* argument, const std::string& text, std::int32_
   return text.empty() ? otherwise : parseArgument<std::int32_t>(argument, text, "a day number");
 }
 
-/// The counters of a device. That a database was damaged goes to standard error and to the device's
-/// system log.
+/// Damage to the database goes to standard error and to the device's system log.
 class DeviceCounters {
  public:
   explicit DeviceCounters(const std::string& directory)
@@ -71,7 +70,7 @@ class DeviceCounters {
   HostTallybook _counters;
 };
 
-/// Runs `change` with a key that has been checked, on the day that was given or today.
+/// Runs `change` with a valid key, on the given day or today.
 void changeCounter(
     const CounterArguments& arguments,
     const std::function<void(CounterStore&, std::int32_t day, const Date& now)>& change) {
@@ -102,7 +101,7 @@ void changeScalar(const CounterArguments& arguments, bool adds) {
   });
 }
 
-/// The samples carry the time of day that the device's clock shows.
+/// Samples carry the clock's time of day.
 void addSamples(const CounterArguments& arguments) {
   std::vector<double> values;
   values.reserve(arguments.values.size());
@@ -139,7 +138,7 @@ void importLines(const CounterArguments& arguments) {
     if (std::exchange(isRepeated, true)) {
       lines.clear();
       if (!lines.seekg(0)) {
-        // Lines from a pipe are gone. Whether the database is damaged, reading it can tell as well.
+        // A pipe cannot be read again. Reading also finds out whether the database is damaged.
         using Days = std::numeric_limits<std::int32_t>;
         const auto ignore = [](std::string_view) { return true; };
         exportCounterLines(store, Days::min(), Days::max(), ignore, error);

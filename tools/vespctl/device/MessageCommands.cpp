@@ -49,7 +49,6 @@ std::string appsDocument(const std::string& file) {
   return document({{"operation", std::int64_t{2}}, {"app_data", *std::move(apps)}});
 }
 
-/// A connection to the message service of a device.
 class Client {
  public:
   explicit Client(const DeviceDirectory& directory) {
@@ -76,8 +75,8 @@ class Client {
     }
   }
 
-  /// Nothing comes back over the connection, but a service that ends before it has read the message
-  /// resets it. One that is still at work after a moment has the message.
+  /// Nothing comes back, but a service that ends before it has read the message resets the
+  /// connection. One that is still there after a moment has the message.
   void finish() const {
     setsockopt(_socket.get(), SOL_SOCKET, SO_RCVTIMEO, &kLastLook, sizeof kLastLook);
     char byte = 0;
@@ -102,13 +101,13 @@ void sendDocument(const std::string& path, const std::string& document) {
   client.finish();
 }
 
-/// The notifications that are posted from now on.
+/// Notifications posted from now on.
 class NewNotifications {
  public:
   explicit NewNotifications(const DeviceDirectory& directory)
       : _file(directory.hostPath("outbox/notifications.jsonl")), _seen(content().size()) {}
 
-  /// Waits, for a bounded time, until one of this name is posted.
+  /// Waits for one of that name, but not for ever.
   bool await(std::string_view name) const {
     const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(kPatienceInSeconds);
     while (!isPosted(name)) {
@@ -133,14 +132,14 @@ class NewNotifications {
 
   bool isPosted(std::string_view name) const {
     const std::string text = content();
-    // A file that has become shorter is a new one.
+    // A shorter file is a new one.
     std::string_view rest = std::string_view(text).substr(text.size() < _seen ? 0 : _seen);
     for (auto end = rest.find('\n'); end != std::string_view::npos; end = rest.find('\n')) {
       std::string ignored;
       const std::optional<PropertyValue> line = valueFromJsonText(rest.substr(0, end), ignored);
       const PropertyDict* dict = line ? line->dict() : nullptr;
-      const PropertyValue* posted = dict != nullptr ? dict->find("name") : nullptr;
-      if (posted != nullptr && *posted == PropertyValue(name)) {
+      const std::string* posted = dict != nullptr ? dict->findString("name") : nullptr;
+      if (posted != nullptr && *posted == name) {
         return true;
       }
       rest.remove_prefix(end + 1);

@@ -82,7 +82,7 @@ void addPreferenceCommands(CLI::App& vespctl) {
   remove->callback([arguments] { changePreference(*arguments, std::nullopt); });
 
   for (CLI::App* command : {get, set, remove}) {
-    command->fallthrough();  // --user may stand behind the command, too
+    command->fallthrough();  // --user may follow the command
   }
   allowOneCommand(*prefs);
 }

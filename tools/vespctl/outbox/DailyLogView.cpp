@@ -16,8 +16,8 @@ namespace {
 const PropertyDict kEmpty;
 
 const PropertyDict& section(const PropertyDict& log, const char* key) {
-  const PropertyValue* value = log.find(key);
-  return value != nullptr && value->dict() != nullptr ? *value->dict() : kEmpty;
+  const PropertyDict* value = log.findDict(key);
+  return value != nullptr ? *value : kEmpty;
 }
 
 std::string text(const PropertyDict& log, const char* key) {
@@ -65,7 +65,7 @@ void showHistogram(std::ostream& out, const PropertyDict& histogram) {
   const auto width = static_cast<int>(longestKey(histogram));
   for (const auto& [label, count] : histogram) {
     const double value = count.number() != nullptr ? count.number()->asDouble() : 0.0;
-    // Also a log that is not ours is shown: its counts may be anything.
+    // A foreign log may hold any counts.
     const double share = value > 0 ? value / largest : 0.0;
     const auto length = share <= 1 ? static_cast<std::size_t>(std::ceil(share * kLongestBar)) : 0;
     out << "      " << std::right << std::setw(width) << printableText(label) << "  "

@@ -6,8 +6,8 @@
 
 namespace vesprun {
 
-/// Writes an aggregated daily log as a person reads it: what it covers, metadata, scalars, and each
-/// distribution with its figures and its histogram drawn in text.
+/// Writes a daily log for people: its day, metadata, scalars, and each distribution with its
+/// figures and a histogram drawn in text.
 void showDailyLog(std::ostream& out, const PropertyDict& log);
 
 }  // namespace vesprun

@@ -7,6 +7,7 @@
 #include <limits>
 
 #include "Command.h"
+#include "common/TextForm.h"
 #include "outbox/SubmittedLogs.h"
 #include "platform/DiagnosticHeader.h"
 #include "platform/host/documents/JsonForm.h"
@@ -42,17 +43,11 @@ Digest authenticationCode(std::string_view key, std::string_view message) {
   return sha256(block + text(sha256(inner.append(message))));
 }
 
-/// A name for the device that stays the same and does not hold its identifier.
+/// A constant name for the device that does not reveal its identifier.
 std::string pseudonymOf(const std::string& systemIdentifier) {
   constexpr std::size_t kBytes = 16;
   const Digest code = authenticationCode(systemIdentifier, "vesprun exported device");
-  std::string name;
-  for (std::size_t i = 0; i < kBytes; ++i) {
-    constexpr char kDigits[] = "0123456789abcdef";
-    name += kDigits[code[i] >> 4];
-    name += kDigits[code[i] & 0xF];
-  }
-  return name;
+  return hexadecimalText(std::span(code).first(kBytes));
 }
 
 struct Export {

@@ -22,7 +22,7 @@ std::string entryText(const PropertyDict& line, const char* key) {
   return value != nullptr ? printableText(textForm(*value)) : "";
 }
 
-/// One shown line for each line of the file; what cannot be read is said where it stands.
+/// Shows each line of the file; says which ones cannot be read.
 template <typename Show>
 void showLines(const std::string& file, Show show) {
   std::string error;
@@ -49,8 +49,7 @@ void showLines(const std::string& file, Show show) {
 
 void showEvents(const DeviceDirectory& directory, bool inFull) {
   showLines(directory.hostPath("outbox/events.jsonl"), [inFull](const PropertyDict& event) {
-    const PropertyValue* payload = event.find("payload");
-    const PropertyDict* fields = payload != nullptr ? payload->dict() : nullptr;
+    const PropertyDict* fields = event.findDict("payload");
     std::cout << entryText(event, "time") << "  " << entryText(event, "event") << "  "
               << (fields != nullptr ? fields->size() : 0) << " fields\n";
     if (inFull && fields != nullptr) {
@@ -61,7 +60,7 @@ void showEvents(const DeviceDirectory& directory, bool inFull) {
   });
 }
 
-/// The text form of a record, or of its first entries and the number of the others.
+/// The text form of a record, possibly cut short.
 std::string recordText(const PropertyDict& record, bool inFull) {
   constexpr std::size_t kShownEntries = 8;
   if (inFull || record.size() <= kShownEntries) {
@@ -76,8 +75,7 @@ std::string recordText(const PropertyDict& record, bool inFull) {
 
 void showRecords(const DeviceDirectory& directory, bool inFull) {
   showLines(directory.hostPath("outbox/records.jsonl"), [inFull](const PropertyDict& line) {
-    const PropertyValue* value = line.find("record");
-    const PropertyDict* record = value != nullptr ? value->dict() : nullptr;
+    const PropertyDict* record = line.findDict("record");
     std::cout << entryText(line, "time") << "  type " << entryText(line, "type") << "  "
               << (record != nullptr ? printableText(recordText(*record, inFull)) : "") << '\n';
   });
@@ -99,7 +97,7 @@ void showSystemLog(const DeviceDirectory& directory) {
   });
 }
 
-/// A text log: the lines, those with fields parted by semicolons as a line for each field.
+/// A text log; fields parted by semicolons get a line each.
 void showText(const std::string& content, bool inFull) {
   constexpr std::size_t kShownFields = 24;
   std::vector<std::string> fields;

@@ -20,7 +20,6 @@ namespace {
 
 constexpr std::string_view kNameAfterNumber = "-193-log-aggregated.ptree";
 
-/// The number in the name of a daily log.
 std::optional<std::uint64_t> numberOf(std::string_view name) {
   std::uint64_t number = 0;
   const auto [end, error] = std::from_chars(name.data(), name.data() + name.size(), number);
@@ -43,25 +42,17 @@ bool isInteger(const PropertyValue& value) {
   return value.number() != nullptr && !value.number()->isFloatingPoint();
 }
 
-/// What keeps a document from being a daily log; null when it is one.
+/// Null for a sound daily log.
 const char* faultOf(const PropertyDict& log) {
-  const auto dict = [&log](std::string_view key) -> const PropertyDict* {
-    const PropertyValue* value = log.find(key);
-    return value != nullptr ? value->dict() : nullptr;
-  };
-  for (const char* const key : {"TBStartDate", "TBLogCreationDate"}) {
-    const PropertyValue* value = log.find(key);
-    if (value == nullptr || value->date() == nullptr) {
-      return "a date is missing";
-    }
+  if (log.findDate("TBStartDate") == nullptr || log.findDate("TBLogCreationDate") == nullptr) {
+    return "a date is missing";
   }
-  const PropertyValue* digest = log.find("TBWhitelistDigest");
-  if (digest == nullptr || digest->string() == nullptr) {
+  if (log.findString("TBWhitelistDigest") == nullptr) {
     return "the whitelist digest is missing";
   }
-  const PropertyDict* const scalars = dict("TBScalars");
-  const PropertyDict* const distributions = dict("TBDistributions");
-  const PropertyDict* const histograms = dict("TBDistributionsHistogram");
+  const PropertyDict* const scalars = log.findDict("TBScalars");
+  const PropertyDict* const distributions = log.findDict("TBDistributions");
+  const PropertyDict* const histograms = log.findDict("TBDistributionsHistogram");
   if (scalars == nullptr || distributions == nullptr || histograms == nullptr) {
     return "its scalars, distributions or histograms are missing";
   }

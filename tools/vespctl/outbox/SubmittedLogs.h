@@ -12,7 +12,7 @@
 
 namespace vesprun {
 
-/// A submitted daily log in the outbox, with what every reader of it needs.
+/// A submitted daily log in the outbox.
 struct SubmittedLog {
   std::string name;           ///< of its file
   std::int32_t day = 0;       ///< that it reports
@@ -21,7 +21,7 @@ struct SubmittedLog {
   PropertyDict document;
 };
 
-/// Why a file with the name of a daily log is none.
+/// A file with the name of a daily log that is not one.
 struct UnreadableLog {
   std::string name;
   std::string why;
@@ -37,12 +37,12 @@ struct SubmittedLogs {
 bool isDailyLogName(std::string_view name);
 
 /// Gives `take` the daily logs in the outbox, by number. A log's revision is one more than the
-/// highest of its day so far, of logs that were pruned as well. Throws `CommandFailure` when the
-/// outbox cannot be read.
+/// highest of its day so far, pruned logs included. Throws `CommandFailure` when the outbox cannot
+/// be read.
 std::vector<UnreadableLog> forEachSubmittedLog(const DeviceDirectory& directory,
                                                const std::function<void(SubmittedLog&& log)>& take);
 
-/// Names logs on standard error, with what is wrong.
+/// Names unreadable logs on standard error.
 void nameUnreadable(std::span<const UnreadableLog> logs);
 
 SubmittedLogs readSubmittedLogs(const DeviceDirectory& directory);

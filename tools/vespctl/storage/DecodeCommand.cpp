@@ -20,7 +20,7 @@ namespace {
 
 using Buffer = std::span<const std::uint8_t>;
 
-/// Field by field: there can be a million. Names need no escape in JSON.
+/// Field by field: there can be a million. Names need no JSON escapes.
 void printFields(const PropertyValue& result, const GenericParserCxt& fields) {
   std::cout << "{\"result\":" << jsonText(result)
             << ",\"error\":" << jsonText(PropertyValue(GetAPIErrorMessage())) << ",\"fields\":[";
@@ -89,7 +89,7 @@ const Layout* findLayout(const std::string& name) {
   return layout != std::end(kLayouts) ? layout : nullptr;
 }
 
-/// The whole 64-bit words of the thread's statistics.
+/// Prints the whole 64-bit words of the thread's statistics.
 void printSnapshot(Buffer snapshot, const std::string& thread) {
   std::optional<Buffer> statistics;
   nlohmann::ordered_json answer;

@@ -16,7 +16,7 @@
 namespace vesprun {
 namespace {
 
-/// The words that ask for a list, and what prints its rows.
+/// The words that select a list.
 struct List {
   std::string name;
   std::function<void()> print;

@@ -4,9 +4,9 @@
 #include <iostream>
 
 #include "Command.h"
+#include "NANDInfo/StructuredLogState.h"
 #include "NANDInfo/controller/NandExporter.h"
 #include "NANDInfo/lists/StructuredLog.h"
-#include "NANDInfo/lists/StructuredLogState.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/sets/HealthSets.h"
 #include "platform/host/documents/JsonForm.h"
@@ -32,7 +32,7 @@ struct NandArguments {
   bool force = false;
 };
 
-/// One exported entry point. What it answers goes into "result", null when it is nothing.
+/// An exported entry point; its answer becomes "result", null when there is none.
 struct NandVerb {
   const char* name;
   const char* help;
@@ -48,7 +48,7 @@ void addRoundFlag(CLI::App& verb, NandArguments& arguments) {
   verb.add_flag("--round", arguments.round, "Rounds the numbers to their significant digits");
 }
 
-/// True when the controller could be opened; it is closed again.
+/// True when the controller opens.
 bool connectsToController() {
   ORUConnection connection;
   const bool opened = openORUConnection(connection);
@@ -141,8 +141,8 @@ constexpr NandVerb kVerbs[] = {
      [](const NandArguments&) { return std::optional<PropertyValue>(connectsToController()); }},
 };
 
-/// Sends what is printed to standard output to standard error as long as it lives: entry points
-/// print there, and would come between a reader and the result.
+/// Redirects standard output to standard error as long as it lives: entry points print there,
+/// before the result.
 class StandardOutputAside {
  public:
   StandardOutputAside() : _kept(dup(STDOUT_FILENO)) {

@@ -100,7 +100,7 @@ bool ChunkEnumerator::loadChunk() {
   return true;
 }
 
-// By a statement of their own: a column that a row names is read with the row.
+// Separate: reading a row reads all its named columns.
 void ChunkEnumerator::loadOffsets() {
   _offsets = _store.readTwice([this] {
     if (_opening != _store.opening()) {  // the values went with the earlier connection

@@ -10,20 +10,20 @@
 
 namespace vesprun {
 
-/// Takes the values out of the chunks of one distribution after another.
+/// Reads the values of one distribution after another from their chunks.
 class ChunkEnumerator final : public TBHistoryDistributionEnumerator {
  public:
   /// `store` must outlive the object.
   explicit ChunkEnumerator(CounterStore& store) : _store(store) {}
 
-  /// Begins with the distribution of that row number.
+  /// Begins the distribution with that row number.
   void start(std::int64_t distribution);
 
-  /// A failure ends the values; it is kept for `rethrowFailure`, since the code that takes the
-  /// values knows nothing of SQLite.
+  /// A failure ends the values and is kept for `rethrowFailure`: the reader of the values knows
+  /// nothing of SQLite.
   bool getNextValueSecondsInDayOffset(double& value, std::int32_t* secondsInDay) override;
 
-  /// Throws that failure; its text then says how many values came before.
+  /// Its text says how many values came before.
   void rethrowFailure() const;
 
  private:
@@ -32,9 +32,9 @@ class ChunkEnumerator final : public TBHistoryDistributionEnumerator {
   void loadOffsets();
 
   CounterStore& _store;
-  int _opening = 0;  ///< the one of the store that the statements belong to
+  int _opening = 0;  ///< of the store, for these statements
   std::optional<SqliteStatement> _chunks;
-  std::int64_t _placedAt = -1;                   ///< the chunk that its next step leads to
+  std::int64_t _placedAt = -1;                   ///< the chunk of its next step
   std::optional<SqliteStatement> _chunkOffsets;  ///< made when someone asks for an offset
   std::int64_t _distribution = 0;
   std::int64_t _sequence = 0;  ///< of the next chunk

@@ -19,7 +19,7 @@ namespace {
 constexpr std::string_view kFolder = "var/mobile/Library/Tallybook";
 constexpr const char* kName = "TBDataStore.sqlitedb";
 
-// What SQLite may keep beside a database. We use only the first; other tools may turn on the rest.
+// SQLite's companion files. We use only the first; other tools may enable the rest.
 constexpr std::array kCompanions{"-journal", "-wal", "-shm"};
 
 constexpr int kMostAttempts = 3;
@@ -106,7 +106,7 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
     try {
       return attempt();
     } catch (const SqliteFailure& failure) {
-      // What reads has been read twice already.
+      // Reading has been tried twice already.
       if (!writes || !failure.isCorruption()) {
         throw;
       }
@@ -138,7 +138,7 @@ bool CounterFile::makeLocked(std::string& error) {
   if (exists(path)) {
     return true;
   }
-  // The journal of a file that is gone would be played back into the new one.
+  // The journal of a lost file would be replayed into the new one.
   const std::string aside = unusedNameAside();
   for (const char* companion : kCompanions) {
     if (std::rename((path + companion).c_str(), (aside + companion).c_str()) != 0 &&
@@ -174,7 +174,7 @@ std::optional<std::string> CounterFile::replace(const Damage& damage, std::strin
   if (stat(path.c_str(), &status) == 0 && status.st_dev == damage.device &&
       status.st_ino == damage.number) {
     aside = unusedNameAside();
-    // The file first: without it, a journal left by a kill at this point is moved later, too.
+    // The file first: if we are killed here, its journal is moved aside later.
     if (std::rename(path.c_str(), aside.c_str()) != 0) {
       error = systemError(path);
       return std::nullopt;

@@ -17,13 +17,13 @@ constexpr std::size_t kReadSize = 256 * 1024;
 constexpr std::size_t kLongestLine = 2 * 1024 * 1024;  // the longest key fits
 constexpr std::size_t kMostBufferedBytes = 32 * 1024 * 1024;
 
-/// Parts a stream at line feeds; the last line may go without.
+/// Splits a stream at line feeds; the last line may lack one.
 class LineReader {
  public:
   explicit LineReader(std::istream& stream) : _stream(stream) {}
 
-  /// The next line, valid until the next call; nothing at the end, and, with a text in `error`,
-  /// when it cannot be had.
+  /// The next line, valid until the next call. Nothing at the end and, with a text in `error`, on
+  /// failure.
   std::optional<std::string_view> next(std::string& error) {
     std::size_t searched = _begin;
     for (;;) {
@@ -71,7 +71,7 @@ class LineReader {
   std::size_t _end = 0;
 };
 
-/// Collects the samples of each key, so that lines of many keys in turn reach the tables as runs.
+/// Collects samples by key, so that alternating keys reach the tables as runs.
 class SampleBuffer {
  public:
   explicit SampleBuffer(CounterStore& counters) : _counters(counters) {}
@@ -113,7 +113,7 @@ class SampleBuffer {
   std::size_t _size = 0;
 };
 
-/// Takes the first field from the text; false when no tab follows it.
+/// False without a tab.
 bool takeFirst(std::string_view& text, std::string_view& field) {
   const auto tab = text.find('\t');
   if (tab == std::string_view::npos) {
@@ -178,7 +178,7 @@ bool importLine(std::string_view line, CounterStore& counters, SampleBuffer& sam
          samples.add(day, key, sample, error);
 }
 
-/// Forms the lines and hands them on in pieces.
+/// Writes lines in pieces.
 class LineWriter {
  public:
   explicit LineWriter(const std::function<bool(std::string_view)>& sink) : _sink(sink) {}

@@ -194,10 +194,9 @@ void CounterStore::appendSamples(std::int32_t day, std::string_view key,
   }
 }
 
-/// Gives `deliver` the rows of day, key and a third column that `select` gives between two days in
-/// the order of days and keys, from a day and key on, for which the key begins with `keyPrefix`;
-/// until it sets its last argument. Sees to it that all rows come in order and with keys that can
-/// have been written.
+/// Delivers the rows of `select` (day, key and a third column, between two days, from a day and key
+/// on) whose key begins with `keyPrefix`, until the handler stops. Checks that rows come in order
+/// and with valid keys.
 template <typename Deliver>
 void CounterStore::forEachRow(const char* what, const char* select, std::string_view keyPrefix,
                               std::int32_t minDay, std::int32_t maxDay, const Deliver& deliver) {

@@ -15,28 +15,27 @@
 
 namespace vesprun {
 
-/// True for a key that the database takes: UTF-8 text that an XML 1.0 document can carry, 1 MiB at
-/// most. Otherwise `error` says what is wrong with it.
+/// True for UTF-8 that an XML 1.0 document can carry, 1 MiB at most; otherwise `error` says why
+/// not.
 bool isCounterKey(std::string_view key, std::string& error);
 
-/// The sum of two counts, which wraps around.
+/// The sum, wrapped in 64 bits.
 inline std::int64_t wrappingSum(std::int64_t left, std::int64_t right) {
   return static_cast<std::int64_t>(static_cast<std::uint64_t>(left) +
                                    static_cast<std::uint64_t>(right));
 }
 
-/// One recorded value of a distribution.
 struct Sample {
   double value;
   std::int32_t secondsInDay;
 };
 
-/// The tables of the counter database, in one open file and one transaction. Every operation throws
-/// `SqliteFailure`. What fails to be read is read once more, from a newly opened file, first.
+/// The tables of the counter database in one open file and one transaction. Every operation throws
+/// `SqliteFailure`; a failed read is first repeated on a newly opened file.
 ///
-/// Scalars are rows of day, key and value. The samples of a distribution are packed into chunks:
-/// their values as little-endian doubles, and their offsets as little-endian 32-bit integers in a
-/// column behind them, so that reading values alone never touches the pages of the offsets.
+/// Scalars are rows of day, key and value. Samples are packed into chunks: values as little-endian
+/// doubles, and behind them offsets as little-endian 32-bit integers, so that reading values alone
+/// never touches the offsets' pages.
 class CounterStore {
  public:
   static constexpr std::size_t kSamplesPerChunk = 4096;
@@ -44,13 +43,13 @@ class CounterStore {
   /// Reading takes back a commit that was cut off; looking touches no file.
   enum class Access { Looking, Reading, Writing };
 
-  /// Opens an existing file. What another process has locked is waited for, `longestWait` at most.
+  /// Opens an existing file, waiting `longestWait` at most for another process's lock.
   CounterStore(std::string path, std::chrono::milliseconds longestWait, Access access);
 
-  /// The content of a new database file. Throws `SqliteFailure`.
+  /// Throws `SqliteFailure`.
   static std::string emptyDatabase();
 
-  /// Makes everything that was written durable; without it, nothing of it is kept.
+  /// Makes all writes durable; without it they are lost.
   void commit() { _connection.commit(); }
 
   const SqliteConnection& connection() const { return _connection; }
@@ -63,9 +62,8 @@ class CounterStore {
   /// Appends samples to a distribution, in order.
   void appendSamples(std::int32_t day, std::string_view key, std::span<const Sample> samples);
 
-  /// Delivers rows as `TBHistory` does. A failure among the values of a distribution ends them for
-  /// the handler, and is thrown when the handler has returned. The text of a failure says how far
-  /// the reading came.
+  /// Delivers rows as `TBHistory` does. A failure within a distribution ends its values and is
+  /// thrown after the handler. Its text says how far the reading came.
   void readScalars(std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
                    const TBHistory::ScalarRowHandler& handler);
   void readDistributions(std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
@@ -85,13 +83,11 @@ class CounterStore {
   /// room for the means to do so is written anew, for which all that was done before is committed.
   void giveRoomBack();
 
-  /// The next day after `day` that has a row; nothing when there is none. `day` is 64 bits wide so
-  /// that the first day can be asked for too.
+  /// The next day after `day` with a row. `day` has 64 bits so that the first day can be asked for.
   std::optional<std::int32_t> nextDay(std::int64_t day);
 
-  /// Runs `step`, which reads, and again when it failed: statements made before belong to an
-  /// earlier `opening` then and are of no more use. Not when a lock was waited for, nor in a
-  /// transaction that writes.
+  /// Runs `step`, which reads, and again if it failed: earlier statements then belong to an earlier
+  /// `opening` and are useless. Not after waiting for a lock, nor in a writing transaction.
   template <typename Step>
   auto readTwice(const Step& step) {
     try {
@@ -109,7 +105,7 @@ class CounterStore {
   int opening() const { return _opening; }
 
  private:
-  /// Statements that write, prepared when the first one is needed.
+  /// Writing statements, prepared on demand.
   struct Writer;
 
   void open();

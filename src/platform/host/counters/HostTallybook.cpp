@@ -3,6 +3,7 @@
 #include <optional>
 
 #include "common/Calendar.h"
+#include "platform/Guarded.h"
 #include "platform/PreferenceNames.h"
 
 namespace vesprun {
@@ -111,7 +112,7 @@ bool HostTallybook::flush(std::string& error) {
     }
     return true;
   };
-  // Without allocating: memory may just have run out.
+  // Does not allocate: memory may just have run out.
   const auto keepChanges = [&] {
     const std::scoped_lock guard(_pendingMutex);
     for (auto& [place, change] : changes) {
@@ -172,7 +173,7 @@ bool HostTallybook::recover(const CounterFile::Damage& damage, std::string& erro
   if (!aside->empty()) {
     _log.write(LogLevel::Error,
                damage.text + "; kept as " + *aside + ", an empty database takes its place");
-    // The first synchronization lets go of a count that another process may have changed.
+    // First forget a count that another process may have changed.
     _preferences.LGSPreferencesSynchronize(kAggregatedDomain);
     const std::int64_t count =
         _preferences.LGSPreferencesGetIntegerValue(kCorruptionCountKey, kAggregatedDomain);

@@ -21,22 +21,22 @@
 
 namespace vesprun {
 
-/// The counter database in `var/mobile/Library/Tallybook/TBDataStore.sqlitedb`. It is opened when
-/// something is read or written, and not before.
+/// The counter database, `var/mobile/Library/Tallybook/TBDataStore.sqlitedb`, opened only to read
+/// or write.
 ///
-/// A file found damaged twice in a row, or of another shape, is moved aside with its journal under
-/// a name with the time ("TBDataStore.sqlitedb.corrupt-20240305T091502Z"), an empty one takes its
-/// place, the integer preference "DatabaseCorruptionCount" of "com.quill.aggregated" goes up by
-/// one, an error line says so, and the work goes on. Locks that last, permissions, full disks and
-/// all other errors of the system are not damage: an error line says what failed, and what was to
-/// be written stays collected. Several processes may use the database at once.
+/// A file that is twice found damaged, or of another shape, is moved aside with its journal
+/// ("TBDataStore.sqlitedb.corrupt-20240305T091502Z"); an empty one replaces it, the integer
+/// preference "DatabaseCorruptionCount" of "com.quill.aggregated" goes up by one, with an error
+/// line, and the work continues. Lasting locks, permissions, full disks and other system errors are
+/// not damage: an error line names them, and unwritten changes stay collected. Several processes
+/// may use the database at once.
 class HostTallybook final : public Tallybook {
  public:
-  /// What the references name must outlive the object. While other processes keep the database
-  /// locked, an operation waits for `longestWait` at most.
+  /// The references must outlive the object. An operation waits `longestWait` at most for other
+  /// processes.
   HostTallybook(const DeviceDirectory& directory, Clock& clock, Preferences& preferences,
                 SystemLog& log, std::chrono::milliseconds longestWait = kLongestLockWait);
-  /// Writes what is still collected; an error line says when that is lost.
+  /// Writes what is collected; an error line reports a loss.
   ~HostTallybook() override;
   HostTallybook(const HostTallybook&) = delete;
   HostTallybook& operator=(const HostTallybook&) = delete;
@@ -48,21 +48,20 @@ class HostTallybook final : public Tallybook {
   void TBClientAddValueForScalarKey(std::string_view key, std::int64_t value) override;
   std::unique_ptr<TBHistory> initWithDefaultPath() override;
 
-  // What tools need beside. Each writes or reads at once, all or nothing; false, with a text in
-  // `error`, when that failed.
+  // For tools. Each works at once, all or nothing; false, with a text in `error`, on failure.
 
-  /// Runs `work` on the tables in one transaction. When it finds the database damaged, `work` runs
-  /// again on the same file, and at last on a new one. A false result takes everything back.
+  /// Runs `work` in one transaction; after damage again on the same file, and at last on a new one.
+  /// A false result undoes everything.
   bool write(const std::function<bool(CounterStore&)>& work, std::string& error);
 
-  /// Runs `work` on the tables as they stand at one moment; without a database it is not run. False
-  /// also when the database cannot be read to its end: `work` has then seen the rows before that
-  /// point, which `error` names.
+  /// Runs `work` on the tables as of one moment; not without a database. False also when the
+  /// database cannot be read to its end: `work` has seen the rows before the point that `error`
+  /// names.
   bool read(const std::function<void(CounterStore&)>& work, std::string& error);
 
  private:
   struct PendingScalar {
-    bool isSet;  ///< replaces what is stored, rather than adding to it
+    bool isSet;  ///< replaces instead of adding
     std::int64_t value;
   };
   using PendingScalars = std::map<std::pair<std::int32_t, std::string>, PendingScalar>;
@@ -77,7 +76,7 @@ class HostTallybook final : public Tallybook {
   Preferences& _preferences;
   SystemLog& _log;
   CounterFile _file;
-  std::mutex _flushMutex;  ///< held for the whole of a flush
+  std::mutex _flushMutex;  ///< during a flush
   std::mutex _pendingMutex;
   PendingScalars _pending;
 };

@@ -5,16 +5,15 @@
 namespace vesprun {
 namespace {
 
-// No cell of ours is near this size; a damaged one may claim to be.
+// Our cells are far smaller; a damaged one may claim any size.
 constexpr int kLongestCell = 16 * 1024 * 1024;
 
-/// SQLite's own file system under another name, with one difference: SQLite takes a read that fails
-/// with EIO for damage of the file, and here it stays an error of reading. The one to look with
-/// leaves all files as they are, too: SQLite removes and makes files also for connections that
-/// read.
+/// SQLite's own file system with one difference: SQLite treats a read that fails with EIO as
+/// damage; here it stays a read error. The one to look with also leaves all files alone: SQLite
+/// removes and creates files even for connections that read.
 class ErrorKeepingFileSystem {
  public:
-  /// Registered with SQLite for as long as the program, or the library, is loaded.
+  /// Registered as long as the program or library is loaded.
   static const char* name(bool looks) {
     static ErrorKeepingFileSystem fileSystem("vesprun", false);
     static ErrorKeepingFileSystem lookingFileSystem("vesprun-looking", true);
@@ -138,7 +137,7 @@ std::int64_t SqliteConnection::queryInteger(const char* sql) {
 
 void SqliteConnection::commit() {
   const int result = sqlite3_exec(handle(), "COMMIT", nullptr, nullptr, nullptr);
-  // When these fail the journal is gone, and with it the way back.
+  // After these failures the journal is gone: no way back.
   if (result != SQLITE_OK && result != SQLITE_IOERR_DIR_FSYNC && result != SQLITE_IOERR_UNLOCK &&
       result != SQLITE_IOERR_RDLOCK) {
     fail(result);

@@ -11,43 +11,37 @@
 
 namespace vesprun {
 
-/// Why the database could not do what it was asked. Thrown within the counter database's own files
-/// and caught before it leaves them.
+/// A failure of the database. Thrown and caught within this folder.
 struct SqliteFailure {
   int code;          ///< SQLite's extended result code
   std::string text;  ///< names the file and the cause
 
-  /// True when the file is not, or no longer, a sound database of the expected shape; false for
-  /// trouble around it: locks, permissions, a full disk.
+  /// True for a damaged file or one of another shape; false for locks, permissions and full disks.
   bool isCorruption() const;
 
-  /// True when another process kept the file locked for as long as the connection waits.
+  /// True after waiting in vain for another process's lock.
   bool isBusy() const { return (code & 0xFF) == SQLITE_BUSY; }
 };
 
-/// An open SQLite database file, set up to distrust what it finds in it. An error of the system is
-/// never taken for damage of the file.
+/// An open SQLite database that distrusts its content. System errors never count as damage.
 class SqliteConnection {
  public:
   SqliteConnection() = default;
-  /// Opens an existing file, for reading only when it cannot be written, or a database in memory
-  /// (":memory:"). What another process has locked is waited for, `longestWait` at most. Throws
-  /// `SqliteFailure`.
+  /// Opens an existing file, for reading only if it cannot be written, or ":memory:". Waits
+  /// `longestWait` at most for a lock. Throws `SqliteFailure`.
   ///
-  /// One that `looks` neither writes nor makes nor removes a file, also not one beside the
-  /// database. What would need that fails: to take back a commit that was cut off, to read a
-  /// write-ahead log.
+  /// One that `looks` writes, creates and removes no file, not even beside the database. What would
+  /// need that fails: rolling back a commit that was cut off, reading a write-ahead log.
   SqliteConnection(const std::string& path, std::chrono::milliseconds longestWait,
                    bool looks = false);
 
-  /// Runs statements that give no rows. Throws `SqliteFailure`.
+  /// Runs statements without rows. Throws `SqliteFailure`.
   void execute(const char* sql);
 
-  /// The integer that a one-row query gives.
+  /// The result of a one-row query.
   std::int64_t queryInteger(const char* sql);
 
-  /// Commits the transaction that `BEGIN` began. One that is not committed ends with the
-  /// connection.
+  /// Without a commit the transaction ends with the connection.
   void commit();
 
   /// The version that a program must know to write to the file, as its header says.
@@ -68,20 +62,20 @@ class SqliteConnection {
   std::unique_ptr<sqlite3, Close> _database;
 };
 
-/// A prepared statement. Every operation throws `SqliteFailure`. Columns are read only as the type
-/// that the schema gives them; another type counts as corruption.
+/// A prepared statement. Every operation throws `SqliteFailure`. A column of another type than the
+/// schema's counts as corruption.
 class SqliteStatement {
  public:
   SqliteStatement(const SqliteConnection& connection, const char* sql);
 
   SqliteStatement& bind(int parameter, std::int64_t value);
-  /// The text or bytes must stay until the statement is reset.
+  /// Text and bytes must stay until the reset.
   SqliteStatement& bind(int parameter, std::string_view text);
   SqliteStatement& bind(int parameter, std::span<const std::uint8_t> bytes);
 
-  /// True when there is a row, which is valid until the next step.
+  /// True for a row, valid until the next step.
   bool step();
-  /// Steps to the end of a statement that gives no rows, and resets it.
+  /// Runs a statement without rows, and resets it.
   void run();
   void reset();
 

@@ -11,14 +11,14 @@
 namespace vesprun {
 namespace {
 
-/// What is wrong with the description; caught before it leaves this file.
+/// Never leaves this file.
 struct DescriptionError {
   std::string text;
 };
 
 class Field;
 
-/// A value of the description, a plain one, and the path that leads to it.
+/// A plain value of the description and the path to it.
 class Entry {
  public:
   Entry(const PropertyValue& value, std::string path) : _value(value), _path(std::move(path)) {}
@@ -30,7 +30,7 @@ class Entry {
   const PropertyValue& value() const { return _value; }
   bool isNull() const { return _value.data() != nullptr; }
 
-  /// The content, of the type that is wanted.
+  /// The content, which must be of that type.
   template <typename T>
   const T& as(const T* (PropertyValue::*content)() const, const char* problem) const {
     const T* found = (_value.*content)();
@@ -49,7 +49,7 @@ class Entry {
     return {value, _path.empty() ? name : _path + '.' + name};
   }
 
-  /// Calls `work` with the name and the entry for each entry of a dictionary whose names are free.
+  /// Calls `work` for each entry of a dictionary with free names.
   template <typename Work>
   void forEachNamed(Work work) const {
     for (const auto& [name, value] : dict()) {
@@ -65,10 +65,10 @@ class Entry {
     }
   }
 
-  /// Reads a dictionary that has no other entries than these.
+  /// Reads a dictionary with these entries and no others.
   void fields(std::initializer_list<Field> fields) const;
 
-  /// The value that the plain one stands for.
+  /// With tagged objects resolved.
   PropertyValue resolved() const {
     std::string error;
     std::optional<PropertyValue> value = valueFromPlain(_value, error);
@@ -86,7 +86,7 @@ class Entry {
 enum class Presence { Optional, Required };
 constexpr Presence kRequired = Presence::Required;
 
-/// An entry of a dictionary and what it is read into.
+/// A named entry and its target.
 class Field {
  public:
   template <typename T>
@@ -123,7 +123,7 @@ void Entry::fields(std::initializer_list<Field> fields) const {
   }
 }
 
-/// An entry that may be there and is looked at later.
+/// An entry that is read elsewhere.
 struct Unread {};
 
 void read(const Entry& /*entry*/, Unread& /*unread*/) {}
@@ -247,7 +247,7 @@ void read(const Entry& entry, SubmissionDescription& submission) {
   entry.fields({{"enabled", submission.enabled}, {"fails", submission.fails}});
 }
 
-/// `true` says what an absent entry says: every event is wanted.
+/// `true` means the same as no entry: every event is wanted.
 struct UsedEvents {
   std::optional<std::set<std::string, std::less<>>>& names;
 };

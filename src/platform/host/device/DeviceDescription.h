@@ -16,10 +16,10 @@
 
 namespace vesprun {
 
-// What `device.json` says of a device. Where an entry may be absent, the running Linux system
-// answers in its place ("live") unless said otherwise.
+// The content of `device.json`. Where an entry is absent, the running Linux system answers ("live")
+// unless stated otherwise.
 
-/// An entry that can be absent (the live answer holds) or null (there is no answer).
+/// An entry that can be absent (live) or null (no answer).
 template <typename T>
 struct AnswerDescription {
   bool isNull = false;
@@ -70,7 +70,7 @@ struct SupportLibraryDescription {
   std::set<std::string, std::less<>> missing;
 };
 
-/// The content of a kernel variable; text is stored without its final NUL.
+/// Text has no final NUL.
 using KernelVariable = std::variant<std::uint32_t, std::uint64_t, std::string, Bytes>;
 
 struct KernelDescription {
@@ -93,7 +93,7 @@ struct ChannelDescription {
   std::uint64_t categories = 256;
 };
 
-/// What the usage feed replies, and when. Null records: it never replies.
+/// The usage feed's reply, and when. Null: it never replies.
 struct UsageDescription {
   PropertyArray records;
   double delaySeconds = 0.0;
@@ -121,7 +121,7 @@ struct UserClientDescription {
   std::uint32_t closeError = 0;
   std::vector<TunnelAnswerDescription> tunnel;
   std::optional<ContentDeletionDescription> contentDeletion;
-  /// Method number, then four-character code, to the scalar that is answered.
+  /// By method number and four-character code.
   std::map<std::uint32_t, std::map<std::uint32_t, std::uint64_t>> scalarMethods;
 };
 
@@ -135,7 +135,7 @@ struct RegistryEntryDescription {
 };
 
 struct DeviceDescription {
-  std::optional<Date> clock;  ///< present: the time stands still at it
+  std::optional<Date> clock;  ///< present: the clock stops at it
   std::optional<std::string> timeZone;
   LogLevel logLevel = LogLevel::Info;
   SystemDescription system;
@@ -148,7 +148,7 @@ struct DeviceDescription {
   LanguageDescription languages;
   SupportLibraryDescription supportLibrary;
   bool purgeableServiceAvailable = false;
-  std::optional<PropertyDict> purgeable;  ///< absent: the service, if there is one, has no answer
+  std::optional<PropertyDict> purgeable;  ///< absent: no answer
   KernelDescription kernel;
   std::vector<RegistryEntryDescription> registry;
   std::vector<ChannelDescription> channels;
@@ -156,11 +156,10 @@ struct DeviceDescription {
   AnswerDescription<UsageDescription> usage;  ///< absent: an empty reply at once
 };
 
-/// The longest `device.json`, in bytes: 16 MiB.
+/// In bytes: 16 MiB.
 inline constexpr std::size_t kLongestDeviceDescription = std::size_t{16} << 20;
 
-/// Reads the text of a `device.json`. Nothing, with a text in `error` that names the entry or the
-/// line, when it is not one.
+/// Nothing, with the entry or line in `error`, when the text is malformed.
 std::optional<DeviceDescription> readDeviceDescription(const std::string& text, std::string& error);
 
 }  // namespace vesprun

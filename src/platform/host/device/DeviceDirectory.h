@@ -6,25 +6,25 @@
 
 namespace vesprun {
 
-/// The folder that stands for one device. Everything in it is for its owner alone.
+/// The folder of one device. Everything in it is its owner's alone.
 class DeviceDirectory {
  public:
-  /// Nothing, with a text in `error`, when `path` is not a folder.
+  /// Nothing, with a text in `error`, unless `path` is a folder.
   static std::optional<DeviceDirectory> open(const std::string& path, std::string& error);
 
-  /// The same folder for one who only looks at it: no service changes anything in it.
+  /// The same folder, in which no service changes anything.
   DeviceDirectory readOnly() const;
   bool isReadOnly() const { return _isReadOnly; }
 
-  /// The folder's own path, without a final slash.
+  /// Without a final slash.
   const std::string& path() const { return _path; }
 
-  /// Where a path of the device ("/var/mobile/...", or one relative to its root) lies on the host.
+  /// The host path of a device path ("/var/mobile/...", or relative to its root).
   std::string hostPath(std::string_view devicePath) const;
 
-  /// The host path of a folder of the device, made (with those above it) when it is missing.
-  /// Nothing, with a text in `error`, when it cannot be made. What is written into a folder begins
-  /// with this, which therefore refuses every folder of a read-only device.
+  /// The host path of a device folder, which is created with those above it if missing. Nothing,
+  /// with a text in `error`, on failure. All writing into a folder begins here, so that a read-only
+  /// device need only refuse it here.
   std::optional<std::string> makeFolder(std::string_view devicePath, std::string& error) const;
 
  private:

@@ -23,7 +23,7 @@ ECCEventQueue::Outcome ECCEventQueue::take(const std::string& path, std::span<st
     error = systemError(path);
     return outcome;
   };
-  // A pipe under the name must not stop the reader for ever.
+  // A pipe must not block the reader.
   FileDescriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
   if (!file.isOpen()) {
     const bool lasts = errno == EACCES || errno == EPERM || errno == ELOOP || errno == ENXIO;
@@ -37,7 +37,7 @@ ECCEventQueue::Outcome ECCEventQueue::take(const std::string& path, std::span<st
     return failed(Outcome::Failed);
   }
   if (status.st_nlink == 0) {
-    return Outcome::Skipped;  // whoever had the lock before has removed it
+    return Outcome::Skipped;  // removed by the earlier holder of the lock
   }
   if (!S_ISREG(status.st_mode) || status.st_size != kEventLength) {
     error = path + (S_ISREG(status.st_mode)

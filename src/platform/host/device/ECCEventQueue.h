@@ -10,28 +10,28 @@
 
 namespace vesprun {
 
-/// The kernel's queue of ECC events: the files kernel/ecc/*.bin, the oldest first by name (byte
-/// order). Several processes may take events at once; each event goes to one of them.
+/// The kernel's queue of ECC events: the files kernel/ecc/*.bin in byte order. Several processes
+/// may read it; each event goes to one of them.
 class ECCEventQueue {
  public:
   static constexpr std::size_t kEventLength = 72;
 
-  /// What the references name must outlive the object.
+  /// The references must outlive the object.
   ECCEventQueue(const DeviceDirectory& directory, SystemLog& log)
       : _directory(directory), _log(log) {}
 
-  /// Takes the oldest event that no other process has taken; its file stays, locked, until
-  /// `removeTaken`. What was taken before and not removed is back in the queue. 0, and the bytes in
-  /// `buffer`; otherwise an error number: ENOENT when the queue is empty, EINVAL when the buffer is
-  /// not of an event's length, EROFS on a read-only device, EIO, and an error in the system log,
-  /// when the folder or an event cannot be read now or a file is in the way that cannot be renamed.
+  /// Takes the oldest event that no other process has; its file stays, locked, until `removeTaken`.
+  /// An earlier event that was not removed is back in the queue. 0, and the bytes in `buffer`; or
+  /// ENOENT when the queue is empty, EINVAL when the buffer is not of an event's length, EROFS on a
+  /// read-only device, EIO, with an error in the system log, when the folder or an event cannot be
+  /// read now or a file in the way cannot be renamed.
   ///
-  /// A file that never is an event (of another kind or length, or not for this process to read) is
-  /// renamed to NAME.bin.unusable, an error in the system log says why, and the next one is taken.
+  /// A file that can never be an event (of another kind or length, or unreadable) is renamed to
+  /// NAME.bin.unusable with an error in the system log, and the next one is taken.
   int takeNext(std::span<std::uint8_t> buffer, std::size_t& length);
 
-  /// Deletes the file of the event that was taken last. False, with an error in the system log,
-  /// when that failed: the event is then taken again.
+  /// Deletes the file of the event taken last. False, with an error in the system log, on failure:
+  /// the event is then taken again.
   bool removeTaken();
 
  private:

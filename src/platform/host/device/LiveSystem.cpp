@@ -26,9 +26,9 @@
 namespace vesprun::live {
 namespace {
 
-/// The entries NAME=value or NAME="value" of /etc/os-release.
-std::map<std::string, std::string> osRelease() {
-  std::map<std::string, std::string> entries;
+/// The first of these entries (NAME=value or NAME="value") that /etc/os-release has.
+std::optional<std::string> osRelease(std::initializer_list<std::string_view> names) {
+  std::map<std::string, std::string, std::less<>> entries;
   std::ifstream stream("/etc/os-release");
   for (std::string line; std::getline(stream, line);) {
     const auto end = line.find('=');
@@ -41,7 +41,12 @@ std::map<std::string, std::string> osRelease() {
     }
     entries.emplace(line.substr(0, end), std::move(value));
   }
-  return entries;
+  for (const std::string_view name : names) {
+    if (const auto entry = entries.find(name); entry != entries.end()) {
+      return entry->second;
+    }
+  }
+  return std::nullopt;
 }
 
 std::string firstLineOf(const std::string& file) {
@@ -57,7 +62,7 @@ std::string upperCase(std::string text) {
   return text;
 }
 
-/// "en_GB.UTF-8@euro" as {"en", "GB"}; nothing for the locales that name no language.
+/// "en_GB.UTF-8@euro" is {"en", "GB"}; nothing for locales without a language.
 struct LocaleName {
   std::string language;
   std::string country;
@@ -103,24 +108,15 @@ void appendDesktopEntries(const std::filesystem::path& folder, bool user,
 }  // namespace
 
 std::string osVersion() {
-  const auto entries = osRelease();
-  const auto name = entries.find("PRETTY_NAME");
-  if (name != entries.end()) {
-    return name->second;
-  }
   utsname system{};
-  return uname(&system) == 0 ? std::string(system.sysname) + ' ' + system.release : "Linux";
+  const bool isNamed = uname(&system) == 0;
+  return osRelease({"PRETTY_NAME"})
+      .value_or(isNamed ? std::string(system.sysname) + ' ' + system.release : "Linux");
 }
 
 std::string osBuild() {
-  const auto entries = osRelease();
-  for (const char* name : {"BUILD_ID", "VERSION_ID"}) {
-    if (const auto entry = entries.find(name); entry != entries.end()) {
-      return entry->second;
-    }
-  }
   utsname system{};
-  return uname(&system) == 0 ? system.release : "";
+  return osRelease({"BUILD_ID", "VERSION_ID"}).value_or(uname(&system) == 0 ? system.release : "");
 }
 
 std::optional<Bytes> swapUsage() {
@@ -141,7 +137,7 @@ std::optional<Bytes> swapUsage() {
 
 std::optional<std::string> bootSessionIdentifier() {
   std::string identifier = upperCase(firstLineOf("/proc/sys/kernel/random/boot_id"));
-  // The service sees nothing but processes in /proc; the system hands it this file as a credential.
+  // The sandboxed service cannot read /proc/sys; systemd passes the file as a credential.
   if (const char* credentials = std::getenv("CREDENTIALS_DIRECTORY");
       identifier.empty() && credentials != nullptr) {
     identifier = upperCase(firstLineOf(std::string(credentials) + "/boot_id"));

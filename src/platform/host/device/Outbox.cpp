@@ -14,7 +14,6 @@
 namespace vesprun {
 namespace {
 
-constexpr std::string_view kLogFolder = "outbox/logs";
 constexpr std::string_view kPtreeLogType = "193";  // the other logs are text
 
 class OutboxLogFile : public LogFileHandle {
@@ -39,7 +38,7 @@ AtomicFile::Added addHeader(const std::string& folder, const std::string& name,
   if (!file) {
     return AtomicFile::Added::Failed;
   }
-  file->append(jsonText(header) + '\n');  // a failure is told by `addNew`
+  file->append(jsonText(header) + '\n');  // `addNew` reports a failure
   file->setModificationTime(time);
   return file->addNew(name, error);
 }
@@ -85,7 +84,7 @@ bool Outbox::writeLog(std::string_view type, std::string_view name, const Proper
   // The machine's clock may be another one.
   const Date time = _clock.now();
   file->setModificationTime(time);
-  // Two submissions at once must not share a number: a header would stand beside the other's log.
+  // Two submissions at once must not share a number, or a header would go with the other's log.
   const std::optional<FolderLock> lock = FolderLock::take(*folder, error);
   if (!lock) {
     return false;
@@ -96,7 +95,7 @@ bool Outbox::writeLog(std::string_view type, std::string_view name, const Proper
   while (added == AtomicFile::Added::NameTaken) {
     const std::string base = baseName(++number, type, name);
     const std::string headerName = base + ".header.json";
-    // First, so that a log which is there has its header beside it.
+    // The header first: a log that is there has its header.
     if (header != nullptr) {
       added = addHeader(*folder, headerName, *header, time, error);
       if (added != AtomicFile::Added::Done) {

@@ -14,20 +14,20 @@
 
 namespace vesprun {
 
-/// What the program hands to the platform: the folder `outbox`. Failures are told in the system
-/// log.
+/// The folder `outbox`: everything that the program gives to the platform. Failures go to the
+/// system log.
 class Outbox {
  public:
   Outbox(const DeviceDirectory& directory, Clock& clock, SystemLog& log)
       : _directory(directory), _clock(clock), _log(log) {}
 
-  /// Appends one line to a file of lines: the time, then the entries. May be called from any
-  /// thread. False when the line could not be written.
+  /// Appends the time and the entries as one line. False when it could not be written. Safe from
+  /// any thread.
   bool append(const std::string& file, const PropertyDict& entries);
 
-  /// Submits a log as `logs/NNNN-TYPE-NAME.EXTENSION`, numbered upwards from 0001, with its header,
-  /// when there is one, beside it. The log appears last and complete, or not at all: false. No
-  /// file that is there already is touched. The files' modification time is that of the device.
+  /// Submits a log as `logs/NNNN-TYPE-NAME.EXTENSION`, numbered from 0001, and its header, if any.
+  /// The log appears last and complete, or not at all: false. No existing file is touched. The
+  /// files' modification time is the device's.
   bool submitLog(std::string_view type, std::string_view name, const PropertyDict* header,
                  const Logsmith::LogWriter& writer);
 

@@ -24,7 +24,7 @@ using Json = nlohmann::ordered_json;
 
 }  // namespace
 
-// What a string has beyond escapes and sound text is left to the library.
+// The library handles what is neither plain text nor a short escape.
 void appendJsonText(std::string_view string, std::string& text) {
   static constexpr std::string_view kEscaped = "\b\f\n\r\t\"\\";
   static constexpr std::string_view kEscapes = "bfnrt\"\\";
@@ -121,7 +121,7 @@ PropertyValue integerValue(std::uint64_t integer) {
              : PropertyValue(integer);
 }
 
-/// A dictionary that was read, or the value that it stands for.
+/// The dictionary, or the value that an object of one tagged entry means.
 std::optional<PropertyValue> untagged(PropertyDict dict, std::string& error) {
   if (dict.size() != 1) {
     return dict;
@@ -129,8 +129,7 @@ std::optional<PropertyValue> untagged(PropertyDict dict, std::string& error) {
   const auto& [name, content] = *dict.begin();
   if (const Number* number = content.number(); number != nullptr && name == "float") {
     const double real = number->asDouble();
-    // The fewest digits of the largest float are a little more than it; from halfway to the next
-    // power of two on a number would not round to it any more.
+    // The shortest text of the largest float is slightly above it, but rounds to it up to here.
     constexpr double kBeyond = 0x1.ffffffp127;
     if (!(std::abs(real) < kBeyond)) {
       error = "a \"float\" that single precision cannot hold";
@@ -173,13 +172,13 @@ std::optional<PropertyValue> untagged(PropertyDict dict, std::string& error) {
   return dict;
 }
 
-/// Builds values as the library's parser meets the parts: stricter than the library's own tree, and
-/// with the digits of integers still at hand.
+/// Builds values as the library meets the parts: stricter than the library's own tree, and it sees
+/// the digits of integers.
 class ValueBuilder final : public nlohmann::json_sax<Json> {
  public:
   ValueBuilder(bool plain, std::string& error) : _plain(plain), _error(error) {}
 
-  /// Nothing when a part that is JSON has no value; the first such part is the error.
+  /// Nothing when some part is JSON without a value; the first such part is the error.
   std::optional<PropertyValue> takeResult() {
     if (!_valueError.empty()) {
       _error = std::move(_valueError);
@@ -263,7 +262,7 @@ class ValueBuilder final : public nlohmann::json_sax<Json> {
     std::string name{};
     PropertyDict dict{};
     PropertyArray array{};
-    std::optional<std::string> twice{};  ///< the first of the names that came again
+    std::optional<std::string> twice{};  ///< the first duplicate name in byte order
   };
 
   bool open(bool isObject) {
@@ -274,7 +273,7 @@ class ValueBuilder final : public nlohmann::json_sax<Json> {
     return true;
   }
 
-  /// Goes on, since what is no JSON further down is the error then.
+  /// Goes on: malformed JSON further down takes precedence.
   bool addInvalid(const std::string& why) {
     if (_valueError.empty()) {
       _valueError = placed(why);
@@ -311,7 +310,7 @@ std::optional<PropertyValue> read(std::string_view text, bool plain, std::string
   return Json::sax_parse(text.begin(), text.end(), &builder) ? builder.takeResult() : std::nullopt;
 }
 
-/// Hands a plain value to a builder once more.
+/// Feeds a plain value to a builder again.
 void replay(const PropertyValue& plain, ValueBuilder& builder) {
   if (const PropertyDict* dict = plain.dict()) {
     builder.start_object(dict->size());

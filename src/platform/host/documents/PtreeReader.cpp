@@ -54,7 +54,7 @@ std::optional<Number> parseInteger(std::string_view text) {
   return std::nullopt;
 }
 
-/// Builds the value while expat goes through the document.
+/// Builds the value as expat goes through the document.
 class PtreeParser {
  public:
   /// `visit`, which may be empty, must outlive the object.
@@ -96,7 +96,7 @@ class PtreeParser {
       _fault = {1, kNoPtree};  // UTF-16, which expat would read
     }
     for (bool isLast = false; _fault.line == 0 && !isLast;) {
-      // Expat looks at the whole of an unfinished token again with every piece.
+      // Expat scans an unfinished token anew with every piece.
       const std::string_view piece =
           document.substr(0, std::max(kParsedPiece, _taken - _tokenStart));
       document.remove_prefix(piece.size());
@@ -127,12 +127,12 @@ class PtreeParser {
     void operator()(XML_Parser parser) const { XML_ParserFree(parser); }
   };
 
-  /// Runs a handler; no exception may cross expat's own code.
+  /// No exception may cross expat's own code.
   template <typename Work>
   static void handle(void* self, Work work) {
     PtreeParser& parser = *static_cast<PtreeParser*>(self);
     if (parser._fault.line != 0 || parser._exception) {
-      return;  // expat delivers what belongs to the same token
+      return;  // expat still delivers the rest of the token
     }
     const XML_Parser expat = parser._expat.get();
     parser._tokenStart =
@@ -150,7 +150,7 @@ class PtreeParser {
   }
 
   void takePiece(std::string_view piece, bool isLast) {
-    // Not even for an empty piece is a buffer of 0 bytes to be had.
+    // A buffer of 0 bytes cannot be had.
     void* buffer = XML_GetBuffer(_expat.get(), static_cast<int>(piece.size()) + 1);
     if (buffer == nullptr) {
       throw std::bad_alloc();
@@ -178,7 +178,7 @@ class PtreeParser {
   std::size_t line() const { return XML_GetCurrentLineNumber(_expat.get()) - _linesIntoToken; }
   [[noreturn]] void fail(std::string message) const { throw Fault{line(), std::move(message)}; }
 
-  /// Notes a text that is not what its element says; faults of the grammar go before it.
+  /// Notes a malformed value; faults of the grammar take precedence.
   void failValue(std::size_t line, std::string message) {
     if (_valueFault.line == 0) {
       _valueFault = {line, std::move(message)};
@@ -230,7 +230,7 @@ class PtreeParser {
     }
   }
 
-  /// The element of a name, which must be allowed at this place.
+  /// The element of that name, if it is allowed here.
   Element place(std::string_view name) {
     if (_inText) {
       fail("an element inside <" + std::string(expectedEnd()) + '>');
@@ -358,14 +358,15 @@ class PtreeParser {
       _text += text;
       return;
     }
-    // White space that a reference stands for is longer in the document, more than a line end is.
+    // A character reference to white space is longer in the document than the text; a line end is
+    // one byte longer at most.
     const auto length = static_cast<std::size_t>(XML_GetCurrentByteCount(_expat.get()));
     if (text.find_first_not_of(kWhiteSpace) != std::string_view::npos || length > text.size() + 1) {
       fail(kTextOutside);
     }
   }
 
-  /// Comments, white space outside of the root element and all markup that has no place here.
+  /// Comments, white space outside the root element and forbidden markup.
   void takeOther(std::string_view token) const {
     if (token.starts_with("<!--") || token.find_first_not_of(kWhiteSpace) == token.npos) {
       return;
@@ -391,13 +392,13 @@ class PtreeParser {
     }
   }
 
-  /// Fails with a text for what expat has refused, in the words of ptree documents.
+  /// Explains in the terms of ptree documents why expat refused the input.
   [[noreturn]] void explain(XML_Error error) {
     int offset = 0;
     int size = 0;
     const char* context = XML_GetInputContext(_expat.get(), &offset, &size);
     const std::string_view input(context, context != nullptr ? static_cast<std::size_t>(size) : 0);
-    // Expat points into the token that it cannot read; all before it have been handled.
+    // Expat points into the token that it refuses; it has handled all tokens before.
     const std::size_t faultInToken =
         static_cast<std::size_t>(XML_GetCurrentByteIndex(_expat.get())) - _tokenStart;
     const auto at = static_cast<std::size_t>(offset);

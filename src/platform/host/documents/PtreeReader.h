@@ -11,26 +11,24 @@
 
 namespace vesprun {
 
-/// The longest ptree document that is read, in bytes: 256 MiB.
+/// In bytes: 256 MiB.
 inline constexpr std::size_t kLongestPtree = std::size_t{256} << 20;
 
-/// Reads a ptree document in its XML form. Nothing when the bytes are not one; `error` then says
-/// why, beginning with the line ("line 12: ...").
+/// Reads a ptree document in XML form. Nothing, with "line 12: ..." in `error`, when the bytes are
+/// not one.
 ///
-/// - UTF-8 only, with or without byte order mark and XML declaration; `<ptree version="1.0">` holds
-///   one value, dictionaries and arrays at most 200 deep.
-/// - Comments are skipped wherever XML allows them. DOCTYPE, CDATA sections and processing
-///   instructions are refused.
-/// - `integer`: an optional minus and decimal digits, nothing else, from −2^63 to 2^64−1; a signed
-///   64-bit number when it fits, else an unsigned one.
-/// - `real`: a decimal number that a double can hold, "inf", "-inf" or "nan"; a double.
-/// - `data`: base64, white space ignored. `date`: what `dateText` writes.
+/// - UTF-8, with or without byte order mark and XML declaration. `<ptree version="1.0">` holds one
+///   value, nested at most 200 deep.
+/// - Comments are skipped. DOCTYPE, CDATA sections and processing instructions are refused.
+/// - `integer`: decimal digits, with a minus or without, from −2^63 to 2^64−1; signed if it fits.
+/// - `real`: a decimal number that a double can hold, "inf", "-inf" or "nan".
+/// - `data`: base64, white space ignored. `date`: as `dateText` writes it.
 /// - A repeated key keeps its first place and its last value.
-/// - White space counts in keys and strings, also where there is nothing else; in numbers and dates
-///   it is refused, between elements it is skipped. `true` and `false` are empty.
+/// - White space counts in keys and strings, is refused in numbers and dates, and is skipped
+///   between elements. `true` and `false` are empty.
 ///
-/// The document, its value and the reading together take less than eight times the document's size;
-/// measured with documents of the smallest elements.
+/// Document, value and reading together take less than eight times the document's size, measured
+/// with the smallest elements.
 std::optional<PropertyValue> readPtree(std::string_view bytes, std::string& error);
 
 /// Gets an entry of a dictionary when its value is complete. `keys` lead from the root to it

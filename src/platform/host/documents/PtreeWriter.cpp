@@ -80,9 +80,7 @@ class TreeWriter {
       return fail(kNestedTooDeeply);
     }
     indent();
-    _document += '<';
-    _document += name;
-    _document += empty ? "/>\n" : ">\n";
+    tag("<", name, empty ? "/>\n" : ">\n");
     ++_level;
     return true;
   }
@@ -91,10 +89,12 @@ class TreeWriter {
     --_level;
     if (!empty) {
       indent();
-      _document += "</";
-      _document += name;
-      _document += ">\n";
+      tag("</", name, ">\n");
     }
+  }
+
+  void tag(const char* start, std::string_view name, const char* end) {
+    _document.append(start).append(name).append(end);
   }
 
   void indent() { _document.append(_level, '\t'); }
@@ -104,9 +104,7 @@ class TreeWriter {
       return fail("the " + std::string(name) + ' ' + quotedText(text) +
                   " holds what XML cannot carry");
     }
-    _document += '<';
-    _document += name;
-    _document += '>';
+    tag("<", name, ">");
     while (true) {
       const std::size_t plain = text.find_first_of("&<>\r");
       _document += text.substr(0, plain);
@@ -114,13 +112,11 @@ class TreeWriter {
         break;
       }
       const char c = text[plain];
-      // A reader takes a bare carriage return for a line feed.
+      // XML readers turn a bare carriage return into a line feed.
       _document += c == '&' ? "&amp;" : c == '<' ? "&lt;" : c == '>' ? "&gt;" : "&#13;";
       text.remove_prefix(plain + 1);
     }
-    _document += "</";
-    _document += name;
-    _document += ">\n";
+    tag("</", name, ">\n");
     return true;
   }
 
@@ -132,20 +128,16 @@ class TreeWriter {
     if (number.isFloatingPoint()) {
       name = "real";
       const double real = number.asDouble();
-      // The sign of a NaN says nothing.
+      // A NaN's sign means nothing.
       last = std::to_chars(text, end, std::isnan(real) ? std::abs(real) : real).ptr;
     } else if (number.isSigned()) {
       last = std::to_chars(text, end, number.asInt64()).ptr;
     } else {
       last = std::to_chars(text, end, number.asUInt64()).ptr;
     }
-    _document += '<';
-    _document += name;
-    _document += '>';
+    tag("<", name, ">");
     _document.append(text, last);
-    _document += "</";
-    _document += name;
-    _document += ">\n";
+    tag("</", name, ">\n");
   }
 
   bool writeDate(const Date& date) {

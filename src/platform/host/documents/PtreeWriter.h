@@ -6,14 +6,13 @@
 
 namespace vesprun {
 
-/// Appends the ptree document of a value to `document`: UTF-8, one tab for each level, entries in
-/// their order. `readPtree` reads back an equal value, except that it cannot tell the widths of
-/// integers; a single-precision float is written with the digits of the double of equal value.
+/// Appends the ptree document of a value: UTF-8, one tab for each level, entries in order.
+/// `readPtree` reads back an equal value, without the widths of integers and floats.
 ///
-/// False when the document could not carry the value: a key or string that is not UTF-8 or holds
-/// a character that XML 1.0 excludes, a date outside the years that date texts can have, or
-/// containers nested deeper than 200. `error` then names the place by its keys and array indices
-/// ("\"outer\" > [2] > \"name\": ...", eight of them at most), and `document` is what it was.
+/// False when the document cannot carry the value: a key or string that is not UTF-8 or holds a
+/// character that XML 1.0 excludes, a date beyond the years of date texts, or more than 200 nested
+/// containers. `error` then names the place ("\"outer\" > [2] > \"name\": ..."), and `document` is
+/// unchanged.
 bool writePtree(const PropertyValue& value, std::string& document, std::string& error);
 bool writePtree(const PropertyDict& dict, std::string& document, std::string& error);
 

@@ -14,7 +14,7 @@ std::optional<double> parseReal(std::string_view text) {
   if (text == "nan") {
     return std::numeric_limits<double>::quiet_NaN();
   }
-  // from_chars also knows names of its own ("infinity", "nan(...)").
+  // from_chars would also accept names such as "infinity" and "nan(...)".
   if (text.find_first_not_of("0123456789.eE+-") != std::string_view::npos) {
     return std::nullopt;
   }

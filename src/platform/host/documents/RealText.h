@@ -5,8 +5,8 @@
 
 namespace vesprun {
 
-/// The double that a whole text says: a decimal number, with an exponent or without, "inf", "-inf"
-/// or "nan". Nothing for any other text and for what a double cannot hold.
+/// The double that the whole text denotes: a decimal number, "inf", "-inf" or "nan". Nothing for
+/// anything else or when a double cannot hold it.
 std::optional<double> parseReal(std::string_view text);
 
 }  // namespace vesprun

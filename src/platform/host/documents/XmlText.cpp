@@ -14,7 +14,7 @@ std::size_t xmlCharacterLength(std::string_view text) {
     return isXmlCharacter(lead) ? 1 : 0;
   }
   const std::size_t length = lead >= 0xF0 ? 4 : lead >= 0xE0 ? 3 : 2;
-  // C0 and C1 could only begin overlong forms, F5 and above only what is no Unicode.
+  // C0 and C1 begin only overlong forms, F5 and above lie beyond Unicode.
   if (lead < 0xC2 || lead > 0xF4 || text.size() < length) {
     return 0;
   }

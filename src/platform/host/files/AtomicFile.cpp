@@ -19,10 +19,6 @@ constexpr mode_t kOwnerOnly = 0600;
 constexpr std::size_t kWrittenPiece = 64 * 1024;
 constexpr int kMostUnfinished = 100;
 
-FileDescriptor openFolder(const std::string& folder) {
-  return FileDescriptor(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-}
-
 }  // namespace
 
 AtomicFile::AtomicFile(std::string folder, FileDescriptor folderDescriptor)
@@ -52,7 +48,7 @@ std::optional<AtomicFile> AtomicFile::create(const std::string& folder, std::str
   if (!file.openUnfinished(error)) {
     return std::nullopt;
   }
-  if (fchmod(file._file.get(), kOwnerOnly) != 0) {  // whatever the process's file mode mask says
+  if (fchmod(file._file.get(), kOwnerOnly) != 0) {  // whatever the umask
     error = systemError(folder);
     return std::nullopt;
   }
@@ -68,8 +64,8 @@ bool AtomicFile::openUnfinished(std::string& error) {
       error = systemError(pathOf(name));
       return false;
     }
-    // Its writer holds the lock while it lives; what a killed one left is written over. The name
-    // may have gone to another file while this one was being opened.
+    // Its writer holds the lock while it lives; a file without one is left from a kill and
+    // overwritten. Between open and lock the name may have gone to another file.
     struct stat opened {};
     struct stat named {};
     if (flock(file.get(), LOCK_EX | LOCK_NB) != 0 || fstat(file.get(), &opened) != 0 ||
@@ -77,7 +73,7 @@ bool AtomicFile::openUnfinished(std::string& error) {
         opened.st_ino != named.st_ino) {
       continue;
     }
-    if (opened.st_nlink != 1) {  // killed after the document got its name: that one is finished
+    if (opened.st_nlink != 1) {  // killed after the document got its name
       unlinkat(_folderDescriptor.get(), name.c_str(), 0);
       continue;
     }
@@ -160,7 +156,7 @@ AtomicFile::Added AtomicFile::addNew(const std::string& name, std::string& error
   if (!makeDurable(name, error)) {
     return Added::Failed;
   }
-  // Not renamed, which would replace a file of that name.
+  // Linked: a rename would replace a file of that name.
   const int folder = _folderDescriptor.get();
   if (linkat(folder, _unfinishedName.c_str(), folder, name.c_str(), 0) != 0) {
     if (errno == EEXIST) {

@@ -9,38 +9,34 @@
 
 namespace vesprun {
 
-/// A whole document on its way into a folder, written under the name ".unfinished-N". It appears
-/// under its own name complete and durable, or not at all. What a process that was killed left
-/// behind is written over by a later document.
+/// A document on its way into a folder as ".unfinished-N". It appears under its own name complete
+/// and durable, or not at all; destroying the object first drops it. A later document overwrites
+/// what a killed process left.
 ///
-/// Files are readable and writable for their owner alone. Dropping the object before it got a name
-/// drops the document. Error texts name the path and the cause.
+/// Files are readable and writable for their owner alone. Errors name the path and the cause.
 class AtomicFile {
  public:
-  /// Starts an empty document in an existing folder.
+  /// The folder must exist.
   static std::optional<AtomicFile> create(const std::string& folder, std::string& error);
 
   AtomicFile(AtomicFile&& other) noexcept;
   AtomicFile& operator=(AtomicFile&&) = delete;
   ~AtomicFile();
 
-  /// Appends the bytes. False when they cannot be written; the document can then no longer get a
-  /// name, and `replace` and `addNew` repeat the reason.
+  /// False when the bytes cannot be written; `replace` and `addNew` then fail with the same reason.
   bool append(std::string_view bytes);
 
-  /// Gives the document this modification time, where the file system can keep it, instead of the
-  /// moment of its last byte.
+  /// Instead of the moment of the last byte, where the file system can keep it.
   void setModificationTime(const Date& time) { _modified = time; }
 
-  /// Gives the document its name in the folder, in place of the file that has it. False, with a
-  /// text in `error`, when that failed: the earlier file is still there, unless only making the new
-  /// name durable failed.
+  /// Gives the document its name, replacing the file that has it. On failure the earlier file is
+  /// still there, unless only making the new name durable failed.
   bool replace(const std::string& name, std::string& error);
 
   enum class Added { Done, NameTaken, Failed };
 
-  /// Gives the document a name that no file has yet. After `NameTaken` another name can be tried;
-  /// only `Failed` sets `error`.
+  /// Gives the document a name that is free. After `NameTaken` try another; only `Failed` sets
+  /// `error`.
   Added addNew(const std::string& name, std::string& error);
 
  private:
@@ -55,13 +51,13 @@ class AtomicFile {
   std::string _folder;
   FileDescriptor _folderDescriptor;
   FileDescriptor _file;
-  std::string _unfinishedName;  ///< empty when the document has its own name
-  std::string _pending;         ///< bytes not handed to the kernel yet
-  std::string _failure;         ///< the first reason why an `append` failed
+  std::string _unfinishedName;  ///< empty after the document got its own name
+  std::string _pending;         ///< not yet written
+  std::string _failure;         ///< the first failure of `append`
   std::optional<Date> _modified;
 };
 
-/// Writes a whole document in place of the file at `path`, as `AtomicFile` does.
+/// Replaces the file at `path` with a whole document.
 bool replaceFile(const std::string& path, std::string_view content, std::string& error);
 
 /// Makes durable which names a folder has.

@@ -1,7 +1,9 @@
 #pragma once
 
+#include <fcntl.h>
 #include <unistd.h>
 
+#include <string>
 #include <utility>
 
 namespace vesprun {
@@ -29,5 +31,9 @@ class FileDescriptor {
  private:
   int _descriptor = -1;
 };
+
+inline FileDescriptor openFolder(const std::string& path) {
+  return FileDescriptor(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+}
 
 }  // namespace vesprun

@@ -1,6 +1,5 @@
 #include "platform/host/files/FileLock.h"
 
-#include <fcntl.h>
 #include <sys/file.h>
 
 #include <cerrno>
@@ -33,7 +32,7 @@ bool takeLock(int descriptor, int operation, std::chrono::milliseconds longestWa
 
 std::optional<FolderLock> FolderLock::take(const std::string& folder, std::string& error, Kind kind,
                                            std::chrono::milliseconds longestWait, bool* busy) {
-  FileDescriptor descriptor(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+  FileDescriptor descriptor = openFolder(folder);
   if (!descriptor.isOpen()) {
     error = systemError(folder);
     return std::nullopt;

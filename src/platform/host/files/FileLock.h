@@ -9,24 +9,22 @@
 
 namespace vesprun {
 
-/// How long a lock of another process is waited for: long enough for any of ours that is running,
-/// not for one that is stopped.
+/// How long to wait for another process's lock: longer than any of ours works, but not for one that
+/// is stopped.
 inline constexpr std::chrono::milliseconds kLongestLockWait(20'000);
 
 /// Takes the lock (LOCK_SH or LOCK_EX) of the open file or folder at `path`, waiting `longestWait`
-/// at most. False, with a text in `error` that names the path, when it cannot be had. `busy`, when
-/// given, becomes true if that is because of another holder.
+/// at most. On failure `error` names the path; `busy`, if given, becomes true when another holder
+/// is the reason.
 bool takeLock(int descriptor, int operation, std::chrono::milliseconds longestWait,
               const std::string& path, std::string& error, bool* busy = nullptr);
 
-/// Keeps other processes, and other holders in this one, from replacing files in a folder.
+/// Keeps other holders, in this process and others, from replacing files in a folder.
 class FolderLock {
  public:
   enum class Kind { Shared, Exclusive };
 
-  /// Waits for the lock and holds it as long as the object lives. Nothing, with a text in `error`
-  /// that names the folder, when it cannot be had. `busy`, when given, becomes true if that is
-  /// because of another holder.
+  /// Holds the lock as long as the object lives. Nothing on failure, as `takeLock` reports it.
   static std::optional<FolderLock> take(const std::string& folder, std::string& error,
                                         Kind kind = Kind::Exclusive,
                                         std::chrono::milliseconds longestWait = kLongestLockWait,

@@ -11,7 +11,7 @@
 
 namespace vesprun {
 
-// Without the standard library's iterator, which ends the process when memory runs out.
+// The standard library's iterator ends the process when memory runs out.
 std::optional<std::vector<std::string>> namesInFolder(const std::string& folder,
                                                       std::string& error) {
   struct Close {

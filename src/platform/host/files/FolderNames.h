@@ -6,8 +6,8 @@
 
 namespace vesprun {
 
-/// The names in a folder, sorted by their bytes; none in one that is not there. Nothing, with a
-/// text in `error` that names the folder and the cause, when it cannot be read to its end.
+/// The names in a folder, sorted by bytes; none when it does not exist. Nothing, with the cause in
+/// `error`, when it cannot be read to its end.
 std::optional<std::vector<std::string>> namesInFolder(const std::string& folder,
                                                       std::string& error);
 

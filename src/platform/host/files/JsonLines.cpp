@@ -19,8 +19,8 @@
 namespace vesprun {
 
 bool JsonLines::open(std::string& error, int creating) {
-  // Reading, to see how the last line ends; not blocking, in case it is no file. A link could lead
-  // the lines out of the device.
+  // Opened for reading as well, to see how the last line ends, and without blocking, in case of a
+  // pipe. A link could lead out of the device.
   FileDescriptor file(::open(
       _path.c_str(), O_RDWR | O_APPEND | O_CLOEXEC | O_NONBLOCK | O_NOFOLLOW | creating, 0600));
   struct stat status {};

@@ -13,19 +13,18 @@
 
 namespace vesprun {
 
-/// Appends lines to a file that several processes and threads may append to at once. Each line is
-/// one write, so that lines never mix. The file is made with its first line and stays open. It is
-/// for its owner alone, also when it was not before, and nothing but a regular file.
+/// Appends lines to a file that several processes and threads share. Each line is one write, so
+/// lines never mix. The file is created with its first line, stays open, must be a regular file,
+/// and becomes its owner's alone.
 class JsonLines {
  public:
-  /// What another process has locked is waited for, `longestWait` at most; after one wait in vain,
-  /// not until a line could be appended again.
+  /// Waits `longestWait` at most for another process's lock; after one wait in vain, no longer at
+  /// all until a line could be appended.
   explicit JsonLines(std::string path, std::chrono::milliseconds longestWait = kLongestLockWait)
       : _path(std::move(path)), _longestWait(longestWait), _wait(longestWait) {}
 
-  /// Appends `line`, which holds no line feed, and ends it. A line of which only a part could be
-  /// written is taken back; a part that was left by someone else is ended first, so that it spoils
-  /// no other line. False, with a text in `error` that names the file, when the line is not there.
+  /// Appends `line`, which holds no line feed. A partly written line is taken back; a torn line of
+  /// someone else is ended first. False, with the file in `error`, when the line is not there.
   bool append(std::string_view line, std::string& error);
 
   /// Makes what was appended durable.
@@ -47,7 +46,7 @@ class JsonLines {
   std::string _path;
   std::chrono::milliseconds _longestWait;
   std::chrono::milliseconds _wait;
-  std::mutex _mutex;  ///< the file's lock does not hold back the threads that share it
+  std::mutex _mutex;  ///< threads share the file's lock
   FileDescriptor _file;
 };
 

@@ -8,7 +8,7 @@
 
 namespace vesprun {
 
-/// "PATH.WHY-20240305T091502Z": the name under which a file that cannot be used is kept.
+/// "PATH.WHY-20240305T091502Z": where a file that cannot be used is kept.
 inline std::string nameAside(const std::string& path, std::string_view why, Clock& clock) {
   std::string time = dateText({clock.now().seconds, 0});
   std::erase_if(time, [](char c) { return c == '-' || c == ':'; });

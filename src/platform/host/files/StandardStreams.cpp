@@ -32,7 +32,7 @@ void terminate() {
 void holdStandardStreams() {
   for (int stream = STDIN_FILENO; stream <= STDERR_FILENO; ++stream) {
     if (fcntl(stream, F_GETFD) == -1) {
-      // The lowest free number is taken: the streams below are there already.
+      // open() takes the lowest free number, which is this stream's.
       static_cast<void>(open("/dev/null", stream == STDIN_FILENO ? O_WRONLY : O_RDONLY));
     }
   }

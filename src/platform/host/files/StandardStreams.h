@@ -2,13 +2,12 @@
 
 namespace vesprun {
 
-/// Takes the place of each standard stream that the process was started without, so that no file of
-/// the device gets it and with it all that is printed. Using the stream fails as if it were closed.
-/// To be called before anything is opened.
+/// Occupies each standard stream that is closed, so that no file of the device gets its number and
+/// all that is printed. Using the stream still fails. Call before anything is opened.
 void holdStandardStreams();
 
-/// From now on, memory that runs out where no exception may leave, such as in a destructor, ends
-/// the process with `status` and one line on standard error. `program` stays for ever.
+/// When memory runs out where no exception may leave, such as in a destructor, the process ends
+/// with `status` and a line on standard error. `program` must live on.
 void exitWithoutMemory(const char* program, int status);
 
 }  // namespace vesprun

@@ -12,7 +12,7 @@
 namespace vesprun {
 namespace {
 
-/// Reads until the end of the file; a file that shrinks or grows meanwhile gives what was there.
+/// A file that shrinks or grows meanwhile gives what was there.
 bool readAll(int file, std::string& content) {
   std::size_t length = 0;
   for (;;) {
@@ -35,7 +35,7 @@ bool readAll(int file, std::string& content) {
 
 std::optional<std::string> readWholeFile(const std::string& path, std::string& error,
                                          bool* missing) {
-  // A pipe or device under the name must not stop the reader for ever.
+  // A pipe or device must not block the reader.
   const FileDescriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
   struct stat status {};
   std::optional<std::string> content;

@@ -5,9 +5,8 @@
 
 namespace vesprun {
 
-/// The whole content of a regular file. Nothing, with a text in `error` that names the file and the
-/// cause, when it cannot be read. `missing`, when given, tells whether the cause is that there is
-/// no such file.
+/// The content of a regular file. Nothing, with the cause in `error`, when it cannot be read;
+/// `missing`, if given, tells whether it does not exist.
 std::optional<std::string> readWholeFile(const std::string& path, std::string& error,
                                          bool* missing = nullptr);
 

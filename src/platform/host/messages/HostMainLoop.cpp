@@ -64,14 +64,14 @@ void HostMainLoop::waitForReadiness(double seconds) {
   const timespec timeout = timespecOf(seconds);
   const int ready = ppoll(descriptors.data(), descriptors.size(), &timeout, nullptr);
   if (ready < 0 && errno != EINTR) {
-    // Out of memory, say: without a pause the loop would spin until it passes.
+    // For instance out of memory: a pause keeps the loop from spinning.
     std::this_thread::sleep_for(Seconds(std::min(seconds, kPauseAfterFailure)));
   }
   if (ready <= 0) {
     return;
   }
   for (const pollfd& descriptor : descriptors) {
-    // What was called before may have ended this watch.
+    // An earlier call may have ended this watch.
     const auto watched = _watched.find(descriptor.fd);
     if (descriptor.revents != 0 && watched != _watched.end()) {
       const Work whenReady = watched->second;  // a copy: it may end its own watch

@@ -9,27 +9,25 @@
 namespace vesprun {
 
 /// The main thread's event loop: a queue of work, and file descriptors whose readiness leads to
-/// more work. Everything here happens on the thread that runs the loop.
+/// more.
 ///
-/// An event is one piece of queued work, such as the delivery of a message. Readiness alone is
-/// none: a peer that sends bytes which never become a message does not prolong a slice. Time is
-/// measured by the monotonic clock, and the thread sleeps while there is nothing to do.
+/// An event is one piece of queued work, such as a message's delivery. Readiness alone does not
+/// count: bytes that never become a message do not prolong a slice.
 class HostMainLoop final : public MainLoop {
  public:
   using Work = std::function<void()>;
 
-  /// A number of seconds that is not above 0, or is none, looks once at what is ready already.
+  /// With 0, a negative number or NaN, looks once at what is ready.
   SliceResult runMainLoopSlice(double seconds) override;
 
-  /// Queues work; each slice does one piece, in the order in which they were queued.
+  /// Each slice does one piece, in order.
   void queueWork(Work work) { _queue.push_back(std::move(work)); }
 
-  /// Calls `whenReady` during slices whenever `descriptor` has something to read, has been hung up
-  /// or has failed. It must not block; it may watch and unwatch any descriptor, also its own.
-  /// Watching a descriptor again replaces what is called.
+  /// Calls `whenReady` during slices while `descriptor` is readable, hung up or failed. It must not
+  /// block and may watch and unwatch any descriptor. Watching again replaces the call.
   void watch(int descriptor, Work whenReady);
 
-  /// Ends the watch; must come before the descriptor is closed.
+  /// Call before the descriptor is closed.
   void unwatch(int descriptor);
 
  private:

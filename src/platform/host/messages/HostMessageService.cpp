@@ -19,39 +19,25 @@ namespace {
 constexpr std::size_t kMostPeers = 16;
 constexpr std::size_t kReceivedPiece = 64 * 1024;
 
-class UnixPeer final : public PeerConnection {
- public:
-  explicit UnixPeer(FileDescriptor socket) : _socket(std::move(socket)) {}
+struct UnixPeer final : PeerConnection {
+  explicit UnixPeer(FileDescriptor descriptor) : socket(std::move(descriptor)) {}
 
-  void setMessageHandler(MessageHandler handler) override { _handler = std::move(handler); }
-  void start() override { _started = true; }
+  void setMessageHandler(MessageHandler messageHandler) override {
+    handler = std::move(messageHandler);
+  }
+  void start() override { isStarted = true; }
 
-  void noteHeard() { _lastHeard = std::chrono::steady_clock::now(); }
-  void noteMessage() { _hasSentMessage = true; }
-
-  /// Whether this one makes room before `other` does: first those that have sent no whole message,
-  /// then those that came or last sent anything longer ago.
+  /// Less worth: first a peer that has sent no whole message, then the one silent longest.
   bool isLessWorth(const UnixPeer& other) const {
-    return std::pair(_hasSentMessage, _lastHeard) <
-           std::pair(other._hasSentMessage, other._lastHeard);
+    return std::pair(hasSentMessage, lastHeard) < std::pair(other.hasSentMessage, other.lastHeard);
   }
 
-  int descriptor() const { return _socket.get(); }
-  bool isStarted() const { return _started; }
-  MessageAssembler& assembler() { return _assembler; }
-  void deliver(const PropertyValue& message) const {
-    if (_handler) {
-      _handler(message);
-    }
-  }
-
- private:
-  FileDescriptor _socket;
-  MessageHandler _handler;
-  MessageAssembler _assembler;
-  std::chrono::steady_clock::time_point _lastHeard = std::chrono::steady_clock::now();
-  bool _hasSentMessage = false;
-  bool _started = false;
+  FileDescriptor socket;
+  MessageHandler handler;
+  MessageAssembler assembler;
+  std::chrono::steady_clock::time_point lastHeard = std::chrono::steady_clock::now();
+  bool hasSentMessage = false;
+  bool isStarted = false;
 };
 
 class UnixServiceListener final : public ServiceListener {
@@ -81,7 +67,7 @@ class UnixServiceListener final : public ServiceListener {
  private:
   using PeerPointer = std::shared_ptr<UnixPeer>;
 
-  /// Queues work that is dropped if the listener is gone by then.
+  /// Drops the work if the listener is gone by then.
   void queueWork(HostMainLoop::Work work) {
     _mainLoop.queueWork([alive = std::weak_ptr<bool>(_alive), work = std::move(work)] {
       if (!alive.expired()) {
@@ -101,7 +87,7 @@ class UnixServiceListener final : public ServiceListener {
     FileDescriptor socket = _socket.accept(error);
     if (!error.empty()) {
       tell("no peer can be accepted: " + error);
-      // It would fail again at once; the next peer that goes makes room.
+      // It would fail again at once, until another peer goes.
       _mainLoop.unwatch(_socket.descriptor());
     }
     if (!socket.isOpen()) {
@@ -119,7 +105,7 @@ class UnixServiceListener final : public ServiceListener {
       drop(*PeerPointer(least->second), "others wait, and it has been silent longest");
     }
     const auto peer = std::make_shared<UnixPeer>(std::move(socket));
-    _peers.emplace(peer->descriptor(), peer);
+    _peers.emplace(peer->socket.get(), peer);
     queueWork([this, peer] { introduce(peer); });
   }
 
@@ -127,23 +113,23 @@ class UnixServiceListener final : public ServiceListener {
     if (_handler) {
       _handler(*peer);
     }
-    if (peer->isStarted()) {
-      _mainLoop.watch(peer->descriptor(), [this, peer] { receive(peer); });
+    if (peer->isStarted) {
+      _mainLoop.watch(peer->socket.get(), [this, peer] { receive(peer); });
     } else {
       drop(*peer, "");
     }
   }
 
   void receive(const PeerPointer& peer) {
-    const ssize_t count = recv(peer->descriptor(), _piece.data(), _piece.size(), MSG_DONTWAIT);
+    const ssize_t count = recv(peer->socket.get(), _piece.data(), _piece.size(), MSG_DONTWAIT);
     if (count < 0) {
       if (errno != EAGAIN && errno != EINTR) {
         drop(*peer, std::strerror(errno));
       }
       return;
     }
-    peer->noteHeard();
-    MessageAssembler& assembler = peer->assembler();
+    peer->lastHeard = std::chrono::steady_clock::now();
+    MessageAssembler& assembler = peer->assembler;
     if (count == 0) {
       drop(*peer, assembler.isInsideMessage() ? "it ended in the middle of a message" : "");
       return;
@@ -157,8 +143,12 @@ class UnixServiceListener final : public ServiceListener {
         drop(*peer, error);
         return;
       }
-      peer->noteMessage();
-      queueWork([peer, message = *std::move(message)] { peer->deliver(message); });
+      peer->hasSentMessage = true;
+      queueWork([peer, message = *std::move(message)] {
+        if (peer->handler) {
+          peer->handler(message);
+        }
+      });
     }
     if (progress == MessageAssembler::Progress::TooLong) {
       drop(*peer, "a message is longer than " + std::to_string(kLongestMessage) + " bytes");
@@ -169,8 +159,8 @@ class UnixServiceListener final : public ServiceListener {
     if (!why.empty()) {
       tell("a peer is dropped: " + std::string(why));
     }
-    const int descriptor = peer.descriptor();
-    // Its queued messages may keep the object for a while; the connection ends now.
+    const int descriptor = peer.socket.get();
+    // Queued messages may keep the object for a while; end the connection now.
     shutdown(descriptor, SHUT_RDWR);
     _mainLoop.unwatch(descriptor);
     _peers.erase(descriptor);

@@ -9,25 +9,22 @@
 namespace vesprun {
 
 /// Named message services over Unix stream sockets, `run/NAME` in the device directory. A message
-/// is a 32-bit little-endian length and that many bytes of a ptree document; nothing is ever sent
-/// back.
+/// is a 32-bit little-endian length and a ptree document of that many bytes; nothing is sent back.
 ///
-/// A new peer is one event of the main loop, and so is each message. A peer that is another user
-/// (unless that is root), sends what is no message, or ends in the middle of one loses its
-/// connection, and the system log says why. At most 16 peers are served at a time; one more takes
-/// the place of one that has sent no whole message, or else of any: the one that has been silent
-/// longest. A message that arrived whole is delivered
-/// even if its peer is gone by then.
+/// A new peer is an event of the main loop, and so is each message. A peer of another user (except
+/// root), one that sends anything else and one that ends inside a message is disconnected, with the
+/// reason in the system log. With 16 peers, a further one takes the place of one without a whole
+/// message, or else of any: the one silent longest. A whole message is delivered even if its peer
+/// is gone.
 ///
-/// All references must outlive the listeners, and a listener must not be destroyed by one of its
-/// own handlers.
+/// Listeners must not outlive the references, nor be destroyed by one of their own handlers.
 class HostMessageService final : public MessageService {
  public:
   HostMessageService(const DeviceDirectory& directory, PtreeSerialization& serialization,
                      SystemLog& log, HostMainLoop& mainLoop)
       : _directory(directory), _serialization(serialization), _log(log), _mainLoop(mainLoop) {}
 
-  /// A device has one service at a time: see `ServiceSocket`.
+  /// One at a time for a device: see `ServiceSocket`.
   std::unique_ptr<ServiceListener> createListener(std::string_view name) override;
 
  private:

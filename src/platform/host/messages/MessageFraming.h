@@ -9,27 +9,27 @@
 
 namespace vesprun {
 
-/// The longest document that a message may carry, in bytes.
+/// The longest document of a message, in bytes.
 inline constexpr std::uint32_t kLongestMessage = 16 * 1024 * 1024;
 
-/// A message on the wire: the length of the document as a 32-bit little-endian number, then the
-/// document. Nothing when the document is longer than a message may be.
+/// A message on the wire: the document's length as a 32-bit little-endian number, then the
+/// document. Nothing when it is too long.
 std::optional<std::string> messageFrame(std::string_view document);
 
-/// Puts the messages of one peer together from the bytes that arrive, in whatever pieces. Memory
-/// grows with the bytes that have come, not with the length that was announced.
+/// Assembles the messages of a peer from bytes in any pieces. Memory grows with the bytes that
+/// came, not with the announced length.
 class MessageAssembler {
  public:
   enum class Progress { Complete, Incomplete, TooLong };
 
-  /// Takes bytes off the front of `bytes` until a message is complete or there are none left. After
-  /// `TooLong`, which an announced length is as soon as it is known, nothing more can be taken.
+  /// Takes bytes off the front until a message is complete or none are left. `TooLong`, known from
+  /// the announced length, is final.
   Progress take(std::string_view& bytes);
 
-  /// The document of the message that has just become complete; the next one begins.
+  /// The document of the message just completed; the next one begins.
   std::string takeDocument();
 
-  /// True when a part of a message is here and the rest is not.
+  /// True after a part of a message.
   bool isInsideMessage() const { return _lengthBytes != 0; }
 
  private:

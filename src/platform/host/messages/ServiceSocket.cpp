@@ -21,12 +21,7 @@ constexpr const char* kFolder = "run";
 constexpr int kWaitingPeers = 16;
 constexpr mode_t kOwnerOnly = 0600;
 
-FileDescriptor openFolder(const std::string& path) {
-  return FileDescriptor(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-}
-
-/// The address of a socket file. A path that is too long for one is replaced by a way through the
-/// open folder.
+/// A path too long for an address goes through the open folder.
 std::optional<sockaddr_un> addressOf(const std::string& path, int folder, const std::string& name) {
   sockaddr_un address{};
   address.sun_family = AF_UNIX;
@@ -50,7 +45,7 @@ bool removeDeadSocket(int folder, const std::string& name) {
   if (fstatat(folder, name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) {
     return errno == ENOENT;
   }
-  // Anything but a socket is not ours to remove, and stands in the way.
+  // Leave anything else alone; binding then fails.
   return !S_ISSOCK(status.st_mode) || unlinkat(folder, name.c_str(), 0) == 0;
 }
 
@@ -83,7 +78,7 @@ std::optional<ServiceSocket> ServiceSocket::listen(const DeviceDirectory& direct
   }
   const std::optional<sockaddr_un> address = addressOf(path, folder, service._name);
   struct stat status {};
-  // Nobody can connect before the socket listens, and by then only its owner may.
+  // Nobody can connect before the socket listens; by then only its owner may.
   if (!address || !removeDeadSocket(folder, service._name) ||
       bind(socket, generic(*address), sizeof *address) != 0 ||
       fstatat(folder, service._name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) {

@@ -11,16 +11,15 @@
 
 namespace vesprun {
 
-/// The listening socket of a named service: `run/NAME` in the device directory, for its owner
-/// alone. The file is removed at the end, if it is still this socket's.
+/// The listening socket of a named service, `run/NAME`, for its owner alone; removed at the end if
+/// it is still ours.
 ///
-/// The process that offers a service holds the lock of the folder `run` for as long, so that two
-/// that start at once cannot take the name from each other, and a file that a killed process left
-/// behind is known to be dead. A device therefore has one service at a time.
+/// The process holds the lock of the folder `run`, so that two cannot take the name from each
+/// other, and a file without a holder is left from a kill. A device therefore has one service at a
+/// time.
 class ServiceSocket {
  public:
-  /// Listens. Nothing, with a text in `error`, when another holder offers a service or the socket
-  /// cannot be made.
+  /// Nothing, with a text in `error`, when another process offers a service or the socket fails.
   static std::optional<ServiceSocket> listen(const DeviceDirectory& directory,
                                              std::string_view name, std::string& error);
 
@@ -30,8 +29,8 @@ class ServiceSocket {
 
   int descriptor() const { return _socket.get(); }
 
-  /// The next waiting peer, its socket non-blocking. Closed when there is none, when it went away
-  /// meanwhile (`error` stays as it is), and when it cannot be accepted (`error` says why).
+  /// The next waiting peer, non-blocking. Closed when none waits (or it has gone), and with a text
+  /// in `error` when it cannot be accepted.
   FileDescriptor accept(std::string& error) const;
 
  private:
@@ -44,13 +43,12 @@ class ServiceSocket {
   ino_t _file = 0;
 };
 
-/// Connects to a service of the device; the socket blocks, but no step for longer than
-/// `patienceInSeconds`. Closed, with a text in `error`, when nobody offers the service.
+/// Connects to a service of the device; the socket blocks, `patienceInSeconds` at most in each
+/// step. Closed, with a text in `error`, when nobody offers the service.
 FileDescriptor connectToService(const DeviceDirectory& directory, std::string_view name,
                                 int patienceInSeconds, std::string& error);
 
-/// True when the other end of a connection is the superuser or runs as the same user as this
-/// process.
+/// True when the other end runs as this process's user or as root.
 bool peerIsTrusted(int descriptor);
 
 }  // namespace vesprun

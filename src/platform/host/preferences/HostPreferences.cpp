@@ -2,6 +2,7 @@
 
 #include <utility>
 
+#include "platform/Guarded.h"
 #include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {

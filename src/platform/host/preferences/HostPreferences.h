@@ -18,28 +18,27 @@
 
 namespace vesprun {
 
-/// A folder of the device that holds one ptree document for each domain.
+/// A device folder with a ptree document for each domain.
 struct PreferenceFolder {
   std::string path;
 };
 
-/// Preferences kept as ptree documents, one for each domain, in one folder of the device; see
-/// `PreferenceFile` for what becomes of a document that cannot be read. May be called from any
-/// thread.
+/// Preferences as ptree documents, one for each domain, in a device folder; `PreferenceFile`
+/// handles those that cannot be read. Safe from any thread.
 ///
-/// The names of users and domains are parts of paths: an empty one, one that begins with a dot and
-/// one with a slash or NUL in it are refused with an error in the system log. There is then no
-/// value, and nothing can be written. A refused domain is told once.
+/// Users and domains become parts of paths: empty names and names with a leading dot, a slash or
+/// NUL are refused with an error in the system log (once for a domain), read as empty and never
+/// written.
 class HostPreferences final : public Preferences {
  public:
-  /// The preferences of a user: var/USER/Library/Preferences. What the references name must outlive
-  /// the object; the log must stand being written to by several threads. While another process
-  /// changes something in the folder, `LGSPreferencesSynchronize` waits for `longestWait` at most.
+  /// The preferences of a user in var/USER/Library/Preferences. The references must outlive the
+  /// object; the log is written from several threads. `LGSPreferencesSynchronize` waits
+  /// `longestWait` at most for another process's change in the folder.
   HostPreferences(const DeviceDirectory& device, Clock& clock, SystemLog& log,
                   std::string_view user = "mobile",
                   std::chrono::milliseconds longestWait = kLongestLockWait);
 
-  /// Those of another folder, such as Library/Logsmith.
+  /// Those in another folder, such as Library/Logsmith.
   HostPreferences(const DeviceDirectory& device, Clock& clock, SystemLog& log,
                   PreferenceFolder folder);
 
@@ -53,11 +52,10 @@ class HostPreferences final : public Preferences {
                                                       std::string_view domain) override;
   void LGSPreferencesSetValue(std::optional<std::string_view> key,
                               std::optional<PropertyValue> value, std::string_view domain) override;
-  /// When nothing changed, nothing is written; what was read is let go, so that the next look-up
-  /// sees what others wrote.
+  /// Writes only changes, and forgets what was read, so that the next look-up sees what others
+  /// wrote.
   bool LGSPreferencesSynchronize(std::string_view domain) override;
 
-  /// Every value of a domain.
   PropertyDict valuesOfDomain(std::string_view domain);
 
  private:
@@ -66,7 +64,7 @@ class HostPreferences final : public Preferences {
   const DeviceDirectory& _device;
   Clock& _clock;
   SystemLog& _log;
-  std::string _folder;  ///< empty when the user's name was refused
+  std::string _folder;  ///< empty for a refused user
   std::chrono::milliseconds _longestWait = kLongestLockWait;
   std::mutex _mutex;
   std::map<std::string, PreferenceFile, std::less<>> _files;

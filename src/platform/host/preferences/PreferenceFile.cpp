@@ -23,8 +23,7 @@ PreferenceFile::PreferenceFile(const DeviceDirectory& device, Clock& clock, Syst
       _clock(clock),
       _log(log),
       _folder(std::move(folder)),
-      _name(std::string(domain) + ".ptree"),
-      _path(device.hostPath(_folder) + '/' + _name),
+      _path(device.hostPath(_folder) + '/' + std::string(domain) + ".ptree"),
       _longestWait(longestWait) {}
 
 PreferenceFile::Content PreferenceFile::read() const {
@@ -70,7 +69,7 @@ std::optional<PropertyValue> PreferenceFile::get(std::string_view key) {
 
 PropertyDict PreferenceFile::values() {
   PropertyDict values = stored();
-  apply(_changes, values);
+  applyChanges(values);
   return values;
 }
 
@@ -86,9 +85,8 @@ void PreferenceFile::set(std::string_view key, std::optional<PropertyValue> valu
   _changes.insert_or_assign(std::string(key), std::move(value));
 }
 
-void PreferenceFile::apply(const std::map<std::string, std::optional<PropertyValue>>& changes,
-                           PropertyDict& values) {
-  for (const auto& [key, value] : changes) {
+void PreferenceFile::applyChanges(PropertyDict& values) const {
+  for (const auto& [key, value] : _changes) {
     if (value) {
       values.set(key, *value);
     } else {
@@ -98,12 +96,8 @@ void PreferenceFile::apply(const std::map<std::string, std::optional<PropertyVal
 }
 
 bool PreferenceFile::synchronize() {
-  if (!hasChanges()) {
-    _stored.reset();
-    return true;
-  }
   std::string error;
-  if (!writeChanges(error)) {
+  if (!_changes.empty() && !writeChanges(error)) {
     _log.write(LogLevel::Error, error);
     return false;
   }
@@ -127,13 +121,13 @@ bool PreferenceFile::writeChanges(std::string& error) {
     error = content.error;
     return false;
   }
-  // Compared as documents: unlike values, those also differ when only the kind of a number does.
+  // Compared as documents, which also differ when only the kind of a number does.
   std::string before;
   std::string document;
   if (!writePtree(content.values, before, error)) {
     return false;
   }
-  apply(_changes, content.values);
+  applyChanges(content.values);
   if (!writePtree(content.values, document, error)) {
     return false;
   }
@@ -143,12 +137,7 @@ bool PreferenceFile::writeChanges(std::string& error) {
   if (content.state == State::Malformed && !keepAside(error)) {
     return false;
   }
-  std::optional<AtomicFile> file = AtomicFile::create(*folder, error);
-  if (!file) {
-    return false;
-  }
-  file->append(document);  // a failure is told by `replace`
-  return file->replace(_name, error);
+  return replaceFile(_path, document, error);
 }
 
 bool PreferenceFile::keepAside(std::string& error) const {
@@ -156,7 +145,7 @@ bool PreferenceFile::keepAside(std::string& error) const {
   constexpr int kMostInOneSecond = 1000;
   for (int number = 1; number <= kMostInOneSecond; ++number) {
     const std::string name = number == 1 ? aside : aside + '-' + std::to_string(number);
-    // A second name, which never replaces a file: at no moment is the domain's file missing.
+    // A second name never replaces a file, and the domain's file is never missing.
     if (link(_path.c_str(), name.c_str()) == 0) {
       _log.write(LogLevel::Error, _path + ": kept as " + name);
       return true;

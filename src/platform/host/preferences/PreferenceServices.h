@@ -11,13 +11,11 @@
 #include "platform/host/device/DeviceDescription.h"
 #include "platform/host/preferences/HostPreferences.h"
 
-// The services that keep their values as `HostPreferences`. What their references name must outlive
-// them.
+// Services that keep their values as `HostPreferences`; the references must outlive them.
 
 namespace vesprun {
 
-/// The preferences of each user as documents in var/USER/Library/Preferences. What is refused is
-/// reported once for each user and domain.
+/// Each user's preferences, as documents in var/USER/Library/Preferences.
 class HostServicesClient final : public LGSServicesClient {
  public:
   HostServicesClient(const DeviceDirectory& device, Clock& clock, SystemLog& log)
@@ -42,7 +40,7 @@ class HostServicesClient final : public LGSServicesClient {
   std::map<std::string, HostPreferences, std::less<>> _users;
 };
 
-/// The configuration as documents in Library/Logsmith.
+/// Documents in Library/Logsmith.
 class HostSystemConfiguration final : public LGSSystemConfiguration {
  public:
   HostSystemConfiguration(const DeviceDescription& description, const DeviceDirectory& device,
@@ -70,7 +68,7 @@ class HostSystemConfiguration final : public LGSSystemConfiguration {
   HostPreferences _values;
 };
 
-/// The store as one more domain among the mobile user's preferences.
+/// One more domain among the mobile user's preferences.
 class HostUserDefaults final : public UserDefaults {
  public:
   explicit HostUserDefaults(Preferences& preferences) : _preferences(preferences) {}

@@ -10,9 +10,8 @@
 
 namespace vesprun {
 
-/// The registry that the device description lays out, with a simulated driver behind each entry
-/// that has a user client. A handle that is not (or no longer) valid finds nothing and fails every
-/// call; it is never given out twice.
+/// The described registry, with a simulated driver behind each entry that has a user client. An
+/// invalid handle finds nothing and fails every call; handles are never reused.
 class HostDeviceRegistry : public DeviceRegistry {
  public:
   HostDeviceRegistry(const std::vector<RegistryEntryDescription>& entries,
@@ -35,24 +34,24 @@ class HostDeviceRegistry : public DeviceRegistry {
   RegistryResult DevRegConnectCallScalarMethod(RegistryHandle connection, std::uint32_t method,
                                                std::uint64_t input, std::uint64_t& output) override;
 
-  /// Handles that were given out and not given back yet, and those given back that were not out.
+  /// Handles that are out, and returns of handles that were not.
   std::size_t openObjects() const { return _objects.size(); }
   std::size_t openConnections() const { return _connections.size(); }
   std::size_t falseReleases() const { return _falseReleases; }
 
  private:
-  /// An entry, by its place in `_nodes`.
+  /// By place in `_nodes`.
   struct Entry {
     std::size_t node;
   };
-  /// The entries from `next` on and before `end`.
+  /// The entries from `next` up to, but not including, `end`.
   struct Iterator {
     std::size_t next;
     std::size_t end;
   };
   using Object = std::variant<Entry, Iterator>;
 
-  /// An entry of the registry. Those below it are the ones after it, up to `end`.
+  /// The entries below a node are those after it, up to `end`.
   struct Node {
     const RegistryEntryDescription* description;
     std::size_t parent;
@@ -61,7 +60,7 @@ class HostDeviceRegistry : public DeviceRegistry {
 
   void layOut(const std::vector<RegistryEntryDescription>& entries, std::size_t parent);
   RegistryHandle handOut(Object object);
-  /// The node of an entry's handle, or null.
+  /// Null for any other handle.
   const Node* nodeOf(RegistryHandle entry) const;
 
   RegistryEntryDescription _root;

@@ -11,17 +11,16 @@
 
 namespace vesprun {
 
-/// Is the entry of the class, or of one that conforms to it?
+/// Is the entry of the class, or does it conform to it?
 bool conformsTo(const RegistryEntryDescription& entry, std::string_view className);
 
-/// The driver behind one user-client connection. It answers at the wire: the same requests, the
-/// same checks and the same bytes as a driver of the entry's class, with the answers that the entry
-/// describes.
+/// The driver behind one user-client connection. It answers at the wire as a driver of the entry's
+/// class would: the same requests, checks and bytes, with the described answers.
 class SimulatedDriver {
  public:
-  /// What a driver answers to a call that it does not understand.
+  /// The answer to a call that the driver does not understand.
   static constexpr RegistryResult kBadArgument = 0xE00002C2;
-  /// What it answers to a four-character code that it does not know.
+  /// The answer to an unknown four-character code.
   static constexpr RegistryResult kError = 0xE00002BC;
 
   /// `entry` has a user client.
@@ -30,8 +29,7 @@ class SimulatedDriver {
       : _entry(entry), _directory(directory), _log(log) {}
 
   /// A tunnel command or the content-deletion query, by the method numbers of the entry's class. An
-  /// answer's file that cannot be read fails the call like a command without an answer; the system
-  /// log names the file.
+  /// answer's file that cannot be read fails the call, with an error in the system log.
   RegistryResult callStructMethod(std::uint32_t method, std::span<const std::uint8_t> input,
                                   std::span<std::uint8_t> output, std::uint64_t& outputLength);
 

@@ -38,7 +38,7 @@ ProcessTimeZone::~ProcessTimeZone() {
 }
 
 bool ProcessTimeZone::set(const std::string& name) {
-  // The C library takes an unknown zone for UTC without a word.
+  // The C library silently takes an unknown zone for UTC.
   const bool isPath = name.empty() || name.front() == '/' || name.front() == '.' ||
                       name.find("..") != std::string::npos || name.find('\0') != std::string::npos;
   std::string error;

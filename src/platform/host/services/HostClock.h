@@ -7,31 +7,31 @@
 
 namespace vesprun {
 
-/// The machine's clock, or one that stands still.
+/// The machine's clock, or a stopped one.
 class HostClock : public Clock {
  public:
   explicit HostClock(std::optional<Date> standingStillAt) : _standingStillAt(standingStillAt) {}
 
   Date now() override;
-  /// Local times follow the process's time zone (see `ProcessTimeZone`).
+  /// In the process's time zone (`ProcessTimeZone`).
   std::string localDateText(const Date& date) override;
 
  private:
   std::optional<Date> _standingStillAt;
 };
 
-/// The time zone of a process, as long as the object lives. Local times are those of the whole
-/// process: `set` changes its environment variable TZ, which no other thread may read meanwhile.
+/// The process's time zone as long as the object lives: `set` changes TZ, which no other thread may
+/// read meanwhile.
 class ProcessTimeZone {
  public:
   ProcessTimeZone() = default;
   ProcessTimeZone(ProcessTimeZone&& other) noexcept;
   ProcessTimeZone& operator=(ProcessTimeZone&&) = delete;
-  /// Brings back the zone that was there before `set`.
+  /// Restores the zone from before `set`.
   ~ProcessTimeZone();
 
-  /// Makes `name`, of the time-zone database, the time zone. False when the database has no such
-  /// zone; nothing is changed then.
+  /// Sets a zone of the time-zone database; false, and nothing changed, when there is none of that
+  /// name.
   bool set(const std::string& name);
 
  private:

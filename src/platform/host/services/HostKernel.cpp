@@ -81,7 +81,7 @@ std::uint64_t HostKernel::monotonicTicks() {
     return _description.ticks.value->value;
   }
   timespec time{};
-  clock_gettime(CLOCK_MONOTONIC, &time);  // stands still while the machine is suspended
+  clock_gettime(CLOCK_MONOTONIC, &time);  // stops while the machine is suspended
   return static_cast<std::uint64_t>(time.tv_sec) * 1'000'000'000 +
          static_cast<std::uint64_t>(time.tv_nsec);
 }

@@ -7,8 +7,7 @@
 
 namespace vesprun {
 
-/// The kernel variables and figures that the device description gives, and those of Linux where it
-/// is silent.
+/// The described kernel variables and figures, or those of Linux.
 class HostKernel : public Kernel {
  public:
   HostKernel(const KernelDescription& description, const DeviceDirectory& directory, SystemLog& log)
@@ -20,8 +19,8 @@ class HostKernel : public Kernel {
   std::uint64_t pageSize() override;
   std::uint64_t monotonicTicks() override;
   std::optional<TickRatio> tickRatio() override;
-  /// The described snapshot, whatever the flags; Linux has none to offer. A file that cannot be
-  /// read leaves an error in the system log.
+  /// The described snapshot, whatever the flags; Linux has none. A file that cannot be read leaves
+  /// an error in the system log.
   std::optional<Bytes> captureSnapshot(std::uint32_t captureFlags) override;
 
  private:

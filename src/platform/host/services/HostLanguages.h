@@ -11,9 +11,9 @@ class HostLanguages : public Languages {
 
   std::vector<std::string> preferredLanguages() override;
   std::vector<std::string> systemLocalizations() override;
-  /// For each preferred language in order: the available language of the same tag, else one that
-  /// the tag begins with ("en" for "en-GB"), else the first of the same language ("en-US" for
-  /// "en-GB"). A language that none serves is passed over.
+  /// For each preferred language: the available one of the same tag, else one that the tag begins
+  /// with ("en" for "en-GB"), else the first of the same language ("en-US" for "en-GB"). Languages
+  /// without a match are skipped.
   std::vector<std::string> bestLocalizations(const std::vector<std::string>& available,
                                              const std::vector<std::string>& preferred) override;
   std::optional<std::string> localeCountryCode() override;

@@ -9,10 +9,12 @@
 #include <utility>
 #include <vector>
 
+#include "platform/Guarded.h"
+
 namespace vesprun {
 
-/// The threads that replies come from. Feeds, and so the handlers that hold them, share it: it may
-/// outlive the service, but has then ended and holds no thread.
+/// The threads of replies. Feeds, and so the handlers that hold them, share it and may outlive the
+/// service; by then it holds no thread.
 class HostMurmur::Replies {
  public:
   Replies(const AnswerDescription<UsageDescription>& description, SystemLog& log)

@@ -8,12 +8,11 @@
 
 namespace vesprun {
 
-/// The usage feed: every query is answered with the described records, as late as described, or
-/// never, on a thread of its own. The filter of a query is not consulted. When the service ends, it
-/// waits for handlers that are running, drops those that are due later, and answers no more.
+/// Answers every query, whatever its filter, with the described records, as late as described or
+/// never, on a thread of its own. When it ends, it waits for running handlers and drops the others.
 class HostMurmur final : public Murmur {
  public:
-  /// What the references name must outlive the object, and so must all that the handlers use.
+  /// The references, and all that handlers use, must outlive the object.
   HostMurmur(const AnswerDescription<UsageDescription>& description, SystemLog& log);
   ~HostMurmur() override;
   HostMurmur(const HostMurmur&) = delete;

@@ -41,7 +41,7 @@ void HostSystemLog::write(LogLevel level, std::string_view message) {
   }
   std::string error;
   try {
-    // Put together here: a message may hold a long list, which no value should copy.
+    // Assembled here: a message may hold a long list, which no value should copy.
     std::string line =
         jsonText(PropertyDict{{"time", dateText(_clock.now())}, {"level", levelName(level)}});
     line.back() = ',';

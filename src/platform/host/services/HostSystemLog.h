@@ -7,8 +7,7 @@
 
 namespace vesprun {
 
-/// The system log, in `outbox/log.jsonl`. What cannot be written there goes to standard error.
-/// Messages may come from any thread.
+/// `outbox/log.jsonl`; standard error gets what cannot be written there. Safe from any thread.
 class HostSystemLog : public SystemLog {
  public:
   HostSystemLog(const DeviceDirectory& directory, Clock& clock, LogLevel lowestKept);

@@ -5,9 +5,8 @@
 
 namespace vesprun {
 
-/// The described reporting channels, in the order of their description, whose readings are the
-/// described values; or live ones: the temperatures and pressure stalls of the running system,
-/// named and merged as their keys in the table of its figures.
+/// The described channels, in order, each with a constant reading; or live ones: the temperatures
+/// and pressure stalls of the running system, named and merged as in the table of its figures.
 class HostTapline final : public Tapline {
  public:
   explicit HostTapline(const DeviceDescription& description) : _description(description) {}

@@ -69,26 +69,6 @@ TEST_F(AtomicFileTest, KeepsTheEarlierDocumentUntilTheNewOneIsComplete) {
   EXPECT_THAT(folder.names(), ElementsAre("document"));
 }
 
-TEST_F(AtomicFileTest, IsCompleteOrAbsentWhereverItsWriterIsKilled) {
-  const std::string content(300'000, 'x');
-  for (int delay = 0; delay < 20; ++delay) {
-    const pid_t child = startProcess([&] {
-      while (replaceFile(folder.path("document"), content, error)) {
-      }
-    });
-    usleep(static_cast<useconds_t>(delay * 700));
-    kill(child, SIGKILL);
-    int status = 0;
-    waitpid(child, &status, 0);
-    ASSERT_TRUE(WIFSIGNALED(status));
-    for (const std::string& name : folder.names()) {
-      EXPECT_TRUE(name == ".unfinished-1" || folder.read(name) == content) << name;
-    }
-  }
-  EXPECT_TRUE(replaceFile(folder.path("document"), content, error)) << error;
-  EXPECT_THAT(folder.names(), ElementsAre("document"));
-}
-
 TEST_F(JsonLinesTest, AppendsWholeLinesFromManyWriters) {
   JsonLines first(folder.path("events.jsonl"));
   JsonLines second(folder.path("events.jsonl"));

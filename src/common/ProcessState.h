@@ -1,0 +1,30 @@
+#pragma once
+
+#include <utility>
+
+namespace vesprun {
+
+/// Something that lives as long as the process. Each has an object of this class beside it, in
+/// static memory, with the function that brings it back to its first state. Then tests and fuzzers
+/// can play one process after another.
+class ProcessState {
+ public:
+  using Reset = void (*)();
+
+  explicit ProcessState(Reset reset) noexcept : _reset(reset), _next(std::exchange(first, this)) {}
+
+  /// Makes every state what it is in a new process.
+  static void startAfresh() {
+    for (const ProcessState* state = first; state != nullptr; state = state->_next) {
+      state->_reset();
+    }
+  }
+
+ private:
+  static inline constinit const ProcessState* first = nullptr;
+
+  Reset _reset;
+  const ProcessState* _next;
+};
+
+}  // namespace vesprun
