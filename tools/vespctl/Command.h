@@ -73,5 +73,6 @@ void addPtreeCommands(CLI::App& vespctl);
 void addFieldsCommand(CLI::App& vespctl);
 void addDecodeCommand(CLI::App& vespctl);
 void addExportCommand(CLI::App& vespctl);
+void addCompletionCommand(CLI::App& vespctl);
 
 }  // namespace vesprun

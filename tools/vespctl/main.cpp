@@ -26,6 +26,7 @@ int runCommandLine(int argc, char** argv) {
   addFieldsCommand(vespctl);
   addDecodeCommand(vespctl);
   addExportCommand(vespctl);
+  addCompletionCommand(vespctl);
   allowOneCommand(vespctl);
   try {
     vespctl.parse(argc, argv);

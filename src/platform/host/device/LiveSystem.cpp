@@ -141,11 +141,6 @@ std::optional<Bytes> swapUsage() {
 
 std::optional<std::string> bootSessionIdentifier() {
   std::string identifier = upperCase(firstLineOf("/proc/sys/kernel/random/boot_id"));
-  // The service sees nothing but processes in /proc; the system hands it this file as a credential.
-  if (const char* credentials = std::getenv("CREDENTIALS_DIRECTORY");
-      identifier.empty() && credentials != nullptr) {
-    identifier = upperCase(firstLineOf(std::string(credentials) + "/boot_id"));
-  }
   return identifier.empty() ? std::nullopt : std::optional(std::move(identifier));
 }
 
