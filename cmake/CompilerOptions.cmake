@@ -21,3 +21,11 @@ if(VESPRUN_SANITIZERS)
     -fno-omit-frame-pointer)
   target_link_options(vesprun_options INTERFACE -fsanitize=${VESPRUN_SANITIZERS})
 endif()
+
+# The fuzzer sees which branches an input reaches.
+if(VESPRUN_FUZZERS)
+  if(NOT CMAKE_CXX_COMPILER_ID MATCHES Clang)
+    message(FATAL_ERROR "The fuzz targets need clang++: configure with --preset fuzz")
+  endif()
+  target_compile_options(vesprun_options INTERFACE -fsanitize=fuzzer-no-link)
+endif()

@@ -8,6 +8,7 @@
 
 #include "NANDInfo/parsers/MSPRecord.h"
 #include "buffers/DeviceBuffers.h"
+#include "platform/host/messages/MessageFraming.h"
 
 using namespace vesprun;
 
@@ -93,6 +94,57 @@ std::vector<Seed> ptreeSeeds() {
   };
 }
 
+std::vector<Seed> messageSeeds() {
+  const auto message = [](const std::string& content) {
+    return *messageFrame("<ptree version=\"1.0\"><dict><key>operation</key>" + content +
+                         "</dict></ptree>");
+  };
+  const std::string apps = message(
+      "<integer>2</integer><key>uuid</key><data>AAAAAAAAAAAAAAAAAAAAAA==</data><key>data</key>"
+      "<array><dict><key>bundle_id</key><string>a</string></dict></array>");
+  return {{"logging", bytesOf(message("<integer>0</integer>"))},
+          {"apps", bytesOf(apps)},
+          {"two", bytesOf(apps + message("<integer>1</integer>"))},
+          {"cut", bytesOf(apps.substr(0, 40))}};
+}
+
+std::vector<Seed> descriptionSeeds() {
+  return {{"everything", bytesOf(R"({"clock": "2024-03-05T09:15:02Z", "timeZone": "UTC",
+      "logLevel": "info", "system": {"buildVersion": "2B"},
+      "properties": {"InternalBuild": false, "DiskUsage": null, "InverseDeviceID": "f"},
+      "userVolume": {"blockSize": 4096, "blocks": 9, "available": 3}, "logBlacklist": ["115"],
+      "submission": {"enabled": true, "fails": false}, "purgeable": {"a": 1},
+      "events": {"available": true, "used": ["a"], "fails": []},
+      "apps": [{"bundle": "a", "user": true}], "languages": {"preferred": ["en"], "country": null},
+      "supportLibrary": {"available": true, "missing": ["a"]},
+      "kernel": {"pageSize": 4096, "ticks": {"value": 1, "numerator": 1, "denominator": 1},
+                 "variables": {"a": {"u32": 1}, "b": {"u64": 1}, "c": "t", "d": {"data": "AQ=="}},
+                 "snapshot": "s.bin", "eccError": 2},
+      "registry": [{"class": "A", "conformsTo": ["B"], "matching": true, "properties": {},
+                    "children": [], "userClient": {"openError": 0, "closeError": 0,
+          "tunnel": [{"opcode": 13, "argument": 0, "kind": 0, "file": "f", "size": 4, "length": 4,
+                      "sizeError": 0, "dataError": 0}],
+          "contentDeletion": {"value": 1, "length": 4, "error": 0},
+          "scalarMethods": {"3": {"LPEM": 1}}}}],
+      "channels": [{"name": "c", "value": 3, "format": 1, "categories": 256}],
+      "usage": {"records": [{"procName": "p", "since": {"date": "2024-03-05T00:00:00Z"}}],
+                "delaySeconds": 0.5}})")},
+          {"values", bytesOf(R"([1, -1, 2.5, {"real": "nan"}, {"float": 0.25}, {"data": "AQID"},
+                                {"date": "2024-03-05T09:15:02Z"}, true, "\u20ac", {}])")}};
+}
+
+std::vector<Seed> counterLineSeeds() {
+  return {{"both", bytesOf("scalar\t19787\ta.b\t-5\nsample\t19787\ta.b\t0.25\t3600\n"
+                           "sample\t19787\ta.b\tinf\t-1\nscalar\t-2\tc\t9223372036854775807\n")}};
+}
+
+std::vector<Seed> exportedLineSeeds() {
+  return {{"line", bytesOf(R"({"version":1,"device":"d","day":19787,"revision":1,)"
+                           R"("created":{"date":"2024-03-05T09:15:02.25Z"},"whitelist":"w",)"
+                           R"("scalars":{"a":-5},"distributions":{"b":[1.0,2.5,1.5,0.5,2]},)"
+                           R"("histograms":{"b":{"(-inf, 10]":2}}})")}};
+}
+
 bool write(const std::filesystem::path& folder, const std::vector<Seed>& seeds) {
   std::filesystem::create_directories(folder);
   for (const Seed& seed : seeds) {
@@ -122,6 +174,10 @@ int main(int argc, char** argv) {
                        write(folder / "MSPStatisticsFuzzer", mspSeeds()) &&
                        write(folder / "CounterLayoutsFuzzer", {{"counting", telemetryList(1)}}) &&
                        write(folder / "KernelSnapshotFuzzer", snapshotSeeds()) &&
-                       write(folder / "PtreeReaderFuzzer", ptreeSeeds());
+                       write(folder / "PtreeReaderFuzzer", ptreeSeeds()) &&
+                       write(folder / "MessageFuzzer", messageSeeds()) &&
+                       write(folder / "DeviceDescriptionFuzzer", descriptionSeeds()) &&
+                       write(folder / "CounterLinesFuzzer", counterLineSeeds()) &&
+                       write(folder / "ExportedLineFuzzer", exportedLineSeeds());
   return written ? 0 : 1;
 }

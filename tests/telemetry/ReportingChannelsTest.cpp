@@ -1,5 +1,8 @@
 #include "telemetry/ReportingChannels.h"
 
+#include <algorithm>
+
+#include "platform/host/figures/FigureReader.h"
 #include "telemetry/TodaysScalars.h"
 
 namespace vesprun {
@@ -15,6 +18,24 @@ TEST(ReportingChannels, OnlySimpleChannelsOfTheCategoryAreWritten) {
     LogTaplineChannelScalars();
     const Scalars written{{"com.quill.tapline.Low", -7}, {"com.quill.tapline.TempMax", 41}};
     EXPECT_EQ(todaysScalars(device), *others == '\0' ? Scalars{} : written);
+  }
+}
+
+TEST(ReportingChannels, LiveOnesAreThoseOfTheRunningSystem) {
+  TestDevice device(deviceWith(R"("channels": "live")"));
+  LogTaplineChannelScalars();
+  Scalars channels;
+  for (const FigureReading& reading : readFigures("", [](const LinuxFigure& figure) {
+                                        return figure.key.starts_with("linux.temperature.") ||
+                                               figure.key.starts_with("linux.pressure.");
+                                      }).figures) {
+    mergeFigure(channels, *reading.figure, "com.quill.tapline." + reading.key, reading.value);
+  }
+  const Scalars written = todaysScalars(device);
+  EXPECT_TRUE(std::ranges::equal(written, channels, {}, &Scalars::value_type::first,
+                                 &Scalars::value_type::first));
+  for (const auto& [key, value] : written) {
+    EXPECT_NEAR(static_cast<double>(value), static_cast<double>(channels[key]), 1000) << key;
   }
 }
 

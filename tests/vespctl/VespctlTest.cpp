@@ -1,9 +1,10 @@
-#include <gmock/gmock.h>
-#include <sys/wait.h>
+#include "vespctl/VespctlTest.h"
 
-#include <cstdlib>
+#include <algorithm>
+#include <map>
+#include <sstream>
 
-#include "support/TemporaryFolder.h"
+#include "platform/host/figures/FigureTable.h"
 
 namespace vesprun {
 namespace {
@@ -13,30 +14,6 @@ using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 using ::testing::Not;
 using ::testing::StartsWith;
-
-/// The program itself, on the device directory "$D", which `init` has made.
-class VespctlTest : public ::testing::Test {
- protected:
-  VespctlTest() { EXPECT_EQ(run("init \"$D\""), 0) << error; }
-
-  /// What follows `vespctl` in a shell; the exit status, with what was printed in `output` and
-  /// `error`.
-  int run(const std::string& arguments) {
-    const std::string script = "D='" + folder.path("device") + "'; cd '" + folder.path() +
-                               "'; '" VESPCTL_PROGRAM "' " + arguments;
-    folder.write("script", script);
-    const int status = std::system(("bash '" + folder.path("script") + "' >'" +
-                                    folder.path("output") + "' 2>'" + folder.path("error") + '\'')
-                                       .c_str());
-    output = folder.read("output");
-    error = folder.read("error");
-    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-  }
-
-  TemporaryFolder folder;
-  std::string output;
-  std::string error;
-};
 
 TEST_F(VespctlTest, SaysWhatIsWrongWithItsArguments) {
   const struct {
@@ -77,6 +54,7 @@ TEST_F(VespctlTest, SaysWhyItFailed) {
       {"show nowhere", "nowhere: No such file"},
       {"show file logs", "file/outbox/logs: Not a directory"},
       {"init file", "file: is not empty"},
+      {"collect \"$D\" --root nowhere", "nowhere: No such file"},
       {"ptree - </tmp", "standard input: Is a directory"},
       {"ptree nowhere", "nowhere: No such file"},
       {"ptree <(echo '<dict>')", "line 1: "},
@@ -159,6 +137,49 @@ TEST_F(VespctlTest, ShowsSubmittedLogs) {
                             HasSubstr("count 2, min 1, mean 2, max 3, standard deviation 1\n"),
                             HasSubstr("  (-inf, 2]  " + std::string(40, '#') + " 1\n"),
                             HasSubstr("   (2, inf)   -4\n")));
+}
+
+TEST_F(VespctlTest, CollectsWhatTheStarterWhitelistLetsLeave) {
+  // A machine that has every figure: 1 in the unit of a file's first.
+  std::map<std::string, std::map<std::string, std::string>> files;
+  for (const LinuxFigure& figure : linuxFigures) {
+    std::string path = "root" + std::string(figure.file);
+    for (const DeviceClass& device : linuxDeviceClasses) {
+      std::string name(device.patterns.substr(0, device.patterns.find(' ')));
+      std::ranges::replace(name, '#', '1');
+      std::ranges::replace(name, '@', 'a');
+      if (const std::size_t place = path.find(device.name); place != std::string::npos) {
+        path.replace(place, device.name.size(), name);
+      }
+    }
+    const std::string label(figure.field.substr(0, figure.field.rfind(' ') + 1));
+    std::string line = label;
+    for (int word = 1; word <= 10; ++word) {
+      line += (figure.field.ends_with('=') ? "total=" : "") + std::to_string(figure.divisor) + ' ';
+    }
+    files[path].try_emplace(label, line + '\n');
+  }
+  for (const auto& [path, lines] : files) {
+    std::string text;
+    for (const auto& [label, line] : lines) {
+      text += line;
+    }
+    folder.write(path, text);
+  }
+  EXPECT_EQ(run("collect \"$D\""), 0) << error;
+  EXPECT_EQ(run("collect \"$D\" --root root"), 0) << error;
+  EXPECT_EQ(run("collect \"$D\""), 0) << error;
+  EXPECT_EQ(run("counters \"$D\" dump | cut -f 3 | sort -u"), 0);
+  const std::string counted = output;
+  EXPECT_EQ(run("run \"$D\" -- -t; '" VESPCTL_PROGRAM "' ptree device/outbox/logs/0001*.ptree"), 0);
+  for (const LinuxFigure& figure : linuxFigures) {
+    const std::string end = figure.key.ends_with('.') ? "" : "\":";
+    EXPECT_THAT(output, HasSubstr('"' + std::string(figure.key) + end)) << figure.file;
+  }
+  std::istringstream keys(counted);
+  for (std::string key; keys >> key;) {
+    EXPECT_THAT(output, HasSubstr('"' + key + "\":"));
+  }
 }
 
 TEST_F(VespctlTest, LetsNoControlCharacterFromAFileReachTheTerminal) {

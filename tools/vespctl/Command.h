@@ -65,6 +65,7 @@ void allowOneCommand(CLI::App& subject, bool needed = true);
 // Each subject adds its commands to vespctl in a file of its own.
 void addDeviceCommands(CLI::App& vespctl);
 void addCounterCommands(CLI::App& vespctl);
+void addCollectCommand(CLI::App& vespctl);
 void addPreferenceCommands(CLI::App& vespctl);
 void addMessageCommands(CLI::App& vespctl);
 void addNandCommands(CLI::App& vespctl);
@@ -74,5 +75,6 @@ void addFieldsCommand(CLI::App& vespctl);
 void addDecodeCommand(CLI::App& vespctl);
 void addExportCommand(CLI::App& vespctl);
 void addCompletionCommand(CLI::App& vespctl);
+void addPruneCommand(CLI::App& vespctl);
 
 }  // namespace vesprun

@@ -18,6 +18,7 @@ int runCommandLine(int argc, char** argv) {
                    "vespctl");
   addDeviceCommands(vespctl);
   addCounterCommands(vespctl);
+  addCollectCommand(vespctl);
   addPreferenceCommands(vespctl);
   addMessageCommands(vespctl);
   addNandCommands(vespctl);
@@ -27,6 +28,7 @@ int runCommandLine(int argc, char** argv) {
   addDecodeCommand(vespctl);
   addExportCommand(vespctl);
   addCompletionCommand(vespctl);
+  addPruneCommand(vespctl);
   allowOneCommand(vespctl);
   try {
     vespctl.parse(argc, argv);

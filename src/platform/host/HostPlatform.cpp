@@ -80,7 +80,7 @@ struct HostPlatform::Services {
   HostUserDefaults userDefaults{preferences};
   HostMainLoop mainLoop;
   HostMessageService messageService{directory, ptreeSerialization, systemLog, mainLoop};
-  HostTapline tapline{description.channels};
+  HostTapline tapline{description};
   HostMurmur murmur{description.usage, systemLog};  // last: a reply may use all of the above
 };
 

@@ -1,8 +1,10 @@
 #include "platform/host/HostPlatform.h"
 
 #include <fcntl.h>
+#include <sys/stat.h>
 
 #include <cerrno>
+#include <filesystem>
 #include <fstream>
 #include <future>
 #include <stdexcept>
@@ -115,6 +117,41 @@ TEST(Outbox, NumbersLogsUpwardsAndKeepsHeadersBesideThem) {
   EXPECT_EQ(device.read("outbox/logs/0042-193-log-aggregated.header.json"),
             "{\"previous_os_version\":\"1\"}\n");
   EXPECT_EQ(device.read("outbox/logs/0043-165-StorageStatus.log"), "text");
+  for (const char* const end : {".ptree", ".header.json"}) {
+    struct stat status {};
+    stat(device.path(std::string("outbox/logs/0042-193-log-aggregated") + end).c_str(), &status);
+    EXPECT_EQ(status.st_mtim.tv_sec, 1709630102) << "the device's clock";
+  }
+}
+
+TEST(Outbox, NumbersGoOnAfterWhateverHappenedToTheFolder) {
+  TestDevice device;
+  const auto nextName = [&device] {
+    const auto write = [](LogFileHandle& file) { file.write("text"); };
+    EXPECT_TRUE(platform().logsmith().LGSWriteLogForSubmission("165", "S", nullptr, write));
+    return device.names("outbox/logs").back();
+  };
+  const std::filesystem::path logs = device.path("outbox/logs");
+  EXPECT_EQ(nextName(), "0001-165-S.log");
+  // At once: within the same tick of the clock that the folder's modification time comes from.
+  device.write("outbox/logs/0007-165-S.log", "put there by someone else");
+  EXPECT_EQ(nextName(), "0008-165-S.log");
+  std::filesystem::remove_all(logs);
+  EXPECT_EQ(nextName(), "0009-165-S.log");
+  device.write("outbox/pruned.jsonl",
+               "{\"name\":\"0020-193-log-aggregated.ptree\",\"day\":1,"
+               "\"revision\":1}\nno note\n");
+  EXPECT_EQ(nextName(), "0021-165-S.log");
+  device.write("outbox/.log-number", "garbage");
+  std::filesystem::remove_all(logs);
+  EXPECT_EQ(nextName(), "0021-165-S.log") << "what the notes tell";
+  const auto time = std::filesystem::last_write_time(logs);
+  device.write("outbox/logs/0010-165-S.log", "");
+  std::filesystem::remove(logs / "0021-165-S.log");
+  device.write("outbox/logs/0090-165-S.log", "");
+  std::filesystem::last_write_time(logs, time);
+  EXPECT_EQ(nextName(), "0090-165-S.log");
+  EXPECT_TRUE(device.exists("outbox/logs/0022-165-S.log")) << "an unchanged folder is not read";
 }
 
 TEST(Outbox, SubmissionsAtOnceNeverShareANumber) {

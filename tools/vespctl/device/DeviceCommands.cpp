@@ -2,6 +2,7 @@
 #include <vector>
 
 #include "Command.h"
+#include "collect/StarterWhitelist.h"
 #include "driver/DailyDriver.h"
 #include "platform/host/files/AtomicFile.h"
 #include "sample/SampleDevice.h"
@@ -39,6 +40,8 @@ void initDevice(const std::string& path, bool sample) {
   }
   if (sample) {
     fillSampleDevice(path);
+  } else {
+    writeWhitelist(*directory, starterWhitelist());
   }
 }
 
@@ -65,7 +68,8 @@ void addDeviceCommands(CLI::App& vespctl) {
   CLI::App* init = vespctl.add_subcommand("init", "Makes a device directory");
   init->add_option("DIR", arguments->directory, "A folder that is missing or empty")->required();
   init->add_flag("--sample", arguments->sample,
-                 "Fills it with a whitelist, counters of this machine and a storage controller");
+                 "Fills it with counters of this machine, a storage controller and a whitelist "
+                 "for them, instead of one for what collect writes");
   init->callback([arguments] { initDevice(arguments->directory, arguments->sample); });
 
   CLI::App* run = vespctl.add_subcommand("run", "Does what vesprun does, on that device");

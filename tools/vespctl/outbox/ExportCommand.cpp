@@ -68,10 +68,9 @@ void run(const Export& wanted) {
       !wanted.device.empty()
           ? wanted.device
           : pseudonymOf(platform->diagnosticHeader().GetSysIDWithDescription(false));
-  const SubmittedLogs submitted = readSubmittedLogs(platform->directory());
-  for (const SubmittedLog& log : submitted.logs) {
+  const auto print = [&](SubmittedLog&& log) {
     if (log.day < wanted.from || log.day > wanted.to) {
-      continue;
+      return;
     }
     const auto entry = [&log](std::string_view key) { return *log.document.find(key); };
     printJson(PropertyDict{{"version", 1},
@@ -83,13 +82,11 @@ void run(const Export& wanted) {
                            {"scalars", entry("TBScalars")},
                            {"distributions", entry("TBDistributions")},
                            {"histograms", entry("TBDistributionsHistogram")}});
-  }
-  for (std::size_t i = 0; i < submitted.unreadable.size(); ++i) {
-    const auto& [name, why] = submitted.unreadable[i];
-    if (i + 1 == submitted.unreadable.size()) {
-      throw CommandFailure(name + ": " + why);
-    }
-    std::fprintf(stderr, "vespctl: %s: %s\n", name.c_str(), why.c_str());
+  };
+  const std::vector<UnreadableLog> unreadable = forEachSubmittedLog(platform->directory(), print);
+  if (!unreadable.empty()) {
+    nameUnreadable(std::span(unreadable).first(unreadable.size() - 1));
+    throw CommandFailure(unreadable.back().name + ": " + unreadable.back().why);
   }
 }
 

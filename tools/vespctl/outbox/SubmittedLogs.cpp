@@ -2,16 +2,16 @@
 
 #include <algorithm>
 #include <charconv>
-#include <filesystem>
+#include <cstdio>
 #include <map>
 #include <optional>
-#include <sstream>
-#include <system_error>
+#include <set>
 
 #include "Command.h"
 #include "common/Calendar.h"
-#include "platform/host/documents/JsonForm.h"
+#include "platform/host/device/PrunedLogs.h"
 #include "platform/host/documents/PtreeReader.h"
+#include "platform/host/files/FolderNames.h"
 #include "platform/host/files/WholeFile.h"
 
 namespace vesprun {
@@ -85,63 +85,110 @@ const char* faultOf(const PropertyDict& log) {
   return nullptr;
 }
 
-/// The highest revision of each day among the logs that were pruned.
-std::map<std::int32_t, std::int64_t> prunedRevisions(const DeviceDirectory& directory) {
-  std::map<std::int32_t, std::int64_t> revisions;
-  std::string error;
-  bool missing = false;
-  const auto content = readWholeFile(directory.hostPath("outbox/pruned.jsonl"), error, &missing);
-  if (!content && !missing) {
-    throw CommandFailure(error);
-  }
-  std::istringstream lines(content.value_or(""));
-  for (std::string line; std::getline(lines, line);) {
-    const auto value = valueFromJsonText(line, error);
-    const PropertyDict* entries = value ? value->dict() : nullptr;
-    const PropertyValue* day = entries != nullptr ? entries->find("day") : nullptr;
-    const PropertyValue* revision = entries != nullptr ? entries->find("revision") : nullptr;
-    if (day != nullptr && isInteger(*day) && revision != nullptr && isInteger(*revision)) {
-      std::int64_t& highest = revisions[day->number()->asInt32()];
-      highest = std::max(highest, revision->number()->asInt64());
+/// The notes of pruned logs by number, and the highest revision of each day among those passed.
+class Revisions {
+ public:
+  explicit Revisions(const DeviceDirectory& directory) : _directory(directory) { readNotes(); }
+
+  /// For a log that has gone since its folder was read: it was noted before.
+  void readNotes() {
+    std::string error;
+    std::optional<PrunedLogs> notes = readPrunedLogs(_directory, error);
+    if (!notes) {
+      throw CommandFailure(error);
     }
+    std::ranges::stable_sort(*notes, {}, &PrunedLog::number);
+    _notes = *std::move(notes);
+    _next = 0;
   }
-  return revisions;
-}
+
+  /// That of the next log by number. One whose removal was noted and then did not happen keeps its
+  /// own.
+  void set(SubmittedLog& log, std::uint64_t number) {
+    for (; _next < _notes.size() && _notes[_next].number < number; ++_next) {
+      count(_notes[_next]);
+    }
+    for (std::size_t i = _next; i < _notes.size() && _notes[i].number == number; ++i) {
+      if (_notes[i].name == log.name && _notes[i].day == log.day) {
+        log.isNoted = true;
+        count(_notes[i]);
+        log.revision = _notes[i].revision;
+        return;
+      }
+    }
+    log.revision = ++_highest[log.day];
+  }
+
+ private:
+  void count(const PrunedLog& note) {
+    std::int64_t& highest = _highest[note.day];
+    highest = std::max(highest, note.revision);
+  }
+
+  const DeviceDirectory& _directory;
+  PrunedLogs _notes;
+  std::size_t _next = 0;
+  std::map<std::int32_t, std::int64_t> _highest;
+};
 
 }  // namespace
 
-SubmittedLogs readSubmittedLogs(const DeviceDirectory& directory) {
-  const std::filesystem::path folder = directory.hostPath("outbox/logs");
-  std::map<std::pair<std::uint64_t, std::string>, std::filesystem::path> files;
-  std::error_code error;
-  for (std::filesystem::directory_iterator entry(folder, error), end; !error && entry != end;
-       entry.increment(error)) {
-    const std::string name = entry->path().filename().string();
+bool isDailyLogName(std::string_view name) { return numberOf(name).has_value(); }
+
+std::vector<UnreadableLog> forEachSubmittedLog(
+    const DeviceDirectory& directory, const std::function<void(SubmittedLog&& log)>& take) {
+  const std::string folder = directory.hostPath("outbox/logs");
+  std::string error;
+  const std::optional<std::vector<std::string>> names = namesInFolder(folder, error);
+  if (!names) {
+    throw CommandFailure(error);
+  }
+  std::set<std::pair<std::uint64_t, std::string>> files;
+  for (const std::string& name : *names) {
     if (const auto number = numberOf(name)) {
-      files.emplace(std::pair(*number, name), entry->path());
+      files.emplace(*number, name);
     }
   }
-  if (error && error != std::errc::no_such_file_or_directory) {
-    throw CommandFailure(folder.string() + ": " + error.message());
-  }
-  std::map<std::int32_t, std::int64_t> revisions = prunedRevisions(directory);
-  SubmittedLogs found;
-  for (const auto& [order, file] : files) {
+  Revisions revisions(directory);
+  std::vector<UnreadableLog> unreadable;
+  for (const auto& [number, name] : files) {
     std::string why;
-    const auto content = readWholeFile(file.string(), why);
+    bool missing = false;
+    const auto content = readWholeFile(folder + '/' + name, why, &missing);
+    if (missing) {
+      revisions.readNotes();
+      continue;
+    }
     std::optional<PropertyValue> document = content ? readPtree(*content, why) : std::nullopt;
-    PropertyDict* const log = document ? document->dict() : nullptr;
+    PropertyDict* const entries = document ? document->dict() : nullptr;
     if (document) {
-      const char* const fault = log != nullptr ? faultOf(*log) : "not a dictionary";
+      const char* const fault = entries != nullptr ? faultOf(*entries) : "not a dictionary";
       why = fault != nullptr ? fault : "";
     }
     if (!why.empty()) {
-      found.unreadable.push_back({order.second, why});
+      unreadable.push_back({name, why, content.has_value()});
       continue;
     }
-    const std::int32_t day = daysSince1970(*log->find("TBStartDate")->date());
-    found.logs.push_back({order.second, day, ++revisions[day], std::move(*log)});
+    SubmittedLog log;
+    log.name = name;
+    log.day = daysSince1970(*entries->find("TBStartDate")->date());
+    revisions.set(log, number);
+    log.document = std::move(*entries);
+    take(std::move(log));
   }
+  return unreadable;
+}
+
+void nameUnreadable(std::span<const UnreadableLog> logs) {
+  for (const auto& [name, why, wasRead] : logs) {
+    std::fprintf(stderr, "vespctl: %s: %s\n", name.c_str(), why.c_str());
+  }
+}
+
+SubmittedLogs readSubmittedLogs(const DeviceDirectory& directory) {
+  SubmittedLogs found;
+  found.unreadable = forEachSubmittedLog(
+      directory, [&found](SubmittedLog&& log) { found.logs.push_back(std::move(log)); });
   return found;
 }
 

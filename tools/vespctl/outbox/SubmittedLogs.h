@@ -1,7 +1,10 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
+#include <span>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "common/PropertyDict.h"
@@ -11,9 +14,10 @@ namespace vesprun {
 
 /// A submitted daily log in the outbox, with what every reader of it needs.
 struct SubmittedLog {
-  std::string name;       ///< of its file
-  std::int32_t day = 0;   ///< that it reports
-  std::int64_t revision;  ///< of that day, from 1
+  std::string name;           ///< of its file
+  std::int32_t day = 0;       ///< that it reports
+  std::int64_t revision = 0;  ///< of that day, from 1
+  bool isNoted = false;       ///< as removed, by a command that was killed before it removed it
   PropertyDict document;
 };
 
@@ -21,6 +25,7 @@ struct SubmittedLog {
 struct UnreadableLog {
   std::string name;
   std::string why;
+  bool wasRead;  ///< so that it will never be one
 };
 
 struct SubmittedLogs {
@@ -28,8 +33,18 @@ struct SubmittedLogs {
   std::vector<UnreadableLog> unreadable;
 };
 
-/// The daily logs in the outbox. A log's revision is one more than the highest of its day so far,
-/// of logs that were pruned as well. Throws `CommandFailure` when the outbox cannot be read.
+/// True for the names that daily logs have.
+bool isDailyLogName(std::string_view name);
+
+/// Gives `take` the daily logs in the outbox, by number. A log's revision is one more than the
+/// highest of its day so far, of logs that were pruned as well. Throws `CommandFailure` when the
+/// outbox cannot be read.
+std::vector<UnreadableLog> forEachSubmittedLog(const DeviceDirectory& directory,
+                                               const std::function<void(SubmittedLog&& log)>& take);
+
+/// Names logs on standard error, with what is wrong.
+void nameUnreadable(std::span<const UnreadableLog> logs);
+
 SubmittedLogs readSubmittedLogs(const DeviceDirectory& directory);
 
 }  // namespace vesprun

@@ -1,14 +1,16 @@
 #include "sample/SampleDevice.h"
 
+#include <cstdlib>
 #include <string_view>
 #include <vector>
 
 #include "Command.h"
+#include "collect/StarterWhitelist.h"
 #include "common/Calendar.h"
+#include "platform/host/counters/CounterLines.h"
 #include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeWriter.h"
-#include "platform/host/files/AtomicFile.h"
 #include "sample/SampleCounters.h"
 #include "sample/SampleData.h"
 #include "sample/SampleDescription.h"
@@ -16,19 +18,15 @@
 namespace vesprun {
 namespace {
 
-constexpr std::string_view kWhitelistFolder = "Library/Application Support/Tallybook";
-constexpr std::string_view kWhitelistFile = "Whitelist_Stagebox.ptree";
-
-void writeWhitelist(const DeviceDirectory& directory) {
+void writeSampleWhitelist(const DeviceDirectory& directory) {
   std::string document;
   std::string error;
   const std::optional<PropertyValue> whitelist =
       valueFromJsonText(sampleData().at("whitelist").dump(), error);
-  const auto folder = directory.makeFolder(kWhitelistFolder, error);
-  if (!folder || !whitelist || !writePtree(*whitelist, document, error) ||
-      !replaceFile(*folder + '/' + std::string(kWhitelistFile), document, error)) {
+  if (!whitelist || !writePtree(*whitelist, document, error)) {
     throw CommandFailure(error);
   }
+  writeWhitelist(directory, document);
 }
 
 /// The readings of one moment stand for a day, those of a burst for its hours.
@@ -69,13 +67,21 @@ void recordCounters(HostPlatform& device) {
   }
 }
 
+/// The time that the controller's statistics tell of: now, unless SOURCE_DATE_EPOCH asks for the same
+/// bytes each time.
+Date sampleTime(Clock& clock) {
+  const char* const epoch = std::getenv("SOURCE_DATE_EPOCH");
+  std::int64_t seconds = 0;
+  return epoch != nullptr && parseWholeText(epoch, seconds) ? Date{seconds, 0} : clock.now();
+}
+
 }  // namespace
 
 void fillSampleDevice(const std::string& directory) {
   const std::unique_ptr<HostPlatform> device = openDevice(directory);
-  writeWhitelist(device->directory());
+  writeSampleWhitelist(device->directory());
   recordCounters(*device);
-  describeSampleDevice(device->directory(), device->clock().now());
+  describeSampleDevice(device->directory(), sampleTime(device->clock()));
 }
 
 }  // namespace vesprun

@@ -11,6 +11,7 @@
 #include "NANDInfo/tables/FieldSets.h"
 #include "NANDInfo/tables/LegacyKeyMap.h"
 #include "NANDInfo/tables/MagazineFields.h"
+#include "platform/host/figures/FigureTable.h"
 
 namespace vesprun {
 namespace {
@@ -57,6 +58,33 @@ void printLegacyKeys() {
   });
 }
 
+constexpr std::string_view kindName(FigureKind kind) {
+  switch (kind) {
+    case FigureKind::Counter:
+      return "counter";
+    case FigureKind::Gauge:
+      return "gauge";
+    case FigureKind::Boots:
+      return "boots";
+  }
+  return "";
+}
+
+void printLinuxFigures() {
+  for (const LinuxFigure& figure : linuxFigures) {
+    std::cout << figure.file << '\t' << figure.field << '\t' << figure.key << '\t' << figure.unit
+              << '\t' << figure.divisor << '\t' << kindName(figure.kind) << '\t' << figure.why
+              << '\n';
+  }
+}
+
+void printLinuxDevices() {
+  for (const DeviceClass& device : linuxDeviceClasses) {
+    std::cout << device.name << '\t' << device.patterns << '\t' << device.namedBy << '\t'
+              << device.identity << '\n';
+  }
+}
+
 std::vector<List> lists() {
   std::vector<List> lists = {
       {"stat-keys", printStatKeys},
@@ -68,7 +96,9 @@ std::vector<List> lists() {
       {"storage-stats-digits", [] { printDigits(WhitelistedStorageStats_SigDigDict); }},
       {"ftl-stats-for-msp", [] { printNames(FTLStats4MSPStats); }},
       {"magazine-accumulating", [] { printNames(PrivacyApprovedSMagNANDFTLCounters_Accum); }},
-      {"magazine-dynamic", [] { printNames(PrivacyApprovedSMagNANDFTLCounters_Dynamic); }}};
+      {"magazine-dynamic", [] { printNames(PrivacyApprovedSMagNANDFTLCounters_Dynamic); }},
+      {"linux-figures", printLinuxFigures},
+      {"linux-devices", printLinuxDevices}};
   for (const StorageEvent& event : EventHubConfigDetails) {
     lists.push_back(
         {"event " + std::string(event.event), [table = event.fields] { printNames(*table); }});

@@ -20,6 +20,7 @@ constexpr std::size_t kLongestKey = 1024 * 1024;
 // Pages of 16 KiB: a chunk of samples is read by few calls.
 constexpr const char* kSchema = R"(
   PRAGMA page_size = 16384;
+  PRAGMA auto_vacuum = INCREMENTAL;
   CREATE TABLE scalar (
     day INTEGER NOT NULL,
     key TEXT NOT NULL,
@@ -290,6 +291,36 @@ void CounterStore::readDistributions(std::string_view keyPrefix, std::int32_t mi
                handler(key, day, values, stop);
                values.rethrowFailure();
              });
+}
+
+CounterStore::Removed CounterStore::removeBefore(std::int64_t day) {
+  Removed removed;
+  SqliteStatement days(_connection,
+                       "SELECT day FROM scalar WHERE day < ?1 UNION "
+                       "SELECT day FROM distribution WHERE day < ?1 ORDER BY day");
+  for (days.bind(1, day); days.step();) {
+    removed.days.push_back(static_cast<std::int32_t>(days.integer(0)));
+  }
+  days.reset();
+  const auto remove = [&](const char* sql) {
+    SqliteStatement(_connection, sql).bind(1, day).run();
+    return std::int64_t{sqlite3_changes(_connection.handle())};
+  };
+  remove("DELETE FROM chunk WHERE distribution IN (SELECT id FROM distribution WHERE day < ?)");
+  removed.distributions = remove("DELETE FROM distribution WHERE day < ?");
+  removed.scalars = remove("DELETE FROM scalar WHERE day < ?");
+  return removed;
+}
+
+void CounterStore::giveRoomBack() {
+  constexpr std::int64_t kIncremental = 2;
+  if (_connection.queryInteger("PRAGMA auto_vacuum") == kIncremental) {
+    _connection.execute("PRAGMA incremental_vacuum");
+  } else if (_connection.queryInteger("PRAGMA freelist_count") != 0) {
+    _writer.reset();
+    _connection.commit();
+    _connection.execute("PRAGMA auto_vacuum = INCREMENTAL; VACUUM; BEGIN IMMEDIATE");
+  }
 }
 
 std::optional<std::int32_t> CounterStore::nextDay(std::int64_t day) {

@@ -8,6 +8,7 @@
 #include <span>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "platform/Tallybook.h"
 #include "platform/host/counters/SqliteConnection.h"
@@ -68,6 +69,20 @@ class CounterStore {
                    const TBHistory::ScalarRowHandler& handler);
   void readDistributions(std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
                          const TBHistory::DistributionRowHandler& handler);
+
+  /// What `removeBefore` removed.
+  struct Removed {
+    std::vector<std::int32_t> days;  ///< ascending
+    std::int64_t scalars = 0;
+    std::int64_t distributions = 0;
+  };
+
+  /// Removes the rows of all days before `day`.
+  Removed removeBefore(std::int64_t day);
+
+  /// Gives the room that removed rows left back to the file system. A file that was made without
+  /// room for the means to do so is written anew, for which all that was done before is committed.
+  void giveRoomBack();
 
   /// The next day after `day` that has a row; nothing when there is none. `day` is 64 bits wide so
   /// that the first day can be asked for too.

@@ -327,6 +327,18 @@ void read(const Entry& entry, ChannelDescription& channel) {
                 {"categories", channel.categories}});
 }
 
+struct Channels {
+  std::vector<ChannelDescription>& described;
+  bool& areLive;
+};
+
+void read(const Entry& entry, Channels& channels) {
+  channels.areLive = entry.value() == PropertyValue("live");
+  if (!channels.areLive) {
+    read(entry, channels.described);
+  }
+}
+
 void read(const Entry& entry, UsageDescription& usage) {
   entry.fields({{"records", usage.records}, {"delaySeconds", usage.delaySeconds}});
   if (!(usage.delaySeconds >= 0.0)) {
@@ -393,6 +405,7 @@ void read(const Entry& entry, RegistryEntryDescription& described) {
 
 void read(const Entry& entry, DeviceDescription& device) {
   AnswerDescription<PropertyDict> purgeable;
+  Channels channels{device.channels, device.liveChannels};
   entry.fields({{"clock", device.clock},
                 {"timeZone", device.timeZone},
                 {"logLevel", device.logLevel},
@@ -408,7 +421,7 @@ void read(const Entry& entry, DeviceDescription& device) {
                 {"purgeable", purgeable},
                 {"kernel", device.kernel},
                 {"registry", device.registry},
-                {"channels", device.channels},
+                {"channels", channels},
                 {"usage", device.usage}});
   device.purgeableServiceAvailable = !purgeable.isLive();
   device.purgeable = std::move(purgeable.value);

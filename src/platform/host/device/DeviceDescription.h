@@ -152,6 +152,7 @@ struct DeviceDescription {
   KernelDescription kernel;
   std::vector<RegistryEntryDescription> registry;
   std::vector<ChannelDescription> channels;
+  bool liveChannels = false;                  ///< the running system's instead
   AnswerDescription<UsageDescription> usage;  ///< absent: an empty reply at once
 };
 

@@ -2,17 +2,14 @@
 
 #include <unistd.h>
 
-#include <algorithm>
-#include <charconv>
 #include <cstdint>
 #include <cstdio>
 #include <optional>
-#include <vector>
 
 #include "common/Calendar.h"
+#include "platform/host/device/LogNumbers.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/files/AtomicFile.h"
-#include "platform/host/files/FolderNames.h"
 
 namespace vesprun {
 namespace {
@@ -30,23 +27,6 @@ class OutboxLogFile : public LogFileHandle {
   AtomicFile& _file;
 };
 
-/// One more than the largest number that a file name in the folder begins with.
-std::optional<std::uint64_t> nextNumber(const std::string& folder, std::string& error) {
-  const std::optional<std::vector<std::string>> names = namesInFolder(folder, error);
-  if (!names) {
-    return std::nullopt;
-  }
-  std::uint64_t largest = 0;
-  for (const std::string& name : *names) {
-    std::uint64_t number = 0;
-    const auto [rest, problem] = std::from_chars(name.data(), name.data() + name.size(), number);
-    if (problem == std::errc() && *rest == '-') {
-      largest = std::max(largest, number);
-    }
-  }
-  return largest + 1;
-}
-
 std::string baseName(std::uint64_t number, std::string_view type, std::string_view name) {
   char digits[24];
   std::snprintf(digits, sizeof digits, "%04llu", static_cast<unsigned long long>(number));
@@ -54,12 +34,13 @@ std::string baseName(std::uint64_t number, std::string_view type, std::string_vi
 }
 
 AtomicFile::Added addHeader(const std::string& folder, const std::string& name,
-                            const PropertyDict& header, std::string& error) {
+                            const PropertyDict& header, const Date& time, std::string& error) {
   std::optional<AtomicFile> file = AtomicFile::create(folder, error);
   if (!file) {
     return AtomicFile::Added::Failed;
   }
   file->append(jsonText(header) + '\n');  // a failure is told by `addNew`
+  file->setModificationTime(time);
   return file->addNew(name, error);
 }
 
@@ -94,25 +75,30 @@ bool Outbox::writeLog(std::string_view type, std::string_view name, const Proper
   if (!folder) {
     return false;
   }
+  const LogNumbers numbers(_directory);
   std::optional<AtomicFile> file = AtomicFile::create(*folder, error);
   if (!file) {
     return false;
   }
   OutboxLogFile handle(*file);
   writer(handle);
+  // The machine's clock may be another one.
+  const Date time = _clock.now();
+  file->setModificationTime(time);
   // Two submissions at once must not share a number: a header would stand beside the other's log.
   const std::optional<FolderLock> lock = FolderLock::take(*folder, error);
   if (!lock) {
     return false;
   }
-  const std::optional<std::uint64_t> first = nextNumber(*folder, error);
-  auto added = first ? AtomicFile::Added::NameTaken : AtomicFile::Added::Failed;
-  for (std::uint64_t number = first.value_or(0); added == AtomicFile::Added::NameTaken; ++number) {
-    const std::string base = baseName(number, type, name);
+  const std::optional<std::uint64_t> newest = numbers.newest(error);
+  auto added = newest ? AtomicFile::Added::NameTaken : AtomicFile::Added::Failed;
+  std::uint64_t number = newest.value_or(0);
+  while (added == AtomicFile::Added::NameTaken) {
+    const std::string base = baseName(++number, type, name);
     const std::string headerName = base + ".header.json";
     // First, so that a log which is there has its header beside it.
     if (header != nullptr) {
-      added = addHeader(*folder, headerName, *header, error);
+      added = addHeader(*folder, headerName, *header, time, error);
       if (added != AtomicFile::Added::Done) {
         continue;
       }
@@ -121,6 +107,10 @@ bool Outbox::writeLog(std::string_view type, std::string_view name, const Proper
     if (added != AtomicFile::Added::Done && header != nullptr) {
       unlink((*folder + '/' + headerName).c_str());
     }
+  }
+  if (added == AtomicFile::Added::Done) {
+    std::string ignored;  // the next log finds its number by reading the folder
+    numbers.remember(number, false, ignored);
   }
   return added == AtomicFile::Added::Done;
 }

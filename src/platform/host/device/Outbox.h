@@ -27,7 +27,7 @@ class Outbox {
 
   /// Submits a log as `logs/NNNN-TYPE-NAME.EXTENSION`, numbered upwards from 0001, with its header,
   /// when there is one, beside it. The log appears last and complete, or not at all: false. No
-  /// file that is there already is touched.
+  /// file that is there already is touched. The files' modification time is that of the device.
   bool submitLog(std::string_view type, std::string_view name, const PropertyDict* header,
                  const Logsmith::LogWriter& writer);
 

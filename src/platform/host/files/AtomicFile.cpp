@@ -34,7 +34,8 @@ AtomicFile::AtomicFile(AtomicFile&& other) noexcept
       _file(std::move(other._file)),
       _unfinishedName(std::exchange(other._unfinishedName, {})),
       _pending(std::move(other._pending)),
-      _failure(std::move(other._failure)) {}
+      _failure(std::move(other._failure)),
+      _modified(other._modified) {}
 
 AtomicFile::~AtomicFile() {
   if (!_unfinishedName.empty()) {
@@ -119,8 +120,14 @@ bool AtomicFile::writeOut(std::string_view bytes) {
 }
 
 bool AtomicFile::makeDurable(const std::string& name, std::string& error) {
-  if (_failure.empty() && writeOut(std::exchange(_pending, {})) && fsync(_file.get()) != 0) {
-    _failure = std::strerror(errno);
+  if (_failure.empty() && writeOut(std::exchange(_pending, {}))) {
+    if (_modified) {
+      const timespec times[] = {{0, UTIME_OMIT}, {_modified->seconds, _modified->nanoseconds}};
+      static_cast<void>(futimens(_file.get(), times));  // a document is worth more than its age
+    }
+    if (fsync(_file.get()) != 0) {
+      _failure = std::strerror(errno);
+    }
   }
   if (!_failure.empty()) {
     error = pathOf(name) + ": " + _failure;
@@ -180,6 +187,15 @@ bool replaceFile(const std::string& path, std::string_view content, std::string&
   }
   file->append(content);
   return file->replace(path.substr(slash + 1), error);
+}
+
+bool flushFolder(const std::string& folder, std::string& error) {
+  const FileDescriptor descriptor = openFolder(folder);
+  if (!descriptor.isOpen() || fsync(descriptor.get()) != 0) {
+    error = systemError(folder);
+    return false;
+  }
+  return true;
 }
 
 }  // namespace vesprun

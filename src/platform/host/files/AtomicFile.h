@@ -4,6 +4,7 @@
 #include <string>
 #include <string_view>
 
+#include "common/Date.h"
 #include "platform/host/files/FileDescriptor.h"
 
 namespace vesprun {
@@ -26,6 +27,10 @@ class AtomicFile {
   /// Appends the bytes. False when they cannot be written; the document can then no longer get a
   /// name, and `replace` and `addNew` repeat the reason.
   bool append(std::string_view bytes);
+
+  /// Gives the document this modification time, where the file system can keep it, instead of the
+  /// moment of its last byte.
+  void setModificationTime(const Date& time) { _modified = time; }
 
   /// Gives the document its name in the folder, in place of the file that has it. False, with a
   /// text in `error`, when that failed: the earlier file is still there, unless only making the new
@@ -53,9 +58,13 @@ class AtomicFile {
   std::string _unfinishedName;  ///< empty when the document has its own name
   std::string _pending;         ///< bytes not handed to the kernel yet
   std::string _failure;         ///< the first reason why an `append` failed
+  std::optional<Date> _modified;
 };
 
 /// Writes a whole document in place of the file at `path`, as `AtomicFile` does.
 bool replaceFile(const std::string& path, std::string_view content, std::string& error);
+
+/// Makes durable which names a folder has.
+bool flushFolder(const std::string& folder, std::string& error);
 
 }  // namespace vesprun

@@ -6,18 +6,23 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <cstdio>
+#include <cstdlib>
 #include <cstring>
+#include <filesystem>
+#include <memory>
 
+#include "platform/host/files/AtomicFile.h"
 #include "platform/host/files/FileLock.h"
 #include "platform/host/files/SystemError.h"
 
 namespace vesprun {
 
-bool JsonLines::open(std::string& error) {
+bool JsonLines::open(std::string& error, int creating) {
   // Reading, to see how the last line ends; not blocking, in case it is no file. A link could lead
   // the lines out of the device.
   FileDescriptor file(::open(
-      _path.c_str(), O_RDWR | O_APPEND | O_CREAT | O_CLOEXEC | O_NONBLOCK | O_NOFOLLOW, 0600));
+      _path.c_str(), O_RDWR | O_APPEND | O_CLOEXEC | O_NONBLOCK | O_NOFOLLOW | creating, 0600));
   struct stat status {};
   if (!file.isOpen() || fstat(file.get(), &status) != 0 ||
       ((status.st_mode & 0777) != 0600 && fchmod(file.get(), 0600) != 0)) {
@@ -38,21 +43,55 @@ bool JsonLines::append(std::string_view line, std::string& error) {
     return false;
   }
   const std::scoped_lock guard(_mutex);
-  struct stat status {};
-  // A file that was deleted meanwhile would take the line with it.
-  const bool usable = _file.isOpen() && fstat(_file.get(), &status) == 0 && status.st_nlink != 0;
-  if (!usable && !open(error)) {
-    return false;
-  }
-  const bool locked = takeLock(_file.get(), LOCK_EX, _wait, _path, error);
-  // Only one line waits for whoever keeps the file; the others would together wait for ever.
-  _wait = locked ? _longestWait : std::chrono::milliseconds::zero();
-  if (!locked) {
+  if (!lock(error, O_CREAT)) {
     return false;
   }
   const bool appended = appendLocked(line, error);
   flock(_file.get(), LOCK_UN);
   return appended;
+}
+
+std::optional<std::uint64_t> JsonLines::remove(
+    const std::function<bool(std::string_view line)>& goes, std::string& error) {
+  const std::scoped_lock guard(_mutex);
+  errno = 0;
+  if (!lock(error, 0)) {
+    return errno == ENOENT ? std::optional<std::uint64_t>(0) : std::nullopt;
+  }
+  const std::optional<std::uint64_t> removed = removeLocked(goes, error);
+  flock(_file.get(), LOCK_UN);
+  return removed;
+}
+
+bool JsonLines::flush(std::string& error) {
+  const std::scoped_lock guard(_mutex);
+  if (!isNamed() || fsync(_file.get()) != 0) {
+    error = systemError(_path);
+    return false;
+  }
+  return flushFolder(std::filesystem::path(_path).parent_path(), error);
+}
+
+bool JsonLines::lock(std::string& error, int creating) {
+  // A file that was deleted or replaced meanwhile would take the line with it. While it is locked,
+  // nobody replaces it.
+  do {
+    if (!isNamed() && !open(error, creating)) {
+      return false;
+    }
+    const bool locked = takeLock(_file.get(), LOCK_EX, _wait, _path, error);
+    // Only one line waits for whoever keeps the file; the others would together wait for ever.
+    _wait = locked ? _longestWait : std::chrono::milliseconds::zero();
+    if (!locked) {
+      return false;
+    }
+  } while (!isNamed());
+  return true;
+}
+
+bool JsonLines::isNamed() const {
+  struct stat status {};
+  return _file.isOpen() && fstat(_file.get(), &status) == 0 && status.st_nlink != 0;
 }
 
 bool JsonLines::appendLocked(std::string_view line, std::string& error) {
@@ -80,6 +119,45 @@ bool JsonLines::appendLocked(std::string_view line, std::string& error) {
     error += std::strerror(errno);
   }
   return false;
+}
+
+std::optional<std::uint64_t> JsonLines::removeLocked(
+    const std::function<bool(std::string_view line)>& goes, std::string& error) {
+  const std::filesystem::path path(_path);
+  std::optional<AtomicFile> kept = AtomicFile::create(path.parent_path(), error);
+  if (!kept) {
+    return std::nullopt;
+  }
+  const auto close = [](std::FILE* stream) { std::fclose(stream); };
+  const std::unique_ptr<std::FILE, decltype(close)> stream(fdopen(dup(_file.get()), "r"), close);
+  if (!stream) {
+    error = systemError(_path);
+    return std::nullopt;
+  }
+  std::rewind(stream.get());
+  std::unique_ptr<char, decltype(&std::free)> buffer(nullptr, std::free);
+  std::size_t capacity = 0;
+  std::uint64_t removed = 0;
+  for (;;) {
+    char* text = buffer.release();
+    const ssize_t length = getline(&text, &capacity, stream.get());
+    buffer.reset(text);
+    if (length <= 0) {
+      break;
+    }
+    const std::string_view line(text, static_cast<std::size_t>(length));
+    if (goes(line.substr(0, line.find('\n')))) {
+      ++removed;
+    } else {
+      kept->append(line);
+    }
+  }
+  if (std::ferror(stream.get()) != 0) {
+    error = systemError(_path);
+    return std::nullopt;
+  }
+  return removed == 0 || kept->replace(path.filename(), error) ? std::optional(removed)
+                                                               : std::nullopt;
 }
 
 }  // namespace vesprun

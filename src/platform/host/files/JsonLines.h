@@ -1,7 +1,10 @@
 #pragma once
 
 #include <chrono>
+#include <cstdint>
+#include <functional>
 #include <mutex>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -25,8 +28,20 @@ class JsonLines {
   /// no other line. False, with a text in `error` that names the file, when the line is not there.
   bool append(std::string_view line, std::string& error);
 
+  /// Makes what was appended durable.
+  bool flush(std::string& error);
+
+  /// Removes the lines that `goes` picks, all or none; those of other writers wait meanwhile. The
+  /// number of lines that are gone; nothing, with a text in `error`, when that failed.
+  std::optional<std::uint64_t> remove(const std::function<bool(std::string_view line)>& goes,
+                                      std::string& error);
+
  private:
-  bool open(std::string& error);
+  bool open(std::string& error, int creating);
+  bool lock(std::string& error, int creating);
+  bool isNamed() const;
+  std::optional<std::uint64_t> removeLocked(const std::function<bool(std::string_view line)>& goes,
+                                            std::string& error);
   bool appendLocked(std::string_view line, std::string& error);
 
   std::string _path;

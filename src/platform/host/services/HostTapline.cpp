@@ -1,9 +1,29 @@
 #include "platform/host/services/HostTapline.h"
 
+#include <map>
 #include <utility>
+#include <vector>
+
+#include "platform/host/figures/FigureReader.h"
 
 namespace vesprun {
 namespace {
+
+std::vector<ChannelDescription> liveChannels() {
+  const auto isChannel = [](const LinuxFigure& figure) {
+    return figure.key.starts_with("linux.temperature.") ||
+           figure.key.starts_with("linux.pressure.");
+  };
+  std::map<std::string, std::int64_t> values;
+  for (const FigureReading& reading : readFigures("", isChannel).figures) {
+    mergeFigure(values, *reading.figure, reading.key, reading.value);
+  }
+  std::vector<ChannelDescription> channels;
+  for (const auto& [name, value] : values) {
+    channels.push_back({name, value});
+  }
+  return channels;
+}
 
 class HostChannel final : public TaplineChannel {
  public:
@@ -59,9 +79,10 @@ std::unique_ptr<TaplineChannels> HostTapline::TaplineCopyChannelsInCategories(
     std::uint64_t categoryMask, std::uint64_t /*firstSelection*/,
     std::uint64_t /*secondSelection*/) {
   std::vector<HostChannel> selected;
-  for (const ChannelDescription& channel : _channels) {
+  for (ChannelDescription& channel :
+       _description.liveChannels ? liveChannels() : std::vector(_description.channels)) {
     if ((channel.categories & categoryMask) != 0) {
-      selected.emplace_back(channel);
+      selected.emplace_back(std::move(channel));
     }
   }
   return selected.empty() ? nullptr : std::make_unique<HostChannels>(std::move(selected));

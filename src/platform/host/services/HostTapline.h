@@ -1,17 +1,16 @@
 #pragma once
 
-#include <vector>
-
 #include "platform/Tapline.h"
 #include "platform/host/device/DeviceDescription.h"
 
 namespace vesprun {
 
-/// The described reporting channels, in the order of their description. A reading is always the
-/// described value.
+/// The described reporting channels, in the order of their description, whose readings are the
+/// described values; or live ones: the temperatures and pressure stalls of the running system,
+/// named and merged as their keys in the table of its figures.
 class HostTapline final : public Tapline {
  public:
-  explicit HostTapline(const std::vector<ChannelDescription>& channels) : _channels(channels) {}
+  explicit HostTapline(const DeviceDescription& description) : _description(description) {}
 
   std::unique_ptr<TaplineChannels> TaplineCopyChannelsInCategories(
       std::uint64_t categoryMask, std::uint64_t firstSelection,
@@ -20,7 +19,7 @@ class HostTapline final : public Tapline {
       const TaplineChannels& wanted, std::unique_ptr<TaplineChannels>& subscribed) override;
 
  private:
-  const std::vector<ChannelDescription>& _channels;
+  const DeviceDescription& _description;
 };
 
 }  // namespace vesprun

@@ -33,6 +33,7 @@ TEST(DeviceDescription, NamesTheEntryThatIsWrong) {
       {R"({"usage": {"delaySeconds": -1}})", "usage.delaySeconds: negative"},
       {R"({"usage": {"delaySeconds": 1e999}})",
        "\"usage\" > \"delaySeconds\": number overflow parsing '1e999'"},
+      {R"({"channels": "dead"})", "channels: not an array"},
       {R"({"channels": [{"value": 18446744073709551616}]})",
        "\"channels\" > [0] > \"value\": the integer 18446744073709551616 does not fit 64 bits"},
       {R"({"clock": "today", "clock": "today"})", "\"clock\": there twice"},

@@ -3,6 +3,7 @@
 #include <fcntl.h>
 #include <sys/file.h>
 
+#include <atomic>
 #include <sstream>
 #include <thread>
 
@@ -121,6 +122,29 @@ TEST_F(JsonLinesTest, EndsATornLineAndMakesADeletedFileAnew) {
   unlink(folder.path("log.jsonl").c_str());
   EXPECT_TRUE(lines.append("{}", error)) << error;
   EXPECT_EQ(folder.read("log.jsonl"), "{}\n");
+}
+
+TEST_F(JsonLinesTest, LoseNoLineWhileOthersAreRemoved) {
+  constexpr int kLines = 300;
+  std::atomic<std::uint64_t> removed = 0;
+  std::thread removing([&] {
+    JsonLines lines(folder.path("log.jsonl"));
+    std::string why;
+    while (removed < kLines && !HasFailure()) {
+      const auto count = lines.remove([](std::string_view line) { return line == "old"; }, why);
+      EXPECT_TRUE(count) << why;
+      removed += count.value_or(0);
+    }
+  });
+  JsonLines lines(folder.path("log.jsonl"));
+  for (int line = 0; line < kLines; ++line) {
+    EXPECT_TRUE(lines.append("old", error) && lines.append("new", error)) << error;
+  }
+  removing.join();
+  EXPECT_EQ(folder.read("log.jsonl").size(), 4U * kLines);
+  folder.write("log.jsonl", std::string("old\nto\0rn\n\nold\nto", 17));
+  EXPECT_EQ(lines.remove([](std::string_view line) { return line == "old"; }, error), 2U);
+  EXPECT_EQ(folder.read("log.jsonl"), std::string("to\0rn\n\nto", 9));
 }
 
 TEST_F(JsonLinesTest, OpensRegularFilesAloneAndKeepsThemToTheirOwner) {

@@ -1,0 +1,102 @@
+#include "platform/host/device/LogNumbers.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <time.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <charconv>
+#include <vector>
+
+#include "platform/host/device/PrunedLogs.h"
+#include "platform/host/files/AtomicFile.h"
+#include "platform/host/files/FileDescriptor.h"
+#include "platform/host/files/FolderNames.h"
+#include "platform/host/files/SystemError.h"
+#include "platform/host/files/WholeFile.h"
+
+namespace vesprun {
+namespace {
+
+constexpr std::string_view kLogFolder = "outbox/logs";
+constexpr std::string_view kNumberFile = "outbox/.log-number";
+
+/// What changes with every log that is added, removed or noted as removed.
+std::string stateOf(const DeviceDirectory& directory) {
+  struct stat folder {};
+  struct stat pruned {};
+  stat(directory.hostPath(kLogFolder).c_str(), &folder);
+  stat(directory.hostPath(kPrunedLogsFile).c_str(), &pruned);
+  return std::to_string(folder.st_mtim.tv_sec) + '.' + std::to_string(folder.st_mtim.tv_nsec) +
+         ' ' + std::to_string(pruned.st_size);
+}
+
+/// Gives the folder a modification time that no change leaves behind, since those are rounded to
+/// ticks of the system's clock. False when the file system cannot keep it.
+bool markFolder(const DeviceDirectory& directory) {
+  const std::string folder = directory.hostPath(kLogFolder);
+  timespec times[2] = {{0, UTIME_OMIT}, {}};
+  clock_gettime(CLOCK_REALTIME, &times[1]);
+  struct stat status {};
+  return utimensat(AT_FDCWD, folder.c_str(), times, 0) == 0 && stat(folder.c_str(), &status) == 0 &&
+         status.st_mtim.tv_sec == times[1].tv_sec && status.st_mtim.tv_nsec == times[1].tv_nsec;
+}
+
+}  // namespace
+
+std::optional<std::uint64_t> logNumber(std::string_view name) {
+  std::uint64_t number = 0;
+  const char* const end = name.data() + name.size();
+  const auto [rest, problem] = std::from_chars(name.data(), end, number);
+  return problem == std::errc() && rest != end && *rest == '-' ? std::optional(number)
+                                                               : std::nullopt;
+}
+
+LogNumbers::LogNumbers(const DeviceDirectory& directory)
+    : _directory(directory), _stateBefore(stateOf(directory)) {}
+
+std::optional<std::uint64_t> LogNumbers::newest(std::string& error) const {
+  std::uint64_t newest = 0;
+  std::string ignored;
+  const std::string kept = readWholeFile(_directory.hostPath(kNumberFile), ignored).value_or("");
+  const char* const end = kept.data() + kept.size();
+  const auto [rest, problem] = std::from_chars(kept.data(), end, newest);
+  if (problem == std::errc() &&
+      std::string_view(rest, end).starts_with(' ' + _stateBefore + '\n')) {
+    return newest;
+  }
+  const std::optional<std::vector<std::string>> names =
+      namesInFolder(_directory.hostPath(kLogFolder), error);
+  if (!names) {
+    return std::nullopt;
+  }
+  for (const std::string& name : *names) {
+    newest = std::max(newest, logNumber(name).value_or(0));
+  }
+  // Notes that cannot be read must not keep a log from being submitted.
+  for (const PrunedLog& log : readPrunedLogs(_directory, ignored).value_or(PrunedLogs())) {
+    newest = std::max(newest, log.number);
+  }
+  return newest;
+}
+
+bool LogNumbers::remember(std::uint64_t number, bool durably, std::string& error) const {
+  const std::string path = _directory.hostPath(kNumberFile);
+  const FileDescriptor file(
+      open(path.c_str(), O_WRONLY | O_CREAT | O_CLOEXEC | O_NONBLOCK | O_NOFOLLOW, 0600));
+  // Written in place and by one call: whenever the power goes, the old or the new number is there,
+  // and both are right. Nothing is flushed for the sake of a log.
+  const std::string content = std::to_string(number) + ' ' +
+                              (markFolder(_directory) ? stateOf(_directory) : "unknown") + '\n';
+  if (!file.isOpen() ||
+      pwrite(file.get(), content.data(), content.size(), 0) !=
+          static_cast<ssize_t>(content.size()) ||
+      (durably && fsync(file.get()) != 0)) {
+    error = systemError(path);
+    return false;
+  }
+  return !durably || flushFolder(_directory.hostPath("outbox"), error);
+}
+
+}  // namespace vesprun

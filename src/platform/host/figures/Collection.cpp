@@ -1,0 +1,191 @@
+#include "platform/host/figures/Collection.h"
+
+#include <map>
+#include <optional>
+#include <utility>
+
+#include "platform/host/figures/FigureReader.h"
+
+namespace vesprun {
+namespace {
+
+// Vanished devices are remembered, since they may come back; but names must not pile up.
+constexpr std::size_t kMostMarks = 4096;
+
+/// What is remembered of a figure, of a file that was left out, or of the boot.
+struct Mark {
+  std::int64_t device = 0;
+  std::int64_t value = 0;
+  std::string text{};  ///< why a file was left out; the boot's identifier
+};
+
+constexpr const char* kBootPlace = "boot";
+
+using Marks = std::map<std::string, Mark>;
+
+Marks readMarks(const SqliteConnection& connection) {
+  SqliteStatement(connection,
+                  "CREATE TABLE IF NOT EXISTS mark (place TEXT PRIMARY KEY, device INTEGER NOT "
+                  "NULL, value INTEGER NOT NULL, text TEXT NOT NULL) STRICT, WITHOUT ROWID")
+      .run();
+  SqliteStatement rows(connection, "SELECT place, device, value, text FROM mark");
+  Marks marks;
+  while (rows.step()) {
+    marks[std::string(rows.text(0))] = {rows.integer(1), rows.integer(2),
+                                        std::string(rows.text(3))};
+  }
+  return marks;
+}
+
+void writeMarks(const SqliteConnection& connection, const Marks& marks) {
+  SqliteStatement(connection, "DELETE FROM mark").run();
+  SqliteStatement put(connection,
+                      "INSERT INTO mark (place, device, value, text) VALUES (?, ?, ?, ?)");
+  for (const auto& [place, mark] : marks) {
+    put.bind(1, std::string_view(place)).bind(2, mark.device).bind(3, mark.value);
+    put.bind(4, std::string_view(mark.text)).run();
+  }
+}
+
+std::string placeOf(const LinuxFigure& figure) {
+  return std::string(figure.file) + ' ' + std::string(figure.field);
+}
+
+/// The marks of the last time against the readings of this one.
+class Collection {
+ public:
+  Collection(const Marks& last, FigureReadings readings)
+      : _last(last), _readings(std::move(readings)) {
+    const auto boot = _last.find(kBootPlace);
+    _isFirst = boot == _last.end();
+    const std::string lastBoot = _isFirst ? "" : boot->second.text;
+    _isUnsure = !_isFirst && _readings.boot.empty() && !lastBoot.empty();
+    _goesOn = !_isFirst && (_isUnsure || lastBoot == _readings.boot);
+    _isNewBoot = !_goesOn && !lastBoot.empty();
+    _isWholeBoot = _isNewBoot || (_goesOn && boot->second.device != 0);
+    _next[kBootPlace] = {_isWholeBoot, 0, _isUnsure ? lastBoot : _readings.boot};
+  }
+
+  void addTo(CounterStore& store, const Date& now) {
+    if (!_isUnsure) {
+      for (const LinuxFigure& figure : linuxFigures) {
+        if (figure.kind == FigureKind::Boots) {
+          grow(figure, std::string(figure.key), _isNewBoot);
+        }
+      }
+    }
+    for (const FigureReading& reading : _readings.figures) {
+      if (reading.figure->kind == FigureKind::Gauge) {
+        mergeFigure(_gauges, *reading.figure, reading.key, reading.value);
+      } else if (!_isUnsure) {
+        count(reading);
+      }
+    }
+    if (_isFirst) {
+      return;
+    }
+    const std::int32_t day = daysSince1970(now);
+    const auto second = static_cast<std::int32_t>(now.seconds - startOfDay(day).seconds);
+    for (const auto& [key, growth] : _growths) {
+      store.addToScalar(day, key, growth);
+    }
+    for (const auto& [key, value] : _gauges) {
+      const Sample sample{static_cast<double>(value), second};
+      store.appendSamples(day, key, {&sample, 1});
+    }
+  }
+
+  /// Lines for what is left out and has not been told yet.
+  std::vector<std::string> complaints() {
+    if (_isUnsure) {
+      _readings.problems.try_emplace(kBootPlace + std::string("_id"),
+                                     "not known; no growth is counted");
+    }
+    std::vector<std::string> lines;
+    for (auto& [path, problem] : _readings.problems) {
+      const Mark* told = known(path);
+      if (told == nullptr || told->text != problem) {
+        lines.push_back(path + ": " + problem + ", left out");
+      }
+      _next[path].text = std::move(problem);
+    }
+    return lines;
+  }
+
+  /// What is to be remembered.
+  Marks next() {
+    for (const LinuxFigure& figure : linuxFigures) {
+      if (!_isUnsure && figure.kind == FigureKind::Counter &&
+          _readings.listed.contains(figure.file)) {
+        _next[placeOf(figure)] = {};
+      }
+    }
+    for (const auto& [place, mark] : _last) {
+      if (_goesOn && mark.text.empty() && _next.size() < kMostMarks) {
+        _next.try_emplace(place, mark);
+      }
+    }
+    return std::move(_next);
+  }
+
+ private:
+  const Mark* known(const std::string& place) const {
+    const auto mark = _goesOn ? _last.find(place) : _last.end();
+    return mark != _last.end() ? &mark->second : nullptr;
+  }
+
+  /// The value from which a figure grows; nothing when it is not known.
+  std::optional<std::int64_t> baseOf(const FigureReading& reading) const {
+    const Mark* mark = known(reading.place);
+    if (mark != nullptr && mark->value != kUnread) {
+      const bool isOther =
+          mark->device != 0 && reading.device != 0 && mark->device != reading.device;
+      return isOther || reading.value < mark->value ? 0 : mark->value;
+    }
+    // What began with this boot or, as a device that was not there the last time, after it.
+    const bool isNewDevice = mark == nullptr && known(placeOf(*reading.figure)) != nullptr;
+    return _isWholeBoot || isNewDevice ? std::optional(0) : std::nullopt;
+  }
+
+  void count(const FigureReading& reading) {
+    if (reading.value == kUnread) {
+      const Mark* mark = known(reading.place);
+      _next[reading.place] = mark != nullptr ? *mark : Mark{reading.device, kUnread};
+      return;
+    }
+    if (const std::optional<std::int64_t> base = baseOf(reading)) {
+      grow(*reading.figure, reading.key, reading.value - *base);
+    }
+    _next[reading.place] = {reading.device, reading.value};
+  }
+
+  void grow(const LinuxFigure& figure, const std::string& key, std::int64_t growth) {
+    mergeFigure(_growths, figure, key, growth);
+  }
+
+  const Marks& _last;
+  FigureReadings _readings;
+  Marks _next;
+  std::map<std::string, std::int64_t> _growths;
+  std::map<std::string, std::int64_t> _gauges;
+  bool _isFirst = false;      ///< there are no marks yet
+  bool _isUnsure = false;     ///< the boot was known and is not now
+  bool _goesOn = false;       ///< the marks are of this boot
+  bool _isNewBoot = false;    ///< the last time was in an earlier boot
+  bool _isWholeBoot = false;  ///< a figure without a mark has grown from 0 since the last time
+};
+
+}  // namespace
+
+std::vector<std::string> collectFigures(CounterStore& store, const std::string& root,
+                                        const Date& now) {
+  // Read within the transaction: no other process can have counted a later reading.
+  const Marks last = readMarks(store.connection());
+  Collection collection(last, readFigures(root, [](const LinuxFigure&) { return true; }));
+  collection.addTo(store, now);
+  std::vector<std::string> complaints = collection.complaints();
+  writeMarks(store.connection(), collection.next());
+  return complaints;
+}
+
+}  // namespace vesprun

@@ -1,0 +1,54 @@
+#pragma once
+
+#include <cstdint>
+#include <span>
+#include <string_view>
+
+namespace vesprun {
+
+enum class FigureKind {
+  Counter,  ///< only grows from the start of the system on
+  Gauge,    ///< goes up and down
+  Boots     ///< the identifier of the boot
+};
+
+/// One figure that Linux tells of itself.
+struct LinuxFigure {
+  /// The file, with names of device classes such as "<disk>" as parts of its path.
+  std::string_view file;
+  /// "2": the second word of the first line. "cpu 2": of the line that begins with the word "cpu",
+  /// the second word after it. "some total=": on the line "some", what follows "total=".
+  std::string_view field;
+  /// The counter key. One that ends in a dot goes on with the device's name. Of several figures
+  /// with one key the sum counts, and of gauges the highest.
+  std::string_view key;
+  std::string_view unit;
+  FigureKind kind;
+  std::int64_t divisor;  ///< the file's number over this is in the unit; what is left is cut
+  std::int64_t lowest;   ///< in the unit; what lies outside means something else than a figure
+  std::int64_t highest;
+  std::string_view why;                    ///< what it is good for
+  std::span<const std::int32_t> bounds{};  ///< of the histogram of a gauge
+};
+
+/// The devices that stand in a path for a name such as "<disk>".
+struct DeviceClass {
+  std::string_view name;
+  /// Names of folders or files, parted by spaces. '#' is for digits, '@' for small letters, at
+  /// least one each, and '*' for anything.
+  std::string_view patterns;
+  /// What a device is called in keys: "." as it is named here, else as this file in it says. Empty:
+  /// it is not named.
+  std::string_view namedBy;
+  /// A file in the device with a number that no later device of the same name has; may be empty.
+  std::string_view identity;
+};
+
+/// All figures; those of one file stand together.
+extern const std::span<const LinuxFigure> linuxFigures;
+extern const std::span<const DeviceClass> linuxDeviceClasses;
+
+/// Tells whether a name is as one of the patterns says.
+bool matchesPatterns(std::string_view name, std::string_view patterns);
+
+}  // namespace vesprun

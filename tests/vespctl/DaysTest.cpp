@@ -1,0 +1,253 @@
+#include <sys/stat.h>
+
+#include <cstdio>
+#include <filesystem>
+#include <sstream>
+
+#include "vespctl/VespctlTest.h"
+
+#ifdef VESPRUN_TRACES
+#include <sys/syscall.h>
+
+#include <set>
+
+#include "TracedRun.h"
+#endif
+
+namespace vesprun {
+namespace {
+
+using ::testing::ElementsAre, ::testing::EndsWith, ::testing::HasSubstr, ::testing::StartsWith;
+
+/// A device whose whitelist lets "s" and "d" through and whose clock the test sets. Day 19787 is
+/// 2024-03-05.
+class DaysTest : public VespctlTest {
+ protected:
+  DaysTest() {
+    folder.write(
+        "device/Library/Application Support/Tallybook/Whitelist_Stagebox.ptree",
+        R"(<?xml version="1.0" encoding="UTF-8"?><ptree version="1.0"><dict><key>G</key><dict>
+<key>ScalarKeys</key><dict><key>s</key><dict/><key>com.quill.kernel.swapusage</key><dict/></dict>
+<key>DistributionKeys</key><dict><key>d</key><dict/></dict></dict></dict></ptree>)");
+    setTime("2024-03-05T09:15:02Z");
+  }
+
+  void setTime(const std::string& time) {
+    folder.write("device/device.json", "{\"clock\": \"" + time +
+                                           "\", \"system\": {\"osVersion\": "
+                                           "\"1\"}, \"registry\": []}");
+  }
+
+  /// Runs the command, which must be done, and gives what it printed.
+  std::string print(const std::string& arguments) {
+    EXPECT_EQ(run(arguments), 0) << arguments << ": " << error;
+    return output;
+  }
+
+  /// Scalars of these days.
+  void count(int first, int last) {
+    std::string lines;
+    for (int day = first; day <= last; ++day) {
+      lines += "scalar\t" + std::to_string(day) + "\ts\t" + std::to_string(day) + "\n";
+    }
+    folder.write("lines", lines);
+    print("counters \"$D\" import lines");
+  }
+
+  /// A daily log of a day of March 2024 that was written at midnight of a date.
+  void addLog(int number, int day, const std::string& written) {
+    const std::string name = logs + "/000" + std::to_string(number) + "-193-log-aggregated.ptree";
+    const std::string date = "<date>2024-03-0" + std::to_string(day) + "T00:00:00Z</date>";
+    folder.write(name,
+                 "<?xml version=\"1.0\" encoding=\"UTF-8\"?><ptree version=\"1.0\"><dict>"
+                 "<key>TBStartDate</key>" +
+                     date + "<key>TBLogCreationDate</key>" + date +
+                     "<key>TBWhitelistDigest</key><string/><key>TBScalars</key><dict/>"
+                     "<key>TBDistributions</key><dict/><key>TBDistributionsHistogram</key><dict/>"
+                     "</dict></ptree>");
+    ASSERT_EQ(std::system(("touch -d " + written + "T00:00Z " + folder.path(name)).c_str()), 0);
+  }
+
+  /// Day of March and revision of each exported log.
+  std::string revisions() {
+    std::string found;
+    std::istringstream lines(print("export \"$D\" --device n"));
+    for (std::string line; std::getline(lines, line);) {
+      int day = 0;
+      int revision = 0;
+      EXPECT_EQ(std::sscanf(line.c_str(), R"({"version":1,"device":"n","day":%d,"revision":%d,)",
+                            &day, &revision),
+                2);
+      found += std::to_string(day - 19782) + ':' + std::to_string(revision) + ' ';
+    }
+    return found;
+  }
+
+  const std::string logs = "device/outbox/logs";
+};
+
+TEST_F(DaysTest, PruneKeepsTheDaysThatAreAskedForOrStillRead) {
+  count(19780, 19789);
+  print("counters \"$D\" sample d 1 2 --day 19779");
+  print("counters \"$D\" sample d 1 2 --day 19785");
+  EXPECT_EQ(print("prune \"$D\""),
+            "{\"days\":[],\"scalars\":0,\"distributions\":0,\"logs\":[],\"lines\":{}}\n");
+  EXPECT_THAT(print("prune \"$D\" --counters 4294967295"), StartsWith("{\"days\":[],"));
+  EXPECT_EQ(print("prune \"$D\" --counters 4"),
+            "{\"days\":[19779,19780,19781,19782],\"scalars\":3,\"distributions\":1,\"logs\":[],"
+            "\"lines\":{}}\n");
+  EXPECT_THAT(print("prune \"$D\" --counters 0"), StartsWith("{\"days\":[19783,19784],"));
+  EXPECT_EQ(print("counters \"$D\" dump"),
+            "scalar\t19785\ts\t19785\nsample\t19785\td\t1\t33302\nsample\t19785\td\t2\t33302\n"
+            "scalar\t19786\ts\t19786\nscalar\t19787\ts\t19787\nscalar\t19788\ts\t19788\n"
+            "scalar\t19789\ts\t19789\n");
+}
+
+TEST_F(DaysTest, PruneRemovesOldLogsWithTheirHeadersAndOldLines) {
+  count(19786, 19786);
+  print("run \"$D\" -- -f");
+  print("run \"$D\" -- -f");
+  setTime("2024-03-15T09:15:02Z");
+  count(19796, 19796);
+  print("run \"$D\" -- -f");
+  folder.write("device/outbox/events.jsonl",
+               "{\"time\":\"2024-03-12T09:15:01Z\"}\n{\"time\":\"2024-03-12T09:15:02Z\"}\n"
+               "{\"time\":\"2024\"}\n{\"time\":1}\n[]\n\n{\"time\":\"2024-03-01T00:00:00Z\",");
+  folder.write(logs + "/note-193-log-aggregated.ptree", "no log");
+  std::filesystem::create_symlink("../events.jsonl", folder.path(logs + "/0002-link.log"));
+  std::filesystem::create_directory(folder.path(logs + "/0003-folder.log"));
+  ASSERT_EQ(mkfifo(folder.path("device/outbox/records.jsonl").c_str(), 0600), 0);
+  EXPECT_EQ(run("prune \"$D\" --outbox 3"), 1) << "the pipe is not a file of lines";
+  EXPECT_EQ(output,
+            "{\"days\":[],\"scalars\":0,\"distributions\":0,\"logs\":["
+            "\"0001-193-log-aggregated.ptree\",\"0002-193-log-aggregated.ptree\"],"
+            "\"lines\":{\"events.jsonl\":1,\"log.jsonl\":15}}\n");
+  EXPECT_THAT(error, HasSubstr("records.jsonl: not a regular file\n"));
+  EXPECT_EQ(folder.read("device/outbox/events.jsonl"),
+            "{\"time\":\"2024-03-12T09:15:02Z\"}\n{\"time\":\"2024\"}\n{\"time\":1}\n[]\n\n"
+            "{\"time\":\"2024-03-01T00:00:00Z\",");
+  EXPECT_THAT(folder.names(logs), ElementsAre("0002-link.log", "0003-193-log-aggregated.ptree",
+                                              "0003-folder.log", "note-193-log-aggregated.ptree"));
+  EXPECT_EQ(folder.read("device/outbox/pruned.jsonl"),
+            "{\"time\":\"2024-03-15T09:15:02Z\",\"name\":\"0001-193-log-aggregated.ptree\","
+            "\"day\":19786,\"revision\":1}\n"
+            "{\"time\":\"2024-03-15T09:15:02Z\",\"name\":\"0002-193-log-aggregated.ptree\","
+            "\"day\":19786,\"revision\":2}\n");
+}
+
+TEST_F(DaysTest, PruneRemovesTheOldestLogsUntilTheOutboxIsSmallEnough) {
+  const std::string large(600'000, 'x');
+  folder.write(logs + "/0009-165-S.log", large);
+  folder.write(logs + "/10000-165-S.log", large);
+  folder.write(logs + "/10000-165-S.header.json", "{}");
+  folder.write(logs + "/0010-165-S.header.json", "of a log that is gone");
+  folder.write("device/outbox/log.jsonl", large);
+  EXPECT_EQ(print("prune \"$D\" --outbox-size 1"),
+            "{\"days\":[],\"scalars\":0,\"distributions\":0,\"logs\":[\"0009-165-S.log\","
+            "\"0010-165-S.header.json\",\"10000-165-S.log\"],\"lines\":{}}\n");
+  EXPECT_THAT(folder.names(logs), ElementsAre());
+  EXPECT_THAT(print("prune \"$D\" --outbox-size 18446744073709551615"), HasSubstr("\"logs\":[]"));
+  count(19786, 19786);
+  print("run \"$D\" -- -f");
+  EXPECT_THAT(folder.names(logs), ElementsAre("10001-193-log-aggregated.header.json",
+                                              "10001-193-log-aggregated.ptree"));
+  EXPECT_THAT(print("prune \"$D\" --outbox-size 0"),
+              HasSubstr("[\"10001-193-log-aggregated.ptree\"]"));
+}
+
+TEST_F(DaysTest, RevisionsGoOnAfterPruningWhicheverLogsWent) {
+  addLog(1, 5, "2024-03-01");
+  addLog(2, 5, "2024-03-04");
+  addLog(3, 5, "2024-03-01");
+  addLog(4, 4, "2024-03-01");
+  EXPECT_EQ(revisions(), "5:1 5:2 5:3 4:1 ");
+  print("prune \"$D\" --outbox 2");
+  EXPECT_EQ(revisions(), "5:2 ");
+  addLog(5, 5, "2024-03-01");
+  addLog(6, 4, "2024-03-04");
+  EXPECT_EQ(revisions(), "5:2 5:4 4:2 ");
+  // As if killed between the note and the removal.
+  const std::string notes = folder.read("device/outbox/pruned.jsonl") +
+                            "{\"time\":\"2024-03-05T09:15:02Z\",\"name\":\"0005-193-log-aggregated"
+                            ".ptree\",\"day\":19787,\"revision\":4}\n";
+  folder.write("device/outbox/pruned.jsonl", notes + "{\"name\":7}\n\ntorn");
+  EXPECT_EQ(revisions(), "5:2 5:4 4:2 ");
+  EXPECT_THAT(print("prune \"$D\" --outbox 2"), HasSubstr("[\"0005-193-log-aggregated.ptree\"]"));
+  EXPECT_EQ(folder.read("device/outbox/pruned.jsonl"), notes + "{\"name\":7}\n\ntorn");
+  addLog(7, 5, "2024-03-04");
+  EXPECT_EQ(revisions(), "5:2 4:2 5:5 ");
+}
+
+TEST_F(DaysTest, PruneKeepsADailyLogThatItCannotNote) {
+  addLog(1, 4, "2024-03-01");
+  folder.write(logs + "/0002-165-S.log", "");
+  folder.write(logs + "/0003-193-log-aggregated.ptree", "no daily log");
+  std::filesystem::create_symlink("/dev/full", folder.path("device/outbox/pruned.jsonl"));
+  EXPECT_EQ(run("prune \"$D\" --outbox-size 0"), 1);
+  EXPECT_THAT(error, HasSubstr("pruned.jsonl: "));
+  EXPECT_THAT(output, HasSubstr("[\"0002-165-S.log\"]"));
+  EXPECT_THAT(folder.names(logs),
+              ElementsAre("0001-193-log-aggregated.ptree", "0003-193-log-aggregated.ptree"));
+  std::filesystem::remove(folder.path("device/outbox/pruned.jsonl"));
+  EXPECT_THAT(print("prune \"$D\" --outbox-size 0"),
+              HasSubstr("\"0003-193-log-aggregated.ptree\"]"));
+}
+
+#ifdef VESPRUN_TRACES
+TEST_F(DaysTest, PruneThatIsKilledOrFailsAnywhereIsMadeUpForByTheNext) {
+  count(19700, 19710);
+  count(19786, 19786);
+  print("counters \"$D\" sample d 1 --day 19701");
+  addLog(1, 4, "2024-02-01");
+  addLog(2, 4, "2024-03-05");
+  addLog(3, 4, "2024-02-01");
+  folder.write(logs + "/0003-193-log-aggregated.header.json", "{}");
+  folder.write(logs + "/0004-165-S.log", "the newest");
+  ASSERT_EQ(std::system(("touch -d 2024-02-01 " + folder.path(logs + "/000[34]*")).c_str()), 0);
+  const std::string old = "{\"time\":\"2024-02-01T00:00:00Z\"}\n";
+  folder.write("device/outbox/events.jsonl", old + "{\"time\":\"2024-03-05T00:00:00Z\"}\n" + old);
+  std::filesystem::rename(folder.path("device"), folder.path("original"));
+  const auto prune = [this](const torture::Fault& fault) {
+    std::filesystem::remove_all(folder.path("device"));
+    EXPECT_EQ(
+        std::system(("cp -a " + folder.path("original") + ' ' + folder.path("device")).c_str()), 0);
+    return torture::runTraced({VESPCTL_PROGRAM, "prune", ".", "--counters", "30", "--outbox", "30"},
+                              folder.path("device"), fault);
+  };
+  // What is there when the next prune has run, and after it a run.
+  const auto state = [this] {
+    print("prune \"$D\" --counters 30 --outbox 30");
+    std::string found = folder.read("device/outbox/pruned.jsonl") +
+                        folder.read("device/outbox/events.jsonl") + print("counters \"$D\" dump");
+    print("run \"$D\" -- -f");
+    for (const std::string& name : folder.names(logs)) {
+      found += name + ' ';
+    }
+    return found + revisions();
+  };
+  const torture::Outcome whole = prune({});
+  EXPECT_EQ(whole.status, 0) << whole.standardError;
+  const std::string expected = state();
+  EXPECT_THAT(expected, EndsWith("scalar\t19786\ts\t19786\n0002-193-log-aggregated.ptree "
+                                 "0005-193-log-aggregated.header.json "
+                                 "0005-193-log-aggregated.ptree 4:2 4:4 "));
+  std::size_t tried = 0;
+  for (std::size_t call = 1; call <= whole.calls.size(); ++call) {
+    const auto& [number, path, size] = whole.calls[call - 1];
+    const std::set<int> changing{SYS_write,     SYS_pwrite64, SYS_unlink, SYS_unlinkat,
+                                 SYS_rename,    SYS_renameat, SYS_linkat, SYS_fsync,
+                                 SYS_fdatasync, SYS_ftruncate};
+    if (changing.contains(number) && path.starts_with(folder.path("device"))) {
+      ++tried;
+      for (const auto kind : {torture::Fault::Kind::Kill, torture::Fault::Kind::Error}) {
+        prune({.kind = kind, .call = call, .error = EIO});
+        EXPECT_EQ(state(), expected) << torture::nameOfCall(number) << ' ' << path;
+      }
+    }
+  }
+  EXPECT_GT(tried, 20U);
+}
+#endif
+
+}  // namespace
+}  // namespace vesprun

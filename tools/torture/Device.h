@@ -1,0 +1,89 @@
+#pragma once
+
+#include <sys/types.h>
+
+#include <cstdio>
+#include <filesystem>
+#include <map>
+#include <string>
+#include <vector>
+
+namespace vesprun::torture {
+
+/// The programs under torture.
+struct Programs {
+  std::string vespctl;
+  std::string vesprun;  ///< works on the folder it is started in
+};
+
+/// Days since 1970 of the first run; its report is that of the day before.
+inline constexpr int kFirstDay = 19787;
+
+/// What can be seen of a device from outside.
+struct Sight {
+  std::map<std::string, std::string> logs;  ///< name in the outbox to content
+  std::vector<std::string> counters;        ///< rows as `vespctl counters dump` writes them
+  std::vector<std::string> files;           ///< all other names
+  std::vector<std::string> faults;          ///< what must never be seen
+};
+
+/// A device directory with something to do for every step of the day, whose clock stands still, and
+/// whose counters include keys that no list names ("secret...").
+class Device {
+ public:
+  /// Sets the device up in a new folder.
+  Device(const Programs& programs, const std::filesystem::path& folder);
+  /// A copy of it in another folder, in place of what is there.
+  Device(const Device& original, const std::filesystem::path& folder);
+
+  const std::string& path() const { return _path; }
+  void setDay(int day);
+  /// Lays a JSON object over the device's description; null removes an entry.
+  void describe(const std::string& change);
+
+  /// Runs `vespctl COMMAND DIR REST...`; its exit status, and what it printed in `output`.
+  int control(const std::string& command, const std::vector<std::string>& rest, std::string& output,
+              const std::string& input = {}) const;
+  std::vector<std::string> controlCommand(const std::string& command,
+                                          const std::vector<std::string>& rest) const;
+  /// The daily run, without a fault; its exit status.
+  int runDaily() const;
+  std::vector<std::string> dailyCommand() const { return {_programs->vesprun, "-d"}; }
+
+  /// Reads everything and judges what can be judged without knowing what happened: half documents
+  /// and lines, keys that no list names, files that nobody would miss.
+  Sight look() const;
+
+ private:
+  const Programs* _programs;
+  std::string _path;
+};
+
+/// A program that runs beside this one in `folder`, with `input` on its standard input, for a
+/// minute at most.
+class Companion {
+ public:
+  Companion(const std::vector<std::string>& command, const std::string& folder,
+            const std::string& input = {});
+  Companion(const Companion&) = delete;
+  Companion& operator=(const Companion&) = delete;
+  ~Companion();
+
+  /// True when it ended within the time.
+  bool endsWithin(int milliseconds);
+  /// Waits for its end; the exit status, -1 for a signal.
+  int status();
+  /// What it printed on both streams.
+  std::string output() const;
+
+ private:
+  FILE* _output;
+  pid_t _child;
+  int _status = 0;
+  bool _ended = false;
+};
+
+std::string readFile(const std::filesystem::path& path);
+void writeFile(const std::filesystem::path& path, const std::string& content);
+
+}  // namespace vesprun::torture

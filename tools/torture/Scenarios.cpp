@@ -1,0 +1,618 @@
+#include "Scenarios.h"
+
+#include <sys/syscall.h>
+
+#include <algorithm>
+#include <cstring>
+#include <map>
+#include <memory>
+#include <random>
+#include <set>
+#include <sstream>
+
+#include "TracedRun.h"
+#include "platform/host/documents/PtreeReader.h"
+
+namespace vesprun::torture {
+namespace {
+
+namespace fs = std::filesystem;
+
+using Faults = std::vector<std::string>;
+constexpr const char* kDailyLog = "-193-log-aggregated.ptree";
+
+/// What a day and the next one leave behind when nothing goes wrong.
+struct Reference {
+  Device device;
+  std::vector<Call> calls;
+  Sight before;
+  Sight after;
+};
+
+Faults& operator+=(Faults& faults, const Faults& more) {
+  faults.insert(faults.end(), more.begin(), more.end());
+  return faults;
+}
+
+// A later start on the same day, and the first one of the next.
+Faults finishTheDays(Device& device) {
+  Faults faults;
+  if (device.runDaily() != 0) {
+    faults.emplace_back("a later run on the same day failed");
+  }
+  device.setDay(kFirstDay + 1);
+  if (device.runDaily() != 0) {
+    faults.emplace_back("the next day's run failed");
+  }
+  return faults;
+}
+
+std::set<std::string> keysOf(const std::string& document) {
+  std::set<std::string> keys;
+  std::string error;
+  const auto value = readPtree(document, error);
+  if (value && value->dict() != nullptr) {
+    for (const auto& [name, part] : *value->dict()) {
+      if (part.dict() != nullptr) {
+        for (const auto& [key, ignored] : *part.dict()) {
+          keys.insert(key);
+        }
+      }
+    }
+  }
+  return keys;
+}
+
+std::vector<std::string> dailyLogs(const Sight& sight) {
+  std::vector<std::string> logs;
+  for (const auto& [name, content] : sight.logs) {
+    if (name.ends_with(kDailyLog)) {
+      logs.push_back(content);
+    }
+  }
+  return logs;
+}
+
+Faults missingFrom(const std::vector<std::string>& wanted, const std::vector<std::string>& there,
+                   const std::string& what) {
+  Faults faults;
+  const std::set<std::string_view> known(there.begin(), there.end());
+  for (const std::string& one : wanted) {
+    if (!known.contains(one)) {
+      faults.push_back(what + ": " + one.substr(0, 200));
+    }
+  }
+  if (faults.size() > 3) {
+    faults.resize(3);
+  }
+  return faults;
+}
+
+// Growth that an earlier day missed is counted by a later one, so days are added up.
+std::map<std::string, long long> usageOf(const Sight& sight) {
+  std::map<std::string, long long> sums;
+  for (const std::string& row : sight.counters) {
+    std::istringstream fields(row);
+    std::string kind;
+    std::string day;
+    std::string key;
+    std::string value;
+    std::getline(fields, kind, '\t');
+    std::getline(fields, day, '\t');
+    std::getline(fields, key, '\t');
+    std::getline(fields, value, '\t');
+    if (key.starts_with("datausage.")) {
+      sums[key] += std::stoll(value);
+    }
+  }
+  return sums;
+}
+
+/// `whole`: the run was only interrupted, so that nothing may be missing in the end.
+Faults judge(const Sight& sight, const Reference& reference, bool whole) {
+  Faults faults = sight.faults;
+  faults += missingFrom(reference.before.counters, sight.counters, "a counter is lost");
+  faults += missingFrom(sight.files, reference.after.files, "a file is left over");
+  if (usageOf(sight) != usageOf(reference.after)) {
+    faults.emplace_back("data usage was lost or counted twice");
+  }
+  std::set<std::string> known;
+  for (const std::string& log : dailyLogs(reference.after)) {
+    known.merge(keysOf(log));
+  }
+  const std::vector<std::string> logs = dailyLogs(sight);
+  for (const std::string& log : logs) {
+    std::set<std::string> keys = keysOf(log);
+    std::erase_if(keys, [&](const std::string& key) { return known.contains(key); });
+    if (!keys.empty()) {
+      faults.push_back("a log has a key of its own: " + *keys.begin());
+    }
+  }
+  if (whole) {
+    faults += missingFrom(reference.after.counters, sight.counters, "a row is missing");
+    faults += missingFrom(sight.counters, reference.after.counters, "a row is too much");
+    faults += missingFrom(dailyLogs(reference.after), logs, "a day's log is missing");
+  }
+  return faults;
+}
+
+/// `started`: not while the loader was at work. `worst`: the highest exit status that is promised.
+Faults judgeRun(const Outcome& outcome, bool killed, bool started, int worst = 0) {
+  Faults faults;
+  if (outcome.late) {
+    faults.push_back("took longer than " + std::to_string(kLongestRun) + " seconds");
+  } else if (!killed && started && outcome.signal != 0) {
+    faults.push_back(std::string("ended by a signal: ") + strsignal(outcome.signal) + "; " +
+                     outcome.standardError);
+  } else if (!killed && started && outcome.status > worst) {
+    faults.push_back("exit status " + std::to_string(outcome.status) + "; " +
+                     outcome.standardError);
+  }
+  return faults;
+}
+
+Faults runWithFault(const Reference& reference, const fs::path& folder, const Fault& fault,
+                    bool started) {
+  Device device(reference.device, folder);
+  const bool killed = fault.kind == Fault::Kind::Kill;
+  const Outcome outcome = runTraced(device.dailyCommand(), device.path(), fault);
+  Faults faults = judgeRun(outcome, killed, started);
+  if (!outcome.happened) {
+    return faults;  // threads make their calls in another order each time
+  }
+  faults += device.look().faults;
+  faults += finishTheDays(device);
+  faults += judge(device.look(), reference, killed || fault.kind == Fault::Kind::Short);
+  return faults;
+}
+
+std::shared_ptr<Reference> makeReference(const Programs& programs, const fs::path& folder) {
+  fs::create_directories(folder);
+  auto reference =
+      std::make_shared<Reference>(Reference{Device(programs, folder / "original"), {}, {}, {}});
+  reference->before = reference->device.look();
+  Device device(reference->device, folder / "reference");
+  Outcome outcome = runTraced(device.dailyCommand(), device.path());
+  Faults faults = judgeRun(outcome, false, true);
+  faults += outcome.notDurable;
+  faults += finishTheDays(device);
+  reference->after = device.look();
+  faults += reference->after.faults;
+  if (dailyLogs(reference->after).size() != 2) {
+    faults.emplace_back("two days did not make two logs");
+  }
+  if (!faults.empty()) {
+    std::string text = "without any fault:";
+    for (const std::string& fault : faults) {
+      text += "\n  " + fault;
+    }
+    throw std::runtime_error(text);
+  }
+  reference->calls = std::move(outcome.calls);
+  return reference;
+}
+
+// Before it the system's loader is at work, and what fails there keeps the program from starting.
+// Its last act is to let go of its list of libraries.
+std::size_t firstOwnCall(const std::vector<Call>& calls) {
+  const auto last = std::ranges::find(calls, SYS_munmap, &Call::number);
+  return static_cast<std::size_t>(last - calls.begin()) + 1;
+}
+
+std::vector<Case> failingCalls(const Programs& programs, const fs::path& folder, std::uint32_t seed,
+                               bool full) {
+  const auto reference = makeReference(programs, folder / "calls");
+  const std::size_t own = firstOwnCall(reference->calls);
+  std::vector<Case> cases;
+  std::mt19937 random(seed);
+  for (std::size_t index = 0; index < reference->calls.size(); ++index) {
+    const Call& call = reference->calls[index];
+    const std::string place = ":" + nameOfCall(call.number) + ":" + std::to_string(index + 1);
+    const bool started = index >= own;
+    const auto add = [&](const std::string& what, Fault fault) {
+      fault.call = index + 1;
+      cases.push_back({what + place, [=](const fs::path& work) {
+                         return runWithFault(*reference, work, fault, started);
+                       }});
+    };
+    const std::vector<int>& errors = fittingErrors(call.number);
+    const std::size_t one = errors.empty() ? 0 : random() % errors.size();
+    for (std::size_t each = 0; each < errors.size(); ++each) {
+      if (full || each == one) {
+        add(strerrorname_np(errors[each]),
+            {.kind = Fault::Kind::Error, .number = call.number, .error = errors[each]});
+      }
+    }
+    if (transfersBytes(call.number) && started) {
+      add("short", {.kind = Fault::Kind::Short, .number = call.number});
+    }
+    add("kill", {.kind = Fault::Kind::Kill});
+  }
+  return cases;
+}
+
+std::vector<Case> fullDisk(const Programs& programs, const fs::path& folder, std::uint32_t seed,
+                           bool full) {
+  const auto reference = makeReference(programs, folder / "disk");
+  std::uint64_t written = 0;
+  for (const Call& call : reference->calls) {
+    const std::string name = nameOfCall(call.number);
+    written += (name == "write" || name == "pwrite64") && call.path.starts_with(folder.string())
+                   ? call.size
+                   : 0;
+  }
+  const std::uint64_t step = full ? 61 : 997;
+  std::vector<Case> cases;
+  for (std::uint64_t room = seed % step; room < written; room += step) {
+    const Fault fault{.kind = Fault::Kind::DiskFull, .room = room};
+    cases.push_back(
+        {"disk full after " + std::to_string(room) + " bytes",
+         [=](const fs::path& work) { return runWithFault(*reference, work, fault, true); }});
+  }
+  return cases;
+}
+
+/// Another program that changes the device while the daily run goes on.
+struct Neighbour {
+  std::string name;
+  std::vector<std::string> command;
+  std::vector<std::string> question;  ///< what `vespctl` is asked afterwards, without the device
+  std::string answer;
+};
+
+Faults runBeside(const Reference& reference, const fs::path& folder, std::size_t call,
+                 const Neighbour& neighbour) {
+  Device device(reference.device, folder);
+  std::unique_ptr<Companion> companion;
+  const bool isDaily = neighbour.command.empty();
+  const auto start = [&] {
+    companion = std::make_unique<Companion>(
+        isDaily ? device.dailyCommand()
+                : device.controlCommand(neighbour.command.front(),
+                                        {neighbour.command.begin() + 1, neighbour.command.end()}),
+        device.path());
+    // A neighbour that waits for a lock of the paused run goes on after it.
+    companion->endsWithin(30);
+  };
+  const Outcome outcome =
+      runTraced(device.dailyCommand(), device.path(),
+                {.kind = Fault::Kind::Pause, .call = call, .whilePaused = start});
+  Faults faults = judgeRun(outcome, false, true);
+  if (!companion) {
+    return faults;
+  }
+  if (companion->status() != 0) {
+    faults.push_back("the neighbour failed: " + companion->output());
+  }
+  std::string answer;
+  if (!isDaily) {
+    device.control(neighbour.question.front(),
+                   {neighbour.question.begin() + 1, neighbour.question.end()}, answer);
+    if (answer.find(neighbour.answer) == std::string::npos) {
+      faults.push_back("what the neighbour wrote is lost");
+    }
+  }
+  if (neighbour.name == "counters") {
+    return faults += device.look().faults;
+  }
+  faults += finishTheDays(device);
+  const Sight sight = device.look();
+  faults += judge(sight, reference, true);
+  if (dailyLogs(sight).size() != 2) {
+    faults.push_back(std::to_string(dailyLogs(sight).size()) + " logs of two days");
+  }
+  return faults;
+}
+
+std::vector<Case> neighbours(const Programs& programs, const fs::path& folder, std::uint32_t seed,
+                             bool full) {
+  const auto reference = makeReference(programs, folder / "neighbours");
+  const std::string day = std::to_string(kFirstDay);
+  const std::vector<Neighbour> others = {
+      {"daily run", {}, {}, {}},
+      {"preferences",
+       {"prefs", "set", "com.quill.aggregated.vesprun", "torture", "7"},
+       {"prefs", "get", "com.quill.aggregated.vesprun", "torture"},
+       "7"},
+      {"counters",
+       {"counters", "add", "host.torture", "7"},
+       {"counters", "dump"},
+       "scalar\t" + day + "\thost.torture\t7\n"},
+  };
+  std::vector<Case> cases;
+  const std::size_t step = full ? 3 : 23;
+  for (std::size_t call = firstOwnCall(reference->calls) + seed % step;
+       call < reference->calls.size(); call += step) {
+    for (const Neighbour& neighbour : others) {
+      cases.push_back(
+          {neighbour.name + " beside call " + std::to_string(call),
+           [=](const fs::path& work) { return runBeside(*reference, work, call, neighbour); }});
+    }
+  }
+  return cases;
+}
+
+/// A `vespctl` command on a device; `judge` says what is wrong after a run with a fault.
+struct Command {
+  std::string name;
+  std::shared_ptr<Device> original;
+  std::string command;
+  std::vector<std::string> rest;
+  std::function<Faults(Device& device, const Outcome& outcome, bool killed)> judge;
+};
+
+Faults runCommand(const Command& command, const fs::path& folder, const Fault& fault,
+                  bool started) {
+  Device device(*command.original, folder);
+  const bool killed = fault.kind == Fault::Kind::Kill;
+  const Outcome outcome =
+      runTraced(device.controlCommand(command.command, command.rest), device.path(), fault);
+  Faults faults = judgeRun(outcome, killed, started, 1);
+  if (outcome.status == 1 && outcome.standardError.empty()) {
+    faults.emplace_back("it failed without a word");
+  }
+  return faults += command.judge(device, outcome, killed);
+}
+
+// Each call fails in one way or, when wanted, in all, and is the last one.
+std::vector<Case> casesOf(const Command& command, const fs::path& folder, std::uint32_t seed,
+                          bool full) {
+  Device device(*command.original, folder / "reference");
+  const Outcome reference =
+      runTraced(device.controlCommand(command.command, command.rest), device.path());
+  Faults wrong = reference.notDurable;
+  wrong += judgeRun(reference, false, true);
+  wrong += command.judge(device, reference, false);
+  if (!wrong.empty()) {
+    throw std::runtime_error(command.name + " without any fault: " + wrong.front());
+  }
+  const std::size_t own = firstOwnCall(reference.calls);
+  std::vector<Case> cases;
+  std::mt19937 random(seed);
+  for (std::size_t index = 0; index < reference.calls.size(); ++index) {
+    const int number = reference.calls[index].number;
+    const auto add = [&](const std::string& what, Fault fault) {
+      fault.call = index + 1;
+      const bool started = index >= own;
+      cases.push_back(
+          {command.name + ":" + what + ":" + nameOfCall(number) + ":" + std::to_string(index + 1),
+           [=](const fs::path& work) { return runCommand(command, work, fault, started); }});
+    };
+    const std::vector<int>& errors = fittingErrors(number);
+    const std::size_t one = errors.empty() ? 0 : random() % errors.size();
+    for (std::size_t each = 0; each < errors.size(); ++each) {
+      if (full || each == one) {
+        add(strerrorname_np(errors[each]),
+            {.kind = Fault::Kind::Error, .number = number, .error = errors[each]});
+      }
+    }
+    add("kill", {.kind = Fault::Kind::Kill});
+  }
+  return cases;
+}
+
+/// All lines or none, and never "done" without them.
+std::vector<Case> imports(const Programs& programs, const fs::path& folder, std::uint32_t seed,
+                          bool full) {
+  const auto original = std::make_shared<Device>(programs, folder / "imports");
+  std::string rows;
+  for (int row = 0; row < 300; ++row) {
+    rows += "scalar\t" + std::to_string(kFirstDay) + "\thost.imported." + std::to_string(row) +
+            "\t" + std::to_string(row) + '\n';
+  }
+  writeFile(original->path() + "/rows", rows);
+  const std::vector<std::string> rest{"import", original->path() + "/rows"};
+  const std::vector<std::string> before = original->look().counters;
+  Device device(*original, folder / "imported");
+  std::string output;
+  device.control("counters", rest, output);
+  const std::vector<std::string> after = device.look().counters;
+  const auto judge = [=](Device& changed, const Outcome& outcome, bool /*killed*/) {
+    const Sight sight = changed.look();
+    Faults faults = sight.faults;
+    if (sight.counters != before && sight.counters != after) {
+      faults.emplace_back("some lines are there and some are not");
+    }
+    if (outcome.status == 0 && sight.counters != after) {
+      faults.emplace_back("it said done, and nothing is there");
+    }
+    return faults;
+  };
+  return casesOf({"import", original, "counters", rest, judge}, folder, seed, full);
+}
+
+/// Recorded files of a small machine that has counted for `hours`.
+void recordMachine(const fs::path& root, std::uint64_t hours) {
+  const std::string n = std::to_string(hours * 3600);
+  const std::string ticks = std::to_string(hours * 360000);
+  writeFile(root / "proc/sys/kernel/random/boot_id", "6f0c1e2d-0000-4000-8000-000000000001\n");
+  writeFile(root / "proc/uptime", n + ".00 " + n + ".00\n");
+  writeFile(root / "proc/stat", "cpu  " + ticks + " 0 " + ticks + " " + ticks + " 0 0 0 0 0 0\n" +
+                                    "ctxt " + n + "\nprocesses " + n + "\n");
+  writeFile(root / "proc/meminfo", "MemTotal: 9000000 kB\nMemAvailable: 4000000 kB\n");
+  writeFile(root / "proc/vmstat", "pgpgin " + n + "\npgpgout " + n + "\noom_kill 3\n");
+  writeFile(root / "proc/pressure/io",
+            "some avg10=0.00 avg60=0.00 avg300=0.00 total=" + n +
+                "000\nfull avg10=0.00 avg60=0.00 avg300=0.00 total=" + n + "000\n");
+  for (const char* disk : {"sda", "sdb"}) {
+    const fs::path block = root / "sys/block" / disk;
+    writeFile(block / "stat", n + " 0 " + n + " 1 " + n + " 0 " + n + " 1 0 " + n + " 2\n");
+    writeFile(block / "diskseq", "1\n");
+  }
+  const fs::path statistics = root / "sys/class/net/eth0/statistics";
+  for (const char* name : {"rx_bytes", "tx_bytes", "rx_packets", "tx_packets"}) {
+    writeFile(statistics / name, n + '\n');
+  }
+  writeFile(root / "sys/class/net/eth0/ifindex", "2\n");
+  writeFile(root / "sys/class/thermal/thermal_zone0/type", "cpu\n");
+  writeFile(root / "sys/class/thermal/thermal_zone0/temp", "41000\n");
+}
+
+/// Growth is counted once, whichever of three collections fails.
+std::vector<Case> collections(const Programs& programs, const fs::path& folder, std::uint32_t seed,
+                              bool full) {
+  const auto original = std::make_shared<Device>(programs, folder / "collections");
+  const auto stage = [=](int number) {
+    return (folder / ("machine-" + std::to_string(number))).string();
+  };
+  for (int number = 1; number <= 3; ++number) {
+    recordMachine(stage(number), static_cast<std::uint64_t>(number * number));
+  }
+  const auto collect = [=](Device& device, int number) {
+    Faults faults;
+    std::string output;
+    if (device.control("collect", {"--root", stage(number)}, output) != 0) {
+      faults.push_back("a collection failed: " + output);
+    }
+    return faults;
+  };
+  const auto figures = [](const Sight& sight) {
+    std::vector<std::string> rows = sight.counters;
+    std::erase_if(rows, [](const std::string& row) {
+      return !row.starts_with("scalar") || row.find("\tlinux.") == std::string::npos;
+    });
+    return rows;
+  };
+  collect(*original, 1);
+  Device device(*original, folder / "collected");
+  collect(device, 2);
+  collect(device, 3);
+  const std::vector<std::string> expected = figures(device.look());
+  const auto judge = [=](Device& changed, const Outcome& /*outcome*/, bool /*killed*/) {
+    Faults faults = collect(changed, 3);
+    const Sight sight = changed.look();
+    faults += sight.faults;
+    faults += missingFrom(expected, figures(sight), "growth is not what it was");
+    faults += missingFrom(figures(sight), expected, "growth from nowhere");
+    return faults;
+  };
+  return casesOf({"collect", original, "collect", {"--root", stage(2)}, judge}, folder, seed, full);
+}
+
+std::string damaged(std::string content, const std::string& how, std::mt19937& random) {
+  if (content.empty()) {
+    return how == "noise" ? std::string(100, '\xff') : content;
+  }
+  if (how == "cut") {
+    content.resize(random() % content.size());
+  } else if (how == "flipped") {
+    content[random() % content.size()] ^= static_cast<char>(1U << (random() % 8));
+  } else if (how == "torn") {
+    // A block that was never written.
+    const std::size_t from = random() % content.size();
+    content.replace(from, std::min<std::size_t>(512, content.size() - from), 512, '\0');
+  } else {
+    std::ranges::generate(content, [&] { return static_cast<char>(random()); });
+  }
+  return content;
+}
+
+std::vector<Case> damages(const Programs& programs, const fs::path& folder, std::uint32_t seed,
+                          bool full) {
+  const auto original = std::make_shared<Device>(programs, folder / "damages");
+  original->runDaily();
+  original->setDay(kFirstDay + 1);
+  std::vector<Case> cases;
+  for (const fs::directory_entry& entry : fs::recursive_directory_iterator(original->path())) {
+    const std::string name = fs::relative(entry.path(), original->path()).string();
+    if (!entry.is_regular_file() || name.starts_with("outbox/logs/")) {
+      continue;
+    }
+    for (const char* how : {"cut", "flipped", "torn", "noise"}) {
+      for (std::uint32_t time = 0; time < (full ? 20U : 2U); ++time) {
+        const std::uint32_t ownSeed = seed * 31 + time;
+        cases.push_back({name + " " + how + " " + std::to_string(time), [=](const fs::path& work) {
+                           Device device(*original, work);
+                           std::mt19937 random(ownSeed);
+                           const fs::path path = fs::path(device.path()) / name;
+                           writeFile(path, damaged(readFile(path), how, random));
+                           Faults faults;
+                           for (int run = 0; run < 2; ++run) {
+                             if (const int status = device.runDaily(); status != 0) {
+                               faults.push_back("exit status " + std::to_string(status));
+                             }
+                           }
+                           for (const std::string& fault : device.look().faults) {
+                             if (!fault.starts_with(name) && !fault.starts_with("the counters")) {
+                               faults.push_back(fault);
+                             }
+                           }
+                           return faults;
+                         }});
+      }
+    }
+  }
+  return cases;
+}
+
+/// A clock that mostly goes on by a day, and sometimes stays, goes back or jumps ahead.
+Faults liveThrough(const Device& original, const fs::path& folder, std::uint32_t seed, int days) {
+  Device device(original, folder);
+  std::mt19937 random(seed);
+  Faults faults;
+  std::vector<std::string> expected;
+  int day = kFirstDay + static_cast<int>(random() % 3650);
+  int stored = kFirstDay - 1;
+  for (int lived = 0; lived < days && faults.empty(); ++lived) {
+    const auto jump = random() % 100;
+    day += jump < 80   ? 1
+           : jump < 88 ? 0
+           : jump < 94 ? -static_cast<int>(random() % 40)
+                       : static_cast<int>(random() % 400);
+    device.setDay(day);
+    std::string output;
+    if (device.control("counters", {"set", "host.memory.MemFree", "65536"}, output) != 0 ||
+        device.control("counters",
+                       {"set", "host.memory.MemFree", "65536", "--day", std::to_string(day - 1)},
+                       output) != 0) {
+      faults.push_back("a counter cannot be set: " + output);
+    }
+    if (device.runDaily() != 0) {
+      faults.emplace_back("the run failed");
+    }
+    if (day - 1 > stored) {
+      stored = day - 1;
+      expected.push_back(std::to_string(day - 1));
+    }
+    if (dailyLogs(device.look()).size() != expected.size()) {
+      faults.push_back("day " + std::to_string(day) + ", the " + std::to_string(lived) +
+                       ". start: " + std::to_string(dailyLogs(device.look()).size()) +
+                       " logs instead of " + std::to_string(expected.size()));
+    }
+  }
+  return faults;
+}
+
+std::vector<Case> years(const Programs& programs, const fs::path& folder, std::uint32_t seed,
+                        bool full) {
+  const auto original = std::make_shared<Device>(programs, folder / "years");
+  original->describe(R"({"registry": null})");
+  original->runDaily();
+  for (const fs::directory_entry& entry :
+       fs::directory_iterator(original->path() + "/outbox/logs")) {
+    fs::remove(entry.path());
+  }
+  std::vector<Case> cases;
+  for (std::uint32_t year = 0; year < (full ? 100U : 10U); ++year) {
+    cases.push_back({"year " + std::to_string(year), [=](const fs::path& work) {
+                       return liveThrough(*original, work, seed * 1000 + year, 365);
+                     }});
+  }
+  return cases;
+}
+
+}  // namespace
+
+std::vector<Scenario> scenarios() {
+  return {
+      {"every call of a daily run fails or is its last", failingCalls},
+      {"the disk gets full during a daily run", fullDisk},
+      {"others write during a daily run", neighbours},
+      {"every call of an import fails or is its last", imports},
+      {"every call of a collection fails or is its last", collections},
+      {"files are damaged", damages},
+      {"the clock jumps through ten years", years},
+  };
+}
+
+}  // namespace vesprun::torture

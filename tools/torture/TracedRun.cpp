@@ -1,0 +1,492 @@
+#include "TracedRun.h"
+
+#include <fcntl.h>
+#include <signal.h>
+#include <sys/mman.h>
+#include <sys/ptrace.h>
+#include <sys/syscall.h>
+#include <sys/uio.h>
+#include <sys/user.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <climits>
+#include <cstring>
+#include <map>
+#include <set>
+#include <stdexcept>
+
+#if !defined(__x86_64__)
+#error "torture changes system calls through the registers of x86-64"
+#endif
+
+namespace vesprun::torture {
+namespace {
+
+enum class Paths { None, Descriptor, First, AtFirst };
+
+struct CallRow {
+  int number;
+  const char* name;
+  Paths paths;
+  std::vector<int> errors;
+};
+
+// Left out: what ends a process or a thread, waits, or only asks for numbers of the process.
+const std::vector<CallRow>& callRows() {
+  static const std::vector<CallRow> rows = {
+      {SYS_access, "access", Paths::First, {EIO}},
+      {SYS_openat, "openat", Paths::AtFirst, {EMFILE, EIO, ENOMEM}},
+      {SYS_read, "read", Paths::Descriptor, {EIO}},
+      {SYS_pread64, "pread64", Paths::Descriptor, {EIO}},
+      {SYS_write, "write", Paths::Descriptor, {ENOSPC, EIO}},
+      {SYS_pwrite64, "pwrite64", Paths::Descriptor, {ENOSPC, EIO}},
+      {SYS_fsync, "fsync", Paths::Descriptor, {EIO, ENOSPC}},
+      {SYS_fdatasync, "fdatasync", Paths::Descriptor, {EIO}},
+      {SYS_ftruncate, "ftruncate", Paths::Descriptor, {EIO, ENOSPC}},
+      {SYS_lseek, "lseek", Paths::Descriptor, {EIO}},
+      {SYS_newfstatat, "newfstatat", Paths::AtFirst, {EIO, ENOMEM}},
+      {SYS_fstat, "fstat", Paths::Descriptor, {EIO}},
+      {SYS_statfs, "statfs", Paths::First, {EIO}},
+      {SYS_getdents64, "getdents64", Paths::Descriptor, {EIO}},
+      {SYS_mkdir, "mkdir", Paths::First, {ENOSPC}},
+      {SYS_mkdirat, "mkdirat", Paths::AtFirst, {ENOSPC}},
+      {SYS_rename, "rename", Paths::First, {EIO}},
+      {SYS_renameat, "renameat", Paths::AtFirst, {ENOSPC, EIO}},
+      {SYS_renameat2, "renameat2", Paths::AtFirst, {ENOSPC}},
+      {SYS_linkat, "linkat", Paths::AtFirst, {ENOSPC, EIO}},
+      {SYS_unlink, "unlink", Paths::First, {EIO}},
+      {SYS_unlinkat, "unlinkat", Paths::AtFirst, {EIO}},
+      {SYS_fchmod, "fchmod", Paths::Descriptor, {EPERM}},
+      {SYS_fchown, "fchown", Paths::Descriptor, {EPERM}},
+      {SYS_flock, "flock", Paths::Descriptor, {ENOLCK}},
+      {SYS_fcntl, "fcntl", Paths::Descriptor, {ENOLCK}},
+      {SYS_close, "close", Paths::Descriptor, {EIO}},
+      {SYS_mmap, "mmap", Paths::None, {ENOMEM}},
+      {SYS_mremap, "mremap", Paths::None, {ENOMEM}},
+      {SYS_brk, "brk", Paths::None, {ENOMEM}},
+      {SYS_mprotect, "mprotect", Paths::None, {ENOMEM}},
+      {SYS_clone3, "clone3", Paths::None, {EAGAIN}},
+      {SYS_getrandom, "getrandom", Paths::None, {}},
+      {SYS_uname, "uname", Paths::None, {}},
+      {SYS_socket, "socket", Paths::None, {EMFILE}},
+      {SYS_bind, "bind", Paths::None, {EADDRINUSE}},
+      {SYS_listen, "listen", Paths::None, {EADDRINUSE}},
+      {SYS_accept4, "accept4", Paths::None, {EMFILE}},
+      {SYS_sendto, "sendto", Paths::None, {EPIPE}},
+      {SYS_recvfrom, "recvfrom", Paths::None, {ECONNRESET}},
+      {SYS_poll, "poll", Paths::None, {ENOMEM}},
+      {SYS_ppoll, "ppoll", Paths::None, {ENOMEM}},
+  };
+  return rows;
+}
+
+const CallRow* rowOf(int number) {
+  const auto row = std::ranges::find(callRows(), number, &CallRow::number);
+  return row == callRows().end() ? nullptr : &*row;
+}
+
+std::string linkTarget(const std::string& link) {
+  char target[PATH_MAX];
+  const ssize_t length = readlink(link.c_str(), target, sizeof target);
+  return length > 0 ? std::string(target, static_cast<std::size_t>(length)) : std::string();
+}
+
+std::string descriptorPath(pid_t process, std::uint64_t descriptor) {
+  const std::string folder = "/proc/" + std::to_string(process);
+  return static_cast<int>(descriptor) == AT_FDCWD
+             ? linkTarget(folder + "/cwd")
+             : linkTarget(folder + "/fd/" + std::to_string(descriptor));
+}
+
+std::string textAt(pid_t process, std::uint64_t address) {
+  std::string text;
+  char piece[64];
+  while (text.size() < PATH_MAX) {
+    // Up to the end of the page: the next one may not be there.
+    const std::uint64_t wanted = std::min<std::uint64_t>(sizeof piece, 4096 - address % 4096);
+    const iovec local{piece, wanted};
+    const iovec remote{reinterpret_cast<void*>(address), wanted};  // NOLINT: the traced process's
+    const ssize_t got = process_vm_readv(process, &local, 1, &remote, 1, 0);
+    if (got <= 0) {
+      break;
+    }
+    const auto length = static_cast<std::size_t>(got);
+    const auto* end = static_cast<const char*>(std::memchr(piece, 0, length));
+    text.append(piece, end == nullptr ? length : static_cast<std::size_t>(end - piece));
+    if (end != nullptr) {
+      break;
+    }
+    address += length;
+  }
+  return text;
+}
+
+std::string pathAt(pid_t process, std::uint64_t folder, std::uint64_t address) {
+  std::string path = textAt(process, address);
+  if (path.empty()) {
+    return descriptorPath(process, folder);
+  }
+  return path.front() == '/' ? path : descriptorPath(process, folder) + '/' + path;
+}
+
+/// Which bytes and names would be lost if the power went now. Lines of `.jsonl` files are appended
+/// without waiting for the disk, and the newest log number is only remembered to save a search.
+class Durability {
+ public:
+  explicit Durability(std::string folder) : _folder(std::move(folder)) {}
+
+  void written(const std::string& path) {
+    if (counts(path)) {
+      _dirtyFiles.insert(path);
+    }
+  }
+  void flushed(const std::string& path) {
+    _dirtyFiles.erase(path);
+    _dirtyFolders.erase(path);
+  }
+  void named(const std::string& from, const std::string& to) {
+    if (!counts(to)) {
+      return;
+    }
+    if (_dirtyFiles.erase(from) > 0) {
+      _faults.push_back(to + " got its name before its bytes were flushed");
+    }
+    _dirtyFolders.insert(to.substr(0, to.rfind('/')));
+  }
+  void removed(const std::string& path) {
+    _dirtyFiles.erase(path);
+    if (counts(path) && path.ends_with("-journal")) {  // its end is the end of the transaction
+      _dirtyFolders.insert(path.substr(0, path.rfind('/')));
+    }
+  }
+
+  std::vector<std::string> atTheEnd() {
+    for (const std::string& path : _dirtyFiles) {
+      _faults.push_back(path + " was written and never flushed");
+    }
+    for (const std::string& path : _dirtyFolders) {
+      _faults.push_back(path + " lost or gained a name and was never flushed");
+    }
+    return _faults;
+  }
+
+ private:
+  bool counts(const std::string& path) const {
+    return path.starts_with(_folder + '/') && !path.ends_with(".jsonl") &&
+           !path.ends_with("/.log-number");
+  }
+
+  std::string _folder;
+  std::set<std::string> _dirtyFiles;
+  std::set<std::string> _dirtyFolders;
+  std::vector<std::string> _faults;
+};
+
+class TimeLimit {
+ public:
+  TimeLimit() {
+    _expired = 0;
+    struct sigaction action {};
+    action.sa_handler = [](int) { _expired = 1; };
+    sigaction(SIGALRM, &action, nullptr);
+    alarm(kLongestRun);
+  }
+  TimeLimit(const TimeLimit&) = delete;
+  TimeLimit& operator=(const TimeLimit&) = delete;
+  ~TimeLimit() { alarm(0); }
+  static bool expired() { return _expired != 0; }
+
+ private:
+  static inline volatile sig_atomic_t _expired = 0;
+};
+
+user_regs_struct registersOf(pid_t thread) {
+  user_regs_struct registers{};
+  ptrace(PTRACE_GETREGS, thread, nullptr, &registers);
+  return registers;
+}
+
+void setRegisters(pid_t thread, user_regs_struct& registers) {
+  ptrace(PTRACE_SETREGS, thread, nullptr, &registers);
+}
+
+class Tracer {
+ public:
+  Tracer(pid_t child, const std::string& folder, const Fault& fault)
+      : _child(child), _folder(folder), _fault(fault), _durability(folder) {}
+
+  /// Follows the program to its end.
+  Outcome run();
+
+ private:
+  /// A thread's call between its entry and its exit.
+  struct Pending {
+    int number;
+    int error;         ///< the answer, when the call is not made
+    std::string from;  ///< of a call that gives a name: paths as they were before it
+    std::string to;
+  };
+
+  void atEntry(pid_t thread);
+  void atExit(pid_t thread);
+  void record(pid_t thread, const user_regs_struct& registers, Pending& pending);
+  void limitGrowth(pid_t thread, user_regs_struct& registers, Pending& pending);
+  void replaceCall(pid_t thread, user_regs_struct& registers, Pending& pending, int error);
+  void shorten(pid_t thread, user_regs_struct& registers, std::uint64_t size);
+
+  pid_t _child;
+  std::string _folder;
+  const Fault& _fault;
+  Durability _durability;
+  Outcome _outcome;
+  std::size_t _count = 0;
+  std::uint64_t _grown = 0;
+  std::uint64_t _break = 0;
+  std::map<pid_t, Pending> _pending;
+};
+
+void Tracer::replaceCall(pid_t thread, user_regs_struct& registers, Pending& pending, int error) {
+  pending.error = error;
+  _outcome.happened = true;
+  if (pending.number != SYS_close) {  // which closes, whatever it answers
+    registers.orig_rax = static_cast<unsigned long long>(-1);
+    setRegisters(thread, registers);
+  }
+}
+
+void Tracer::shorten(pid_t thread, user_regs_struct& registers, std::uint64_t size) {
+  registers.rdx = size;
+  setRegisters(thread, registers);
+  _outcome.happened = true;
+}
+
+void Tracer::limitGrowth(pid_t thread, user_regs_struct& registers, Pending& pending) {
+  if ((pending.number != SYS_write && pending.number != SYS_pwrite64) ||
+      !descriptorPath(thread, registers.rdi).starts_with(_folder + '/')) {
+    return;
+  }
+  const std::uint64_t left = _fault.room - _grown;
+  const std::uint64_t wanted = registers.rdx;
+  if (left == 0) {
+    replaceCall(thread, registers, pending, ENOSPC);
+  } else if (wanted > left) {
+    shorten(thread, registers, left);
+  }
+  _grown += std::min(wanted, left);
+}
+
+void Tracer::record(pid_t thread, const user_regs_struct& registers, Pending& pending) {
+  Call call{pending.number, {}, 0};
+  const CallRow* row = rowOf(pending.number);
+  switch (row == nullptr ? Paths::None : row->paths) {
+    case Paths::None:
+      break;
+    case Paths::Descriptor:
+      call.path = descriptorPath(thread, registers.rdi);
+      call.size = registers.rdx;
+      break;
+    case Paths::First:
+      call.path = pathAt(thread, static_cast<std::uint64_t>(AT_FDCWD), registers.rdi);
+      break;
+    case Paths::AtFirst:
+      call.path = pathAt(thread, registers.rdi, registers.rsi);
+      break;
+  }
+  pending.from = call.path;
+  if (pending.number == SYS_renameat || pending.number == SYS_linkat) {
+    pending.to = pathAt(thread, registers.rdx, registers.r10);
+  } else if (pending.number == SYS_rename) {
+    pending.to = pathAt(thread, static_cast<std::uint64_t>(AT_FDCWD), registers.rsi);
+  }
+  _outcome.calls.push_back(std::move(call));
+}
+
+void Tracer::atEntry(pid_t thread) {
+  user_regs_struct registers = registersOf(thread);
+  Pending& pending = _pending[thread];
+  pending = {static_cast<int>(registers.orig_rax), 0, {}, {}};
+  ++_count;
+  if (_fault.kind == Fault::Kind::None) {
+    record(thread, registers, pending);
+  } else if (_fault.kind == Fault::Kind::DiskFull) {
+    limitGrowth(thread, registers, pending);
+  } else if (_count < _fault.call || _outcome.happened ||
+             (_fault.number != 0 && _fault.number != pending.number)) {
+    return;
+  } else if (_fault.kind == Fault::Kind::Error) {
+    replaceCall(thread, registers, pending, _fault.error);
+  } else if (_fault.kind == Fault::Kind::Short) {
+    shorten(thread, registers, std::max<std::uint64_t>(registers.rdx / 2, 1));
+  } else if (_fault.kind == Fault::Kind::Kill) {
+    kill(_child, SIGKILL);
+    _outcome.happened = true;
+  } else {
+    _fault.whilePaused();
+    _outcome.happened = true;
+  }
+}
+
+void Tracer::atExit(pid_t thread) {
+  user_regs_struct registers = registersOf(thread);
+  const Pending& pending = _pending[thread];
+  if (pending.error != 0) {
+    // A program break that cannot grow is answered by the one that was.
+    registers.rax =
+        pending.number == SYS_brk ? _break : static_cast<unsigned long long>(-pending.error);
+    setRegisters(thread, registers);
+  } else if (pending.number == SYS_brk) {
+    _break = registers.rax;
+  } else if (_fault.kind == Fault::Kind::None && static_cast<long long>(registers.rax) >= 0) {
+    switch (pending.number) {
+      case SYS_write:
+      case SYS_pwrite64:
+      case SYS_ftruncate:
+        _durability.written(pending.from);
+        break;
+      case SYS_fsync:
+      case SYS_fdatasync:
+        _durability.flushed(pending.from);
+        break;
+      case SYS_rename:
+      case SYS_renameat:
+      case SYS_linkat:
+        _durability.named(pending.from, pending.to);
+        break;
+      case SYS_unlink:
+      case SYS_unlinkat:
+        _durability.removed(pending.from);
+        break;
+      default:
+        break;
+    }
+  }
+}
+
+Outcome Tracer::run() {
+  const TimeLimit limit;
+  while (true) {
+    int status = 0;
+    const pid_t thread = waitpid(-_child, &status, __WALL);
+    if (thread < 0) {
+      if (errno == EINTR && TimeLimit::expired()) {
+        _outcome.late = true;
+        kill(_child, SIGKILL);
+        continue;
+      }
+      if (errno == EINTR) {
+        continue;
+      }
+      break;
+    }
+    if (WIFEXITED(status) || WIFSIGNALED(status)) {
+      if (thread == _child) {
+        _outcome.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+        _outcome.signal = WIFSIGNALED(status) ? WTERMSIG(status) : 0;
+        break;
+      }
+      continue;
+    }
+    int signal = WSTOPSIG(status);
+    if (signal == (SIGTRAP | 0x80)) {
+      __ptrace_syscall_info info{};
+      ptrace(PTRACE_GET_SYSCALL_INFO, thread, sizeof info, &info);
+      if (info.op == PTRACE_SYSCALL_INFO_ENTRY) {
+        atEntry(thread);
+      } else if (info.op == PTRACE_SYSCALL_INFO_EXIT) {
+        atExit(thread);
+      }
+      signal = 0;
+    } else if (status >> 16 != 0 || signal == SIGSTOP || signal == SIGTRAP) {
+      signal = 0;  // a new thread, or the program's start
+    }
+    ptrace(PTRACE_SYSCALL, thread, nullptr, signal);
+  }
+  _outcome.notDurable = _durability.atTheEnd();
+  return std::move(_outcome);
+}
+
+/// What the program prints goes into a file: a pipe would have to be emptied beside the tracing.
+class PrintedText {
+ public:
+  PrintedText() : _file(memfd_create("printed", MFD_CLOEXEC)) {}
+  PrintedText(const PrintedText&) = delete;
+  PrintedText& operator=(const PrintedText&) = delete;
+  ~PrintedText() { close(_file); }
+  int descriptor() const { return _file; }
+  std::string text() const {
+    std::string text(static_cast<std::size_t>(std::max<off_t>(lseek(_file, 0, SEEK_END), 0)), ' ');
+    const ssize_t got = pread(_file, text.data(), text.size(), 0);
+    text.resize(static_cast<std::size_t>(std::max<ssize_t>(got, 0)));
+    return text;
+  }
+
+ private:
+  int _file;
+};
+
+}  // namespace
+
+Outcome runTraced(const std::vector<std::string>& command, const std::string& folder,
+                  const Fault& fault) {
+  std::vector<char*> arguments;
+  for (const std::string& argument : command) {
+    arguments.push_back(const_cast<char*>(argument.c_str()));  // NOLINT: execv changes nothing
+  }
+  arguments.push_back(nullptr);
+  const PrintedText output;
+  const PrintedText errors;
+  const pid_t child = fork();
+  if (child < 0) {
+    throw std::runtime_error("fork: " + std::string(std::strerror(errno)));
+  }
+  if (child == 0) {
+    dup2(output.descriptor(), STDOUT_FILENO);
+    dup2(errors.descriptor(), STDERR_FILENO);
+    setenv("MALLOC_TOP_PAD_", "0", 1);  // more often a call for memory that can fail
+    // A group of its own: other children of this process are not the tracer's.
+    if (setpgid(0, 0) == 0 && chdir(folder.c_str()) == 0 &&
+        ptrace(PTRACE_TRACEME, 0, nullptr, nullptr) == 0) {
+      raise(SIGSTOP);
+      execv(arguments[0], arguments.data());
+    }
+    _exit(126);
+  }
+  int status = 0;
+  waitpid(child, &status, 0);
+  if (!WIFSTOPPED(status) ||
+      ptrace(PTRACE_SETOPTIONS, child, nullptr,
+             PTRACE_O_TRACESYSGOOD | PTRACE_O_TRACECLONE | PTRACE_O_TRACEEXEC |
+                 PTRACE_O_EXITKILL) != 0 ||
+      ptrace(PTRACE_CONT, child, nullptr, nullptr) != 0) {
+    throw std::runtime_error("the system does not let this process trace another");
+  }
+  waitpid(child, &status, 0);  // the program's start
+  if (!WIFSTOPPED(status)) {
+    throw std::runtime_error(command.front() + " cannot be started");
+  }
+  ptrace(PTRACE_SYSCALL, child, nullptr, 0);
+  Outcome outcome = Tracer(child, folder, fault).run();
+  outcome.standardError = errors.text();
+  return outcome;
+}
+
+const std::vector<int>& fittingErrors(int number) {
+  static const std::vector<int> none;
+  const CallRow* row = rowOf(number);
+  return row == nullptr ? none : row->errors;
+}
+
+bool transfersBytes(int number) {
+  return number == SYS_read || number == SYS_pread64 || number == SYS_write ||
+         number == SYS_pwrite64;
+}
+
+std::string nameOfCall(int number) {
+  const CallRow* row = rowOf(number);
+  return row == nullptr ? "call " + std::to_string(number) : row->name;
+}
+
+}  // namespace vesprun::torture

@@ -1,0 +1,61 @@
+#pragma once
+
+#include <cstdint>
+#include <functional>
+#include <string>
+#include <vector>
+
+namespace vesprun::torture {
+
+/// What goes wrong during one run of a program.
+struct Fault {
+  enum class Kind {
+    None,
+    Error,     ///< the call answers `error` and is not made
+    Short,     ///< a read or write that transfers half of what it was asked to, at least one byte
+    Kill,      ///< SIGKILL in place of the call
+    Pause,     ///< `whilePaused` runs before the call is made
+    DiskFull,  ///< files below the watched folder grow by `room` more bytes, then never again
+  };
+  Kind kind = Kind::None;
+  std::size_t call = 0;  ///< counted from 1, over all threads
+  /// When not 0: the first call of this kind from there on. Threads do not always take turns alike.
+  int number = 0;
+  int error = 0;
+  std::uint64_t room = 0;
+  std::function<void()> whilePaused = {};
+};
+
+/// One system call of a run without a fault.
+struct Call {
+  int number = 0;
+  std::string path;        ///< of its descriptor or first path, when it is a file
+  std::uint64_t size = 0;  ///< bytes that a write asks for
+};
+
+struct Outcome {
+  int status = -1;  ///< exit status; -1 when a signal ended the program
+  int signal = 0;
+  bool late = false;  ///< stopped, since it took longer than the limit
+  std::string standardError;
+  std::vector<Call> calls;              ///< recorded only without a fault
+  std::vector<std::string> notDurable;  ///< likewise: names given to bytes that were not flushed
+  bool happened = false;                ///< the fault came to pass
+};
+
+/// Runs `command` in `folder` with every system call watched. Files below it are the ones whose
+/// disk gets full and whose durability counts. Throws `std::runtime_error` when tracing is not
+/// possible.
+Outcome runTraced(const std::vector<std::string>& command, const std::string& folder,
+                  const Fault& fault = {});
+
+/// The errors that the call can give on a real system and that the program must survive; empty for
+/// calls that cannot fail in a way that says anything.
+const std::vector<int>& fittingErrors(int number);
+bool transfersBytes(int number);
+std::string nameOfCall(int number);
+
+/// The longest time a run may take, in seconds.
+inline constexpr unsigned kLongestRun = 60;
+
+}  // namespace vesprun::torture

@@ -1,0 +1,137 @@
+#include <sys/mman.h>
+#include <sys/wait.h>
+#include <unistd.h>
+#include <CLI/CLI.hpp>
+
+#include <atomic>
+#include <cstdio>
+#include <cstring>
+#include <filesystem>
+#include <memory>
+#include <stdexcept>
+#include <thread>
+
+#include "Scenarios.h"
+
+namespace vesprun::torture {
+namespace {
+
+namespace fs = std::filesystem;
+
+struct Options {
+  std::uint32_t seed = 1;
+  bool full = false;
+  std::size_t share = 1;
+  unsigned workers = std::max(1U, std::thread::hardware_concurrency());
+  std::string only;
+};
+
+struct Counts {
+  std::atomic<std::size_t> tried;
+  std::atomic<std::size_t> failed;
+};
+
+void runCases(const std::vector<Case>& cases, const Options& options, unsigned worker,
+              const fs::path& folder, Counts& counts) {
+  for (std::size_t index = worker; index < cases.size(); index += options.workers) {
+    const Case& one = cases[index];
+    std::vector<std::string> faults;
+    try {
+      faults = one.run(folder / ("device-" + std::to_string(worker)));
+    } catch (const std::exception& failure) {
+      faults = {failure.what()};
+    }
+    ++counts.tried;
+    if (!faults.empty()) {
+      ++counts.failed;
+      std::string text = "FAILED " + one.name + '\n';
+      for (const std::string& fault : faults) {
+        text += "  " + fault + '\n';
+      }
+      text += "  again: scripts/torture --seed " + std::to_string(options.seed) + " --only '" +
+              one.name + "'\n";
+      std::fputs(text.c_str(), stdout);
+      std::fflush(stdout);
+    }
+  }
+}
+
+std::vector<Case> chosen(std::vector<Case> cases, const Options& options) {
+  std::vector<Case> result;
+  for (std::size_t index = 0; index < cases.size(); ++index) {
+    if (options.only.empty() ? index % options.share == options.seed % options.share
+                             : cases[index].name == options.only) {
+      result.push_back(std::move(cases[index]));
+    }
+  }
+  return result;
+}
+
+int torture(const Options& options) {
+  const Programs programs{VESPCTL_PROGRAM, VESPRUN_PROGRAM};
+  std::string name = (fs::temp_directory_path() / "vesprun-torture-XXXXXX").string();
+  if (mkdtemp(name.data()) == nullptr) {
+    throw std::runtime_error(name + ": " + std::strerror(errno));
+  }
+  const fs::path folder = name;
+  void* shared =
+      mmap(nullptr, sizeof(Counts), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
+  if (shared == MAP_FAILED) {
+    throw std::runtime_error(std::string("mmap: ") + std::strerror(errno));
+  }
+  Counts& total = *new (shared) Counts{};
+  for (const Scenario& scenario : scenarios()) {
+    const std::vector<Case> cases =
+        chosen(scenario.cases(programs, folder, options.seed, options.full), options);
+    const std::size_t failedBefore = total.failed;
+    std::vector<pid_t> children;
+    for (unsigned worker = 0; worker < options.workers; ++worker) {
+      const pid_t child = fork();
+      if (child == 0) {
+        runCases(cases, options, worker, folder, total);
+        _exit(0);
+      }
+      children.push_back(child);
+    }
+    bool ended = true;
+    for (const pid_t child : children) {
+      int status = 0;
+      ended = waitpid(child, &status, 0) == child && WIFEXITED(status) && ended;
+    }
+    if (!ended) {
+      throw std::runtime_error("a worker of \"" + scenario.name + "\" did not come to its end");
+    }
+    if (options.only.empty() || !cases.empty()) {
+      std::printf("%-44s %6zu cases, %zu failed\n", scenario.name.c_str(), cases.size(),
+                  total.failed - failedBefore);
+      std::fflush(stdout);
+    }
+  }
+  fs::remove_all(folder);
+  std::printf("torture: seed %u, %zu cases, %zu failed\n", options.seed, total.tried.load(),
+              total.failed.load());
+  if (total.tried == 0) {
+    throw std::runtime_error("there is no such case");
+  }
+  return total.failed == 0 ? 0 : 1;
+}
+
+}  // namespace
+}  // namespace vesprun::torture
+
+int main(int argc, char** argv) {
+  CLI::App app("Runs vesprun and vespctl under every fault that a system can show them.",
+               "torture");
+  vesprun::torture::Options options;
+  app.add_option("--seed", options.seed, "Where the random choices begin");
+  app.add_flag("--full", options.full, "Every error of every call and every byte of a full disk");
+  app.add_option("--share", options.share, "Only every N-th case")->check(CLI::PositiveNumber);
+  app.add_option("--only", options.only, "One case, by the name that a failure prints");
+  CLI11_PARSE(app, argc, argv);
+  try {
+    return vesprun::torture::torture(options);
+  } catch (const std::exception& failure) {
+    std::fprintf(stderr, "torture: %s\n", failure.what());
+    return 2;
+  }
+}

@@ -1,0 +1,52 @@
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "common/Date.h"
+#include "platform/host/device/DeviceDirectory.h"
+#include "platform/host/files/FileLock.h"
+
+namespace vesprun {
+
+/// Removes logs from the outbox of a device, each with its header. What is to be remembered of a
+/// log is durable before the log goes: its number, and of a daily log a note in `pruned.jsonl`. A
+/// command that is killed in between has then noted a log that is still there, which keeps its
+/// revision and is not noted again.
+class LogPruning {
+ public:
+  /// `now` is the time of the notes. The directory must outlive the object.
+  LogPruning(const DeviceDirectory& directory, const Date& now)
+      : _directory(directory), _now(now) {}
+
+  /// Removes the logs that were written before `time`.
+  void removeBefore(const Date& time);
+
+  /// Removes the logs with the lowest numbers until all files in the outbox are together below a
+  /// number of bytes, or no log is left.
+  void removeUntilBelow(std::uint64_t bytes);
+
+  /// The files that went, but for headers that stood beside a log.
+  const std::vector<std::string>& removed() const { return _removed; }
+
+  /// What could not be done.
+  const std::vector<std::string>& problems() const { return _problems; }
+
+ private:
+  struct Log;
+
+  std::vector<Log> readFolder();
+  void remove(const std::vector<Log>& logs);
+  std::vector<const Log*> noteDailyLogs(const std::vector<Log>& logs);
+  void unlinkFiles(const Log& log);
+
+  const DeviceDirectory& _directory;
+  Date _now;
+  std::optional<FolderLock> _lock;  ///< a header without a log is not one of a log that is coming
+  std::vector<std::string> _removed;
+  std::vector<std::string> _problems;
+};
+
+}  // namespace vesprun

@@ -1,0 +1,141 @@
+#include <algorithm>
+#include <cstdint>
+#include <cstdio>
+#include <limits>
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "Command.h"
+#include "Complaints.h"
+#include "common/Calendar.h"
+#include "days/DailyWork.h"
+#include "days/LogPruning.h"
+#include "platform/host/counters/HostTallybook.h"
+#include "platform/host/documents/JsonForm.h"
+#include "platform/host/documents/QuotedText.h"
+#include "platform/host/files/JsonLines.h"
+
+namespace vesprun {
+namespace {
+
+struct Pruning {
+  std::string directory;
+  std::optional<std::uint32_t> counterDays;
+  std::optional<std::uint32_t> outboxDays;
+  std::optional<std::uint64_t> outboxMebibytes;
+};
+
+/// Removes the lines of a file in the outbox that were written before `time`, and gives their
+/// number. One that does not tell its time stays.
+std::uint64_t removeLines(const std::string& path, const Date& time,
+                          std::vector<std::string>& problems) {
+  std::string error;
+  const auto isOlder = [&time](std::string_view text) {
+    std::string malformed;
+    const std::optional<PropertyValue> line = valueFromJsonText(text, malformed);
+    const PropertyValue* written =
+        line && line->dict() != nullptr ? line->dict()->find("time") : nullptr;
+    const std::optional<Date> date = written != nullptr && written->string() != nullptr
+                                         ? parseDateText(*written->string())
+                                         : std::nullopt;
+    return date && *date < time;
+  };
+  const std::optional<std::uint64_t> removed = JsonLines(path).remove(isOlder, error);
+  if (!removed) {
+    problems.push_back(error);
+  }
+  return removed.value_or(0);
+}
+
+/// Removes the counters of days before `day`. What cannot be done goes into `problems`.
+CounterStore::Removed removeCounters(HostPlatform& device, std::int64_t day,
+                                     std::vector<std::string>& problems) {
+  constexpr std::int64_t kBeforeAllDays = std::numeric_limits<std::int64_t>::min();
+  Complaints complaints(&device.systemLog());
+  HostTallybook counters(device.directory(), device.clock(), device.preferences(), complaints);
+  CounterStore::Removed removed;
+  std::optional<std::int32_t> first;
+  std::string error;
+  const auto remove = [&](CounterStore& store) {
+    removed = store.removeBefore(day);
+    store.giveRoomBack();
+    return true;
+  };
+  // Nothing is written, and no database made, for nothing.
+  if (!counters.read([&](CounterStore& store) { first = store.nextDay(kBeforeAllDays); }, error) ||
+      (first && *first < day && !counters.write(remove, error))) {
+    problems.push_back(error);
+  }
+  complaints.print();
+  return removed;
+}
+
+void prune(const Pruning& wanted) {
+  // Neither today's run nor the one that may still make up for its day lack what they read.
+  constexpr std::int64_t kDaysKept = 2;
+  constexpr std::uint64_t kBytesPerMebibyte = 1048576;
+  const auto device = openDevice(wanted.directory);
+  const FolderLock lock = takeDailyWork(device->directory());
+  const Date now = device->clock().now();
+  std::vector<std::string> problems;
+  LogPruning logs(device->directory(), now);
+  PropertyDict lines;
+  if (wanted.outboxDays) {
+    const Date time{now.seconds - *wanted.outboxDays * kSecondsPerDay, now.nanoseconds};
+    logs.removeBefore(time);
+    for (const char* const file :
+         {"records.jsonl", "events.jsonl", "notifications.jsonl", "log.jsonl"}) {
+      const std::string path = device->directory().hostPath(std::string("outbox/") + file);
+      if (const std::uint64_t removed = removeLines(path, time, problems); removed != 0) {
+        lines.set(file, removed);
+      }
+    }
+  }
+  if (wanted.outboxMebibytes) {
+    constexpr std::uint64_t kMost = std::numeric_limits<std::uint64_t>::max() / kBytesPerMebibyte;
+    logs.removeUntilBelow(std::min(*wanted.outboxMebibytes, kMost) * kBytesPerMebibyte);
+  }
+  CounterStore::Removed counters;
+  if (wanted.counterDays) {
+    const std::int64_t today = daysSince1970(now);
+    counters = removeCounters(
+        *device, today - std::max<std::int64_t>(*wanted.counterDays, kDaysKept), problems);
+  }
+  problems.insert(problems.begin(), logs.problems().begin(), logs.problems().end());
+  printJson(PropertyDict{{"days", PropertyArray(counters.days.begin(), counters.days.end())},
+                         {"scalars", counters.scalars},
+                         {"distributions", counters.distributions},
+                         {"logs", PropertyArray(logs.removed().begin(), logs.removed().end())},
+                         {"lines", std::move(lines)}});
+  for (std::size_t i = 0; i + 1 < problems.size(); ++i) {
+    std::fprintf(stderr, "vespctl: %s\n", printableText(problems[i]).c_str());
+  }
+  if (!problems.empty()) {
+    throw CommandFailure(problems.back());
+  }
+}
+
+}  // namespace
+
+void addPruneCommand(CLI::App& vespctl) {
+  const auto wanted = std::make_shared<Pruning>();
+  CLI::App* command = vespctl.add_subcommand("prune", "Removes what is old, and prints what went");
+  command->add_option("DIR", wanted->directory, "The device directory")->required();
+  command
+      ->add_option("--counters", wanted->counterDays,
+                   "Keeps the counters of the last N days, and those of three days in any case")
+      ->check(decimal<std::uint32_t>());
+  command
+      ->add_option("--outbox", wanted->outboxDays,
+                   "Keeps the logs and lines that were written in the last N days")
+      ->check(decimal<std::uint32_t>());
+  command
+      ->add_option("--outbox-size", wanted->outboxMebibytes,
+                   "Removes the oldest logs until the outbox is smaller than that, in MiB")
+      ->check(decimal<std::uint64_t>());
+  command->callback([wanted] { prune(*wanted); });
+}
+
+}  // namespace vesprun
