@@ -78,6 +78,7 @@ void addExportCommand(CLI::App& vespctl);
 void addPageCommand(CLI::App& vespctl);
 void addDaysCommand(CLI::App& vespctl);
 void addCatchUpCommand(CLI::App& vespctl);
+void addCompletionCommand(CLI::App& vespctl);
 void addPruneCommand(CLI::App& vespctl);
 void addOutlookCommands(CLI::App& vespctl);
 void addWhitelistCommands(CLI::App& vespctl);

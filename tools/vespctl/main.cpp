@@ -30,6 +30,7 @@ int runCommandLine(int argc, char** argv) {
   addPageCommand(vespctl);
   addDaysCommand(vespctl);
   addCatchUpCommand(vespctl);
+  addCompletionCommand(vespctl);
   addPruneCommand(vespctl);
   addOutlookCommands(vespctl);
   addWhitelistCommands(vespctl);
