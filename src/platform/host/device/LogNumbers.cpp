@@ -19,14 +19,14 @@
 namespace vesprun {
 namespace {
 
-constexpr std::string_view kNumberedFolder = "outbox/logs";
+constexpr std::string_view kLogFolder = "outbox/logs";
 constexpr std::string_view kNumberFile = "outbox/.log-number";
 
 /// What changes with every log that is added, removed or noted as removed.
 std::string stateOf(const DeviceDirectory& directory) {
   struct stat folder {};
   struct stat pruned {};
-  stat(directory.hostPath(kNumberedFolder).c_str(), &folder);
+  stat(directory.hostPath(kLogFolder).c_str(), &folder);
   stat(directory.hostPath(kPrunedLogsFile).c_str(), &pruned);
   return std::to_string(folder.st_mtim.tv_sec) + '.' + std::to_string(folder.st_mtim.tv_nsec) +
          ' ' + std::to_string(pruned.st_size);
@@ -35,7 +35,7 @@ std::string stateOf(const DeviceDirectory& directory) {
 /// Gives the folder a modification time that no change leaves behind, since those are rounded to
 /// ticks of the system's clock. False when the file system cannot keep it.
 bool markFolder(const DeviceDirectory& directory) {
-  const std::string folder = directory.hostPath(kNumberedFolder);
+  const std::string folder = directory.hostPath(kLogFolder);
   timespec times[2] = {{0, UTIME_OMIT}, {}};
   clock_gettime(CLOCK_REALTIME, &times[1]);
   struct stat status {};
@@ -67,7 +67,7 @@ std::optional<std::uint64_t> LogNumbers::newest(std::string& error) const {
     return newest;
   }
   const std::optional<std::vector<std::string>> names =
-      namesInFolder(_directory.hostPath(kNumberedFolder), error);
+      namesInFolder(_directory.hostPath(kLogFolder), error);
   if (!names) {
     return std::nullopt;
   }
