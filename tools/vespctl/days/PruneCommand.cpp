@@ -31,7 +31,7 @@ struct Pruning {
 /// number. One that does not tell its time stays.
 std::uint64_t removeLines(const std::string& path, const Date& time,
                           std::vector<std::string>& problems) {
-  constexpr std::string_view kBegin = "{\"time\":\"";
+  static constexpr std::string_view kBegin = "{\"time\":\"";
   std::string error;
   const auto isOlder = [&time](std::string_view text) {
     if (text.starts_with(kBegin)) {  // as every line of ours: most are not old and need no parsing
