@@ -27,6 +27,7 @@ int runCommandLine(int argc, char** argv) {
   addFieldsCommand(vespctl);
   addDecodeCommand(vespctl);
   addExportCommand(vespctl);
+  addPageCommand(vespctl);
   addDaysCommand(vespctl);
   addCatchUpCommand(vespctl);
   addPruneCommand(vespctl);
