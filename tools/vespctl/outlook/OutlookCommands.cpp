@@ -68,13 +68,14 @@ void printLeftOut(const OutlookArguments& arguments) {
   std::cout << keptBack.text() << '\n';
 }
 
-/// Adds the rows of a key on the last two days, as they are stored and as the log would have them.
-/// Without `options` it would not. False when the counters cannot be read.
-bool addValues(std::string_view key, const ScalarOptions* options, JsonArray& values) {
+/// Adds the rows of a key that a report of `day` reads, as they are stored and as the log would
+/// have them; without `options` it would not. False when the counters cannot be read.
+bool addValues(std::int32_t day, std::string_view key, const ScalarOptions* options,
+               JsonArray& values) {
   const auto history = platform().tallybook().initWithDefaultPath();
   return history->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
-      key, firstDayOfReport(yesterday()), yesterday(),
-      [&](std::string_view rowKey, std::int32_t day, std::int64_t value, bool&) {
+      key, firstDayOfReport(day), day,
+      [&](std::string_view rowKey, std::int32_t rowDay, std::int64_t value, bool&) {
         if (rowKey != key) {
           return;
         }
@@ -83,15 +84,16 @@ bool addValues(std::string_view key, const ScalarOptions* options, JsonArray& va
           reported = TBReport(nullptr).addScalarForKeyWithOptions(value, key, *options);
         }
         values.add(
-            JsonObject().add("day", day).add("stored", value).add("reported", reported).text());
+            JsonObject().add("day", rowDay).add("stored", value).add("reported", reported).text());
       });
 }
 
-bool addValues(std::string_view key, const DistributionOptions* options, JsonArray& values) {
+bool addValues(std::int32_t day, std::string_view key, const DistributionOptions* options,
+               JsonArray& values) {
   const auto history = platform().tallybook().initWithDefaultPath();
   return history->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
-      key, firstDayOfReport(yesterday()), yesterday(),
-      [&](std::string_view rowKey, std::int32_t day, TBHistoryDistributionEnumerator& samples,
+      key, firstDayOfReport(day), day,
+      [&](std::string_view rowKey, std::int32_t rowDay, TBHistoryDistributionEnumerator& samples,
           bool&) {
         if (rowKey != key) {
           return;
@@ -105,7 +107,7 @@ bool addValues(std::string_view key, const DistributionOptions* options, JsonArr
           return value != nullptr ? std::optional(*value) : std::nullopt;
         };
         values.add(JsonObject()
-                       .add("day", day)
+                       .add("day", rowDay)
                        .add("statistics", copied(row.distributionsOutput()))
                        .add("histogram", copied(row.histogramsOutput()))
                        .text());
@@ -148,7 +150,7 @@ void explainKey(const OutlookArguments& arguments) {
     }
   }
   JsonArray values;
-  if (!addValues(key, decision.options(), values)) {
+  if (!addValues(yesterday(), key, decision.options(), values)) {
     looked.complaints.fail(kUnreadableCounters);
   }
   looked.complaints.print();

@@ -175,8 +175,8 @@ std::string dayStrip(const std::vector<double>& days, const std::string& label) 
     return "";
   }
   constexpr double kMostCells = 100;
-  const Scale across(days.front(), days.back() + 1, 0, kWidth * 10);
   const double cell = days.back() - days.front() < kMostCells ? 0.88 : 1.0;
+  const Scale across(days.front(), days.back() + cell, 0, kWidth * 10);
   std::string steps;
   std::int64_t end = -1;
   for (const double day : days) {

@@ -114,19 +114,24 @@ class PageWriter {
                   (_period.first == _period.last ? "" : " to " + momentText(_period.last)) + ".";
     std::string html = "<header><p>Device reports</p><h1>" + htmlName(_device) + "</h1><p>" +
                        period + " Page made " + minuteText(_now) + " UTC.</p></header>\n<nav>";
-    const auto add = [&html](const char* anchor, const std::string& number, const char* what) {
+    const auto add = [&html](const char* anchor, const std::string& number,
+                             const std::string& what) {
       html += std::string("<a href=\"#") + anchor + "\"><b>" + number + "</b> " + what + "</a>";
+    };
+    const auto addCount = [&add](const char* anchor, std::size_t count, const char* noun,
+                                 const char* rest = "") {
+      add(anchor, numeral(count), std::string(noun) + (count == 1 ? "" : "s") + rest);
     };
     std::size_t sent = 0;
     for (const auto& [name, events] : _data.events) {
       sent += events.count;
     }
-    add("reports", numeral(_data.days.size()), "days reported");
+    addCount("reports", _data.days.size(), "day", " reported");
     add("storage", verdictMark(), "storage");
-    add("scalars", numeral(_data.scalars.size()), "scalars");
-    add("distributions", numeral(_data.distributions.size()), "distributions");
-    add("events", numeral(sent), "events");
-    add("left-out", numeral(_keptBack.size()), "keys kept back");
+    addCount("scalars", _data.scalars.size(), "scalar");
+    addCount("distributions", _data.distributions.size(), "distribution");
+    addCount("events", sent, "event");
+    addCount("left-out", _keptBack.size(), "key", " kept back");
     return html + "</nav>\n<main>\n";
   }
 
