@@ -45,7 +45,7 @@ struct WhitelistDecision {
     return entry != nullptr ? std::optional<PropertyValue>(entry->group) : std::nullopt;
   }
 
-  /// The options as they stand in the whitelist; nothing when they are no dictionary, too.
+  /// The options as they stand in the whitelist; nothing also when they are not a dictionary.
   std::optional<PropertyValue> writtenOptions() const {
     if (by == DecidedBy::InternalDevice) {
       return PropertyDict();

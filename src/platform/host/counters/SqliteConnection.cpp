@@ -152,7 +152,7 @@ int SqliteConnection::formatVersion() const {
   if (result == SQLITE_OK) {
     result = file->pMethods->xRead(file, &version, sizeof version, kOffset);
   }
-  if (result != SQLITE_OK) {
+  if (result != SQLITE_OK && result != SQLITE_IOERR_SHORT_READ) {
     fail(result);
   }
   return version;
