@@ -12,8 +12,6 @@
 namespace vesprun {
 namespace {
 
-constexpr std::string_view kStoredDayKey = "LastCrashLogSerializationDateInDaysSince1970";
-
 /// Longer than a day's work takes; a stopped holder must not block the others for ever.
 constexpr double kLongestWaitForOthers = 300;
 

@@ -28,9 +28,11 @@ int runCommandLine(int argc, char** argv) {
   addDecodeCommand(vespctl);
   addExportCommand(vespctl);
   addPageCommand(vespctl);
+  addDaysCommand(vespctl);
+  addCatchUpCommand(vespctl);
+  addPruneCommand(vespctl);
   addOutlookCommands(vespctl);
   addWhitelistCommands(vespctl);
-  addPruneCommand(vespctl);
   allowOneCommand(vespctl);
   try {
     vespctl.parse(argc, argv);

@@ -31,8 +31,16 @@ struct Pruning {
 /// number. One that does not tell its time stays.
 std::uint64_t removeLines(const std::string& path, const Date& time,
                           std::vector<std::string>& problems) {
+  static constexpr std::string_view kBegin = "{\"time\":\"";
   std::string error;
   const auto isOlder = [&time](std::string_view text) {
+    if (text.starts_with(kBegin)) {  // as every line of ours: most are not old and need no parsing
+      const std::string_view rest = text.substr(kBegin.size());
+      const std::optional<Date> date = parseDateText(rest.substr(0, rest.find('"')));
+      if (date && *date >= time) {
+        return false;
+      }
+    }
     std::string malformed;
     const std::optional<PropertyValue> line = valueFromJsonText(text, malformed);
     const PropertyValue* written =
