@@ -17,7 +17,7 @@ constexpr std::int32_t kMebibytes[] = {64, 256, 1024, 2048, 4096, 8192, 16384, 6
 constexpr std::int32_t kMegahertz[] = {500, 1000, 1500, 2000, 2500, 3000, 4000, 5000};
 constexpr std::int32_t kDegrees[] = {0, 20, 30, 40, 50, 60, 70, 80, 90, 100};
 constexpr std::int32_t kTenths[] = {1, 2, 3, 4, 5, 6, 7, 8, 9, 10};
-constexpr std::int32_t kLevels[] = {1, 2};
+constexpr std::int32_t kSpareLevels[] = {1, 2};
 
 constexpr LinuxFigure memory(std::string_view field, std::string_view key, std::string_view why) {
   return {"/proc/meminfo", field, key, "MiB", FigureKind::Gauge, 1024, 0, 1 << 30, why, kMebibytes};
@@ -36,7 +36,8 @@ constexpr LinuxFigure usedLife(std::string_view file, std::string_view field, st
 
 // 1: normal, 2: most reserved blocks are used, 3: nearly all.
 constexpr LinuxFigure endOfLife(std::string_view file, std::string_view key) {
-  return {file, "1", key, "level", FigureKind::Gauge, 1, 1, 3, "spare blocks run out", kLevels};
+  return {file,        "1", key, "level", FigureKind::Gauge, 1, 1, 3, "spare blocks run out",
+          kSpareLevels};
 }
 
 constexpr const char* kStat = "/proc/stat";
