@@ -28,7 +28,12 @@ int runCommandLine(int argc, char** argv) {
   addDecodeCommand(vespctl);
   addExportCommand(vespctl);
   addCompletionCommand(vespctl);
+  addPageCommand(vespctl);
+  addDaysCommand(vespctl);
+  addCatchUpCommand(vespctl);
   addPruneCommand(vespctl);
+  addOutlookCommands(vespctl);
+  addWhitelistCommands(vespctl);
   allowOneCommand(vespctl);
   try {
     vespctl.parse(argc, argv);
