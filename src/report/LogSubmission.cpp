@@ -30,7 +30,7 @@ std::optional<std::string> serializeDailyLog(const PropertyDict& document) {
   return bytes;
 }
 
-void submitDailyLog(const std::string& bytes) {
+bool submitDailyLog(const std::string& bytes) {
   Preferences& preferences = platform().preferences();
   const PropertyValue osVersion = platform().logsmith().LGSOSVersion();
   const PropertyDict header =
@@ -45,6 +45,7 @@ void submitDailyLog(const std::string& bytes) {
   if (!submitted) {
     logMessage(LogLevel::Error, "%s", kSubmissionFailed);
   }
+  return submitted;
 }
 
 }  // namespace vesprun

@@ -14,7 +14,7 @@ inline constexpr const char* kSubmissionFailed = "Failed to write aggregated log
 std::optional<std::string> serializeDailyLog(const PropertyDict& document);
 
 /// Submits the bytes as log "log-aggregated" of type "193". The header names the previous OS
-/// version on the first log after it changed. What fails is left at an error line.
-void submitDailyLog(const std::string& bytes);
+/// version on the first log after it changed. False, with an error line, when that failed.
+bool submitDailyLog(const std::string& bytes);
 
 }  // namespace vesprun

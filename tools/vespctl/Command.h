@@ -77,8 +77,11 @@ void addPtreeCommands(CLI::App& vespctl);
 void addFieldsCommand(CLI::App& vespctl);
 void addDecodeCommand(CLI::App& vespctl);
 void addExportCommand(CLI::App& vespctl);
+void addPageCommand(CLI::App& vespctl);
+void addDaysCommand(CLI::App& vespctl);
+void addCatchUpCommand(CLI::App& vespctl);
+void addPruneCommand(CLI::App& vespctl);
 void addOutlookCommands(CLI::App& vespctl);
 void addWhitelistCommands(CLI::App& vespctl);
-void addPruneCommand(CLI::App& vespctl);
 
 }  // namespace vesprun

@@ -27,9 +27,12 @@ int runCommandLine(int argc, char** argv) {
   addFieldsCommand(vespctl);
   addDecodeCommand(vespctl);
   addExportCommand(vespctl);
+  addPageCommand(vespctl);
+  addDaysCommand(vespctl);
+  addCatchUpCommand(vespctl);
+  addPruneCommand(vespctl);
   addOutlookCommands(vespctl);
   addWhitelistCommands(vespctl);
-  addPruneCommand(vespctl);
   allowOneCommand(vespctl);
   try {
     vespctl.parse(argc, argv);

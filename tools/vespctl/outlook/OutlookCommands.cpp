@@ -1,11 +1,11 @@
 #include <algorithm>
 #include <iostream>
 #include <optional>
-#include <set>
 
 #include "Command.h"
 #include "driver/DailyTasks.h"
 #include "outlook/JsonObject.h"
+#include "outlook/KeptBack.h"
 #include "outlook/LookedAtDevice.h"
 #include "report/LogSubmission.h"
 #include "report/ReportSources.h"
@@ -55,32 +55,14 @@ void previewLog(const OutlookArguments& arguments) {
 void printLeftOut(const OutlookArguments& arguments) {
   const LookedAtDevice looked(arguments.directory, LogLevel::Default);
   const std::int32_t day = arguments.day.value_or(yesterday());
-  const std::unique_ptr<TBConfig> config = TBConfig::init();
-  JsonArray keptBack;
-  std::set<std::string, std::less<>> keys;
-  const auto note = [&](const char* kind, std::string_view key) {
-    if (keys.emplace(key).second) {
-      keptBack.add(JsonObject().add("kind", kind).add("key", key).text());
-    }
-  };
-  const std::unique_ptr<TBHistory> history = platform().tallybook().initWithDefaultPath();
-  bool complete = history->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
-      "", firstDayOfReport(day), day, [&](std::string_view key, std::int32_t, std::int64_t, bool&) {
-        if (!config || config->decide<ScalarOptions>(key).options() == nullptr) {
-          note("scalar", key);
-        }
-      });
-  keys.clear();
-  complete = complete &&
-             history->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
-                 "", firstDayOfReport(day), day,
-                 [&](std::string_view key, std::int32_t, TBHistoryDistributionEnumerator&, bool&) {
-                   if (!config || config->decide<DistributionOptions>(key).options() == nullptr) {
-                     note("distribution", key);
-                   }
-                 });
-  if (!complete) {
+  const auto keys = keysKeptBack(firstDayOfReport(day), day);
+  if (!keys) {
     looked.complaints.fail(kUnreadableCounters);
+  }
+  JsonArray keptBack;
+  for (const auto& [isDistribution, key] : *keys) {
+    const char* const kind = isDistribution ? "distribution" : "scalar";
+    keptBack.add(JsonObject().add("kind", kind).add("key", key).text());
   }
   looked.complaints.print();
   std::cout << keptBack.text() << '\n';
