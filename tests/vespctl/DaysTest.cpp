@@ -325,6 +325,7 @@ TEST_F(DaysTest, PruneThatIsKilledOrFailsAnywhereIsMadeUpForByTheNext) {
   };
   const torture::Outcome whole = prune({});
   EXPECT_EQ(whole.status, 0) << whole.standardError;
+  EXPECT_THAT(whole.notDurable, ElementsAre());
   const std::string expected = state();
   EXPECT_THAT(expected, EndsWith("scalar\t19786\ts\t19786\n0002-193-log-aggregated.ptree "
                                  "0005-193-log-aggregated.header.json "
