@@ -114,6 +114,9 @@ std::string htmlText(std::string_view text) {
 bool isLongName(std::string_view name) { return name.size() > kLongestName; }
 
 std::string htmlName(std::string_view name) {
+  if (name.empty()) {
+    return "<i>empty</i>";
+  }
   if (!isLongName(name)) {
     return "<bdi>" + htmlText(name) + "</bdi>";
   }

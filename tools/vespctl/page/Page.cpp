@@ -157,7 +157,7 @@ class PageWriter {
       ++digests[*log->document.findString("TBWhitelistDigest")];
     }
     const std::string tableHead =
-        "<table class=reports><thead><tr><th>Day<th>Revision<th>Submitted, "
+        "<table class=reports><thead><tr><th>Day<th>Rev.<th>Submitted, "
         "UTC<th>Scalars<th>Distributions<th>Whitelist<th>Log</thead>";
     html += tableHead + newest + "</table>\n";
     if (!older.empty()) {

@@ -8,6 +8,7 @@
 #include "Command.h"
 #include "common/Calendar.h"
 #include "common/TextForm.h"
+#include "page/Html.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/files/FolderNames.h"
 #include "platform/host/files/WholeFile.h"
@@ -148,7 +149,7 @@ void PageData::takeEvents(const DeviceDirectory& directory) {
       });
   if (malformed > 0) {
     unreadable.push_back(
-        {"events.jsonl", std::to_string(malformed) + " lines cannot be read", true});
+        {"events.jsonl", countedNoun(malformed, "line") + " cannot be read", true});
   }
 }
 
@@ -160,7 +161,7 @@ void PageData::takeRecords(const DeviceDirectory& directory) {
       });
   if (malformed > 0) {
     unreadable.push_back(
-        {"records.jsonl", std::to_string(malformed) + " lines cannot be read", true});
+        {"records.jsonl", countedNoun(malformed, "line") + " cannot be read", true});
   }
 }
 
