@@ -35,10 +35,10 @@ class DaysTest : public VespctlTest {
     setTime("2024-03-05T09:15:02Z");
   }
 
-  void setTime(const std::string& time) {
-    folder.write("device/device.json", "{\"clock\": \"" + time +
-                                           "\", \"system\": {\"osVersion\": "
-                                           "\"1\"}, \"registry\": []}");
+  void setTime(const std::string& time, const std::string& submission = "{}") {
+    folder.write("device/device.json",
+                 R"({"system": {"osVersion": "1"}, "registry": [], "submission": )" + submission +
+                     R"(, "clock": ")" + time + "\"}");
   }
 
   /// Runs the command, which must be done, and gives what it printed.
@@ -61,13 +61,10 @@ class DaysTest : public VespctlTest {
   void addLog(int number, int day, const std::string& written) {
     const std::string name = logs + "/000" + std::to_string(number) + "-193-log-aggregated.ptree";
     const std::string date = "<date>2024-03-0" + std::to_string(day) + "T00:00:00Z</date>";
-    folder.write(name,
-                 "<?xml version=\"1.0\" encoding=\"UTF-8\"?><ptree version=\"1.0\"><dict>"
-                 "<key>TBStartDate</key>" +
-                     date + "<key>TBLogCreationDate</key>" + date +
-                     "<key>TBWhitelistDigest</key><string/><key>TBScalars</key><dict/>"
-                     "<key>TBDistributions</key><dict/><key>TBDistributionsHistogram</key><dict/>"
-                     "</dict></ptree>");
+    folder.write(name, R"(<ptree version="1.0"><dict><key>TBStartDate</key>)" + date +
+                           "<key>TBLogCreationDate</key>" + date + R"(<key>TBWhitelistDigest</key>
+<string/><key>TBScalars</key><dict/><key>TBDistributions</key><dict/>
+<key>TBDistributionsHistogram</key><dict/></dict></ptree>)");
     ASSERT_EQ(std::system(("touch -d " + written + "T00:00Z " + folder.path(name)).c_str()), 0);
   }
 
@@ -104,12 +101,11 @@ TEST_F(DaysTest, DaysTellsWhatIsKeptAndChangesNothing) {
       "LastCrashLogSerializationDateInDaysSince1970 19787");
   const std::string look = "find " + folder.path("device") + " -printf '%p %s %C@\\n' | md5sum >";
   ASSERT_EQ(std::system((look + folder.path("before")).c_str()), 0);
-  EXPECT_EQ(
-      print("days \"$D\" --last 3"),
-      "{\"day\":19785,\"date\":\"2024-03-03\",\"scalars\":1,\"distributions\":1,\"logs\":[]}\n"
-      "{\"day\":19786,\"date\":\"2024-03-04\",\"scalars\":1,\"distributions\":0,\"logs\":["
-      "\"0001-193-log-aggregated.ptree\",\"0002-193-log-aggregated.ptree\"]}\n"
-      "{\"day\":19787,\"date\":\"2024-03-05\",\"scalars\":0,\"distributions\":0,\"logs\":[]}\n");
+  EXPECT_EQ(print("days \"$D\" --last 3"),
+            R"({"day":19785,"date":"2024-03-03","scalars":1,"distributions":1,"logs":[]}
+{"day":19786,"date":"2024-03-04","scalars":1,"distributions":0,"logs":["0001-193-log-aggregated.ptree","0002-193-log-aggregated.ptree"]}
+{"day":19787,"date":"2024-03-05","scalars":0,"distributions":0,"logs":[]}
+)");
   EXPECT_THAT(error, AllOf(HasSubstr("vespctl: 0004-193-log-aggregated.ptree: line 1"),
                            HasSubstr("the day of the last run, 19787, is ahead of the clock")));
   EXPECT_EQ(print("days \"$D\" --last 0"), "");
@@ -169,15 +165,11 @@ TEST_F(DaysTest, CatchUpSubmitsWhatTheRunOfEachDayWouldHave) {
 TEST_F(DaysTest, CatchUpSaysWhichDaysCouldNotBeSubmitted) {
   count(19783, 19786);
   print("counters \"$D\" set other 1 --day 19781");
-  folder.write("device/device.json",
-               "{\"clock\": \"2024-03-05T09:15:02Z\", \"submission\": "
-               "{\"fails\": true}, \"registry\": []}");
+  setTime("2024-03-05T09:15:02Z", R"({"fails": true})");
   EXPECT_EQ(run("catch-up \"$D\""), 1);
   EXPECT_EQ(output, "[]\n");
   EXPECT_EQ(error, "vespctl: not submitted: 19783, 19784, 19785; the system log says why\n");
-  folder.write("device/device.json",
-               "{\"clock\": \"2024-03-05T09:15:02Z\", \"submission\": "
-               "{\"enabled\": false}, \"registry\": []}");
+  setTime("2024-03-05T09:15:02Z", R"({"enabled": false})");
   EXPECT_EQ(print("catch-up \"$D\""), "[]\n");
   setTime("2024-03-05T09:15:02Z");
   EXPECT_EQ(print("catch-up \"$D\" --last 2"), "[19784,19785]\n");
@@ -192,8 +184,8 @@ TEST_F(DaysTest, PruneKeepsTheDaysThatAreAskedForOrStillRead) {
             "{\"days\":[],\"scalars\":0,\"distributions\":0,\"logs\":[],\"lines\":{}}\n");
   EXPECT_THAT(print("prune \"$D\" --counters 4294967295"), StartsWith("{\"days\":[],"));
   EXPECT_EQ(print("prune \"$D\" --counters 4"),
-            "{\"days\":[19779,19780,19781,19782],\"scalars\":3,\"distributions\":1,\"logs\":[],"
-            "\"lines\":{}}\n");
+            R"({"days":[19779,19780,19781,19782],"scalars":3,"distributions":1,"logs":[],"lines":{}}
+)");
   EXPECT_THAT(print("prune \"$D\" --counters 0"), StartsWith("{\"days\":[19783,19784],"));
   EXPECT_EQ(print("counters \"$D\" dump"),
             "scalar\t19785\ts\t19785\nsample\t19785\td\t1\t33302\nsample\t19785\td\t2\t33302\n"
@@ -209,28 +201,37 @@ TEST_F(DaysTest, PruneRemovesOldLogsWithTheirHeadersAndOldLines) {
   count(19796, 19796);
   print("run \"$D\" -- -f");
   folder.write("device/outbox/events.jsonl",
-               "{\"time\":\"2024-03-12T09:15:01Z\"}\n{\"time\":\"2024-03-12T09:15:02Z\"}\n"
-               "{\"time\":\"2024\"}\n{\"time\":1}\n[]\n\n{\"time\":\"2024-03-01T00:00:00Z\",");
+               R"({"time":"2024-03-12T09:15:01Z"}
+{"time":"2024-03-12T09:15:02Z"}
+{"time":"2024"}
+{"time":1}
+[]
+
+{"time":"2024-03-01T00:00:00Z",)");
   folder.write(logs + "/note-193-log-aggregated.ptree", "no log");
   std::filesystem::create_symlink("../events.jsonl", folder.path(logs + "/0002-link.log"));
   std::filesystem::create_directory(folder.path(logs + "/0003-folder.log"));
   ASSERT_EQ(mkfifo(folder.path("device/outbox/records.jsonl").c_str(), 0600), 0);
   EXPECT_EQ(run("prune \"$D\" --outbox 3"), 1) << "the pipe is not a file of lines";
-  EXPECT_EQ(output,
-            "{\"days\":[],\"scalars\":0,\"distributions\":0,\"logs\":["
-            "\"0001-193-log-aggregated.ptree\",\"0002-193-log-aggregated.ptree\"],"
-            "\"lines\":{\"events.jsonl\":1,\"log.jsonl\":15}}\n");
+  EXPECT_EQ(
+      output,
+      R"({"days":[],"scalars":0,"distributions":0,"logs":["0001-193-log-aggregated.ptree","0002-193-log-aggregated.ptree"],"lines":{"events.jsonl":1,"log.jsonl":15}}
+)");
   EXPECT_THAT(error, HasSubstr("records.jsonl: not a regular file\n"));
   EXPECT_EQ(folder.read("device/outbox/events.jsonl"),
-            "{\"time\":\"2024-03-12T09:15:02Z\"}\n{\"time\":\"2024\"}\n{\"time\":1}\n[]\n\n"
-            "{\"time\":\"2024-03-01T00:00:00Z\",");
+            R"({"time":"2024-03-12T09:15:02Z"}
+{"time":"2024"}
+{"time":1}
+[]
+
+{"time":"2024-03-01T00:00:00Z",)");
   EXPECT_THAT(folder.names(logs), ElementsAre("0002-link.log", "0003-193-log-aggregated.ptree",
                                               "0003-folder.log", "note-193-log-aggregated.ptree"));
-  EXPECT_EQ(folder.read("device/outbox/pruned.jsonl"),
-            "{\"time\":\"2024-03-15T09:15:02Z\",\"name\":\"0001-193-log-aggregated.ptree\","
-            "\"day\":19786,\"revision\":1}\n"
-            "{\"time\":\"2024-03-15T09:15:02Z\",\"name\":\"0002-193-log-aggregated.ptree\","
-            "\"day\":19786,\"revision\":2}\n");
+  EXPECT_EQ(
+      folder.read("device/outbox/pruned.jsonl"),
+      R"({"time":"2024-03-15T09:15:02Z","name":"0001-193-log-aggregated.ptree","day":19786,"revision":1}
+{"time":"2024-03-15T09:15:02Z","name":"0002-193-log-aggregated.ptree","day":19786,"revision":2}
+)");
 }
 
 TEST_F(DaysTest, PruneRemovesTheOldestLogsUntilTheOutboxIsSmallEnough) {
@@ -240,9 +241,10 @@ TEST_F(DaysTest, PruneRemovesTheOldestLogsUntilTheOutboxIsSmallEnough) {
   folder.write(logs + "/10000-165-S.header.json", "{}");
   folder.write(logs + "/0010-165-S.header.json", "of a log that is gone");
   folder.write("device/outbox/log.jsonl", large);
-  EXPECT_EQ(print("prune \"$D\" --outbox-size 1"),
-            "{\"days\":[],\"scalars\":0,\"distributions\":0,\"logs\":[\"0009-165-S.log\","
-            "\"0010-165-S.header.json\",\"10000-165-S.log\"],\"lines\":{}}\n");
+  EXPECT_EQ(
+      print("prune \"$D\" --outbox-size 1"),
+      R"({"days":[],"scalars":0,"distributions":0,"logs":["0009-165-S.log","0010-165-S.header.json","10000-165-S.log"],"lines":{}}
+)");
   EXPECT_THAT(folder.names(logs), ElementsAre());
   EXPECT_THAT(print("prune \"$D\" --outbox-size 18446744073709551615"), HasSubstr("\"logs\":[]"));
   count(19786, 19786);
@@ -265,9 +267,10 @@ TEST_F(DaysTest, RevisionsGoOnAfterPruningWhicheverLogsWent) {
   addLog(6, 4, "2024-03-04");
   EXPECT_EQ(revisions(), "5:2 5:4 4:2 ");
   // As if killed between the note and the removal.
-  const std::string notes = folder.read("device/outbox/pruned.jsonl") +
-                            "{\"time\":\"2024-03-05T09:15:02Z\",\"name\":\"0005-193-log-aggregated"
-                            ".ptree\",\"day\":19787,\"revision\":4}\n";
+  const std::string notes =
+      folder.read("device/outbox/pruned.jsonl") +
+      R"({"time":"2024-03-05T09:15:02Z","name":"0005-193-log-aggregated.ptree","day":19787,"revision":4}
+)";
   folder.write("device/outbox/pruned.jsonl", notes + "{\"name\":7}\n\ntorn");
   EXPECT_EQ(revisions(), "5:2 5:4 4:2 ");
   EXPECT_THAT(print("prune \"$D\" --outbox 2"), HasSubstr("[\"0005-193-log-aggregated.ptree\"]"));
@@ -325,6 +328,7 @@ TEST_F(DaysTest, PruneThatIsKilledOrFailsAnywhereIsMadeUpForByTheNext) {
   };
   const torture::Outcome whole = prune({});
   EXPECT_EQ(whole.status, 0) << whole.standardError;
+  EXPECT_THAT(whole.notDurable, ElementsAre());
   const std::string expected = state();
   EXPECT_THAT(expected, EndsWith("scalar\t19786\ts\t19786\n0002-193-log-aggregated.ptree "
                                  "0005-193-log-aggregated.header.json "

@@ -9,7 +9,6 @@
 
 namespace vesprun {
 
-/// Where submitted logs lie, on the device.
 inline constexpr std::string_view kLogFolder = "outbox/logs";
 
 /// The number that a log's or header's name begins with.

@@ -105,25 +105,44 @@ TEST_F(JsonLinesTest, EndsATornLineAndMakesADeletedFileAnew) {
 }
 
 TEST_F(JsonLinesTest, LoseNoLineWhileOthersAreRemoved) {
-  constexpr int kLines = 300;
-  std::atomic<std::uint64_t> removed = 0;
-  std::thread removing([&] {
-    JsonLines lines(folder.path("log.jsonl"));
+  const std::string path = folder.path("log.jsonl");
+  const auto isOld = [](std::string_view line) { return line == "old"; };
+  JsonLines lines(path);
+  EXPECT_TRUE(lines.append("old", error)) << error;
+  const FileDescriptor held(open(path.c_str(), O_RDONLY));
+  ASSERT_EQ(flock(held.get(), LOCK_EX), 0);
+  std::thread waiting([&lines] {
     std::string why;
-    while (removed < kLines && !HasFailure()) {
-      const auto count = lines.remove([](std::string_view line) { return line == "old"; }, why);
+    EXPECT_TRUE(lines.append("waited", why)) << why;
+  });
+  std::this_thread::sleep_for(std::chrono::milliseconds(50));
+  EXPECT_TRUE(replaceFile(path, "another file\n", error)) << error;
+  flock(held.get(), LOCK_UN);
+  waiting.join();
+  EXPECT_EQ(folder.read("log.jsonl"), "another file\nwaited\n");
+  folder.write("log.jsonl", "");
+
+  constexpr int kLines = 300;
+  std::atomic<bool> done = false;
+  std::uint64_t removed = 0;
+  std::thread removing([&] {
+    JsonLines others(path);
+    std::string why;
+    while (!done) {
+      const auto count = others.remove(isOld, why);
       EXPECT_TRUE(count) << why;
       removed += count.value_or(0);
     }
   });
-  JsonLines lines(folder.path("log.jsonl"));
   for (int line = 0; line < kLines; ++line) {
     EXPECT_TRUE(lines.append("old", error) && lines.append("new", error)) << error;
   }
+  done = true;
   removing.join();
+  EXPECT_EQ(removed + lines.remove(isOld, error).value_or(0), kLines);
   EXPECT_EQ(folder.read("log.jsonl").size(), 4U * kLines);
   folder.write("log.jsonl", std::string("old\nto\0rn\n\nold\nto", 17));
-  EXPECT_EQ(lines.remove([](std::string_view line) { return line == "old"; }, error), 2U);
+  EXPECT_EQ(lines.remove(isOld, error), 2U);
   EXPECT_EQ(folder.read("log.jsonl"), std::string("to\0rn\n\nto", 9));
 }
 
