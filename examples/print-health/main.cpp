@@ -9,10 +9,10 @@
 // vesprun in a folder of its own is found with -DCMAKE_PREFIX_PATH=FOLDER, or with the folder of
 // its vesprun.pc in PKG_CONFIG_PATH. `vespctl init DIRECTORY --sample` makes a device to try.
 
-#include <vesprun/vesprun.h>
 #include <iostream>
 #include <memory>
 #include <string>
+#include <vesprun/vesprun.hpp>
 
 int main(int argc, char** argv) {
   if (argc != 2) {

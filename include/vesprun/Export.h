@@ -1,4 +1,4 @@
 #pragma once
 
-/// Visible to users of the shared library.
-#define VESPRUN_EXPORT [[gnu::visibility("default")]]
+/* Marks what the shared library gives to other programs, in C and C++. */
+#define VESPRUN_EXPORT __attribute__((visibility("default")))

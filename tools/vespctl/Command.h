@@ -75,6 +75,7 @@ void addPtreeCommands(CLI::App& vespctl);
 void addFieldsCommand(CLI::App& vespctl);
 void addDecodeCommand(CLI::App& vespctl);
 void addExportCommand(CLI::App& vespctl);
+void addCompletionCommand(CLI::App& vespctl);
 void addPageCommand(CLI::App& vespctl);
 void addDaysCommand(CLI::App& vespctl);
 void addCatchUpCommand(CLI::App& vespctl);

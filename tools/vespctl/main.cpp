@@ -27,6 +27,7 @@ int runCommandLine(int argc, char** argv) {
   addFieldsCommand(vespctl);
   addDecodeCommand(vespctl);
   addExportCommand(vespctl);
+  addCompletionCommand(vespctl);
   addPageCommand(vespctl);
   addDaysCommand(vespctl);
   addCatchUpCommand(vespctl);

@@ -5,7 +5,7 @@
 #include "platform/host/registry/HostDeviceRegistry.h"
 #include "support/ControllerTest.h"
 #include "support/ScarceMemory.h"
-#include "vesprun.h"
+#include "vesprun.hpp"
 
 namespace vesprun {
 namespace {

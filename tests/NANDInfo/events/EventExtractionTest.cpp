@@ -3,7 +3,7 @@
 #include "NANDInfo/StatisticsDevice.h"
 #include "NANDInfo/events/StorageEvents.h"
 #include "NANDInfo/tables/EventFields.h"
-#include "vesprun.h"
+#include "vesprun.hpp"
 
 namespace vesprun {
 namespace {

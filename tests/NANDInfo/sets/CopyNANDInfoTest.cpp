@@ -4,7 +4,7 @@
 #include "NANDInfo/controller/NandExporter.h"
 #include "NANDInfo/sets/StorageHealthFields.h"
 #include "support/ControllerTest.h"
-#include "vesprun.h"
+#include "vesprun.hpp"
 
 namespace vesprun {
 namespace {

@@ -1,5 +1,5 @@
 #include "NANDInfo/StatisticsDevice.h"
-#include "vesprun.h"
+#include "vesprun.hpp"
 
 namespace vesprun {
 namespace {

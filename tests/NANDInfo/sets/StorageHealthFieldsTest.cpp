@@ -2,7 +2,7 @@
 
 #include "NANDInfo/StatisticsDevice.h"
 #include "buffers/DeviceBuffers.h"
-#include "vesprun.h"
+#include "vesprun.hpp"
 
 namespace vesprun {
 namespace {

@@ -1,4 +1,4 @@
-#include "vesprun.h"
+#include "vesprun.hpp"
 
 #include "NANDInfo/StatisticsDevice.h"
 

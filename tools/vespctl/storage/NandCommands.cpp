@@ -1,148 +1,21 @@
 #include <unistd.h>
 
+#include <algorithm>
+#include <cctype>
 #include <cstdio>
 #include <iostream>
+#include <vector>
 
 #include "Command.h"
-#include "NANDInfo/StructuredLogState.h"
-#include "NANDInfo/controller/NandExporter.h"
-#include "NANDInfo/lists/StructuredLog.h"
-#include "NANDInfo/parsers/APIErrorMessage.h"
-#include "NANDInfo/sets/HealthSets.h"
-#include "platform/host/documents/JsonForm.h"
+#include "library/EntryPoints.h"
 #include "platform/host/files/FileDescriptor.h"
 #include "platform/host/files/SystemError.h"
-#include "telemetry/DiskInfo.h"
-#include "telemetry/NVRAMStatistics.h"
-#include "vesprun.h"
 
 namespace vesprun {
 namespace {
 
-struct NandArguments {
-  std::string device;
-  bool statKeys = false;
-  bool round = false;
-  std::uint64_t hours = 0;
-  bool raw = false;
-  std::uint32_t mode = 2;
-  std::uint32_t fromStep = 0;
-  bool noMonthly = false;
-  bool flag = false;
-  bool force = false;
-};
-
-/// An exported entry point; its answer becomes "result", null when there is none.
-struct NandVerb {
-  const char* name;
-  const char* help;
-  void (*addOptions)(CLI::App& verb, NandArguments& arguments);  ///< null: it takes none
-  std::optional<PropertyValue> (*call)(const NandArguments& arguments);
-};
-
-std::optional<PropertyValue> valueOf(std::optional<PropertyDict> dict) {
-  return dict ? std::optional<PropertyValue>(*std::move(dict)) : std::nullopt;
-}
-
-void addRoundFlag(CLI::App& verb, NandArguments& arguments) {
-  verb.add_flag("--round", arguments.round, "Rounds the numbers to their significant digits");
-}
-
-/// True when the controller opens.
-bool connectsToController() {
-  ORUConnection connection;
-  const bool opened = openORUConnection(connection);
-  closeORUConnection(connection);
-  return opened;
-}
-
-constexpr NandVerb kVerbs[] = {
-    {"info", "The legacy NAND info", nullptr,
-     [](const NandArguments&) { return valueOf(CopyNANDInfo()); }},
-    {"info-for-daily-log", "The legacy NAND info, on the days when the daily log has it", nullptr,
-     [](const NandArguments&) { return valueOf(CopyNANDInfoWithOptions({})); }},
-    {"dump", "The legacy NAND info without its version fields", nullptr,
-     [](const NandArguments&) {
-       PropertyDict info;
-       DumpNANDInfo(info);
-       return valueOf(std::move(info));
-     }},
-    {"ftl-raw", "The FTL fields, all of them",
-     [](CLI::App& verb, NandArguments& arguments) {
-       verb.add_flag("--stat-keys", arguments.statKeys, "Names the fields by their ids");
-     },
-     [](const NandArguments& arguments) {
-       return valueOf(CopyNANDFTLInfo(arguments.statKeys, 1));
-     }},
-    {"ftl", "The FTL fields that may leave the device", addRoundFlag,
-     [](const NandArguments& arguments) {
-       return valueOf(CopyWhitelistedNANDFTLInfo(arguments.round));
-     }},
-    {"msp", "The fields of each MSP that may leave the device", addRoundFlag,
-     [](const NandArguments& arguments) {
-       return valueOf(CopyWhitelistedNANDMSPInfo(arguments.round));
-     }},
-    {"storage-stats", "The storage statistics that may leave the device", addRoundFlag,
-     [](const NandArguments& arguments) {
-       return valueOf(CopyWhitelistedStorageStats(arguments.round));
-     }},
-    {"vm-freezer", "What the kernel's swap-out thread has written", nullptr,
-     [](const NandArguments&) { return valueOf(CopyVMFreezerNANDInfo()); }},
-    {"magazine", "What happened since a snapshot of the stats magazine",
-     [](CLI::App& verb, NandArguments& arguments) {
-       verb.add_option("HOURS", arguments.hours, "How long ago the snapshot was taken")
-           ->required()
-           ->transform(decimal<std::uint64_t>());
-       verb.add_flag("--raw", arguments.raw,
-                     "The counters as the snapshot has them, not what they grew by");
-       verb.add_option("--mode", arguments.mode,
-                       "0: counters that accumulate, 1: instantaneous values, 2: both")
-           ->transform(decimal<std::uint32_t>());
-     },
-     [](const NandArguments& arguments) {
-       return valueOf(CopySMagNANDFTLInfo(arguments.hours, arguments.raw ? 0 : 1, arguments.mode));
-     }},
-    {"magazine-history", "The write amplification of the last six periods of four hours", nullptr,
-     [](const NandArguments&) { return valueOf(CopySMagNANDFTLCustomHistoryInfo(0)); }},
-    {"tendmark", "The storage's health, for service plans", nullptr,
-     [](const NandArguments&) { return valueOf(CopyTendmarkNANDInfo()); }},
-    {"ota", "The storage's health, for updates over the air", nullptr,
-     [](const NandArguments&) { return valueOf(CopyOTANANDInfo()); }},
-    {"lab", "The storage's health, for labs", nullptr,
-     [](const NandArguments&) { return valueOf(CopyInternalLabNANDInfo()); }},
-    {"recommends-deletion", "Does the controller recommend deleting content?", nullptr,
-     [](const NandArguments&) {
-       return std::optional<PropertyValue>(NandRecommendsContentDeletion());
-     }},
-    {"events", "Sends the storage statistics as analytics events, and shows what was sent",
-     [](CLI::App& verb, NandArguments& arguments) {
-       verb.add_option("--from-step", arguments.fromStep, "The step to begin with, 0 to 6")
-           ->transform(decimal<std::uint32_t>());
-       verb.add_flag("--no-monthly", arguments.noMonthly, "Leaves out the step of a month");
-     },
-     [](const NandArguments& arguments) {
-       return valueOf(
-           NandInfoExtractToEH_runAllSteps(0, !arguments.noMonthly, 1, arguments.fromStep));
-     }},
-    {"structured-log", "Logs the controller's lists: true when all could be handled",
-     [](CLI::App& verb, NandArguments& arguments) {
-       verb.add_flag("--flag", arguments.flag, "Passes the caller's flag on to the controller");
-       verb.add_flag("--force", arguments.force, "Collects the validity list in any case");
-     },
-     [](const NandArguments& arguments) {
-       gForceCollectionSet = arguments.force ? 1 : 0;
-       return std::optional<PropertyValue>(DumpStorageStructuredLog(arguments.flag));
-     }},
-    {"disk", "Size and fullness of the user data volume", nullptr,
-     [](const NandArguments&) { return valueOf(GetDiskInfo()); }},
-    {"nvram", "The usage and write counters of the NVRAM", nullptr,
-     [](const NandArguments&) { return valueOf(gatherNVRAMStats()); }},
-    {"connect", "Opens the controller and closes it: true when it could be opened", nullptr,
-     [](const NandArguments&) { return std::optional<PropertyValue>(connectsToController()); }},
-};
-
-/// Redirects standard output to standard error as long as it lives: entry points print there,
-/// before the result.
+/// Sends what is printed to standard output to standard error as long as it lives: entry points
+/// print there, and would come between a reader and the result.
 class StandardOutputAside {
  public:
   StandardOutputAside() : _kept(dup(STDOUT_FILENO)) {
@@ -161,31 +34,57 @@ class StandardOutputAside {
   FileDescriptor _kept;
 };
 
-std::optional<PropertyValue> callAside(const NandVerb& verb, const NandArguments& arguments) {
+std::string callAside(const EntryPointRow& row, std::span<const std::uint64_t> values) {
   const StandardOutputAside aside;
-  return verb.call(arguments);
+  return callToJson(row, values);
 }
 
-void callVerb(const NandVerb& verb, const NandArguments& arguments) {
-  const std::unique_ptr<HostPlatform> device = openDevice(arguments.device);
-  const InstalledPlatform installed(*device);
-  const std::optional<PropertyValue> result = callAside(verb, arguments);
-  std::cout << "{\"result\":" << (result ? jsonText(*result) : "null")
-            << ",\"error\":" << jsonText(PropertyValue(GetAPIErrorMessage())) << "}\n";
+/// What the command line gave for one parameter.
+struct GivenArgument {
+  std::uint64_t number = 0;
+  bool flag = false;
+};
+
+void addParameter(CLI::App& command, const EntryPointParameter& parameter, GivenArgument& given) {
+  std::string name = parameter.name;
+  if (parameter.isFlag()) {
+    command.add_flag("--" + name, given.flag, parameter.help);
+    return;
+  }
+  if (parameter.isNeeded) {
+    std::transform(name.begin(), name.end(), name.begin(), [](char letter) {
+      return static_cast<char>(std::toupper(static_cast<unsigned char>(letter)));
+    });
+  }
+  given.number = parameter.absent;
+  command.add_option(parameter.isNeeded ? name : "--" + name, given.number, parameter.help)
+      ->required(parameter.isNeeded)
+      ->transform(parameter.most == std::numeric_limits<std::uint64_t>::max()
+                      ? decimal<std::uint64_t>()
+                      : decimal<std::uint32_t>());
 }
 
 }  // namespace
 
 void addNandCommands(CLI::App& vespctl) {
   CLI::App* nand = vespctl.add_subcommand("nand", "Asks a device for its storage statistics");
-  const auto arguments = std::make_shared<NandArguments>();
-  nand->add_option("DIR", arguments->device, "The device directory")->required();
-  for (const NandVerb& verb : kVerbs) {
-    CLI::App* command = nand->add_subcommand(verb.name, verb.help);
-    if (verb.addOptions != nullptr) {
-      verb.addOptions(*command, *arguments);
+  const auto directory = std::make_shared<std::string>();
+  nand->add_option("DIR", *directory, "The device directory")->required();
+  for (const EntryPointRow& row : entryPoints()) {
+    CLI::App* command = nand->add_subcommand(row.command, row.help);
+    const auto given = std::make_shared<std::vector<GivenArgument>>(row.parameters.size());
+    for (std::size_t i = 0; i < given->size(); ++i) {
+      addParameter(*command, row.parameters[i], (*given)[i]);
     }
-    command->callback([arguments, &verb] { callVerb(verb, *arguments); });
+    command->callback([directory, given, &row] {
+      std::vector<std::uint64_t> values;
+      for (std::size_t i = 0; i < given->size(); ++i) {
+        values.push_back(row.parameters[i].isFlag() ? (*given)[i].flag : (*given)[i].number);
+      }
+      const std::unique_ptr<HostPlatform> device = openDevice(*directory);
+      const InstalledPlatform installed(*device);
+      std::cout << callAside(row, values) << '\n';
+    });
   }
   allowOneCommand(*nand);
 }

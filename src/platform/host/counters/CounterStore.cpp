@@ -45,6 +45,16 @@ constexpr const char* kSchema = R"(
   PRAGMA user_version = 1;
 )";
 
+/// `wrapping_sum` in statements: one look-up of the row is enough to add to it.
+void sumInStatement(sqlite3_context* context, int /*count*/, sqlite3_value** values) {
+  if (sqlite3_value_type(values[0]) != SQLITE_INTEGER) {
+    sqlite3_result_error_code(context, SQLITE_CORRUPT);
+    return;
+  }
+  sqlite3_result_int64(context,
+                       wrappingSum(sqlite3_value_int64(values[0]), sqlite3_value_int64(values[1])));
+}
+
 void appendBytes(Bytes& bytes, const void* value, std::size_t size) {
   const std::size_t end = bytes.size();
   bytes.resize(end + size);
@@ -69,10 +79,12 @@ bool isCounterKey(std::string_view key, std::string& error) {
 
 struct CounterStore::Writer {
   explicit Writer(const SqliteConnection& connection)
-      : readScalar(connection, "SELECT value FROM scalar WHERE day = ? AND key = ?"),
-        putScalar(connection,
+      : putScalar(connection,
                   "INSERT INTO scalar (day, key, value) VALUES (?, ?, ?) "
                   "ON CONFLICT DO UPDATE SET value = excluded.value"),
+        addScalar(connection,
+                  "INSERT INTO scalar (day, key, value) VALUES (?, ?, ?) "
+                  "ON CONFLICT DO UPDATE SET value = wrapping_sum(value, excluded.value)"),
         findDistribution(connection, "SELECT id FROM distribution WHERE day = ? AND key = ?"),
         putDistribution(connection, "INSERT INTO distribution (day, key) VALUES (?, ?)"),
         lastChunk(connection,
@@ -82,8 +94,8 @@ struct CounterStore::Writer {
                  "INSERT OR REPLACE INTO chunk (distribution, sequence, samples, offsets) "
                  "VALUES (?, ?, ?, ?)") {}
 
-  SqliteStatement readScalar;
   SqliteStatement putScalar;
+  SqliteStatement addScalar;
   SqliteStatement findDistribution;
   SqliteStatement putDistribution;
   SqliteStatement lastChunk;
@@ -123,6 +135,12 @@ std::string CounterStore::emptyDatabase() {
 
 CounterStore::Writer& CounterStore::writer() {
   if (!_writer) {
+    const int result = sqlite3_create_function_v2(_connection.handle(), "wrapping_sum", 2,
+                                                  SQLITE_UTF8 | SQLITE_DETERMINISTIC, nullptr,
+                                                  sumInStatement, nullptr, nullptr, nullptr);
+    if (result != SQLITE_OK) {
+      _connection.fail(result);
+    }
     _writer = std::make_shared<Writer>(_connection);
   }
   return *_writer;
@@ -133,10 +151,7 @@ void CounterStore::setScalar(std::int32_t day, std::string_view key, std::int64_
 }
 
 void CounterStore::addToScalar(std::int32_t day, std::string_view key, std::int64_t value) {
-  SqliteStatement& read = writer().readScalar.bind(1, day).bind(2, key);
-  const std::int64_t stored = read.step() ? read.integer(0) : 0;
-  read.reset();
-  setScalar(day, key, wrappingSum(stored, value));
+  writer().addScalar.bind(1, day).bind(2, key).bind(3, value).run();
 }
 
 std::int64_t CounterStore::distributionForWriting(std::int32_t day, std::string_view key) {

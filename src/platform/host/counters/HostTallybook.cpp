@@ -47,9 +47,10 @@ HostTallybook::HostTallybook(const DeviceDirectory& directory, Clock& clock,
 HostTallybook::~HostTallybook() {
   runGuarded(_log, "counters", [this] {
     std::string error;
-    if (!flush(error)) {
+    if (!checkpoint(error)) {
+      const std::size_t lost = _pending.scalars.size() + _pending.samples.size();
       _log.write(LogLevel::Error,
-                 "changes of " + std::to_string(_pending.size()) + " counters are lost: " + error);
+                 "changes of " + std::to_string(lost) + " counters are lost: " + error);
     }
   });
 }
@@ -60,81 +61,136 @@ Date HostTallybook::dateForDaysSince1970(std::int32_t day) { return startOfDay(d
 
 void HostTallybook::TBClientCheckpoint() {
   std::string error;
-  if (!flush(error)) {
+  if (!checkpoint(error)) {
     _log.write(LogLevel::Error, "counters wait for the next checkpoint: " + error);
   }
 }
 
 void HostTallybook::TBClientSetValueForScalarKey(std::string_view key, std::int64_t value) {
-  collect(key, {true, value});
+  std::string error;
+  if (!setScalar(key, value, error)) {
+    logRefusal(error);
+  }
 }
 
 void HostTallybook::TBClientAddValueForScalarKey(std::string_view key, std::int64_t value) {
-  collect(key, {false, value});
+  std::string error;
+  if (!addToScalar(key, value, error)) {
+    logRefusal(error);
+  }
 }
 
-void HostTallybook::collect(std::string_view key, PendingScalar change) {
-  std::string error;
-  if (!isCounterKey(key, error)) {
-    _log.write(LogLevel::Error, "a counter is refused: " + error);
-    return;
+void HostTallybook::logRefusal(const std::string& error) {
+  _log.write(LogLevel::Error, "a counter is refused: " + error);
+}
+
+/// The entry of a counter among those collected, made when it is missing; null, with a text in
+/// `error`, when the key is refused.
+template <typename Counters>
+typename Counters::mapped_type* HostTallybook::pendingCounter(Counters& counters, std::int32_t day,
+                                                              std::string_view key,
+                                                              std::string& error) {
+  const auto found = counters.find(std::pair(day, key));
+  if (found != counters.end()) {
+    return &found->second;
   }
+  return isCounterKey(key, error) ? &counters[{day, std::string(key)}] : nullptr;
+}
+
+bool HostTallybook::setScalar(std::string_view key, std::int64_t value, std::string& error) {
   const std::int32_t today = TBDaysSince1970();
   const std::scoped_lock guard(_pendingMutex);
-  const auto [entry, isNew] = _pending.try_emplace({today, std::string(key)}, change);
-  if (isNew) {
-    return;
+  PendingScalar* const pending = pendingCounter(_pending.scalars, today, key, error);
+  if (pending != nullptr) {
+    *pending = {true, value};
   }
-  if (change.isSet) {
-    entry->second = change;
-  } else {
-    entry->second.value = wrappingSum(entry->second.value, change.value);
-  }
+  return pending != nullptr;
 }
 
-bool HostTallybook::flush(std::string& error) {
-  const std::scoped_lock flushing(_flushMutex);
-  PendingScalars changes;
+bool HostTallybook::addToScalar(std::string_view key, std::int64_t value, std::string& error) {
+  const std::int32_t today = TBDaysSince1970();
+  const std::scoped_lock guard(_pendingMutex);
+  PendingScalar* const pending = pendingCounter(_pending.scalars, today, key, error);
+  if (pending != nullptr) {
+    pending->value = wrappingSum(pending->value, value);
+  }
+  return pending != nullptr;
+}
+
+bool HostTallybook::addSample(std::string_view key, double value, std::string& error) {
+  const Date now = _clock.now();
+  const std::int32_t today = daysSince1970(now);
+  const auto secondsInDay = static_cast<std::int32_t>(now.seconds - startOfDay(today).seconds);
+  const std::scoped_lock guard(_pendingMutex);
+  auto* const pending = pendingCounter(_pending.samples, today, key, error);
+  if (pending == nullptr) {
+    return false;
+  }
+  const Sample sample{value, secondsInDay};
+  if (pending->empty()) {
+    pending->emplace_back(1, sample);
+  } else {
+    pending->back().push_back(sample);
+  }
+  return true;
+}
+
+bool HostTallybook::checkpoint(std::string& error) {
+  const std::scoped_lock running(_checkpointMutex);
+  Changes changes;
   {
     const std::scoped_lock guard(_pendingMutex);
-    changes.swap(_pending);
+    std::swap(changes, _pending);
   }
-  if (changes.empty()) {
+  if (changes.scalars.empty() && changes.samples.empty()) {
     return true;
   }
   const auto apply = [&changes](CounterStore& store) {
-    for (const auto& [place, change] : changes) {
+    for (const auto& [place, change] : changes.scalars) {
       if (change.isSet) {
         store.setScalar(place.first, place.second, change.value);
       } else {
         store.addToScalar(place.first, place.second, change.value);
       }
     }
-    return true;
-  };
-  // Does not allocate: memory may just have run out.
-  const auto keepChanges = [&] {
-    const std::scoped_lock guard(_pendingMutex);
-    for (auto& [place, change] : changes) {
-      if (const auto later = _pending.find(place); later != _pending.end()) {
-        change = later->second.isSet
-                     ? later->second
-                     : PendingScalar{change.isSet, wrappingSum(change.value, later->second.value)};
+    for (const auto& [place, pieces] : changes.samples) {
+      for (const std::vector<Sample>& samples : pieces) {
+        store.appendSamples(place.first, place.second, samples);
       }
     }
-    changes.merge(_pending);
-    _pending.swap(changes);
+    return true;
   };
   try {
     if (write(apply, error)) {
       return true;
     }
   } catch (...) {
-    keepChanges();
+    keepChanges(changes);
     throw;
   }
-  keepChanges();
+  keepChanges(changes);
   return false;
+}
+
+/// Puts changes that were not written before those collected since. Without allocating: memory may
+/// just have run out.
+void HostTallybook::keepChanges(Changes& changes) {
+  const std::scoped_lock guard(_pendingMutex);
+  for (auto& [place, change] : changes.scalars) {
+    if (const auto later = _pending.scalars.find(place); later != _pending.scalars.end()) {
+      change = later->second.isSet
+                   ? later->second
+                   : PendingScalar{change.isSet, wrappingSum(change.value, later->second.value)};
+    }
+  }
+  for (auto& [place, pieces] : changes.samples) {
+    if (const auto later = _pending.samples.find(place); later != _pending.samples.end()) {
+      pieces.splice(pieces.end(), later->second);
+    }
+  }
+  changes.scalars.merge(_pending.scalars);
+  changes.samples.merge(_pending.samples);
+  std::swap(_pending, changes);
 }
 
 std::unique_ptr<TBHistory> HostTallybook::initWithDefaultPath() {

@@ -3,12 +3,14 @@
 #include <chrono>
 #include <cstdint>
 #include <functional>
+#include <list>
 #include <map>
 #include <memory>
 #include <mutex>
 #include <string>
 #include <string_view>
 #include <utility>
+#include <vector>
 
 #include "platform/Clock.h"
 #include "platform/Preferences.h"
@@ -48,6 +50,13 @@ class HostTallybook final : public Tallybook {
   void TBClientAddValueForScalarKey(std::string_view key, std::int64_t value) override;
   std::unique_ptr<TBHistory> initWithDefaultPath() override;
 
+  // The same with a result: false, with a text in `error`, on failure. Samples of today carry the
+  // clock's time of day.
+  bool setScalar(std::string_view key, std::int64_t value, std::string& error);
+  bool addToScalar(std::string_view key, std::int64_t value, std::string& error);
+  bool addSample(std::string_view key, double value, std::string& error);
+  bool checkpoint(std::string& error);
+
   // For tools. Each works at once, all or nothing; false, with a text in `error`, on failure.
 
   /// Runs `work` in one transaction; after damage again on the same file, and at last on a new one.
@@ -64,21 +73,40 @@ class HostTallybook final : public Tallybook {
     bool isSet;  ///< replaces instead of adding
     std::int64_t value;
   };
-  using PendingScalars = std::map<std::pair<std::int32_t, std::string>, PendingScalar>;
+
+  /// Day and key, in the order of the database; found by a `string_view` too.
+  using Place = std::pair<std::int32_t, std::string>;
+  struct PlaceOrder {
+    using is_transparent = void;
+    bool operator()(const auto& left, const auto& right) const {
+      return left.first != right.first
+                 ? left.first < right.first
+                 : std::string_view(left.second) < std::string_view(right.second);
+    }
+  };
+
+  struct Changes {
+    std::map<Place, PendingScalar, PlaceOrder> scalars;
+    /// A list: pieces of two batches are joined without memory.
+    std::map<Place, std::list<std::vector<Sample>>, PlaceOrder> samples;
+  };
 
   class History;
 
-  void collect(std::string_view key, PendingScalar change);
-  bool flush(std::string& error);
+  template <typename Counters>
+  static typename Counters::mapped_type* pendingCounter(Counters& counters, std::int32_t day,
+                                                        std::string_view key, std::string& error);
+  void logRefusal(const std::string& error);
+  void keepChanges(Changes& changes);
   bool recover(const CounterFile::Damage& damage, std::string& error);
 
   Clock& _clock;
   Preferences& _preferences;
   SystemLog& _log;
   CounterFile _file;
-  std::mutex _flushMutex;  ///< during a flush
+  std::mutex _checkpointMutex;  ///< during a checkpoint
   std::mutex _pendingMutex;
-  PendingScalars _pending;
+  Changes _pending;
 };
 
 }  // namespace vesprun

@@ -137,11 +137,6 @@ std::optional<Bytes> swapUsage() {
 
 std::optional<std::string> bootSessionIdentifier() {
   std::string identifier = upperCase(firstLineOf("/proc/sys/kernel/random/boot_id"));
-  // The sandboxed service cannot read /proc/sys; systemd passes the file as a credential.
-  if (const char* credentials = std::getenv("CREDENTIALS_DIRECTORY");
-      identifier.empty() && credentials != nullptr) {
-    identifier = upperCase(firstLineOf(std::string(credentials) + "/boot_id"));
-  }
   return identifier.empty() ? std::nullopt : std::optional(std::move(identifier));
 }
 

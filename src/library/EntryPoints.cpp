@@ -1,0 +1,213 @@
+#include "library/EntryPoints.h"
+
+#include <algorithm>
+#include <array>
+#include <vector>
+
+#include "NANDInfo/lists/StructuredLog.h"
+#include "platform/host/documents/JsonForm.h"
+#include "platform/host/documents/QuotedText.h"
+#include "telemetry/DiskInfo.h"
+#include "telemetry/NVRAMStatistics.h"
+#include "vesprun.hpp"
+
+namespace vesprun {
+namespace {
+
+using Values = std::span<const std::uint64_t>;
+using Answer = std::optional<PropertyValue>;
+
+constexpr std::uint64_t kMost32 = std::numeric_limits<std::uint32_t>::max();
+constexpr std::uint64_t kMost64 = std::numeric_limits<std::uint64_t>::max();
+
+constexpr EntryPointParameter kStatKeys[] = {{"stat-keys", "Names the fields by their ids"}};
+constexpr EntryPointParameter kRound[] = {
+    {"round", "Rounds the numbers to their significant digits"}};
+constexpr EntryPointParameter kMagazine[] = {
+    {"hours", "How long ago the snapshot was taken", kMost64, 0, true},
+    {"raw", "The counters as the snapshot has them, not what they grew by"},
+    {"mode", "0: counters that accumulate, 1: instantaneous values, 2: both", kMost32, 2}};
+constexpr EntryPointParameter kEvents[] = {{"from-step", "The step to begin with, 0 to 6", kMost32},
+                                           {"no-monthly", "Leaves out the step of a month"}};
+constexpr EntryPointParameter kStructuredLog[] = {
+    {"flag", "Passes the caller's flag on to the controller"},
+    {"force", "Collects the validity list in any case"}};
+
+Answer answer(std::optional<PropertyDict> dict) {
+  return dict ? Answer(*std::move(dict)) : std::nullopt;
+}
+
+/// True when the controller could be opened; it is closed again.
+bool connectsToController() {
+  ORUConnection connection;
+  const bool opened = openORUConnection(connection);
+  closeORUConnection(connection);
+  return opened;
+}
+
+std::uint32_t low32(std::uint64_t value) { return static_cast<std::uint32_t>(value); }
+
+constexpr EntryPointRow kEntryPoints[] = {
+    {"info",
+     "CopyNANDInfo",
+     "The legacy NAND info",
+     {},
+     [](Values) { return answer(CopyNANDInfo()); }},
+    {"info-for-daily-log",
+     "CopyNANDInfoWithOptions",
+     "The legacy NAND info, on the days when the daily log has it",
+     {},
+     [](Values) { return answer(CopyNANDInfoWithOptions({})); }},
+    {"dump",
+     "DumpNANDInfo",
+     "The legacy NAND info without its version fields",
+     {},
+     [](Values) {
+       PropertyDict info;
+       DumpNANDInfo(info);
+       return answer(std::move(info));
+     }},
+    {"ftl-raw", "CopyNANDFTLInfo", "The FTL fields, all of them", kStatKeys,
+     [](Values values) { return answer(CopyNANDFTLInfo(values[0] != 0, 1)); }},
+    {"ftl", "CopyWhitelistedNANDFTLInfo", "The FTL fields that may leave the device", kRound,
+     [](Values values) { return answer(CopyWhitelistedNANDFTLInfo(values[0] != 0)); }},
+    {"msp", "CopyWhitelistedNANDMSPInfo", "The fields of each MSP that may leave the device",
+     kRound, [](Values values) { return answer(CopyWhitelistedNANDMSPInfo(values[0] != 0)); }},
+    {"storage-stats", "CopyWhitelistedStorageStats",
+     "The storage statistics that may leave the device", kRound,
+     [](Values values) { return answer(CopyWhitelistedStorageStats(values[0] != 0)); }},
+    {"vm-freezer",
+     "CopyVMFreezerNANDInfo",
+     "What the kernel's swap-out thread has written",
+     {},
+     [](Values) { return answer(CopyVMFreezerNANDInfo()); }},
+    {"magazine", "CopySMagNANDFTLInfo", "What happened since a snapshot of the stats magazine",
+     kMagazine,
+     [](Values values) {
+       return answer(CopySMagNANDFTLInfo(values[0], values[1] != 0 ? 0 : 1, low32(values[2])));
+     }},
+    {"magazine-history",
+     "CopySMagNANDFTLCustomHistoryInfo",
+     "The write amplification of the last six periods of four hours",
+     {},
+     [](Values) { return answer(CopySMagNANDFTLCustomHistoryInfo(0)); }},
+    {"tendmark",
+     "CopyTendmarkNANDInfo",
+     "The storage's health, for service plans",
+     {},
+     [](Values) { return answer(CopyTendmarkNANDInfo()); }},
+    {"ota",
+     "CopyOTANANDInfo",
+     "The storage's health, for updates over the air",
+     {},
+     [](Values) { return answer(CopyOTANANDInfo()); }},
+    {"lab",
+     "CopyInternalLabNANDInfo",
+     "The storage's health, for labs",
+     {},
+     [](Values) { return answer(CopyInternalLabNANDInfo()); }},
+    {"recommends-deletion",
+     "NandRecommendsContentDeletion",
+     "Does the controller recommend deleting content?",
+     {},
+     [](Values) { return Answer(NandRecommendsContentDeletion()); }},
+    {"events", "NandInfoExtractToEH_runAllSteps",
+     "Sends the storage statistics as analytics events, and shows what was sent", kEvents,
+     [](Values values) {
+       return answer(NandInfoExtractToEH_runAllSteps(0, values[1] == 0, 1, low32(values[0])));
+     }},
+    {"structured-log", "DumpStorageStructuredLog",
+     "Logs the controller's lists: true when all could be handled", kStructuredLog,
+     [](Values values) {
+       gForceCollectionSet = values[1] != 0 ? 1 : 0;
+       return Answer(DumpStorageStructuredLog(values[0] != 0));
+     }},
+    {"disk",
+     "GetDiskInfo",
+     "Size and fullness of the user data volume",
+     {},
+     [](Values) { return answer(GetDiskInfo()); }},
+    {"nvram",
+     "gatherNVRAMStats",
+     "The usage and write counters of the NVRAM",
+     {},
+     [](Values) { return answer(gatherNVRAMStats()); }},
+    {"connect",
+     "openORUConnection",
+     "Opens the controller and closes it: true when it could be opened",
+     {},
+     [](Values) { return Answer(connectsToController()); }},
+};
+
+/// The value of an argument as JSON has it; nothing when it is not of the parameter's kind.
+std::optional<std::uint64_t> argumentValue(const EntryPointParameter& parameter,
+                                           const PropertyValue& value) {
+  if (parameter.isFlag()) {
+    const bool* const flag = value.boolean();
+    return flag != nullptr ? std::optional<std::uint64_t>(*flag) : std::nullopt;
+  }
+  const Number* const number = value.number();
+  if (number == nullptr || number->isFloatingPoint() ||
+      (number->isSigned() && number->asInt64() < 0) || number->asUInt64() > parameter.most) {
+    return std::nullopt;
+  }
+  return number->asUInt64();
+}
+
+}  // namespace
+
+std::span<const EntryPointRow> entryPoints() { return kEntryPoints; }
+
+std::string callToJson(const EntryPointRow& entryPoint, std::span<const std::uint64_t> values) {
+  const Answer result = entryPoint.call(values);
+  return "{\"result\":" + (result ? jsonText(*result) : "null") +
+         ",\"error\":" + jsonText(PropertyValue(GetAPIErrorMessage())) + '}';
+}
+
+std::optional<std::string> callByName(std::string_view name, std::string_view arguments,
+                                      std::string& error) {
+  const auto* const row = std::find_if(
+      std::begin(kEntryPoints), std::end(kEntryPoints),
+      [name](const EntryPointRow& each) { return name == each.command || name == each.function; });
+  if (row == std::end(kEntryPoints)) {
+    error = "there is no entry point " + quotedText(name);
+    return std::nullopt;
+  }
+  const std::string place = row->command + std::string(": ");
+  std::vector<std::optional<std::uint64_t>> given(row->parameters.size());
+  if (!arguments.empty()) {
+    const std::optional<PropertyValue> value = valueFromJsonText(arguments, error);
+    if (!value || value->dict() == nullptr) {
+      error = place + "the arguments are no JSON object" + (value ? "" : ": " + error);
+      return std::nullopt;
+    }
+    for (const auto& [key, argument] : *value->dict()) {
+      const auto parameter = std::find_if(row->parameters.begin(), row->parameters.end(),
+                                          [&](const auto& each) { return each.name == key; });
+      if (parameter == row->parameters.end()) {
+        error = place + "there is no argument " + quotedText(key);
+        return std::nullopt;
+      }
+      auto& place_ = given[static_cast<std::size_t>(parameter - row->parameters.begin())];
+      place_ = argumentValue(*parameter, argument);
+      if (!place_) {
+        error =
+            place + key +
+            (parameter->isFlag() ? " is neither true nor false"
+                                 : " is no number from 0 to " + std::to_string(parameter->most));
+        return std::nullopt;
+      }
+    }
+  }
+  std::vector<std::uint64_t> values;
+  for (std::size_t i = 0; i < given.size(); ++i) {
+    if (!given[i] && row->parameters[i].isNeeded) {
+      error = place + row->parameters[i].name + " is missing";
+      return std::nullopt;
+    }
+    values.push_back(given[i].value_or(row->parameters[i].absent));
+  }
+  return callToJson(*row, values);
+}
+
+}  // namespace vesprun
