@@ -5,7 +5,6 @@
 #include <vector>
 
 #include "NANDInfo/lists/StructuredLog.h"
-#include "NANDInfo/StructuredLogState.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/QuotedText.h"
 #include "telemetry/DiskInfo.h"

@@ -6,6 +6,7 @@
 #include <thread>
 
 #include "NANDInfo/parsers/APIErrorMessage.h"
+#include "common/ProcessState.h"
 #include "platform/host/HostPlatform.h"
 #include "platform/host/counters/CounterLines.h"
 #include "platform/host/counters/HostTallybook.h"
@@ -129,7 +130,7 @@ TEST_F(VesprunLibraryTest, LosesNothingOfThreadsAndProcessesThatWriteAtOnce) {
 
 TEST_F(VesprunLibraryTest, GivesTheResultOfAnEntryPointAsJson) {
   open();
-  forgetAPIErrorMessage();
+  ProcessState::startAfresh();
   for (const char* name : {"vm-freezer", "CopyVMFreezerNANDInfo"}) {
     EXPECT_EQ(call(name), R"({"result":{},"error":"NA"})");
   }
@@ -138,7 +139,7 @@ TEST_F(VesprunLibraryTest, GivesTheResultOfAnEntryPointAsJson) {
             R"({"result":null,"error":"gatherORUFTLData: Could not get nand_exporter_t"})");
   EXPECT_THAT(call("magazine", R"({"hours":24,"raw":false,"mode":4294967295})"),
               HasSubstr("com.quill.NANDInfo.IsStatMagSupported"));
-  forgetAPIErrorMessage();
+  ProcessState::startAfresh();
 }
 
 TEST_F(VesprunLibraryTest, SaysWhatIsWrongWithACall) {

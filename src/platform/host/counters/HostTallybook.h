@@ -50,15 +50,14 @@ class HostTallybook final : public Tallybook {
   void TBClientAddValueForScalarKey(std::string_view key, std::int64_t value) override;
   std::unique_ptr<TBHistory> initWithDefaultPath() override;
 
-  // The same for those who want to know why it failed: false, with a text in `error`. Beside
-  // scalars, they collect samples of today, recorded at the clock's time of day.
+  // The same with a result: false, with a text in `error`, on failure. Samples of today carry the
+  // clock's time of day.
   bool setScalar(std::string_view key, std::int64_t value, std::string& error);
   bool addToScalar(std::string_view key, std::int64_t value, std::string& error);
   bool addSample(std::string_view key, double value, std::string& error);
   bool checkpoint(std::string& error);
 
-  // What tools need beside. Each writes or reads at once, all or nothing; false, with a text in
-  // `error`, when that failed.
+  // For tools. Each works at once, all or nothing; false, with a text in `error`, on failure.
 
   /// Runs `work` in one transaction; after damage again on the same file, and at last on a new one.
   /// A false result undoes everything.
@@ -105,7 +104,7 @@ class HostTallybook final : public Tallybook {
   Preferences& _preferences;
   SystemLog& _log;
   CounterFile _file;
-  std::mutex _checkpointMutex;  ///< held for the whole of a checkpoint
+  std::mutex _checkpointMutex;  ///< during a checkpoint
   std::mutex _pendingMutex;
   Changes _pending;
 };
