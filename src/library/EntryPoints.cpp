@@ -182,8 +182,9 @@ std::optional<std::string> callByName(std::string_view name, std::string_view ar
       return std::nullopt;
     }
     for (const auto& [key, argument] : *value->dict()) {
-      const auto parameter = std::find_if(row->parameters.begin(), row->parameters.end(),
-                                          [&](const auto& each) { return each.name == key; });
+      const auto parameter =
+          std::find_if(row->parameters.begin(), row->parameters.end(),
+                       [&name = key](const auto& each) { return each.name == name; });
       if (parameter == row->parameters.end()) {
         error = place + "there is no argument " + quotedText(key);
         return std::nullopt;

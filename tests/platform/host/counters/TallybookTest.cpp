@@ -508,20 +508,34 @@ TEST_F(TallybookTest, KeepsWhatItCollectedWhenMemoryRunsOut) {
   class FailingPreferences final : public Preferences {
     std::optional<PropertyValue> LGSPreferencesGetValue(std::string_view /*key*/,
                                                         std::string_view /*domain*/) override {
+      if (onRead) {
+        onRead();
+      }
       throw std::bad_alloc();
     }
     void LGSPreferencesSetValue(std::optional<std::string_view> /*key*/,
                                 std::optional<PropertyValue> /*value*/,
                                 std::string_view /*domain*/) override {}
     bool LGSPreferencesSynchronize(std::string_view /*domain*/) override { return true; }
+
+   public:
+    std::function<void()> onRead;
   } failing;
   HostTallybook tallybook(device, clock, failing, log);
-  tallybook.TBClientAddValueForScalarKey("k", 1);
+  const auto change = [&](int value) {
+    tallybook.TBClientAddValueForScalarKey("k", value);
+    EXPECT_TRUE(tallybook.addSample("v", value, error));
+  };
+  change(1);
+  failing.onRead = [&] { change(2); };  // in the middle of the checkpoint
   folder.write(kFile, "damaged");
   EXPECT_THROW(tallybook.TBClientCheckpoint(), std::bad_alloc);
-  tallybook.TBClientAddValueForScalarKey("k", 1);
+  failing.onRead = nullptr;
+  change(4);
   tallybook.TBClientCheckpoint();
-  EXPECT_EQ(dump(), scalar(2));
+  EXPECT_EQ(dump(), scalar(7) +
+                        "sample\t19787\tv\t1\t33302\nsample\t19787\tv\t2\t33302\n"
+                        "sample\t19787\tv\t4\t33302\n");
   folder.write(kFile, "damaged");
   HostTallybook(device, clock, failing, log).TBClientAddValueForScalarKey("k", 1);
 }
