@@ -67,8 +67,8 @@ void recordCounters(HostPlatform& device) {
   }
 }
 
-/// The time that the controller's statistics tell of: now, unless SOURCE_DATE_EPOCH asks for the same
-/// bytes each time.
+/// The time that the controller's statistics tell of: now, unless SOURCE_DATE_EPOCH asks for the
+/// same bytes each time.
 Date sampleTime(Clock& clock) {
   const char* const epoch = std::getenv("SOURCE_DATE_EPOCH");
   std::int64_t seconds = 0;
