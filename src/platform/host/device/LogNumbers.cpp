@@ -19,7 +19,6 @@
 namespace vesprun {
 namespace {
 
-constexpr std::string_view kLogFolder = "outbox/logs";
 constexpr std::string_view kNumberFile = "outbox/.log-number";
 
 /// What changes with every log that is added, removed or noted as removed.

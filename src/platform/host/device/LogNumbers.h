@@ -9,6 +9,9 @@
 
 namespace vesprun {
 
+/// The folder of the logs, in the device.
+inline constexpr std::string_view kLogFolder = "outbox/logs";
+
 /// The number that a log's or header's name begins with.
 std::optional<std::uint64_t> logNumber(std::string_view name);
 

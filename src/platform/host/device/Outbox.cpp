@@ -14,7 +14,6 @@
 namespace vesprun {
 namespace {
 
-constexpr std::string_view kLogFolder = "outbox/logs";
 constexpr std::string_view kPtreeLogType = "193";  // the other logs are text
 
 class OutboxLogFile : public LogFileHandle {
