@@ -4,7 +4,7 @@ namespace vesprun {
 
 const FieldRange* FieldTable::find(const FieldName& name) const {
   const std::size_t mask = _slots.size() - 1;
-  std::size_t slot = hashOfStem(name.stem) & mask;
+  std::size_t slot = hashOfText(name.stem) & mask;
   while (_slots[slot] != 0 && _ranges[_slots[slot] - 1U].stem != name.stem) {
     slot = (slot + 1) & mask;
   }
