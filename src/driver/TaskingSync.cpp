@@ -1,15 +1,13 @@
 #include "driver/TaskingSync.h"
 
-#include <algorithm>
 #include <cstdint>
 #include <functional>
 #include <optional>
 #include <set>
 #include <string>
 #include <string_view>
-#include <unordered_map>
+#include <unordered_set>
 #include <utility>
-#include <vector>
 
 #include "common/PropertyDict.h"
 #include "common/TextForm.h"
@@ -124,6 +122,7 @@ void applyTasking(const OptionalValue& tasking, const OptionalValue& build, Doma
 
 /// The own domain, which says what was applied, comes last.
 void synchronize(DomainSet changed) {
+  platform().systemConfiguration().synchronize();
   platform().servicesClient().synchronizeAllUsers();
   const bool own = changed.erase(std::string(kOwnDomain)) != 0;
   for (const std::string& domain : changed) {
@@ -169,22 +168,46 @@ void syncTasking(const OptionalValue& build) {
   platform().notificationCenter().PostNotification("com.quill.da.tasking_changed");
 }
 
-/// A text that is the same for equal values, -0.0 and 0 too, and seldom so for others.
-std::string bucketOf(const PropertyValue& value) {
+/// The same for equal values, and seldom so for others: numbers are equal whatever their kinds, and
+/// dictionaries whatever the order of their entries.
+std::size_t hashOf(const PropertyValue& value) {
   if (const Number* number = value.number()) {
-    return std::to_string(number->asDouble() + 0.0);
+    return std::hash<double>{}(number->asDouble());
   }
-  return value.string() != nullptr ? *value.string() : "";
+  if (const std::string* text = value.string()) {
+    return hashOfText(*text);
+  }
+  if (const Bytes* data = value.data()) {
+    return hashOfText({reinterpret_cast<const char*>(data->data()), data->size()});
+  }
+  std::size_t hash = 0;
+  if (const PropertyArray* array = value.array()) {
+    for (const PropertyValue& element : *array) {
+      hash = hash * 31 + hashOf(element);
+    }
+  } else if (const PropertyDict* dict = value.dict()) {
+    for (const auto& [key, entry] : *dict) {
+      hash += key.hash() * (hashOf(entry) | 1);
+    }
+  } else {
+    hash = hashOfText(textForm(value));
+  }
+  return hash;
 }
 
 PropertyArray distinctEntries(const PropertyArray& entries) {
+  struct Hash {
+    std::size_t operator()(const PropertyValue* value) const { return hashOf(*value); }
+  };
+  struct Equal {
+    bool operator()(const PropertyValue* left, const PropertyValue* right) const {
+      return *left == *right;
+    }
+  };
+  std::unordered_set<const PropertyValue*, Hash, Equal> seen;
   PropertyArray distinct;
-  std::unordered_map<std::string, std::vector<const PropertyValue*>> buckets;
   for (const PropertyValue& entry : entries) {
-    std::vector<const PropertyValue*>& bucket = buckets[bucketOf(entry)];
-    if (std::none_of(bucket.begin(), bucket.end(),
-                     [&entry](const PropertyValue* other) { return *other == entry; })) {
-      bucket.push_back(&entry);
+    if (seen.insert(&entry).second) {
       distinct.push_back(entry);
     }
   }

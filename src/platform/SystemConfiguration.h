@@ -22,12 +22,16 @@ class LGSSystemConfiguration {
                                                                        std::string_view domain,
                                                                        std::uint32_t options) = 0;
 
-  /// Sets `value`, or removes the key when there is none. With `sync` the domain's changes are
-  /// durable when this returns, else when the domain is next written or at the latest when the
-  /// process ends. A missing `key` is refused like a bad domain.
+  /// Sets `value`, or removes the key when there is none. With `sync` the next `synchronize` makes
+  /// the domain's changes durable, else they are when the domain is next written or at the latest
+  /// when the process ends. A missing `key` is refused like a bad domain.
   virtual void setPrefsKeyValueForDomainWithSync(std::optional<std::string_view> key,
                                                  std::optional<PropertyValue> value,
                                                  std::string_view domain, bool sync) = 0;
+
+  /// Writes each domain that was changed with `sync`, once however many its changes are. What fails
+  /// is told in the system log.
+  virtual void synchronize() = 0;
 
   /// The log types that are disabled unless the user's preferences say otherwise, in order.
   virtual PropertyArray getLogBlacklist() = 0;

@@ -285,6 +285,7 @@ struct FailingSystemConfiguration : Failing<LGSSystemConfiguration> {
                                          std::string_view domain, bool sync) override {
     sound(__func__).setPrefsKeyValueForDomainWithSync(key, std::move(value), domain, sync);
   }
+  void synchronize() override { sound(__func__).synchronize(); }
   PropertyArray getLogBlacklist() override { return sound(__func__).getLogBlacklist(); }
 };
 
