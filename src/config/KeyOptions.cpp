@@ -1,7 +1,8 @@
 #include "config/KeyOptions.h"
 
 #include <algorithm>
-#include <string_view>
+
+#include "common/TextForm.h"
 
 namespace vesprun {
 namespace {
@@ -20,19 +21,29 @@ bool readUnsigned(const PropertyDict& options, std::string_view name,
 
 std::optional<ScalarOptions> ScalarOptions::read(const PropertyDict& options) {
   ScalarOptions read;
-  const bool isReadable = readUnsigned(options, "bucket_interval", read.bucketInterval) &&
-                          readUnsigned(options, "sig_fig", read.significantDigits);
+  const bool isReadable = readUnsigned(options, kBucketInterval, read.bucketInterval) &&
+                          readUnsigned(options, kSignificantDigits, read.significantDigits);
   return isReadable ? std::optional(read) : std::nullopt;
 }
 
 std::optional<DistributionOptions> DistributionOptions::read(const PropertyDict& options) {
-  const PropertyArray* intervals = options.findArray("intervals");
+  const PropertyArray* intervals = options.findArray(kIntervals);
   const bool isReadable =
       intervals != nullptr
           ? std::all_of(intervals->begin(), intervals->end(),
                         [](const PropertyValue& boundary) { return boundary.number() != nullptr; })
-          : !options.contains("intervals");
+          : !options.contains(kIntervals);
   return isReadable ? std::optional(DistributionOptions{intervals}) : std::nullopt;
+}
+
+bool DistributionOptions::operator==(const DistributionOptions& other) const {
+  if (intervals == nullptr || other.intervals == nullptr) {
+    return intervals == other.intervals;
+  }
+  // As labels show them, in which NaN is like itself.
+  return std::equal(
+      intervals->begin(), intervals->end(), other.intervals->begin(), other.intervals->end(),
+      [](const auto& left, const auto& right) { return textForm(left) == textForm(right); });
 }
 
 }  // namespace vesprun

@@ -1,8 +1,8 @@
 #include "config/TBConfig.h"
 
 #include <cstdint>
+#include <optional>
 #include <utility>
-#include <vector>
 
 #include "common/TextForm.h"
 #include "config/InternalDevice.h"
@@ -23,27 +23,11 @@ std::optional<std::string> readWhitelist() {
   return fileSystem.readFile(kWhitelistPath);
 }
 
-template <typename Options>
-void takeList(const WhitelistKeyGroup& group, const std::string& list, const PropertyValue& entries,
-              WhitelistTable<Options>& table) {
-  if (entries.dict() == nullptr) {
-    logMessage(LogLevel::Error, "Whitelist group %s: %s is not a dictionary and is skipped",
-               group.name.c_str(), list.c_str());
-    return;
-  }
-  for (const auto& [key, written] : *entries.dict()) {
-    const PropertyDict* options = written.dict();
-    table.insert_or_assign(
-        key, WhitelistEntry<Options>{group.name,
-                                     options != nullptr ? Options::read(*options) : std::nullopt});
-  }
-}
-
-template <typename Options>
-void reportHeldBack(const char* list, const WhitelistTable<Options>& table) {
+template <typename Entries>
+void reportHeldBack(std::string_view list, const Entries& entries) {
   std::size_t count = 0;
   std::string first;
-  for (const auto& [key, entry] : table) {
+  for (const auto& [key, entry] : entries) {
     if (!entry.options && count++ == 0) {
       first.append(key).append(" in group ").append(entry.group);
     }
@@ -52,32 +36,8 @@ void reportHeldBack(const char* list, const WhitelistTable<Options>& table) {
     logMessage(LogLevel::Error,
                "Whitelist: %s: options of %zu keys cannot be read, which are left out; the first "
                "is %s",
-               list, count, first.c_str());
+               list.data(), count, first.c_str());
   }
-}
-
-template <typename Options>
-PrefixTable prefixTableOf(const WhitelistTable<Options>& prefixes) {
-  std::vector<std::string_view> texts;
-  texts.reserve(prefixes.size());
-  for (const auto& [prefix, entry] : prefixes) {
-    texts.push_back(prefix);
-  }
-  return PrefixTable(texts);
-}
-
-template <typename Options>
-WhitelistDecision<Options> decide(std::string_view key, const WhitelistTable<Options>& keys,
-                                  const WhitelistTable<Options>& prefixes,
-                                  const PrefixTable& prefixTable, bool isInternalDevice) {
-  if (const auto named = keys.find(key); named != keys.end()) {
-    return {DecidedBy::Key, {}, &named->second};
-  }
-  if (const std::optional<std::size_t> place = prefixTable.find(key)) {
-    const auto& [prefix, entry] = *prefixes.nth(*place);
-    return {DecidedBy::Prefix, prefix, &entry};
-  }
-  return {isInternalDevice ? DecidedBy::InternalDevice : DecidedBy::Nothing, {}, nullptr};
 }
 
 template <typename Options>
@@ -134,12 +94,13 @@ TBConfig::TBConfig(PropertyValue document)
     }
   }
   // After the last group: a later one may name a key again, with options that can be read.
-  reportHeldBack("ScalarKeys", _scalarKeys);
-  reportHeldBack("DistributionKeys", _distributionKeys);
-  reportHeldBack("ScalarKeyPrefixes", _scalarPrefixes);
-  reportHeldBack("DistributionKeyPrefixes", _distributionPrefixes);
-  _scalarPrefixTable = prefixTableOf(_scalarPrefixes);
-  _distributionPrefixTable = prefixTableOf(_distributionPrefixes);
+  const auto& scalars = _tables.of<ScalarOptions>();
+  const auto& distributions = _tables.of<DistributionOptions>();
+  reportHeldBack(ScalarOptions::kKeyList, scalars.keys());
+  reportHeldBack(DistributionOptions::kKeyList, distributions.keys());
+  reportHeldBack(ScalarOptions::kPrefixList, scalars.prefixes());
+  reportHeldBack(DistributionOptions::kPrefixList, distributions.prefixes());
+  _tables.indexPrefixes();
 }
 
 void TBConfig::takeGroup(const WhitelistKeyGroup& group) {
@@ -148,34 +109,54 @@ void TBConfig::takeGroup(const WhitelistKeyGroup& group) {
                group.name.c_str());
     return;
   }
-  for (const auto& [list, entries] : *group.lists.dict()) {
-    if (list == "ScalarKeys") {
-      takeList(group, list, entries, _scalarKeys);
-    } else if (list == "ScalarKeyPrefixes") {
-      takeList(group, list, entries, _scalarPrefixes);
-    } else if (list == "DistributionKeys") {
-      takeList(group, list, entries, _distributionKeys);
-    } else if (list == "DistributionKeyPrefixes") {
-      takeList(group, list, entries, _distributionPrefixes);
-    }
+  for (const std::string_view list : _tables.take(group)) {
+    logMessage(LogLevel::Error, "Whitelist group %s: %s is not a dictionary and is skipped",
+               group.name.c_str(), list.data());
   }
 }
 
-WhitelistDecision<ScalarOptions> TBConfig::decideScalarKey(std::string_view key) const {
-  return decide(key, _scalarKeys, _scalarPrefixes, _scalarPrefixTable, _isInternalDevice);
+template <typename Options>
+WhitelistDecision<Options> TBConfig::decide(std::string_view key) const {
+  WhitelistDecision<Options> decision = _tables.of<Options>().decide(key);
+  if (decision.by == DecidedBy::Nothing && _isInternalDevice) {
+    decision.by = DecidedBy::InternalDevice;
+  }
+  return decision;
 }
 
-WhitelistDecision<DistributionOptions> TBConfig::decideDistributionKey(std::string_view key) const {
-  return decide(key, _distributionKeys, _distributionPrefixes, _distributionPrefixTable,
-                _isInternalDevice);
+template WhitelistDecision<ScalarOptions> TBConfig::decide(std::string_view) const;
+template WhitelistDecision<DistributionOptions> TBConfig::decide(std::string_view) const;
+
+template <typename Options>
+std::vector<PassedOverGroup> TBConfig::groupsPassedOver(std::string_view key) const {
+  std::vector<PassedOverGroup> groups;
+  for (const auto& [name, lists] : *_document.dict()) {
+    const WhitelistKeyGroup group{name, lists};
+    const auto standing = group.standing(_isInternalDevice);
+    if (standing == WhitelistKeyGroup::Standing::Taken || lists.dict() == nullptr) {
+      continue;
+    }
+    WhitelistTables ofGroup;
+    ofGroup.take(group);
+    ofGroup.indexPrefixes();
+    if (const DecidedBy by = ofGroup.of<Options>().decide(key).by; by != DecidedBy::Nothing) {
+      groups.push_back({name, standing, by});
+    }
+  }
+  return groups;
 }
+
+template std::vector<PassedOverGroup> TBConfig::groupsPassedOver<ScalarOptions>(
+    std::string_view) const;
+template std::vector<PassedOverGroup> TBConfig::groupsPassedOver<DistributionOptions>(
+    std::string_view) const;
 
 const ScalarOptions* TBConfig::configOptionsForScalarKey(std::string_view key) const {
-  return optionsOf(key, decideScalarKey(key));
+  return optionsOf(key, decide<ScalarOptions>(key));
 }
 
 const DistributionOptions* TBConfig::configOptionsForDistributionKey(std::string_view key) const {
-  return optionsOf(key, decideDistributionKey(key));
+  return optionsOf(key, decide<DistributionOptions>(key));
 }
 
 }  // namespace vesprun

@@ -1,47 +1,22 @@
 #pragma once
 
-#include <tsl/ordered_map.h>
-
 #include <memory>
-#include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "common/PropertyDict.h"
 #include "config/KeyOptions.h"
-#include "config/PrefixTable.h"
 #include "config/WhitelistKeyGroup.h"
+#include "config/WhitelistTable.h"
 
 namespace vesprun {
 
-/// What the whitelist says of a key or prefix.
-template <typename Options>
-struct WhitelistEntry {
-  std::string_view group;          ///< the last one that names it
-  std::optional<Options> options;  ///< nothing when they cannot be read: held back
-};
-
-/// Keys or prefixes in the order in which they were first named. Texts lie in the document.
-template <typename Options>
-using WhitelistTable = tsl::ordered_map<std::string_view, WhitelistEntry<Options>>;
-
-enum class DecidedBy { Nothing, Key, Prefix, InternalDevice };
-
-/// How the whitelist decides on a key.
-template <typename Options>
-struct WhitelistDecision {
-  DecidedBy by = DecidedBy::Nothing;
-  std::string_view prefix;                         ///< DecidedBy::Prefix
-  const WhitelistEntry<Options>* entry = nullptr;  ///< DecidedBy::Key and Prefix
-
-  /// The options with which the key leaves, or null when it stays.
-  const Options* options() const {
-    static constexpr Options kNoOptions;
-    if (by == DecidedBy::InternalDevice) {
-      return &kNoOptions;
-    }
-    return entry != nullptr && entry->options ? &*entry->options : nullptr;
-  }
+/// A group that does not count on this device although it names a key.
+struct PassedOverGroup {
+  std::string_view name;
+  WhitelistKeyGroup::Standing standing;
+  DecidedBy by;  ///< Key or Prefix
 };
 
 /// The whitelist: which counter keys the daily log may carry, and with which options.
@@ -68,9 +43,16 @@ class TBConfig {
   const ScalarOptions* configOptionsForScalarKey(std::string_view key) const;
   const DistributionOptions* configOptionsForDistributionKey(std::string_view key) const;
 
+  // For both kinds, `ScalarOptions` and `DistributionOptions`:
+
   /// The same with the reason, and without debug lines.
-  WhitelistDecision<ScalarOptions> decideScalarKey(std::string_view key) const;
-  WhitelistDecision<DistributionOptions> decideDistributionKey(std::string_view key) const;
+  template <typename Options>
+  WhitelistDecision<Options> decide(std::string_view key) const;
+
+  /// The groups, in document order, that do not count on this device although their lists of that
+  /// kind name the key, or else a prefix of it.
+  template <typename Options>
+  std::vector<PassedOverGroup> groupsPassedOver(std::string_view key) const;
 
   /// MD5 over the bytes of the whitelist file: 32 lowercase hexadecimal digits.
   const std::string& configFileDigest() const { return _configFileDigest; }
@@ -81,12 +63,7 @@ class TBConfig {
   void takeGroup(const WhitelistKeyGroup& group);
 
   PropertyValue _document;
-  WhitelistTable<ScalarOptions> _scalarKeys;
-  WhitelistTable<ScalarOptions> _scalarPrefixes;
-  WhitelistTable<DistributionOptions> _distributionKeys;
-  WhitelistTable<DistributionOptions> _distributionPrefixes;
-  PrefixTable _scalarPrefixTable;
-  PrefixTable _distributionPrefixTable;
+  WhitelistTables _tables;
   bool _isInternalDevice = false;
   std::string _configFileDigest;
 };

@@ -8,7 +8,7 @@ WhitelistKeyGroup::Standing WhitelistKeyGroup::standing(bool isInternalDevice) c
   if (isInternalDevice) {
     return Standing::Taken;
   }
-  if (name == "InternalTesting") {
+  if (isForInternalDevices()) {
     return Standing::InternalDevicesOnly;
   }
   bool found = false;

@@ -14,6 +14,9 @@ struct WhitelistKeyGroup {
   /// "InternalTesting" does not, nor a group whose preference in "com.quill.da" is there and false.
   Standing standing(bool isInternalDevice) const;
 
+  /// True for the group that counts on internal devices alone.
+  bool isForInternalDevices() const { return name == "InternalTesting"; }
+
   const std::string& name;
   const PropertyValue& lists;  ///< a dictionary, or else the group is to be skipped
 };

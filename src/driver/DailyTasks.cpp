@@ -12,8 +12,6 @@
 namespace vesprun {
 namespace {
 
-constexpr std::string_view kStoredDayKey = "LastCrashLogSerializationDateInDaysSince1970";
-
 /// Longer than a day's work takes; a holder that has stopped must not hold up the others for ever.
 constexpr double kLongestWaitForOthers = 300;
 

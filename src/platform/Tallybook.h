@@ -23,7 +23,8 @@ class TBHistoryDistributionEnumerator {
 /// `minDay` to `maxDay`, both included, whose key begins with `keyPrefix` (the empty prefix: every
 /// key), by ascending day and then by ascending key (byte order). Setting `stop` ends the query
 /// after the row. A database that cannot be read delivers the rows before the damage, and of the
-/// row with the damage the values before it; the service reports it in the system log.
+/// row with the damage the values before it; the service reports it in the system log, and the
+/// query gives false.
 class TBHistory {
  public:
   using ScalarRowHandler =
@@ -34,12 +35,11 @@ class TBHistory {
 
   virtual ~TBHistory() = default;
 
-  /// False when the database could not be read to its end.
   virtual bool scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
       std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
       const ScalarRowHandler& rowHandler) = 0;
 
-  virtual void distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+  virtual bool distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
       std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
       const DistributionRowHandler& rowHandler) = 0;
 };

@@ -146,6 +146,14 @@ std::int64_t valueOf(const Row& row, std::uint64_t gateNumber) {
 
 }  // namespace
 
+std::vector<std::string_view> vmStatisticKeys() {
+  std::vector<std::string_view> keys;
+  for (const Row& row : kRows) {
+    keys.emplace_back(row.key);
+  }
+  return keys;
+}
+
 void reportVMStats(TBReport& report) {
   const Gates gates;
   for (const Row& row : kRows) {

@@ -21,14 +21,16 @@ PropertyDict headerOf(const std::optional<PropertyValue>& last, const PropertyVa
 
 }  // namespace
 
-void submitDailyLog(const PropertyDict& document) {
+std::optional<std::string> serializeDailyLog(const PropertyDict& document) {
   std::string error;
-  const std::optional<std::string> bytes =
-      platform().ptreeSerialization().serialize(document, error);
+  std::optional<std::string> bytes = platform().ptreeSerialization().serialize(document, error);
   if (!bytes) {
     logMessage(LogLevel::Error, "Could not create aggregated ptree: %s", error.c_str());
-    return;
   }
+  return bytes;
+}
+
+bool submitDailyLog(const std::string& bytes) {
   Preferences& preferences = platform().preferences();
   const PropertyValue osVersion = platform().logsmith().LGSOSVersion();
   const PropertyDict header =
@@ -39,10 +41,11 @@ void submitDailyLog(const PropertyDict& document) {
   }
   const bool submitted = platform().logsmith().LGSWriteLogForSubmission(
       "193", "log-aggregated", header.empty() ? nullptr : &header,
-      [&bytes](LogFileHandle& file) { file.write(*bytes); });
+      [&bytes](LogFileHandle& file) { file.write(bytes); });
   if (!submitted) {
-    logMessage(LogLevel::Error, "Failed to write aggregated log");
+    logMessage(LogLevel::Error, "%s", kSubmissionFailed);
   }
+  return submitted;
 }
 
 }  // namespace vesprun

@@ -5,6 +5,7 @@
 
 #include "platform/Platform.h"
 #include "platform/PreferenceNames.h"
+#include "report/KernelMemoryStatistics.h"
 #include "report/SupportLibraryFunctions.h"
 
 namespace vesprun {
@@ -12,6 +13,9 @@ namespace {
 
 constexpr std::string_view kAllAppsKey = "com.quill.homeshell.numAllInstalledApps";
 constexpr std::string_view kThirdPartyAppsKey = "com.quill.homeshell.numThirdPartyApps";
+constexpr std::string_view kDatabaseSizeKey = "com.quill.logsmith.tlyd.database.size";
+constexpr std::string_view kCorruptionsKey = "com.quill.logsmith.tlyd.database.corruptions";
+constexpr std::string_view kCPUUptimeKey = "com.quill.usage.cur_boot_session_cpu_uptime";
 constexpr std::string_view kAppInstallsEvent = "com.quill.homeshell.appInstalls";
 constexpr std::uint64_t kBytesPerMebibyte = 1048576;
 constexpr const char* kDatabasePath = "/var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
@@ -23,17 +27,6 @@ std::string firstOrUnknown(const std::vector<std::string>& languages) {
 std::int64_t databaseMebibytes() {
   const std::optional<std::uint64_t> bytes = platform().fileSystem().fileSize(kDatabasePath);
   return bytes ? static_cast<std::int64_t>(*bytes / kBytesPerMebibyte) : -1;
-}
-
-std::int64_t takeCorruptionCount() {
-  if (!resolveSupportLibraryFunctions()) {
-    return 0;
-  }
-  Preferences& preferences = platform().preferences();
-  const std::int64_t count =
-      preferences.LGSPreferencesGetIntegerValue(kCorruptionCountKey, kAggregatedDomain);
-  preferences.LGSPreferencesSetValue(kCorruptionCountKey, 0, kAggregatedDomain);
-  return count;
 }
 
 std::int64_t minutesAwake() {
@@ -52,29 +45,40 @@ std::int64_t minutesAwake() {
 
 }  // namespace
 
-void addInstalledAppInfo(TBReport& report) {
+std::vector<std::string_view> ownScalarKeys() {
+  std::vector<std::string_view> keys{kAllAppsKey, kThirdPartyAppsKey, kDatabaseSizeKey,
+                                     kCorruptionsKey, kCPUUptimeKey};
+  const std::vector<std::string_view> ofMemory = vmStatisticKeys();
+  keys.insert(keys.end(), ofMemory.begin(), ofMemory.end());
+  return keys;
+}
+
+std::optional<InstalledAppCounts> addInstalledAppInfo(TBReport& report) {
   const ScalarOptions* allAppsOptions = report.optionsForScalarKey(kAllAppsKey);
   const ScalarOptions* thirdPartyAppsOptions = report.optionsForScalarKey(kThirdPartyAppsKey);
-  EventHub& eventHub = platform().eventHub();
   if (allAppsOptions == nullptr && thirdPartyAppsOptions == nullptr &&
-      !eventHub.EventHubIsEventUsed(kAppInstallsEvent)) {
-    return;
+      !platform().eventHub().EventHubIsEventUsed(kAppInstallsEvent)) {
+    return std::nullopt;
   }
-  std::int64_t allApps = 0;
-  std::int64_t thirdPartyApps = 0;
+  InstalledAppCounts counts;
   platform().installedApplications().EnumerateInstalledBundles(
       [&](std::string_view /*bundle*/, BundleType type) {
-        ++allApps;
-        thirdPartyApps += type == BundleType::User ? 1 : 0;
+        ++counts.all;
+        counts.thirdParty += type == BundleType::User ? 1 : 0;
       });
   if (allAppsOptions != nullptr) {
-    report.addScalarForKeyWithOptions(allApps, kAllAppsKey, *allAppsOptions);
+    report.addScalarForKeyWithOptions(counts.all, kAllAppsKey, *allAppsOptions);
   }
   if (thirdPartyAppsOptions != nullptr) {
-    report.addScalarForKeyWithOptions(thirdPartyApps, kThirdPartyAppsKey, *thirdPartyAppsOptions);
+    report.addScalarForKeyWithOptions(counts.thirdParty, kThirdPartyAppsKey,
+                                      *thirdPartyAppsOptions);
   }
-  eventHub.EventHubSendEventLazy(kAppInstallsEvent, [&] {
-    return PropertyDict{{"numThirdPartyApps", thirdPartyApps}, {"numAllApps", allApps}};
+  return counts;
+}
+
+void offerAppInstallsEvent(const InstalledAppCounts& counts) {
+  platform().eventHub().EventHubSendEventLazy(kAppInstallsEvent, [&counts] {
+    return PropertyDict{{"numThirdPartyApps", counts.thirdParty}, {"numAllApps", counts.all}};
   });
 }
 
@@ -89,16 +93,24 @@ void addMetadataKeys(PropertyDict& metadata) {
   }
 }
 
-void reportDatabaseSize(TBReport& report) {
-  report.addScalarForKeyByExecutingBlock("com.quill.logsmith.tlyd.database.size",
-                                         databaseMebibytes);
-  report.addScalarForKeyByExecutingBlock("com.quill.logsmith.tlyd.database.corruptions",
-                                         takeCorruptionCount);
+bool reportDatabaseSize(TBReport& report) {
+  report.addScalarForKeyByExecutingBlock(kDatabaseSizeKey, databaseMebibytes);
+  bool corruptionsWereRead = false;
+  report.addScalarForKeyByExecutingBlock(kCorruptionsKey, [&corruptionsWereRead] {
+    corruptionsWereRead = resolveSupportLibraryFunctions();
+    return corruptionsWereRead ? platform().preferences().LGSPreferencesGetIntegerValue(
+                                     kCorruptionCountKey, kAggregatedDomain)
+                               : 0;
+  });
+  return corruptionsWereRead;
+}
+
+void restartCorruptionCount() {
+  platform().preferences().LGSPreferencesSetValue(kCorruptionCountKey, 0, kAggregatedDomain);
 }
 
 void reportCPUUptime(TBReport& report) {
-  report.addScalarForKeyByExecutingBlock("com.quill.usage.cur_boot_session_cpu_uptime",
-                                         minutesAwake);
+  report.addScalarForKeyByExecutingBlock(kCPUUptimeKey, minutesAwake);
 }
 
 }  // namespace vesprun

@@ -48,7 +48,13 @@ PropertyValue preferenceOr(std::string_view key, PropertyValue fallback) {
 
 }  // namespace
 
-TBReport::TBReport() : _config(TBConfig::init()) {}
+std::int32_t firstDayOfReport(std::int32_t day) {
+  return day == std::numeric_limits<std::int32_t>::min() ? day : day - 1;
+}
+
+TBReport::TBReport() : TBReport(TBConfig::init()) {}
+
+TBReport::TBReport(std::unique_ptr<TBConfig> config) : _config(std::move(config)) {}
 
 const ScalarOptions* TBReport::optionsForScalarKey(std::string_view key) const {
   return _config ? _config->configOptionsForScalarKey(key) : nullptr;
@@ -61,46 +67,57 @@ void TBReport::writeLogForYesterdayWithAppInfo(std::int32_t day, const AppInfoLi
 }
 
 void TBReport::serializeWithDateAndAppInfo(std::int32_t day, const AppInfoList* appInfo) {
-  if (_scalarsOutput.empty() && _distributionsOutput.empty() && _histogramsOutput.empty()) {
-    return;
+  const std::optional<PropertyDict> document = makeDocument(day, appInfo, SideEffects::Done);
+  if (const auto bytes = document ? serializeDailyLog(*document) : std::nullopt) {
+    submitDailyLog(*bytes);
   }
-  addOwnSources();
-  submitDailyLog(takeDocument(day, appInfo));
 }
 
-void TBReport::readHistory(std::int32_t day) {
+bool TBReport::readHistory(std::int32_t day) {
   const std::unique_ptr<TBHistory> history = platform().tallybook().initWithDefaultPath();
   if (!history) {
-    return;
+    return false;
   }
-  const std::int32_t firstDay = day == std::numeric_limits<std::int32_t>::min() ? day : day - 1;
-  history->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+  const std::int32_t firstDay = firstDayOfReport(day);
+  const bool allScalars = history->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
       "", firstDay, day,
       [this](std::string_view key, std::int32_t /*day*/, std::int64_t value, bool& /*stop*/) {
         if (const ScalarOptions* options = optionsForScalarKey(key)) {
           addScalarForKeyWithOptions(value, key, *options);
         }
       });
-  history->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
-      "", firstDay, day,
-      [this](std::string_view key, std::int32_t /*day*/, TBHistoryDistributionEnumerator& values,
-             bool& /*stop*/) {
-        if (const DistributionOptions* options =
-                _config ? _config->configOptionsForDistributionKey(key) : nullptr) {
-          computeAndAddDistributionForKeyWithOptions(values, key, *options);
-        }
-      });
+  const bool allDistributions =
+      history->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+          "", firstDay, day,
+          [this](std::string_view key, std::int32_t /*day*/,
+                 TBHistoryDistributionEnumerator& values, bool& /*stop*/) {
+            if (const DistributionOptions* options =
+                    _config ? _config->configOptionsForDistributionKey(key) : nullptr) {
+              computeAndAddDistributionForKeyWithOptions(values, key, *options);
+            }
+          });
+  return allScalars && allDistributions;
 }
 
-void TBReport::addOwnSources() {
-  addInstalledAppInfo(*this);
+void TBReport::addOwnSources(SideEffects sideEffects) {
+  const bool done = sideEffects == SideEffects::Done;
+  if (const std::optional<InstalledAppCounts> counts = addInstalledAppInfo(*this); counts && done) {
+    offerAppInstallsEvent(*counts);
+  }
   addMetadataKeys(_metadataOutput);
-  reportDatabaseSize(*this);
+  if (reportDatabaseSize(*this) && done) {
+    restartCorruptionCount();
+  }
   reportCPUUptime(*this);
   reportVMStats(*this);
 }
 
-PropertyDict TBReport::takeDocument(std::int32_t day, const AppInfoList* appInfo) {
+std::optional<PropertyDict> TBReport::makeDocument(std::int32_t day, const AppInfoList* appInfo,
+                                                   SideEffects sideEffects) {
+  if (_scalarsOutput.empty() && _distributionsOutput.empty() && _histogramsOutput.empty()) {
+    return std::nullopt;
+  }
+  addOwnSources(sideEffects);
   const std::string whitelistDigest = _config ? _config->configFileDigest() : "";
   _config.reset();
   PropertyDict document;

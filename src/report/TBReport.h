@@ -13,6 +13,10 @@
 
 namespace vesprun {
 
+/// The first of the two days whose rows a report of `day` reads. No day comes before the lowest
+/// number, which is then read alone.
+std::int32_t firstDayOfReport(std::int32_t day);
+
 /// One day's aggregated log: collects the whitelisted counters, adds its own sources, and submits
 /// the document. Made for one run and used once. Without a whitelist it stays empty and submits
 /// nothing.
@@ -26,13 +30,31 @@ class TBReport {
   /// Reads the whitelist.
   TBReport();
 
+  /// With a whitelist that has been read; null: none.
+  explicit TBReport(std::unique_ptr<TBConfig> config);
+
   /// Reads the history of day `day` and the day before it, then `serializeWithDateAndAppInfo`.
-  /// `appInfo` may be null. (No day comes before the lowest number; it is then read alone.)
+  /// `appInfo` may be null.
   void writeLogForYesterdayWithAppInfo(std::int32_t day, const AppInfoList* appInfo);
 
   /// Unless scalars, distributions and histograms are all empty: runs the log's own sources, and
   /// submits the document of `day`, into which the outputs are moved.
   void serializeWithDateAndAppInfo(std::int32_t day, const AppInfoList* appInfo);
+
+  // The steps of these two, to look at a report that is not submitted.
+
+  /// Collects the rows of `day` and the day before it. False when the history could not be read to
+  /// its end; what came before is collected.
+  bool readHistory(std::int32_t day);
+
+  /// What a submitted report does on the device beside the log: offers the event of the installed
+  /// apps, restarts the count of corruptions.
+  enum class SideEffects { Done, LeftOut };
+
+  /// Runs the log's own sources and builds the document, into which the outputs are moved. Nothing
+  /// when scalars, distributions and histograms are all empty.
+  std::optional<PropertyDict> makeDocument(std::int32_t day, const AppInfoList* appInfo,
+                                           SideEffects sideEffects);
 
   /// The options with which the whitelist lets a scalar through; null when it does not.
   const ScalarOptions* optionsForScalarKey(std::string_view key) const;
@@ -57,9 +79,7 @@ class TBReport {
   const PropertyDict& histogramsOutput() const { return _histogramsOutput; }
 
  private:
-  void readHistory(std::int32_t day);
-  void addOwnSources();
-  PropertyDict takeDocument(std::int32_t day, const AppInfoList* appInfo);
+  void addOwnSources(SideEffects sideEffects);
 
   std::unique_ptr<TBConfig> _config;  ///< null without a whitelist, and after its digest was taken
   PropertyDict _scalarsOutput;

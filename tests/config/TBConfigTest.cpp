@@ -112,16 +112,16 @@ TEST(TBConfig, SaysByWhichEntryItDecides) {
   device.writeWhitelistJson(R"({"A": {"ScalarKeys": {"key": {}}, "ScalarKeyPrefixes": {"pre": 1}},
                                 "B": {"ScalarKeys": {"key": {"sig_fig": 5}}}})");
   const std::unique_ptr<TBConfig> config = TBConfig::init();
-  const auto byKey = config->decideScalarKey("key");
+  const auto byKey = config->decide<ScalarOptions>("key");
   EXPECT_EQ(byKey.by, DecidedBy::Key);
   EXPECT_EQ(byKey.entry->group, "B");
   EXPECT_EQ(textOf(byKey.options()), "-/5");
-  const auto byPrefix = config->decideScalarKey("prefix");
+  const auto byPrefix = config->decide<ScalarOptions>("prefix");
   EXPECT_EQ(byPrefix.by, DecidedBy::Prefix);
   EXPECT_EQ(byPrefix.prefix, "pre");
   EXPECT_EQ(byPrefix.entry->group, "A");
   EXPECT_EQ(byPrefix.options(), nullptr);
-  const auto byDevice = config->decideDistributionKey("key");
+  const auto byDevice = config->decide<DistributionOptions>("key");
   EXPECT_EQ(byDevice.by, DecidedBy::InternalDevice);
   EXPECT_EQ(byDevice.options()->intervals, nullptr);
 }

@@ -310,13 +310,12 @@ struct FailingTallybook : Failing<Tallybook> {
              real->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
                  keyPrefix, minDay, maxDay, rowHandler);
     }
-    void distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+    bool distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
         std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
         const DistributionRowHandler& rowHandler) override {
-      if (!faults.fails(__func__)) {
-        real->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
-            keyPrefix, minDay, maxDay, rowHandler);
-      }
+      return !faults.fails(__func__) &&
+             real->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+                 keyPrefix, minDay, maxDay, rowHandler);
     }
     std::unique_ptr<TBHistory> real;
     Faults& faults;

@@ -2,7 +2,9 @@
 
 #include <cstdio>
 #include <filesystem>
+#include <regex>
 #include <sstream>
+#include <vector>
 
 #include "vespctl/VespctlTest.h"
 
@@ -17,7 +19,8 @@
 namespace vesprun {
 namespace {
 
-using ::testing::ElementsAre, ::testing::EndsWith, ::testing::HasSubstr, ::testing::StartsWith;
+using ::testing::AllOf, ::testing::ElementsAre, ::testing::EndsWith, ::testing::HasSubstr,
+    ::testing::StartsWith;
 
 /// A device whose whitelist lets "s" and "d" through and whose clock the test sets. Day 19787 is
 /// 2024-03-05.
@@ -28,7 +31,7 @@ class DaysTest : public VespctlTest {
         "device/Library/Application Support/Tallybook/Whitelist_Stagebox.ptree",
         R"(<?xml version="1.0" encoding="UTF-8"?><ptree version="1.0"><dict><key>G</key><dict>
 <key>ScalarKeys</key><dict><key>s</key><dict/><key>com.quill.kernel.swapusage</key><dict/></dict>
-<key>DistributionKeys</key><dict><key>d</key><dict/></dict></dict></dict></ptree>)");
+<key>DistributionKeys</key><dict><key>d</key><dict><key>intervals</key><array><real>0.5</real></array></dict></dict></dict></dict></ptree>)");
     setTime("2024-03-05T09:15:02Z");
   }
 
@@ -85,6 +88,101 @@ class DaysTest : public VespctlTest {
 
   const std::string logs = "device/outbox/logs";
 };
+
+TEST_F(DaysTest, DaysTellsWhatIsKeptAndChangesNothing) {
+  EXPECT_EQ(
+      print("days \"$D\" --last 1"),
+      "{\"day\":19787,\"date\":\"2024-03-05\",\"scalars\":0,\"distributions\":0,\"logs\":[]}\n");
+  count(19785, 19786);
+  print("counters \"$D\" sample d 1 2 --day 19785");
+  addLog(1, 4, "2024-03-05");
+  addLog(2, 4, "2024-03-05");
+  addLog(3, 1, "2024-03-05");
+  folder.write(logs + "/0004-193-log-aggregated.ptree", "torn");
+  print(
+      "prefs \"$D\" set com.quill.aggregated.vesprun "
+      "LastCrashLogSerializationDateInDaysSince1970 19787");
+  const std::string look = "find " + folder.path("device") + " -printf '%p %s %C@\\n' | md5sum >";
+  ASSERT_EQ(std::system((look + folder.path("before")).c_str()), 0);
+  EXPECT_EQ(
+      print("days \"$D\" --last 3"),
+      "{\"day\":19785,\"date\":\"2024-03-03\",\"scalars\":1,\"distributions\":1,\"logs\":[]}\n"
+      "{\"day\":19786,\"date\":\"2024-03-04\",\"scalars\":1,\"distributions\":0,\"logs\":["
+      "\"0001-193-log-aggregated.ptree\",\"0002-193-log-aggregated.ptree\"]}\n"
+      "{\"day\":19787,\"date\":\"2024-03-05\",\"scalars\":0,\"distributions\":0,\"logs\":[]}\n");
+  EXPECT_THAT(error, AllOf(HasSubstr("vespctl: 0004-193-log-aggregated.ptree: line 1"),
+                           HasSubstr("the day of the last run, 19787, is ahead of the clock")));
+  EXPECT_EQ(print("days \"$D\" --last 0"), "");
+  EXPECT_THAT(print("days \"$D\""), StartsWith("{\"day\":19774,"));
+  ASSERT_EQ(std::system((look + folder.path("after")).c_str()), 0);
+  EXPECT_EQ(folder.read("after"), folder.read("before"));
+}
+
+TEST_F(DaysTest, CatchUpSubmitsWhatTheRunOfEachDayWouldHave) {
+  count(19784, 19790);
+  print("counters \"$D\" sample d 1 0.1 7e300 --day 19785");
+  print("counters \"$D\" set com.quill.kernel.swapusage 1 --day 19785");
+  print("prefs \"$D\" set com.quill.aggregated DatabaseCorruptionCount 3");
+  setTime("2024-03-03T04:00:00Z");
+  print("run \"$D\" -- -d");
+  print("run \"$D\" -- -d");
+  ASSERT_EQ(std::system(("cp -a " + folder.path("device") + ' ' + folder.path("kept")).c_str()), 0);
+  for (const char* const day : {"04", "05", "06"}) {
+    setTime("2024-03-" + std::string(day) + "T04:00:00Z");
+    print("run \"$D\" -- -d");
+  }
+  // By the number of the log, without what tells of the moment.
+  const auto documents = [this](bool measured) {
+    const std::regex creation("(TBLogCreationDate</key>\\s*<date>)[^<]*");
+    const std::regex own("\\s*<key>com.quill.kernel.swapusage</key>\\s*<integer>\\d+</integer>");
+    std::vector<std::string> found;
+    for (const std::string& name : folder.names(logs)) {
+      if (name.ends_with("-193-log-aggregated.ptree") && !name.starts_with("0001")) {
+        const std::string text = folder.read(logs + '/' + name);
+        EXPECT_EQ(std::regex_search(text, own), measured) << text;
+        found.push_back(std::regex_replace(std::regex_replace(text, creation, "$1"), own, ""));
+      }
+    }
+    return found;
+  };
+  const std::vector<std::string> ofRuns = documents(true);
+  EXPECT_EQ(ofRuns.size(), 3U);
+  std::filesystem::remove_all(folder.path("device"));
+  std::filesystem::rename(folder.path("kept"), folder.path("device"));
+  setTime("2024-03-07T04:00:00Z");
+  const std::string events = folder.read("device/outbox/events.jsonl");
+  EXPECT_EQ(print("days \"$D\" --last 0; (flock \"$D\" sh -c 'sleep 0.5; touch released' & sleep "
+                  "0.1; '" VESPCTL_PROGRAM "' catch-up \"$D\" --last 3; test -e released)"),
+            "[19785,19786,19787]\n")
+      << "after the run that is at work";
+  EXPECT_EQ(documents(false), ofRuns);
+  EXPECT_EQ(folder.read("device/outbox/events.jsonl"), events);
+  EXPECT_EQ(print("prefs \"$D\" get com.quill.aggregated DatabaseCorruptionCount"), "3\n");
+  EXPECT_EQ(print("prefs \"$D\" get com.quill.aggregated.vesprun "
+                  "LastCrashLogSerializationDateInDaysSince1970"),
+            "19784\n");
+  EXPECT_EQ(print("catch-up \"$D\""), "[]\n");
+  EXPECT_THAT(print("prune \"$D\" --outbox-size 0"), HasSubstr("0004-193-log-aggregated.ptree"));
+  EXPECT_EQ(print("catch-up \"$D\" --last 4294967295"), "[]\n") << "pruned is not missed";
+}
+
+TEST_F(DaysTest, CatchUpSaysWhichDaysCouldNotBeSubmitted) {
+  count(19783, 19786);
+  print("counters \"$D\" set other 1 --day 19781");
+  folder.write("device/device.json",
+               "{\"clock\": \"2024-03-05T09:15:02Z\", \"submission\": "
+               "{\"fails\": true}, \"registry\": []}");
+  EXPECT_EQ(run("catch-up \"$D\""), 1);
+  EXPECT_EQ(output, "[]\n");
+  EXPECT_EQ(error, "vespctl: not submitted: 19783, 19784, 19785; the system log says why\n");
+  folder.write("device/device.json",
+               "{\"clock\": \"2024-03-05T09:15:02Z\", \"submission\": "
+               "{\"enabled\": false}, \"registry\": []}");
+  EXPECT_EQ(print("catch-up \"$D\""), "[]\n");
+  setTime("2024-03-05T09:15:02Z");
+  EXPECT_EQ(print("catch-up \"$D\" --last 2"), "[19784,19785]\n");
+  EXPECT_EQ(print("catch-up \"$D\""), "[19783]\n") << "nothing of day 19781 may leave";
+}
 
 TEST_F(DaysTest, PruneKeepsTheDaysThatAreAskedForOrStillRead) {
   count(19780, 19789);

@@ -151,6 +151,37 @@ Faults judgeRun(const Outcome& outcome, bool killed, bool started, int worst = 0
   return faults;
 }
 
+/// A call that fails costs one step of the day at most, once the day's work has begun.
+Faults lostSteps(const Device& device, const Sight& sight) {
+  if (readFile(device.path() + "/outbox/log.jsonl").find("daily tasks for day") ==
+      std::string::npos) {
+    return {};
+  }
+  const auto hasLog = [&](const char* ending) {
+    return std::ranges::any_of(sight.logs,
+                               [=](const auto& log) { return log.first.ends_with(ending); });
+  };
+  const auto counts = [&](const char* key) {
+    const std::string text = '\t' + std::to_string(kFirstDay) + '\t' + key;
+    return std::ranges::any_of(sight.counters, [&](const std::string& row) {
+      return row.find(text) != std::string::npos;
+    });
+  };
+  const std::pair<const char*, bool> steps[] = {
+      {"daily log", hasLog(kDailyLog)},
+      {"storage log", hasLog("-165-StorageStatus.log")},
+      {"records", !readFile(device.path() + "/outbox/records.jsonl").empty()},
+      {"counters", counts("datausage.") || counts("com.quill.tapline.")},
+      {"tasking", std::ranges::count(sight.files, "var/mobile/Library/Preferences/a.ptree") != 0},
+  };
+  std::string lost;
+  for (const auto& [name, done] : steps) {
+    lost += done ? "" : std::string(lost.empty() ? "" : ", ") + name;
+  }
+  return lost.find(',') == std::string::npos ? Faults()
+                                             : Faults{"more than one step lost: " + lost};
+}
+
 Faults runWithFault(const Reference& reference, const fs::path& folder, const Fault& fault,
                     bool started) {
   Device device(reference.device, folder);
@@ -160,9 +191,16 @@ Faults runWithFault(const Reference& reference, const fs::path& folder, const Fa
   if (!outcome.happened) {
     return faults;  // threads make their calls in another order each time
   }
-  faults += device.look().faults;
+  const Sight halfway = device.look();
+  faults += halfway.faults;
+  if (fault.kind == Fault::Kind::Error) {
+    faults += lostSteps(device, halfway);
+  }
   faults += finishTheDays(device);
   faults += judge(device.look(), reference, killed || fault.kind == Fault::Kind::Short);
+  if (!faults.empty()) {
+    faults.push_back("the fault came at: " + outcome.place);
+  }
   return faults;
 }
 
@@ -351,7 +389,11 @@ Faults runCommand(const Command& command, const fs::path& folder, const Fault& f
   if (outcome.status == 1 && outcome.standardError.empty()) {
     faults.emplace_back("it failed without a word");
   }
-  return faults += command.judge(device, outcome, killed);
+  faults += command.judge(device, outcome, killed);
+  if (!faults.empty()) {
+    faults.push_back("the fault came at: " + outcome.place);
+  }
+  return faults;
 }
 
 // Each call fails in one way or, when wanted, in all, and is the last one.

@@ -278,9 +278,9 @@ void Tracer::limitGrowth(pid_t thread, user_regs_struct& registers, Pending& pen
   _grown += std::min(wanted, left);
 }
 
-void Tracer::record(pid_t thread, const user_regs_struct& registers, Pending& pending) {
-  Call call{pending.number, {}, 0};
-  const CallRow* row = rowOf(pending.number);
+Call callOf(pid_t thread, const user_regs_struct& registers) {
+  Call call{static_cast<int>(registers.orig_rax), {}, 0};
+  const CallRow* row = rowOf(call.number);
   switch (row == nullptr ? Paths::None : row->paths) {
     case Paths::None:
       break;
@@ -295,6 +295,11 @@ void Tracer::record(pid_t thread, const user_regs_struct& registers, Pending& pe
       call.path = pathAt(thread, registers.rdi, registers.rsi);
       break;
   }
+  return call;
+}
+
+void Tracer::record(pid_t thread, const user_regs_struct& registers, Pending& pending) {
+  Call call = callOf(thread, registers);
   pending.from = call.path;
   if (pending.number == SYS_renameat || pending.number == SYS_linkat) {
     pending.to = pathAt(thread, registers.rdx, registers.r10);
@@ -311,12 +316,19 @@ void Tracer::atEntry(pid_t thread) {
   ++_count;
   if (_fault.kind == Fault::Kind::None) {
     record(thread, registers, pending);
-  } else if (_fault.kind == Fault::Kind::DiskFull) {
-    limitGrowth(thread, registers, pending);
-  } else if (_count < _fault.call || _outcome.happened ||
-             (_fault.number != 0 && _fault.number != pending.number)) {
     return;
-  } else if (_fault.kind == Fault::Kind::Error) {
+  }
+  if (_fault.kind == Fault::Kind::DiskFull) {
+    limitGrowth(thread, registers, pending);
+    return;
+  }
+  if (_count < _fault.call || _outcome.happened ||
+      (_fault.number >= 0 && _fault.number != pending.number)) {
+    return;
+  }
+  const Call call = callOf(thread, registers);
+  _outcome.place = nameOfCall(call.number) + ' ' + call.path;
+  if (_fault.kind == Fault::Kind::Error) {
     replaceCall(thread, registers, pending, _fault.error);
   } else if (_fault.kind == Fault::Kind::Short) {
     shorten(thread, registers, std::max<std::uint64_t>(registers.rdx / 2, 1));

@@ -19,8 +19,9 @@ struct Fault {
   };
   Kind kind = Kind::None;
   std::size_t call = 0;  ///< counted from 1, over all threads
-  /// When not 0: the first call of this kind from there on. Threads do not always take turns alike.
-  int number = 0;
+  /// When there is one: the first call of this kind from there on. Threads do not always take turns
+  /// alike.
+  int number = -1;
   int error = 0;
   std::uint64_t room = 0;
   std::function<void()> whilePaused = {};
@@ -41,6 +42,7 @@ struct Outcome {
   std::vector<Call> calls;              ///< recorded only without a fault
   std::vector<std::string> notDurable;  ///< likewise: names given to bytes that were not flushed
   bool happened = false;                ///< the fault came to pass
+  std::string place{};                  ///< the call that it happened to, with its path
 };
 
 /// Runs `command` in `folder` with every system call watched. Files below it are the ones whose

@@ -21,6 +21,15 @@ std::unique_ptr<HostPlatform> openDevice(const std::string& directory) {
   return device;
 }
 
+std::unique_ptr<HostPlatform> openDeviceReadOnly(const std::string& directory, SystemLog& log) {
+  std::string error;
+  std::unique_ptr<HostPlatform> device = HostPlatform::openReadOnly(directory, log, error);
+  if (!device) {
+    throw CommandFailure(error);
+  }
+  return device;
+}
+
 DeviceDirectory openDirectory(const std::string& directory) {
   std::string error;
   std::optional<DeviceDirectory> opened = DeviceDirectory::open(directory, error);

@@ -24,6 +24,9 @@ class CommandFailure : public std::runtime_error {
 /// The platform of a device directory. Throws `CommandFailure` when there is none.
 std::unique_ptr<HostPlatform> openDevice(const std::string& directory);
 
+/// The same, to look at the device and change nothing on it; see `HostPlatform::openReadOnly`.
+std::unique_ptr<HostPlatform> openDeviceReadOnly(const std::string& directory, SystemLog& log);
+
 /// A device directory without what stands in its description. Throws `CommandFailure` when there is
 /// none.
 DeviceDirectory openDirectory(const std::string& directory);
@@ -74,6 +77,11 @@ void addPtreeCommands(CLI::App& vespctl);
 void addFieldsCommand(CLI::App& vespctl);
 void addDecodeCommand(CLI::App& vespctl);
 void addExportCommand(CLI::App& vespctl);
+void addPageCommand(CLI::App& vespctl);
+void addDaysCommand(CLI::App& vespctl);
+void addCatchUpCommand(CLI::App& vespctl);
 void addPruneCommand(CLI::App& vespctl);
+void addOutlookCommands(CLI::App& vespctl);
+void addWhitelistCommands(CLI::App& vespctl);
 
 }  // namespace vesprun

@@ -8,11 +8,11 @@
 namespace vesprun {
 
 bool Complaints::keeps(LogLevel level) const {
-  return level == LogLevel::Error || (_also != nullptr && _also->keeps(level));
+  return level <= _least || (_also != nullptr && _also->keeps(level));
 }
 
 void Complaints::write(LogLevel level, std::string_view message) {
-  if (level == LogLevel::Error) {
+  if (level <= _least && (_messages.empty() || _messages.back() != message)) {
     _messages.emplace_back(message);
   }
   if (_also != nullptr) {

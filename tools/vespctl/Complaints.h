@@ -8,11 +8,13 @@
 
 namespace vesprun {
 
-/// Takes the errors that a service logs, which become the command's own.
+/// Takes what a service logs, which becomes the command's own: errors, or down to another level. A
+/// message that is repeated at once counts once.
 class Complaints final : public SystemLog {
  public:
   /// `also` gets all that is logged too, unless it is null.
-  explicit Complaints(SystemLog* also = nullptr) : _also(also) {}
+  explicit Complaints(SystemLog* also = nullptr, LogLevel least = LogLevel::Error)
+      : _also(also), _least(least) {}
 
   bool keeps(LogLevel level) const override;
   void write(LogLevel level, std::string_view message) override;
@@ -26,6 +28,7 @@ class Complaints final : public SystemLog {
 
  private:
   SystemLog* _also;
+  LogLevel _least;
   std::vector<std::string> _messages;
 };
 

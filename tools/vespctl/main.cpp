@@ -27,7 +27,12 @@ int runCommandLine(int argc, char** argv) {
   addFieldsCommand(vespctl);
   addDecodeCommand(vespctl);
   addExportCommand(vespctl);
+  addPageCommand(vespctl);
+  addDaysCommand(vespctl);
+  addCatchUpCommand(vespctl);
   addPruneCommand(vespctl);
+  addOutlookCommands(vespctl);
+  addWhitelistCommands(vespctl);
   allowOneCommand(vespctl);
   try {
     vespctl.parse(argc, argv);

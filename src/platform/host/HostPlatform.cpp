@@ -32,10 +32,11 @@ namespace vesprun {
 // Destroyed from the last to the first: what writes at its end comes after what it needs for that.
 struct HostPlatform::Services {
   Services(DeviceDirectory deviceDirectory, DeviceDescription deviceDescription,
-           ProcessTimeZone processTimeZone)
+           ProcessTimeZone processTimeZone, SystemLog* log)
       : directory(std::move(deviceDirectory)),
         description(std::move(deviceDescription)),
-        timeZone(std::move(processTimeZone)) {}
+        timeZone(std::move(processTimeZone)),
+        systemLog(log != nullptr ? *log : logFile) {}
 
   DeviceRegistry& deviceRegistry() {
     return interposedRegistry != nullptr ? *interposedRegistry : describedRegistry();
@@ -52,7 +53,8 @@ struct HostPlatform::Services {
   DeviceDescription description;
   ProcessTimeZone timeZone;
   HostClock clock{description.clock};
-  HostSystemLog systemLog{directory, clock, description.logLevel};
+  HostSystemLog logFile{directory, clock, description.logLevel};
+  SystemLog& systemLog;
   Outbox outbox{directory, clock, systemLog};
   HostDailyWorkLock dailyWorkLock{directory,
                                   systemLog};  // freed when what follows has been written
@@ -89,6 +91,16 @@ HostPlatform::HostPlatform(std::unique_ptr<Services> services) : _services(std::
 HostPlatform::~HostPlatform() = default;
 
 std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, std::string& error) {
+  return open(path, nullptr, error);
+}
+
+std::unique_ptr<HostPlatform> HostPlatform::openReadOnly(const std::string& path, SystemLog& log,
+                                                         std::string& error) {
+  return open(path, &log, error);
+}
+
+std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, SystemLog* log,
+                                                 std::string& error) {
   std::optional<DeviceDirectory> directory = DeviceDirectory::open(path, error);
   if (!directory) {
     return nullptr;
@@ -111,8 +123,9 @@ std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, std::s
     error = file + ": timeZone: unknown time zone " + quotedText(*description.timeZone);
     return nullptr;
   }
-  auto services = std::make_unique<Services>(*std::move(directory), std::move(description),
-                                             std::move(timeZone));
+  auto services =
+      std::make_unique<Services>(log != nullptr ? directory->readOnly() : *std::move(directory),
+                                 std::move(description), std::move(timeZone), log);
   return std::unique_ptr<HostPlatform>(new HostPlatform(std::move(services)));
 }
 

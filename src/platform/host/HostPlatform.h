@@ -21,6 +21,12 @@ class HostPlatform : public Platform {
   /// whole process, in its environment variable TZ, until the platform is destroyed.
   static std::unique_ptr<HostPlatform> open(const std::string& path, std::string& error);
 
+  /// The same, to look at the device without changing anything on it: no file is written, made or
+  /// removed, a change of a preference holds for this platform alone, and `log`, which outlives it,
+  /// takes what the system log would. The device need not be writable.
+  static std::unique_ptr<HostPlatform> openReadOnly(const std::string& path, SystemLog& log,
+                                                    std::string& error);
+
   ~HostPlatform() override;
 
   const DeviceDirectory& directory() const;
@@ -65,6 +71,10 @@ class HostPlatform : public Platform {
   struct Services;
 
   explicit HostPlatform(std::unique_ptr<Services> services);
+
+  /// Read-only with a `log`.
+  static std::unique_ptr<HostPlatform> open(const std::string& path, SystemLog* log,
+                                            std::string& error);
 
   std::unique_ptr<Services> _services;
 };

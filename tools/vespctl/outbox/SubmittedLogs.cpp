@@ -11,6 +11,7 @@
 #include "common/Calendar.h"
 #include "platform/host/device/PrunedLogs.h"
 #include "platform/host/documents/PtreeReader.h"
+#include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/FolderNames.h"
 #include "platform/host/files/WholeFile.h"
 
@@ -181,7 +182,8 @@ std::vector<UnreadableLog> forEachSubmittedLog(
 
 void nameUnreadable(std::span<const UnreadableLog> logs) {
   for (const auto& [name, why, wasRead] : logs) {
-    std::fprintf(stderr, "vespctl: %s: %s\n", name.c_str(), why.c_str());
+    std::fprintf(stderr, "vespctl: %s: %s\n", printableText(name).c_str(),
+                 printableText(why).c_str());
   }
 }
 

@@ -42,13 +42,19 @@ bool CounterFile::read(const std::function<void(CounterStore&)>& work, std::stri
     work(store);
     return true;
   };
-  return use(CounterStore::Access::Reading, reading, error, damage);
+  const auto access =
+      _directory.isReadOnly() ? CounterStore::Access::Looking : CounterStore::Access::Reading;
+  return use(access, reading, error, damage);
 }
 
 bool CounterFile::use(CounterStore::Access access, const std::function<bool(CounterStore&)>& work,
                       std::string& error, std::optional<Damage>& damage) {
   const bool writes = access == CounterStore::Access::Writing;
   const std::string folder = _directory.hostPath(kFolder);
+  if (writes && _directory.isReadOnly()) {
+    _directory.makeFolder(kFolder, error);  // which says why not
+    return false;
+  }
   const std::string path = folder + '/' + kName;
   struct stat status {};
   std::optional<FolderLock> shared;
@@ -108,7 +114,7 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
     return attempt();
   } catch (const SqliteFailure& failure) {
     error = failure.text;
-    if (failure.isCorruption()) {
+    if (failure.isCorruption() && !_directory.isReadOnly()) {
       damage = Damage{status.st_dev, status.st_ino, failure.text};
     }
     return false;

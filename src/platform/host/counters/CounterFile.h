@@ -38,7 +38,9 @@ class CounterFile {
              std::optional<Damage>& damage);
 
   /// Runs `work` on the tables as they stand at one moment; not at all, and true, when there is no
-  /// file. False as above.
+  /// file. False as above. On a read-only device the file and what lies beside it stay untouched: a
+  /// commit that was cut off or that lies in a write-ahead log is an error, and damage is not told
+  /// apart, since nobody may mend it.
   bool read(const std::function<void(CounterStore&)>& work, std::string& error,
             std::optional<Damage>& damage);
 

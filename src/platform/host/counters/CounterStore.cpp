@@ -15,6 +15,7 @@ namespace {
 
 constexpr std::int64_t kApplicationIdentifier = 0x56455350;  // "VESP"
 constexpr std::int64_t kSchemaVersion = 1;
+constexpr int kNewestFormat = 2;  // of SQLite's files
 constexpr std::size_t kLongestKey = 1024 * 1024;
 
 // Pages of 16 KiB: a chunk of samples is read by few calls.
@@ -96,14 +97,13 @@ CounterStore::CounterStore(std::string path, std::chrono::milliseconds longestWa
 
 void CounterStore::open() {
   ++_opening;
-  _connection = SqliteConnection(_path, _longestWait);
-  const bool mayBeWritten = !_connection.isReadOnly();
+  _connection = SqliteConnection(_path, _longestWait, _access == Access::Looking);
   if (_connection.queryInteger("PRAGMA application_id") != kApplicationIdentifier ||
       _connection.queryInteger("PRAGMA user_version") != kSchemaVersion) {
     _connection.failAsCorrupt("not a counter database of this version");
   }
   // SQLite takes an unknown format version for a database of the future and never writes to it.
-  if (mayBeWritten && _connection.isReadOnly()) {
+  if (_connection.formatVersion() > kNewestFormat) {
     _connection.failAsCorrupt("the header is damaged");
   }
   _connection.execute(_access == Access::Writing ? "BEGIN IMMEDIATE" : "BEGIN");

@@ -41,7 +41,8 @@ class CounterStore {
  public:
   static constexpr std::size_t kSamplesPerChunk = 4096;
 
-  enum class Access { Reading, Writing };
+  /// Reading takes back a commit that was cut off; looking touches no file.
+  enum class Access { Looking, Reading, Writing };
 
   /// Opens an existing file. What another process has locked is waited for, `longestWait` at most.
   CounterStore(std::string path, std::chrono::milliseconds longestWait, Access access);

@@ -17,10 +17,10 @@ class HostTallybook::History final : public TBHistory {
         [&](CounterStore& store) { store.readScalars(keyPrefix, minDay, maxDay, rowHandler); });
   }
 
-  void distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+  bool distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
       std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
       const DistributionRowHandler& rowHandler) override {
-    read([&](CounterStore& store) {
+    return read([&](CounterStore& store) {
       store.readDistributions(keyPrefix, minDay, maxDay, rowHandler);
     });
   }

@@ -9,13 +9,16 @@ namespace {
 constexpr int kLongestCell = 16 * 1024 * 1024;
 
 /// SQLite's own file system under another name, with one difference: SQLite takes a read that fails
-/// with EIO for damage of the file, and here it stays an error of reading.
+/// with EIO for damage of the file, and here it stays an error of reading. The one to look with
+/// leaves all files as they are, too: SQLite removes and makes files also for connections that
+/// read.
 class ErrorKeepingFileSystem {
  public:
   /// Registered with SQLite for as long as the program, or the library, is loaded.
-  static const char* name() {
-    static ErrorKeepingFileSystem fileSystem;
-    return fileSystem._methods.zName;
+  static const char* name(bool looks) {
+    static ErrorKeepingFileSystem fileSystem("vesprun", false);
+    static ErrorKeepingFileSystem lookingFileSystem("vesprun-looking", true);
+    return (looks ? lookingFileSystem : fileSystem)._methods.zName;
   }
 
   ErrorKeepingFileSystem(const ErrorKeepingFileSystem&) = delete;
@@ -28,11 +31,14 @@ class ErrorKeepingFileSystem {
     const sqlite3_io_methods* original;
   };
 
-  ErrorKeepingFileSystem() : _methods(*original()) {
-    _methods.zName = "vesprun";
+  ErrorKeepingFileSystem(const char* name, bool looks) : _methods(*original()) {
+    _methods.zName = name;
     _methods.pNext = nullptr;
     _methods.szOsFile += static_cast<int>(sizeof(Methods));
-    _methods.xOpen = open;
+    _methods.xOpen = looks ? openToLook : open;
+    if (looks) {
+      _methods.xDelete = refuseToDelete;
+    }
     sqlite3_vfs_register(&_methods, 0);
   }
   ~ErrorKeepingFileSystem() { sqlite3_vfs_unregister(&_methods); }
@@ -56,6 +62,21 @@ class ErrorKeepingFileSystem {
       file->pMethods = &methods->methods;
     }
     return result;
+  }
+
+  static int openToLook(sqlite3_vfs* self, const char* name, sqlite3_file* file, int flags,
+                        int* flagsTaken) {
+    constexpr int kWriting = SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE | SQLITE_OPEN_DELETEONCLOSE;
+    const int result =
+        open(self, name, file, (flags & ~kWriting) | SQLITE_OPEN_READONLY, flagsTaken);
+    if (result == SQLITE_OK) {
+      methodsOf(file)->methods.iVersion = 1;  // without shared memory, whose file would be made
+    }
+    return result;
+  }
+
+  static int refuseToDelete(sqlite3_vfs* /*self*/, const char* /*name*/, int /*syncFolder*/) {
+    return SQLITE_READONLY;
   }
 
   static int read(sqlite3_file* file, void* bytes, int length, sqlite3_int64 offset) {
@@ -82,16 +103,19 @@ bool SqliteFailure::isCorruption() const {
   }
 }
 
-SqliteConnection::SqliteConnection(const std::string& path, std::chrono::milliseconds longestWait)
+SqliteConnection::SqliteConnection(const std::string& path, std::chrono::milliseconds longestWait,
+                                   bool looks)
     : _path(path) {
   sqlite3* database = nullptr;
-  const int result = sqlite3_open_v2(
-      path.c_str(), &database, SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE,
-      ErrorKeepingFileSystem::name());
+  const int result = sqlite3_open_v2(path.c_str(), &database,
+                                     (looks ? SQLITE_OPEN_READONLY : SQLITE_OPEN_READWRITE) |
+                                         SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE,
+                                     ErrorKeepingFileSystem::name(looks));
   _database.reset(database);
   if (result != SQLITE_OK) {
     fail(result);
   }
+  _looks = looks;
   sqlite3_busy_timeout(database, static_cast<int>(longestWait.count()));
   sqlite3_db_config(database, SQLITE_DBCONFIG_DEFENSIVE, 1, nullptr);
   sqlite3_db_config(database, SQLITE_DBCONFIG_TRUSTED_SCHEMA, 0, nullptr);
@@ -121,7 +145,27 @@ void SqliteConnection::commit() {
   }
 }
 
+int SqliteConnection::formatVersion() const {
+  constexpr sqlite3_int64 kOffset = 18;
+  sqlite3_file* file = nullptr;
+  std::uint8_t version = 0;
+  int result = sqlite3_file_control(handle(), "main", SQLITE_FCNTL_FILE_POINTER, &file);
+  if (result == SQLITE_OK) {
+    result = file->pMethods->xRead(file, &version, sizeof version, kOffset);
+  }
+  if (result != SQLITE_OK) {
+    fail(result);
+  }
+  return version;
+}
+
 void SqliteConnection::fail(int code) const {
+  if (_looks && (code == SQLITE_READONLY_ROLLBACK || code == SQLITE_CANTOPEN)) {
+    throw SqliteFailure{code, _path +
+                                  (code == SQLITE_CANTOPEN ? ": has a write-ahead log"
+                                                           : ": the last commit was cut off") +
+                                  ", which only a command that may write can take in"};
+  }
   if ((code & 0xFF) == SQLITE_BUSY) {
     throw SqliteFailure{code, _path + ": another process keeps it locked"};
   }

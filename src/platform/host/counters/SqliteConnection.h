@@ -33,7 +33,12 @@ class SqliteConnection {
   /// Opens an existing file, for reading only when it cannot be written, or a database in memory
   /// (":memory:"). What another process has locked is waited for, `longestWait` at most. Throws
   /// `SqliteFailure`.
-  SqliteConnection(const std::string& path, std::chrono::milliseconds longestWait);
+  ///
+  /// One that `looks` neither writes nor makes nor removes a file, also not one beside the
+  /// database. What would need that fails: to take back a commit that was cut off, to read a
+  /// write-ahead log.
+  SqliteConnection(const std::string& path, std::chrono::milliseconds longestWait,
+                   bool looks = false);
 
   /// Runs statements that give no rows. Throws `SqliteFailure`.
   void execute(const char* sql);
@@ -45,8 +50,8 @@ class SqliteConnection {
   /// connection.
   void commit();
 
-  /// Known for sure when something has been read.
-  bool isReadOnly() const { return sqlite3_db_readonly(handle(), "main") != 0; }
+  /// The version that a program must know to write to the file, as its header says.
+  int formatVersion() const;
 
   sqlite3* handle() const { return _database.get(); }
 
@@ -59,6 +64,7 @@ class SqliteConnection {
   };
 
   std::string _path;
+  bool _looks = false;
   std::unique_ptr<sqlite3, Close> _database;
 };
 

@@ -31,6 +31,12 @@ std::optional<DeviceDirectory> DeviceDirectory::open(const std::string& path, st
   return DeviceDirectory(path.substr(0, lastCharacter + 1));
 }
 
+DeviceDirectory DeviceDirectory::readOnly() const {
+  DeviceDirectory directory = *this;
+  directory._isReadOnly = true;
+  return directory;
+}
+
 std::string DeviceDirectory::hostPath(std::string_view devicePath) const {
   while (!devicePath.empty() && devicePath.front() == '/') {
     devicePath.remove_prefix(1);
@@ -41,6 +47,10 @@ std::string DeviceDirectory::hostPath(std::string_view devicePath) const {
 std::optional<std::string> DeviceDirectory::makeFolder(std::string_view devicePath,
                                                        std::string& error) const {
   const std::string folder = hostPath(devicePath);
+  if (_isReadOnly) {
+    error = folder + ": the device is only looked at";
+    return std::nullopt;
+  }
   if (isFolder(folder)) {
     return folder;
   }

@@ -57,6 +57,9 @@ ECCEventQueue::Outcome ECCEventQueue::take(const std::string& path, std::span<st
 
 int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length) {
   _taken = FileDescriptor();
+  if (_directory.isReadOnly()) {
+    return EROFS;
+  }
   const std::string folder = _directory.hostPath("kernel/ecc");
   std::string error;
   const std::optional<std::vector<std::string>> names = namesInFolder(folder, error);

@@ -23,8 +23,8 @@ class ECCEventQueue {
   /// Takes the oldest event that no other process has taken; its file stays, locked, until
   /// `removeTaken`. What was taken before and not removed is back in the queue. 0, and the bytes in
   /// `buffer`; otherwise an error number: ENOENT when the queue is empty, EINVAL when the buffer is
-  /// not of an event's length, EIO, and an error in the system log, when the folder or an event
-  /// cannot be read now or a file is in the way that cannot be renamed.
+  /// not of an event's length, EROFS on a read-only device, EIO, and an error in the system log,
+  /// when the folder or an event cannot be read now or a file is in the way that cannot be renamed.
   ///
   /// A file that never is an event (of another kind or length, or not for this process to read) is
   /// renamed to NAME.bin.unusable, an error in the system log says why, and the next one is taken.

@@ -57,7 +57,9 @@ std::optional<Number> parseInteger(std::string_view text) {
 /// Builds the value while expat goes through the document.
 class PtreeParser {
  public:
-  PtreeParser() : _expat(XML_ParserCreate("UTF-8")) {
+  /// `visit`, which may be empty, must outlive the object.
+  explicit PtreeParser(const PtreeEntryVisitor& visit)
+      : _expat(XML_ParserCreate("UTF-8")), _visit(visit) {
     if (!_expat) {
       throw std::bad_alloc();
     }
@@ -299,10 +301,24 @@ class PtreeParser {
     if (_open.empty()) {
       _value = std::move(value);
     } else if (_open.back().isDict) {
+      if (_visit) {
+        visitEntry(value);
+      }
       _open.back().dict.set(_open.back().key, std::move(value));
     } else {
       _open.back().array.push_back(std::move(value));
     }
+  }
+
+  void visitEntry(const PropertyValue& value) const {
+    std::vector<std::string_view> keys;
+    for (const Container& container : _open) {
+      if (!container.isDict) {
+        return;
+      }
+      keys.push_back(container.key);
+    }
+    _visit(keys, value);
   }
 
   PropertyValue textValue() {
@@ -453,6 +469,7 @@ class PtreeParser {
   }
 
   std::unique_ptr<XML_ParserStruct, Free> _expat;
+  const PtreeEntryVisitor& _visit;
   Fault _fault;
   Fault _valueFault;
   std::exception_ptr _exception;
@@ -473,7 +490,12 @@ class PtreeParser {
 }  // namespace
 
 std::optional<PropertyValue> readPtree(std::string_view bytes, std::string& error) {
-  return PtreeParser().read(bytes, error);
+  return readPtreeEntries(bytes, error, {});
+}
+
+std::optional<PropertyValue> readPtreeEntries(std::string_view bytes, std::string& error,
+                                              const PtreeEntryVisitor& visit) {
+  return PtreeParser(visit).read(bytes, error);
 }
 
 }  // namespace vesprun

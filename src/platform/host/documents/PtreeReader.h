@@ -1,7 +1,9 @@
 #pragma once
 
 #include <cstddef>
+#include <functional>
 #include <optional>
+#include <span>
 #include <string>
 #include <string_view>
 
@@ -30,5 +32,15 @@ inline constexpr std::size_t kLongestPtree = std::size_t{256} << 20;
 /// The document, its value and the reading together take less than eight times the document's size;
 /// measured with documents of the smallest elements.
 std::optional<PropertyValue> readPtree(std::string_view bytes, std::string& error);
+
+/// Gets an entry of a dictionary when its value is complete. `keys` lead from the root to it
+/// through dictionaries alone, its own is the last.
+using PtreeEntryVisitor =
+    std::function<void(std::span<const std::string_view> keys, const PropertyValue& value)>;
+
+/// The same, and `visit` gets each entry in the order of the document, an entry that a later one
+/// with its key replaces as well. Also of a document that turns out to be none.
+std::optional<PropertyValue> readPtreeEntries(std::string_view bytes, std::string& error,
+                                              const PtreeEntryVisitor& visit);
 
 }  // namespace vesprun

@@ -1,5 +1,6 @@
 #include "platform/host/figures/Collection.h"
 
+#include <algorithm>
 #include <map>
 #include <optional>
 #include <utility>
@@ -67,12 +68,13 @@ class Collection {
   }
 
   void addTo(CounterStore& store, const Date& now) {
-    if (!_isUnsure) {
-      for (const LinuxFigure& figure : linuxFigures) {
-        if (figure.kind == FigureKind::Boots) {
-          grow(figure, std::string(figure.key), _isNewBoot);
-        }
-      }
+    const LinuxFigure& boots =
+        *std::ranges::find(linuxFigures, FigureKind::Boots, &LinuxFigure::kind);
+    if (_isUnsure) {
+      _readings.problems.try_emplace(std::string(boots.file),
+                                     "not known; growth waits until it is");
+    } else {
+      mergeFigure(_growths, boots, std::string(boots.key), _isNewBoot);
     }
     for (const FigureReading& reading : _readings.figures) {
       if (reading.figure->kind == FigureKind::Gauge) {
@@ -95,17 +97,13 @@ class Collection {
     }
   }
 
-  /// Lines for what is left out and has not been told yet.
+  /// Lines for what is left out and was not reported before.
   std::vector<std::string> complaints() {
-    if (_isUnsure) {
-      _readings.problems.try_emplace(kBootPlace + std::string("_id"),
-                                     "not known; no growth is counted");
-    }
     std::vector<std::string> lines;
     for (auto& [path, problem] : _readings.problems) {
-      const Mark* told = known(path);
-      if (told == nullptr || told->text != problem) {
-        lines.push_back(path + ": " + problem + ", left out");
+      const Mark* reported = known(path);
+      if (reported == nullptr || reported->text != problem) {
+        lines.push_back("left out: " + path + ": " + problem);
       }
       _next[path].text = std::move(problem);
     }
@@ -142,7 +140,7 @@ class Collection {
           mark->device != 0 && reading.device != 0 && mark->device != reading.device;
       return isOther || reading.value < mark->value ? 0 : mark->value;
     }
-    // What began with this boot or, as a device that was not there the last time, after it.
+    // It began with this boot or, as a device that was not there the last time, after that.
     const bool isNewDevice = mark == nullptr && known(placeOf(*reading.figure)) != nullptr;
     return _isWholeBoot || isNewDevice ? std::optional(0) : std::nullopt;
   }
@@ -154,13 +152,9 @@ class Collection {
       return;
     }
     if (const std::optional<std::int64_t> base = baseOf(reading)) {
-      grow(*reading.figure, reading.key, reading.value - *base);
+      mergeFigure(_growths, *reading.figure, reading.key, reading.value - *base);
     }
     _next[reading.place] = {reading.device, reading.value};
-  }
-
-  void grow(const LinuxFigure& figure, const std::string& key, std::int64_t growth) {
-    mergeFigure(_growths, figure, key, growth);
   }
 
   const Marks& _last;

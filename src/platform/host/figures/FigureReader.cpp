@@ -81,7 +81,7 @@ std::optional<std::int64_t> numberOf(std::string_view word) {
   return number;
 }
 
-/// A device's name as a part of a key: never an address, of few characters, and short.
+/// A device's name as a part of a key: short, without a hardware address, and of safe characters.
 std::string nameInKey(std::string_view name) {
   const auto isHexDigit = [](char c) { return ('0' <= c && c <= '9') || ('a' <= c && c <= 'f'); };
   if (name.size() > kAddressDigits &&
@@ -127,8 +127,8 @@ class FigureReader {
     std::int64_t identity = 0;
   };
 
-  /// Puts every device that is there in the place of the device classes of `pattern`, the rest of a
-  /// path that begins with `path`.
+  /// Reads the files that `path` and `pattern` make together, with every device that is there in
+  /// place of the pattern's device classes.
   void expand(const std::string& path, std::string_view pattern, const Device& device) {
     const std::size_t start = pattern.find('<');
     std::string folder = path + std::string(pattern.substr(0, start));
@@ -181,7 +181,7 @@ class FigureReader {
         if (!value || *value < figure.lowest || *value > figure.highest) {
           complain(path, std::string(figure.field) + (word.empty() ? " is missing"
                                                       : value      ? " is out of range"
-                                                                   : " is no number"));
+                                                                   : " is not a number"));
           value.reset();
         }
       }
@@ -201,12 +201,12 @@ class FigureReader {
         {&figure, path + ' ' + std::string(figure.field), std::move(key), device.identity, value});
   }
 
-  /// The content of a file as far as it is to be read, which stays until the next call.
+  /// The content of a file, valid until the next call; nothing when it cannot be used.
   std::optional<std::string_view> text(const std::string& path) {
     if (path == kClockFile) {
       return clockText();
     }
-    // Opening must not wait for who writes to a pipe.
+    // Without O_NONBLOCK, opening a pipe would wait for a writer.
     const FileDescriptor file(
         open((_root + path).c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
     struct stat status {};
@@ -234,7 +234,7 @@ class FigureReader {
     if (size == 0 || !std::ranges::all_of(content, [](char c) {
           return (' ' <= c && c <= '~') || c == '\n' || c == '\t';
         })) {
-      complain(path, size == 0 ? "empty" : "no plain text");
+      complain(path, size == 0 ? "empty" : "not plain text");
       return std::nullopt;
     }
     return content;
@@ -298,15 +298,16 @@ class FigureReader {
     return names;
   }
 
-  void complain(const std::string& path, std::string problem) {
-    _readings.problems.try_emplace(path, std::move(problem));
+  void complain(const std::string& path, const std::string& problem) {
+    _readings.problems.try_emplace(path, problem);
   }
 
   const std::string& _root;
   FigureReadings& _readings;
   std::span<const LinuxFigure> _figures;
   bool _isListed = false;
-  std::unique_ptr<char[]> _buffer{new char[kLongestFile + 1]};  // what is not read is not touched
+  std::unique_ptr<char[]> _buffer{
+      new char[kLongestFile + 1]};  // pages that nothing is read into cost nothing
   std::map<std::string, std::optional<std::vector<std::string>>> _devices;  ///< by folder and class
 };
 

@@ -16,19 +16,20 @@ struct FigureReading {
   std::string place;  ///< file and field
   std::string key;
   std::int64_t device;  ///< what its device class calls the identity; 0 when it has none
-  std::int64_t value;   ///< in the unit; `kUnread` when the device is there but the figure is not
+  std::int64_t
+      value;  ///< in the unit; `kUnread` when the device is there but the figure cannot be read
 };
 
 inline constexpr std::int64_t kUnread = -1;  ///< of a counter; no gauge is ever unread
 
-/// What could be read of a system at one moment. A file that is missing has no figures; neither has
-/// one that is no regular file, is longer than 256 KiB or holds anything but a plain text, and a
-/// figure that is no number or is out of its range is left out.
+/// What could be read of a system at one moment. Files that are missing, irregular, longer than
+/// 256 KiB or anything but plain text are left out, and so are figures that are not numbers or out
+/// of their range.
 struct FigureReadings {
   std::vector<FigureReading> figures;  ///< counters and gauges, in the order of the table
-  std::set<std::string_view> listed;   ///< the `file`s whose devices are all known
+  std::set<std::string_view> listed;   ///< each `file` with devices, when all of them are known
   std::string boot;                    ///< the identifier of the boot; empty when it is not known
-  std::map<std::string, std::string> problems;  ///< what was left out though it is there, by path
+  std::map<std::string, std::string> problems;  ///< why existing files were left out, by path
 };
 
 /// Reads the figures of the system below `root` (empty: the running one), of the files for which

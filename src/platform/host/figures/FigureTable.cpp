@@ -5,8 +5,7 @@
 namespace vesprun {
 namespace {
 
-// Far above what a system counts between two starts, and far enough below the highest number for
-// sums.
+// Far above what a system counts between two starts, and low enough that sums do not overflow.
 constexpr std::int64_t kHighestCount = std::int64_t{1} << 48;
 
 constexpr LinuxFigure counter(std::string_view file, std::string_view field, std::string_view key,
@@ -56,9 +55,9 @@ constexpr LinuxFigure kFigures[] = {
             "drivers that keep it awake"),
     // Bit 5: the watchdog caused the last start.
     {"/sys/class/watchdog/<watchdog>/bootstatus", "1", "linux.time.watchdogResets", "count",
-     FigureKind::Counter, 32, 0, 1, "starts after the machine hung, which were no clean shutdown"},
+     FigureKind::Counter, 32, 0, 1, "starts after the machine hung and was reset"},
 
-    // Not the time waiting for disks, which the kernel lets run backwards.
+    // Without the time spent waiting for disks, which the kernel lets run backwards.
     counter(kStat, "cpu 1", "linux.cpu.userSeconds", "s", 100, "work of programs"),
     counter(kStat, "cpu 2", "linux.cpu.niceSeconds", "s", 100,
             "work of programs that give way to others"),

@@ -19,15 +19,15 @@ struct LinuxFigure {
   /// "2": the second word of the first line. "cpu 2": of the line that begins with the word "cpu",
   /// the second word after it. "some total=": on the line "some", what follows "total=".
   std::string_view field;
-  /// The counter key. One that ends in a dot goes on with the device's name. Of several figures
-  /// with one key the sum counts, and of gauges the highest.
+  /// The counter key. One that ends in a dot goes on with the device's name. Counters with the same
+  /// key are added up; of gauges the highest counts.
   std::string_view key;
   std::string_view unit;
   FigureKind kind;
-  std::int64_t divisor;  ///< the file's number over this is in the unit; what is left is cut
-  std::int64_t lowest;   ///< in the unit; what lies outside means something else than a figure
+  std::int64_t divisor;  ///< the number that the file shows for one unit
+  std::int64_t lowest;   ///< in the unit; numbers outside are left out
   std::int64_t highest;
-  std::string_view why;                    ///< what it is good for
+  std::string_view why;                    ///< what it is good for, in the whitelist's words
   std::span<const std::int32_t> bounds{};  ///< of the histogram of a gauge
 };
 
@@ -40,7 +40,7 @@ struct DeviceClass {
   /// What a device is called in keys: "." as it is named here, else as this file in it says. Empty:
   /// it is not named.
   std::string_view namedBy;
-  /// A file in the device with a number that no later device of the same name has; may be empty.
+  /// A file in the device whose number no later device of the same name has; may be empty.
   std::string_view identity;
 };
 

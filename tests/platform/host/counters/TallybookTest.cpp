@@ -1,4 +1,5 @@
 #include <algorithm>
+#include <filesystem>
 #include <limits>
 #include <random>
 #include <sstream>
@@ -155,6 +156,35 @@ TEST_F(TallybookTest, ReadsBackWhatItDumps) {
   EXPECT_EQ(dump(),
             text.substr(0, text.size() - second.size()) + "sample\t19787\tfirst\t-1\t3\n" + second);
   EXPECT_EQ(dump(19788), "");
+}
+
+TEST_F(TallybookTest, GivesTheRoomOfRemovedDaysBack) {
+  std::string lines;
+  for (int i = 0; i < 40'000; ++i) {
+    lines += "sample\t" + std::to_string(i % 20) + "\td\t0.5\t" + std::to_string(i) + '\n';
+  }
+  lines += "scalar\t20\tk\t1\nsample\t21\td\t1\t1\n";
+  for (const char* const form : {"", "PRAGMA auto_vacuum = NONE; VACUUM"}) {
+    EXPECT_TRUE(import(lines)) << error;
+    SqliteConnection(folder.path(kFile), kShortWait).execute(form);
+    const auto before = std::filesystem::file_size(folder.path(kFile));
+    HostTallybook tallybook(device, clock, preferences, log);
+    const auto remove = [](CounterStore& store) {
+      store.appendSamples(0, "added and removed at once", {});
+      const CounterStore::Removed removed = store.removeBefore(20);
+      EXPECT_THAT(removed.days, SizeIs(20));
+      EXPECT_EQ(removed.distributions, 21);
+      store.giveRoomBack();
+      store.setScalar(19, "later", 2);
+      EXPECT_EQ(store.removeBefore(20).scalars, 1);
+      return true;
+    };
+    EXPECT_TRUE(tallybook.write(remove, error)) << error;
+    EXPECT_EQ(dump(0, 30), "scalar\t20\tk\t1\nsample\t21\td\t1\t1\n");
+    EXPECT_LT(std::filesystem::file_size(folder.path(kFile)), before / 3) << form;
+    const auto removeAll = [](CounterStore& store) { return store.removeBefore(30).scalars == 1; };
+    EXPECT_TRUE(tallybook.write(removeAll, error)) << error;
+  }
 }
 
 TEST_F(TallybookTest, KeepsNothingOfAnImportWithABadLine) {

@@ -99,8 +99,8 @@ sys/class/net/enxba9876543210/statistics/tx_bytes | 0    | 1024
 sys/class/net/veth1a2b/statistics/tx_bytes        | 0    | 2048
 sys/class/net/lo/statistics/tx_bytes              | 0    | 2048
 sys/class/hwmon/hwmon3/name          | nvme; | nvme;
-sys/class/hwmon/hwmon3/temp1_input   | 30000 | 38850;
-sys/class/hwmon/hwmon3/temp2_input   | 30000 | 45999;
+sys/class/hwmon/hwmon3/temp1_input   | 30000 | 45999;
+sys/class/hwmon/hwmon3/temp2_input   | 30000 | 38850;
 sys/class/thermal/thermal_zone0/type | INT3400 Thermal; | INT3400 Thermal;
 sys/class/thermal/thermal_zone0/temp | 20000 | -5500
 sys/class/thermal/thermal_zone1/temp | 20000 | 20000
@@ -196,6 +196,7 @@ TEST_F(CollectionTest, GrowthGoesOnFromWhatIsKnown) {
 }
 
 TEST_F(CollectionTest, WhatWasNotThereTheFirstTime) {
+  machine.write(kBoot, "a");
   machine.write("sys/block/sda/diskseq", "1");  // a disk, but nothing to read of it
   collect();
   machine.write("proc/vmstat", "oom_kill 5\n");
@@ -211,6 +212,16 @@ TEST_F(CollectionTest, WhatWasNotThereTheFirstTime) {
   EXPECT_EQ(counted("linux.memory.oomKills"), "1") << "grown before nobody knows when";
   EXPECT_EQ(counted("linux.nvme.fatalErrors"), "1") << "its folder could not be read";
   EXPECT_EQ(counted(kReads), "1");
+  std::filesystem::remove(machine.path(kBoot));
+  machine.write("sys/class/watchdog/watchdog0/bootstatus", "32");
+  collect();
+  EXPECT_THAT(
+      complaints,
+      ElementsAre(
+          "left out: /proc/sys/kernel/random/boot_id: not known; growth waits until it is"));
+  machine.write(kBoot, "a");
+  collect();
+  EXPECT_EQ(counted("linux.time.watchdogResets"), "") << "it may have been there before";
 }
 
 TEST_F(CollectionTest, BadFilesAreLeftOutAndToldOnce) {
@@ -223,16 +234,17 @@ TEST_F(CollectionTest, BadFilesAreLeftOutAndToldOnce) {
     const char* complaint;
   } cases[] = {
       {holding(""), "empty"},
-      {holding(std::string("some total=5\0\n", 14)), "no plain text"},
-      {holding("some total=5\xC3\xA4\n"), "no plain text"},
+      {holding(std::string("some total=5\0\n", 14)), "not plain text"},
+      {holding("some total=5\xC3\xA4\n"), "not plain text"},
       {holding("some total=5\n" + std::string(256 * 1024, ' ')), "longer than 256 KiB"},
       {holding("some avg10=0\nfull total=9000\n"), "some total= is missing"},
       {holding("some total=\nfull total=9000\n"), "some total= is missing"},
-      {holding("some total=12x\nfull total=9000\n"), "some total= is no number"},
-      {holding("some total=0x1G\nfull total=9000\n"), "some total= is no number"},
-      {holding("some total=5.5.5\nfull total=9000\n"), "some total= is no number"},
+      {holding("some total=12x\nfull total=9000\n"), "some total= is not a number"},
+      {holding("some total=0x1G\nfull total=9000\n"), "some total= is not a number"},
+      {holding("some total=5.5.5\nfull total=9000\n"), "some total= is not a number"},
       {holding("some total=-9000\nfull total=9000\n"), "some total= is out of range"},
-      {holding("some total=99999999999999999999\nfull total=9000\n"), "some total= is no number"},
+      {holding("some total=99999999999999999999\nfull total=9000\n"),
+       "some total= is not a number"},
       {[&] { mkfifo(machine.path(path).c_str(), 0600); }, "not a regular file"},
       {[&] { machine.write(path + "/a", ""); }, "not a regular file"},
       {[&] { std::filesystem::create_symlink("io", machine.path(path)); },
@@ -250,7 +262,7 @@ TEST_F(CollectionTest, BadFilesAreLeftOutAndToldOnce) {
       machine.write(kBoot, machine.read(kBoot) + "a");
       collect();
     }
-    EXPECT_THAT(complaints, ElementsAre("/" + path + ": " + complaint + ", left out"));
+    EXPECT_THAT(complaints, ElementsAre("left out: /" + path + ": " + complaint));
     EXPECT_EQ(counted("linux.pressure.ioSomeMilliseconds"), "");
     collect();
     EXPECT_THAT(complaints, IsEmpty());
@@ -271,7 +283,7 @@ TEST_F(CollectionTest, TooManyDevicesAndOddNamesDoNotPileUp) {
   }
   machine.write(kStat, "3");
   collect();
-  EXPECT_THAT(complaints, ElementsAre("/sys/block/: more than 128 devices, left out"));
+  EXPECT_THAT(complaints, ElementsAre("left out: /sys/block/: more than 128 devices"));
   EXPECT_EQ(counted(kReads), "");
   std::filesystem::remove_all(machine.path("sys/block/nvme0n1"));
   machine.write("sys/class/net/enp<&\xFFname/statistics/rx_packets", "5");

@@ -1,0 +1,111 @@
+#pragma once
+
+#include <tsl/ordered_map.h>
+
+#include <optional>
+#include <string_view>
+#include <type_traits>
+#include <vector>
+
+#include "common/PropertyDict.h"
+#include "config/KeyOptions.h"
+#include "config/PrefixTable.h"
+#include "config/WhitelistKeyGroup.h"
+
+namespace vesprun {
+
+/// What the whitelist says of a key or prefix. All of it lies in the document.
+template <typename Options>
+struct WhitelistEntry {
+  std::string_view group;          ///< the last one that names it
+  const PropertyValue* written;    ///< its options as they stand there
+  std::optional<Options> options;  ///< nothing when they cannot be read: held back
+};
+
+enum class DecidedBy { Nothing, Key, Prefix, InternalDevice };
+
+/// How the whitelist decides on a key.
+template <typename Options>
+struct WhitelistDecision {
+  DecidedBy by = DecidedBy::Nothing;
+  std::string_view prefix;                         ///< DecidedBy::Prefix
+  const WhitelistEntry<Options>* entry = nullptr;  ///< DecidedBy::Key and Prefix
+
+  /// The options with which the key leaves, or null when it stays.
+  const Options* options() const {
+    static constexpr Options kNoOptions;
+    if (by == DecidedBy::InternalDevice) {
+      return &kNoOptions;
+    }
+    return entry != nullptr && entry->options ? &*entry->options : nullptr;
+  }
+
+  /// The last group that counts and names the key or its prefix.
+  std::optional<PropertyValue> group() const {
+    return entry != nullptr ? std::optional<PropertyValue>(entry->group) : std::nullopt;
+  }
+
+  /// The options as they stand in the whitelist; nothing when they are no dictionary, too.
+  std::optional<PropertyValue> writtenOptions() const {
+    if (by == DecidedBy::InternalDevice) {
+      return PropertyDict();
+    }
+    return entry != nullptr && entry->written->dict() != nullptr ? std::optional(*entry->written)
+                                                                 : std::nullopt;
+  }
+};
+
+/// The keys and prefixes of one kind, scalars or distributions, from the groups that count.
+template <typename Options>
+class WhitelistTable {
+ public:
+  /// In the order in which they were first named.
+  using Entries = tsl::ordered_map<std::string_view, WhitelistEntry<Options>>;
+
+  /// Takes the entries of a group's list, `Options::kKeyList` or `Options::kPrefixList`. A key or
+  /// prefix that is there takes the later options in its earlier place. Texts and options must
+  /// outlive the table.
+  void take(std::string_view group, std::string_view list, const PropertyDict& entries);
+
+  /// Must be called between the last `take` and the first look-up of a prefix.
+  void indexPrefixes();
+
+  const Entries& keys() const { return _keys; }
+  const Entries& prefixes() const { return _prefixes; }
+
+  /// The exact key decides before the first prefix in order.
+  WhitelistDecision<Options> decide(std::string_view key) const;
+  /// What the first prefix would decide; on `prefix` itself, the one that is reached in its place.
+  WhitelistDecision<Options> decideByPrefix(std::string_view key) const;
+
+ private:
+  Entries _keys;
+  Entries _prefixes;
+  PrefixTable _prefixTable;
+};
+
+/// The tables of both kinds.
+class WhitelistTables {
+ public:
+  /// Takes the lists of a group, which must be a dictionary. Gives the names of those that are
+  /// skipped since they are none.
+  std::vector<std::string_view> take(const WhitelistKeyGroup& group);
+
+  /// See `WhitelistTable`.
+  void indexPrefixes();
+
+  template <typename Options>
+  const WhitelistTable<Options>& of() const {
+    if constexpr (std::is_same_v<Options, ScalarOptions>) {
+      return _scalars;
+    } else {
+      return _distributions;
+    }
+  }
+
+ private:
+  WhitelistTable<ScalarOptions> _scalars;
+  WhitelistTable<DistributionOptions> _distributions;
+};
+
+}  // namespace vesprun

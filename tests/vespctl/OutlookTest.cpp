@@ -1,0 +1,357 @@
+#include <cstring>
+#include <filesystem>
+#include <random>
+#include <regex>
+
+#include "common/PropertyDict.h"
+#include "platform/host/documents/JsonForm.h"
+#include "platform/host/documents/PtreeWriter.h"
+#include "vespctl/VespctlTest.h"
+
+namespace vesprun {
+namespace {
+
+using ::testing::HasSubstr;
+
+constexpr const char* kWhitelist =
+    "device/Library/Application Support/Tallybook/Whitelist_Stagebox.ptree";
+const std::string kDatabase = "device/var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
+
+/// A device on day 19787 whose corruptions were counted and whose group "Off" is switched off.
+class OutlookTest : public VespctlTest {
+ protected:
+  OutlookTest() { describe(""); }
+
+  void describe(const std::string& entries) {
+    folder.write("device/device.json",
+                 R"({"clock": "2024-03-05T09:15:02Z", "apps": [{"bundle": "a", "user": true}],)"
+                 R"("registry": [], "kernel": {"ticks": {"value": 1, "numerator": 1, )"
+                 R"("denominator": 1}, "variables": {"vm.vmtc_total": {"u32": 7}}})" +
+                     entries + "}");
+    write("device/var/mobile/Library/Preferences/com.quill.aggregated.ptree",
+          R"({"DatabaseCorruptionCount": 3})");
+    write("device/var/mobile/Library/Preferences/com.quill.da.ptree",
+          R"({"Off": false, "InternalTesting": false})");
+  }
+
+  /// Writes a JSON text as ptree document.
+  void write(std::string_view name, const std::string& json) {
+    std::string failure;
+    std::string document;
+    const std::optional<PropertyValue> value = valueFromJsonText(json, failure);
+    ASSERT_TRUE(value && writePtree(*value, document, failure)) << failure;
+    folder.write(name, document);
+  }
+
+  std::string print(const std::string& arguments) {
+    EXPECT_EQ(run(arguments), 0) << arguments << ": " << error;
+    return output;
+  }
+
+  void import(const std::string& lines) {
+    folder.write("lines", lines);
+    print("counters \"$D\" import lines");
+  }
+
+  void setWritable(bool writable) const {
+    using std::filesystem::perms, std::filesystem::perm_options;
+    for (const auto& entry : std::filesystem::recursive_directory_iterator(folder.path("device"))) {
+      std::filesystem::permissions(entry.path(), perms::owner_write,
+                                   writable ? perm_options::add : perm_options::remove);
+    }
+  }
+
+  /// The daily log in the outbox; empty without one.
+  std::string submitted() const {
+    for (const std::string& name : folder.names("device/outbox/logs")) {
+      if (name.ends_with("-193-log-aggregated.ptree")) {
+        return folder.read("device/outbox/logs/" + name);
+      }
+    }
+    return "";
+  }
+
+  /// Everything in the device directory, with times and modes.
+  std::string snapshot() const {
+    std::string all;
+    namespace fs = std::filesystem;
+    for (const auto& entry : fs::recursive_directory_iterator(folder.path("device"))) {
+      all += entry.path().string() + ' ' +
+             std::to_string(entry.last_write_time().time_since_epoch().count()) + ' ' +
+             std::to_string(static_cast<int>(entry.status().permissions()));
+      all += entry.is_regular_file()
+                 ? folder.read(fs::relative(entry.path(), folder.path()).string())
+                 : "";
+    }
+    return all;
+  }
+};
+
+/// A whitelist of short keys in all four lists, which often meet.
+std::string randomWhitelist(std::mt19937& random) {
+  const auto any = [&](std::initializer_list<const char*> texts) {
+    return std::string(texts.begin()[random() % texts.size()]);
+  };
+  std::string groups;
+  for (const char* name : {"A", "InternalTesting", "Off", "B"}) {
+    std::string lists;
+    for (const char* list :
+         {"ScalarKeys", "ScalarKeyPrefixes", "DistributionKeys", "DistributionKeyPrefixes"}) {
+      std::string entries;
+      for (const char* key : {"a", "ab", "b.", "b.c", "com.quill."}) {
+        if (random() % 4 == 0) {
+          entries += (entries.empty() ? "\"" : ",\"") + std::string(key) + "\":" +
+                     any({"{}", R"({"sig_fig":1})", R"({"bucket_interval":10,"sig_fig":2})",
+                          R"({"sig_fig":"1"})", R"({"intervals":[2,5.5]})", "true",
+                          R"({"intervals":true})"});
+        }
+      }
+      lists += (lists.empty() ? "\"" : ",\"") + std::string(list) + "\":{" + entries + '}';
+    }
+    groups += (groups.empty() ? "\"" : ",\"") + std::string(name) + "\":{" + lists + '}';
+  }
+  return '{' + groups + '}';
+}
+
+TEST_F(OutlookTest, PreviewsWhatTheRunSubmitsRightAfter) {
+  std::string lines;
+  int number = 0;
+  for (const char* day : {"19784", "19785", "19786", "19787"}) {
+    for (const char* key : {"a", "ab", "abc", "b.c", "d", "com.quill.kernel.vmtc_total"}) {
+      if (++number % 3 != 0) {
+        lines += std::string("scalar\t") + day + '\t' + key + '\t' + std::to_string(number * 997);
+        lines += std::string("\nsample\t") + day + '\t' + key + "\t4\t1\nsample\t" + day + '\t' +
+                 key + '\t' + std::to_string(number) + ".25\t2\n";
+      }
+    }
+  }
+  import(lines);
+  int logs = 0;
+  for (unsigned int seed = 0; seed < 24; ++seed) {
+    std::mt19937 random(seed);
+    describe(seed % 3 == 0 ? R"(, "properties": {"InternalBuild": true})" : "");
+    write(kWhitelist, randomWhitelist(random));
+    const bool today = seed % 4 == 3;
+    const std::string day = today ? " --day 19787" : "";
+    const std::string before = snapshot();
+    const std::string preview = print("preview \"$D\" --document" + day);
+    const std::string json = print("preview \"$D\"" + day);
+    std::string failure;
+    const PropertyDict leftOut{
+        {"rows", valueFromJsonText(print("preview \"$D\" --left-out" + day), failure).value()}};
+    EXPECT_EQ(snapshot(), before) << seed;
+    print(std::string("run \"$D\" -- ") + (today ? "-t" : "-f"));
+    const bool hasLog = run("ptree device/outbox/logs/*-193-*.ptree") == 0;
+    EXPECT_EQ(json, hasLog ? output : "null\n") << seed;
+    EXPECT_EQ(preview, submitted()) << seed;
+    logs += hasLog ? 1 : 0;
+    for (const PropertyValue& row : *leftOut.findArray("rows")) {
+      const std::string* key = row.dict()->findString("key");
+      const bool isScalar = *row.dict()->findString("kind") == "scalar";
+      print("explain \"$D\" " + *key + (isScalar ? "" : " --distribution"));
+      EXPECT_THAT(output, HasSubstr("\"leaves\":false")) << seed;
+    }
+    std::filesystem::remove_all(folder.path("device/outbox"));
+    std::filesystem::remove_all(folder.path("device/var/mobile/Library/Preferences"));
+  }
+  EXPECT_GT(logs, 12);
+  EXPECT_LT(logs, 24);
+}
+
+TEST_F(OutlookTest, PreviewsNullWhereNothingWouldBeSubmitted) {
+  import("scalar\t19786\ts\t1\n");
+  const struct {
+    const char* entries;
+    const char* whitelist;
+    const char* complaint;
+  } cases[] = {
+      {"", R"({"Off": {"ScalarKeys": {"s": {}}}})",
+       "vespctl: keyGroup Off is disabled by tasking\n"},
+      {R"(, "submission": {"enabled": false})", R"({"G": {"ScalarKeys": {"s": {}}}})", ""},
+      {R"(, "submission": {"fails": true})", R"({"G": {"ScalarKeys": {"s": {}}}})",
+       "vespctl: Failed to write aggregated log\n"},
+      {R"(, "languages": {"preferred": ["\u0001"]})", R"({"G": {"ScalarKeys": {"s": {}}}})",
+       "vespctl: Could not create aggregated ptree: "},
+      {R"(, "properties": {"InternalBuild": true})", "[]",
+       "vespctl: Couldn't parse the contents of the config file. "},
+  };
+  for (const auto& [entries, whitelist, complaint] : cases) {
+    describe(entries);
+    write(kWhitelist, whitelist);
+    EXPECT_EQ(print("preview \"$D\""), "null\n") << whitelist;
+    EXPECT_TRUE(error.starts_with(complaint) && error.empty() == (*complaint == '\0')) << error;
+    EXPECT_EQ(print("preview \"$D\" --document"), "");
+  }
+  EXPECT_EQ(print("preview \"$D\" --left-out"), "[{\"kind\":\"scalar\",\"key\":\"s\"}]\n");
+  EXPECT_EQ(run("preview \"$D\" --left-out --document"), 2);
+  EXPECT_EQ(run("preview \"$D\" --day x"), 2);
+}
+
+TEST_F(OutlookTest, LooksAtADeviceWithoutTouchingIt) {
+  import("scalar\t19786\ts\t1\n");
+  write(kWhitelist, R"({"G": {"ScalarKeys": {"s": {}}}})");
+  const std::string database = folder.read(kDatabase);
+  std::string otherFormat = database;
+  otherFormat[18] = 3;
+  std::string writeAhead = database;
+  writeAhead[18] = writeAhead[19] = 2;
+  const struct {
+    std::string database;
+    const char* beside;
+    const char* complaint;
+  } cases[] = {
+      {database, "-none", ""},
+      {database, "-journal", "the last commit was cut off"},
+      {"", "-journal", "not a counter database"},
+      {database, "-wal", "has a write-ahead log"},
+      {"", "-wal", "TBDataStore"},
+      {writeAhead, "-none", "has a write-ahead log"},
+      {otherFormat, "-none", "the header is damaged"},
+      {database.substr(0, database.size() / 2), "-none", "malformed"},
+      {"no database", "-none", "not a database"},
+  };
+  for (const auto& [content, beside, complaint] : cases) {
+    folder.write(kDatabase, content);
+    folder.write(kDatabase + beside, "\xD9\xD5\x05\xF9\x20\xA1\x63\xD7");
+    setWritable(false);
+    const std::string before = snapshot();
+    for (const char* command :
+         {"preview \"$D\"", "preview \"$D\" --left-out", "explain \"$D\" s",
+          "whitelist diff \"$D\" device/Library/*/*/Whitelist_Stagebox.ptree"}) {
+      EXPECT_EQ(run(command), *complaint == '\0' ? 0 : 1) << command << complaint << output;
+      EXPECT_THAT(error, HasSubstr(complaint)) << command;
+      EXPECT_EQ(std::count(error.begin(), error.end(), '\n'), *complaint == '\0' ? 0 : 1) << error;
+    }
+    EXPECT_EQ(snapshot(), before) << complaint;
+    setWritable(true);
+    std::filesystem::remove(folder.path(kDatabase + beside));
+  }
+}
+
+TEST_F(OutlookTest, ExplainsByWhatAKeyLeavesOrStays) {
+  import(
+      "scalar\t19785\tkey\t14\nscalar\t19786\tkey\t26\nscalar\t19787\tkey\t9\n"
+      "scalar\t19786\tkey.longer\t1\nsample\t19786\tpre.d\t3\t0\nsample\t19786\theld.d\t3\t0\n");
+  write(kWhitelist, R"({
+      "A": {"ScalarKeys": {"key": {}, "held": {"sig_fig": "2"}, "text": "x"},
+            "ScalarKeyPrefixes": {"pre.": {}}, "DistributionKeyPrefixes": {"pre": {"intervals": [5]}}},
+      "Off": {"ScalarKeys": {"key": {}}, "ScalarKeyPrefixes": {"o": {}, "off": {}}},
+      "B": {"ScalarKeys": {"key": {"bucket_interval": 10, "why": 1}}, "DistributionKeys": {"held.d": {"intervals": 1}}},
+      "InternalTesting": {"ScalarKeyPrefixes": {"of": {}}, "ScalarKeys": {"off": {}}}})");
+  const std::string nothing = R"("prefix":null,"group":null,"options":null,"source":)";
+  const std::string off = R"({"group":"Off","why":"disabled by tasking","by":)";
+  const struct {
+    const char* key;
+    std::string answer;
+    const char* onInternalDevices;
+  } cases[] = {
+      {"key",
+       R"("leaves":true,"by":"key","prefix":null,"group":"B","options":{"bucket_interval":10,"why":1},"source":false,"passedOver":[)" +
+           off +
+           R"("key"}],"values":[{"day":19785,"stored":14,"reported":10},{"day":19786,"stored":26,"reported":30}]})",
+       R"("group":"B")"},
+      {"held",
+       R"("leaves":false,"by":"key","prefix":null,"group":"A","options":{"sig_fig":"2"},"source":false,"passedOver":[],"values":[]})",
+       R"("leaves":false,"by":"key")"},
+      {"text", R"("leaves":false,"by":"key","prefix":null,"group":"A","options":null,)",
+       R"("options":null)"},
+      {"pre.fix", R"("leaves":true,"by":"prefix","prefix":"pre.","group":"A","options":{},)",
+       R"("by":"prefix")"},
+      {"off",
+       R"("leaves":false,"by":null,)" + nothing + R"(false,"passedOver":[)" + off +
+           R"("prefix"},{"group":"InternalTesting","why":"internal devices only","by":"key"}],"values":[]})",
+       R"("leaves":true,"by":"key","prefix":null,"group":"InternalTesting","options":{},"source":false,"passedOver":[])"},
+      {"key.longer",
+       R"("leaves":false,"by":null,)" + nothing +
+           R"(false,"passedOver":[],"values":[{"day":19786,"stored":1,"reported":null}]})",
+       R"("leaves":true,"by":"internal device","prefix":null,"group":null,"options":{},)"},
+      {"com.quill.kernel.swapusage", R"("leaves":false,"by":null,)" + nothing + "true,",
+       R"("source":true)"},
+      {"pre.d --distribution",
+       R"("leaves":true,"by":"prefix","prefix":"pre","group":"A","options":{"intervals":[5]},"source":false,"passedOver":[],"values":[{"day":19786,"statistics":[3.0,3.0,3.0,0.0,1],"histogram":{"(-inf, 5]":1}}]})",
+       R"("prefix":"pre")"},
+      {"held.d --distribution",
+       R"("options":{"intervals":1},"source":false,"passedOver":[],"values":[{"day":19786,"statistics":null,"histogram":null}]})",
+       R"("leaves":false)"},
+  };
+  for (const char* device : {"", R"(, "properties": {"InternalBuild": true})"}) {
+    describe(device);
+    for (const auto& [key, answer, onInternalDevices] : cases) {
+      EXPECT_THAT(print(std::string("explain \"$D\" ") + key),
+                  HasSubstr(*device == '\0' ? answer : onInternalDevices));
+    }
+  }
+  std::filesystem::remove(folder.path(kWhitelist));
+  EXPECT_THAT(print("explain \"$D\" key"), HasSubstr(R"("leaves":false,"by":null,)" + nothing));
+}
+
+TEST_F(OutlookTest, FindsEachFaultOfAWhitelist) {
+  write("w", R"({"None": [],
+      "A": {"Scalars": {}, "DistributionKeys": true,
+        "ScalarKeys": {"held": true, "odd": {"bucket_interval": {"real": "nan"}, "sig_fig": 1.5},
+          "zero": {"bucket_interval": 0, "sig_fig": 0.0}, "far": {"bucket_interval": -1, "sig_fig": true},
+          "unread": {"intervals": []}, "p.same": {"sig_fig": 2.0}, "p.other": {}, "again": {}, "tested": {}},
+        "ScalarKeyPrefixes": {"p.": {"sig_fig": 2}, "p.x": {}, "t.x": {}}},
+      "InternalTesting": {"ScalarKeys": {"tested": {}, "p.in": {"sig_fig": 2}}, "ScalarKeyPrefixes": {"t.": {}}},
+      "B": {"ScalarKeys": {"again": {"sig_fig": 2}, "t.k": {}},
+        "DistributionKeyPrefixes": {"": {"intervals": [1.0, 1]}}}})");
+  folder.write("twice", R"(<ptree version="1.0"><dict><key>G</key><true/><key>G</key><dict>
+      <key>ScalarKeys</key><true/><key>ScalarKeys</key><dict><key>k</key><true/><key>l</key><dict/>
+      <key>k</key><dict/></dict></dict></dict></ptree>)");
+  const std::pair<const char*, const char*> cases[] = {
+      {"w",
+       "None/-/-/wrong kind\nA/Scalars/-/unknown list\nA/DistributionKeys/-/wrong kind\n"
+       "A/ScalarKeys/held/unreadable options\nA/ScalarKeys/odd/doubtful number\n"
+       "A/ScalarKeys/odd/doubtful number\nA/ScalarKeys/zero/interval is 0\n"
+       "A/ScalarKeys/zero/digit count is 0\nA/ScalarKeys/far/unreadable options\n"
+       "A/ScalarKeys/far/doubtful number\nA/ScalarKeys/unread/unread option\n"
+       "A/ScalarKeys/p.same/same as its prefix\nA/ScalarKeys/again/replaced by a later group\n"
+       "A/ScalarKeyPrefixes/p.x/prefix never reached\n"
+       "InternalTesting/ScalarKeys/p.in/same as its prefix\n"
+       "B/DistributionKeyPrefixes//intervals do not rise\n"
+       "B/DistributionKeyPrefixes//empty prefix\n"},
+      {"twice",
+       "G/-/-/stands twice\nG/ScalarKeys/-/stands twice\nG/ScalarKeys/k/unreadable options\n"
+       "G/ScalarKeys/k/stands twice\n"}};
+  for (const auto& [file, expected] : cases) {
+    EXPECT_EQ(run("whitelist check " + std::string(file)), 1);
+    const auto count = std::count(expected, expected + std::strlen(expected), '\n');
+    EXPECT_EQ(error,
+              "vespctl: " + std::string(file) + ": faults found: " + std::to_string(count) + "\n");
+    std::string failure;
+    std::string found;
+    output = std::regex_replace(output, std::regex(":null"), ":\"-\"");
+    for (const PropertyValue& finding : *valueFromJsonText(output, failure).value().array()) {
+      for (const char* part : {"group", "list", "key"}) {
+        found += *finding.dict()->findString(part) + '/';
+      }
+      found += *finding.dict()->findString("finding") + '\n';
+      EXPECT_GT(finding.dict()->findString("detail")->size(), 20U);
+    }
+    EXPECT_EQ(found, expected);
+  }
+  write("good", R"({"G": {"ScalarKeys": {"a": {}}}})");
+  EXPECT_EQ(print("whitelist check - <good"), "[]\n");
+  EXPECT_EQ(run("whitelist check <(echo '<ptree version=\"1.0\"><array/></ptree>')"), 1);
+  EXPECT_EQ(output, "");
+  EXPECT_THAT(error, HasSubstr("the root is not a dictionary"));
+}
+
+TEST_F(OutlookTest, TellsWhatAnotherWhitelistWouldChange) {
+  import("scalar\t1\ta\t1\nscalar\t2\tb\t1\nsample\t3\td\t1\t0\nsample\t3\te\t1\t0\n");
+  write(kWhitelist, R"({"G": {"ScalarKeys": {"a": {"sig_fig": 2}, "gone": {}},
+      "ScalarKeyPrefixes": {"com.quill.usage": {}}, "DistributionKeys": {"d": {"intervals": [1, 2]}, "e": {}}}})");
+  write("next", R"({"G": {"ScalarKeyPrefixes": {"a": {"sig_fig": 2.0}, "b": {}},
+      "DistributionKeys": {"d": {"intervals": [1.0, 3]}, "e": {"sig_fig": 1}}}})");
+  EXPECT_EQ(
+      print("whitelist diff \"$D\" next"),
+      R"({"scalars":{"added":["b"],"removed":["com.quill.usage.cur_boot_session_cpu_uptime"],)"
+      R"("changed":[]},"distributions":{"added":[],"removed":[],"changed":[{"key":"d",)"
+      R"("before":{"intervals":[1,2]},"after":{"intervals":[1.0,3]}}]}})"
+      "\n");
+  EXPECT_EQ(run("whitelist diff \"$D\" - <<<'<ptree>'"), 1);
+  EXPECT_THAT(error, HasSubstr("standard input"));
+}
+
+}  // namespace
+}  // namespace vesprun

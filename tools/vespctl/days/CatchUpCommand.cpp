@@ -1,0 +1,119 @@
+#include <algorithm>
+#include <cstdint>
+#include <limits>
+#include <optional>
+#include <set>
+#include <string>
+
+#include "Command.h"
+#include "days/DailyWork.h"
+#include "outbox/SubmittedLogs.h"
+#include "platform/Platform.h"
+#include "platform/host/counters/HostTallybook.h"
+#include "platform/host/device/PrunedLogs.h"
+#include "report/LogSubmission.h"
+#include "report/ReportSources.h"
+#include "report/TBReport.h"
+
+namespace vesprun {
+namespace {
+
+/// The days that a daily log tells of, or did before it was removed.
+std::set<std::int32_t> reportedDays(const DeviceDirectory& directory) {
+  std::set<std::int32_t> days;
+  nameUnreadable(
+      forEachSubmittedLog(directory, [&days](SubmittedLog&& log) { days.insert(log.day); }));
+  std::string error;
+  const std::optional<PrunedLogs> pruned = readPrunedLogs(directory, error);
+  if (!pruned) {
+    throw CommandFailure(error);
+  }
+  for (const PrunedLog& log : *pruned) {
+    days.insert(log.day);
+  }
+  return days;
+}
+
+/// The days from `first` to `last` that have a row and are not among `reported`.
+std::vector<std::int32_t> missedDays(HostTallybook& counters, std::int64_t first, std::int64_t last,
+                                     const std::set<std::int32_t>& reported) {
+  std::vector<std::int32_t> days;
+  const auto find = [&](CounterStore& store) {
+    std::optional<std::int32_t> day = store.nextDay(first - 1);
+    for (; day && *day <= last; day = store.nextDay(*day)) {
+      if (!reported.contains(*day)) {
+        days.push_back(*day);
+      }
+    }
+  };
+  std::string error;
+  if (!counters.read(find, error)) {
+    throw CommandFailure(error);
+  }
+  return days;
+}
+
+enum class Submission { Done, Empty, Failed };
+
+/// Submits what the run of the day after would have, without the keys that tell of its moment.
+Submission submitReport(std::int32_t day) {
+  logMessage(LogLevel::Default, "catching up on day %d", day);
+  TBReport report;
+  if (!report.readHistory(day)) {
+    return Submission::Failed;
+  }
+  std::optional<PropertyDict> document =
+      report.makeDocument(day, nullptr, TBReport::SideEffects::LeftOut);
+  if (!document) {
+    return Submission::Empty;
+  }
+  PropertyDict scalars = *document->find("TBScalars")->dict();
+  for (const std::string_view key : ownScalarKeys()) {
+    scalars.remove(key);
+  }
+  document->set("TBScalars", std::move(scalars));
+  const std::optional<std::string> bytes = serializeDailyLog(*document);
+  return bytes && submitDailyLog(*bytes) ? Submission::Done : Submission::Failed;
+}
+
+void catchUp(const std::string& directory, std::uint32_t last) {
+  const auto device = openDevice(directory);
+  const InstalledPlatform installed(*device);
+  const FolderLock lock = takeDailyWork(device->directory());
+  const std::int64_t today = device->tallybook().TBDaysSince1970();
+  PropertyArray submitted;
+  std::string failed;
+  if (device->logsmith().DiagnosticLogSubmissionEnabled()) {
+    for (const std::int32_t day : missedDays(device->counters(), today - 1 - last, today - 2,
+                                             reportedDays(device->directory()))) {
+      const Submission submission = submitReport(day);
+      if (submission == Submission::Done) {
+        submitted.emplace_back(day);
+      } else if (submission == Submission::Failed) {
+        failed += (failed.empty() ? "" : ", ") + std::to_string(day);
+      }
+    }
+  }
+  printJson(submitted);
+  if (!failed.empty()) {
+    throw CommandFailure("not submitted: " + failed + "; the system log says why");
+  }
+}
+
+}  // namespace
+
+void addCatchUpCommand(CLI::App& vespctl) {
+  struct Arguments {
+    std::string directory;
+    std::uint32_t last = 7;
+  };
+  const auto arguments = std::make_shared<Arguments>();
+  CLI::App* command = vespctl.add_subcommand(
+      "catch-up", "Submits the reports of days that no daily log tells of, and prints the days");
+  command->add_option("DIR", arguments->directory, "The device directory")->required();
+  command->add_option("--last", arguments->last, "How many days, the day before yesterday the last")
+      ->check(decimal<std::uint32_t>());
+  command->callback([arguments] { catchUp(arguments->directory, arguments->last); });
+}
+
+}  // namespace vesprun

@@ -1,0 +1,26 @@
+#pragma once
+
+#include <memory>
+#include <string>
+
+#include "Command.h"
+#include "Complaints.h"
+
+namespace vesprun {
+
+/// The installed platform of a device that a command only looks at. What would stand in the system
+/// log becomes the command's complaints.
+struct LookedAtDevice {
+  explicit LookedAtDevice(const std::string& directory, LogLevel least = LogLevel::Error)
+      : complaints(nullptr, least),
+        device(openDeviceReadOnly(directory, complaints)),
+        installed(*device) {}
+
+  Complaints complaints;
+  std::unique_ptr<HostPlatform> device;
+  InstalledPlatform installed;
+};
+
+inline constexpr const char* kUnreadableCounters = "counters cannot be read";
+
+}  // namespace vesprun

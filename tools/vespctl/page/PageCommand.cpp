@@ -1,0 +1,69 @@
+#include <sys/stat.h>
+
+#include <filesystem>
+#include <iostream>
+#include <limits>
+#include <system_error>
+
+#include "Command.h"
+#include "outlook/LookedAtDevice.h"
+#include "page/Page.h"
+#include "platform/host/files/AtomicFile.h"
+
+namespace vesprun {
+namespace {
+
+/// Writes the file whole or not at all. What a link leads to is replaced, not the link.
+void writePage(const std::string& file, const std::string& page) {
+  std::error_code failure;
+  std::filesystem::path path(file);
+  if (std::filesystem::exists(path, failure)) {
+    if (!std::filesystem::is_regular_file(path, failure)) {
+      throw CommandFailure(file + ": not a regular file");
+    }
+    path = std::filesystem::canonical(path, failure);
+  }
+  if (failure) {
+    throw CommandFailure(file + ": " + failure.message());
+  }
+  std::string error;
+  if (!replaceFile(path.string(), page, error)) {
+    throw CommandFailure(error);
+  }
+}
+
+void makePage(const std::string& directory, const std::string& file) {
+  using Days = std::numeric_limits<std::int32_t>;
+  const LookedAtDevice looked(directory);
+  const PageData data(looked.device->directory());
+  const auto keptBack = keysKeptBack(Days::min(), Days::max());
+  if (!keptBack) {
+    looked.complaints.fail(kUnreadableCounters);
+  }
+  looked.complaints.print();
+  nameUnreadable(data.submitted.unreadable);
+  nameUnreadable(data.unreadable);
+  std::error_code ignored;
+  const auto absolute = std::filesystem::canonical(looked.device->directory().path(), ignored);
+  const std::string page =
+      pageText(absolute.filename().string(), platform().clock().now(), data, *keptBack);
+  if (file.empty() || file == "-") {
+    std::cout << page;
+  } else {
+    writePage(file, page);
+  }
+}
+
+}  // namespace
+
+void addPageCommand(CLI::App& vespctl) {
+  const auto directory = std::make_shared<std::string>();
+  const auto file = std::make_shared<std::string>();
+  CLI::App* command =
+      vespctl.add_subcommand("page", "Writes one HTML page of all that the device reported");
+  command->add_option("DIR", *directory, "The device directory")->required();
+  command->add_option("FILE", *file, "Where to write it, instead of standard output");
+  command->callback([directory, file] { makePage(*directory, *file); });
+}
+
+}  // namespace vesprun

@@ -1,0 +1,68 @@
+#pragma once
+
+#include <cstdint>
+#include <map>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "outbox/SubmittedLogs.h"
+#include "platform/host/device/DeviceDirectory.h"
+
+namespace vesprun {
+
+/// What the outbox of a device tells, read once. Later parts refer to earlier ones.
+struct PageData {
+  struct Value {
+    double day;  ///< since 1970, with a fraction for a time within the day
+    Number value;
+  };
+  using Series = std::vector<Value>;
+
+  struct DistributionDay {
+    std::int32_t day;
+    double minimum, maximum, mean, squaredDeviations;
+    Number count;
+    const PropertyDict* histogram;  ///< null: none
+  };
+
+  struct Event {
+    double day;
+    PropertyDict payload;
+  };
+
+  /// The events of one name, and for one that tells of an MSP, of that MSP.
+  struct Events {
+    std::size_t count = 0;
+    std::vector<Event> newest;  ///< some hundred at most, in the order of their lines
+  };
+
+  /// The fields of a submitted text log of type 165, "name:value;name:value".
+  struct StorageLog {
+    std::string name;
+    std::optional<Date> date;
+    std::map<std::string, double, std::less<>> fields;
+  };
+
+  explicit PageData(const DeviceDirectory& directory);
+  PageData(const PageData&) = delete;
+  PageData& operator=(const PageData&) = delete;
+
+  SubmittedLogs submitted;
+  std::map<std::int32_t, const SubmittedLog*> days;  ///< the last revision of each
+  std::map<std::string_view, Series> scalars;        ///< by key, by day
+  std::map<std::string_view, std::vector<DistributionDay>> distributions;
+  std::map<std::string, Events> events;       ///< by name
+  std::optional<StorageLog> storageLog;       ///< the newest
+  std::map<std::string, std::size_t> others;  ///< what else was submitted, and how often
+  std::vector<UnreadableLog> unreadable;      ///< other files, and lines of files
+
+ private:
+  void takeDays();
+  void takeLogs(const DeviceDirectory& directory);
+  void takeEvents(const DeviceDirectory& directory);
+  void takeRecords(const DeviceDirectory& directory);
+};
+
+}  // namespace vesprun

@@ -1,0 +1,221 @@
+#include "page/StorageHealth.h"
+
+#include <algorithm>
+#include <cmath>
+#include <initializer_list>
+
+#include "common/Calendar.h"
+#include "page/Html.h"
+
+namespace vesprun {
+namespace {
+
+using Level = HealthStatement::Level;
+
+// Percentages: of the rated erase cycles, of the spare blocks, of the capacity.
+constexpr double kWearToLookAt = 80;
+constexpr double kWearToActOn = 100;
+constexpr double kSpareToLookAt = 99;
+constexpr double kSpareToActOn = 10;
+constexpr double kFullnessToLookAt = 95;
+
+struct Fact {
+  double value;
+  double day;
+};
+
+/// The newest value of each figure, by its name without what all have in front.
+class Facts {
+ public:
+  explicit Facts(const PageData& data) {
+    constexpr std::string_view kKeys = "com.quill.NANDInfo.";
+    constexpr std::string_view kEvents = "com.quill.massStorage.NANDInfo.";
+    for (auto series = data.scalars.lower_bound(kKeys);
+         series != data.scalars.end() && series->first.starts_with(kKeys); ++series) {
+      const PageData::Value& newest = series->second.back();
+      take(series->first.substr(kKeys.size()), newest.value.asDouble(), newest.day);
+    }
+    for (auto event = data.events.lower_bound(std::string(kEvents));
+         event != data.events.end() && event->first.starts_with(kEvents); ++event) {
+      takeEvent(event->first.substr(kEvents.size()), event->second.newest.back());
+    }
+    if (data.storageLog && data.storageLog->date) {
+      const double day = static_cast<double>(data.storageLog->date->seconds) / kSecondsPerDay;
+      for (const auto& [name, value] : data.storageLog->fields) {
+        take(name.starts_with(kKeys) ? name.substr(kKeys.size()) : name, value, day);
+      }
+    }
+  }
+
+  /// The newest figure under any of the names.
+  std::optional<Fact> find(std::initializer_list<std::string_view> names) const {
+    std::optional<Fact> newest;
+    for (const std::string_view name : names) {
+      const auto fact = _facts.find(name);
+      if (fact != _facts.end() && (!newest || fact->second.day > newest->day)) {
+        newest = fact->second;
+      }
+    }
+    return newest;
+  }
+
+ private:
+  void take(std::string_view name, double value, double day) {
+    if (std::isfinite(value) && value >= 0) {
+      const auto [fact, isNew] = _facts.try_emplace(std::string(name), Fact{value, day});
+      if (!isNew && day >= fact->second.day) {
+        fact->second = {value, day};
+      }
+    }
+  }
+
+  void takeEvent(const std::string& name, const PageData::Event& event) {
+    // The statistics magazine tells what a counter grew by, under the counter's own name.
+    const std::string prefix = name.starts_with("SM.") ? name.substr(0, name.rfind('.') + 1) : "";
+    if (name.starts_with("MSP")) {
+      return;  // a part of the storage only
+    }
+    for (const auto& [field, value] : event.payload) {
+      if (value.number() != nullptr) {
+        take(prefix + field, value.number()->asDouble(), event.day);
+      }
+    }
+  }
+
+  std::map<std::string, Fact, std::less<>> _facts;
+};
+
+/// Collects the sentences; one is made when its figure is known.
+class Statements {
+ public:
+  explicit Statements(const PageData& data) : _facts(data) {}
+
+  using Names = std::initializer_list<std::string_view>;
+
+  std::optional<Fact> find(Names names) const { return _facts.find(names); }
+
+  template <typename... Days>
+  void add(Level level, const std::string& text, Days... days) {
+    list.push_back({level, text, std::max({days...})});
+  }
+
+  /// A counter that should be 0.
+  void addFailures(Names names, Level ifAny, const std::string& none, const char* noun,
+                   const std::string& some) {
+    if (const auto fact = find(names)) {
+      const auto count = static_cast<std::size_t>(std::min(fact->value, 1e18));
+      add(count == 0 ? Level::Good : ifAny, count == 0 ? none : countedNoun(count, noun) + some,
+          fact->day);
+    }
+  }
+
+  std::vector<HealthStatement> list;
+
+ private:
+  Facts _facts;
+};
+
+std::string percentText(double value) { return numeral(value) + "\u202F%"; }
+
+void addWear(Statements& statements) {
+  const auto addUsed = [&statements](Statements::Names names, const char* where) {
+    if (const auto used = statements.find(names)) {
+      statements.add(used->value >= kWearToActOn    ? Level::Act
+                     : used->value >= kWearToLookAt ? Level::Look
+                                                    : Level::Good,
+                     percentText(used->value) + " of the rated erase cycles of the " + where +
+                         " partition are used.",
+                     used->day);
+    }
+  };
+  addUsed({"UserPartitionPEPercentUsed", "percentUsed"}, "user");
+  addUsed({"IntermediatePartitionPEPercentUsed", "slcPercentUsed"}, "intermediate");
+  const auto user = statements.find({"HLT_averageTLCPECycles"});
+  const auto intermediate = statements.find({"HLT_averageSLCPECycles"});
+  if (user && intermediate) {
+    statements.add(Level::Plain,
+                   "A TLC block has been erased " + numeral(user->value) +
+                       " times on average, an SLC block " + numeral(intermediate->value) +
+                       " times.",
+                   user->day, intermediate->day);
+  }
+  if (const auto spare = statements.find({"spareAvailablePercent"})) {
+    statements.add(spare->value <= kSpareToActOn    ? Level::Act
+                   : spare->value <= kSpareToLookAt ? Level::Look
+                                                    : Level::Good,
+                   percentText(spare->value) + " of the spare blocks are available.", spare->day);
+  }
+}
+
+void addFaults(Statements& statements) {
+  const auto factory = statements.find({"numFactoryBad", "numFactoryBadBlocks"});
+  const std::string since =
+      factory ? "; " + numeral(factory->value) + " were bad from the factory." : ".";
+  statements.addFailures({"numGrownBad"}, Level::Look, "No block has gone bad in use" + since,
+                         "block", " went bad in use" + since);
+  statements.addFailures({"numPfail"}, Level::Look, "No program operation has failed.",
+                         "program operation", " failed.");
+  statements.addFailures({"numEfail"}, Level::Look, "No erase operation has failed.",
+                         "erase operation", " failed.");
+  statements.addFailures({"numDieFailures"}, Level::Act, "No die has failed.", "die failure",
+                         " counted.");
+  statements.addFailures({"raidFailedReconstructionHost", "FailedReconstructionNonGC"}, Level::Act,
+                         "Data that the system read has always been reconstructed.",
+                         "reconstruction", " of data that the system read failed.");
+  statements.addFailures({"raidFailedReconstructionInternal", "FailedReconstructionGC"}, Level::Act,
+                         "Data that was moved internally has always been reconstructed.",
+                         "reconstruction", " of data that was moved internally failed.");
+  statements.addFailures({"UncleanBoots", "uncleanBoots"}, Level::Plain,
+                         "No start followed an unclean shutdown.", "start",
+                         " followed an unclean shutdown.");
+}
+
+void addUse(Statements& statements) {
+  if (const auto full = statements.find({"HLT_OR_Diskfullness_BP"})) {
+    constexpr double kBasisPoints = 100;
+    const double share = full->value / kBasisPoints;
+    const auto capacity = statements.find({"HLT_OR_Capacity_GB"});
+    statements.add(share >= kFullnessToLookAt ? Level::Look : Level::Plain,
+                   "The storage" +
+                       (capacity ? " of " + numeral(capacity->value) + "\u202FGB" : "") + " is " +
+                       percentText(std::round(share)) + " full.",
+                   full->day);
+  }
+  if (const auto amplification = statements.find({"UserWamp"})) {
+    statements.add(
+        Level::Plain,
+        "The write amplification of the user partition is " + numeral(amplification->value) + ".",
+        amplification->day);
+  }
+  const auto written = statements.find({"hostWrites", "NumLogicalWrites", "HLT_hostWrites"});
+  const auto addGrowth = [&](Statements::Names names, const char* period) {
+    const auto growth = statements.find(names);
+    if (growth && written && written->value > 0) {
+      statements.add(Level::Plain,
+                     "Writing of the last " + std::string(period) + " is " +
+                         percentText(std::round(growth->value / written->value * 1e4) / 1e2) +
+                         " of all that the system has ever written.",
+                     growth->day);
+    }
+  };
+  addGrowth({"SM.Daily.hostWrites"}, "day");
+  addGrowth({"SM.WeeklyMA.hostWrites"}, "seven days");
+  addGrowth({"SM.Monthly.hostWrites"}, "thirty days");
+  if (const auto hours = statements.find({"powerOnHours", "PowerOnHours"})) {
+    statements.add(Level::Plain,
+                   "The storage has been powered for " + numeral(hours->value) + " hours.",
+                   hours->day);
+  }
+}
+
+}  // namespace
+
+std::vector<HealthStatement> storageHealth(const PageData& data) {
+  Statements statements(data);
+  addWear(statements);
+  addFaults(statements);
+  addUse(statements);
+  return std::move(statements.list);
+}
+
+}  // namespace vesprun
