@@ -106,12 +106,12 @@ TBConfig::TBConfig(PropertyValue document)
 void TBConfig::takeGroup(const WhitelistKeyGroup& group) {
   if (group.lists.dict() == nullptr) {
     logMessage(LogLevel::Error, "Whitelist group %s is not a dictionary and is skipped",
-               group.name.c_str());
+               group.name.data());
     return;
   }
   for (const std::string_view list : _tables.take(group)) {
     logMessage(LogLevel::Error, "Whitelist group %s: %s is not a dictionary and is skipped",
-               group.name.c_str(), list.data());
+               group.name.data(), list.data());
   }
 }
 

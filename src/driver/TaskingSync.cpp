@@ -1,15 +1,13 @@
 #include "driver/TaskingSync.h"
 
-#include <algorithm>
 #include <cstdint>
 #include <functional>
 #include <optional>
 #include <set>
 #include <string>
 #include <string_view>
-#include <unordered_map>
+#include <unordered_set>
 #include <utility>
-#include <vector>
 
 #include "common/PropertyDict.h"
 #include "common/TextForm.h"
@@ -123,6 +121,7 @@ void applyTasking(const OptionalValue& tasking, const OptionalValue& build, Doma
 
 /// The own domain last: it says what was applied.
 void synchronize(DomainSet changed) {
+  platform().systemConfiguration().synchronize();
   platform().servicesClient().synchronizeAllUsers();
   const bool own = changed.erase(std::string(kOwnDomain)) != 0;
   for (const std::string& domain : changed) {
@@ -168,22 +167,46 @@ void syncTasking(const OptionalValue& build) {
   platform().notificationCenter().PostNotification("com.quill.da.tasking_changed");
 }
 
-/// Equal for equal values (-0.0 and 0 too), and seldom for others.
-std::string bucketOf(const PropertyValue& value) {
+/// Equal for equal values (-0.0 and 0 too, whatever the kinds of numbers and the order of a
+/// dictionary's entries), and seldom for others.
+std::size_t hashOf(const PropertyValue& value) {
   if (const Number* number = value.number()) {
-    return std::to_string(number->asDouble() + 0.0);
+    return std::hash<double>{}(number->asDouble());
   }
-  return value.string() != nullptr ? *value.string() : "";
+  if (const std::string* text = value.string()) {
+    return hashOfText(*text);
+  }
+  if (const Bytes* data = value.data()) {
+    return hashOfText({reinterpret_cast<const char*>(data->data()), data->size()});
+  }
+  std::size_t hash = 0;
+  if (const PropertyArray* array = value.array()) {
+    for (const PropertyValue& element : *array) {
+      hash = hash * 31 + hashOf(element);
+    }
+  } else if (const PropertyDict* dict = value.dict()) {
+    for (const auto& [key, entry] : *dict) {
+      hash += key.hash() * (hashOf(entry) | 1);
+    }
+  } else {
+    hash = hashOfText(textForm(value));
+  }
+  return hash;
 }
 
 PropertyArray distinctEntries(const PropertyArray& entries) {
+  struct Hash {
+    std::size_t operator()(const PropertyValue* value) const { return hashOf(*value); }
+  };
+  struct Equal {
+    bool operator()(const PropertyValue* left, const PropertyValue* right) const {
+      return *left == *right;
+    }
+  };
+  std::unordered_set<const PropertyValue*, Hash, Equal> seen;
   PropertyArray distinct;
-  std::unordered_map<std::string, std::vector<const PropertyValue*>> buckets;
   for (const PropertyValue& entry : entries) {
-    std::vector<const PropertyValue*>& bucket = buckets[bucketOf(entry)];
-    if (std::none_of(bucket.begin(), bucket.end(),
-                     [&entry](const PropertyValue* other) { return *other == entry; })) {
-      bucket.push_back(&entry);
+    if (seen.insert(&entry).second) {
       distinct.push_back(entry);
     }
   }

@@ -22,12 +22,16 @@ class LGSSystemConfiguration {
                                                                        std::string_view domain,
                                                                        std::uint32_t options) = 0;
 
-  /// Sets a value, or removes the key when there is none. With `sync` the domain is durable when
-  /// this returns, else when it is next written or the process ends. A missing key is refused like
-  /// a bad domain.
+  /// Sets a value, or removes the key when there is none. With `sync` the next `synchronize` makes
+  /// the domain durable; else it is when it is next written or the process ends. A missing key is
+  /// refused like a bad domain.
   virtual void setPrefsKeyValueForDomainWithSync(std::optional<std::string_view> key,
                                                  std::optional<PropertyValue> value,
                                                  std::string_view domain, bool sync) = 0;
+
+  /// Writes each domain that was changed with `sync`, once however many its changes are. The system
+  /// log has what failed.
+  virtual void synchronize() = 0;
 
   /// Log types that are disabled unless the user's preferences say otherwise, in order.
   virtual PropertyArray getLogBlacklist() = 0;

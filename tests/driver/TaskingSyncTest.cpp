@@ -123,11 +123,12 @@ TEST(TaskingSync, RecordsThatNameNothingChangeNothing) {
 }
 
 TEST(TaskingSync, OSChangesAndDisabledLogsAreToldWithoutATasking) {
-  const std::string cases[][4] = {
-      {"{}", "(null)", "'103'", "['101', '102', '101']"},
-      {"{'LastOSUpdate': '2B'}", "(null)", "[]", "[]"},
-      {"{'LastOSUpdate': {'version': '1A', 'day': 5}}", "1A",
-       "['9', 9, '8', {'a': 1}, '9', true, 9.0, {'a': 1}]", "['9', 9, '8', {'a': 1}, true]"}};
+  const std::string cases[][4] = {{"{}", "(null)", "'103'", "['101', '102', '101']"},
+                                  {"{'LastOSUpdate': '2B'}", "(null)", "[]", "[]"},
+                                  {"{'LastOSUpdate': {'version': '1A', 'day': 5}}", "1A",
+                                   "['9', 9, '8', {'a': 1, 'b': [2]}, '9', true, 9.0, {'b': [2.0], "
+                                   "'a': 1.0}, [0], [-0.0], true]",
+                                   "['9', 9, '8', {'a': 1, 'b': [2]}, true, [0]]"}};
   for (const auto& [own, from, disabled, sent] : cases) {
     TaskingDevice device;
     device.store(kOwn, json(own));

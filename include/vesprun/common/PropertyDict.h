@@ -12,6 +12,7 @@
 #include <utility>
 #include <vector>
 
+#include "PropertyKey.h"
 #include "PropertyValue.h"
 
 namespace vesprun {
@@ -21,12 +22,11 @@ namespace vesprun {
 class PropertyDict {
   struct KeyHash {
     using is_transparent = void;
-    std::size_t operator()(std::string_view key) const {
-      return std::hash<std::string_view>{}(key);
-    }
+    std::size_t operator()(const PropertyKey& key) const { return key.hash(); }
+    std::size_t operator()(std::string_view key) const { return hashOfText(key); }
   };
-  using Entries = std::vector<std::pair<std::string, PropertyValue>>;
-  using Map = tsl::ordered_map<std::string, PropertyValue, KeyHash, std::equal_to<>,
+  using Entries = std::vector<std::pair<PropertyKey, PropertyValue>>;
+  using Map = tsl::ordered_map<PropertyKey, PropertyValue, KeyHash, std::equal_to<>,
                                Entries::allocator_type, Entries>;
 
  public:
@@ -70,20 +70,21 @@ class PropertyDict {
   const Bytes* findData(std::string_view key) const { return find(key, &PropertyValue::data); }
   const Date* findDate(std::string_view key) const { return find(key, &PropertyValue::date); }
 
-  void set(std::string_view key, PropertyValue value) {
+  void set(std::string_view key, PropertyValue value) { set(PropertyKey(key), std::move(value)); }
+  void set(PropertyKey key, PropertyValue value) {
     if (!_many) {
       if (const auto entry = findFew(key); entry != _few.end()) {
         _few[static_cast<std::size_t>(entry - _few.begin())].second = std::move(value);
         return;
       }
       if (_few.size() < kMostFew) {
-        _few.emplace_back(key, std::move(value));
+        _few.emplace_back(std::move(key), std::move(value));
         return;
       }
       makeMap(kMostFew + 1);
     }
-    // One search both finds out whether the key is new, as most are, and where it goes.
-    auto [entry, isNew] = _many->try_emplace(std::string(key), std::move(value));
+    // Most keys are new: one search finds that out and where they go.
+    auto [entry, isNew] = _many->try_emplace(std::move(key), std::move(value));
     if (!isNew) {
       entry.value() = std::move(value);  // which was not taken
     }

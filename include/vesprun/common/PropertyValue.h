@@ -9,6 +9,7 @@
 
 #include "Date.h"
 #include "Number.h"
+#include "PropertyKey.h"
 
 namespace vesprun {
 
@@ -31,6 +32,7 @@ class PropertyValue {
   PropertyValue(std::string text) : PropertyValue(Type::String, std::move(text)) {}
   PropertyValue(std::string_view text) : PropertyValue(std::string(text)) {}
   PropertyValue(const char* text) : PropertyValue(std::string(text)) {}
+  PropertyValue(const PropertyKey& text) : PropertyValue(std::string(text)) {}
   PropertyValue(Bytes data) : PropertyValue(Type::Data, std::move(data)) {}
   PropertyValue(Date date) : PropertyValue(Type::Date, date) {}
   PropertyValue(Number number) : _number(number), _type(Type::Number) {}

@@ -1,6 +1,5 @@
 #include "NANDInfo/parsers/GenericParserCxt.h"
 
-#include <algorithm>
 #include <array>
 #include <charconv>
 #include <limits>
@@ -9,19 +8,18 @@
 #include "common/LittleEndian.h"
 
 namespace vesprun {
-namespace {
-
-constexpr std::size_t kMostDigits = std::numeric_limits<std::size_t>::digits10 + 1;
-
-}  // namespace
-
 bool GenericParserCxt::append(std::string_view prefix, std::string_view suffix,
                               std::uint64_t value) noexcept {
   const std::size_t begin = _names.size();
   prefix = prefix.substr(0, kMaxNameLength);
+  suffix = suffix.substr(0, kMaxNameLength - prefix.size());
   try {
-    _names.append(prefix).append(suffix.substr(0, kMaxNameLength - prefix.size()));
-    _entries.push_back({_names.size(), value});
+    if (begin > std::numeric_limits<std::uint32_t>::max()) {
+      throw std::bad_alloc();
+    }
+    _names.append(prefix).append(suffix);
+    _entries.push_back({nullptr, static_cast<std::uint32_t>(_names.size() - begin),
+                        static_cast<std::uint32_t>(begin), value});
     return true;
   } catch (const std::bad_alloc&) {
     _names.resize(begin);
@@ -29,44 +27,20 @@ bool GenericParserCxt::append(std::string_view prefix, std::string_view suffix,
   }
 }
 
-bool GenericParserCxt::appendArray(std::string_view name, const std::uint8_t* source,
-                                   std::size_t width, std::size_t count) noexcept {
-  const std::size_t begin = _names.size();
-  const std::size_t first = _entries.size();
+bool GenericParserCxt::appendKnown(KnownNames names, const std::uint8_t* source, std::size_t width,
+                                   std::size_t count) noexcept {
   try {
-    appendAtOnce(name.substr(0, kMaxNameLength), source, width, count);
+    for (std::size_t i = 0; i < count; ++i) {
+      const KnownName name = names[i];
+      const std::uint8_t* const element = source + i * width;
+      _entries.push_back({name.text.data(), static_cast<std::uint32_t>(name.text.size()), name.hash,
+                          width == sizeof(std::uint64_t) ? loadLittleEndian<std::uint64_t>(element)
+                                                         : loadLittleEndian(element, width)});
+    }
     return true;
   } catch (const std::bad_alloc&) {
-    _names.resize(begin);
-    _entries.resize(first);
+    return false;
   }
-  std::array<char, kMostDigits> digits;
-  bool allAppended = true;
-  for (std::size_t i = 0; i < count; ++i) {
-    const char* const end = std::to_chars(digits.data(), digits.data() + digits.size(), i).ptr;
-    const std::uint64_t value = loadLittleEndian(source + i * width, width);
-    allAppended = append(name, {digits.data(), end}, value) && allAppended;
-  }
-  return allAppended;
-}
-
-void GenericParserCxt::appendAtOnce(std::string_view name, const std::uint8_t* source,
-                                    std::size_t width, std::size_t count) {
-  // A buffer has thousands of elements: room for all names of the array is made at once, and each
-  // is written where it stays.
-  std::size_t at = _names.size();
-  _names.resize(at + count * std::min(name.size() + kMostDigits, kMaxNameLength) + kMostDigits);
-  for (std::size_t i = 0; i < count; ++i) {
-    char* const begin = _names.data() + at;
-    char* const index = std::copy(name.begin(), name.end(), begin);
-    const char* const end = std::to_chars(index, index + kMostDigits, i).ptr;
-    at += std::min(static_cast<std::size_t>(end - begin), kMaxNameLength);
-    const std::uint8_t* const element = source + i * width;
-    _entries.push_back({at, width == sizeof(std::uint64_t)
-                                ? loadLittleEndian<std::uint64_t>(element)
-                                : loadLittleEndian(element, width)});
-  }
-  _names.resize(at);
 }
 
 bool AddSingleValueToGenericContext(GenericParserCxt& ctx, std::string_view prefix,
@@ -83,8 +57,18 @@ bool AddMultipleFieldsToGenericContext(GenericParserCxt& ctx, std::string_view n
   if (width > sizeof(std::uint64_t) || count > kMaxFieldsOfOneCall) {
     return false;
   }
-  return count == 1 ? AddSingleValueToGenericContext(ctx, "", name, loadLittleEndian(source, width))
-                    : ctx.appendArray(name, source, width, count);
+  if (count == 1) {
+    return ctx.append(name, loadLittleEndian(source, width));
+  }
+  bool allAppended = true;
+  for (std::uint32_t i = 0; i < count; ++i) {
+    std::array<char, std::numeric_limits<std::uint32_t>::digits10 + 1> digits;
+    const char* const end = std::to_chars(digits.data(), digits.data() + digits.size(), i).ptr;
+    allAppended =
+        ctx.append(name, {digits.data(), end}, loadLittleEndian(source + i * width, width)) &&
+        allAppended;
+  }
+  return allAppended;
 }
 
 void ReleaseGenericParserCxt(GenericParserCxt& ctx) { ctx.release(); }
@@ -93,7 +77,7 @@ PropertyDict CreateDictFromCxt(const GenericParserCxt& ctx) {
   PropertyDict dict;
   dict.reserve(ctx.size());
   for (const GenericParserCxt::Field field : ctx) {
-    dict.set(field.name, field.value);
+    dict.set(field.key(), field.value);
   }
   return dict;
 }

@@ -4,16 +4,19 @@
 #include <cstddef>
 #include <cstdint>
 #include <iterator>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
+#include "NANDInfo/parsers/KnownNames.h"
 #include "common/PropertyDict.h"
 
 namespace vesprun {
 
 /// The result of the statistics parsers: an ordered list of named unsigned 64-bit fields, possibly
-/// with repeated names. All names share one text, so that a field needs no allocation of its own.
+/// with repeated names. Names of known fields are referred to; all others share one text, so that a
+/// field needs no allocation of its own.
 class GenericParserCxt {
  public:
   static constexpr std::size_t kMaxNameLength = 98;  ///< longer names are cut
@@ -21,9 +24,13 @@ class GenericParserCxt {
   struct Field {
     std::string_view name;  ///< valid until the context is changed
     std::uint64_t value;
+    std::optional<std::uint32_t> knownHash;  ///< of a known name
 
     /// In decimal.
     std::string text() const { return std::to_string(value); }
+    PropertyKey key() const {
+      return knownHash ? PropertyKey::permanent(name, *knownHash) : PropertyKey(name);
+    }
   };
 
   /// In the order in which fields were appended.
@@ -57,9 +64,11 @@ class GenericParserCxt {
   bool empty() const { return _entries.empty(); }
   /// `index` is below `size()`.
   Field operator[](std::size_t index) const {
-    const std::size_t begin = index == 0 ? 0 : _entries[index - 1].nameEnd;
     const Entry& entry = _entries[index];
-    return {std::string_view(_names).substr(begin, entry.nameEnd - begin), entry.value};
+    if (entry.known != nullptr) {
+      return {{entry.known, entry.nameSize}, entry.value, entry.hashOrBegin};
+    }
+    return {std::string_view(_names).substr(entry.hashOrBegin, entry.nameSize), entry.value, {}};
   }
   const_iterator begin() const { return {*this, 0}; }
   const_iterator end() const { return {*this, size()}; }
@@ -70,22 +79,20 @@ class GenericParserCxt {
   bool append(std::string_view name, std::uint64_t value) noexcept {
     return append({}, name, value);
   }
-  /// Appends `count` fields, named `name` + index from 0: the little-endian values of `width`
-  /// bytes, 1 to 8, at `source`. False when memory ran out for some, which are missing.
-  bool appendArray(std::string_view name, const std::uint8_t* source, std::size_t width,
+  /// Appends `count` fields under these names: the little-endian values of `width` bytes, 1 to 8,
+  /// at `source`. False when memory ran out for some, which are missing.
+  bool appendKnown(KnownNames names, const std::uint8_t* source, std::size_t width,
                    std::size_t count) noexcept;
   /// Empties the context and frees its memory.
   void release() { *this = GenericParserCxt(); }
 
  private:
   struct Entry {
-    std::size_t nameEnd = 0;  ///< in `_names`; begins at the end of the one before
-    std::uint64_t value = 0;
+    const char* known;  ///< the name; null when it is in `_names`
+    std::uint32_t nameSize;
+    std::uint32_t hashOrBegin;  ///< of a known name its hash, else its place in `_names`
+    std::uint64_t value;
   };
-
-  /// May leave a part of the array behind when it throws.
-  void appendAtOnce(std::string_view name, const std::uint8_t* source, std::size_t width,
-                    std::size_t count);
 
   std::string _names;
   std::vector<Entry> _entries;
@@ -118,7 +125,7 @@ PropertyDict CreateDictFromCxt(const GenericParserCxt& ctx, const Filter& keeps)
   PropertyDict dict;
   for (const GenericParserCxt::Field field : ctx) {
     if (keeps(field.name)) {
-      dict.set(field.name, field.value);
+      dict.set(field.key(), field.value);
     }
   }
   return dict;

@@ -17,19 +17,14 @@ constexpr std::uint32_t kNoId = 0xFFFF;
 /// The number of fields taken; nothing ends the walk.
 using Taken = std::optional<std::uint32_t>;
 
-bool append(GenericParserCxt& ctx, std::string_view name, const std::uint8_t* payload,
-            std::uint32_t count) {
-  return AddMultipleFieldsToGenericContext(ctx, name, payload, StatisticsRecordReader::kWordSize,
-                                           count);
-}
-
 Taken takeUnknown(GenericParserCxt& ctx, const StatisticsRecordHeader& header,
                   const std::uint8_t* payload) {
   const int id = static_cast<int>(header.id);
   const int count = static_cast<int>(header.count);
   std::array<char, 32> name;
   std::snprintf(name.data(), name.size(), count > 1 ? "Stat_%d_" : "Stat_%d", id);
-  if (!append(ctx, name.data(), payload, header.count)) {
+  if (!AddMultipleFieldsToGenericContext(ctx, name.data(), payload,
+                                         StatisticsRecordReader::kWordSize, header.count)) {
     SetAPIErrorMessage("ORUFTLParseBufferToCxt %d: Cannot add %d elements to context", id, count);
     return std::nullopt;
   }
@@ -37,7 +32,7 @@ Taken takeUnknown(GenericParserCxt& ctx, const StatisticsRecordHeader& header,
 }
 
 Taken takeSingleValue(GenericParserCxt& ctx, const ORUStatKey& key, const std::uint8_t* payload) {
-  if (!append(ctx, key.name, payload, 1)) {
+  if (!ctx.appendKnown(FTLNamesOf(key), payload, StatisticsRecordReader::kWordSize, 1)) {
     SetAPIErrorMessage("ORUFTLParseBufferToCxt: %s(%d) cannot add 1 element to context",
                        key.name.data(), key.id);
   }
@@ -51,10 +46,11 @@ Taken takeArray(GenericParserCxt& ctx, const ORUStatKey& key, const StatisticsRe
                        key.name.data(), key.id, key.count, static_cast<int>(header.count));
   }
   const std::uint32_t count = std::min<std::uint32_t>(header.count, key.count);
-  std::array<char, GenericParserCxt::kMaxNameLength> name;
-  const std::size_t length = key.name.copy(name.data(), name.size() - 1);
-  name[length] = '_';
-  if (!append(ctx, {name.data(), length + 1}, payload, count)) {
+  const bool appended =
+      count == 1
+          ? ctx.append(key.name, "_", loadLittleEndian<std::uint64_t>(payload))
+          : ctx.appendKnown(FTLNamesOf(key), payload, StatisticsRecordReader::kWordSize, count);
+  if (!appended) {
     SetAPIErrorMessage("ORUFTLParseBufferToCxt: %s(%d): Cannot add %d elements to context",
                        key.name.data(), key.id, key.count);
     return std::nullopt;

@@ -153,7 +153,13 @@ static_assert(std::ranges::adjacent_find(ORUMSPKeyTable, std::ranges::greater_eq
                                          &ORUMSPKey::key) == ORUMSPKeyTable.end());
 static_assert(ORUMSPKeyTable.size() < kNoMSPRow);
 
+constexpr char kMSPSeparator[] = "";
+
 }  // namespace
+
+KnownNames MSPNamesOf(const ORUMSPKey& row) {
+  return KnownNamesOf<ORUMSPKeyTable, kMSPSeparator>::of(row);
+}
 
 const ORUMSPKey* findORUMSPKey(std::uint16_t key) {
   const std::uint32_t group = ORUMSPKey::groupOf(key);

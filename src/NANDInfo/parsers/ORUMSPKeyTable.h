@@ -5,6 +5,8 @@
 #include <cstdint>
 #include <string_view>
 
+#include "NANDInfo/parsers/KnownNames.h"
+
 namespace vesprun {
 
 /// A statistic of the MSP buffer. The top four bits of its key are its group, the others its index
@@ -29,5 +31,8 @@ extern const std::array<ORUMSPKey, kORUMSPKeyCount> ORUMSPKeyTable;
 
 /// The statistic with that key, or null. Takes constant time.
 const ORUMSPKey* findORUMSPKey(std::uint16_t key);
+
+/// The names of the elements of a row of the table.
+KnownNames MSPNamesOf(const ORUMSPKey& row);
 
 }  // namespace vesprun

@@ -33,15 +33,12 @@ void keepInSummary(ORUStatsContext& ctx, std::size_t id, std::uint64_t value) {
 void appendStatistic(ORUStatsContext& ctx, const ORUStatKey& key,
                      const StatisticsRecordReader& reader) {
   const std::size_t present = std::min<std::size_t>(key.count, reader.remaining());
-  if (!key.isArray()) {
-    if (present != 0) {
-      keepInSummary(ctx, key.id, reader.word(0));
-      AddSingleValueToGenericContext(ctx.fields, "", key.name, reader.word(0));
-    }
-    return;
-  }
   // A lone remaining element keeps its index, too.
-  ctx.fields.appendArray(key.name, reader.data(), StatisticsRecordReader::kWordSize, present);
+  ctx.fields.appendKnown(baseNamesOf(key), reader.data(), StatisticsRecordReader::kWordSize,
+                         present);
+  if (!key.isArray() && present != 0) {
+    keepInSummary(ctx, key.id, reader.word(0));
+  }
   if (key.id == kReadCountHisto) {
     for (std::size_t i = 0; i < present; ++i) {
       ctx.readCountHisto[i] = reader.word(i);

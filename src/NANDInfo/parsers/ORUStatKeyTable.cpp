@@ -291,7 +291,18 @@ static_assert(std::ranges::adjacent_find(ORUStatKeyTable, std::ranges::greater_e
                                          &ORUStatKey::id) == ORUStatKeyTable.end());
 static_assert(ORUStatKeyTable.back().id == kLargestKnownId);
 
+constexpr char kBaseSeparator[] = "";
+constexpr char kFTLSeparator[] = "_";
+
 }  // namespace
+
+KnownNames baseNamesOf(const ORUStatKey& row) {
+  return KnownNamesOf<ORUStatKeyTable, kBaseSeparator>::of(row);
+}
+
+KnownNames FTLNamesOf(const ORUStatKey& row) {
+  return KnownNamesOf<ORUStatKeyTable, kFTLSeparator>::of(row);
+}
 
 const ORUStatKey* findORUStatKey(std::uint32_t id) {
   const std::uint16_t row = id < kRowOfId.size() ? kRowOfId[id] : kNoRow;

@@ -5,6 +5,8 @@
 #include <cstdint>
 #include <string_view>
 
+#include "NANDInfo/parsers/KnownNames.h"
+
 namespace vesprun {
 
 /// A statistic that the storage controller exports in its base and FTL buffers.
@@ -23,5 +25,10 @@ extern const std::array<ORUStatKey, kORUStatKeyCount> ORUStatKeyTable;
 
 /// The statistic with that id, or null. Takes constant time.
 const ORUStatKey* findORUStatKey(std::uint32_t id);
+
+// The names of the elements of a row of the table, which in the FTL buffer have an underscore
+// before the index.
+KnownNames baseNamesOf(const ORUStatKey& row);
+KnownNames FTLNamesOf(const ORUStatKey& row);
 
 }  // namespace vesprun

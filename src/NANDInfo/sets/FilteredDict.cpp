@@ -2,14 +2,15 @@
 
 #include <algorithm>
 #include <array>
+#include <bit>
 #include <cmath>
 #include <cstddef>
 
 namespace vesprun {
 namespace {
 
-constexpr std::array<std::uint64_t, 19> kPowersOfTen = [] {
-  std::array<std::uint64_t, 19> powers{};
+constexpr std::array<std::uint64_t, 20> kPowersOfTen = [] {
+  std::array<std::uint64_t, 20> powers{};
   std::uint64_t power = 1;
   for (std::uint64_t& entry : powers) {
     entry = power;
@@ -18,18 +19,33 @@ constexpr std::array<std::uint64_t, 19> kPowersOfTen = [] {
   return powers;
 }();
 
+constexpr std::uint64_t kMostCutDigits = 18;
+
+/// The whole part of the base-ten logarithm in double precision, and one. The two ways can only
+/// differ near a power of ten; elsewhere digits are counted, which takes less time.
+std::uint64_t digitsOf(std::uint64_t x) {
+  const auto least =
+      static_cast<std::size_t>(std::bit_width(x)) * 1233 >> 12;  // 1233/4096: log10(2)
+  const std::size_t digits = least + (x >= kPowersOfTen[least] ? 1 : 0);
+  const std::uint64_t near = x >> 40;
+  const bool belowNext = digits == kPowersOfTen.size() || x + near < kPowersOfTen[digits];
+  return belowNext && x - near > kPowersOfTen[digits - 1]
+             ? digits
+             : static_cast<std::uint64_t>(std::log10(static_cast<double>(x))) + 1;
+}
+
 }  // namespace
 
 std::uint64_t roundSig(std::uint64_t x, std::uint64_t sig) {
   if (x == 0) {
     return 0;
   }
-  const auto digits = static_cast<std::uint64_t>(std::log10(static_cast<double>(x))) + 1;
+  const std::uint64_t digits = digitsOf(x);
   if (digits <= sig) {
     return x;
   }
   const std::uint64_t cut = digits - sig;
-  if (cut >= kPowersOfTen.size()) {
+  if (cut > kMostCutDigits) {
     return 0;
   }
   const std::uint64_t power = kPowersOfTen[static_cast<std::size_t>(cut)];

@@ -4,11 +4,9 @@
 #include <charconv>
 #include <cstddef>
 #include <cstdint>
-#include <cstring>
 #include <limits>
 #include <string>
 #include <string_view>
-#include <type_traits>
 
 namespace vesprun {
 
@@ -47,27 +45,6 @@ inline void assignFieldName(std::string& name, std::string_view stem, std::uint3
     const auto [end, error] = std::to_chars(digits.data(), digits.data() + digits.size(), number);
     name.append(digits.data(), end);
   }
-}
-
-/// Equal at compile time and at run time. Takes eight bytes at a time: names are long and looked up
-/// by the thousand.
-constexpr std::size_t hashOfStem(std::string_view stem) {
-  std::uint64_t hash = stem.size();
-  while (!stem.empty()) {
-    const std::size_t length = stem.size() < 8 ? stem.size() : 8;
-    std::uint64_t word = 0;
-    if (length == 8 && !std::is_constant_evaluated()) {
-      std::memcpy(&word, stem.data(), 8);
-    } else {
-      for (std::size_t i = 0; i < length; ++i) {
-        word |= std::uint64_t{static_cast<unsigned char>(stem[i])} << (8 * i);
-      }
-    }
-    hash = (hash ^ word) * 0x9E3779B97F4A7C15U;
-    hash ^= hash >> 32;
-    stem.remove_prefix(length);
-  }
-  return static_cast<std::size_t>(hash);
 }
 
 }  // namespace vesprun

@@ -9,6 +9,7 @@
 #include <string_view>
 
 #include "NANDInfo/tables/FieldName.h"
+#include "common/PropertyKey.h"
 
 namespace vesprun {
 
@@ -53,7 +54,7 @@ struct FieldIndex {
   explicit consteval FieldIndex(const std::array<FieldRange, RangeCount>& ranges) {
     for (std::size_t i = 0; i < RangeCount; ++i) {
       fieldCount += ranges[i].size();
-      std::uint16_t* link = &slots[hashOfStem(ranges[i].stem) % slots.size()];
+      std::uint16_t* link = &slots[hashOfText(ranges[i].stem) % slots.size()];
       while (*link != 0 && ranges[*link - 1].stem != ranges[i].stem) {
         link = link == &slots.back() ? &slots.front() : link + 1;
       }
@@ -110,7 +111,7 @@ class FieldTable {
 
 inline const FieldRange* FieldTable::find(const FieldName& name) const {
   const std::size_t mask = _slots.size() - 1;
-  std::size_t slot = hashOfStem(name.stem) & mask;
+  std::size_t slot = hashOfText(name.stem) & mask;
   while (_slots[slot] != 0 && _ranges[_slots[slot] - 1U].stem != name.stem) {
     slot = (slot + 1) & mask;
   }

@@ -2,6 +2,7 @@
 
 #include <functional>
 #include <map>
+#include <set>
 #include <string>
 #include <utility>
 
@@ -58,6 +59,11 @@ class HostSystemConfiguration final : public LGSSystemConfiguration {
                                          std::string_view domain, bool sync) override {
     _values.LGSPreferencesSetValue(key, std::move(value), domain);
     if (sync) {
+      _changed.emplace(domain);
+    }
+  }
+  void synchronize() override {
+    for (const std::string& domain : std::exchange(_changed, {})) {
       _values.LGSPreferencesSynchronize(domain);
     }
   }
@@ -66,6 +72,7 @@ class HostSystemConfiguration final : public LGSSystemConfiguration {
  private:
   const DeviceDescription& _description;
   HostPreferences _values;
+  std::set<std::string, std::less<>> _changed;  ///< domains to be written
 };
 
 /// One more domain among the mobile user's preferences.

@@ -1,0 +1,119 @@
+#pragma once
+
+#include <array>
+#include <cstddef>
+#include <cstdint>
+#include <string_view>
+
+#include "common/PropertyKey.h"
+
+namespace vesprun {
+
+/// The name of a known field. It lives as long as the program, with a zero byte behind it.
+struct KnownName {
+  std::string_view text;
+  std::uint32_t hash;  ///< `hashOfText` of it
+};
+
+/// The names of one statistic's elements.
+class KnownNames {
+ public:
+  // By number, not by address: nothing of a table changes when a program starts.
+  struct Place {
+    std::uint32_t begin = 0;
+    std::uint32_t size = 0;
+    std::uint32_t hash = 0;
+  };
+
+  constexpr KnownNames(const char* text, const Place* places) : _text(text), _places(places) {}
+  KnownName operator[](std::size_t element) const {
+    const Place& place = _places[element];
+    return {{_text + place.begin, place.size}, place.hash};
+  }
+
+ private:
+  const char* _text;
+  const Place* _places;
+};
+
+/// The names of all elements of all statistics in `kTable`, laid out when it is compiled: that of a
+/// single value is the statistic's, that of an array's element has `kSeparator` and the index
+/// behind it.
+template <const auto& kTable, const char* kSeparator>
+class KnownNamesOf {
+ public:
+  using Row = typename std::decay_t<decltype(kTable)>::value_type;
+
+  /// Of a row of the table.
+  static KnownNames of(const Row& row) {
+    const auto index = static_cast<std::size_t>(&row - kTable.data());
+    return {kLayout.text.data(), &kLayout.places[kLayout.firstOfRow[index]]};
+  }
+
+ private:
+  /// Calls `visit(row, name)` for each.
+  template <typename Visit>
+  static constexpr void forEach(Visit visit) {
+    std::array<char, 128> name{};
+    for (std::size_t row = 0; row < kTable.size(); ++row) {
+      for (std::size_t element = 0; element < kTable[row].count; ++element) {
+        char* end = name.data();
+        const auto append = [&end](std::string_view text) {
+          for (const char character : text) {
+            *end++ = character;
+          }
+        };
+        append(kTable[row].name);
+        if (kTable[row].count > 1) {
+          append(kSeparator);
+          for (std::size_t power = element < 10    ? 1
+                                   : element < 100 ? 10
+                                                   : 100;
+               power != 0; power /= 10) {
+            *end++ = static_cast<char>('0' + element / power % 10);
+          }
+        }
+        visit(row, std::string_view(name.data(), end));
+      }
+    }
+  }
+
+  static constexpr auto kSizes = [] {
+    struct Sizes {
+      std::size_t names = 0;
+      std::size_t characters = 0;
+    } sizes;
+    forEach([&sizes](std::size_t, std::string_view name) {
+      ++sizes.names;
+      sizes.characters += name.size() + 1;
+    });
+    return sizes;
+  }();
+
+  struct Layout {
+    std::array<char, kSizes.characters> text{};
+    std::array<KnownNames::Place, kSizes.names> places{};
+    std::array<std::uint16_t, kTable.size()> firstOfRow{};
+  };
+
+  static constexpr Layout kLayout = [] {
+    Layout layout;
+    std::uint16_t names = 0;
+    std::uint32_t begin = 0;
+    std::size_t lastRow = kTable.size();
+    forEach([&](std::size_t row, std::string_view name) {
+      if (row != lastRow) {
+        layout.firstOfRow[row] = names;
+        lastRow = row;
+      }
+      layout.places[names++] = {begin, static_cast<std::uint32_t>(name.size()), hashOfText(name)};
+      for (const char character : name) {
+        layout.text[begin++] = character;
+      }
+      ++begin;  // the zero byte
+    });
+    return layout;
+  }();
+};
+
+}  // namespace vesprun
