@@ -14,6 +14,11 @@ if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
     -Wno-maybe-uninitialized)
 endif()
 
+if(CMAKE_CXX_COMPILER_ID MATCHES Clang)
+  # The tables of field names are laid out at compile time.
+  target_compile_options(vesprun_options INTERFACE -fconstexpr-steps=100000000)
+endif()
+
 if(VESPRUN_SANITIZERS)
   # Without vptr: clang's check opens a file descriptor, and fails in tests that leave none.
   target_compile_options(vesprun_options INTERFACE

@@ -17,7 +17,7 @@ struct WhitelistKeyGroup {
   /// True for the group that counts on internal devices alone.
   bool isForInternalDevices() const { return name == "InternalTesting"; }
 
-  std::string_view name;  ///< a key of the document, with its zero byte behind it
+  std::string_view name;       ///< a key of the document, with its zero byte behind it
   const PropertyValue& lists;  ///< skipped unless it is a dictionary
 };
 

@@ -98,7 +98,7 @@ TEST_F(DailyLogTest, HasTheKeysThatItComputesItself) {
   const PropertyDict document = device->documents().at(0);
   std::vector<std::string> keys;
   for (const auto& [key, value] : *document.find("TBScalars")->dict()) {
-    keys.push_back(key);
+    keys.emplace_back(key);
   }
   EXPECT_THAT(
       keys,

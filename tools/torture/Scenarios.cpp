@@ -55,7 +55,7 @@ std::set<std::string> keysOf(const std::string& document) {
     for (const auto& [name, part] : *value->dict()) {
       if (part.dict() != nullptr) {
         for (const auto& [key, ignored] : *part.dict()) {
-          keys.insert(key);
+          keys.emplace(key);
         }
       }
     }

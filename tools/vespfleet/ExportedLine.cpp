@@ -37,7 +37,7 @@ const std::string& text(const PropertyValue& value, const char* why) {
   return found;
 }
 
-const std::string& key(const std::string& name) {
+std::string_view key(std::string_view name) {
   require(!name.empty(), "an empty key");
   require(isXmlText(name), "a text that XML cannot carry");
   return name;
@@ -78,7 +78,7 @@ Histogram readHistogram(const PropertyDict& counts) {
   Histogram histogram;
   for (const auto& [label, value] : counts) {
     require(isXmlText(label), "a text that XML cannot carry");
-    histogram[label] = static_cast<std::uint64_t>(count(value));
+    histogram[std::string(label)] = static_cast<std::uint64_t>(count(value));
   }
   return histogram;
 }
@@ -100,8 +100,8 @@ ExportedLine readLine(const PropertyDict& line) {
   const PropertyDict& scalars = as(entry(line, "scalars").dict(), "scalars that are no object");
   read.scalars.reserve(scalars.size());
   for (const auto& [name, value] : scalars) {
-    read.scalars.push_back(
-        {key(name), integer(value, INT64_MIN, INT64_MAX, "a scalar that is no 64-bit integer")});
+    read.scalars.push_back({std::string(key(name)), integer(value, INT64_MIN, INT64_MAX,
+                                                            "a scalar that is no 64-bit integer")});
   }
   const PropertyDict& distributions =
       as(entry(line, "distributions").dict(), "distributions that are no object");
@@ -112,7 +112,7 @@ ExportedLine readLine(const PropertyDict& line) {
     histogramOf[key(name)] = readHistogram(as(value.dict(), "a histogram that is no object"));
   }
   for (const auto& [name, value] : distributions) {
-    ReportedDistribution distribution{key(name), {}};
+    ReportedDistribution distribution{std::string(key(name)), {}};
     if (readStatistics(value, distribution.values.statistics)) {
       if (const auto found = histogramOf.find(name); found != histogramOf.end()) {
         distribution.values.histogram = std::move(found->second);

@@ -60,9 +60,8 @@ class PropertyKey : public std::string_view {
     }
   }
 
-  operator std::string() const {  // NOLINT(google-explicit-constructor): to its readers, a text
-    return {data(), size()};
-  }
+  // Explicit: a `const std::string&` to a copy that nobody holds is easily kept too long.
+  explicit operator std::string() const { return {data(), size()}; }
   const char* c_str() const { return empty() ? "" : data(); }
   std::string substr(std::size_t begin, std::size_t count = npos) const {
     return std::string(std::string_view::substr(begin, count));

@@ -83,7 +83,7 @@ TEST_F(EventExtractionTest, AllStepsSendTheirEvents) {
     std::size_t own = 0;
     std::string others;
     for (const auto& [key, value] : payload(i)) {
-      const bool isOwn = isFieldOf(kPrefix + kAllEvents[i], key);
+      const bool isOwn = isFieldOf(kPrefix + kAllEvents[i], std::string(key));
       own += isOwn ? 1 : 0;
       others += isOwn ? "" : key + ' ';
     }

@@ -33,7 +33,7 @@ constexpr FieldTable kListed(kListedRanges, kListedIndex);
 std::vector<std::string> keysOf(const PropertyDict& dict) {
   std::vector<std::string> keys;
   for (const auto& [key, value] : dict) {
-    keys.push_back(key);
+    keys.emplace_back(key);
   }
   return keys;
 }

@@ -37,7 +37,7 @@ std::optional<Bytes> uuidBytes(std::string_view text) {
 }
 
 /// The value for the message; nothing, with the expectation in `wanted`, for a wrong one.
-std::optional<PropertyValue> messageValue(const std::string& name, const PropertyValue& value,
+std::optional<PropertyValue> messageValue(std::string_view name, const PropertyValue& value,
                                           std::string& wanted) {
   if (name == "bundle_id" || name == "version") {
     wanted = "not a string";

@@ -128,7 +128,7 @@ class WhitelistCheck {
     }
     if (written != nullptr) {
       for (const auto& [name, value] : *written) {
-        judgeOption(Options(), name, value);
+        judgeOption(Options(), std::string(name), value);
       }
     }
     if (options && hasFallingIntervals(*options)) {

@@ -44,16 +44,16 @@ class Entry {
   }
   const std::string& text() const { return as(&PropertyValue::string, "not a string"); }
 
-  Entry at(const std::string& name) const { return at(name, *dict().find(name)); }
-  Entry at(const std::string& name, const PropertyValue& value) const {
-    return {value, _path.empty() ? name : _path + '.' + name};
+  Entry at(std::string_view name) const { return at(name, *dict().find(name)); }
+  Entry at(std::string_view name, const PropertyValue& value) const {
+    return {value, (_path.empty() ? "" : _path + '.').append(name)};
   }
 
   /// Calls `work` for each entry of a dictionary with free names.
   template <typename Work>
   void forEachNamed(Work work) const {
     for (const auto& [name, value] : dict()) {
-      work(name, at(name, value));
+      work(std::string(name), at(name, value));
     }
   }
 

@@ -315,7 +315,7 @@ void replay(const PropertyValue& plain, ValueBuilder& builder) {
   if (const PropertyDict* dict = plain.dict()) {
     builder.start_object(dict->size());
     for (const auto& [name, content] : *dict) {
-      std::string copy = name;
+      std::string copy(name);
       builder.key(copy);
       replay(content, builder);
     }
