@@ -17,9 +17,10 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* bytes, std::size_t siz
   require(ORUParseBufferToCxt(ctx, buffer.span()) == result, "a parse gives the same result again");
   require(ctx.fields.size() == 2 * count, "a parse appends the same fields again");
   for (std::size_t i = 0; i < count; ++i) {
-    const auto [name, value] = ctx.fields[i];
-    require(!name.empty() && name == ctx.fields[count + i].name, "names are the same again");
-    require(value == ctx.fields[count + i].value, "values are the same again");
+    const GenericParserCxt::Field first = ctx.fields[i];
+    const GenericParserCxt::Field second = ctx.fields[count + i];
+    require(!first.name.empty() && first.name == second.name, "names are the same again");
+    require(first.value == second.value, "values are the same again");
   }
   ORUReleaseContext(ctx);
   require(ctx.fields.empty() && ctx.driverVersion == 0, "a released context is empty");
