@@ -32,7 +32,7 @@ void runTasks(std::int32_t day, const AppInfoList* appInfo) {
       TBReport().writeLogForYesterdayWithAppInfo(day, appInfo);
     }
   });
-  runGuarded(LogDailyStorageAndDeviceStats);
+  LogDailyStorageAndDeviceStats();  // guards its own steps
   runGuarded([] { platform().logsmith().FLDumpAllOldStructuredDataLogs(); });
   runGuarded(syncTaskingAndOSChange);
   runGuarded([] { platform().logsmith().rollTendmarkLogs(); });
