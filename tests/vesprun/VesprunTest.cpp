@@ -36,6 +36,9 @@ class Process {
     device.write("device.json", description);
     _child = fork();
     if (_child == 0) {
+      if (description == kDescription) {
+        close(STDERR_FILENO);  // the system log takes its number, but not what is printed
+      }
       if (chdir(device.path().c_str()) == 0) {
         execl(VESPRUN_PROGRAM, "vesprun", argument, nullptr);
       }
