@@ -1,8 +1,7 @@
 #include "NANDInfo/controller/TunnelCommand.h"
-#include "common/ProcessState.h"
-
 
 #include "NANDInfo/parsers/APIErrorMessage.h"
+#include "common/ProcessState.h"
 #include "support/ControllerTest.h"
 #include "support/WatchedRegistry.h"
 
