@@ -56,7 +56,7 @@ void takeActiveAppInfo(const PropertyDict& message) {
 
 void requestActiveAppInfo() {
   aaiRequested = true;
-  platform().notificationCenter().PostNotification(kLoggingNotification);
+  platform().eventHub().PostNotification(kLoggingNotification);
   logMessage(LogLevel::Default, "notified of logging status, waiting for activate app info");
 }
 

@@ -8,6 +8,17 @@
 
 namespace vesprun {
 
+/// The event loop of the main thread.
+class MainLoop {
+ public:
+  enum class SliceResult { HandledEvent, TimedOut };
+
+  virtual ~MainLoop() = default;
+
+  /// Waits for one event (a delivered message), `seconds` at most.
+  virtual SliceResult runMainLoopSlice(double seconds) = 0;
+};
+
 /// A peer of a named message service. Messages arrive on the main thread while the main loop runs.
 class PeerConnection {
  public:

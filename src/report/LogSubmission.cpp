@@ -4,7 +4,6 @@
 
 #include "common/TextForm.h"
 #include "platform/Platform.h"
-#include "platform/PreferenceNames.h"
 
 namespace vesprun {
 namespace {

@@ -11,11 +11,12 @@
 #include "platform/host/preferences/HostPreferences.h"
 #include "platform/host/preferences/PreferenceServices.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
-#include "platform/host/services/ForwardingServices.h"
+#include "platform/host/services/FileServices.h"
 #include "platform/host/services/HostClock.h"
+#include "platform/host/services/HostDeviceInformation.h"
 #include "platform/host/services/HostKernel.h"
-#include "platform/host/services/HostLanguages.h"
 #include "platform/host/services/HostMurmur.h"
+#include "platform/host/services/HostOutbox.h"
 #include "platform/host/services/HostSystemLog.h"
 #include "platform/host/services/HostTapline.h"
 
@@ -37,62 +38,41 @@ struct HostPlatform::Services {
   HostClock clock{description.clock};
   HostSystemLog logFile{directory, clock, description.logLevel};
   SystemLog& systemLog;
-  Outbox outbox{directory, clock, systemLog};
-  HostDailyWorkLock dailyWorkLock{directory,
-                                  systemLog};  // freed when what follows has been written
+  HostFileSystem fileSystem{directory, description.userVolume,
+                            systemLog};  // unlocked when what follows has been written
+  HostOutbox outbox{directory, description, clock, systemLog};
   HostPreferences preferences{directory, clock, systemLog};
   HostTallybook tallybook{directory, clock, preferences, systemLog};
+  HostDeviceInformation deviceInformation{description, directory};
   HostDeviceRegistry deviceRegistry{description.registry, directory, systemLog};
-  HostDiagnosticHeader diagnosticHeader{description.system};
-  HostEventHub eventHub{description.events, outbox};
-  HostFileSystem fileSystem{directory, description.userVolume, systemLog};
-  HostInstalledApplications installedApplications{description};
   HostKernel kernel{description.kernel, directory, systemLog};
-  HostLanguages languages{description.languages};
-  HostLogsmith logsmith{description, outbox};
-  HostMessageDigest messageDigest;
-  HostNotificationCenter notificationCenter{outbox};
-  HostOrrery orrery{description.properties, directory};
-  HostProcessInformation processInformation;
   HostPtreeSerialization ptreeSerialization;
-  HostReclaimer reclaimer{description};
   HostServicesClient servicesClient{directory, clock, systemLog};
-  HostSupportLibrary supportLibrary{description.supportLibrary};
   HostSystemConfiguration systemConfiguration{description, directory, clock, systemLog};
-  HostUserDefaults userDefaults{preferences};
   HostMainLoop mainLoop;
-  HostMessageService messageService{directory, ptreeSerialization, systemLog, mainLoop};
+  HostMessageService messageService{directory, systemLog, mainLoop};
   HostTapline tapline{description};
   HostMurmur murmur{description.usage, systemLog};  // last: a reply may use all of the above
 };
 
 HostPlatform::HostPlatform(std::unique_ptr<Services> services)
     : Platform{services->clock,
-               services->dailyWorkLock,
-               services->deviceRegistry,
-               services->diagnosticHeader,
-               services->eventHub,
                services->fileSystem,
-               services->installedApplications,
+               services->deviceInformation,
+               services->deviceRegistry,
+               services->outbox,
+               services->fileSystem,
                services->kernel,
-               services->languages,
-               services->logsmith,
+               services->outbox,
                services->mainLoop,
-               services->messageDigest,
                services->messageService,
                services->murmur,
-               services->notificationCenter,
-               services->orrery,
                services->preferences,
-               services->processInformation,
                services->ptreeSerialization,
-               services->reclaimer,
                services->servicesClient,
-               services->supportLibrary,
                services->systemConfiguration,
                services->systemLog,
                services->tallybook,
-               services->userDefaults,
                services->tapline},
       _services(std::move(services)) {}
 

@@ -77,7 +77,7 @@ TEST(HostKernel, ReadsOnlyVariablesOfTheAskedWidth) {
 
 TEST(HostLanguages, MatchesTheNearestLocalization) {
   TestDevice device;
-  Languages& languages = device.platform().languages();
+  DeviceInformation& languages = device.platform().deviceInformation();
   const std::vector<std::string> available{"en", "en-US", "pt-BR", "zh-Hans", "fr"};
   using Tags = std::vector<std::string>;
   EXPECT_EQ(languages.bestLocalizations(available, {"en-GB", "fr", "en"}), (Tags{"en", "fr"}));
@@ -236,7 +236,7 @@ TEST(HostMurmur, OutlivesAHandlerThatThrows) {
 
 TEST(DiagnosticHeader, IsLiveWhenItIsNotDescribed) {
   TestDevice device;
-  DiagnosticHeader& header = device.platform().diagnosticHeader();
+  DeviceInformation& header = device.platform().deviceInformation();
   EXPECT_NE(header.GetHardwareModel(), "");
   EXPECT_NE(header.GetSystemVersion(), "");
   EXPECT_EQ(header.GetIncidentID().size(), 36U);

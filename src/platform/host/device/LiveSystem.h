@@ -7,6 +7,16 @@
 
 #include "platform/host/device/DeviceDescription.h"
 
+namespace vesprun {
+
+/// What the description says, or else the live answer.
+template <typename T, typename Live>
+T describedOr(const std::optional<T>& described, Live live) {
+  return described ? *described : live();
+}
+
+}  // namespace vesprun
+
 /// The running Linux system's answers where a device description is silent.
 namespace vesprun::live {
 

@@ -4,7 +4,7 @@
 #include <functional>
 #include <map>
 
-#include "platform/MainLoop.h"
+#include "platform/MessageService.h"
 
 namespace vesprun {
 

@@ -10,6 +10,7 @@
 #include <map>
 #include <utility>
 
+#include "platform/host/documents/PtreeReader.h"
 #include "platform/host/messages/MessageFraming.h"
 #include "platform/host/messages/ServiceSocket.h"
 
@@ -42,13 +43,9 @@ struct UnixPeer final : PeerConnection {
 
 class UnixServiceListener final : public ServiceListener {
  public:
-  UnixServiceListener(ServiceSocket socket, std::string name, PtreeSerialization& serialization,
-                      SystemLog& log, HostMainLoop& mainLoop)
-      : _socket(std::move(socket)),
-        _name(std::move(name)),
-        _serialization(serialization),
-        _log(log),
-        _mainLoop(mainLoop) {}
+  UnixServiceListener(ServiceSocket socket, std::string name, SystemLog& log,
+                      HostMainLoop& mainLoop)
+      : _socket(std::move(socket)), _name(std::move(name)), _log(log), _mainLoop(mainLoop) {}
 
   ~UnixServiceListener() override {
     _mainLoop.unwatch(_socket.descriptor());
@@ -138,7 +135,7 @@ class UnixServiceListener final : public ServiceListener {
     MessageAssembler::Progress progress = assembler.take(bytes);
     for (; progress == MessageAssembler::Progress::Complete; progress = assembler.take(bytes)) {
       std::string error;
-      std::optional<PropertyValue> message = _serialization.parse(assembler.takeDocument(), error);
+      std::optional<PropertyValue> message = readPtree(assembler.takeDocument(), error);
       if (!message) {
         drop(*peer, error);
         return;
@@ -171,7 +168,6 @@ class UnixServiceListener final : public ServiceListener {
 
   ServiceSocket _socket;
   std::string _name;
-  PtreeSerialization& _serialization;
   SystemLog& _log;
   HostMainLoop& _mainLoop;
   PeerHandler _handler;
@@ -190,8 +186,8 @@ std::unique_ptr<ServiceListener> HostMessageService::createListener(std::string_
     _log.write(LogLevel::Error, error);
     return nullptr;
   }
-  return std::make_unique<UnixServiceListener>(*std::move(socket), std::string(name),
-                                               _serialization, _log, _mainLoop);
+  return std::make_unique<UnixServiceListener>(*std::move(socket), std::string(name), _log,
+                                               _mainLoop);
 }
 
 }  // namespace vesprun

@@ -1,7 +1,6 @@
 #pragma once
 
 #include "platform/MessageService.h"
-#include "platform/PtreeSerialization.h"
 #include "platform/SystemLog.h"
 #include "platform/host/device/DeviceDirectory.h"
 #include "platform/host/messages/HostMainLoop.h"
@@ -20,16 +19,14 @@ namespace vesprun {
 /// Listeners must not outlive the references, nor be destroyed by one of their own handlers.
 class HostMessageService final : public MessageService {
  public:
-  HostMessageService(const DeviceDirectory& directory, PtreeSerialization& serialization,
-                     SystemLog& log, HostMainLoop& mainLoop)
-      : _directory(directory), _serialization(serialization), _log(log), _mainLoop(mainLoop) {}
+  HostMessageService(const DeviceDirectory& directory, SystemLog& log, HostMainLoop& mainLoop)
+      : _directory(directory), _log(log), _mainLoop(mainLoop) {}
 
   /// One at a time for a device: see `ServiceSocket`.
   std::unique_ptr<ServiceListener> createListener(std::string_view name) override;
 
  private:
   const DeviceDirectory& _directory;
-  PtreeSerialization& _serialization;
   SystemLog& _log;
   HostMainLoop& _mainLoop;
 };

@@ -6,7 +6,6 @@
 #include "platform/host/messages/HostMessageService.h"
 #include "platform/host/messages/MessageFraming.h"
 #include "platform/host/messages/ServiceSocket.h"
-#include "platform/host/services/ForwardingServices.h"
 #include "support/HostServiceTest.h"
 
 namespace vesprun {
@@ -68,9 +67,8 @@ class MessageServiceTest : public HostServiceTest {
     return events;
   }
 
-  HostPtreeSerialization serialization;
   HostMainLoop loop;
-  HostMessageService service{device, serialization, log, loop};
+  HostMessageService service{device, log, loop};
   std::vector<std::string> received;
 };
 
