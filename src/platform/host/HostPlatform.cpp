@@ -5,7 +5,7 @@
 
 #include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/QuotedText.h"
-#include "platform/host/files/WholeFile.h"
+#include "platform/host/files/Files.h"
 #include "platform/host/messages/HostMainLoop.h"
 #include "platform/host/messages/HostMessageService.h"
 #include "platform/host/preferences/HostPreferences.h"
@@ -38,21 +38,21 @@ struct HostPlatform::Services {
   HostClock clock{description.clock};
   HostSystemLog logFile{directory, clock, description.logLevel};
   SystemLog& systemLog;
-  HostFileSystem fileSystem{directory, description.userVolume,
+  HostFileSystem fileSystem{directory, description,
                             systemLog};  // unlocked when what follows has been written
   HostOutbox outbox{directory, description, clock, systemLog};
   HostPreferences preferences{directory, clock, systemLog};
   HostTallybook tallybook{directory, clock, preferences, systemLog};
   HostDeviceInformation deviceInformation{description, directory};
   HostDeviceRegistry deviceRegistry{description.registry, directory, systemLog};
-  HostKernel kernel{description.kernel, directory, systemLog};
+  HostKernel kernel{description, directory, systemLog};
   HostPtreeSerialization ptreeSerialization;
   HostServicesClient servicesClient{directory, clock, systemLog};
   HostSystemConfiguration systemConfiguration{description, directory, clock, systemLog};
   HostMainLoop mainLoop;
   HostMessageService messageService{directory, systemLog, mainLoop};
   HostTapline tapline{description};
-  HostMurmur murmur{description.usage, systemLog};  // last: a reply may use all of the above
+  HostMurmur murmur{description, systemLog};  // last: a reply may use all of the above
 };
 
 HostPlatform::HostPlatform(std::unique_ptr<Services> services)

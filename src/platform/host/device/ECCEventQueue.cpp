@@ -12,8 +12,7 @@
 #include <utility>
 #include <vector>
 
-#include "platform/host/files/FolderNames.h"
-#include "platform/host/files/SystemError.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 

@@ -6,7 +6,7 @@
 
 #include "platform/SystemLog.h"
 #include "platform/host/device/DeviceDirectory.h"
-#include "platform/host/files/FileDescriptor.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 

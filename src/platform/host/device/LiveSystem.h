@@ -7,16 +7,6 @@
 
 #include "platform/host/device/DeviceDescription.h"
 
-namespace vesprun {
-
-/// What the description says, or else the live answer.
-template <typename T, typename Live>
-T describedOr(const std::optional<T>& described, Live live) {
-  return described ? *described : live();
-}
-
-}  // namespace vesprun
-
 /// The running Linux system's answers where a device description is silent.
 namespace vesprun::live {
 
@@ -26,10 +16,10 @@ std::string osVersion();  ///< as /etc/os-release names it, for example "Debian 
 std::string osBuild();
 
 /// "vm.swapusage": total, free and used bytes (u64), page size and a flag (u32).
-std::optional<Bytes> swapUsage();
+std::optional<KernelVariable> swapUsage();
 
-/// In upper case.
-std::optional<std::string> bootSessionIdentifier();
+/// "kern.bootsessionuuid", in upper case.
+std::optional<KernelVariable> bootSessionIdentifier();
 
 std::string machineIdentifier();  ///< empty when there is none
 std::string hardwareModel();      ///< the architecture, for example "x86_64"

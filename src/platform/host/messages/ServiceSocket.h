@@ -7,7 +7,7 @@
 #include <string_view>
 
 #include "platform/host/device/DeviceDirectory.h"
-#include "platform/host/files/FileDescriptor.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 

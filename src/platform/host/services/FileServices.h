@@ -15,7 +15,7 @@
 #include "platform/host/documents/PtreeReader.h"
 #include "platform/host/documents/PtreeWriter.h"
 #include "platform/host/files/FileLock.h"
-#include "platform/host/files/WholeFile.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 
@@ -24,9 +24,9 @@ namespace vesprun {
 /// frees it when its process ends.
 class HostFileSystem final : public FileSystem, public DailyWorkLock {
  public:
-  HostFileSystem(const DeviceDirectory& directory,
-                 const AnswerDescription<FileSystemStatistics>& userVolume, SystemLog& log)
-      : _directory(directory), _userVolume(userVolume), _log(log) {}
+  HostFileSystem(const DeviceDirectory& directory, const DeviceDescription& description,
+                 SystemLog& log)
+      : _directory(directory), _description(description), _log(log) {}
 
   std::optional<std::string> readFile(const std::string& path) override {
     std::string error;
@@ -44,10 +44,9 @@ class HostFileSystem final : public FileSystem, public DailyWorkLock {
                : std::nullopt;
   }
   std::optional<FileSystemStatistics> statfs(const std::string& path) override {
-    if (path != "/private/var") {
-      return live::volume(_directory.hostPath(path));
-    }
-    return _userVolume.isLive() ? live::volume(_directory.path()) : _userVolume.value;
+    return path == "/private/var" ? describedOr(_description.userVolume,
+                                                [&] { return live::volume(_directory.path()); })
+                                  : live::volume(_directory.hostPath(path));
   }
 
   bool lock(double seconds) override {
@@ -67,7 +66,7 @@ class HostFileSystem final : public FileSystem, public DailyWorkLock {
 
  private:
   const DeviceDirectory& _directory;
-  const AnswerDescription<FileSystemStatistics>& _userVolume;
+  const DeviceDescription& _description;
   SystemLog& _log;
   std::optional<FolderLock> _dailyWork;
 };

@@ -6,7 +6,7 @@
 #include <cstdlib>
 #include <utility>
 
-#include "platform/host/files/WholeFile.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 

@@ -18,12 +18,12 @@ class HostDeviceInformation final : public DeviceInformation {
       : _description(description), _directory(directory) {}
 
   std::optional<PropertyValue> OrreryCopyAnswer(std::string_view question) override {
-    const DevicePropertyDescription& properties = _description.properties;
+    const auto& properties = _description.properties;
     if (question == "InternalBuild") {
       return properties.internalBuild;
     }
     if (question == "DiskUsage") {
-      return properties.diskUsage.isLive() ? liveDiskUsage() : properties.diskUsage.value;
+      return describedOr(properties.diskUsage, [this] { return liveDiskUsage(); });
     }
     return question == "InverseDeviceID" ? properties.inverseDeviceID : std::nullopt;
   }
@@ -73,15 +73,14 @@ class HostDeviceInformation final : public DeviceInformation {
     return best;
   }
   std::optional<std::string> localeCountryCode() override {
-    const AnswerDescription<std::string>& country = _description.languages.country;
-    return country.isLive() ? live::countryCode() : country.value;
+    return describedOr(_description.languages.country, live::countryCode);
   }
 
-  bool reclaimerIsAvailable() override { return _description.purgeableServiceAvailable; }
+  bool reclaimerIsAvailable() override { return _description.purgeable.has_value(); }
   /// The same for every volume.
   std::optional<PropertyDict> ReclaimerCopyItemizedPurgeableSpaceWithInfo(
       const PropertyDict& /*options*/) override {
-    return _description.purgeable;
+    return *_description.purgeable;
   }
 
   bool loadSupportLibrary() override { return _description.supportLibrary.available; }

@@ -17,12 +17,13 @@ namespace vesprun {
 /// service; by then it holds no thread.
 class HostMurmur::Replies {
  public:
-  Replies(const AnswerDescription<UsageDescription>& description, SystemLog& log)
-      : _description(description), _log(log) {}
+  Replies(const DeviceDescription& description, SystemLog& log)
+      : _usage(describedOr(description.usage, [] { return std::optional(UsageDescription()); })),
+        _log(log) {}
 
   void send(UsageFeed::ReplyHandler handler) {
     const std::lock_guard lock(_mutex);
-    if (_ended || _description.isNull) {
+    if (_ended || !_usage) {
       return;
     }
     try {
@@ -48,19 +49,17 @@ class HostMurmur::Replies {
  private:
   void reply(const UsageFeed::ReplyHandler& handler) {
     constexpr double kLongestDelay = 1e8;  // three years; far more would overflow the clock
-    static const UsageDescription kEmptyAtOnce;
-    const UsageDescription& usage = _description.value ? *_description.value : kEmptyAtOnce;
-    const std::chrono::duration<double> delay(std::min(usage.delaySeconds, kLongestDelay));
+    const std::chrono::duration<double> delay(std::min(_usage->delaySeconds, kLongestDelay));
     {
       std::unique_lock lock(_mutex);
       if (_endedChanged.wait_for(lock, delay, [this] { return _ended; })) {
         return;
       }
     }
-    runGuarded(_log, "usage feed", [&] { handler(&usage.records); });
+    runGuarded(_log, "usage feed", [&] { handler(&_usage->records); });
   }
 
-  const AnswerDescription<UsageDescription>& _description;
+  const std::optional<UsageDescription> _usage;  ///< nothing: it never replies
   SystemLog& _log;
   std::mutex _mutex;
   std::condition_variable _endedChanged;
@@ -83,7 +82,7 @@ class HostMurmur::Feed final : public UsageFeed {
   std::shared_ptr<Replies> _replies;
 };
 
-HostMurmur::HostMurmur(const AnswerDescription<UsageDescription>& description, SystemLog& log)
+HostMurmur::HostMurmur(const DeviceDescription& description, SystemLog& log)
     : _replies(std::make_shared<Replies>(description, log)) {}
 
 HostMurmur::~HostMurmur() { _replies->end(); }

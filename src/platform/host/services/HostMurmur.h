@@ -13,7 +13,7 @@ namespace vesprun {
 class HostMurmur final : public Murmur {
  public:
   /// The references, and all that handlers use, must outlive the object.
-  HostMurmur(const AnswerDescription<UsageDescription>& description, SystemLog& log);
+  HostMurmur(const DeviceDescription& description, SystemLog& log);
   ~HostMurmur() override;
   HostMurmur(const HostMurmur&) = delete;
   HostMurmur& operator=(const HostMurmur&) = delete;
