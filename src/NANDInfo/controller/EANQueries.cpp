@@ -1,11 +1,41 @@
 #include "NANDInfo/controller/EANQueries.h"
 
+#include "platform/RegistryObject.h"
+
 namespace vesprun {
 namespace {
 
 constexpr const char* kServiceClass = "QuillNVMeEAN";
 constexpr std::uint32_t kImageSizeMethod = 3;
 constexpr std::uint32_t kUpdateCountMethod = 7;
+
+/// The service and the connection to it, closed at the end.
+struct EANConnection {
+  RegistryObject service{};
+  RegistryHandle connection = 0;
+
+  ~EANConnection() {
+    if (connection != 0) {
+      platform().deviceRegistry().DevRegServiceClose(connection);
+    }
+  }
+};
+
+bool getEANConnection(EANConnection& ean) {
+  DeviceRegistry& registry = platform().deviceRegistry();
+  ean.service = RegistryObject(registry.DevRegServiceGetMatchingService(kServiceClass));
+  if (!ean.service) {
+    logMessage(LogLevel::Default, "getEANConnection: Couldn't find QuillNVMeEAN object\n");
+    return false;
+  }
+  if (const RegistryResult result = registry.DevRegServiceOpen(ean.service.get(), ean.connection)) {
+    logMessage(LogLevel::Default,
+               "getEANConnection: DevRegServiceOpen on QuillNVMeEAN failed kernResult:%x\n",
+               result);
+    return false;
+  }
+  return true;
+}
 
 /// The log names the two failures by different names.
 std::uint64_t ask(std::uint32_t method, const char* name, const char* callName,
@@ -33,22 +63,6 @@ std::uint64_t ask(std::uint32_t method, const char* name, const char* callName,
 }
 
 }  // namespace
-
-bool getEANConnection(EANConnection& ean) {
-  DeviceRegistry& registry = platform().deviceRegistry();
-  ean.service = RegistryObject(registry.DevRegServiceGetMatchingService(kServiceClass));
-  if (!ean.service) {
-    logMessage(LogLevel::Default, "getEANConnection: Couldn't find QuillNVMeEAN object\n");
-    return false;
-  }
-  if (const RegistryResult result = registry.DevRegServiceOpen(ean.service.get(), ean.connection)) {
-    logMessage(LogLevel::Default,
-               "getEANConnection: DevRegServiceOpen on QuillNVMeEAN failed kernResult:%x\n",
-               result);
-    return false;
-  }
-  return true;
-}
 
 std::uint64_t GetEANImageSize(std::uint32_t code) {
   return ask(kImageSizeMethod, "GetEANImageSize", "GetImageSize", code);
