@@ -20,9 +20,8 @@ inline constexpr std::string_view kUsageSinceKey = "since";
 enum class UsageNameKind { Process, Bundle };
 
 /// A connection to a usage service.
-class UsageWorkspace {
- public:
-  virtual ~UsageWorkspace() = default;
+struct UsageWorkspace {
+  std::string_view endpoint;
 };
 
 /// Network usage by process.
@@ -51,10 +50,7 @@ class Murmur {
   virtual ~Murmur() = default;
 
   /// Never null.
-  virtual std::shared_ptr<UsageWorkspace> createUsageWorkspace(std::string_view endpoint) = 0;
-
-  /// Never null. The feed keeps its workspace.
-  virtual std::shared_ptr<UsageFeed> createUsageFeed(std::shared_ptr<UsageWorkspace> workspace) = 0;
+  virtual std::shared_ptr<UsageFeed> createUsageFeed(const UsageWorkspace& workspace) = 0;
 };
 
 }  // namespace vesprun

@@ -227,7 +227,7 @@ TEST(HostServices, SayWhichFileCannotBeRead) {
 TEST(HostMurmur, OutlivesAHandlerThatThrows) {
   TestDevice device;
   std::promise<void> called;
-  const auto feed = platform().murmur().createUsageFeed(nullptr);
+  const auto feed = platform().murmur().createUsageFeed({});
   feed->usageToDateForNameKindReply({}, {}, [&](const auto*) {
     called.set_value();
     throw std::runtime_error("no room");

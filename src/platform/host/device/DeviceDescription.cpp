@@ -188,12 +188,11 @@ void read(const Entry& entry, DescribedAnswer<T>& answer) {
 }
 
 void read(const Entry& entry, LogLevel& level) {
-  static constexpr std::string_view kLevels[] = {"error", "default", "notice", "info", "debug"};
-  const auto* found = std::ranges::find(kLevels, entry.text());
-  if (found == std::end(kLevels)) {
+  const auto* found = std::ranges::find(kLogLevelNames, entry.text());
+  if (found == std::end(kLogLevelNames)) {
     entry.fail("not a log level (error, default, notice, info, debug)");
   }
-  level = static_cast<LogLevel>(found - std::begin(kLevels));
+  level = static_cast<LogLevel>(found - std::begin(kLogLevelNames));
 }
 
 void read(const Entry& entry, Date& clock) {

@@ -18,14 +18,12 @@ class HostMurmur final : public Murmur {
   HostMurmur(const HostMurmur&) = delete;
   HostMurmur& operator=(const HostMurmur&) = delete;
 
-  std::shared_ptr<UsageWorkspace> createUsageWorkspace(std::string_view endpoint) override;
-  std::shared_ptr<UsageFeed> createUsageFeed(std::shared_ptr<UsageWorkspace> workspace) override;
+  std::shared_ptr<UsageFeed> createUsageFeed(const UsageWorkspace& workspace) override;
 
  private:
-  class Replies;
   class Feed;
 
-  std::shared_ptr<Replies> _replies;
+  std::shared_ptr<Feed> _feed;
 };
 
 }  // namespace vesprun
