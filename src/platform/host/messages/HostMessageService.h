@@ -23,7 +23,8 @@ class HostMessageService final : public MessageService {
       : _directory(directory), _log(log), _mainLoop(mainLoop) {}
 
   /// One at a time for a device: see `ServiceSocket`.
-  std::unique_ptr<ServiceListener> createListener(std::string_view name) override;
+  std::unique_ptr<ServiceListener> createListener(std::string_view name,
+                                                  MessageHandler handler) override;
 
  private:
   const DeviceDirectory& _directory;
