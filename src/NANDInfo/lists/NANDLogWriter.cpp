@@ -144,7 +144,7 @@ void submitLog(std::string_view logType, const PropertyDict& fields, const Date&
   const std::string text = logText(platform().clock().localDateText(now), fields);
   // A failed submission counts: the next one is due in 7 days.
   platform().logsmith().LGSWriteLogForSubmission(
-      logType, kLogName, nullptr, [&text](LogFileHandle& file) { file.write(text); });
+      logType, kLogName, nullptr, [&text](const LogFileHandle& write) { write(text); });
   platform().preferences().LGSPreferencesSetValue(kLastLoggedKey, now, kDefaultsDomain);
   platform().preferences().LGSPreferencesSynchronize(kDefaultsDomain);
 }

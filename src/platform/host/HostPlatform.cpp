@@ -25,11 +25,9 @@ namespace vesprun {
 // Destroyed from the last to the first: a service that writes at its end follows those that it
 // needs.
 struct HostPlatform::Services {
-  Services(DeviceDirectory deviceDirectory, DeviceDescription deviceDescription,
-           ProcessTimeZone processTimeZone, SystemLog* log)
+  Services(DeviceDirectory deviceDirectory, DeviceDescription deviceDescription, SystemLog* log)
       : directory(std::move(deviceDirectory)),
         description(std::move(deviceDescription)),
-        timeZone(std::move(processTimeZone)),
         systemLog(log != nullptr ? *log : logFile) {}
 
   DeviceDirectory directory;
@@ -106,14 +104,13 @@ std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, System
   } else if (!missing) {
     return nullptr;
   }
-  ProcessTimeZone timeZone;
-  if (description.timeZone && !timeZone.set(*description.timeZone)) {
-    error = file + ": timeZone: unknown time zone " + quotedText(*description.timeZone);
+  auto services = std::make_unique<Services>(
+      log != nullptr ? directory->readOnly() : *std::move(directory), std::move(description), log);
+  const std::optional<std::string>& zone = services->description.timeZone;
+  if (zone && !services->timeZone.set(*zone)) {
+    error = file + ": timeZone: unknown time zone " + quotedText(*zone);
     return nullptr;
   }
-  auto services =
-      std::make_unique<Services>(log != nullptr ? directory->readOnly() : *std::move(directory),
-                                 std::move(description), std::move(timeZone), log);
   return std::unique_ptr<HostPlatform>(new HostPlatform(std::move(services)));
 }
 

@@ -17,16 +17,6 @@ namespace {
 
 constexpr std::string_view kPtreeLogType = "193";  // the other logs are text
 
-class OutboxLogFile : public LogFileHandle {
- public:
-  explicit OutboxLogFile(AtomicFile& file) : _file(file) {}
-
-  bool write(std::string_view bytes) override { return _file.append(bytes); }
-
- private:
-  AtomicFile& _file;
-};
-
 std::string baseName(std::uint64_t number, std::string_view type, std::string_view name) {
   char digits[24];
   std::snprintf(digits, sizeof digits, "%04llu", static_cast<unsigned long long>(number));
@@ -101,7 +91,7 @@ bool HostOutbox::LGSWriteLogForSubmission(std::string_view logType, std::string_
 }
 
 bool HostOutbox::writeLog(std::string_view type, std::string_view name, const PropertyDict* header,
-                      const LogWriter& writer, std::string& error) const {
+                          const LogWriter& writer, std::string& error) const {
   const std::optional<std::string> folder = _directory.makeFolder(kLogFolder, error);
   if (!folder) {
     return false;
@@ -111,8 +101,7 @@ bool HostOutbox::writeLog(std::string_view type, std::string_view name, const Pr
   if (!file) {
     return false;
   }
-  OutboxLogFile handle(*file);
-  writer(handle);
+  writer([&file](std::string_view bytes) { return file->append(bytes); });
   // The machine's clock may be another one.
   const Date time = _clock.now();
   file->setModificationTime(time);
