@@ -30,12 +30,9 @@ using PrunedLogs = std::vector<PrunedLog>;
 /// in `error`, when the file is there and cannot be read.
 std::optional<PrunedLogs> readPrunedLogs(const DeviceDirectory& directory, std::string& error);
 
-/// The numbers of the logs in `outbox/logs`, which only ever go up, also past logs that were
-/// removed.
-///
-/// The newest is remembered in `outbox/.log-number`, with the modification time of the folder. The
-/// folder is read only when that has changed, so that the time does not depend on how many logs lie
-/// there.
+/// The numbers of the logs in `outbox/logs`, which only ever go up, also past removed logs. The
+/// newest is remembered in `outbox/.log-number`, with the modification time of the folder, which is
+/// read only when that has changed: the time does not depend on how many logs lie there.
 class LogNumbers {
  public:
   /// To be made before the folder is touched; to be used by who holds its lock.

@@ -12,11 +12,11 @@ namespace vesprun {
 ///
 /// A new peer is an event of the main loop, and so is each message. A peer of another user (except
 /// root), one that sends anything else and one that ends inside a message is disconnected, with the
-/// reason in the system log. With 16 peers, a further one takes the place of one without a whole
-/// message, or else of any: the one silent longest. A whole message is delivered even if its peer
-/// is gone.
+/// reason in the system log. With 16 peers, a further one takes the place of the one silent
+/// longest, of those without a whole message first. A message is delivered even if its peer is
+/// gone.
 ///
-/// Listeners must not outlive the references, nor be destroyed by one of their own handlers.
+/// Listeners must not outlive the references, nor be destroyed by their handler.
 class HostMessageService final : public MessageService {
  public:
   HostMessageService(const DeviceDirectory& directory, SystemLog& log, HostMainLoop& mainLoop)

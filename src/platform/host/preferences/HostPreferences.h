@@ -24,14 +24,12 @@ struct PreferenceFolder {
 /// Preferences as ptree documents in a device folder, DOMAIN.ptree with a dictionary as its root
 /// for each domain. A document is read when it is first needed. Safe from any thread.
 ///
-/// A malformed document counts as empty. It stays until there is something to write, and is then
-/// kept as DOMAIN.ptree.unreadable-TIME. A file that cannot be read is never overwritten. Both are
-/// errors in the system log, and so is a value that no document can carry: it is refused, so that
-/// it cannot hold up other changes.
+/// A malformed document counts as empty. When there is something to write, it is kept as
+/// DOMAIN.ptree.unreadable-TIME. A file that cannot be read is never overwritten. Both are errors
+/// in the system log, and so is a value that no document can carry, which is refused.
 ///
 /// Users and domains become parts of paths: empty names and names with a leading dot, a slash or
-/// NUL are refused with an error in the system log (once for a domain), read as empty and never
-/// written.
+/// NUL are refused with an error in the system log (once for a domain) and read as empty.
 class HostPreferences final : public Preferences {
  public:
   /// The preferences of a user in var/USER/Library/Preferences. The references must outlive the
