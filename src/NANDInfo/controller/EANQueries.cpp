@@ -40,14 +40,12 @@ bool getEANConnection(EANConnection& ean) {
 /// The log names the two failures by different names.
 std::uint64_t ask(std::uint32_t method, const char* name, const char* callName,
                   std::uint32_t code) {
-  const auto character = [code](unsigned index) {
-    return static_cast<int>(code >> (24 - 8 * index) & 0xFF);
-  };
+  const char key[] = {static_cast<char>(code >> 24), static_cast<char>(code >> 16),
+                      static_cast<char>(code >> 8), static_cast<char>(code)};
   EANConnection ean;
   if (!getEANConnection(ean)) {
     logMessage(LogLevel::Default,
-               "%s: Unable to get EAN Io service connection for key (%u): %c%c%c%c\n", name, code,
-               character(0), character(1), character(2), character(3));
+               "%s: Unable to get EAN Io service connection for key (%u): %.4s\n", name, code, key);
     return 0;
   }
   std::uint64_t answer = 0;
@@ -55,8 +53,8 @@ std::uint64_t ask(std::uint32_t method, const char* name, const char* callName,
       ean.connection, method, code, answer);
   if (result != kRegistrySuccess) {
     logMessage(LogLevel::Default,
-               "%s: DevRegConnectCallMethod failed (key (%u): %c%c%c%c) kernResult:%x\n", callName,
-               code, character(0), character(1), character(2), character(3), result);
+               "%s: DevRegConnectCallMethod failed (key (%u): %.4s) kernResult:%x\n", callName,
+               code, key, result);
     return 0;
   }
   return answer;

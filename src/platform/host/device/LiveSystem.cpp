@@ -40,6 +40,12 @@ std::optional<std::string> osRelease(std::initializer_list<std::string_view> nam
   return std::nullopt;
 }
 
+utsname kernelName() {
+  utsname name{};
+  uname(&name);
+  return name;
+}
+
 std::string firstLineOf(const std::string& file) {
   std::ifstream stream(file);
   std::string line;
@@ -96,15 +102,12 @@ void appendDesktopEntries(const std::filesystem::path& folder, bool user,
 }  // namespace
 
 std::string osVersion() {
-  utsname system{};
-  const bool isNamed = uname(&system) == 0;
-  return osRelease({"PRETTY_NAME"})
-      .value_or(isNamed ? std::string(system.sysname) + ' ' + system.release : "Linux");
+  const utsname system = kernelName();
+  return osRelease({"PRETTY_NAME"}).value_or(std::string(system.sysname) + ' ' + system.release);
 }
 
 std::string osBuild() {
-  utsname system{};
-  return osRelease({"BUILD_ID", "VERSION_ID"}).value_or(uname(&system) == 0 ? system.release : "");
+  return osRelease({"BUILD_ID", "VERSION_ID"}).value_or(kernelName().release);
 }
 
 std::optional<KernelVariable> swapUsage() {
@@ -132,10 +135,7 @@ std::optional<KernelVariable> bootSessionIdentifier() {
 
 std::string machineIdentifier() { return firstLineOf("/etc/machine-id"); }
 
-std::string hardwareModel() {
-  utsname system{};
-  return uname(&system) == 0 ? system.machine : "";
-}
+std::string hardwareModel() { return kernelName().machine; }
 
 std::string newIdentifier() {
   std::array<std::uint64_t, 2> bits{};
