@@ -65,7 +65,7 @@ std::unique_ptr<TBConfig> TBConfig::init() {
 }
 
 std::unique_ptr<TBConfig> TBConfig::fromBytes(std::string_view bytes) {
-  std::string digest = hexadecimalText(platform().messageDigest().md5(bytes));
+  std::string digest = hexadecimalText(platform().ptreeSerialization().md5(bytes));
   std::string error;
   std::optional<PropertyValue> root = platform().ptreeSerialization().parse(bytes, error);
   if (!root || root->dict() == nullptr) {

@@ -6,7 +6,6 @@
 #include "driver/TaskingSync.h"
 #include "platform/Guarded.h"
 #include "platform/Platform.h"
-#include "platform/PreferenceNames.h"
 #include "report/TBReport.h"
 
 namespace vesprun {

@@ -4,7 +4,6 @@
 
 #include "common/TextForm.h"
 #include "platform/Platform.h"
-#include "platform/PreferenceNames.h"
 
 namespace vesprun {
 namespace {
@@ -41,7 +40,7 @@ bool submitDailyLog(const std::string& bytes) {
   }
   const bool submitted = platform().logsmith().LGSWriteLogForSubmission(
       "193", "log-aggregated", header.empty() ? nullptr : &header,
-      [&bytes](LogFileHandle& file) { file.write(bytes); });
+      [&bytes](const LogFileHandle& write) { write(bytes); });
   if (!submitted) {
     logMessage(LogLevel::Error, "%s", kSubmissionFailed);
   }

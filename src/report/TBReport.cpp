@@ -7,7 +7,6 @@
 #include <vector>
 
 #include "platform/Platform.h"
-#include "platform/PreferenceNames.h"
 #include "report/DistributionStats.h"
 #include "report/Histogram.h"
 #include "report/KernelMemoryStatistics.h"

@@ -266,10 +266,9 @@ void CollectDataUsage(std::chrono::nanoseconds replyTimeout) {
   if (!fingerprint) {
     return;  // unknown counters: the next run counts the growth
   }
-  const auto workspace = platform().murmur().createUsageWorkspace(kUsageServiceEndpoint);
-  const auto feed = platform().murmur().createUsageFeed(workspace);
+  const auto feed = platform().murmur().createUsageFeed(UsageWorkspace{kUsageServiceEndpoint});
   const auto handled = std::make_shared<std::binary_semaphore>(0);
-  const auto reply = [feed, workspace, handled, services,
+  const auto reply = [feed, handled, services,
                       mark = CountingMark{today, *fingerprint, {}}](const PropertyArray* records) {
     UsageReply usageReply(services, mark);
     usageReply.handle(records);

@@ -215,18 +215,11 @@ TEST_F(DailyDriverTest, MessagesLeadToWhatTheirStateAllows) {
 }
 
 TEST_F(DailyDriverTest, AMessageThatFailsStopsNoOther) {
-  struct Failing : PeerConnection {
-    void setMessageHandler(MessageHandler handler) override { deliver = std::move(handler); }
-    void start() override {}
-    MessageHandler deliver;
-  };
   DriverDevice device;
-  Failing peer;
-  handleNewPeer(peer);
   auto& loop = dynamic_cast<HostMainLoop&>(device.platform().mainLoop());
-  loop.queueWork([&peer] { peer.deliver(operation(0)); });
+  loop.queueWork([] { handlePeerMessage(operation(0)); });
   loop.queueWork([] { throw std::bad_alloc(); });
-  loop.queueWork([&peer] { peer.deliver(PropertyDict{{"operation", 2}, {"app_data", 0}}); });
+  loop.queueWork([] { handlePeerMessage(PropertyDict{{"operation", 2}, {"app_data", 0}}); });
   runListenerMode(kQuiet);
   EXPECT_THAT(device.log(), Contains("error: unexpected failure: std::bad_alloc"));
   EXPECT_EQ(storedDay(device), PropertyValue(kYesterday));
@@ -270,7 +263,7 @@ TEST_F(DailyDriverTest, AWaitForTheDaysWorkOfAnotherProcessEnds) {
 TEST_F(DailyDriverTest, AServiceThatIsTakenChangesNothingElse) {
   DriverDevice device;
   const std::unique_ptr<ServiceListener> other =
-      device.platform().messageService().createListener(kService);
+      device.platform().messageService().createListener(kService, handlePeerMessage);
   ASSERT_NE(other, nullptr);
   aaiRequested = true;
   runListenerMode(kQuiet);

@@ -7,8 +7,7 @@
 
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/QuotedText.h"
-#include "platform/host/files/FileDescriptor.h"
-#include "platform/host/files/SystemError.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 

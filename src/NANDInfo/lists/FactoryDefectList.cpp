@@ -1,7 +1,10 @@
 #include "NANDInfo/lists/FactoryDefectList.h"
 
 #include <algorithm>
+#include <array>
+#include <bit>
 #include <cstdio>
+#include <cstring>
 
 #include "NANDInfo/lists/ListRecord.h"
 #include "common/LittleEndian.h"
@@ -14,9 +17,8 @@ namespace {
 constexpr std::size_t kFactoryCountOffset = 4;
 constexpr std::size_t kRecordCountOffset = 8;
 constexpr std::size_t kListHeaderSize = 12;
-constexpr std::size_t kRecordSize = 32;
 
-/// A defect record, 32 bytes.
+/// A defect record, little-endian.
 struct DefectRecord {
   std::uint16_t bus;
   std::uint16_t chipEnable;
@@ -25,19 +27,9 @@ struct DefectRecord {
   std::uint32_t cycle;
   std::uint32_t reason;
   std::uint32_t page;
-  std::int8_t temperature;  ///< the low byte of its word
+  std::int8_t temperature;
+  std::array<std::uint8_t, 3> unused;
   std::uint32_t mode;
-
-  explicit DefectRecord(const std::uint8_t* bytes)
-      : bus(loadLittleEndian<std::uint16_t>(bytes)),
-        chipEnable(loadLittleEndian<std::uint16_t>(bytes + 2)),
-        cau(loadLittleEndian<std::uint32_t>(bytes + 4)),
-        block(loadLittleEndian<std::uint32_t>(bytes + 8)),
-        cycle(loadLittleEndian<std::uint32_t>(bytes + 12)),
-        reason(loadLittleEndian<std::uint32_t>(bytes + 16)),
-        page(loadLittleEndian<std::uint32_t>(bytes + 20)),
-        temperature(static_cast<std::int8_t>(bytes[24])),
-        mode(loadLittleEndian<std::uint32_t>(bytes + 28)) {}
 
   /// The reason adjusted by the mode, in 32 bits.
   std::uint32_t adjustedReason() const {
@@ -54,6 +46,8 @@ struct DefectRecord {
     }
   }
 };
+
+static_assert(sizeof(DefectRecord) == 32 && std::endian::native == std::endian::little);
 
 PropertyValue signedNumber(std::uint32_t word) { return static_cast<std::int32_t>(word); }
 
@@ -93,10 +87,12 @@ bool LogFactoryDefectList(std::span<const std::uint8_t> buffer, const PropertyVa
     return true;
   }
   const std::size_t stated = loadLittleEndian<std::uint32_t>(buffer.data() + kRecordCountOffset);
-  const std::size_t count = std::min(stated, (buffer.size() - kListHeaderSize) / kRecordSize);
+  const std::size_t count =
+      std::min(stated, (buffer.size() - kListHeaderSize) / sizeof(DefectRecord));
   for (std::size_t i = 0; i < count; ++i) {
-    const std::uint8_t* bytes = buffer.data() + kListHeaderSize + i * kRecordSize;
-    logDefect(DefectRecord(bytes), className != "ORUStorage");
+    DefectRecord defect{};
+    std::memcpy(&defect, buffer.data() + kListHeaderSize + i * sizeof defect, sizeof defect);
+    logDefect(defect, className != "ORUStorage");
   }
   return true;
 }

@@ -9,11 +9,8 @@
 namespace vesprun {
 
 /// Logs a controller's factory defects as structured records of type 176: one with "Factory Count"
-/// and, if the controller's properties have it, "com.quill.NANDInfo.nandDesc"; then one for each
-/// defect wholly in the buffer. Numbers are signed 32-bit, "Temperature" signed 8-bit.
-///
-/// `properties` may be null or no dictionary. Always true: a buffer without the factory count logs
-/// nothing, one without the record count no defects.
+/// and, if `properties` (may be null) have it, "com.quill.NANDInfo.nandDesc"; then one for each
+/// defect wholly in the buffer. Numbers are signed 32-bit, "Temperature" signed 8-bit. Always true.
 bool LogFactoryDefectList(std::span<const std::uint8_t> buffer, const PropertyValue* properties,
                           std::string_view className);
 

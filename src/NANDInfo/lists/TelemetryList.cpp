@@ -1,6 +1,7 @@
 #include "NANDInfo/lists/TelemetryList.h"
 
 #include <array>
+#include <cctype>
 #include <cstddef>
 #include <cstdio>
 #include <memory>
@@ -157,19 +158,15 @@ PropertyDict busRecord(const std::uint8_t* busEntry, const NandChannelCounters& 
 }  // namespace
 
 std::uint8_t hexStringToByte(std::string_view text, std::uint32_t length) {
-  unsigned value = 0;
-  for (char c : text.substr(0, std::min<std::size_t>(length, 2))) {
-    if (c >= 'A' && c <= 'Z') {
-      c = static_cast<char>(c - 'A' + 'a');
-    }
-    value *= 16;
-    if (c >= '0' && c <= '9') {
-      value += static_cast<unsigned>(c - '0');
-    } else if (c >= 'a' && c <= 'f') {
-      value += static_cast<unsigned>(c - 'a') + 10;
-    } else {
+  constexpr std::string_view kDigits = "0123456789abcdef";
+  std::size_t value = 0;
+  for (const unsigned char character : text.substr(0, std::min<std::size_t>(length, 2))) {
+    const auto c = static_cast<char>(std::tolower(character));
+    const std::size_t digit = kDigits.find(c);
+    if (digit == std::string_view::npos) {
       std::printf("unrecognized hex character: %c", c);
     }
+    value = value * 16 + (digit != std::string_view::npos ? digit : 0);
   }
   return static_cast<std::uint8_t>(value);
 }

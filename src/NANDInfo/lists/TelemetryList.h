@@ -9,11 +9,9 @@
 namespace vesprun {
 
 /// Logs a telemetry list as a structured record of type 176 for each NAND bus, in signed 32-bit
-/// numbers: wear figures of the bus, then its decoded counters.
-///
-/// Of the controller's `characteristics`, "chip-id" (at most 63 bytes) and "manufacturer-id"
-/// (hexadecimal digits, possibly fewer than 12) select the layout of the counters; "num-bus" is the
-/// number of buses, of which 0 or fewer log nothing.
+/// numbers: wear figures of the bus, then its decoded counters. Of the `characteristics`, "chip-id"
+/// (at most 63 bytes) and "manufacturer-id" (hexadecimal digits) select the layout of the counters;
+/// "num-bus" is the number of buses, of which 0 or fewer log nothing.
 ///
 /// False, with a line on standard error and nothing logged, when a characteristic is missing or
 /// unusable, the buffer does not hold all buses, or memory runs out.

@@ -14,26 +14,16 @@
 namespace vesprun {
 namespace {
 
-/// Closes what `findNandExporterNew` opened.
-class OpenExporter {
- public:
-  OpenExporter() = default;
-  OpenExporter(const OpenExporter&) = delete;
-  OpenExporter& operator=(const OpenExporter&) = delete;
-  ~OpenExporter() {
-    if (_exporter != nullptr) {
-      ReleaseIOInterfaces(*_exporter);
-    }
-  }
-
-  /// False when no controller opens.
-  bool open() { return findNandExporterNew(_exporter); }
-  const nand_exporter_t* operator->() const { return _exporter; }
-  const nand_exporter_t& operator*() const { return *_exporter; }
-
- private:
-  nand_exporter_t* _exporter = nullptr;
+struct ReleaseInterfaces {
+  void operator()(nand_exporter_t* exporter) const { ReleaseIOInterfaces(*exporter); }
 };
+
+/// The controller that `findNandExporterNew` opens, until the pointer goes; null when none opens.
+std::unique_ptr<nand_exporter_t, ReleaseInterfaces> openExporter() {
+  nand_exporter_t* exporter = nullptr;
+  const bool isOpen = findNandExporterNew(exporter);
+  return std::unique_ptr<nand_exporter_t, ReleaseInterfaces>(isOpen ? exporter : nullptr);
+}
 
 struct Answer {
   TunnelBuffer buffer;
@@ -68,8 +58,8 @@ std::uint32_t countMSPs(const nand_exporter_t& exporter) {
 
 std::optional<PropertyDict> gatherORUFTLData(bool useStatKeyParser, bool useStatsSelector,
                                              std::uint32_t argument) {
-  OpenExporter exporter;
-  if (!exporter.open()) {
+  const auto exporter = openExporter();
+  if (!exporter) {
     SetAPIErrorMessage("gatherORUFTLData: Could not get nand_exporter_t");
     return std::nullopt;
   }
@@ -113,8 +103,8 @@ std::optional<PropertyDict> gatherORUFTLData(bool useStatKeyParser, bool useStat
 }
 
 std::optional<PropertyDict> gatherORUMSPData() {
-  OpenExporter exporter;
-  if (!exporter.open()) {
+  const auto exporter = openExporter();
+  if (!exporter) {
     SetAPIErrorMessage("gatherORUMSPData: Could not get nand_exporter_t");
     return std::nullopt;
   }

@@ -111,12 +111,12 @@ std::uint64_t weeksSince2000(std::uint64_t secondsSince1970) {
 
 PropertyDict getReclaimerInfo() {
   PropertyDict info;
-  Reclaimer& reclaimer = platform().reclaimer();
-  if (!reclaimer.isAvailable()) {
+  DeviceInformation& device = platform().deviceInformation();
+  if (!device.reclaimerIsAvailable()) {
     return info;
   }
   const std::optional<PropertyDict> answer =
-      reclaimer.ReclaimerCopyItemizedPurgeableSpaceWithInfo({{"RECLAIMER_VOLUME", "/private/var"}});
+      device.ReclaimerCopyItemizedPurgeableSpaceWithInfo({{"RECLAIMER_VOLUME", "/private/var"}});
   if (!answer) {
     SetAPIErrorMessage(
         "getReclaimerInfo: unable to get output from ReclaimerCopyItemizedPurgeableSpaceWithInfo");

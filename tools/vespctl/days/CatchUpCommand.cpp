@@ -10,7 +10,7 @@
 #include "outbox/SubmittedLogs.h"
 #include "platform/Platform.h"
 #include "platform/host/counters/HostTallybook.h"
-#include "platform/host/device/PrunedLogs.h"
+#include "platform/host/device/LogNumbers.h"
 #include "report/LogSubmission.h"
 #include "report/ReportSources.h"
 #include "report/TBReport.h"

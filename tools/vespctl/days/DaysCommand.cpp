@@ -10,7 +10,6 @@
 #include "Complaints.h"
 #include "common/Calendar.h"
 #include "outbox/SubmittedLogs.h"
-#include "platform/PreferenceNames.h"
 #include "platform/host/counters/HostTallybook.h"
 
 namespace vesprun {

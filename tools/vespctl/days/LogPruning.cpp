@@ -14,12 +14,10 @@
 #include "common/Calendar.h"
 #include "outbox/SubmittedLogs.h"
 #include "platform/host/device/LogNumbers.h"
-#include "platform/host/device/PrunedLogs.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/files/FileLock.h"
-#include "platform/host/files/FolderNames.h"
+#include "platform/host/files/Files.h"
 #include "platform/host/files/JsonLines.h"
-#include "platform/host/files/SystemError.h"
 
 namespace vesprun {
 namespace {

@@ -10,7 +10,7 @@
 #include "device/AppFile.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeWriter.h"
-#include "platform/host/files/WholeFile.h"
+#include "platform/host/files/Files.h"
 #include "platform/host/messages/MessageFraming.h"
 #include "platform/host/messages/ServiceSocket.h"
 

@@ -9,7 +9,6 @@
 #include "Command.h"
 #include "common/TextForm.h"
 #include "outbox/SubmittedLogs.h"
-#include "platform/DiagnosticHeader.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/XmlText.h"
 
@@ -62,7 +61,7 @@ void run(const Export& wanted) {
   const std::string device =
       !wanted.device.empty()
           ? wanted.device
-          : pseudonymOf(platform->diagnosticHeader().GetSysIDWithDescription(false));
+          : pseudonymOf(platform->deviceInformation().GetSysIDWithDescription(false));
   const auto print = [&](SubmittedLog&& log) {
     if (log.day < wanted.from || log.day > wanted.to) {
       return;

@@ -11,8 +11,7 @@
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeReader.h"
 #include "platform/host/documents/QuotedText.h"
-#include "platform/host/files/FolderNames.h"
-#include "platform/host/files/WholeFile.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {

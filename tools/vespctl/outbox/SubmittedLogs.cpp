@@ -9,11 +9,10 @@
 
 #include "Command.h"
 #include "common/Calendar.h"
-#include "platform/host/device/PrunedLogs.h"
+#include "platform/host/device/LogNumbers.h"
 #include "platform/host/documents/PtreeReader.h"
 #include "platform/host/documents/QuotedText.h"
-#include "platform/host/files/FolderNames.h"
-#include "platform/host/files/WholeFile.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {

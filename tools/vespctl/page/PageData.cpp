@@ -10,8 +10,7 @@
 #include "common/TextForm.h"
 #include "page/Html.h"
 #include "platform/host/documents/JsonForm.h"
-#include "platform/host/files/FolderNames.h"
-#include "platform/host/files/WholeFile.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {

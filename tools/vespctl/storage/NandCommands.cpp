@@ -8,8 +8,7 @@
 
 #include "Command.h"
 #include "library/EntryPoints.h"
-#include "platform/host/files/FileDescriptor.h"
-#include "platform/host/files/SystemError.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {

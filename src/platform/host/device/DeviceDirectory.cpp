@@ -5,7 +5,7 @@
 #include <cerrno>
 #include <utility>
 
-#include "platform/host/files/SystemError.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {

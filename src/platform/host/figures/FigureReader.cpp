@@ -14,7 +14,7 @@
 #include <memory>
 #include <optional>
 
-#include "platform/host/files/FileDescriptor.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {

@@ -5,7 +5,7 @@
 #include <cerrno>
 #include <thread>
 
-#include "platform/host/files/SystemError.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 

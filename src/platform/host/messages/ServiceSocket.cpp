@@ -12,7 +12,7 @@
 #include <cstring>
 #include <utility>
 
-#include "platform/host/files/SystemError.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {

@@ -7,7 +7,7 @@
 #include <limits>
 
 #include "common/LittleEndian.h"
-#include "platform/host/files/WholeFile.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {
