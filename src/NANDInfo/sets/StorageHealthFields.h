@@ -3,6 +3,7 @@
 #include <cstdint>
 #include <string_view>
 
+#include "NANDInfo/tables/FieldTable.h"
 #include "common/PropertyDict.h"
 
 namespace vesprun {
@@ -31,6 +32,9 @@ PropertyDict getReclaimerInfo();
 ///
 /// Without FTL fields (null) an error is recorded, and only the device's fields are there.
 PropertyDict gatherORUFTLOtherData(const PropertyDict* ftl);
+
+/// The FTL fields that these fields come from.
+extern const FieldTable kSourcesOfOtherData;
 
 /// The derived fields of other sets than the FTL's: those of `FTLStats4MSPStats` that are there, in
 /// its order, from the FTL fields of now. Empty, with the error recorded, without these.

@@ -27,8 +27,7 @@ TEST(RoundSig, RoundsHalfUpOnTheDigitThatIsCutOff) {
 }
 
 constexpr auto kListedRanges = std::to_array<FieldRange>({{2, "a"}, {1, "b"}, {3, "bin", 9, 11}});
-constexpr FieldIndex kListedIndex(kListedRanges);
-constexpr FieldTable kListed(kListedRanges, kListedIndex);
+constexpr FieldTable kListed = fieldTable<kListedRanges, 5>();
 
 std::vector<std::string> keysOf(const PropertyDict& dict) {
   std::vector<std::string> keys;

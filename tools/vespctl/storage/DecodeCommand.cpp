@@ -25,10 +25,10 @@ void printFields(const PropertyValue& result, const GenericParserCxt& fields) {
   std::cout << "{\"result\":" << jsonText(result)
             << ",\"error\":" << jsonText(PropertyValue(GetAPIErrorMessage())) << ",\"fields\":[";
   const char* separator = "";
-  for (const GenericParserCxt::Field field : fields) {
+  fields.forEach([&separator](const GenericParserCxt::Field& field) {
     std::cout << separator << "[\"" << field.name << "\"," << field.value << ']';
     separator = ",";
-  }
+  });
   std::cout << ']';
 }
 
