@@ -125,10 +125,10 @@ struct PackedDistribution {
 template <>
 PackedDistribution readValue(PackedReader& entries) {
   PackedDistribution value;
-  value.statistics.minimum = entries.real();
-  value.statistics.maximum = entries.real();
-  value.statistics.mean = entries.real();
-  value.statistics.deviations = entries.real();
+  value.statistics.minimum = entries.raw<double>();
+  value.statistics.maximum = entries.raw<double>();
+  value.statistics.mean = entries.raw<double>();
+  value.statistics.deviations = entries.raw<double>();
   value.statistics.count = static_cast<std::int64_t>(entries.varint());
   std::uint64_t labels = entries.varint();
   value.hasHistogram = labels != 0;
@@ -152,7 +152,7 @@ PassedOver<KeyKind::Scalar> readValue(PackedReader& entries) {
 template <>
 PassedOver<KeyKind::Distribution> readValue(PackedReader& entries) {
   for (int number = 0; number < 4; ++number) {
-    entries.real();
+    entries.raw<double>();
   }
   entries.varint();
   for (std::uint64_t labels = entries.varint(); labels > 1; --labels) {
@@ -312,7 +312,7 @@ void SqliteStore::add(const ExportedLine& line) {
         value.clear();
         for (const double real :
              {statistics.minimum, statistics.maximum, statistics.mean, statistics.deviations}) {
-          appendDouble(value, real);
+          appendRaw(value, real);
         }
         appendVarint(value, static_cast<std::uint64_t>(statistics.count));
         appendVarint(value, histogram ? histogram->size() + 1 : 0);
@@ -487,7 +487,7 @@ void SqliteStore::visitPackedEntries(KeyKind kind, std::int64_t key, const std::
   }
 }
 
-void SqliteStore::visitKeys(const std::function<void(const ReportedKey&)>& visit) {
+void SqliteStore::visitKeys(const VisitKey& visit) {
   guarded([&] {
     _database->execute("BEGIN");  // one state of the store, until it is closed
     std::vector<Line> lines = linesThatHold({});
@@ -520,7 +520,7 @@ void SqliteStore::visitKeys(const std::function<void(const ReportedKey&)>& visit
 }
 
 void SqliteStore::visitScalars(std::string_view key, const DayRange& days,
-                               const std::function<void(std::int32_t, std::int64_t)>& visit) {
+                               const VisitScalar& visit) {
   guarded([&] {
     _database->execute("BEGIN");  // one state of the store, until it is closed
     if (const auto number = findKey(KeyKind::Scalar, key)) {
@@ -531,9 +531,8 @@ void SqliteStore::visitScalars(std::string_view key, const DayRange& days,
   });
 }
 
-void SqliteStore::visitDistributions(
-    std::string_view key, const DayRange& days,
-    const std::function<void(std::int32_t, const Distribution&)>& visit) {
+void SqliteStore::visitDistributions(std::string_view key, const DayRange& days,
+                                     const VisitDistribution& visit) {
   guarded([&] {
     _database->execute("BEGIN");  // one state of the store, until it is closed
     const auto number = findKey(KeyKind::Distribution, key);

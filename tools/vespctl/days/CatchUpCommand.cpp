@@ -6,7 +6,6 @@
 #include <string>
 
 #include "Command.h"
-#include "days/DailyWork.h"
 #include "outbox/SubmittedLogs.h"
 #include "platform/Platform.h"
 #include "platform/host/counters/HostTallybook.h"
@@ -23,11 +22,7 @@ std::set<std::int32_t> reportedDays(const DeviceDirectory& directory) {
   std::set<std::int32_t> days;
   nameUnreadable(
       forEachSubmittedLog(directory, [&days](SubmittedLog&& log) { days.insert(log.day); }));
-  std::string error;
-  const std::optional<PrunedLogs> pruned = readPrunedLogs(directory, error);
-  if (!pruned) {
-    throw CommandFailure(error);
-  }
+  const auto pruned = orFail([&](std::string& error) { return readPrunedLogs(directory, error); });
   for (const PrunedLog& log : *pruned) {
     days.insert(log.day);
   }
@@ -46,10 +41,7 @@ std::vector<std::int32_t> missedDays(HostTallybook& counters, std::int64_t first
       }
     }
   };
-  std::string error;
-  if (!counters.read(find, error)) {
-    throw CommandFailure(error);
-  }
+  orFail([&](std::string& error) { return counters.read(find, error); });
   return days;
 }
 

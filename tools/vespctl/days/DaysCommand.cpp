@@ -28,7 +28,6 @@ std::string dateOf(std::int32_t day) {
 }
 
 void showDays(const std::string& directory, std::uint32_t last) {
-  std::string error;
   Complaints complaints;
   const auto device = openDeviceReadOnly(directory, complaints);
   const std::int32_t today = device->tallybook().TBDaysSince1970();
@@ -49,8 +48,8 @@ void showDays(const std::string& directory, std::uint32_t last) {
         "", first, today,
         [&](std::string_view, std::int32_t day, auto&, bool&) { ++days[day].distributions; });
   };
-  if (last != 0 && !device->counters().read(countKeys, error)) {
-    throw CommandFailure(error);
+  if (last != 0) {
+    orFail([&](std::string& error) { return device->counters().read(countKeys, error); });
   }
   for (std::int64_t day = first; day <= today; ++day) {
     Day& shown = days[static_cast<std::int32_t>(day)];

@@ -10,7 +10,6 @@
 #include "Command.h"
 #include "Complaints.h"
 #include "common/Calendar.h"
-#include "days/DailyWork.h"
 #include "days/LogPruning.h"
 #include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/JsonForm.h"

@@ -23,25 +23,19 @@ void initDevice(const std::string& path, bool sample) {
   if (failure) {
     throw CommandFailure(path + ": " + failure.message());
   }
-  std::string error;
-  const std::optional<DeviceDirectory> directory = DeviceDirectory::open(path, error);
-  if (!directory) {
-    throw CommandFailure(error);
-  }
+  const DeviceDirectory directory = openDirectory(path);
   for (const char* folder :
        {"Library/Application Support/Tallybook", "Library/Logsmith", "var/mobile/Library/Tallybook",
         "var/mobile/Library/Preferences", "run", "kernel/ecc", "outbox/logs"}) {
-    if (!directory->makeFolder(folder, error)) {
-      throw CommandFailure(error);
-    }
+    orFail([&](std::string& error) { return directory.makeFolder(folder, error); });
   }
-  if (!replaceFile(directory->hostPath("device.json"), "{\n}\n", error)) {
-    throw CommandFailure(error);
-  }
+  orFail([&](std::string& error) {
+    return replaceFile(directory.hostPath("device.json"), "{\n}\n", error);
+  });
   if (sample) {
     fillSampleDevice(path);
   } else {
-    writeWhitelist(*directory, starterWhitelist());
+    writeWhitelist(directory, starterWhitelist());
   }
 }
 

@@ -26,10 +26,7 @@ void writePage(const std::string& file, const std::string& page) {
   if (failure) {
     throw CommandFailure(file + ": " + failure.message());
   }
-  std::string error;
-  if (!replaceFile(path.string(), page, error)) {
-    throw CommandFailure(error);
-  }
+  orFail([&](std::string& error) { return replaceFile(path.string(), page, error); });
 }
 
 void makePage(const std::string& directory, const std::string& file) {

@@ -20,12 +20,10 @@ namespace {
 
 void writeSampleWhitelist(const DeviceDirectory& directory) {
   std::string document;
-  std::string error;
-  const std::optional<PropertyValue> whitelist =
-      valueFromJsonText(sampleData().at("whitelist").dump(), error);
-  if (!whitelist || !writePtree(*whitelist, document, error)) {
-    throw CommandFailure(error);
-  }
+  orFail([&](std::string& error) {
+    const auto whitelist = valueFromJsonText(sampleData().at("whitelist").dump(), error);
+    return whitelist && writePtree(*whitelist, document, error);
+  });
   writeWhitelist(directory, document);
 }
 
@@ -61,10 +59,7 @@ void recordCounters(HostPlatform& device) {
     recordDay(store, yesterday, later);
     return true;
   };
-  std::string error;
-  if (!counters.write(record, error)) {
-    throw CommandFailure(error);
-  }
+  orFail([&](std::string& error) { return counters.write(record, error); });
 }
 
 /// The time that the controller's statistics tell of: now, unless SOURCE_DATE_EPOCH asks for the
