@@ -76,6 +76,13 @@ std::string inputName(const std::string& file) { return file == "-" ? "standard 
 
 void printJson(const PropertyValue& value) { std::cout << jsonText(value) << '\n'; }
 
+CLI::App* addDeviceCommand(CLI::App& above, const std::string& name, const std::string& description,
+                           std::string& directory) {
+  CLI::App* command = above.add_subcommand(name, description);
+  command->add_option("DIR", directory, "The device directory")->required();
+  return command;
+}
+
 void allowOneCommand(CLI::App& subject, bool needed) {
   subject.require_subcommand(0, 1);
   subject.allow_extras();

@@ -83,6 +83,10 @@ CLI::Validator decimal() {
       "");
 }
 
+/// Adds a command whose first argument is a device directory.
+CLI::App* addDeviceCommand(CLI::App& above, const std::string& name, const std::string& description,
+                           std::string& directory);
+
 /// Allows one of `subject`'s commands, and names them all to refuse any other word, or none when
 /// one is `needed`.
 void allowOneCommand(CLI::App& subject, bool needed = true);

@@ -164,28 +164,23 @@ PassedOver<KeyKind::Distribution> readValue(PackedReader& entries) {
 
 }  // namespace
 
-class SqliteStore::Statements {
- public:
-  explicit Statements(const SqliteConnection& database)
-      : find(database,
-             "SELECT number, revision, seconds, nanoseconds, size, text FROM line"
-             " WHERE day = ? AND device = ?"),
-        remove(database, "DELETE FROM line WHERE number = ?"),
-        insert(database,
-               "INSERT INTO line(day, device, revision, seconds, nanoseconds, size, text)"
-               " VALUES(?, ?, ?, ?, ?, ?, ?)"),
-        lastChunk(database,
-                  "SELECT number, last, entries FROM chunk WHERE number >= ? AND number < ?"
-                  " ORDER BY number DESC LIMIT 1"),
-        writeChunk(database, "INSERT OR REPLACE INTO chunk(number, last, entries) VALUES(?, ?, ?)"),
-        countReplaced(database, "UPDATE replaced SET lines = lines + 1") {}
+struct SqliteStore::Statements {
+  explicit Statements(const SqliteConnection& opened) : database(opened) {}
 
-  SqliteStatement find;
-  SqliteStatement remove;
-  SqliteStatement insert;
-  SqliteStatement lastChunk;
-  SqliteStatement writeChunk;
-  SqliteStatement countReplaced;
+  const SqliteConnection& database;
+  SqliteStatement findLine{database,
+                           "SELECT number, revision, seconds, nanoseconds, size, text FROM line"
+                           " WHERE day = ? AND device = ?"};
+  SqliteStatement remove{database, "DELETE FROM line WHERE number = ?"};
+  SqliteStatement insert{database,
+                         "INSERT INTO line(day, device, revision, seconds, nanoseconds, size, text)"
+                         " VALUES(?, ?, ?, ?, ?, ?, ?)"};
+  SqliteStatement lastChunk{database,
+                            "SELECT number, last, entries FROM chunk WHERE number >= ? AND"
+                            " number < ? ORDER BY number DESC LIMIT 1"};
+  SqliteStatement writeChunk{database,
+                             "INSERT OR REPLACE INTO chunk(number, last, entries) VALUES(?, ?, ?)"};
+  SqliteStatement countReplaced{database, "UPDATE replaced SET lines = lines + 1"};
 };
 
 /// Turns what goes wrong in the file into one line.
@@ -231,27 +226,33 @@ SqliteStore::SqliteStore(const std::string& path, bool toBeLoaded) : _path(path)
 
 SqliteStore::~SqliteStore() = default;
 
-std::int64_t SqliteStore::numberOf(const char* table, KeyKind kind, std::string_view text) {
-  const bool isKey = std::string_view(table) == "key";
+/// The number of a text in the tables `device`, `key` and `label`; only keys have a kind.
+std::optional<std::int64_t> SqliteStore::findNumber(const std::string& table, KeyKind kind,
+                                                    std::string_view text) {
+  const bool isKey = table == "key";
+  const std::string query =
+      "SELECT number FROM " + table + " WHERE name = ?" + (isKey ? " AND kind = ?" : "");
+  SqliteStatement find(*_database, query.c_str());
+  find.bind(1, text);
+  if (isKey) {
+    find.bind(2, static_cast<std::int64_t>(kind));
+  }
+  return find.step() ? std::optional(find.integer(0)) : std::nullopt;
+}
+
+/// The same, where a text that is not there gets a number.
+std::int64_t SqliteStore::numberOf(const std::string& table, KeyKind kind, std::string_view text) {
   std::string cached = table;
   cached.append(kind == KeyKind::Scalar ? "\1" : "\2").append(text);
   if (const auto known = _numbers.find(cached); known != _numbers.end()) {
     return known->second;
   }
-  const std::string where =
-      std::string(table) + (isKey ? " WHERE name = ? AND kind = ?" : " WHERE name = ?");
-  SqliteStatement find(*_database, ("SELECT number FROM " + where).c_str());
-  find.bind(1, text);
-  if (isKey) {
-    find.bind(2, static_cast<std::int64_t>(kind));
-  }
-  std::int64_t number = 0;
-  if (find.step()) {
-    number = find.integer(0);
-  } else {
-    SqliteStatement insert(*_database, (std::string("INSERT INTO ") + table +
-                                        (isKey ? "(name, kind) VALUES(?, ?)" : "(name) VALUES(?)"))
-                                           .c_str());
+  std::optional<std::int64_t> number = findNumber(table, kind, text);
+  if (!number) {
+    const bool isKey = table == "key";
+    const std::string query =
+        "INSERT INTO " + table + (isKey ? "(name, kind) VALUES(?, ?)" : "(name) VALUES(?)");
+    SqliteStatement insert(*_database, query.c_str());
     insert.bind(1, text);
     if (isKey) {
       insert.bind(2, static_cast<std::int64_t>(kind));
@@ -259,12 +260,12 @@ std::int64_t SqliteStore::numberOf(const char* table, KeyKind kind, std::string_
     insert.run();
     number = sqlite3_last_insert_rowid(_database->handle());
   }
-  return _numbers.emplace(std::move(cached), number).first->second;
+  return _numbers.emplace(std::move(cached), *number).first->second;
 }
 
 /// Removes the line that `line` takes the place of; false when that one holds on.
 bool SqliteStore::replacesEarlier(const ExportedLine& line, std::int64_t device) {
-  SqliteStatement& find = _statements->find;
+  SqliteStatement& find = _statements->findLine;
   find.bind(1, line.day).bind(2, device);
   bool replaces = true;
   std::optional<std::int64_t> earlier;
@@ -441,12 +442,6 @@ std::vector<SqliteStore::Line> SqliteStore::linesThatHold(const DayRange& days) 
   return lines;
 }
 
-std::optional<std::int64_t> SqliteStore::findKey(KeyKind kind, std::string_view key) {
-  SqliteStatement find(*_database, "SELECT number FROM key WHERE name = ? AND kind = ?");
-  find.bind(1, key).bind(2, static_cast<std::int64_t>(kind));
-  return find.step() ? std::optional(find.integer(0)) : std::nullopt;
-}
-
 /// Visits the entries of a key whose lines hold. Both ascend by the lines' numbers.
 template <typename Value, typename Visit>
 void SqliteStore::visitEntries(std::int64_t key, const std::vector<Line>& lines,
@@ -523,7 +518,7 @@ void SqliteStore::visitScalars(std::string_view key, const DayRange& days,
                                const VisitScalar& visit) {
   guarded([&] {
     _database->execute("BEGIN");  // one state of the store, until it is closed
-    if (const auto number = findKey(KeyKind::Scalar, key)) {
+    if (const auto number = findNumber("key", KeyKind::Scalar, key)) {
       visitEntries<std::int64_t>(
           *number, linesThatHold(days),
           [&](const Line& line, std::int64_t value, std::string_view) { visit(line.day, value); });
@@ -535,7 +530,7 @@ void SqliteStore::visitDistributions(std::string_view key, const DayRange& days,
                                      const VisitDistribution& visit) {
   guarded([&] {
     _database->execute("BEGIN");  // one state of the store, until it is closed
-    const auto number = findKey(KeyKind::Distribution, key);
+    const auto number = findNumber("key", KeyKind::Distribution, key);
     if (!number) {
       return;
     }

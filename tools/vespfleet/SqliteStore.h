@@ -51,18 +51,19 @@ class SqliteStore : public FleetStore {
     std::int64_t last = 0;   ///< line number of its last entry, 0 when empty
     std::string entries;
   };
-  class Statements;
+  struct Statements;
 
   bool replacesEarlier(const ExportedLine& line, std::int64_t device);
   void append(std::int64_t key, std::int64_t line, std::string_view value);
   void write(Tail& tail);
   Tail& tailOf(std::int64_t key);
-  std::int64_t numberOf(const char* table, KeyKind kind, std::string_view text);
+  std::optional<std::int64_t> findNumber(const std::string& table, KeyKind kind,
+                                         std::string_view text);
+  std::int64_t numberOf(const std::string& table, KeyKind kind, std::string_view text);
   void beginBatch();
   void commitBatch();
   void writeAnew();
   std::vector<Line> linesThatHold(const DayRange& days);
-  std::optional<std::int64_t> findKey(KeyKind kind, std::string_view key);
   template <typename Value, typename Visit>
   void visitEntries(std::int64_t key, const std::vector<Line>& lines, const Visit& visit);
   template <typename Visit>

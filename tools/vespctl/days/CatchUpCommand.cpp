@@ -100,9 +100,10 @@ void addCatchUpCommand(CLI::App& vespctl) {
     std::uint32_t last = 7;
   };
   const auto arguments = std::make_shared<Arguments>();
-  CLI::App* command = vespctl.add_subcommand(
-      "catch-up", "Submits the reports of days that no daily log tells of, and prints the days");
-  command->add_option("DIR", arguments->directory, "The device directory")->required();
+  CLI::App* command = addDeviceCommand(
+      vespctl, "catch-up",
+      "Submits the reports of days that no daily log tells of, and prints the days",
+      arguments->directory);
   command->add_option("--last", arguments->last, "How many days, the day before yesterday the last")
       ->check(decimal<std::uint32_t>());
   command->callback([arguments] { catchUp(arguments->directory, arguments->last); });

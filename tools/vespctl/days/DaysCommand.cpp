@@ -78,9 +78,9 @@ void addDaysCommand(CLI::App& vespctl) {
     std::uint32_t last = 14;
   };
   const auto arguments = std::make_shared<Arguments>();
-  CLI::App* command = vespctl.add_subcommand(
-      "days", "Prints what is kept of the last days, and which daily logs tell of them");
-  command->add_option("DIR", arguments->directory, "The device directory")->required();
+  CLI::App* command = addDeviceCommand(
+      vespctl, "days", "Prints what is kept of the last days, and which daily logs tell of them",
+      arguments->directory);
   command->add_option("--last", arguments->last, "How many days, today the last of them")
       ->check(decimal<std::uint32_t>());
   command->callback([arguments] { showDays(arguments->directory, arguments->last); });

@@ -66,8 +66,8 @@ void addDeviceCommands(CLI::App& vespctl) {
                  "for them, instead of one for what collect writes");
   init->callback([arguments] { initDevice(arguments->directory, arguments->sample); });
 
-  CLI::App* run = vespctl.add_subcommand("run", "Does what vesprun does, on that device");
-  run->add_option("DIR", arguments->directory, "The device directory")->required();
+  CLI::App* run = addDeviceCommand(vespctl, "run", "Does what vesprun does, on that device",
+                                   arguments->directory);
   run->add_option("ARG", arguments->job, "What vesprun is given, behind --");
   run->callback([arguments] { runJob(arguments->directory, arguments->job); });
 }

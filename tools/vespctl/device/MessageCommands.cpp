@@ -162,8 +162,8 @@ void addMessageCommands(CLI::App& vespctl) {
   };
   const auto arguments = std::make_shared<Arguments>();
 
-  CLI::App* send = vespctl.add_subcommand("send", "Sends messages to a running vesprun");
-  send->add_option("DIR", arguments->device, "The device directory")->required();
+  CLI::App* send =
+      addDeviceCommand(vespctl, "send", "Sends messages to a running vesprun", arguments->device);
 
   send->add_subcommand("logging", "Notifies the logging status")->callback([arguments] {
     sendDocument(arguments->device, operationDocument(0));

@@ -157,8 +157,8 @@ void showAll(const DeviceDirectory& directory) {
 
 void addOutboxCommands(CLI::App& vespctl) {
   const auto path = std::make_shared<std::string>();
-  CLI::App* show = vespctl.add_subcommand("show", "Shows what the runs left in the outbox");
-  show->add_option("DIR", *path, "The device directory")->required();
+  CLI::App* show =
+      addDeviceCommand(vespctl, "show", "Shows what the runs left in the outbox", *path);
   show->callback([show, path] {
     if (show->get_subcommands().empty()) {
       showAll(openDirectory(*path));
