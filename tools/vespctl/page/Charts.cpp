@@ -85,9 +85,6 @@ std::string lineThrough(const std::vector<Point>& points, std::size_t from, std:
   return steps.find('L') == std::string::npos ? steps + "h0" : steps;  // a dot is seen, too
 }
 
-double logarithmOf(double value) { return std::log10(value); }
-double valueItself(double value) { return value; }
-
 }  // namespace
 
 std::string sparkline(const std::vector<Point>& all, Period period, double longestStep,
@@ -130,7 +127,8 @@ std::string bandChart(const std::vector<BandPoint>& points, Period period,
     return "";
   }
   const auto [low, high] = rangeOf(points);
-  const auto shown = isLogarithmic(low, high) ? logarithmOf : valueItself;
+  const bool isOverLogarithm = isLogarithmic(low, high);
+  const auto shown = [=](double value) { return isOverLogarithm ? std::log10(value) : value; };
   const Scale across(period.first, period.last, kMargin, kWidth - kMargin);
   const Scale up(shown(low), shown(high), kHeight - 1, 1);
   std::string area;
