@@ -106,15 +106,6 @@ void makeStore(const std::string& path) {
   }
 }
 
-/// Reads one value of a chunk; `Value` is what the entries stand for.
-template <typename Value>
-Value readValue(PackedReader& entries);
-
-template <>
-std::int64_t readValue(PackedReader& entries) {
-  return entries.signedInteger();
-}
-
 /// Labels by their numbers in `label`.
 struct PackedDistribution {
   Statistics statistics;
@@ -122,8 +113,7 @@ struct PackedDistribution {
   std::vector<std::pair<std::int64_t, std::uint64_t>> counts;
 };
 
-template <>
-PackedDistribution readValue(PackedReader& entries) {
+PackedDistribution readDistribution(PackedReader& entries) {
   PackedDistribution value;
   value.statistics.minimum = entries.raw<double>();
   value.statistics.maximum = entries.raw<double>();
@@ -139,18 +129,12 @@ PackedDistribution readValue(PackedReader& entries) {
   return value;
 }
 
-/// What is read of a value when only its line matters.
-template <KeyKind kind>
-struct PassedOver {};
-
-template <>
-PassedOver<KeyKind::Scalar> readValue(PackedReader& entries) {
-  entries.varint();
-  return {};
-}
-
-template <>
-PassedOver<KeyKind::Distribution> readValue(PackedReader& entries) {
+/// Reads a value of which only the line matters.
+void passOver(KeyKind kind, PackedReader& entries) {
+  if (kind == KeyKind::Scalar) {
+    entries.varint();
+    return;
+  }
   for (int number = 0; number < 4; ++number) {
     entries.raw<double>();
   }
@@ -159,7 +143,6 @@ PassedOver<KeyKind::Distribution> readValue(PackedReader& entries) {
     entries.varint();
     entries.varint();
   }
-  return {};
 }
 
 }  // namespace
@@ -411,10 +394,14 @@ void SqliteStore::writeAnew() {
   while (keys.step()) {
     const std::int64_t key = keys.integer(0);
     std::vector<std::pair<std::int64_t, std::string>> kept;
-    visitPackedEntries(static_cast<KeyKind>(keys.integer(1)), key, lines,
-                       [&kept](const Line& line, std::string_view packed) {
-                         kept.emplace_back(line.number, packed);
-                       });
+    const auto kind = static_cast<KeyKind>(keys.integer(1));
+    visitEntries(key, lines, [&](PackedReader& entries, const Line* line) {
+      const char* const begin = entries.position();
+      passOver(kind, entries);
+      if (line != nullptr) {
+        kept.emplace_back(line->number, std::string(begin, entries.position()));
+      }
+    });
     remove.bind(1, key * kChunksOfKey).bind(2, (key + 1) * kChunksOfKey).run();
     for (const auto& [line, packed] : kept) {
       append(key, line, packed);
@@ -442,10 +429,10 @@ std::vector<SqliteStore::Line> SqliteStore::linesThatHold(const DayRange& days) 
   return lines;
 }
 
-/// Visits the entries of a key whose lines hold. Both ascend by the lines' numbers.
-template <typename Value, typename Visit>
-void SqliteStore::visitEntries(std::int64_t key, const std::vector<Line>& lines,
-                               const Visit& visit) {
+/// Calls `read` for each entry of a key, to read its value, with its line, or null when that does
+/// not hold. Entries and lines ascend by the lines' numbers.
+template <typename Read>
+void SqliteStore::visitEntries(std::int64_t key, const std::vector<Line>& lines, const Read& read) {
   SqliteStatement chunks(*_database,
                          "SELECT entries FROM chunk WHERE number >= ? AND number < ?"
                          " ORDER BY number");
@@ -456,29 +443,11 @@ void SqliteStore::visitEntries(std::int64_t key, const std::vector<Line>& lines,
     std::int64_t number = 0;
     while (!entries.atEnd()) {
       number += static_cast<std::int64_t>(entries.varint());
-      const char* const begin = entries.position();
-      const Value value = readValue<Value>(entries);
       while (line != lines.end() && line->number < number) {
         ++line;
       }
-      if (line != lines.end() && line->number == number) {
-        visit(*line, value, std::string_view(begin, entries.position()));
-      }
+      read(entries, line != lines.end() && line->number == number ? &*line : nullptr);
     }
-  }
-}
-
-/// The same without reading the values.
-template <typename Visit>
-void SqliteStore::visitPackedEntries(KeyKind kind, std::int64_t key, const std::vector<Line>& lines,
-                                     const Visit& visit) {
-  const auto pass = [&visit](const Line& line, const auto& /*value*/, std::string_view packed) {
-    visit(line, packed);
-  };
-  if (kind == KeyKind::Scalar) {
-    visitEntries<PassedOver<KeyKind::Scalar>>(key, lines, pass);
-  } else {
-    visitEntries<PassedOver<KeyKind::Distribution>>(key, lines, pass);
   }
 }
 
@@ -500,12 +469,15 @@ void SqliteStore::visitKeys(const VisitKey& visit) {
     while (keys.step()) {
       const std::int64_t key = keys.integer(0);
       ReportedKey reported{std::string(keys.text(1)), static_cast<KeyKind>(keys.integer(2)), 0, 0};
-      visitPackedEntries(reported.kind, key, lines, [&](const Line& line, std::string_view) {
-        std::int64_t& onDay = keyOfDay[static_cast<std::size_t>(line.day)];
-        std::int64_t& onDevice = keyOfDevice[static_cast<std::size_t>(line.device)];
-        reported.days += onDay != key ? 1 : 0;
-        reported.devices += onDevice != key ? 1 : 0;
-        onDay = onDevice = key;
+      visitEntries(key, lines, [&](PackedReader& entries, const Line* line) {
+        passOver(reported.kind, entries);
+        if (line != nullptr) {
+          std::int64_t& onDay = keyOfDay[static_cast<std::size_t>(line->day)];
+          std::int64_t& onDevice = keyOfDevice[static_cast<std::size_t>(line->device)];
+          reported.days += onDay != key ? 1 : 0;
+          reported.devices += onDevice != key ? 1 : 0;
+          onDay = onDevice = key;
+        }
       });
       if (reported.devices > 0) {
         visit(reported);
@@ -519,9 +491,12 @@ void SqliteStore::visitScalars(std::string_view key, const DayRange& days,
   guarded([&] {
     _database->execute("BEGIN");  // one state of the store, until it is closed
     if (const auto number = findNumber("key", KeyKind::Scalar, key)) {
-      visitEntries<std::int64_t>(
-          *number, linesThatHold(days),
-          [&](const Line& line, std::int64_t value, std::string_view) { visit(line.day, value); });
+      visitEntries(*number, linesThatHold(days), [&](PackedReader& entries, const Line* line) {
+        const std::int64_t value = entries.signedInteger();
+        if (line != nullptr) {
+          visit(line->day, value);
+        }
+      });
     }
   });
 }
@@ -536,27 +511,29 @@ void SqliteStore::visitDistributions(std::string_view key, const DayRange& days,
     }
     std::unordered_map<std::int64_t, std::string> labels;
     SqliteStatement label(*_database, "SELECT name FROM label WHERE number = ?");
-    visitEntries<PackedDistribution>(
-        *number, linesThatHold(days),
-        [&](const Line& line, const PackedDistribution& packed, std::string_view) {
-          Distribution distribution{packed.statistics, std::nullopt};
-          if (packed.hasHistogram) {
-            distribution.histogram.emplace();
+    visitEntries(*number, linesThatHold(days), [&](PackedReader& entries, const Line* line) {
+      const PackedDistribution packed = readDistribution(entries);
+      if (line == nullptr) {
+        return;
+      }
+      Distribution distribution{packed.statistics, std::nullopt};
+      if (packed.hasHistogram) {
+        distribution.histogram.emplace();
+      }
+      for (const auto& [numberOfLabel, count] : packed.counts) {
+        const auto [name, isNew] = labels.try_emplace(numberOfLabel);
+        if (isNew) {
+          label.bind(1, numberOfLabel);
+          if (!label.step()) {
+            throw std::out_of_range("a label that is not there");
           }
-          for (const auto& [numberOfLabel, count] : packed.counts) {
-            const auto [name, isNew] = labels.try_emplace(numberOfLabel);
-            if (isNew) {
-              label.bind(1, numberOfLabel);
-              if (!label.step()) {
-                throw std::out_of_range("a label that is not there");
-              }
-              name->second = label.text(0);
-              label.reset();
-            }
-            (*distribution.histogram)[name->second] = count;
-          }
-          visit(line.day, distribution);
-        });
+          name->second = label.text(0);
+          label.reset();
+        }
+        (*distribution.histogram)[name->second] = count;
+      }
+      visit(line->day, distribution);
+    });
   });
 }
 

@@ -1,7 +1,5 @@
 #pragma once
 
-#include <functional>
-#include <map>
 #include <memory>
 #include <optional>
 #include <string>
@@ -64,11 +62,8 @@ class SqliteStore : public FleetStore {
   void commitBatch();
   void writeAnew();
   std::vector<Line> linesThatHold(const DayRange& days);
-  template <typename Value, typename Visit>
-  void visitEntries(std::int64_t key, const std::vector<Line>& lines, const Visit& visit);
-  template <typename Visit>
-  void visitPackedEntries(KeyKind kind, std::int64_t key, const std::vector<Line>& lines,
-                          const Visit& visit);
+  template <typename Read>
+  void visitEntries(std::int64_t key, const std::vector<Line>& lines, const Read& read);
   template <typename Task>
   auto guarded(const Task& task);
 

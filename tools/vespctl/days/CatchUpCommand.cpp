@@ -1,6 +1,4 @@
-#include <algorithm>
 #include <cstdint>
-#include <limits>
 #include <optional>
 #include <set>
 #include <string>

@@ -4,7 +4,6 @@
 #include <limits>
 #include <map>
 #include <string>
-#include <vector>
 
 #include "Command.h"
 #include "Complaints.h"

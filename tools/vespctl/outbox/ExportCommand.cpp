@@ -2,8 +2,6 @@
 
 #include <array>
 #include <cstdint>
-#include <cstdio>
-#include <iostream>
 #include <limits>
 
 #include "Command.h"

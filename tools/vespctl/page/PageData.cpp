@@ -1,6 +1,5 @@
 #include "page/PageData.h"
 
-#include <algorithm>
 #include <charconv>
 #include <sstream>
 #include <utility>

@@ -1,7 +1,6 @@
 #include "sample/SampleDevice.h"
 
 #include <cstdlib>
-#include <string_view>
 #include <vector>
 
 #include "Command.h"
