@@ -87,36 +87,19 @@ void writeFile(const fs::path& path, const std::string& content) {
 }
 
 Companion::Companion(const std::vector<std::string>& command, const std::string& folder,
-                     const std::string& input)
-    : _output(std::tmpfile()) {
-  std::vector<char*> arguments;
-  for (const std::string& argument : command) {
-    arguments.push_back(const_cast<char*>(argument.c_str()));  // NOLINT: execv changes nothing
-  }
-  arguments.push_back(nullptr);
-  FILE* in = std::tmpfile();
-  if (in == nullptr || _output == nullptr) {
-    throw std::runtime_error("no temporary file can be made");
-  }
-  std::fwrite(input.data(), 1, input.size(), in);
-  std::rewind(in);
+                     const std::string& input) {
+  const TextFile in(input);
   _child = fork();
   if (_child == 0) {
-    dup2(fileno(in), STDIN_FILENO);
-    dup2(fileno(_output), STDOUT_FILENO);
-    dup2(fileno(_output), STDERR_FILENO);
+    dup2(in.descriptor(), STDIN_FILENO);
+    dup2(_output.descriptor(), STDOUT_FILENO);
+    dup2(_output.descriptor(), STDERR_FILENO);
     alarm(60);
     if (chdir(folder.c_str()) == 0) {
-      execv(arguments[0], arguments.data());
+      runInstead(command);
     }
     _exit(126);
   }
-  std::fclose(in);
-}
-
-Companion::~Companion() {
-  status();
-  std::fclose(_output);
 }
 
 bool Companion::endsWithin(int milliseconds) {
@@ -134,16 +117,6 @@ int Companion::status() {
     _ended = waitpid(_child, &_status, 0) == _child || errno != EINTR;
   }
   return WIFEXITED(_status) ? WEXITSTATUS(_status) : -1;
-}
-
-std::string Companion::output() const {
-  std::string text;
-  std::rewind(_output);
-  char piece[65536];
-  for (std::size_t got = 0; (got = std::fread(piece, 1, sizeof piece, _output)) > 0;) {
-    text.append(piece, got);
-  }
-  return text;
 }
 
 Device::Device(const Programs& programs, const fs::path& folder)

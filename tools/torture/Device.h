@@ -2,11 +2,12 @@
 
 #include <sys/types.h>
 
-#include <cstdio>
 #include <filesystem>
 #include <map>
 #include <string>
 #include <vector>
+
+#include "TracedRun.h"
 
 namespace vesprun::torture {
 
@@ -67,18 +68,18 @@ class Companion {
             const std::string& input = {});
   Companion(const Companion&) = delete;
   Companion& operator=(const Companion&) = delete;
-  ~Companion();
+  ~Companion() { status(); }
 
   /// True when it ended within the time.
   bool endsWithin(int milliseconds);
   /// Waits for its end; the exit status, -1 for a signal.
   int status();
   /// What it printed on both streams.
-  std::string output() const;
+  std::string output() const { return _output.text(); }
 
  private:
-  FILE* _output;
-  pid_t _child;
+  TextFile _output;
+  pid_t _child = -1;
   int _status = 0;
   bool _ended = false;
 };

@@ -243,36 +243,47 @@ std::size_t firstOwnCall(const std::vector<Call>& calls) {
   return static_cast<std::size_t>(last - calls.begin()) + 1;
 }
 
-std::vector<Case> failingCalls(const Programs& programs, const fs::path& folder, std::uint32_t seed,
-                               bool full) {
-  const auto reference = makeReference(programs, folder / "calls");
-  const std::size_t own = firstOwnCall(reference->calls);
+using RunWithFault = std::function<Faults(const fs::path& work, const Fault& fault, bool started)>;
+
+/// Each call fails in one way or, when wanted, in all, transfers half where `alsoShort` asks for
+/// it, and is the last one.
+std::vector<Case> faultsOfCalls(const std::string& name, const std::vector<Call>& calls,
+                                std::uint32_t seed, bool full, bool alsoShort,
+                                const RunWithFault& run) {
+  const std::size_t own = firstOwnCall(calls);
   std::vector<Case> cases;
   std::mt19937 random(seed);
-  for (std::size_t index = 0; index < reference->calls.size(); ++index) {
-    const Call& call = reference->calls[index];
-    const std::string place = ":" + nameOfCall(call.number) + ":" + std::to_string(index + 1);
+  for (std::size_t index = 0; index < calls.size(); ++index) {
+    const int number = calls[index].number;
     const bool started = index >= own;
     const auto add = [&](const std::string& what, Fault fault) {
       fault.call = index + 1;
-      cases.push_back({what + place, [=](const fs::path& work) {
-                         return runWithFault(*reference, work, fault, started);
-                       }});
+      cases.push_back({name + what + ":" + nameOfCall(number) + ":" + std::to_string(index + 1),
+                       [=](const fs::path& work) { return run(work, fault, started); }});
     };
-    const std::vector<int>& errors = fittingErrors(call.number);
+    const std::vector<int>& errors = fittingErrors(number);
     const std::size_t one = errors.empty() ? 0 : random() % errors.size();
     for (std::size_t each = 0; each < errors.size(); ++each) {
       if (full || each == one) {
         add(strerrorname_np(errors[each]),
-            {.kind = Fault::Kind::Error, .number = call.number, .error = errors[each]});
+            {.kind = Fault::Kind::Error, .number = number, .error = errors[each]});
       }
     }
-    if (transfersBytes(call.number) && started) {
-      add("short", {.kind = Fault::Kind::Short, .number = call.number});
+    if (alsoShort && started && transfersBytes(number)) {
+      add("short", {.kind = Fault::Kind::Short, .number = number});
     }
     add("kill", {.kind = Fault::Kind::Kill});
   }
   return cases;
+}
+
+std::vector<Case> failingCalls(const Programs& programs, const fs::path& folder, std::uint32_t seed,
+                               bool full) {
+  const auto reference = makeReference(programs, folder / "calls");
+  return faultsOfCalls("", reference->calls, seed, full, true,
+                       [=](const fs::path& work, const Fault& fault, bool started) {
+                         return runWithFault(*reference, work, fault, started);
+                       });
 }
 
 std::vector<Case> fullDisk(const Programs& programs, const fs::path& folder, std::uint32_t seed,
@@ -402,7 +413,6 @@ Faults runCommand(const Command& command, const fs::path& folder, const Fault& f
   return faults;
 }
 
-// Each call fails in one way or, when wanted, in all, and is the last one.
 std::vector<Case> casesOf(const Command& command, const fs::path& folder, std::uint32_t seed,
                           bool full) {
   Device device(*command.original, folder / "reference");
@@ -414,29 +424,10 @@ std::vector<Case> casesOf(const Command& command, const fs::path& folder, std::u
   if (!wrong.empty()) {
     throw std::runtime_error(command.name + " without any fault: " + wrong.front());
   }
-  const std::size_t own = firstOwnCall(reference.calls);
-  std::vector<Case> cases;
-  std::mt19937 random(seed);
-  for (std::size_t index = 0; index < reference.calls.size(); ++index) {
-    const int number = reference.calls[index].number;
-    const auto add = [&](const std::string& what, Fault fault) {
-      fault.call = index + 1;
-      const bool started = index >= own;
-      cases.push_back(
-          {command.name + ":" + what + ":" + nameOfCall(number) + ":" + std::to_string(index + 1),
-           [=](const fs::path& work) { return runCommand(command, work, fault, started); }});
-    };
-    const std::vector<int>& errors = fittingErrors(number);
-    const std::size_t one = errors.empty() ? 0 : random() % errors.size();
-    for (std::size_t each = 0; each < errors.size(); ++each) {
-      if (full || each == one) {
-        add(strerrorname_np(errors[each]),
-            {.kind = Fault::Kind::Error, .number = number, .error = errors[each]});
-      }
-    }
-    add("kill", {.kind = Fault::Kind::Kill});
-  }
-  return cases;
+  return faultsOfCalls(command.name + ":", reference.calls, seed, full, false,
+                       [=](const fs::path& work, const Fault& fault, bool started) {
+                         return runCommand(command, work, fault, started);
+                       });
 }
 
 /// All lines or none, and never "done" without them.

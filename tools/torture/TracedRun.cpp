@@ -420,36 +420,37 @@ Outcome Tracer::run() {
   return std::move(_outcome);
 }
 
-/// What the program prints goes into a file: a pipe would have to be emptied beside the tracing.
-class PrintedText {
- public:
-  PrintedText() : _file(memfd_create("printed", MFD_CLOEXEC)) {}
-  PrintedText(const PrintedText&) = delete;
-  PrintedText& operator=(const PrintedText&) = delete;
-  ~PrintedText() { close(_file); }
-  int descriptor() const { return _file; }
-  std::string text() const {
-    std::string text(static_cast<std::size_t>(std::max<off_t>(lseek(_file, 0, SEEK_END), 0)), ' ');
-    const ssize_t got = pread(_file, text.data(), text.size(), 0);
-    text.resize(static_cast<std::size_t>(std::max<ssize_t>(got, 0)));
-    return text;
-  }
-
- private:
-  int _file;
-};
-
 }  // namespace
 
-Outcome runTraced(const std::vector<std::string>& command, const std::string& folder,
-                  const Fault& fault) {
+TextFile::TextFile(const std::string& text) : _file(memfd_create("text", MFD_CLOEXEC)) {
+  if (_file < 0 ||
+      pwrite(_file, text.data(), text.size(), 0) != static_cast<ssize_t>(text.size())) {
+    throw std::runtime_error("no temporary file can be made");
+  }
+}
+
+TextFile::~TextFile() { close(_file); }
+
+std::string TextFile::text() const {
+  std::string text(static_cast<std::size_t>(std::max<off_t>(lseek(_file, 0, SEEK_END), 0)), ' ');
+  const ssize_t got = pread(_file, text.data(), text.size(), 0);
+  text.resize(static_cast<std::size_t>(std::max<ssize_t>(got, 0)));
+  return text;
+}
+
+void runInstead(const std::vector<std::string>& command) {
   std::vector<char*> arguments;
   for (const std::string& argument : command) {
     arguments.push_back(const_cast<char*>(argument.c_str()));  // NOLINT: execv changes nothing
   }
   arguments.push_back(nullptr);
-  const PrintedText output;
-  const PrintedText errors;
+  execv(arguments[0], arguments.data());
+}
+
+Outcome runTraced(const std::vector<std::string>& command, const std::string& folder,
+                  const Fault& fault) {
+  const TextFile output;
+  const TextFile errors;
   const pid_t child = fork();
   if (child < 0) {
     throw std::runtime_error("fork: " + std::string(std::strerror(errno)));
@@ -462,7 +463,7 @@ Outcome runTraced(const std::vector<std::string>& command, const std::string& fo
     if (setpgid(0, 0) == 0 && chdir(folder.c_str()) == 0 &&
         ptrace(PTRACE_TRACEME, 0, nullptr, nullptr) == 0) {
       raise(SIGSTOP);
-      execv(arguments[0], arguments.data());
+      runInstead(command);
     }
     _exit(126);
   }

@@ -7,6 +7,25 @@
 
 namespace vesprun::torture {
 
+/// A file without a name, for what a program reads or prints: a pipe would have to be emptied
+/// meanwhile.
+class TextFile {
+ public:
+  explicit TextFile(const std::string& text = {});
+  TextFile(const TextFile&) = delete;
+  TextFile& operator=(const TextFile&) = delete;
+  ~TextFile();
+
+  int descriptor() const { return _file; }
+  std::string text() const;
+
+ private:
+  int _file;
+};
+
+/// Replaces this process by a program; comes back when that fails.
+void runInstead(const std::vector<std::string>& command);
+
 /// What goes wrong during one run of a program.
 struct Fault {
   enum class Kind {

@@ -1,12 +1,9 @@
-#include <algorithm>
 #include <cstdint>
-#include <limits>
 #include <optional>
 #include <set>
 #include <string>
 
 #include "Command.h"
-#include "days/DailyWork.h"
 #include "outbox/SubmittedLogs.h"
 #include "platform/Platform.h"
 #include "platform/host/counters/HostTallybook.h"
@@ -23,11 +20,7 @@ std::set<std::int32_t> reportedDays(const DeviceDirectory& directory) {
   std::set<std::int32_t> days;
   nameUnreadable(
       forEachSubmittedLog(directory, [&days](SubmittedLog&& log) { days.insert(log.day); }));
-  std::string error;
-  const std::optional<PrunedLogs> pruned = readPrunedLogs(directory, error);
-  if (!pruned) {
-    throw CommandFailure(error);
-  }
+  const auto pruned = orFail([&](std::string& error) { return readPrunedLogs(directory, error); });
   for (const PrunedLog& log : *pruned) {
     days.insert(log.day);
   }
@@ -46,10 +39,7 @@ std::vector<std::int32_t> missedDays(HostTallybook& counters, std::int64_t first
       }
     }
   };
-  std::string error;
-  if (!counters.read(find, error)) {
-    throw CommandFailure(error);
-  }
+  orFail([&](std::string& error) { return counters.read(find, error); });
   return days;
 }
 
@@ -108,9 +98,10 @@ void addCatchUpCommand(CLI::App& vespctl) {
     std::uint32_t last = 7;
   };
   const auto arguments = std::make_shared<Arguments>();
-  CLI::App* command = vespctl.add_subcommand(
-      "catch-up", "Submits the reports of days that no daily log tells of, and prints the days");
-  command->add_option("DIR", arguments->directory, "The device directory")->required();
+  CLI::App* command = addDeviceCommand(
+      vespctl, "catch-up",
+      "Submits the reports of days that no daily log tells of, and prints the days",
+      arguments->directory);
   command->add_option("--last", arguments->last, "How many days, the day before yesterday the last")
       ->check(decimal<std::uint32_t>());
   command->callback([arguments] { catchUp(arguments->directory, arguments->last); });

@@ -33,6 +33,9 @@ struct SubmittedLogs {
   std::vector<UnreadableLog> unreadable;
 };
 
+/// What lies in the folder of submitted logs. Throws `CommandFailure` when it cannot be read.
+std::vector<std::string> namesOfLogs(const DeviceDirectory& directory);
+
 /// True for the names that daily logs have.
 bool isDailyLogName(std::string_view name);
 

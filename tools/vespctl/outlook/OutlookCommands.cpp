@@ -181,9 +181,8 @@ void explainKey(const OutlookArguments& arguments) {
 void addOutlookCommands(CLI::App& vespctl) {
   const auto arguments = std::make_shared<OutlookArguments>();
 
-  CLI::App* preview =
-      vespctl.add_subcommand("preview", "Prints the daily log that a run would submit now");
-  preview->add_option("DIR", arguments->directory, "The device directory")->required();
+  CLI::App* preview = addDeviceCommand(
+      vespctl, "preview", "Prints the daily log that a run would submit now", arguments->directory);
   preview->add_option("--day", arguments->day, "The day number, instead of yesterday's")
       ->transform(decimal<std::int32_t>());
   CLI::Option* document =
@@ -200,9 +199,8 @@ void addOutlookCommands(CLI::App& vespctl) {
     }
   });
 
-  CLI::App* explain =
-      vespctl.add_subcommand("explain", "Says why a key leaves the device or stays");
-  explain->add_option("DIR", arguments->directory, "The device directory")->required();
+  CLI::App* explain = addDeviceCommand(
+      vespctl, "explain", "Says why a key leaves the device or stays", arguments->directory);
   explain->add_option("KEY", arguments->key, "The key of a counter")->required();
   explain->add_flag("--distribution", arguments->isDistribution,
                     "The key is one of a distribution, not of a scalar");

@@ -61,8 +61,10 @@ struct PageData {
  private:
   void takeDays();
   void takeLogs(const DeviceDirectory& directory);
-  void takeEvents(const DeviceDirectory& directory);
-  void takeRecords(const DeviceDirectory& directory);
+  template <typename Take>
+  void takeLines(const DeviceDirectory& directory, const std::string& name, Take take);
+  void takeEvent(const PropertyDict& line);
+  void takeRecord(const PropertyDict& line);
 };
 
 }  // namespace vesprun

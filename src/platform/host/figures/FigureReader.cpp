@@ -20,7 +20,7 @@ namespace vesprun {
 namespace {
 
 constexpr std::size_t kLongestFile = 256 * 1024;
-constexpr std::size_t kMostDevices = 128;
+constexpr std::size_t kMostDevices = 512;
 constexpr std::size_t kLongestName = 40;
 constexpr std::size_t kAddressDigits = 12;
 constexpr std::string_view kClockFile = "clock";
@@ -175,10 +175,8 @@ class FigureReader {
       if (content) {
         const std::string_view word = fieldOf(*content, figure.field);
         value = numberOf(word);
-        if (value) {
-          *value /= figure.divisor;
-        }
-        if (!value || *value < figure.lowest || *value > figure.highest) {
+        if (!value || *value < figure.lowest * figure.divisor ||
+            *value / figure.divisor > figure.highest) {
           complain(path, std::string(figure.field) + (word.empty() ? " is missing"
                                                       : value      ? " is out of range"
                                                                    : " is not a number"));
@@ -186,7 +184,7 @@ class FigureReader {
         }
       }
       if (value || (device.isThere && figure.kind == FigureKind::Counter)) {
-        add(figure, path, device, value.value_or(kUnread));
+        add(figure, path, device, value ? *value / figure.divisor : kUnread);
       }
     }
   }
@@ -289,7 +287,7 @@ class FigureReader {
         continue;
       }
       if (names.size() == kMostDevices) {
-        complain(folder, "more than 128 devices");
+        complain(folder, "more than " + std::to_string(kMostDevices) + " devices");
         return std::nullopt;
       }
       names.emplace_back(entry->d_name);
@@ -299,7 +297,10 @@ class FigureReader {
   }
 
   void complain(const std::string& path, const std::string& problem) {
-    _readings.problems.try_emplace(path, problem);
+    std::string& problems = _readings.problems[path];
+    if (problems.find(problem) == std::string::npos) {
+      problems += (problems.empty() ? "" : ", ") + problem;
+    }
   }
 
   const std::string& _root;
