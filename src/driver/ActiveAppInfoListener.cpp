@@ -37,6 +37,7 @@ std::string textForm(const AppInfoList& list) {
   std::string text;
   list.forEach([&text](const PropertyDict& app) {
     text += (text.empty() ? "(" : ", ") + textForm(PropertyValue(app));
+    return true;
   });
   return text.empty() ? "()" : text + ')';
 }

@@ -214,7 +214,7 @@ class UsageReply {
       addOne("datausage.olddata.", *name);
     }
     std::string error;
-    if (_services.serialization.serialize({{name->name, after}}, error)) {
+    if (_services.serialization.canSerialize({PropertyDict{{name->name, after}}}, error)) {
       _newBaseline.set(name->name, std::move(after));
       _hasGrowth = _hasGrowth || _additions.size() > additionsBefore;
     }

@@ -279,14 +279,22 @@ TEST_F(DailyDriverTest, AppsKeepFiveEntriesWhateverIsMissing) {
   odd.set("arch", 2.9);
   odd.set("uuid", Bytes(15, 1));
   const PropertyValue apps(PropertyArray{sampleApp(), "no app", PropertyDict{}, odd});
-  const PropertyArray list = AppInfoList(&apps).array();
+  const auto listOf = [](const PropertyValue& data) {
+    PropertyArray list;
+    AppInfoList(&data).forEach([&list](const PropertyDict& app) {
+      list.emplace_back(app);
+      return true;
+    });
+    return list;
+  };
+  const PropertyArray list = listOf(apps);
   ASSERT_THAT(list, SizeIs(3));
   EXPECT_EQ(textForm(PropertyArray{list[0]}), kSampleText);
   EXPECT_EQ(textForm(list[1]), "{bundle = ; version = ; adamID = 0; arch = 0; uuid = }");
   EXPECT_EQ(textForm(list[2]), "{bundle = ; version = 1.2; adamID = 0; arch = 2; uuid = }");
   EXPECT_EQ(list[2].dict()->find("arch")->number()->kind(), NumberKind::Int64);
   const PropertyValue notAnArray(PropertyDict{{"0", sampleApp()}});
-  EXPECT_THAT(AppInfoList(&notAnArray).array(), IsEmpty());
+  EXPECT_THAT(listOf(notAnArray), IsEmpty());
 }
 
 }  // namespace

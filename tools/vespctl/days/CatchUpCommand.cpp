@@ -52,8 +52,7 @@ Submission submitReport(std::int32_t day) {
   if (!report.readHistory(day)) {
     return Submission::Failed;
   }
-  std::optional<PropertyDict> document =
-      report.makeDocument(day, nullptr, TBReport::SideEffects::LeftOut);
+  std::optional<PropertyDict> document = report.makeDocument(day, TBReport::SideEffects::LeftOut);
   if (!document) {
     return Submission::Empty;
   }
@@ -62,8 +61,7 @@ Submission submitReport(std::int32_t day) {
     scalars.remove(key);
   }
   document->set("TBScalars", std::move(scalars));
-  const std::optional<std::string> bytes = serializeDailyLog(*document);
-  return bytes && submitDailyLog(*bytes) ? Submission::Done : Submission::Failed;
+  return submitDailyLog(*document) ? Submission::Done : Submission::Failed;
 }
 
 void catchUp(const std::string& directory, std::uint32_t last) {

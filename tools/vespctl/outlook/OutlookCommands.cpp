@@ -29,25 +29,26 @@ void previewLog(const OutlookArguments& arguments) {
   const LookedAtDevice looked(arguments.directory, LogLevel::Default);
   const std::int32_t day = arguments.day.value_or(yesterday());
   std::optional<PropertyDict> document;
-  std::optional<std::string> bytes;
   if (platform().logsmith().DiagnosticLogSubmissionEnabled()) {
     TBReport report;
     if (!report.readHistory(day)) {
       looked.complaints.fail(kUnreadableCounters);
     }
-    document = report.makeDocument(day, nullptr, TBReport::SideEffects::LeftOut);
-    bytes = document ? serializeDailyLog(*document) : std::nullopt;
-    if (bytes && looked.device->description().submission.fails) {
+    document = report.makeDocument(day, TBReport::SideEffects::LeftOut);
+    if (document && !canSerializeDailyLog(*document)) {
+      document.reset();
+    } else if (document && looked.device->description().submission.fails) {
       logMessage(LogLevel::Error, "%s", kSubmissionFailed);
-      bytes.reset();
+      document.reset();
     }
   }
   looked.complaints.print();
-  if (arguments.document) {
-    std::cout << bytes.value_or("");
-  } else if (bytes) {
+  if (document && arguments.document) {
+    platform().ptreeSerialization().serialize({*document},
+                                              [](std::string_view piece) { std::cout << piece; });
+  } else if (document) {
     printJson(*document);
-  } else {
+  } else if (!arguments.document) {
     std::cout << "null\n";
   }
 }

@@ -76,9 +76,11 @@ class HostPtreeSerialization final : public PtreeSerialization {
   std::optional<PropertyValue> parse(std::string_view bytes, std::string& error) override {
     return readPtree(bytes, error);
   }
-  std::optional<std::string> serialize(const PropertyDict& dict, std::string& error) override {
-    std::string document;
-    return writePtree(dict, document, error) ? std::optional(std::move(document)) : std::nullopt;
+  bool canSerialize(const PtreeDocument& document, std::string& error) override {
+    return isPtree(document, error);
+  }
+  void serialize(const PtreeDocument& document, const Sink& sink) override {
+    writePtree(document, sink);
   }
   std::array<std::uint8_t, 16> md5(std::string_view bytes) override {
     MD5_CTX context;
