@@ -8,6 +8,7 @@
 #include "platform/Platform.h"
 
 namespace vesprun {
+
 std::optional<DistributionBatch::HistogramCounters> DistributionBatch::allocateCounters(
     const PropertyArray& intervals, const std::string& key) {
   logMessage(LogLevel::Debug, "Treating key %s as a histogram", key.c_str());
@@ -23,7 +24,8 @@ std::optional<DistributionBatch::HistogramCounters> DistributionBatch::allocateC
 
 void DistributionBatch::add(TBHistoryDistributionEnumerator& values, std::string_view key,
                             const DistributionOptions& options) {
-  Row& row = _rows.emplace_back(std::string(key), options.intervals);
+  _rows.push_back({std::string(key), options.intervals});
+  Row& row = _rows.back();
   if (row.intervals != nullptr) {
     row.histogram = allocateCounters(*row.intervals, row.key);
   }
