@@ -51,6 +51,7 @@ std::unique_ptr<Device> Device::open(const std::string& path, std::string& error
     if (platformIsInstalled()) {
       error = path + ": another device is open";
     } else if (std::unique_ptr<HostPlatform> platform = HostPlatform::open(path, error)) {
+      // NOLINTNEXTLINE(bugprone-unhandled-exception-at-new): runForProgram catches it
       device.reset(new Device(std::make_unique<Installation>(std::move(platform))));
     }
     return true;

@@ -13,11 +13,11 @@
 #include "NANDInfo/controller/Controller.h"
 #include "NANDInfo/controller/TunnelCommand.h"
 #include "NANDInfo/lists/FactoryDefectList.h"
+#include "NANDInfo/lists/NANDLogWriter.h"
 #include "NANDInfo/lists/TelemetryList.h"
 #include "NANDInfo/lists/WriteAmplification.h"
 #include "NANDInfo/sets/StatisticsGathering.h"
 #include "common/LittleEndian.h"
-#include "telemetry/NANDLogWriter.h"
 
 namespace vesprun {
 namespace {

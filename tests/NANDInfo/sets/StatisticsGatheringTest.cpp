@@ -71,6 +71,23 @@ TEST_F(StatisticsGatheringTest, FTLFailures) {
   entry = complete;
 }
 
+TEST_F(StatisticsGatheringTest, AnOpenServiceWithoutAConnectionIsAFailure) {
+  class Unconnected final : public WatchedRegistry {
+   public:
+    using WatchedRegistry::WatchedRegistry;
+    RegistryResult DevRegServiceOpen(RegistryHandle /*service*/, RegistryHandle& handle) override {
+      handle = 0;
+      return kRegistrySuccess;
+    }
+  };
+  for (const bool ftl : {true, false}) {
+    const Unconnected registry(start(controller(kQNS3, kStatisticsAnswer)));
+    EXPECT_EQ(ftl ? gatherORUFTLData(false, true, 0) : gatherORUMSPData(), std::nullopt);
+    EXPECT_EQ(GetAPIErrorMessage(), std::string(ftl ? "gatherORUFTLData" : "gatherORUMSPData") +
+                                        ": No io_connection exist");
+  }
+}
+
 TEST_F(StatisticsGatheringTest, MSPsAreCountedThenFetched) {
   const auto describeMSPs = [](std::uint32_t count, const std::string& last) {
     std::string all = last;

@@ -99,6 +99,11 @@ TEST(EventHub, BuildsOnlyWhatIsTaken) {
   EXPECT_EQ(device.read("outbox/events.jsonl"),
             "{\"time\":\"2024-03-05T09:15:02Z\",\"event\":\"wanted\","
             "\"payload\":{\"n\":1,\"half\":0.5,\"one\":1.0}}\n");
+  std::filesystem::remove(device.path("outbox/events.jsonl"));
+  std::filesystem::create_directory(device.path("outbox/events.jsonl"));
+  EXPECT_FALSE(hub.EventHubSendEventLazy("wanted", build));
+  EXPECT_EQ(device.log(), std::vector<std::string>{"error: " + device.path("outbox/events.jsonl") +
+                                                   ": Is a directory"});
 }
 
 TEST(Outbox, NumbersLogsUpwardsAndKeepsHeadersBesideThem) {

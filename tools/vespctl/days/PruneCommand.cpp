@@ -43,11 +43,9 @@ std::uint64_t removeLines(const std::string& path, const Date& time,
     }
     std::string malformed;
     const std::optional<PropertyValue> line = valueFromJsonText(text, malformed);
-    const PropertyValue* written =
-        line && line->dict() != nullptr ? line->dict()->find("time") : nullptr;
-    const std::optional<Date> date = written != nullptr && written->string() != nullptr
-                                         ? parseDateText(*written->string())
-                                         : std::nullopt;
+    const PropertyDict* fields = line ? line->dict() : nullptr;
+    const std::string* written = fields != nullptr ? fields->findString("time") : nullptr;
+    const std::optional<Date> date = written != nullptr ? parseDateText(*written) : std::nullopt;
     return date && *date < time;
   };
   const std::optional<std::uint64_t> removed = JsonLines(path).remove(isOlder, error);

@@ -7,6 +7,7 @@
 #include <sstream>
 #include <thread>
 
+#include "platform/host/files/FileLock.h"
 #include "platform/host/files/JsonLines.h"
 #include "support/HostServiceTest.h"
 
@@ -185,6 +186,8 @@ TEST_F(JsonLinesTest, WaitOnceForALockThatNobodyReleases) {
     EXPECT_EQ(error, folder.path("log.jsonl") + ": another process keeps it locked");
   }
   EXPECT_TRUE(lines.append("{}", error)) << error;
+  EXPECT_FALSE(takeLock(-1, LOCK_EX, std::chrono::milliseconds(0), "name", error));
+  EXPECT_EQ(error, "name: Bad file descriptor");
 }
 
 }  // namespace

@@ -1,4 +1,4 @@
-#include "telemetry/NANDLogWriter.h"
+#include "NANDInfo/lists/NANDLogWriter.h"
 
 #include <array>
 #include <charconv>
