@@ -1,5 +1,7 @@
 #include "config/WhitelistTable.h"
 
+#include <algorithm>
+
 namespace vesprun {
 namespace {
 
@@ -34,7 +36,12 @@ void WhitelistTable<Options>::indexPrefixes() {
 
 template <typename Options>
 WhitelistDecision<Options> WhitelistTable<Options>::decide(std::string_view key) const {
-  if (const auto named = _keys.find(key); named != _keys.end()) {
+  auto named = _keys.nth(std::min(_expected, _keys.size()));
+  if (named == _keys.end() || named.key() != key) {
+    named = _keys.find(key);
+  }
+  if (named != _keys.end()) {
+    _expected = static_cast<std::size_t>(named - _keys.begin()) + 1;
     return {DecidedBy::Key, {}, &named->second};
   }
   return decideByPrefix(key);

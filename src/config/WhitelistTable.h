@@ -2,6 +2,7 @@
 
 #include <tsl/ordered_map.h>
 
+#include <cstddef>
 #include <optional>
 #include <string_view>
 #include <type_traits>
@@ -73,13 +74,15 @@ class WhitelistTable {
   const Entries& keys() const { return _keys; }
   const Entries& prefixes() const { return _prefixes; }
 
-  /// The exact key decides before the first prefix in order.
+  /// The exact key decides before the first prefix in order. Fastest for keys in the order of the
+  /// whitelist; not for several threads at a time.
   WhitelistDecision<Options> decide(std::string_view key) const;
   /// What the first prefix would decide; on `prefix` itself, the one that is reached in its place.
   WhitelistDecision<Options> decideByPrefix(std::string_view key) const;
 
  private:
   Entries _keys;
+  mutable std::size_t _expected = 0;  ///< the place after the key that was found last
   Entries _prefixes;
   PrefixTable _prefixTable;
 };

@@ -1,8 +1,10 @@
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <memory>
+#include <span>
 #include <string_view>
 
 #include "common/Calendar.h"
@@ -17,6 +19,13 @@ class TBHistoryDistributionEnumerator {
   /// Gives the next value and, unless `secondsInDay` is null, its offset in seconds within the day.
   /// False, and both untouched, after the last one.
   virtual bool getNextValueSecondsInDayOffset(double& value, std::int32_t* secondsInDay) = 0;
+
+  /// Fills `values`, which must not be empty, with the next ones, without their offsets. Gives
+  /// their number: less than asked for when they end or where they are stored apart, 0 after the
+  /// last one.
+  virtual std::size_t getNextValues(std::span<double> values) {
+    return getNextValueSecondsInDayOffset(values[0], nullptr) ? 1 : 0;
+  }
 };
 
 /// The rows of the counter database. Both queries deliver the rows from `minDay` to `maxDay`, both

@@ -1,14 +1,11 @@
 #include "report/TBReport.h"
 
 #include <limits>
-#include <new>
 #include <string>
 #include <utility>
-#include <vector>
 
 #include "platform/Platform.h"
-#include "report/DistributionStats.h"
-#include "report/Histogram.h"
+#include "report/DistributionBatch.h"
 #include "report/KernelMemoryStatistics.h"
 #include "report/LogSubmission.h"
 #include "report/ReportSources.h"
@@ -16,28 +13,6 @@
 
 namespace vesprun {
 namespace {
-
-/// Boundaries and a counter for each bucket.
-struct HistogramCounters {
-  explicit HistogramCounters(const PropertyArray& intervals)
-      : boundaries(intervals), counts(boundaries.bucketCount()) {}
-
-  HistogramBoundaries boundaries;
-  std::vector<std::uint64_t> counts;
-};
-
-std::optional<HistogramCounters> allocateCounters(const PropertyArray& intervals,
-                                                  std::string_view key) {
-  logMessage(LogLevel::Debug, "Treating key %s as a histogram", std::string(key).c_str());
-  try {
-    return HistogramCounters(intervals);
-  } catch (const std::bad_alloc&) {
-    logMessage(LogLevel::Default,
-               "Couldn't allocate histCounts for key %s. Will not calculate histogram values",
-               std::string(key).c_str());
-    return std::nullopt;
-  }
-}
 
 PropertyValue preferenceOr(std::string_view key, PropertyValue fallback) {
   std::optional<PropertyValue> value =
@@ -84,16 +59,18 @@ bool TBReport::readHistory(std::int32_t day) {
           addScalarForKeyWithOptions(value, key, *options);
         }
       });
+  DistributionBatch distributions(_distributionsOutput, _histogramsOutput);
   const bool allDistributions =
       history->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
           "", firstDay, day,
-          [this](std::string_view key, std::int32_t /*day*/,
-                 TBHistoryDistributionEnumerator& values, bool& /*stop*/) {
+          [&](std::string_view key, std::int32_t /*day*/, TBHistoryDistributionEnumerator& values,
+              bool& /*stop*/) {
             if (const DistributionOptions* options =
                     _config ? _config->configOptionsForDistributionKey(key) : nullptr) {
-              computeAndAddDistributionForKeyWithOptions(values, key, *options);
+              distributions.add(values, key, *options);
             }
           });
+  distributions.finish();
   return allScalars && allDistributions;
 }
 
@@ -149,29 +126,9 @@ void TBReport::addScalarForKeyByExecutingBlock(std::string_view key,
 void TBReport::computeAndAddDistributionForKeyWithOptions(TBHistoryDistributionEnumerator& values,
                                                           std::string_view key,
                                                           const DistributionOptions& options) {
-  std::optional<HistogramCounters> histogram;
-  if (options.intervals != nullptr) {
-    histogram = allocateCounters(*options.intervals, key);
-  }
-  DistributionStats statistics;
-  double value = 0.0;
-  if (histogram) {
-    while (values.getNextValueSecondsInDayOffset(value, nullptr)) {
-      ++histogram->counts[determineHistBucketForValueWithIntervals(value, histogram->boundaries)];
-      statistics.add(value);
-    }
-    if (std::optional<PropertyDict> dict =
-            histogramDictForIntervalsWithHistCounts(*options.intervals, histogram->counts)) {
-      _histogramsOutput.set(key, *std::move(dict));
-    } else {
-      _histogramsOutput.remove(key);
-    }
-  } else {
-    while (values.getNextValueSecondsInDayOffset(value, nullptr)) {
-      statistics.add(value);
-    }
-  }
-  _distributionsOutput.set(key, statistics.toArray());
+  DistributionBatch alone(_distributionsOutput, _histogramsOutput);
+  alone.add(values, key, options);
+  alone.finish();
 }
 
 }  // namespace vesprun

@@ -1,9 +1,12 @@
 #include <algorithm>
+#include <cmath>
 #include <limits>
 #include <random>
 #include <sstream>
 
 #include "common/TextForm.h"
+#include "platform/host/documents/JsonForm.h"
+#include "report/DistributionBatch.h"
 #include "report/Histogram.h"
 #include "report/RoundScalar.h"
 #include "report/TBReport.h"
@@ -66,6 +69,27 @@ TEST(Distributions, AreSummarizedAndCounted) {
   const PropertyDict& histogram = *report.histogramsOutput().find("key")->dict();
   EXPECT_EQ(histogram.begin()->second.number()->kind(), NumberKind::UInt64);
   EXPECT_EQ(device.log().back(), "debug: Treating key key as a histogram");
+}
+
+TEST(Distributions, AreTheSameSideBySideAsAlone) {
+  TestDevice device;
+  std::mt19937 random(11);
+  const PropertyArray intervals{10, 1000, 100000};
+  PropertyDict distributions, histograms;
+  TBReport alone;
+  DistributionBatch batch(distributions, histograms);
+  for (int row = 0; row < 60; ++row) {
+    std::vector<double> values(random() % 3 == 0 ? random() % 6000 : random() % 10);
+    std::generate(values.begin(), values.end(), [&] { return std::ldexp(random(), -13); });
+    const std::string key = "key" + std::to_string(random() % 20);
+    const DistributionOptions options{random() % 2 == 0 ? &intervals : nullptr};
+    ListedValues forBatch(values), forReport(values);
+    batch.add(forBatch, key, options);
+    alone.computeAndAddDistributionForKeyWithOptions(forReport, key, options);
+  }
+  batch.finish();
+  EXPECT_EQ(jsonText(distributions), jsonText(alone.distributionsOutput()));
+  EXPECT_EQ(jsonText(histograms), jsonText(alone.histogramsOutput()));
 }
 
 TEST(Histogram, TakesTheFirstBoundaryThatReachesAValue) {

@@ -70,7 +70,13 @@ class PropertyDict {
   const Bytes* findData(std::string_view key) const { return find(key, &PropertyValue::data); }
   const Date* findDate(std::string_view key) const { return find(key, &PropertyValue::date); }
 
-  void set(std::string_view key, PropertyValue value) { set(PropertyKey(key), std::move(value)); }
+  void set(std::string_view key, PropertyValue value) {
+    if (PropertyValue* const expected = findExpected(key)) {
+      *expected = std::move(value);
+    } else {
+      set(PropertyKey(key), std::move(value));
+    }
+  }
   void set(PropertyKey key, PropertyValue value) {
     if (!_many) {
       if (const auto entry = findFew(key); entry != _few.end()) {
@@ -88,6 +94,7 @@ class PropertyDict {
     if (!isNew) {
       entry.value() = std::move(value);  // which was not taken
     }
+    _expected = static_cast<std::size_t>(entry - _many->begin()) + 1;
   }
   /// Keeps the order of the others; false when there was none.
   bool remove(std::string_view key) {
@@ -149,6 +156,19 @@ class PropertyDict {
                         [key](const auto& entry) { return entry.first == key; });
   }
 
+  /// Keys that are set again mostly come in the order of the first time, which saves a search.
+  PropertyValue* findExpected(std::string_view key) {
+    if (!_many || _expected >= _many->size()) {
+      return nullptr;
+    }
+    auto entry = _many->nth(_expected);
+    if (entry.key() != key) {
+      return nullptr;
+    }
+    ++_expected;
+    return &entry.value();
+  }
+
   void makeMap(std::size_t count) {
     auto map = std::make_unique<Map>();
     map->reserve(count);
@@ -161,6 +181,7 @@ class PropertyDict {
 
   Entries _few;
   std::unique_ptr<Map> _many;  // once there have been more than a few
+  std::size_t _expected = 0;   // of many, the place after the last one that was set
 };
 
 // What a value can only do where a dictionary is complete.

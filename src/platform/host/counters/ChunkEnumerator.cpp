@@ -1,5 +1,6 @@
 #include "platform/host/counters/ChunkEnumerator.h"
 
+#include <algorithm>
 #include <bit>
 #include <cstring>
 
@@ -47,6 +48,17 @@ bool ChunkEnumerator::getNextValueSecondsInDayOffset(double& value, std::int32_t
   ++_next;
   ++_taken;
   return true;
+}
+
+std::size_t ChunkEnumerator::getNextValues(std::span<double> values) {
+  if (!getNextValueSecondsInDayOffset(values[0], nullptr)) {
+    return 0;
+  }
+  const std::size_t rest = std::min(values.size() - 1, _count - _next);
+  std::memcpy(values.data() + 1, _values + _next * sizeof(double), rest * sizeof(double));
+  _next += rest;
+  _taken += rest;
+  return rest + 1;
 }
 
 // `length` knows the size of a column without reading it.

@@ -22,6 +22,7 @@ class ChunkEnumerator final : public TBHistoryDistributionEnumerator {
   /// A failure ends the values and is kept for `rethrowFailure`: the reader of the values knows
   /// nothing of SQLite.
   bool getNextValueSecondsInDayOffset(double& value, std::int32_t* secondsInDay) override;
+  std::size_t getNextValues(std::span<double> values) override;
 
   /// Its text says how many values came before.
   void rethrowFailure() const;

@@ -1,5 +1,6 @@
 #include "platform/host/documents/PtreeWriter.h"
 
+#include <algorithm>
 #include <charconv>
 #include <cmath>
 #include <cstddef>
@@ -232,18 +233,22 @@ class TreeWriter {
   void writeText(std::string_view name, std::string_view text) {
     tag("<", name, ">");
     while (true) {
-      const std::size_t plain = text.find_first_of("&<>\r");
-      _text += text.substr(0, plain);
-      if (plain == std::string_view::npos) {
+      const auto* const special = std::find_if(text.begin(), text.end(), isSpecial);
+      _text.append(text.begin(), special);
+      if (special == text.end()) {
         break;
       }
-      const char c = text[plain];
       // XML readers turn a bare carriage return into a line feed.
-      _text += c == '&' ? "&amp;" : c == '<' ? "&lt;" : c == '>' ? "&gt;" : "&#13;";
-      text.remove_prefix(plain + 1);
+      _text += *special == '&'   ? "&amp;"
+               : *special == '<' ? "&lt;"
+               : *special == '>' ? "&gt;"
+                                 : "&#13;";
+      text = {special + 1, text.end()};
     }
     tag("</", name, ">\n");
   }
+
+  static bool isSpecial(char c) { return c == '&' || c == '<' || c == '>' || c == '\r'; }
 
   void writeNumber(const Number& number) {
     char text[32];

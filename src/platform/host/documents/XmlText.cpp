@@ -1,6 +1,7 @@
 #include "platform/host/documents/XmlText.h"
 
 #include <cstdint>
+#include <cstring>
 
 namespace vesprun {
 
@@ -32,6 +33,16 @@ std::size_t xmlCharacterLength(std::string_view text) {
 std::size_t xmlTextLength(std::string_view text) {
   std::size_t at = 0;
   while (at < text.size()) {
+    // Eight bytes at a time as long as all are printable ASCII characters.
+    constexpr std::uint64_t kOnes = 0x0101010101010101;
+    std::uint64_t bytes = 0;
+    if (text.size() - at >= sizeof bytes) {
+      std::memcpy(&bytes, text.data() + at, sizeof bytes);
+      if (((bytes | (bytes - kOnes * ' ')) & kOnes * 0x80) == 0) {
+        at += sizeof bytes;
+        continue;
+      }
+    }
     const auto byte = static_cast<std::uint8_t>(text[at]);
     const std::size_t length =
         byte >= 0x20 && byte < 0x80 ? 1 : xmlCharacterLength(text.substr(at));

@@ -1,0 +1,66 @@
+#pragma once
+
+#include <cstddef>
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "common/PropertyDict.h"
+#include "config/KeyOptions.h"
+#include "platform/Tallybook.h"
+#include "report/DistributionStats.h"
+#include "report/Histogram.h"
+
+namespace vesprun {
+
+/// Computes the statistics of a few distributions at a time, side by side: each step of one waits
+/// for its division, meanwhile the others go on. Every distribution takes its values in order.
+class DistributionBatch {
+ public:
+  /// The outputs must outlive the object.
+  DistributionBatch(PropertyDict& distributions, PropertyDict& histograms)
+      : _distributions(distributions), _histograms(histograms) {}
+
+  /// Takes all values. What becomes of them is stored here or in `finish`, in the order of the
+  /// calls. The intervals must stay until then.
+  void add(TBHistoryDistributionEnumerator& values, std::string_view key,
+           const DistributionOptions& options);
+
+  void finish();
+
+ private:
+  struct HistogramCounters {
+    explicit HistogramCounters(const PropertyArray& intervals)
+        : boundaries(intervals), counts(boundaries.bucketCount()) {}
+
+    HistogramBoundaries boundaries;
+    std::vector<std::uint64_t> counts;
+  };
+  struct Row {
+    std::string key;
+    const PropertyArray* intervals;
+    std::optional<HistogramCounters> histogram{};
+    DistributionStats statistics{};
+    std::size_t pending = 0;  ///< values that have been read but not counted
+  };
+  static constexpr std::size_t kMostRows = 8;
+  /// Rows of so many values begin in different lines of the processor's cache.
+  static constexpr std::size_t kMostPending = 2040;
+
+  static std::optional<HistogramCounters> allocateCounters(const PropertyArray& intervals,
+                                                           const std::string& key);
+  double* valuesOf(const Row& row) {
+    return &_values[static_cast<std::size_t>(&row - _rows.data()) * kMostPending];
+  }
+  void countPending();
+
+  PropertyDict& _distributions;
+  PropertyDict& _histograms;
+  std::vector<Row> _rows;
+  std::unique_ptr<double[]> _values =
+      std::make_unique_for_overwrite<double[]>(kMostRows * kMostPending);
+};
+
+}  // namespace vesprun
