@@ -10,6 +10,14 @@
 
 namespace vesprun {
 
+void GenericParserCxt::reserve(std::size_t count) noexcept {
+  try {
+    _values.reserve(_values.size() + count);
+  } catch (const std::bad_alloc&) {
+    // Appending goes as far as it can.
+  }
+}
+
 bool GenericParserCxt::append(std::string_view prefix, std::string_view suffix,
                               std::uint64_t value) noexcept {
   const std::size_t begin = _names.size();

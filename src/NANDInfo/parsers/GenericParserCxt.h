@@ -52,6 +52,8 @@ class GenericParserCxt {
     }
   }
 
+  /// Makes room for that many values more, if there is memory.
+  void reserve(std::size_t count) noexcept;
   /// Appends a field named `prefix` + `suffix`, cut to `kMaxNameLength`. False, and nothing
   /// appended, when memory runs out.
   bool append(std::string_view prefix, std::string_view suffix, std::uint64_t value) noexcept;

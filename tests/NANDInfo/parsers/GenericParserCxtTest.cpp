@@ -52,8 +52,8 @@ TEST(GenericParserCxt, CutsNamesAt98Characters) {
   EXPECT_EQ(fields[14].first, std::string(98, 'q'));
 }
 
-constexpr auto kListedRanges = std::to_array<FieldRange>({"b", "c"});
-constexpr FieldTable kListed = fieldTable<kListedRanges, 2>();
+constexpr auto kFilterRanges = std::to_array<FieldRange>({"b", "c"});
+constexpr FieldTable kFilter = fieldTable<kFilterRanges, 2>();
 
 TEST(GenericParserCxt, KeepsOrderAndRepeatsUntilReleased) {
   GenericParserCxt ctx;
@@ -68,7 +68,7 @@ TEST(GenericParserCxt, KeepsOrderAndRepeatsUntilReleased) {
   const PropertyDict dict = CreateDictFromCxt(ctx);
   EXPECT_EQ(dict, (PropertyDict{{"a1", 3}, {"b", 2}}));
   EXPECT_EQ(dict.find("b")->number()->kind(), NumberKind::UInt64);
-  EXPECT_EQ(CreateDictFromCxt(ctx, &kListed), (PropertyDict{{"b", 2}}));
+  EXPECT_EQ(CreateDictFromCxt(ctx, &kFilter), (PropertyDict{{"b", 2}}));
   ReleaseGenericParserCxt(ctx);
   ReleaseGenericParserCxt(ctx);
   EXPECT_TRUE(ctx.empty());
