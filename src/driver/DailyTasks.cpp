@@ -1,6 +1,5 @@
 #include "driver/DailyTasks.h"
 
-#include <string_view>
 
 #include "driver/DailyStorageAndDeviceStats.h"
 #include "driver/TaskingSync.h"

@@ -22,7 +22,7 @@ std::unique_ptr<HostPlatform> openDevice(const std::string& directory) {
 
 std::unique_ptr<HostPlatform> openDeviceReadOnly(const std::string& directory, SystemLog& log) {
   std::string error;
-  std::unique_ptr<HostPlatform> device = HostPlatform::openReadOnly(directory, log, error);
+  std::unique_ptr<HostPlatform> device = HostPlatform::open(directory, error, &log);
   if (!device) {
     throw CommandFailure(error);
   }
