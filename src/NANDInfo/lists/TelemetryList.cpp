@@ -160,8 +160,8 @@ PropertyDict busRecord(const std::uint8_t* busEntry, const NandChannelCounters& 
 std::uint8_t hexStringToByte(std::string_view text, std::uint32_t length) {
   constexpr std::string_view kDigits = "0123456789abcdef";
   std::size_t value = 0;
-  for (const unsigned char character : text.substr(0, std::min<std::size_t>(length, 2))) {
-    const auto c = static_cast<char>(std::tolower(character));
+  for (const char character : text.substr(0, std::min<std::size_t>(length, 2))) {
+    const auto c = static_cast<char>(std::tolower(static_cast<unsigned char>(character)));
     const std::size_t digit = kDigits.find(c);
     if (digit == std::string_view::npos) {
       std::printf("unrecognized hex character: %c", c);
