@@ -55,7 +55,6 @@ struct HostPlatform::Services {
 
 HostPlatform::HostPlatform(std::unique_ptr<Services> services)
     : Platform{services->clock,
-               services->fileSystem,
                services->deviceInformation,
                services->deviceRegistry,
                services->outbox,
