@@ -1,7 +1,5 @@
 #include "driver/DailyTasks.h"
 
-#include <string_view>
-
 #include "driver/DailyStorageAndDeviceStats.h"
 #include "driver/TaskingSync.h"
 #include "platform/Guarded.h"
@@ -14,7 +12,7 @@ namespace {
 /// Longer than a day's work takes; a stopped holder must not block the others for ever.
 constexpr double kLongestWaitForOthers = 300;
 
-bool isAlone() { return platform().dailyWorkLock().lock(kLongestWaitForOthers); }
+bool isAlone() { return platform().fileSystem().lockDailyWork(kLongestWaitForOthers); }
 
 std::int32_t yesterday() { return dayBefore(platform().tallybook().TBDaysSince1970()); }
 

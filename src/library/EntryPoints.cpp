@@ -1,7 +1,7 @@
 #include "library/EntryPoints.h"
 
 #include <algorithm>
-#include <array>
+#include <limits>
 #include <vector>
 
 #include "NANDInfo/lists/StructuredLog.h"

@@ -1,7 +1,6 @@
 #pragma once
 
 #include "platform/Clock.h"
-#include "platform/DailyWorkLock.h"
 #include "platform/DeviceInformation.h"
 #include "platform/DeviceRegistry.h"
 #include "platform/EventHub.h"
@@ -32,7 +31,6 @@ struct Platform {
   };
 
   Service<Clock> clock;
-  Service<DailyWorkLock> dailyWorkLock;
   Service<DeviceInformation> deviceInformation;
   Service<DeviceRegistry> deviceRegistry;
   Service<EventHub> eventHub;

@@ -247,17 +247,17 @@ TEST_F(DailyDriverTest, OneProcessDoesTheDaysWorkAndTheOthersFindItDone) {
 
 TEST_F(DailyDriverTest, AWaitForTheDaysWorkOfAnotherProcessEnds) {
   DriverDevice device;
-  EXPECT_TRUE(device.platform().dailyWorkLock().lock(0));
-  EXPECT_TRUE(device.platform().dailyWorkLock().lock(0));
+  EXPECT_TRUE(device.platform().fileSystem().lockDailyWork(0));
+  EXPECT_TRUE(device.platform().fileSystem().lockDailyWork(0));
   EXPECT_TRUE(hasSucceeded(startProcess([&device] {
     std::string error;
     const std::unique_ptr<HostPlatform> other = HostPlatform::open(device.path(), error);
-    EXPECT_FALSE(other->dailyWorkLock().lock(0.01));
+    EXPECT_FALSE(other->fileSystem().lockDailyWork(0.01));
   })));
   EXPECT_THAT(device.log(),
               ::testing::ElementsAre(::testing::EndsWith(": another process keeps it locked")));
   device.endProcess();
-  EXPECT_TRUE(device.platform().dailyWorkLock().lock(0));
+  EXPECT_TRUE(device.platform().fileSystem().lockDailyWork(0));
 }
 
 TEST_F(DailyDriverTest, AServiceThatIsTakenChangesNothingElse) {

@@ -18,8 +18,7 @@ std::unique_ptr<HostPlatform> openDevice(const std::string& directory) {
 }
 
 std::unique_ptr<HostPlatform> openDeviceReadOnly(const std::string& directory, SystemLog& log) {
-  return orFail(
-      [&](std::string& error) { return HostPlatform::openReadOnly(directory, log, error); });
+  return orFail([&](std::string& error) { return HostPlatform::open(directory, error, &log); });
 }
 
 DeviceDirectory openDirectory(const std::string& directory) {

@@ -38,7 +38,7 @@ auto orFail(const Attempt& attempt) {
 /// Throws `CommandFailure` when the directory cannot be used; so do the next two.
 std::unique_ptr<HostPlatform> openDevice(const std::string& directory);
 
-/// Without changing anything on the device; see `HostPlatform::openReadOnly`.
+/// Without changing anything on the device; see `HostPlatform::open`.
 std::unique_ptr<HostPlatform> openDeviceReadOnly(const std::string& directory, SystemLog& log);
 
 /// The directory alone, without its description.

@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <optional>
 #include <string>
-#include <string_view>
 
 #include "NANDInfo/VMFreezer.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"

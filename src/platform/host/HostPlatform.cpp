@@ -55,7 +55,6 @@ struct HostPlatform::Services {
 
 HostPlatform::HostPlatform(std::unique_ptr<Services> services)
     : Platform{services->clock,
-               services->fileSystem,
                services->deviceInformation,
                services->deviceRegistry,
                services->outbox,
@@ -76,17 +75,8 @@ HostPlatform::HostPlatform(std::unique_ptr<Services> services)
 
 HostPlatform::~HostPlatform() = default;
 
-std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, std::string& error) {
-  return open(path, nullptr, error);
-}
-
-std::unique_ptr<HostPlatform> HostPlatform::openReadOnly(const std::string& path, SystemLog& log,
-                                                         std::string& error) {
-  return open(path, &log, error);
-}
-
-std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, SystemLog* log,
-                                                 std::string& error) {
+std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, std::string& error,
+                                                 SystemLog* readOnlyLog) {
   std::optional<DeviceDirectory> directory = DeviceDirectory::open(path, error);
   if (!directory) {
     return nullptr;
@@ -105,7 +95,8 @@ std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, System
     return nullptr;
   }
   auto services = std::make_unique<Services>(
-      log != nullptr ? directory->readOnly() : *std::move(directory), std::move(description), log);
+      readOnlyLog != nullptr ? directory->readOnly() : *std::move(directory),
+      std::move(description), readOnlyLog);
   const std::optional<std::string>& zone = services->description.timeZone;
   if (zone && !services->timeZone.set(*zone)) {
     error = file + ": timeZone: unknown time zone " + quotedText(*zone);

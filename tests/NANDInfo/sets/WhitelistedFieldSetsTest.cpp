@@ -27,14 +27,6 @@ TEST_F(WhitelistedFieldSetsTest, EachMSPHasTheDerivedFieldsUnrounded) {
                 R"("fw_version_identifier_2":3,"fw_version_identifier_3":65535},)"
                 R"("1":{"fw_updates":7)" +
                 derived + "}," + error);
-
-  answer(221, 0, msp);
-  startController();
-  EXPECT_EQ(jsonText(CopyWhitelistedNANDMSPInfo(false)),
-            R"({"0":{"fw_updates":12345,"fw_version_identifier":18446462611617873921,)"
-            R"("fw_version_identifier_0":1,"fw_version_identifier_1":2,)"
-            R"("fw_version_identifier_2":3,"fw_version_identifier_3":65535},)" +
-                error);
 }
 
 TEST_F(WhitelistedFieldSetsTest, StorageStatsAskForEveryImage) {

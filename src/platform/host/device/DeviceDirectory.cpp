@@ -3,7 +3,6 @@
 #include <sys/stat.h>
 
 #include <cerrno>
-#include <utility>
 
 #include "platform/host/files/Files.h"
 

@@ -8,11 +8,8 @@
 #include <cerrno>
 #include <cstdio>
 #include <optional>
-#include <string>
 #include <utility>
 #include <vector>
-
-#include "platform/host/files/Files.h"
 
 namespace vesprun {
 

@@ -6,11 +6,8 @@
 #include <unistd.h>
 
 #include <cerrno>
-#include <cstdio>
 #include <cstring>
 #include <utility>
-
-#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {

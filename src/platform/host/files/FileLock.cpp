@@ -5,8 +5,6 @@
 #include <cerrno>
 #include <thread>
 
-#include "platform/host/files/Files.h"
-
 namespace vesprun {
 
 bool takeLock(int descriptor, int operation, std::chrono::milliseconds longestWait,

@@ -11,8 +11,6 @@
 #include <fstream>
 
 #include "platform/host/files/AtomicFile.h"
-#include "platform/host/files/FileLock.h"
-#include "platform/host/files/Files.h"
 
 namespace vesprun {
 

@@ -46,9 +46,6 @@ class HostPreferences final : public Preferences {
   /// Synchronizes every domain.
   ~HostPreferences() override;
 
-  HostPreferences(const HostPreferences&) = delete;
-  HostPreferences& operator=(const HostPreferences&) = delete;
-
   std::optional<PropertyValue> LGSPreferencesGetValue(std::string_view key,
                                                       std::string_view domain) override;
   void LGSPreferencesSetValue(std::optional<std::string_view> key,

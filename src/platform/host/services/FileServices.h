@@ -5,7 +5,6 @@
 
 #include <chrono>
 
-#include "platform/DailyWorkLock.h"
 #include "platform/FileSystem.h"
 #include "platform/PtreeSerialization.h"
 #include "platform/SystemLog.h"
@@ -22,7 +21,7 @@ namespace vesprun {
 /// The files of the device directory. One that is there but cannot be read leaves an error in the
 /// system log. The lock is that of the directory itself: no file is left behind, and the kernel
 /// frees it when its process ends.
-class HostFileSystem final : public FileSystem, public DailyWorkLock {
+class HostFileSystem final : public FileSystem {
  public:
   HostFileSystem(const DeviceDirectory& directory, const DeviceDescription& description,
                  SystemLog& log)
@@ -49,7 +48,7 @@ class HostFileSystem final : public FileSystem, public DailyWorkLock {
                                   : live::volume(_directory.hostPath(path));
   }
 
-  bool lock(double seconds) override {
+  bool lockDailyWork(double seconds) override {
     if (_dailyWork) {
       return true;
     }

@@ -9,11 +9,6 @@
 #include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {
-HostSystemLog::HostSystemLog(const DeviceDirectory& directory, Clock& clock, LogLevel lowestKept)
-    : _directory(directory),
-      _clock(clock),
-      _lowestKept(lowestKept),
-      _lines(directory.hostPath("outbox/log.jsonl")) {}
 
 void HostSystemLog::write(LogLevel level, std::string_view message) {
   if (!keeps(level)) {
