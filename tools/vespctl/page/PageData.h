@@ -32,7 +32,7 @@ struct PageData {
     PropertyDict payload;
   };
 
-  /// The events of one name, and for one that tells of an MSP, of that MSP.
+  /// The events of one name; those of each MSP apart.
   struct Events {
     std::size_t count = 0;
     std::vector<Event> newest;  ///< some hundred at most, in the order of their lines
