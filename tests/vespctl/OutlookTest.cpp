@@ -171,7 +171,7 @@ TEST_F(OutlookTest, LooksAtADeviceWithoutTouchingIt) {
     shell("chmod -R a-w device");
     const std::string before = snapshot();
     for (const char* command :
-         {"preview \"$D\"", "preview \"$D\" --left-out", "explain \"$D\" s",
+         {"preview \"$D\"", "preview \"$D\" --left-out", "explain \"$D\" s", "page \"$D\"",
           "whitelist diff \"$D\" device/Library/*/*/Whitelist_Stagebox.ptree"}) {
       EXPECT_EQ(run(command), *complaint == '\0' ? 0 : 1) << command << complaint << output;
       EXPECT_THAT(error, HasSubstr(complaint)) << command;

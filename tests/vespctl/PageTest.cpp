@@ -10,7 +10,7 @@
 namespace vesprun {
 namespace {
 
-using ::testing::AllOf, ::testing::Each, ::testing::ElementsAre, ::testing::HasSubstr;
+using ::testing::AllOf, ::testing::ElementsAre, ::testing::HasSubstr;
 using ::testing::Not, ::testing::StartsWith;
 
 /// A device whose whitelist lets what begins with "s." and "d." through.
@@ -222,22 +222,6 @@ TEST_F(PageTest, NamesWhatItCannotRead) {
   EXPECT_THAT(output, AllOf(HasSubstr("There is no daily log"), HasSubstr("No scalar"),
                             HasSubstr("No distribution"), HasSubstr("No analytics event")));
   EXPECT_THAT(output, HasSubstr("Every key of the counter database may leave"));
-}
-
-TEST_F(PageTest, ChangesNothingOnTheDevice) {
-  report(1, "scalar\ts.a\t1\nscalar\tkept\t1\nsample\td.a\t1\t0");
-  folder.write("device/outbox/logs/0007-193-log-aggregated.ptree", "<ptree");
-  const std::string before = snapshot();
-  page();
-  EXPECT_EQ(run("page \"$D\" page.html"), 0) << error;
-  EXPECT_EQ(snapshot(), before);
-
-  folder.write("device/var/mobile/Library/Tallybook/TBDataStore.sqlitedb", "no database");
-  const std::string damaged = snapshot();
-  EXPECT_EQ(run("page \"$D\" other.html"), 1);
-  EXPECT_THAT(error, HasSubstr("is not a database"));
-  EXPECT_EQ(snapshot(), damaged);
-  EXPECT_THAT(folder.names(), Each(Not("other.html")));
 }
 
 TEST_F(PageTest, WritesAFileWholeOrNotAtAll) {
