@@ -122,7 +122,7 @@ int Companion::status() {
 Device::Device(const Programs& programs, const fs::path& folder)
     : _programs(&programs), _path(folder.string()) {
   std::string output;
-  if (control("init", {"--sample"}, output) != 0 || control("counters", {"dump"}, output) != 0) {
+  if (control({"init", "--sample"}, output) != 0 || control({"counters", "dump"}, output) != 0) {
     throw std::runtime_error("no device can be made: " + output);
   }
   describe(kDescription);
@@ -135,7 +135,7 @@ Device::Device(const Programs& programs, const fs::path& folder)
     rows += "scalar\t" + number + "\tsecret.scalar\t7\n";
     rows += "sample\t" + number + "\tsecret.distribution\t7.5\t3600\n";
   }
-  if (control("counters", {"import", "-"}, output, rows) != 0) {
+  if (control({"counters", "import", "-"}, output, rows) != 0) {
     throw std::runtime_error("no counters can be made: " + output);
   }
 }
@@ -154,19 +154,18 @@ void Device::describe(const std::string& change) {
 
 void Device::setDay(int day) { describe(R"({"clock": ")" + clockOf(day) + R"("})"); }
 
-int Device::control(const std::string& command, const std::vector<std::string>& rest,
-                    std::string& output, const std::string& input) const {
-  Companion program(controlCommand(command, rest), "/", input);
+std::vector<std::string> Device::controlCommand(std::vector<std::string> words) const {
+  words.insert(words.begin() + 1, _path);
+  words.insert(words.begin(), _programs->vespctl);
+  return words;
+}
+
+int Device::control(const std::vector<std::string>& words, std::string& output,
+                    const std::string& input) const {
+  Companion program(controlCommand(words), "/", input);
   const int status = program.status();
   output = program.output();
   return status;
-}
-
-std::vector<std::string> Device::controlCommand(const std::string& command,
-                                                const std::vector<std::string>& rest) const {
-  std::vector<std::string> line{_programs->vespctl, command, _path};
-  line.insert(line.end(), rest.begin(), rest.end());
-  return line;
 }
 
 int Device::runDaily() const { return Companion(dailyCommand(), _path).status(); }
@@ -203,7 +202,7 @@ Sight Device::look() const {
     }
   }
   std::string dump;
-  if (control("counters", {"dump"}, dump) != 0) {
+  if (control({"counters", "dump"}, dump) != 0) {
     sight.faults.push_back("the counters cannot be read: " + dump);
   }
   std::istringstream rows(dump);

@@ -42,11 +42,11 @@ class Device {
   /// Lays a JSON object over the device's description; null removes an entry.
   void describe(const std::string& change);
 
-  /// Runs `vespctl COMMAND DIR REST...`; its exit status, and what it printed in `output`.
-  int control(const std::string& command, const std::vector<std::string>& rest, std::string& output,
+  /// The command line of `vespctl` for a command and its arguments, without the device.
+  std::vector<std::string> controlCommand(std::vector<std::string> words) const;
+  /// Runs it; its exit status, and what it printed in `output`.
+  int control(const std::vector<std::string>& words, std::string& output,
               const std::string& input = {}) const;
-  std::vector<std::string> controlCommand(const std::string& command,
-                                          const std::vector<std::string>& rest) const;
   /// The daily run, without a fault; its exit status.
   int runDaily() const;
   std::vector<std::string> dailyCommand() const { return {_programs->vesprun, "-d"}; }

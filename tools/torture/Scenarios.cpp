@@ -322,10 +322,7 @@ Faults runBeside(const Reference& reference, const fs::path& folder, std::size_t
   const bool isDaily = neighbour.command.empty();
   const auto start = [&] {
     companion = std::make_unique<Companion>(
-        isDaily ? device.dailyCommand()
-                : device.controlCommand(neighbour.command.front(),
-                                        {neighbour.command.begin() + 1, neighbour.command.end()}),
-        device.path());
+        isDaily ? device.dailyCommand() : device.controlCommand(neighbour.command), device.path());
     // A neighbour that waits for a lock of the paused run goes on after it.
     companion->endsWithin(30);
   };
@@ -341,8 +338,7 @@ Faults runBeside(const Reference& reference, const fs::path& folder, std::size_t
   }
   std::string answer;
   if (!isDaily) {
-    device.control(neighbour.question.front(),
-                   {neighbour.question.begin() + 1, neighbour.question.end()}, answer);
+    device.control(neighbour.question, answer);
     if (answer.find(neighbour.answer) == std::string::npos) {
       faults.push_back("what the neighbour wrote is lost");
     }
@@ -391,8 +387,7 @@ std::vector<Case> neighbours(const Programs& programs, const fs::path& folder, s
 struct Command {
   std::string name;
   std::shared_ptr<Device> original;
-  std::string command;
-  std::vector<std::string> rest;
+  std::vector<std::string> words;
   std::function<Faults(Device& device, const Outcome& outcome, bool killed)> judge;
 };
 
@@ -400,8 +395,7 @@ Faults runCommand(const Command& command, const fs::path& folder, const Fault& f
                   bool started) {
   Device device(*command.original, folder);
   const bool killed = fault.kind == Fault::Kind::Kill;
-  const Outcome outcome =
-      runTraced(device.controlCommand(command.command, command.rest), device.path(), fault);
+  const Outcome outcome = runTraced(device.controlCommand(command.words), device.path(), fault);
   Faults faults = judgeRun(outcome, killed, started, 1);
   if (outcome.status == 1 && outcome.standardError.empty()) {
     faults.emplace_back("it failed without a word");
@@ -416,8 +410,7 @@ Faults runCommand(const Command& command, const fs::path& folder, const Fault& f
 std::vector<Case> casesOf(const Command& command, const fs::path& folder, std::uint32_t seed,
                           bool full) {
   Device device(*command.original, folder / "reference");
-  const Outcome reference =
-      runTraced(device.controlCommand(command.command, command.rest), device.path());
+  const Outcome reference = runTraced(device.controlCommand(command.words), device.path());
   Faults wrong = reference.notDurable;
   wrong += judgeRun(reference, false, true);
   wrong += command.judge(device, reference, false);
@@ -440,11 +433,11 @@ std::vector<Case> imports(const Programs& programs, const fs::path& folder, std:
             "\t" + std::to_string(row) + '\n';
   }
   writeFile(original->path() + "/rows", rows);
-  const std::vector<std::string> rest{"import", original->path() + "/rows"};
+  const std::vector<std::string> words{"counters", "import", original->path() + "/rows"};
   const std::vector<std::string> before = original->look().counters;
   Device device(*original, folder / "imported");
   std::string output;
-  device.control("counters", rest, output);
+  device.control(words, output);
   const std::vector<std::string> after = device.look().counters;
   const auto judge = [=](Device& changed, const Outcome& outcome, bool /*killed*/) {
     const Sight sight = changed.look();
@@ -457,7 +450,7 @@ std::vector<Case> imports(const Programs& programs, const fs::path& folder, std:
     }
     return faults;
   };
-  return casesOf({"import", original, "counters", rest, judge}, folder, seed, full);
+  return casesOf({"import", original, words, judge}, folder, seed, full);
 }
 
 /// Recorded files of a small machine that has counted for `hours`.
@@ -500,7 +493,7 @@ std::vector<Case> collections(const Programs& programs, const fs::path& folder, 
   const auto collect = [=](Device& device, int number) {
     Faults faults;
     std::string output;
-    if (device.control("collect", {"--root", stage(number)}, output) != 0) {
+    if (device.control({"collect", "--root", stage(number)}, output) != 0) {
       faults.push_back("a collection failed: " + output);
     }
     return faults;
@@ -525,7 +518,7 @@ std::vector<Case> collections(const Programs& programs, const fs::path& folder, 
     faults += missingFrom(figures(sight), expected, "growth from nowhere");
     return faults;
   };
-  return casesOf({"collect", original, "collect", {"--root", stage(2)}, judge}, folder, seed, full);
+  return casesOf({"collect", original, {"collect", "--root", stage(2)}, judge}, folder, seed, full);
 }
 
 std::string damaged(std::string content, const std::string& how, std::mt19937& random) {
@@ -600,10 +593,10 @@ Faults liveThrough(const Device& original, const fs::path& folder, std::uint32_t
                        : static_cast<int>(random() % 400);
     device.setDay(day);
     std::string output;
-    if (device.control("counters", {"set", "host.memory.MemFree", "65536"}, output) != 0 ||
-        device.control("counters",
-                       {"set", "host.memory.MemFree", "65536", "--day", std::to_string(day - 1)},
-                       output) != 0) {
+    if (device.control({"counters", "set", "host.memory.MemFree", "65536"}, output) != 0 ||
+        device.control(
+            {"counters", "set", "host.memory.MemFree", "65536", "--day", std::to_string(day - 1)},
+            output) != 0) {
       faults.push_back("a counter cannot be set: " + output);
     }
     if (device.runDaily() != 0) {

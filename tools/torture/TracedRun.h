@@ -60,7 +60,7 @@ struct Outcome {
   std::string standardError;
   std::vector<Call> calls;              ///< recorded only without a fault
   std::vector<std::string> notDurable;  ///< likewise: names given to bytes that were not flushed
-  bool happened = false;                ///< the fault came to pass
+  bool happened = false;                ///< the fault happened
   std::string place{};                  ///< the call that it happened to, with its path
 };
 

@@ -246,7 +246,7 @@ std::int64_t SqliteStore::numberOf(const std::string& table, KeyKind kind, std::
   return _numbers.emplace(std::move(cached), *number).first->second;
 }
 
-/// Removes the line that `line` takes the place of; false when that one holds on.
+/// Removes the line of the same device and day. False when it stays, as it ranks above `line`.
 bool SqliteStore::replacesEarlier(const ExportedLine& line, std::int64_t device) {
   SqliteStatement& find = _statements->findLine;
   find.bind(1, line.day).bind(2, device);

@@ -15,7 +15,7 @@
 namespace vesprun {
 namespace {
 
-/// The days that a daily log tells of, or did before it was removed.
+/// The days that have a daily log, or had one before it was pruned.
 std::set<std::int32_t> reportedDays(const DeviceDirectory& directory) {
   std::set<std::int32_t> days;
   nameUnreadable(

@@ -28,13 +28,7 @@ std::string document(const PropertyDict& message) {
   return text;
 }
 
-std::string operationDocument(std::int64_t operation) {
-  return document({{"operation", operation}});
-}
-
-std::string dailyDocument(std::int64_t day) {
-  return document({{"operation", std::int64_t{1}}, {"value", day}});
-}
+std::string loggingDocument() { return document({{"operation", std::int64_t{0}}}); }
 
 std::string appsDocument(const std::string& file) {
   std::string error;
@@ -143,7 +137,7 @@ void runSession(const std::string& path, const std::string& file) {
   const DeviceDirectory directory = openDirectory(path);
   const NewNotifications notifications(directory);
   const Client client(directory);
-  client.send(operationDocument(0));
+  client.send(loggingDocument());
   if (!notifications.await(kLoggingNotification)) {
     throw CommandFailure("the notification " + std::string(kLoggingNotification) +
                          " did not come within " + std::to_string(kPatienceInSeconds) + " seconds");
@@ -166,7 +160,7 @@ void addMessageCommands(CLI::App& vespctl) {
       addDeviceCommand(vespctl, "send", "Sends messages to a running vesprun", arguments->device);
 
   send->add_subcommand("logging", "Notifies the logging status")->callback([arguments] {
-    sendDocument(arguments->device, operationDocument(0));
+    sendDocument(arguments->device, loggingDocument());
   });
 
   CLI::App* apps = send->add_subcommand("apps", "Delivers the active apps");
@@ -186,7 +180,10 @@ void addMessageCommands(CLI::App& vespctl) {
   daily->add_option("DAY", arguments->day, "The day number")
       ->required()
       ->transform(decimal<std::int64_t>());
-  daily->callback([arguments] { sendDocument(arguments->device, dailyDocument(arguments->day)); });
+  daily->callback([arguments] {
+    sendDocument(arguments->device,
+                 document({{"operation", std::int64_t{1}}, {"value", arguments->day}}));
+  });
 
   CLI::App* raw = send->add_subcommand("raw", "Sends a ptree document as it is");
   raw->add_option("FILE", arguments->file, "The document; - for standard input")->required();

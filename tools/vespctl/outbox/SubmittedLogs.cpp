@@ -171,11 +171,4 @@ void nameUnreadable(std::span<const UnreadableLog> logs) {
   }
 }
 
-SubmittedLogs readSubmittedLogs(const DeviceDirectory& directory) {
-  SubmittedLogs found;
-  found.unreadable = forEachSubmittedLog(
-      directory, [&found](SubmittedLog&& log) { found.logs.push_back(std::move(log)); });
-  return found;
-}
-
 }  // namespace vesprun

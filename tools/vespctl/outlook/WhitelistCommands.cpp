@@ -40,7 +40,7 @@ void printFindings(const std::string& file) {
 
 using Keys = std::set<std::string, std::less<>>;
 
-/// What changes for the keys when `after` takes the place of `before`, which may be null.
+/// What changes for the keys when `after` replaces `before`, which may be null.
 template <typename Options>
 std::string differences(const TBConfig* before, const TBConfig& after, const Keys& keys) {
   JsonArray added;

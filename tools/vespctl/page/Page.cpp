@@ -157,7 +157,7 @@ class PageWriter {
     std::string older;
     std::map<std::string, std::size_t> digests;
     std::size_t count = 0;
-    for (auto log = _data.submitted.logs.rbegin(); log != _data.submitted.logs.rend(); ++log) {
+    for (auto log = _data.submitted.rbegin(); log != _data.submitted.rend(); ++log) {
       (count++ < kShownReports ? newest : older) += reportRow(*log);
       ++digests[*log->document.findString("TBWhitelistDigest")];
     }
@@ -211,10 +211,8 @@ class PageWriter {
 
   std::string unreadableFiles() const {
     std::string html;
-    for (const auto* list : {&_data.submitted.unreadable, &_data.unreadable}) {
-      for (const UnreadableLog& file : *list) {
-        html += "<li>" + htmlName(file.name) + ": " + htmlText(file.why);
-      }
+    for (const UnreadableLog& file : _data.unreadable) {
+      html += "<li>" + htmlName(file.name) + ": " + htmlText(file.why);
     }
     return html.empty() ? "" : "<p class=act>Not on this page:</p><ul>" + html + "</ul>";
   }

@@ -38,7 +38,6 @@ void makePage(const std::string& directory, const std::string& file) {
     looked.complaints.fail(kUnreadableCounters);
   }
   looked.complaints.print();
-  nameUnreadable(data.submitted.unreadable);
   nameUnreadable(data.unreadable);
   std::error_code ignored;
   const auto absolute = std::filesystem::canonical(looked.device->directory().path(), ignored);

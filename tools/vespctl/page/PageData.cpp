@@ -47,7 +47,7 @@ PageData::StorageLog parseStorageLog(const std::string& name, const std::string&
 }  // namespace
 
 void PageData::takeDays() {
-  for (const SubmittedLog& log : submitted.logs) {
+  for (const SubmittedLog& log : submitted) {
     days[log.day] = &log;
   }
   for (const auto& [day, log] : days) {
@@ -129,7 +129,9 @@ void PageData::takeRecord(const PropertyDict& line) {
   ++others["record of type " + (type != nullptr ? textForm(*type) : "?")];
 }
 
-PageData::PageData(const DeviceDirectory& directory) : submitted(readSubmittedLogs(directory)) {
+PageData::PageData(const DeviceDirectory& directory) {
+  unreadable = forEachSubmittedLog(
+      directory, [this](SubmittedLog&& log) { submitted.push_back(std::move(log)); });
   takeDays();
   takeLogs(directory);
   takeLines(directory, "events.jsonl", [this](const PropertyDict& line) { takeEvent(line); });

@@ -83,12 +83,6 @@ constexpr Layout kLayouts[] = {
 
 constexpr const char* kSnapshot = "snapshot";
 
-const Layout* findLayout(const std::string& name) {
-  const auto* layout = std::find_if(std::begin(kLayouts), std::end(kLayouts),
-                                    [&name](const Layout& each) { return each.name == name; });
-  return layout != std::end(kLayouts) ? layout : nullptr;
-}
-
 /// Prints the whole 64-bit words of the thread's statistics.
 void printSnapshot(Buffer snapshot, const std::string& thread) {
   std::optional<Buffer> statistics;
@@ -113,8 +107,8 @@ struct Arguments {
 
 void decode(const Arguments& arguments) {
   const bool isSnapshot = arguments.layout == kSnapshot;
-  const Layout* layout = findLayout(arguments.layout);
-  if (layout == nullptr && !isSnapshot) {
+  const auto* layout = std::ranges::find(kLayouts, arguments.layout, &Layout::name);
+  if (layout == std::end(kLayouts) && !isSnapshot) {
     throw CLI::ValidationError("LAYOUT", "there is no layout " + arguments.layout);
   }
   if (isSnapshot != arguments.thread.has_value()) {
