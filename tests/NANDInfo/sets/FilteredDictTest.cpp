@@ -48,6 +48,18 @@ TEST(FilteredDict, KeepsListedEntriesInTheOrderOfTheSource) {
 
   EXPECT_EQ(CreateFilteredDict(source, nullptr), source);
   EXPECT_EQ(CreateFilteredDict_SigDig(source, nullptr, true), source);
+
+  GenericParserCxt fields;
+  for (const char* name : {"bin10", "c", "a", "bin12", "bin9", "a"}) {
+    fields.append(name, 12345);
+  }
+  for (const bool round : {false, true}) {
+    const PropertyDict dict = CreateDictFromCxt(fields);
+    for (const FieldTable* table : {&kListed, static_cast<const FieldTable*>(nullptr)}) {
+      EXPECT_EQ(CreateFilteredDict_SigDig(fields, table, round),
+                CreateFilteredDict_SigDig(dict, table, round));
+    }
+  }
 }
 
 TEST(FilteredDict, RoundsNumbersOfEveryKindAndNothingElse) {
