@@ -1,6 +1,8 @@
 #include "config/TBConfig.h"
 
+#include <cstddef>
 #include <cstdint>
+#include <future>
 #include <optional>
 #include <utility>
 
@@ -65,7 +67,11 @@ std::unique_ptr<TBConfig> TBConfig::init() {
 }
 
 std::unique_ptr<TBConfig> TBConfig::fromBytes(std::string_view bytes) {
-  std::string digest = hexadecimalText(platform().messageDigest().md5(bytes));
+  // Beside the parsing if both take long, where a thread can be had.
+  constexpr std::size_t kLong = 1 << 20;
+  auto digest = std::async(
+      bytes.size() < kLong ? std::launch::deferred : std::launch::async | std::launch::deferred,
+      [&bytes, &digests = platform().messageDigest()] { return digests.md5(bytes); });
   std::string error;
   std::optional<PropertyValue> root = platform().ptreeSerialization().parse(bytes, error);
   if (!root || root->dict() == nullptr) {
@@ -74,7 +80,7 @@ std::unique_ptr<TBConfig> TBConfig::fromBytes(std::string_view bytes) {
     return nullptr;
   }
   std::unique_ptr<TBConfig> config(new TBConfig(*std::move(root)));
-  config->_configFileDigest = std::move(digest);
+  config->_configFileDigest = hexadecimalText(digest.get());
   return config;
 }
 
