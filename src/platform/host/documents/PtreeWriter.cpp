@@ -224,7 +224,7 @@ class TreeWriter {
     }
   }
 
-  void tag(const char* start, std::string_view name, const char* end) {
+  void tag(std::string_view start, std::string_view name, std::string_view end) {
     _text.append(start).append(name).append(end);
   }
 
