@@ -98,8 +98,8 @@ void decodeFTL(benchmark::State& state) {
   for (auto _ : state) {
     GenericParserCxt fields;
     ORUFTLParseBufferToCxt(fields, buffer);
-    benchmark::DoNotOptimize(CreateFilteredDict_SigDig(
-        CreateDictFromCxt(fields), &WhitelistedRawNANDFTLCounters_SigDigDict, true));
+    benchmark::DoNotOptimize(
+        CreateFilteredDict_SigDig(fields, &WhitelistedRawNANDFTLCounters_SigDigDict, true));
   }
 }
 
@@ -108,8 +108,8 @@ void decodeMSP(benchmark::State& state) {
   for (auto _ : state) {
     GenericParserCxt fields;
     ORUMSPParseBufferToCxt(fields, buffer);
-    benchmark::DoNotOptimize(CreateFilteredDict_SigDig(
-        CreateDictFromCxt(fields), &WhitelistedRawNANDMSPCounters_SigDigDict, true));
+    benchmark::DoNotOptimize(
+        CreateFilteredDict_SigDig(fields, &WhitelistedRawNANDMSPCounters_SigDigDict, true));
   }
 }
 
@@ -118,8 +118,8 @@ void decodeBase(benchmark::State& state) {
   for (auto _ : state) {
     ORUStatsContext context;
     ORUParseBufferToCxt(context, buffer);
-    benchmark::DoNotOptimize(CreateFilteredDict_SigDig(
-        CreateDictFromCxt(context.fields), &WhitelistedRawNANDFTLCounters_SigDigDict, true));
+    benchmark::DoNotOptimize(
+        CreateFilteredDict_SigDig(context.fields, &WhitelistedRawNANDFTLCounters_SigDigDict, true));
   }
 }
 

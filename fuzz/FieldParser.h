@@ -6,6 +6,8 @@
 #include "ExactCopy.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/GenericParserCxt.h"
+#include "NANDInfo/sets/FilteredDict.h"
+#include "NANDInfo/tables/FieldSets.h"
 #include "Require.h"
 #include "common/ProcessState.h"
 
@@ -25,7 +27,12 @@ int requireFieldsOf(Parser parse, const char* name, std::size_t width, const std
 
   const std::string error = GetAPIErrorMessage();
   require(error == "NA" || error.starts_with(name), "an error names its parser", error.c_str());
-  require(CreateDictFromCxt(ctx).size() <= ctx.size(), "a dictionary has no more than the fields");
+  const PropertyDict all = CreateDictFromCxt(ctx);
+  require(all.size() <= ctx.size(), "a dictionary has no more than the fields");
+  const FieldTable* const digits = &WhitelistedRawNANDFTLCounters_SigDigDict;
+  require(
+      CreateFilteredDict_SigDig(ctx, digits, true) == CreateFilteredDict_SigDig(all, digits, true),
+      "fields are filtered as their dictionary is");
   return 0;
 }
 

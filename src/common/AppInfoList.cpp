@@ -3,7 +3,6 @@
 #include <cstdint>
 #include <string>
 #include <string_view>
-#include <utility>
 
 #include "common/HexText.h"
 
@@ -38,7 +37,7 @@ std::string appUUID(const PropertyDict& dict, std::string_view key) {
 
 }  // namespace
 
-void AppInfoList::forEach(const std::function<void(PropertyDict app)>& visit) const {
+void AppInfoList::forEach(const std::function<bool(const PropertyDict& app)>& take) const {
   if (_appData == nullptr) {
     return;
   }
@@ -51,16 +50,11 @@ void AppInfoList::forEach(const std::function<void(PropertyDict app)>& visit) co
       info.set("adamID", appInteger(*app, "adam_id"));
       info.set("arch", appInteger(*app, "arch"));
       info.set("uuid", appUUID(*app, "uuid"));
-      visit(std::move(info));
+      if (!take(info)) {
+        return;
+      }
     }
   }
-}
-
-PropertyArray AppInfoList::array() const {
-  PropertyArray apps;
-  apps.reserve(_appData != nullptr ? _appData->size() : 0);
-  forEach([&apps](PropertyDict app) { apps.emplace_back(std::move(app)); });
-  return apps;
 }
 
 }  // namespace vesprun

@@ -18,9 +18,8 @@ class AppInfoList {
   explicit AppInfoList(const PropertyValue* appData)
       : _appData(appData != nullptr ? appData->array() : nullptr) {}
 
-  void forEach(const std::function<void(PropertyDict app)>& visit) const;
-
-  PropertyArray array() const;
+  /// Until `take` returns false.
+  void forEach(const std::function<bool(const PropertyDict& app)>& take) const;
 
  private:
   const PropertyArray* _appData;

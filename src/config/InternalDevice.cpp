@@ -15,7 +15,7 @@ const ProcessState kAnswerState([] { gIsInternalDevice.reset(); });
 
 bool TBIsInternalDevice() {
   if (!gIsInternalDevice) {
-    gIsInternalDevice = platform().orrery().OrreryGetBoolAnswer("InternalBuild");
+    gIsInternalDevice = platform().deviceInformation().OrreryGetBoolAnswer("InternalBuild");
   }
   return *gIsInternalDevice;
 }

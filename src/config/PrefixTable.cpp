@@ -10,62 +10,98 @@ std::size_t commonLength(std::string_view left, std::string_view right) {
   return static_cast<std::size_t>(end - left.begin());
 }
 
-/// The first eight bytes as a number that orders as the text does; a shorter text may tie.
-std::uint64_t head(std::string_view text) {
-  std::uint64_t head = 0;
-  for (std::size_t i = 0; i < sizeof head; ++i) {
-    head = head << 8 | (i < text.size() ? static_cast<std::uint8_t>(text[i]) : 0);
+/// The half byte at that place, counted from 1; 0 behind the end. They order as texts do.
+unsigned halfByte(std::string_view text, std::size_t at) {
+  if (at / 2 >= text.size()) {
+    return 0;
   }
-  return head;
+  const auto byte = static_cast<std::uint8_t>(text[at / 2]);
+  return (at % 2 == 0 ? byte >> 4 : byte & 0xF) + 1;
+}
+
+/// The first half byte in which two different texts differ.
+std::size_t firstDifference(std::string_view left, std::string_view right) {
+  const std::size_t at = 2 * commonLength(left, right);
+  return halfByte(left, at) != halfByte(right, at) ? at : at + 1;
 }
 
 }  // namespace
 
 PrefixTable::PrefixTable(const std::vector<std::string_view>& prefixes) {
   for (const std::string_view prefix : prefixes) {
-    _sorted.push_back({prefix, static_cast<std::uint32_t>(_sorted.size()), nullptr});
+    _sorted.push_back({prefix, static_cast<std::uint32_t>(_sorted.size())});
   }
   if (_sorted.empty()) {
     return;
   }
   std::sort(_sorted.begin(), _sorted.end(),
             [](const Entry& left, const Entry& right) { return left.text < right.text; });
-  const std::string_view front = _sorted.front().text;
-  _common = front.substr(0, commonLength(front, _sorted.back().text));
-  const Entry* longest = nullptr;
+  std::uint32_t longest = kNone;
   for (Entry& entry : _sorted) {
-    while (longest != nullptr && !entry.text.starts_with(longest->text)) {
-      longest = longest->longest;
+    while (longest != kNone && !entry.text.starts_with(_sorted[longest].text)) {
+      longest = _sorted[longest].longest;
     }
-    if (longest != nullptr) {
+    if (longest != kNone) {
       entry.longest = longest;
-      entry.first = std::min(entry.first, longest->first);
+      entry.first = std::min(entry.first, _sorted[longest].first);
     }
-    longest = &entry;
-    _heads.push_back(head(entry.text.substr(_common.size())));
+    longest = static_cast<std::uint32_t>(&entry - _sorted.data());
+  }
+
+  /// The entries below a node.
+  struct Range {
+    std::size_t node;
+    std::uint32_t from, to;
+  };
+  std::vector<Range> ranges = {{0, 0, static_cast<std::uint32_t>(_sorted.size())}};
+  _nodes.push_back({0});
+  while (!ranges.empty()) {
+    const auto [node, from, to] = ranges.back();
+    ranges.pop_back();
+    if (to - from == 1) {
+      _nodes[node] = {from};
+      continue;
+    }
+    const std::size_t at = firstDifference(_sorted[from].text, _sorted[to - 1].text);
+    const unsigned low = halfByte(_sorted[from].text, at);
+    const unsigned high = halfByte(_sorted[to - 1].text, at);
+    const std::size_t children = _nodes.size();
+    _nodes[node] = {static_cast<std::uint32_t>(children), static_cast<std::uint8_t>(low),
+                    static_cast<std::uint8_t>(high - low), at};
+    // Where there is no child, all entries have the same beginning in common with a key.
+    _nodes.resize(children + high - low + 1, {from});
+    for (std::uint32_t begin = from; begin != to;) {
+      const unsigned half = halfByte(_sorted[begin].text, at);
+      std::uint32_t end = begin + 1;
+      while (end != to && halfByte(_sorted[end].text, at) == half) {
+        ++end;
+      }
+      ranges.push_back({children + half - low, begin, end});
+      begin = end;
+    }
   }
 }
 
 std::optional<std::size_t> PrefixTable::find(std::string_view key) const {
-  if (!key.starts_with(_common)) {
+  if (_nodes.empty()) {
     return std::nullopt;
   }
-  const auto [from, to] =
-      std::equal_range(_heads.begin(), _heads.end(), head(key.substr(_common.size())));
-  const auto above = std::upper_bound(
-      _sorted.begin() + (from - _heads.begin()), _sorted.begin() + (to - _heads.begin()), key,
-      [](std::string_view text, const Entry& entry) { return text < entry.text; });
-  if (above == _sorted.begin()) {
-    return std::nullopt;
+  const Node* node = _nodes.data();
+  while (node->span != 0) {
+    node =
+        &_nodes[node->next + std::min<unsigned>(halfByte(key, node->at) - node->low, node->span)];
   }
-  const Entry* entry = &*(above - 1);
+  const Entry* entry = &_sorted[node->next];
   if (!key.starts_with(entry->text)) {
-    const std::size_t length = commonLength(entry->text, key);
-    while (entry != nullptr && entry->text.size() > length) {
-      entry = entry->longest;
-    }
+    const std::size_t length = entry->longest != kNone ? commonLength(entry->text, key) : 0;
+    do {
+      if (entry->longest == kNone) {
+        return std::nullopt;
+      }
+      entry = &_sorted[entry->longest];
+    } while (entry->text.size() > length);
   }
-  return entry != nullptr ? std::optional<std::size_t>(entry->first) : std::nullopt;
+  return entry->first;
 }
 
 }  // namespace vesprun

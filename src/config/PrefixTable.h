@@ -11,25 +11,34 @@ namespace vesprun {
 /// Finds the first prefix, in the given order, with which a key begins; the empty one fits every
 /// key.
 ///
-/// The prefixes are sorted, and each knows the longest other one that it begins with. A key's
-/// longest prefix is then the last one not above the key, or one that this one begins with.
+/// A tree over the half bytes in which the prefixes differ leads to the one that has the longest
+/// beginning in common with a key, without a look at those in between. What the key begins with is
+/// then this prefix, or one that it begins with itself.
 class PrefixTable {
  public:
-  /// Fewer than 2^32 different prefixes, whose texts outlive the table.
+  /// Fewer than a hundred million different prefixes, whose texts outlive the table.
   explicit PrefixTable(const std::vector<std::string_view>& prefixes = {});
 
   std::optional<std::size_t> find(std::string_view key) const;
 
  private:
+  static constexpr std::uint32_t kNone = 0xFFFF'FFFF;
+
   struct Entry {
     std::string_view text;
-    std::uint32_t first;   ///< lowest place of this prefix and of those that it begins with
-    const Entry* longest;  ///< other prefix that it begins with, or null
+    std::uint32_t first;  ///< lowest place of this prefix and of those that it begins with
+    std::uint32_t longest = kNone;  ///< other prefix that it begins with
+  };
+
+  struct Node {
+    std::uint32_t next;     ///< the first of its children, or a leaf's entry
+    std::uint8_t low = 0;   ///< the first child's half byte
+    std::uint8_t span = 0;  ///< children behind the first one; 0: a leaf
+    std::uint64_t at = 0;   ///< the half byte of the key that chooses
   };
 
   std::vector<Entry> _sorted;
-  std::string_view _common;           ///< beginning of all
-  std::vector<std::uint64_t> _heads;  ///< bytes after it, to search without going to the texts
+  std::vector<Node> _nodes;
 };
 
 }  // namespace vesprun

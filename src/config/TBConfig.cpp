@@ -71,7 +71,9 @@ std::unique_ptr<TBConfig> TBConfig::fromBytes(std::string_view bytes) {
   constexpr std::size_t kLong = 1 << 20;
   auto digest = std::async(
       bytes.size() < kLong ? std::launch::deferred : std::launch::async | std::launch::deferred,
-      [&bytes, &digests = platform().messageDigest()] { return digests.md5(bytes); });
+      [&bytes, &serialization = platform().ptreeSerialization()] {
+        return serialization.md5(bytes);
+      });
   std::string error;
   std::optional<PropertyValue> root = platform().ptreeSerialization().parse(bytes, error);
   if (!root || root->dict() == nullptr) {

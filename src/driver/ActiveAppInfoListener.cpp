@@ -37,6 +37,7 @@ std::string textForm(const AppInfoList& list) {
   std::string text;
   list.forEach([&text](const PropertyDict& app) {
     text += (text.empty() ? "(" : ", ") + textForm(PropertyValue(app));
+    return true;
   });
   return text.empty() ? "()" : text + ')';
 }
@@ -56,33 +57,29 @@ void takeActiveAppInfo(const PropertyDict& message) {
 
 void requestActiveAppInfo() {
   aaiRequested = true;
-  platform().notificationCenter().PostNotification(kLoggingNotification);
+  platform().eventHub().PostNotification(kLoggingNotification);
   logMessage(LogLevel::Default, "notified of logging status, waiting for activate app info");
 }
 
-}  // namespace
-
-void handlePeerMessage(const PropertyValue& message) {
-  const PropertyDict* dict = message.dict();
-  if (dict == nullptr) {
-    return;
-  }
-  const auto operation = static_cast<std::uint32_t>(integerField(*dict, "operation"));
+void handle(const PropertyDict& message) {
+  const auto operation = static_cast<std::uint32_t>(integerField(message, "operation"));
   if (operation == kActiveAppInfo) {
-    takeActiveAppInfo(*dict);
+    takeActiveAppInfo(message);
   } else if (!gMessageGateClosed.test_and_set()) {
     if (operation == kLoggingStatus) {
       requestActiveAppInfo();
     } else if (operation == kDailyTasks) {
-      runDailyTasks(static_cast<std::int32_t>(integerField(*dict, "value")), nullptr);
+      runDailyTasks(static_cast<std::int32_t>(integerField(message, "value")), nullptr);
     }
   }
 }
 
-void handleNewPeer(PeerConnection& peer) {
-  peer.setMessageHandler(
-      [](const PropertyValue& message) { runGuarded([&message] { handlePeerMessage(message); }); });
-  peer.start();
+}  // namespace
+
+void handlePeerMessage(const PropertyValue& message) noexcept {
+  if (const PropertyDict* dict = message.dict()) {
+    runGuarded([dict] { handle(*dict); });
+  }
 }
 
 }  // namespace vesprun

@@ -41,11 +41,7 @@ void runCommandLine(std::span<const char* const> commandLine) {
 
 void runListenerMode(double quietSeconds) {
   const std::unique_ptr<ServiceListener> listener =
-      platform().messageService().createListener(kServiceName);
-  if (listener) {
-    listener->setPeerHandler(handleNewPeer);
-    listener->start();
-  }
+      platform().messageService().createListener(kServiceName, handlePeerMessage);
   auto result = MainLoop::SliceResult::HandledEvent;
   // A failed slice has probably used up its event, such as a message too large to read.
   for (int failures = 0; result == MainLoop::SliceResult::HandledEvent && failures < kMostFailures;

@@ -7,15 +7,13 @@ namespace vesprun {
 /// The listener mode ends after so many seconds without a message.
 inline constexpr double kQuietSeconds = 10.0;
 
-/// The job of a process on the installed platform. `commandLine` begins with the program name,
-/// without which nothing runs. Only the next argument counts:
+/// The job of a process. `commandLine` begins with the program name, without which nothing runs.
+/// Only the next argument counts:
 ///
 /// - none: `runListenerMode`;
 /// - "-d": the day check, without app info;
 /// - "-f", "-t": the daily tasks for yesterday or today; the stored day stays;
-/// - any other: a line in the system log.
-///
-/// Failures go to the system log; the job's exit status is always 0.
+/// - any other: a line in the system log, where failures go as well.
 void runDailyDriver(std::span<const char* const> commandLine) noexcept;
 
 /// Offers the service for active-app-info messages and runs the main loop until `quietSeconds` pass

@@ -18,7 +18,8 @@ namespace vesprun {
 namespace {
 
 void logDiskUsage() {
-  const std::optional<PropertyValue> answer = platform().orrery().OrreryCopyAnswer("DiskUsage");
+  const std::optional<PropertyValue> answer =
+      platform().deviceInformation().OrreryCopyAnswer("DiskUsage");
   Tallybook& tallybook = platform().tallybook();
   tallybook.TBClientSetValueForScalarKey(
       "com.quill.homeshell.DiskUsageUserTotalBlocks",

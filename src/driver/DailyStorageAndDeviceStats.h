@@ -4,12 +4,9 @@
 
 namespace vesprun {
 
-/// Records the device's storage and hardware, in this order: disk usage and NAND info as scalars of
-/// today (the structured storage log between them), the kernel's ECC events, data usage, reporting
-/// channels. Failures go to the system log, and the next part runs.
-///
-/// Disk usage is "com.quill.homeshell.DiskUsageUserTotalBlocks" and
-/// "com.quill.homeshell.DiskUsageUserBlocksFree" in MiB, -1 when unknown.
+/// Records the device's storage and hardware: disk usage in MiB (-1 when unknown), the structured
+/// storage log, NAND info, the kernel's ECC events, data usage, reporting channels. A failure goes
+/// to the system log, and the next part runs.
 void LogDailyStorageAndDeviceStats();
 
 /// Sets each number of the NAND info, as a signed 64-bit integer, and each boolean, as 1 or 0, as a

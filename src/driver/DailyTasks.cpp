@@ -1,12 +1,9 @@
 #include "driver/DailyTasks.h"
 
-#include <string_view>
-
 #include "driver/DailyStorageAndDeviceStats.h"
 #include "driver/TaskingSync.h"
 #include "platform/Guarded.h"
 #include "platform/Platform.h"
-#include "platform/PreferenceNames.h"
 #include "report/TBReport.h"
 
 namespace vesprun {
@@ -15,7 +12,7 @@ namespace {
 /// Longer than a day's work takes; a stopped holder must not block the others for ever.
 constexpr double kLongestWaitForOthers = 300;
 
-bool isAlone() { return platform().dailyWorkLock().lock(kLongestWaitForOthers); }
+bool isAlone() { return platform().fileSystem().lockDailyWork(kLongestWaitForOthers); }
 
 std::int32_t yesterday() { return dayBefore(platform().tallybook().TBDaysSince1970()); }
 

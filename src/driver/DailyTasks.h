@@ -10,11 +10,11 @@ namespace vesprun {
 std::int32_t dayBefore(std::int32_t day);
 
 /// Runs the daily tasks for yesterday unless they have run for it or a later day, then stores
-/// yesterday as the day of the last run. A process that ends earlier leaves the stored day, so that
-/// the next one runs them again. `appInfo` may be null.
+/// yesterday. A process that ends earlier leaves the stored day: the next one runs them again.
+/// `appInfo` may be null.
 ///
-/// One process does the work; the others wait and find it done. One that has waited for minutes
-/// gives up with a line in the system log.
+/// One process does the work; the others wait and find it done, or give up after minutes with a
+/// line in the system log.
 void runDayCheck(const AppInfoList* appInfo);
 
 /// Runs the daily tasks for a day, whether or not they have run, unless another process is at them

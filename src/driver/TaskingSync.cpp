@@ -12,7 +12,6 @@
 #include "common/PropertyDict.h"
 #include "common/TextForm.h"
 #include "platform/Platform.h"
-#include "platform/PreferenceNames.h"
 
 namespace vesprun {
 namespace {
@@ -164,7 +163,7 @@ void syncTasking(const OptionalValue& build) {
   }
   applyTasking(scheduled, build, changed);
   synchronize(std::move(changed));
-  platform().notificationCenter().PostNotification("com.quill.da.tasking_changed");
+  platform().eventHub().PostNotification("com.quill.da.tasking_changed");
 }
 
 /// Equal for equal values (-0.0 and 0 too, whatever the kinds of numbers and the order of a

@@ -1,7 +1,7 @@
 #include "library/EntryPoints.h"
 
 #include <algorithm>
-#include <array>
+#include <limits>
 #include <vector>
 
 #include "NANDInfo/lists/StructuredLog.h"
@@ -33,8 +33,24 @@ constexpr EntryPointParameter kStructuredLog[] = {
     {"flag", "Passes the caller's flag on to the controller"},
     {"force", "Collects the validity list in any case"}};
 
+Answer answer(bool value) { return PropertyValue(value); }
 Answer answer(std::optional<PropertyDict> dict) {
   return dict ? Answer(*std::move(dict)) : std::nullopt;
+}
+
+template <auto function>
+Answer call(Values /*values*/) {
+  return answer(function());
+}
+template <auto function>
+Answer callWithFlag(Values values) {
+  return answer(function(values[0] != 0));
+}
+
+PropertyDict dumpedInfo() {
+  PropertyDict info;
+  DumpNANDInfo(info);
+  return info;
 }
 
 /// True when the controller could be opened; it is closed again.
@@ -48,95 +64,57 @@ bool connectsToController() {
 std::uint32_t low32(std::uint64_t value) { return static_cast<std::uint32_t>(value); }
 
 constexpr EntryPointRow kEntryPoints[] = {
-    {"info",
-     "CopyNANDInfo",
-     "The legacy NAND info",
-     {},
-     [](Values) { return answer(CopyNANDInfo()); }},
-    {"info-for-daily-log",
-     "CopyNANDInfoWithOptions",
+    {"info", "CopyNANDInfo", "The legacy NAND info", call<CopyNANDInfo>},
+    {"info-for-daily-log", "CopyNANDInfoWithOptions",
      "The legacy NAND info, on the days when the daily log has it",
-     {},
      [](Values) { return answer(CopyNANDInfoWithOptions({})); }},
-    {"dump",
-     "DumpNANDInfo",
-     "The legacy NAND info without its version fields",
-     {},
-     [](Values) {
-       PropertyDict info;
-       DumpNANDInfo(info);
-       return answer(std::move(info));
-     }},
-    {"ftl-raw", "CopyNANDFTLInfo", "The FTL fields, all of them", kStatKeys,
-     [](Values values) { return answer(CopyNANDFTLInfo(values[0] != 0, 1)); }},
-    {"ftl", "CopyWhitelistedNANDFTLInfo", "The FTL fields that may leave the device", kRound,
-     [](Values values) { return answer(CopyWhitelistedNANDFTLInfo(values[0] != 0)); }},
+    {"dump", "DumpNANDInfo", "The legacy NAND info without its version fields", call<dumpedInfo>},
+    {"ftl-raw", "CopyNANDFTLInfo", "The FTL fields, all of them",
+     [](Values values) { return answer(CopyNANDFTLInfo(values[0] != 0, 1)); }, kStatKeys},
+    {"ftl", "CopyWhitelistedNANDFTLInfo", "The FTL fields that may leave the device",
+     callWithFlag<CopyWhitelistedNANDFTLInfo>, kRound},
     {"msp", "CopyWhitelistedNANDMSPInfo", "The fields of each MSP that may leave the device",
-     kRound, [](Values values) { return answer(CopyWhitelistedNANDMSPInfo(values[0] != 0)); }},
+     callWithFlag<CopyWhitelistedNANDMSPInfo>, kRound},
     {"storage-stats", "CopyWhitelistedStorageStats",
-     "The storage statistics that may leave the device", kRound,
-     [](Values values) { return answer(CopyWhitelistedStorageStats(values[0] != 0)); }},
-    {"vm-freezer",
-     "CopyVMFreezerNANDInfo",
-     "What the kernel's swap-out thread has written",
-     {},
-     [](Values) { return answer(CopyVMFreezerNANDInfo()); }},
+     "The storage statistics that may leave the device", callWithFlag<CopyWhitelistedStorageStats>,
+     kRound},
+    {"vm-freezer", "CopyVMFreezerNANDInfo", "What the kernel's swap-out thread has written",
+     call<CopyVMFreezerNANDInfo>},
     {"magazine", "CopySMagNANDFTLInfo", "What happened since a snapshot of the stats magazine",
-     kMagazine,
      [](Values values) {
        return answer(CopySMagNANDFTLInfo(values[0], values[1] != 0 ? 0 : 1, low32(values[2])));
-     }},
-    {"magazine-history",
-     "CopySMagNANDFTLCustomHistoryInfo",
+     },
+     kMagazine},
+    {"magazine-history", "CopySMagNANDFTLCustomHistoryInfo",
      "The write amplification of the last six periods of four hours",
-     {},
      [](Values) { return answer(CopySMagNANDFTLCustomHistoryInfo(0)); }},
-    {"tendmark",
-     "CopyTendmarkNANDInfo",
-     "The storage's health, for service plans",
-     {},
-     [](Values) { return answer(CopyTendmarkNANDInfo()); }},
-    {"ota",
-     "CopyOTANANDInfo",
-     "The storage's health, for updates over the air",
-     {},
-     [](Values) { return answer(CopyOTANANDInfo()); }},
-    {"lab",
-     "CopyInternalLabNANDInfo",
-     "The storage's health, for labs",
-     {},
-     [](Values) { return answer(CopyInternalLabNANDInfo()); }},
-    {"recommends-deletion",
-     "NandRecommendsContentDeletion",
-     "Does the controller recommend deleting content?",
-     {},
-     [](Values) { return Answer(NandRecommendsContentDeletion()); }},
+    {"tendmark", "CopyTendmarkNANDInfo", "The storage's health, for service plans",
+     call<CopyTendmarkNANDInfo>},
+    {"ota", "CopyOTANANDInfo", "The storage's health, for updates over the air",
+     call<CopyOTANANDInfo>},
+    {"lab", "CopyInternalLabNANDInfo", "The storage's health, for labs",
+     call<CopyInternalLabNANDInfo>},
+    {"recommends-deletion", "NandRecommendsContentDeletion",
+     "Does the controller recommend deleting content?", call<NandRecommendsContentDeletion>},
     {"events", "NandInfoExtractToEH_runAllSteps",
-     "Sends the storage statistics as analytics events, and shows what was sent", kEvents,
+     "Sends the storage statistics as analytics events, and shows what was sent",
      [](Values values) {
        return answer(NandInfoExtractToEH_runAllSteps(0, values[1] == 0, 1, low32(values[0])));
-     }},
+     },
+     kEvents},
     {"structured-log", "DumpStorageStructuredLog",
-     "Logs the controller's lists: true when all could be handled", kStructuredLog,
+     "Logs the controller's lists: true when all could be handled",
      [](Values values) {
        gForceCollectionSet = values[1] != 0 ? 1 : 0;
-       return Answer(DumpStorageStructuredLog(values[0] != 0));
-     }},
-    {"disk",
-     "GetDiskInfo",
-     "Size and fullness of the user data volume",
-     {},
-     [](Values) { return answer(GetDiskInfo()); }},
-    {"nvram",
-     "gatherNVRAMStats",
-     "The usage and write counters of the NVRAM",
-     {},
-     [](Values) { return answer(gatherNVRAMStats()); }},
-    {"connect",
-     "openORUConnection",
+       return answer(DumpStorageStructuredLog(values[0] != 0));
+     },
+     kStructuredLog},
+    {"disk", "GetDiskInfo", "Size and fullness of the user data volume", call<GetDiskInfo>},
+    {"nvram", "gatherNVRAMStats", "The usage and write counters of the NVRAM",
+     call<gatherNVRAMStats>},
+    {"connect", "openORUConnection",
      "Opens the controller and closes it: true when it could be opened",
-     {},
-     [](Values) { return Answer(connectsToController()); }},
+     call<connectsToController>},
 };
 
 /// The value of an argument as JSON has it; nothing when it is not of the parameter's kind.
@@ -166,9 +144,9 @@ std::string callToJson(const EntryPointRow& entryPoint, std::span<const std::uin
 
 std::optional<std::string> callByName(std::string_view name, std::string_view arguments,
                                       std::string& error) {
-  const auto* const row = std::find_if(
-      std::begin(kEntryPoints), std::end(kEntryPoints),
-      [name](const EntryPointRow& each) { return name == each.command || name == each.function; });
+  const auto* const row = std::ranges::find_if(kEntryPoints, [name](const EntryPointRow& each) {
+    return name == each.command || name == each.function;
+  });
   if (row == std::end(kEntryPoints)) {
     error = "there is no entry point " + quotedText(name);
     return std::nullopt;
@@ -183,8 +161,7 @@ std::optional<std::string> callByName(std::string_view name, std::string_view ar
     }
     for (const auto& [key, argument] : *value->dict()) {
       const auto parameter =
-          std::find_if(row->parameters.begin(), row->parameters.end(),
-                       [&name = key](const auto& each) { return each.name == name; });
+          std::ranges::find(row->parameters, std::string_view(key), &EntryPointParameter::name);
       if (parameter == row->parameters.end()) {
         error = place + "there is no argument " + quotedText(key);
         return std::nullopt;

@@ -1,7 +1,6 @@
 #pragma once
 
 #include <cstdint>
-#include <limits>
 #include <optional>
 #include <span>
 #include <string>
@@ -27,9 +26,9 @@ struct EntryPointRow {
   const char* command;
   const char* function;
   const char* help;
-  std::span<const EntryPointParameter> parameters;
   /// Takes one value for each parameter. Nothing when the entry point answers nothing.
   std::optional<PropertyValue> (*call)(std::span<const std::uint64_t> values);
+  std::span<const EntryPointParameter> parameters{};
 };
 
 std::span<const EntryPointRow> entryPoints();

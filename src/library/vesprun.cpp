@@ -60,14 +60,15 @@ Result callFromC(Result failed, const Body& body) noexcept {
 }
 
 /// 0, or -1 on failure, of a change of the counter `key`.
-template <typename Change>
-int changeCounter(vesprun_device* device, const char* key, const Change& change) noexcept {
+template <typename Value>
+int changeCounter(vesprun_device* device, const char* key, Value value,
+                  bool (vesprun::Device::*change)(std::string_view, Value, std::string&)) noexcept {
   return callFromC(-1, [&](std::string& error) {
     if (device == nullptr || key == nullptr) {
       error = device == nullptr ? "no device is given" : "no key is given";
       return -1;
     }
-    return change(*device->device, key, error) ? 0 : -1;
+    return (*device->device.*change)(key, value, error) ? 0 : -1;
   });
 }
 
@@ -97,32 +98,25 @@ void vesprun_close(vesprun_device* device) {
 }
 
 int vesprun_set_scalar(vesprun_device* device, const char* key, int64_t value) {
-  return changeCounter(device, key,
-                       [value](vesprun::Device& counters, const char* scalar, std::string& error) {
-                         return counters.setScalar(scalar, value, error);
-                       });
+  return changeCounter(device, key, value, &vesprun::Device::setScalar);
 }
 
 int vesprun_add_to_scalar(vesprun_device* device, const char* key, int64_t value) {
-  return changeCounter(device, key,
-                       [value](vesprun::Device& counters, const char* scalar, std::string& error) {
-                         return counters.addToScalar(scalar, value, error);
-                       });
+  return changeCounter(device, key, value, &vesprun::Device::addToScalar);
 }
 
 int vesprun_add_to_distribution(vesprun_device* device, const char* key, double value) {
-  return changeCounter(
-      device, key,
-      [value](vesprun::Device& counters, const char* distribution, std::string& error) {
-        return counters.addToDistribution(distribution, value, error);
-      });
+  return changeCounter(device, key, value, &vesprun::Device::addToDistribution);
 }
 
 int vesprun_checkpoint(vesprun_device* device) {
-  return changeCounter(device, "",
-                       [](vesprun::Device& counters, const char* /*key*/, std::string& error) {
-                         return counters.checkpoint(error);
-                       });
+  return callFromC(-1, [device](std::string& error) {
+    if (device == nullptr) {
+      error = "no device is given";
+      return -1;
+    }
+    return device->device->checkpoint(error) ? 0 : -1;
+  });
 }
 
 char* vesprun_call(vesprun_device* device, const char* entry_point, const char* arguments) {

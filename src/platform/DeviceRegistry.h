@@ -16,48 +16,43 @@ using RegistryResult = std::uint32_t;
 inline constexpr RegistryResult kRegistrySuccess = 0;
 
 /// The device registry: a tree of driver objects, and the user-client connections to them. Each
-/// look-up gives a new handle, even for an object that was found before. The caller returns objects
-/// with `DevRegObjectRelease` (or lets `RegistryObject` do it) and connections with
-/// `DevRegServiceClose`.
+/// look-up gives a new handle, 0 on failure. The caller returns objects with `DevRegObjectRelease`
+/// (or lets `RegistryObject` do it) and connections with `DevRegServiceClose`.
 class DeviceRegistry {
  public:
   enum class SearchDirection { Parents, Children };
 
   virtual ~DeviceRegistry() = default;
 
-  /// The first service that can be matched and is of the class, or of one that conforms to it; else
-  /// 0.
+  /// The first service that can be matched and conforms to the class.
   virtual RegistryHandle DevRegServiceGetMatchingService(const std::string& className) = 0;
 
-  /// The root of the registry; 0 when there is none.
   virtual RegistryHandle DevRegRegistryGetRootEntry() = 0;
 
-  /// An iterator over everything below an entry in the service plane, parents first; 0 on failure.
+  /// An iterator over everything below an entry in the service plane, parents first.
   virtual RegistryHandle DevRegRegistryEntryCreateIterator(RegistryHandle entry) = 0;
 
   /// The next object of an iterator; 0 at its end.
   virtual RegistryHandle DevRegIteratorNext(RegistryHandle iterator) = 0;
 
-  /// Is the object of the class, or of one that conforms to it?
+  /// Is the object of the class, or of one derived from it?
   virtual bool DevRegObjectConformsTo(RegistryHandle object, const std::string& className) = 0;
 
   /// Returns a handle. Nothing happens for 0.
   virtual void DevRegObjectRelease(RegistryHandle object) = 0;
 
-  /// A property of the entry, else of the nearest one above it or the first one below it in the
-  /// service plane.
+  /// A property of the entry, else of the nearest one above it or the first one below it.
   virtual std::optional<PropertyValue> DevRegRegistryEntrySearchProperty(
       RegistryHandle entry, const std::string& key, SearchDirection direction) = 0;
 
   /// Opens a user client of type 0 for this process. On failure `connection` is 0.
   virtual RegistryResult DevRegServiceOpen(RegistryHandle service, RegistryHandle& connection) = 0;
 
-  /// Closes a connection, which is gone whatever the result. For 0: an error, and nothing happens.
+  /// Closes a connection, which is gone whatever the result. For 0 an error.
   virtual RegistryResult DevRegServiceClose(RegistryHandle connection) = 0;
 
-  /// Calls a method with a structure in and a structure out; either may be empty. On success
-  /// `outputLength` is the length that the driver reports, which may differ from what it wrote; it
-  /// never writes past `output`. On failure `outputLength` is untouched.
+  /// Calls a method with a structure in and one out; either may be empty. On success `outputLength`
+  /// is what the driver reports, which may differ from what it wrote, never past `output`.
   virtual RegistryResult DevRegConnectCallStructMethod(RegistryHandle connection,
                                                        std::uint32_t method,
                                                        std::span<const std::uint8_t> input,

@@ -7,7 +7,7 @@
 
 namespace vesprun {
 
-/// The platform's analytics event service.
+/// The platform's analytics events and notifications.
 class EventHub {
  public:
   using PayloadBuilder = std::function<PropertyDict()>;
@@ -24,6 +24,9 @@ class EventHub {
   /// event and can send. True when the service took the offer, even of an event that it does not
   /// want.
   virtual bool EventHubSendEventLazy(std::string_view event, const PayloadBuilder& build) = 0;
+
+  /// Posts a system-wide notification, which carries no data.
+  virtual void PostNotification(std::string_view name) = 0;
 };
 
 }  // namespace vesprun

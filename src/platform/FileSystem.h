@@ -26,6 +26,12 @@ class FileSystem {
 
   /// The file system of a path; nothing when it cannot be measured.
   virtual std::optional<FileSystemStatistics> statfs(const std::string& path) = 0;
+
+  /// Lets one process at a time do the day's work. Waits `seconds` at most, and holds the lock
+  /// until the services have written what they held back at the platform's end. False when another
+  /// process keeps it that long. A lock that the system cannot give is an error line and counts as
+  /// taken: the work must be done.
+  virtual bool lockDailyWork(double seconds) = 0;
 };
 
 }  // namespace vesprun

@@ -20,13 +20,12 @@ class Kernel {
  public:
   virtual ~Kernel() = default;
 
-  /// Reads a variable into `buffer`. 0 on success, with the bytes written in `length`; otherwise a
-  /// system error number, and `buffer` is untouched. The variable must be of the buffer's size;
-  /// text must fit with its final NUL.
+  /// Reads a variable into `buffer`. 0, and the bytes written in `length`; or a system error number,
+  /// and `buffer` untouched. The variable must have the buffer's size; text, with its final NUL, may
+  /// be shorter.
   ///
-  /// "kern.next_ecc_event" (72 bytes) is a queue: each read takes one event, and an empty queue is
-  /// error 2. Where the platform can keep events, one that was read and not acknowledged is in the
-  /// queue again after the process.
+  /// "kern.next_ecc_event" (72 bytes) is a queue: each read takes one event; error 2 when it is
+  /// empty. An event that is not acknowledged comes back with the next process.
   virtual int sysctlbyname(const std::string& name, std::span<std::uint8_t> buffer,
                            std::size_t& length) = 0;
 

@@ -9,19 +9,13 @@
 
 namespace vesprun {
 
-/// The file of a log under submission; it appears, complete, when its writer has returned.
-class LogFileHandle {
- public:
-  virtual ~LogFileHandle() = default;
-
-  /// False when the bytes could not be written; the submission then fails.
-  virtual bool write(std::string_view bytes) = 0;
-};
+/// Writes to the file of a log under submission. False when it failed; the submission then fails.
+using LogFileHandle = std::function<bool(std::string_view bytes)>;
 
 /// The platform's diagnostics services.
 class Logsmith {
  public:
-  using LogWriter = std::function<void(LogFileHandle& file)>;
+  using LogWriter = std::function<void(const LogFileHandle& write)>;
 
   virtual ~Logsmith() = default;
 

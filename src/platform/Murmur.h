@@ -20,9 +20,8 @@ inline constexpr std::string_view kUsageSinceKey = "since";
 enum class UsageNameKind { Process, Bundle };
 
 /// A connection to a usage service.
-class UsageWorkspace {
- public:
-  virtual ~UsageWorkspace() = default;
+struct UsageWorkspace {
+  std::string_view endpoint;
 };
 
 /// Network usage by process.
@@ -42,19 +41,16 @@ class UsageFeed {
 
 /// The platform's usage feed.
 ///
-/// A reply may come while the process ends. The platform therefore ends this service first: it
-/// waits for a running handler and drops the others. A handler may use only services that are safe
-/// from any thread (`Tallybook`, `Preferences`, `PtreeSerialization`, `SystemLog`), by references
-/// taken before: another platform may be installed by then.
+/// The platform ends this service first: it waits for a running handler and drops the others. A
+/// handler may use only services that are safe from any thread (`Tallybook`, `Preferences`,
+/// `PtreeSerialization`, `SystemLog`), by references taken before: another platform may be installed
+/// by then.
 class Murmur {
  public:
   virtual ~Murmur() = default;
 
   /// Never null.
-  virtual std::shared_ptr<UsageWorkspace> createUsageWorkspace(std::string_view endpoint) = 0;
-
-  /// Never null. The feed keeps its workspace.
-  virtual std::shared_ptr<UsageFeed> createUsageFeed(std::shared_ptr<UsageWorkspace> workspace) = 0;
+  virtual std::shared_ptr<UsageFeed> createUsageFeed(const UsageWorkspace& workspace) = 0;
 };
 
 }  // namespace vesprun

@@ -1,32 +1,19 @@
 #pragma once
 
 #include "platform/Clock.h"
-#include "platform/DailyWorkLock.h"
+#include "platform/DeviceInformation.h"
 #include "platform/DeviceRegistry.h"
-#include "platform/DiagnosticHeader.h"
 #include "platform/EventHub.h"
 #include "platform/FileSystem.h"
-#include "platform/InstalledApplications.h"
 #include "platform/Kernel.h"
-#include "platform/Languages.h"
 #include "platform/Logsmith.h"
-#include "platform/MainLoop.h"
-#include "platform/MessageDigest.h"
 #include "platform/MessageService.h"
 #include "platform/Murmur.h"
-#include "platform/NotificationCenter.h"
-#include "platform/Orrery.h"
 #include "platform/Preferences.h"
-#include "platform/ProcessInformation.h"
 #include "platform/PtreeSerialization.h"
-#include "platform/Reclaimer.h"
-#include "platform/ServicesClient.h"
-#include "platform/SupportLibrary.h"
-#include "platform/SystemConfiguration.h"
 #include "platform/SystemLog.h"
 #include "platform/Tallybook.h"
 #include "platform/Tapline.h"
-#include "platform/UserDefaults.h"
 
 namespace vesprun {
 
@@ -44,31 +31,21 @@ struct Platform {
   };
 
   Service<Clock> clock;
-  Service<DailyWorkLock> dailyWorkLock;
+  Service<DeviceInformation> deviceInformation;
   Service<DeviceRegistry> deviceRegistry;
-  Service<DiagnosticHeader> diagnosticHeader;
   Service<EventHub> eventHub;
   Service<FileSystem> fileSystem;
-  Service<InstalledApplications> installedApplications;
   Service<Kernel> kernel;
-  Service<Languages> languages;
   Service<Logsmith> logsmith;
   Service<MainLoop> mainLoop;
-  Service<MessageDigest> messageDigest;
   Service<MessageService> messageService;
   Service<Murmur> murmur;
-  Service<NotificationCenter> notificationCenter;
-  Service<Orrery> orrery;
   Service<Preferences> preferences;
-  Service<ProcessInformation> processInformation;
   Service<PtreeSerialization> ptreeSerialization;
-  Service<Reclaimer> reclaimer;
   Service<LGSServicesClient> servicesClient;
-  Service<SupportLibrary> supportLibrary;
   Service<LGSSystemConfiguration> systemConfiguration;
   Service<SystemLog> systemLog;
   Service<Tallybook> tallybook;
-  Service<UserDefaults> userDefaults;
   Service<Tapline> tapline;
 };
 

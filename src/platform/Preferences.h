@@ -6,10 +6,30 @@
 
 #include "common/PropertyValue.h"
 
+// Stored values. This process sees a change at once; it is written when it is synchronized, or when
+// the process ends. A value of nothing removes the key.
+//
+// Keys, domains and users may come from foreign data. A missing key, an empty (or missing) domain
+// or user and an impossible name are refused with an error in the system log.
+
 namespace vesprun {
 
-/// The mobile user's preferences, a dictionary for each domain. This process sees a change at once;
-/// it is written when its domain is synchronized, or when the process ends. Safe from any thread.
+/// The job's own domain, its memory from one day to the next.
+inline constexpr std::string_view kOwnDomain = "com.quill.aggregated.vesprun";
+
+/// In it: the last day for which the daily tasks were run.
+inline constexpr std::string_view kStoredDayKey = "LastCrashLogSerializationDateInDaysSince1970";
+
+// In it: the current tasking, as the daily log reports it.
+inline constexpr std::string_view kTaskingIDKey = "TaskingID";
+inline constexpr std::string_view kTaskingDigestKey = "TaskingDigest";
+inline constexpr std::string_view kTaskingPayloadKey = "TaskingPayload";
+
+/// In the domain of all aggregated figures: how often the counter database was damaged.
+inline constexpr std::string_view kAggregatedDomain = "com.quill.aggregated";
+inline constexpr std::string_view kCorruptionCountKey = "DatabaseCorruptionCount";
+
+/// The mobile user's preferences, a dictionary for each domain. Safe from any thread.
 class Preferences {
  public:
   virtual ~Preferences() = default;
@@ -17,9 +37,6 @@ class Preferences {
   virtual std::optional<PropertyValue> LGSPreferencesGetValue(std::string_view key,
                                                               std::string_view domain) = 0;
 
-  /// Sets a value, or removes the key when there is none. Key and domain may come from foreign
-  /// data: a missing key, an empty (or missing) domain and an impossible domain name are refused
-  /// with an error in the system log.
   virtual void LGSPreferencesSetValue(std::optional<std::string_view> key,
                                       std::optional<PropertyValue> value,
                                       std::string_view domain) = 0;
@@ -33,6 +50,45 @@ class Preferences {
 
   /// `found`: the key holds a boolean or a number, which is true unless it is 0.
   bool LGSPreferencesGetBoolValue(std::string_view key, std::string_view domain, bool& found);
+};
+
+/// The preferences of users other than the mobile one.
+class LGSServicesClient {
+ public:
+  virtual ~LGSServicesClient() = default;
+
+  virtual void setPreferenceForUserInDomainToValue(std::optional<std::string_view> key,
+                                                   std::string_view user, std::string_view domain,
+                                                   std::optional<PropertyValue> value) = 0;
+
+  virtual void deletePreferenceForUserInDomain(std::optional<std::string_view> key,
+                                               std::string_view user, std::string_view domain) = 0;
+
+  /// Writes all changes durably; failures go to the system log.
+  virtual void synchronizeAllUsers() = 0;
+};
+
+/// The diagnostics service's own configuration, a dictionary for each domain.
+class LGSSystemConfiguration {
+ public:
+  virtual ~LGSSystemConfiguration() = default;
+
+  /// `options` is 0: none is in use.
+  virtual std::optional<PropertyValue> getPrefsKeyForDomainWithOptions(std::string_view key,
+                                                                       std::string_view domain,
+                                                                       std::uint32_t options) = 0;
+
+  /// With `sync` the next `synchronize` makes the domain durable; else it is when it is next
+  /// written or the process ends.
+  virtual void setPrefsKeyValueForDomainWithSync(std::optional<std::string_view> key,
+                                                 std::optional<PropertyValue> value,
+                                                 std::string_view domain, bool sync) = 0;
+
+  /// Writes each domain that was changed with `sync` once. The system log has what failed.
+  virtual void synchronize() = 0;
+
+  /// Log types that are disabled unless the user's preferences say otherwise, in order.
+  virtual PropertyArray getLogBlacklist() = 0;
 };
 
 }  // namespace vesprun

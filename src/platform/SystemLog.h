@@ -1,14 +1,15 @@
 #pragma once
 
 #include <cstdint>
-#include <exception>
-#include <string>
 #include <string_view>
 
 namespace vesprun {
 
 /// Gravest first; a log that keeps one level keeps all graver ones.
 enum class LogLevel : std::uint8_t { Error, Default, Notice, Info, Debug };
+
+inline constexpr std::string_view kLogLevelNames[] = {"error", "default", "notice", "info",
+                                                      "debug"};
 
 /// The system log. Writing never fails for the caller and is safe from any thread.
 class SystemLog {

@@ -30,8 +30,8 @@ class TBHistoryDistributionEnumerator {
 
 /// The rows of the counter database. Both queries deliver the rows from `minDay` to `maxDay`, both
 /// included, whose key begins with `keyPrefix`, by day and then by key (byte order). Setting `stop`
-/// ends the query after the row. Of a damaged database they deliver the rows and values before the
-/// damage, which the service reports in the system log, and give false.
+/// ends the query. Of a damaged database they deliver what comes before the damage, which goes to
+/// the system log, and give false.
 class TBHistory {
  public:
   using ScalarRowHandler =

@@ -2,8 +2,10 @@
 
 #include <cstdint>
 #include <functional>
-#include <memory>
+#include <optional>
 #include <string>
+#include <utility>
+#include <vector>
 
 namespace vesprun {
 
@@ -19,12 +21,20 @@ enum class TaplineResult : std::int32_t {
 /// A reporting channel, or its reading in a sample.
 class TaplineChannel {
  public:
-  virtual ~TaplineChannel() = default;
+  TaplineChannel(std::string name, std::int64_t format, std::int64_t reading)
+      : _name(std::move(name)), _format(format), _reading(reading) {}
 
-  virtual std::int64_t TaplineChannelGetFormat() const = 0;
-  virtual std::string TaplineChannelGetChannelName() const = 0;
+  std::int64_t TaplineChannelGetFormat() const { return _format; }
+  const std::string& TaplineChannelGetChannelName() const { return _name; }
   /// The reading, in a sample, of a channel of the simple format; else 0.
-  virtual std::int64_t TaplineSimpleGetIntegerValue() const = 0;
+  std::int64_t TaplineSimpleGetIntegerValue() const {
+    return _format == kTaplineFormatSimple ? _reading : 0;
+  }
+
+ private:
+  std::string _name;
+  std::int64_t _format;
+  std::int64_t _reading;
 };
 
 /// A set of reporting channels, or a sample of them.
@@ -32,38 +42,50 @@ class TaplineChannels {
  public:
   using Visitor = std::function<TaplineResult(const TaplineChannel& channel)>;
 
-  virtual ~TaplineChannels() = default;
+  explicit TaplineChannels(std::vector<TaplineChannel> channels) : _channels(std::move(channels)) {}
 
   /// Removes the channels for which `filter` answers so.
-  virtual void TaplinePrune(const Visitor& filter) = 0;
+  void TaplinePrune(const Visitor& filter) {
+    std::erase_if(_channels, [&](const TaplineChannel& channel) {
+      return filter(channel) == TaplineResult::Remove;
+    });
+  }
 
   /// Visits the channels in order until the visitor answers other than `Continue`.
-  virtual void TaplineIterate(const Visitor& visitor) const = 0;
+  void TaplineIterate(const Visitor& visitor) const {
+    for (const TaplineChannel& channel : _channels) {
+      if (visitor(channel) != TaplineResult::Continue) {
+        return;
+      }
+    }
+  }
+
+ private:
+  std::vector<TaplineChannel> _channels;
 };
 
-/// Reads subscribed channels.
-class TaplineSubscription {
- public:
-  virtual ~TaplineSubscription() = default;
-
-  /// A reading of every subscribed channel; null when none can be taken.
-  virtual std::unique_ptr<TaplineChannels> TaplineCreateSamples() = 0;
+/// The channels that are read.
+struct TaplineSubscription {
+  TaplineChannels channels;
 };
 
-/// The kernel's reporting channels. The caller owns every result.
+/// The kernel's reporting channels.
 class Tapline {
  public:
   virtual ~Tapline() = default;
 
-  /// The channels in any category of the mask; null when there are none. Selections are the
+  /// The channels in any category of the mask; nothing when there are none. Selections are the
   /// platform's own: 1 and 0 select every such channel.
-  virtual std::unique_ptr<TaplineChannels> TaplineCopyChannelsInCategories(
+  virtual std::optional<TaplineChannels> TaplineCopyChannelsInCategories(
       std::uint64_t categoryMask, std::uint64_t firstSelection, std::uint64_t secondSelection) = 0;
 
-  /// Subscribes to channels; null on failure. `subscribed` becomes the set that the subscription
-  /// reads, and may stay null.
-  virtual std::unique_ptr<TaplineSubscription> TaplineCreateSubscription(
-      const TaplineChannels& wanted, std::unique_ptr<TaplineChannels>& subscribed) = 0;
+  /// Subscribes to channels; nothing on failure.
+  virtual std::optional<TaplineSubscription> TaplineCreateSubscription(
+      const TaplineChannels& wanted) = 0;
+
+  /// A reading of every subscribed channel; nothing when none can be taken.
+  virtual std::optional<TaplineChannels> TaplineCreateSamples(
+      const TaplineSubscription& subscription) = 0;
 };
 
 }  // namespace vesprun

@@ -4,7 +4,6 @@
 
 #include "common/TextForm.h"
 #include "platform/Platform.h"
-#include "platform/PreferenceNames.h"
 
 namespace vesprun {
 namespace {
@@ -19,18 +18,28 @@ PropertyDict headerOf(const std::optional<PropertyValue>& last, const PropertyVa
   return {{"previous_os_version", last ? textForm(*last) : "<unknown>"}};
 }
 
-}  // namespace
-
-std::optional<std::string> serializeDailyLog(const PropertyDict& document) {
-  std::string error;
-  std::optional<std::string> bytes = platform().ptreeSerialization().serialize(document, error);
-  if (!bytes) {
-    logMessage(LogLevel::Error, "Could not create aggregated ptree: %s", error.c_str());
+PtreeDocument withApps(const PropertyDict& document, const AppInfoList* appInfo) {
+  if (appInfo == nullptr) {
+    return {document};
   }
-  return bytes;
+  return {document, "TBActivatedAppInfo", [appInfo](const auto& take) { appInfo->forEach(take); }};
 }
 
-bool submitDailyLog(const std::string& bytes) {
+}  // namespace
+
+bool canSerializeDailyLog(const PropertyDict& document, const AppInfoList* appInfo) {
+  std::string error;
+  if (!platform().ptreeSerialization().canSerialize(withApps(document, appInfo), error)) {
+    logMessage(LogLevel::Error, "Could not create aggregated ptree: %s", error.c_str());
+    return false;
+  }
+  return true;
+}
+
+bool submitDailyLog(const PropertyDict& document, const AppInfoList* appInfo) {
+  if (!canSerializeDailyLog(document, appInfo)) {
+    return false;
+  }
   Preferences& preferences = platform().preferences();
   const PropertyValue osVersion = platform().logsmith().LGSOSVersion();
   const PropertyDict header =
@@ -40,8 +49,9 @@ bool submitDailyLog(const std::string& bytes) {
     preferences.LGSPreferencesSynchronize(kOwnDomain);
   }
   const bool submitted = platform().logsmith().LGSWriteLogForSubmission(
-      "193", "log-aggregated", header.empty() ? nullptr : &header,
-      [&bytes](LogFileHandle& file) { file.write(bytes); });
+      "193", "log-aggregated", header.empty() ? nullptr : &header, [&](const LogFileHandle& write) {
+        platform().ptreeSerialization().serialize(withApps(document, appInfo), write);
+      });
   if (!submitted) {
     logMessage(LogLevel::Error, "%s", kSubmissionFailed);
   }

@@ -1,8 +1,6 @@
 #pragma once
 
-#include <optional>
-#include <string>
-
+#include "common/AppInfoList.h"
 #include "common/PropertyDict.h"
 
 namespace vesprun {
@@ -10,11 +8,12 @@ namespace vesprun {
 /// Logged, at error level, when the diagnostics service does not take the log.
 inline constexpr const char* kSubmissionFailed = "Failed to write aggregated log";
 
-/// The bytes of a daily log; nothing, with an error line, when no document can carry it.
-std::optional<std::string> serializeDailyLog(const PropertyDict& document);
+/// False, with an error line, when no document can carry the daily log.
+bool canSerializeDailyLog(const PropertyDict& document, const AppInfoList* appInfo = nullptr);
 
-/// Submits the bytes as log "log-aggregated" of type "193". The header names the previous OS
-/// version on the first log after it changed. False, with an error line, when that failed.
-bool submitDailyLog(const std::string& bytes);
+/// Submits the daily log as "log-aggregated" of type "193", with the active apps when there are
+/// any. The header names the previous OS version on the first log after it changed. False, with an
+/// error line, when that failed or the log cannot be serialized.
+bool submitDailyLog(const PropertyDict& document, const AppInfoList* appInfo = nullptr);
 
 }  // namespace vesprun

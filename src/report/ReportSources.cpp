@@ -4,7 +4,6 @@
 #include <vector>
 
 #include "platform/Platform.h"
-#include "platform/PreferenceNames.h"
 #include "report/KernelMemoryStatistics.h"
 #include "report/SupportLibraryFunctions.h"
 
@@ -61,7 +60,7 @@ std::optional<InstalledAppCounts> addInstalledAppInfo(TBReport& report) {
     return std::nullopt;
   }
   InstalledAppCounts counts;
-  platform().installedApplications().EnumerateInstalledBundles(
+  platform().deviceInformation().EnumerateInstalledBundles(
       [&](std::string_view /*bundle*/, BundleType type) {
         ++counts.all;
         counts.thirdParty += type == BundleType::User ? 1 : 0;
@@ -83,12 +82,12 @@ void offerAppInstallsEvent(const InstalledAppCounts& counts) {
 }
 
 void addMetadataKeys(PropertyDict& metadata) {
-  Languages& languages = platform().languages();
-  const std::vector<std::string> preferred = languages.preferredLanguages();
-  metadata.set("TBUserInterfaceLanguage", firstOrUnknown(languages.bestLocalizations(
-                                              languages.systemLocalizations(), preferred)));
+  DeviceInformation& device = platform().deviceInformation();
+  const std::vector<std::string> preferred = device.preferredLanguages();
+  metadata.set("TBUserInterfaceLanguage",
+               firstOrUnknown(device.bestLocalizations(device.systemLocalizations(), preferred)));
   metadata.set("TBPreferredUserInterfaceLanguage", firstOrUnknown(preferred));
-  if (const std::optional<std::string> country = languages.localeCountryCode()) {
+  if (const std::optional<std::string> country = device.localeCountryCode()) {
     metadata.set("TBUserSetRegionFormat", *country);
   }
 }

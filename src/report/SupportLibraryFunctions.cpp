@@ -15,16 +15,16 @@ bool resolveSupportLibraryFunctions() {
   if (gBothResolved) {
     return true;
   }
-  SupportLibrary& library = platform().supportLibrary();
-  if (!library.load()) {
+  DeviceInformation& device = platform().deviceInformation();
+  if (!device.loadSupportLibrary()) {
     logMessage(LogLevel::Error, "Failed to dynamically load the FaultlineSupport framework");
     return false;
   }
-  const bool reads = library.offers("LGSPreferencesGetIntegerValue");
+  const bool reads = device.supportLibraryOffers("LGSPreferencesGetIntegerValue");
   if (!reads) {
     logMessage(LogLevel::Error, "Failed to dyanmically link LGSPreferencesGetIntegerValue");
   }
-  const bool writes = library.offers("LGSPreferencesSetValue");
+  const bool writes = device.supportLibraryOffers("LGSPreferencesSetValue");
   if (!writes) {
     logMessage(LogLevel::Error, "Failed to dynamically link LGSPreferencesSetValue");
   }

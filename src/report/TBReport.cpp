@@ -5,7 +5,6 @@
 #include <utility>
 
 #include "platform/Platform.h"
-#include "platform/PreferenceNames.h"
 #include "report/DistributionBatch.h"
 #include "report/KernelMemoryStatistics.h"
 #include "report/LogSubmission.h"
@@ -42,9 +41,8 @@ void TBReport::writeLogForYesterdayWithAppInfo(std::int32_t day, const AppInfoLi
 }
 
 void TBReport::serializeWithDateAndAppInfo(std::int32_t day, const AppInfoList* appInfo) {
-  const std::optional<PropertyDict> document = makeDocument(day, appInfo, SideEffects::Done);
-  if (const auto bytes = document ? serializeDailyLog(*document) : std::nullopt) {
-    submitDailyLog(*bytes);
+  if (const auto document = makeDocument(day, SideEffects::Done)) {
+    submitDailyLog(*document, appInfo);
   }
 }
 
@@ -89,8 +87,7 @@ void TBReport::addOwnSources(SideEffects sideEffects) {
   reportVMStats(*this);
 }
 
-std::optional<PropertyDict> TBReport::makeDocument(std::int32_t day, const AppInfoList* appInfo,
-                                                   SideEffects sideEffects) {
+std::optional<PropertyDict> TBReport::makeDocument(std::int32_t day, SideEffects sideEffects) {
   if (_scalarsOutput.empty() && _distributionsOutput.empty() && _histogramsOutput.empty()) {
     return std::nullopt;
   }
@@ -109,9 +106,6 @@ std::optional<PropertyDict> TBReport::makeDocument(std::int32_t day, const AppIn
   document.set("TBTaskID", preferenceOr(kTaskingIDKey, "(no tasking id)"));
   document.set("TBTaskDigest", preferenceOr(kTaskingDigestKey, "(no tasking digest)"));
   document.set("TBWhitelistDigest", whitelistDigest);
-  if (appInfo != nullptr) {
-    document.set("TBActivatedAppInfo", appInfo->array());
-  }
   return document;
 }
 

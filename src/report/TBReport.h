@@ -50,10 +50,9 @@ class TBReport {
   /// apps, restarts the count of corruptions.
   enum class SideEffects { Done, LeftOut };
 
-  /// Runs the log's own sources and builds the document, into which the outputs are moved. Nothing
-  /// when scalars, distributions and histograms are all empty.
-  std::optional<PropertyDict> makeDocument(std::int32_t day, const AppInfoList* appInfo,
-                                           SideEffects sideEffects);
+  /// Runs the log's own sources and builds the document without the active apps; the outputs are
+  /// moved into it. Nothing when scalars, distributions and histograms are all empty.
+  std::optional<PropertyDict> makeDocument(std::int32_t day, SideEffects sideEffects);
 
   /// The whitelist's options for a scalar; null keeps it out.
   const ScalarOptions* optionsForScalarKey(std::string_view key) const;

@@ -214,7 +214,7 @@ class UsageReply {
       addOne("datausage.olddata.", *name);
     }
     std::string error;
-    if (_services.serialization.serialize({{name->name, after}}, error)) {
+    if (_services.serialization.canSerialize({PropertyDict{{name->name, after}}}, error)) {
       _newBaseline.set(name->name, std::move(after));
       _hasGrowth = _hasGrowth || _additions.size() > additionsBefore;
     }
@@ -266,10 +266,9 @@ void CollectDataUsage(std::chrono::nanoseconds replyTimeout) {
   if (!fingerprint) {
     return;  // unknown counters: the next run counts the growth
   }
-  const auto workspace = platform().murmur().createUsageWorkspace(kUsageServiceEndpoint);
-  const auto feed = platform().murmur().createUsageFeed(workspace);
+  const auto feed = platform().murmur().createUsageFeed(UsageWorkspace{kUsageServiceEndpoint});
   const auto handled = std::make_shared<std::binary_semaphore>(0);
-  const auto reply = [feed, workspace, handled, services,
+  const auto reply = [feed, handled, services,
                       mark = CountingMark{today, *fingerprint, {}}](const PropertyArray* records) {
     UsageReply usageReply(services, mark);
     usageReply.handle(records);

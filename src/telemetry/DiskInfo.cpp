@@ -39,7 +39,8 @@ bool isPlausible(const PropertyDict& info) {
 }
 
 PropertyDict askForDiskUsage() {
-  const std::optional<PropertyValue> answer = platform().orrery().OrreryCopyAnswer("DiskUsage");
+  const std::optional<PropertyValue> answer =
+      platform().deviceInformation().OrreryCopyAnswer("DiskUsage");
   const auto mebibytes = [&answer](std::string_view name) {
     return diskUsageInMebibytes(answer, name).value_or(0);
   };

@@ -1,6 +1,6 @@
 #include "telemetry/ReportingChannels.h"
 
-#include <memory>
+#include <optional>
 
 #include "platform/Platform.h"
 
@@ -17,7 +17,7 @@ bool isSimple(const TaplineChannel& channel) {
 
 void LogTaplineChannelScalars() {
   Tapline& tapline = platform().tapline();
-  const std::unique_ptr<TaplineChannels> channels =
+  std::optional<TaplineChannels> channels =
       tapline.TaplineCopyChannelsInCategories(kDailyLogCategory, 1, 0);
   if (!channels) {
     return;
@@ -25,13 +25,12 @@ void LogTaplineChannelScalars() {
   channels->TaplinePrune([](const TaplineChannel& channel) {
     return isSimple(channel) ? TaplineResult::Continue : TaplineResult::Remove;
   });
-  std::unique_ptr<TaplineChannels> subscribed;
-  const std::unique_ptr<TaplineSubscription> subscription =
-      tapline.TaplineCreateSubscription(*channels, subscribed);
+  const std::optional<TaplineSubscription> subscription =
+      tapline.TaplineCreateSubscription(*channels);
   if (!subscription) {
     return;
   }
-  const std::unique_ptr<TaplineChannels> samples = subscription->TaplineCreateSamples();
+  const std::optional<TaplineChannels> samples = tapline.TaplineCreateSamples(*subscription);
   if (!samples) {
     return;
   }

@@ -215,18 +215,11 @@ TEST_F(DailyDriverTest, MessagesLeadToWhatTheirStateAllows) {
 }
 
 TEST_F(DailyDriverTest, AMessageThatFailsStopsNoOther) {
-  struct Failing : PeerConnection {
-    void setMessageHandler(MessageHandler handler) override { deliver = std::move(handler); }
-    void start() override {}
-    MessageHandler deliver;
-  };
   DriverDevice device;
-  Failing peer;
-  handleNewPeer(peer);
   auto& loop = dynamic_cast<HostMainLoop&>(device.platform().mainLoop());
-  loop.queueWork([&peer] { peer.deliver(operation(0)); });
+  loop.queueWork([] { handlePeerMessage(operation(0)); });
   loop.queueWork([] { throw std::bad_alloc(); });
-  loop.queueWork([&peer] { peer.deliver(PropertyDict{{"operation", 2}, {"app_data", 0}}); });
+  loop.queueWork([] { handlePeerMessage(PropertyDict{{"operation", 2}, {"app_data", 0}}); });
   runListenerMode(kQuiet);
   EXPECT_THAT(device.log(), Contains("error: unexpected failure: std::bad_alloc"));
   EXPECT_EQ(storedDay(device), PropertyValue(kYesterday));
@@ -254,23 +247,23 @@ TEST_F(DailyDriverTest, OneProcessDoesTheDaysWorkAndTheOthersFindItDone) {
 
 TEST_F(DailyDriverTest, AWaitForTheDaysWorkOfAnotherProcessEnds) {
   DriverDevice device;
-  EXPECT_TRUE(device.platform().dailyWorkLock().lock(0));
-  EXPECT_TRUE(device.platform().dailyWorkLock().lock(0));
+  EXPECT_TRUE(device.platform().fileSystem().lockDailyWork(0));
+  EXPECT_TRUE(device.platform().fileSystem().lockDailyWork(0));
   EXPECT_TRUE(hasSucceeded(startProcess([&device] {
     std::string error;
     const std::unique_ptr<HostPlatform> other = HostPlatform::open(device.path(), error);
-    EXPECT_FALSE(other->dailyWorkLock().lock(0.01));
+    EXPECT_FALSE(other->fileSystem().lockDailyWork(0.01));
   })));
   EXPECT_THAT(device.log(),
               ::testing::ElementsAre(::testing::EndsWith(": another process keeps it locked")));
   device.endProcess();
-  EXPECT_TRUE(device.platform().dailyWorkLock().lock(0));
+  EXPECT_TRUE(device.platform().fileSystem().lockDailyWork(0));
 }
 
 TEST_F(DailyDriverTest, AServiceThatIsTakenChangesNothingElse) {
   DriverDevice device;
   const std::unique_ptr<ServiceListener> other =
-      device.platform().messageService().createListener(kService);
+      device.platform().messageService().createListener(kService, handlePeerMessage);
   ASSERT_NE(other, nullptr);
   aaiRequested = true;
   runListenerMode(kQuiet);
@@ -286,14 +279,22 @@ TEST_F(DailyDriverTest, AppsKeepFiveEntriesWhateverIsMissing) {
   odd.set("arch", 2.9);
   odd.set("uuid", Bytes(15, 1));
   const PropertyValue apps(PropertyArray{sampleApp(), "no app", PropertyDict{}, odd});
-  const PropertyArray list = AppInfoList(&apps).array();
+  const auto listOf = [](const PropertyValue& data) {
+    PropertyArray list;
+    AppInfoList(&data).forEach([&list](const PropertyDict& app) {
+      list.emplace_back(app);
+      return true;
+    });
+    return list;
+  };
+  const PropertyArray list = listOf(apps);
   ASSERT_THAT(list, SizeIs(3));
   EXPECT_EQ(textForm(PropertyArray{list[0]}), kSampleText);
   EXPECT_EQ(textForm(list[1]), "{bundle = ; version = ; adamID = 0; arch = 0; uuid = }");
   EXPECT_EQ(textForm(list[2]), "{bundle = ; version = 1.2; adamID = 0; arch = 2; uuid = }");
   EXPECT_EQ(list[2].dict()->find("arch")->number()->kind(), NumberKind::Int64);
   const PropertyValue notAnArray(PropertyDict{{"0", sampleApp()}});
-  EXPECT_THAT(AppInfoList(&notAnArray).array(), IsEmpty());
+  EXPECT_THAT(listOf(notAnArray), IsEmpty());
 }
 
 }  // namespace

@@ -104,12 +104,5 @@ TEST(ECCEventQueue, KeepsAnEventUntilItsRecordIsWritten) {
   EXPECT_THAT(device.names("kernel/ecc"), ElementsAre());
 }
 
-TEST(ECCEventQueue, SaysThatItsFolderCannotBeOpened) {
-  TestDevice device;
-  device.write("kernel/ecc", "");
-  EXPECT_THAT(run(device), ElementsAre());
-  EXPECT_THAT(device.log(), testing::Contains(EndsWith("kernel/ecc: Not a directory")));
-}
-
 }  // namespace
 }  // namespace vesprun

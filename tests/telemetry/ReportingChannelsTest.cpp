@@ -23,28 +23,31 @@ TEST(ReportingChannels, OnlySimpleChannelsOfTheCategoryAreWritten) {
 
 TEST(ReportingChannels, NothingIsWrittenWithoutASubscriptionOrASample) {
   struct Unreadable final : Tapline {
-    struct Subscription final : TaplineSubscription {
-      std::unique_ptr<TaplineChannels> TaplineCreateSamples() override { return nullptr; }
-    };
-    explicit Unreadable(Tapline& real) : tapline(real) {}
-    std::unique_ptr<TaplineChannels> TaplineCopyChannelsInCategories(
-        std::uint64_t mask, std::uint64_t first, std::uint64_t second) override {
+    Unreadable(Tapline& platforms, bool does) : tapline(platforms), subscribes(does) {}
+    std::optional<TaplineChannels> TaplineCopyChannelsInCategories(std::uint64_t mask,
+                                                                   std::uint64_t first,
+                                                                   std::uint64_t second) override {
       return tapline.TaplineCopyChannelsInCategories(mask, first, second);
     }
-    std::unique_ptr<TaplineSubscription> TaplineCreateSubscription(
-        const TaplineChannels& /*wanted*/,
-        std::unique_ptr<TaplineChannels>& /*subscribed*/) override {
-      return std::exchange(subscription, nullptr);
+    std::optional<TaplineSubscription> TaplineCreateSubscription(
+        const TaplineChannels& wanted) override {
+      return subscribes ? std::optional(TaplineSubscription{wanted}) : std::nullopt;
+    }
+    std::optional<TaplineChannels> TaplineCreateSamples(
+        const TaplineSubscription& /*subscription*/) override {
+      return std::nullopt;
     }
     Tapline& tapline;
-    std::unique_ptr<TaplineSubscription> subscription = std::make_unique<Subscription>();
+    bool subscribes;
   };
   TestDevice device(deviceWith(R"("channels": [{"name": "c", "value": 3}])"));
-  Unreadable unreadable(device.platform().tapline());
-  device.platform().tapline = unreadable;
-  LogTaplineChannelScalars();
-  LogTaplineChannelScalars();
-  EXPECT_EQ(unreadable.subscription, nullptr);
+  Tapline& real = device.platform().tapline();
+  Unreadable unsubscribed(real, false);
+  Unreadable unsampled(real, true);
+  for (Tapline* unreadable : {&unsubscribed, &unsampled}) {
+    device.platform().tapline = *unreadable;
+    LogTaplineChannelScalars();
+  }
   EXPECT_EQ(todaysScalars(device), Scalars{});
 }
 

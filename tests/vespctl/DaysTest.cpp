@@ -28,7 +28,7 @@ class DaysTest : public VespctlTest {
  protected:
   DaysTest() {
     folder.write(
-        "device/Library/Application Support/Tallybook/Whitelist_Stagebox.ptree",
+        kWhitelist,
         R"(<?xml version="1.0" encoding="UTF-8"?><ptree version="1.0"><dict><key>G</key><dict>
 <key>ScalarKeys</key><dict><key>s</key><dict/><key>com.quill.kernel.swapusage</key><dict/></dict>
 <key>DistributionKeys</key><dict><key>d</key><dict><key>intervals</key><array><real>0.5</real></array></dict></dict></dict></dict></ptree>)");
@@ -41,20 +41,13 @@ class DaysTest : public VespctlTest {
                      R"(, "clock": ")" + time + "\"}");
   }
 
-  /// Runs the command, which must be done, and gives what it printed.
-  std::string print(const std::string& arguments) {
-    EXPECT_EQ(run(arguments), 0) << arguments << ": " << error;
-    return output;
-  }
-
   /// Scalars of these days.
   void count(int first, int last) {
     std::string lines;
     for (int day = first; day <= last; ++day) {
       lines += "scalar\t" + std::to_string(day) + "\ts\t" + std::to_string(day) + "\n";
     }
-    folder.write("lines", lines);
-    print("counters \"$D\" import lines");
+    import(lines);
   }
 
   /// A daily log of a day of March 2024 that was written at midnight of a date.
@@ -65,7 +58,7 @@ class DaysTest : public VespctlTest {
                            "<key>TBLogCreationDate</key>" + date + R"(<key>TBWhitelistDigest</key>
 <string/><key>TBScalars</key><dict/><key>TBDistributions</key><dict/>
 <key>TBDistributionsHistogram</key><dict/></dict></ptree>)");
-    ASSERT_EQ(std::system(("touch -d " + written + "T00:00Z " + folder.path(name)).c_str()), 0);
+    shell("touch -d " + written + "T00:00Z " + name);
   }
 
   /// Day of March and revision of each exported log.
@@ -99,8 +92,7 @@ TEST_F(DaysTest, DaysTellsWhatIsKeptAndChangesNothing) {
   print(
       "prefs \"$D\" set com.quill.aggregated.vesprun "
       "LastCrashLogSerializationDateInDaysSince1970 19787");
-  const std::string look = "find " + folder.path("device") + " -printf '%p %s %C@\\n' | md5sum >";
-  ASSERT_EQ(std::system((look + folder.path("before")).c_str()), 0);
+  const std::string before = snapshot();
   EXPECT_EQ(print("days \"$D\" --last 3"),
             R"({"day":19785,"date":"2024-03-03","scalars":1,"distributions":1,"logs":[]}
 {"day":19786,"date":"2024-03-04","scalars":1,"distributions":0,"logs":["0001-193-log-aggregated.ptree","0002-193-log-aggregated.ptree"]}
@@ -110,8 +102,7 @@ TEST_F(DaysTest, DaysTellsWhatIsKeptAndChangesNothing) {
                            HasSubstr("the day of the last run, 19787, is ahead of the clock")));
   EXPECT_EQ(print("days \"$D\" --last 0"), "");
   EXPECT_THAT(print("days \"$D\""), StartsWith("{\"day\":19774,"));
-  ASSERT_EQ(std::system((look + folder.path("after")).c_str()), 0);
-  EXPECT_EQ(folder.read("after"), folder.read("before"));
+  EXPECT_EQ(snapshot(), before);
 }
 
 TEST_F(DaysTest, CatchUpSubmitsWhatTheRunOfEachDayWouldHave) {
@@ -122,7 +113,7 @@ TEST_F(DaysTest, CatchUpSubmitsWhatTheRunOfEachDayWouldHave) {
   setTime("2024-03-03T04:00:00Z");
   print("run \"$D\" -- -d");
   print("run \"$D\" -- -d");
-  ASSERT_EQ(std::system(("cp -a " + folder.path("device") + ' ' + folder.path("kept")).c_str()), 0);
+  shell("cp -a device kept");
   for (const char* const day : {"04", "05", "06"}) {
     setTime("2024-03-" + std::string(day) + "T04:00:00Z");
     print("run \"$D\" -- -d");
@@ -304,14 +295,12 @@ TEST_F(DaysTest, PruneThatIsKilledOrFailsAnywhereIsMadeUpForByTheNext) {
   addLog(3, 4, "2024-02-01");
   folder.write(logs + "/0003-193-log-aggregated.header.json", "{}");
   folder.write(logs + "/0004-165-S.log", "the newest");
-  ASSERT_EQ(std::system(("touch -d 2024-02-01 " + folder.path(logs + "/000[34]*")).c_str()), 0);
+  shell("touch -d 2024-02-01 " + logs + "/000[34]*");
   const std::string old = "{\"time\":\"2024-02-01T00:00:00Z\"}\n";
   folder.write("device/outbox/events.jsonl", old + "{\"time\":\"2024-03-05T00:00:00Z\"}\n" + old);
   std::filesystem::rename(folder.path("device"), folder.path("original"));
   const auto prune = [this](const torture::Fault& fault) {
-    std::filesystem::remove_all(folder.path("device"));
-    EXPECT_EQ(
-        std::system(("cp -a " + folder.path("original") + ' ' + folder.path("device")).c_str()), 0);
+    shell("rm -r device; cp -a original device");
     return torture::runTraced({VESPCTL_PROGRAM, "prune", ".", "--counters", "30", "--outbox", "30"},
                               folder.path("device"), fault);
   };

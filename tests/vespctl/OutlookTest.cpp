@@ -13,8 +13,6 @@ namespace {
 
 using ::testing::HasSubstr;
 
-constexpr const char* kWhitelist =
-    "device/Library/Application Support/Tallybook/Whitelist_Stagebox.ptree";
 const std::string kDatabase = "device/var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
 
 /// A device on day 19787 whose corruptions were counted and whose group "Off" is switched off.
@@ -41,26 +39,6 @@ class OutlookTest : public VespctlTest {
     const std::optional<PropertyValue> value = valueFromJsonText(json, failure);
     ASSERT_TRUE(value && writePtree(*value, document, failure)) << failure;
     folder.write(name, document);
-  }
-
-  std::string print(const std::string& arguments) {
-    EXPECT_EQ(run(arguments), 0) << arguments << ": " << error;
-    return output;
-  }
-
-  void import(const std::string& lines) {
-    folder.write("lines", lines);
-    print("counters \"$D\" import lines");
-  }
-
-  /// What a shell command prints in the folder of the device directory.
-  std::string shell(const std::string& command) { return print("fields >/dev/null; " + command); }
-
-  /// Everything in the device directory, with times and modes.
-  std::string snapshot() {
-    return shell(
-        "find device -printf '%p %T@ %m %i\\n' | sort; "
-        "find device -type f -print0 | sort -z | xargs -0 sha256sum");
   }
 };
 
@@ -193,7 +171,7 @@ TEST_F(OutlookTest, LooksAtADeviceWithoutTouchingIt) {
     shell("chmod -R a-w device");
     const std::string before = snapshot();
     for (const char* command :
-         {"preview \"$D\"", "preview \"$D\" --left-out", "explain \"$D\" s",
+         {"preview \"$D\"", "preview \"$D\" --left-out", "explain \"$D\" s", "page \"$D\"",
           "whitelist diff \"$D\" device/Library/*/*/Whitelist_Stagebox.ptree"}) {
       EXPECT_EQ(run(command), *complaint == '\0' ? 0 : 1) << command << complaint << output;
       EXPECT_THAT(error, HasSubstr(complaint)) << command;

@@ -29,6 +29,30 @@ class VespctlTest : public ::testing::Test {
     return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
   }
 
+  /// Runs the command, which must succeed, and gives what it printed.
+  std::string print(const std::string& arguments) {
+    EXPECT_EQ(run(arguments), 0) << arguments << ": " << error;
+    return output;
+  }
+
+  /// What a shell command prints in the folder of the device directory.
+  std::string shell(const std::string& command) { return print("fields >/dev/null; " + command); }
+
+  /// Everything in the device directory, with times and modes.
+  std::string snapshot() {
+    return shell(
+        "find device -printf '%p %T@ %m %i\\n' | sort; "
+        "find device -type f -print0 | sort -z | xargs -0 sha256sum");
+  }
+
+  /// Counts the lines of a dump.
+  void import(const std::string& lines) {
+    folder.write("lines", lines);
+    print("counters \"$D\" import lines");
+  }
+
+  static constexpr const char* kWhitelist =
+      "device/Library/Application Support/Tallybook/Whitelist_Stagebox.ptree";
   TemporaryFolder folder;
   std::string output;
   std::string error;

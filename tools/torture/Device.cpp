@@ -87,36 +87,19 @@ void writeFile(const fs::path& path, const std::string& content) {
 }
 
 Companion::Companion(const std::vector<std::string>& command, const std::string& folder,
-                     const std::string& input)
-    : _output(std::tmpfile()) {
-  std::vector<char*> arguments;
-  for (const std::string& argument : command) {
-    arguments.push_back(const_cast<char*>(argument.c_str()));  // NOLINT: execv changes nothing
-  }
-  arguments.push_back(nullptr);
-  FILE* in = std::tmpfile();
-  if (in == nullptr || _output == nullptr) {
-    throw std::runtime_error("no temporary file can be made");
-  }
-  std::fwrite(input.data(), 1, input.size(), in);
-  std::rewind(in);
+                     const std::string& input) {
+  const TextFile in(input);
   _child = fork();
   if (_child == 0) {
-    dup2(fileno(in), STDIN_FILENO);
-    dup2(fileno(_output), STDOUT_FILENO);
-    dup2(fileno(_output), STDERR_FILENO);
+    dup2(in.descriptor(), STDIN_FILENO);
+    dup2(_output.descriptor(), STDOUT_FILENO);
+    dup2(_output.descriptor(), STDERR_FILENO);
     alarm(60);
     if (chdir(folder.c_str()) == 0) {
-      execv(arguments[0], arguments.data());
+      runInstead(command);
     }
     _exit(126);
   }
-  std::fclose(in);
-}
-
-Companion::~Companion() {
-  status();
-  std::fclose(_output);
 }
 
 bool Companion::endsWithin(int milliseconds) {
@@ -136,20 +119,10 @@ int Companion::status() {
   return WIFEXITED(_status) ? WEXITSTATUS(_status) : -1;
 }
 
-std::string Companion::output() const {
-  std::string text;
-  std::rewind(_output);
-  char piece[65536];
-  for (std::size_t got = 0; (got = std::fread(piece, 1, sizeof piece, _output)) > 0;) {
-    text.append(piece, got);
-  }
-  return text;
-}
-
 Device::Device(const Programs& programs, const fs::path& folder)
     : _programs(&programs), _path(folder.string()) {
   std::string output;
-  if (control("init", {"--sample"}, output) != 0 || control("counters", {"dump"}, output) != 0) {
+  if (control({"init", "--sample"}, output) != 0 || control({"counters", "dump"}, output) != 0) {
     throw std::runtime_error("no device can be made: " + output);
   }
   describe(kDescription);
@@ -162,7 +135,7 @@ Device::Device(const Programs& programs, const fs::path& folder)
     rows += "scalar\t" + number + "\tsecret.scalar\t7\n";
     rows += "sample\t" + number + "\tsecret.distribution\t7.5\t3600\n";
   }
-  if (control("counters", {"import", "-"}, output, rows) != 0) {
+  if (control({"counters", "import", "-"}, output, rows) != 0) {
     throw std::runtime_error("no counters can be made: " + output);
   }
 }
@@ -181,19 +154,18 @@ void Device::describe(const std::string& change) {
 
 void Device::setDay(int day) { describe(R"({"clock": ")" + clockOf(day) + R"("})"); }
 
-int Device::control(const std::string& command, const std::vector<std::string>& rest,
-                    std::string& output, const std::string& input) const {
-  Companion program(controlCommand(command, rest), "/", input);
+std::vector<std::string> Device::controlCommand(std::vector<std::string> words) const {
+  words.insert(words.begin() + 1, _path);
+  words.insert(words.begin(), _programs->vespctl);
+  return words;
+}
+
+int Device::control(const std::vector<std::string>& words, std::string& output,
+                    const std::string& input) const {
+  Companion program(controlCommand(words), "/", input);
   const int status = program.status();
   output = program.output();
   return status;
-}
-
-std::vector<std::string> Device::controlCommand(const std::string& command,
-                                                const std::vector<std::string>& rest) const {
-  std::vector<std::string> line{_programs->vespctl, command, _path};
-  line.insert(line.end(), rest.begin(), rest.end());
-  return line;
 }
 
 int Device::runDaily() const { return Companion(dailyCommand(), _path).status(); }
@@ -230,7 +202,7 @@ Sight Device::look() const {
     }
   }
   std::string dump;
-  if (control("counters", {"dump"}, dump) != 0) {
+  if (control({"counters", "dump"}, dump) != 0) {
     sight.faults.push_back("the counters cannot be read: " + dump);
   }
   std::istringstream rows(dump);

@@ -2,11 +2,12 @@
 
 #include <sys/types.h>
 
-#include <cstdio>
 #include <filesystem>
 #include <map>
 #include <string>
 #include <vector>
+
+#include "TracedRun.h"
 
 namespace vesprun::torture {
 
@@ -41,11 +42,11 @@ class Device {
   /// Lays a JSON object over the device's description; null removes an entry.
   void describe(const std::string& change);
 
-  /// Runs `vespctl COMMAND DIR REST...`; its exit status, and what it printed in `output`.
-  int control(const std::string& command, const std::vector<std::string>& rest, std::string& output,
+  /// The command line of `vespctl` for a command and its arguments, without the device.
+  std::vector<std::string> controlCommand(std::vector<std::string> words) const;
+  /// Runs it; its exit status, and what it printed in `output`.
+  int control(const std::vector<std::string>& words, std::string& output,
               const std::string& input = {}) const;
-  std::vector<std::string> controlCommand(const std::string& command,
-                                          const std::vector<std::string>& rest) const;
   /// The daily run, without a fault; its exit status.
   int runDaily() const;
   std::vector<std::string> dailyCommand() const { return {_programs->vesprun, "-d"}; }
@@ -67,18 +68,18 @@ class Companion {
             const std::string& input = {});
   Companion(const Companion&) = delete;
   Companion& operator=(const Companion&) = delete;
-  ~Companion();
+  ~Companion() { status(); }
 
   /// True when it ended within the time.
   bool endsWithin(int milliseconds);
   /// Waits for its end; the exit status, -1 for a signal.
   int status();
   /// What it printed on both streams.
-  std::string output() const;
+  std::string output() const { return _output.text(); }
 
  private:
-  FILE* _output;
-  pid_t _child;
+  TextFile _output;
+  pid_t _child = -1;
   int _status = 0;
   bool _ended = false;
 };

@@ -243,36 +243,47 @@ std::size_t firstOwnCall(const std::vector<Call>& calls) {
   return static_cast<std::size_t>(last - calls.begin()) + 1;
 }
 
-std::vector<Case> failingCalls(const Programs& programs, const fs::path& folder, std::uint32_t seed,
-                               bool full) {
-  const auto reference = makeReference(programs, folder / "calls");
-  const std::size_t own = firstOwnCall(reference->calls);
+using RunWithFault = std::function<Faults(const fs::path& work, const Fault& fault, bool started)>;
+
+/// Each call fails in one way or, when wanted, in all, transfers half where `alsoShort` asks for
+/// it, and is the last one.
+std::vector<Case> faultsOfCalls(const std::string& name, const std::vector<Call>& calls,
+                                std::uint32_t seed, bool full, bool alsoShort,
+                                const RunWithFault& run) {
+  const std::size_t own = firstOwnCall(calls);
   std::vector<Case> cases;
   std::mt19937 random(seed);
-  for (std::size_t index = 0; index < reference->calls.size(); ++index) {
-    const Call& call = reference->calls[index];
-    const std::string place = ":" + nameOfCall(call.number) + ":" + std::to_string(index + 1);
+  for (std::size_t index = 0; index < calls.size(); ++index) {
+    const int number = calls[index].number;
     const bool started = index >= own;
     const auto add = [&](const std::string& what, Fault fault) {
       fault.call = index + 1;
-      cases.push_back({what + place, [=](const fs::path& work) {
-                         return runWithFault(*reference, work, fault, started);
-                       }});
+      cases.push_back({name + what + ":" + nameOfCall(number) + ":" + std::to_string(index + 1),
+                       [=](const fs::path& work) { return run(work, fault, started); }});
     };
-    const std::vector<int>& errors = fittingErrors(call.number);
+    const std::vector<int>& errors = fittingErrors(number);
     const std::size_t one = errors.empty() ? 0 : random() % errors.size();
     for (std::size_t each = 0; each < errors.size(); ++each) {
       if (full || each == one) {
         add(strerrorname_np(errors[each]),
-            {.kind = Fault::Kind::Error, .number = call.number, .error = errors[each]});
+            {.kind = Fault::Kind::Error, .number = number, .error = errors[each]});
       }
     }
-    if (transfersBytes(call.number) && started) {
-      add("short", {.kind = Fault::Kind::Short, .number = call.number});
+    if (alsoShort && started && transfersBytes(number)) {
+      add("short", {.kind = Fault::Kind::Short, .number = number});
     }
     add("kill", {.kind = Fault::Kind::Kill});
   }
   return cases;
+}
+
+std::vector<Case> failingCalls(const Programs& programs, const fs::path& folder, std::uint32_t seed,
+                               bool full) {
+  const auto reference = makeReference(programs, folder / "calls");
+  return faultsOfCalls("", reference->calls, seed, full, true,
+                       [=](const fs::path& work, const Fault& fault, bool started) {
+                         return runWithFault(*reference, work, fault, started);
+                       });
 }
 
 std::vector<Case> fullDisk(const Programs& programs, const fs::path& folder, std::uint32_t seed,
@@ -311,10 +322,7 @@ Faults runBeside(const Reference& reference, const fs::path& folder, std::size_t
   const bool isDaily = neighbour.command.empty();
   const auto start = [&] {
     companion = std::make_unique<Companion>(
-        isDaily ? device.dailyCommand()
-                : device.controlCommand(neighbour.command.front(),
-                                        {neighbour.command.begin() + 1, neighbour.command.end()}),
-        device.path());
+        isDaily ? device.dailyCommand() : device.controlCommand(neighbour.command), device.path());
     // A neighbour that waits for a lock of the paused run goes on after it.
     companion->endsWithin(30);
   };
@@ -330,8 +338,7 @@ Faults runBeside(const Reference& reference, const fs::path& folder, std::size_t
   }
   std::string answer;
   if (!isDaily) {
-    device.control(neighbour.question.front(),
-                   {neighbour.question.begin() + 1, neighbour.question.end()}, answer);
+    device.control(neighbour.question, answer);
     if (answer.find(neighbour.answer) == std::string::npos) {
       faults.push_back("what the neighbour wrote is lost");
     }
@@ -380,8 +387,7 @@ std::vector<Case> neighbours(const Programs& programs, const fs::path& folder, s
 struct Command {
   std::string name;
   std::shared_ptr<Device> original;
-  std::string command;
-  std::vector<std::string> rest;
+  std::vector<std::string> words;
   std::function<Faults(Device& device, const Outcome& outcome, bool killed)> judge;
 };
 
@@ -389,8 +395,7 @@ Faults runCommand(const Command& command, const fs::path& folder, const Fault& f
                   bool started) {
   Device device(*command.original, folder);
   const bool killed = fault.kind == Fault::Kind::Kill;
-  const Outcome outcome =
-      runTraced(device.controlCommand(command.command, command.rest), device.path(), fault);
+  const Outcome outcome = runTraced(device.controlCommand(command.words), device.path(), fault);
   Faults faults = judgeRun(outcome, killed, started, 1);
   if (outcome.status == 1 && outcome.standardError.empty()) {
     faults.emplace_back("it failed without a word");
@@ -402,41 +407,20 @@ Faults runCommand(const Command& command, const fs::path& folder, const Fault& f
   return faults;
 }
 
-// Each call fails in one way or, when wanted, in all, and is the last one.
 std::vector<Case> casesOf(const Command& command, const fs::path& folder, std::uint32_t seed,
                           bool full) {
   Device device(*command.original, folder / "reference");
-  const Outcome reference =
-      runTraced(device.controlCommand(command.command, command.rest), device.path());
+  const Outcome reference = runTraced(device.controlCommand(command.words), device.path());
   Faults wrong = reference.notDurable;
   wrong += judgeRun(reference, false, true);
   wrong += command.judge(device, reference, false);
   if (!wrong.empty()) {
     throw std::runtime_error(command.name + " without any fault: " + wrong.front());
   }
-  const std::size_t own = firstOwnCall(reference.calls);
-  std::vector<Case> cases;
-  std::mt19937 random(seed);
-  for (std::size_t index = 0; index < reference.calls.size(); ++index) {
-    const int number = reference.calls[index].number;
-    const auto add = [&](const std::string& what, Fault fault) {
-      fault.call = index + 1;
-      const bool started = index >= own;
-      cases.push_back(
-          {command.name + ":" + what + ":" + nameOfCall(number) + ":" + std::to_string(index + 1),
-           [=](const fs::path& work) { return runCommand(command, work, fault, started); }});
-    };
-    const std::vector<int>& errors = fittingErrors(number);
-    const std::size_t one = errors.empty() ? 0 : random() % errors.size();
-    for (std::size_t each = 0; each < errors.size(); ++each) {
-      if (full || each == one) {
-        add(strerrorname_np(errors[each]),
-            {.kind = Fault::Kind::Error, .number = number, .error = errors[each]});
-      }
-    }
-    add("kill", {.kind = Fault::Kind::Kill});
-  }
-  return cases;
+  return faultsOfCalls(command.name + ":", reference.calls, seed, full, false,
+                       [=](const fs::path& work, const Fault& fault, bool started) {
+                         return runCommand(command, work, fault, started);
+                       });
 }
 
 /// All lines or none, and never "done" without them.
@@ -449,11 +433,11 @@ std::vector<Case> imports(const Programs& programs, const fs::path& folder, std:
             "\t" + std::to_string(row) + '\n';
   }
   writeFile(original->path() + "/rows", rows);
-  const std::vector<std::string> rest{"import", original->path() + "/rows"};
+  const std::vector<std::string> words{"counters", "import", original->path() + "/rows"};
   const std::vector<std::string> before = original->look().counters;
   Device device(*original, folder / "imported");
   std::string output;
-  device.control("counters", rest, output);
+  device.control(words, output);
   const std::vector<std::string> after = device.look().counters;
   const auto judge = [=](Device& changed, const Outcome& outcome, bool /*killed*/) {
     const Sight sight = changed.look();
@@ -466,7 +450,7 @@ std::vector<Case> imports(const Programs& programs, const fs::path& folder, std:
     }
     return faults;
   };
-  return casesOf({"import", original, "counters", rest, judge}, folder, seed, full);
+  return casesOf({"import", original, words, judge}, folder, seed, full);
 }
 
 /// Recorded files of a small machine that has counted for `hours`.
@@ -509,7 +493,7 @@ std::vector<Case> collections(const Programs& programs, const fs::path& folder, 
   const auto collect = [=](Device& device, int number) {
     Faults faults;
     std::string output;
-    if (device.control("collect", {"--root", stage(number)}, output) != 0) {
+    if (device.control({"collect", "--root", stage(number)}, output) != 0) {
       faults.push_back("a collection failed: " + output);
     }
     return faults;
@@ -534,7 +518,7 @@ std::vector<Case> collections(const Programs& programs, const fs::path& folder, 
     faults += missingFrom(figures(sight), expected, "growth from nowhere");
     return faults;
   };
-  return casesOf({"collect", original, "collect", {"--root", stage(2)}, judge}, folder, seed, full);
+  return casesOf({"collect", original, {"collect", "--root", stage(2)}, judge}, folder, seed, full);
 }
 
 std::string damaged(std::string content, const std::string& how, std::mt19937& random) {
@@ -609,10 +593,10 @@ Faults liveThrough(const Device& original, const fs::path& folder, std::uint32_t
                        : static_cast<int>(random() % 400);
     device.setDay(day);
     std::string output;
-    if (device.control("counters", {"set", "host.memory.MemFree", "65536"}, output) != 0 ||
-        device.control("counters",
-                       {"set", "host.memory.MemFree", "65536", "--day", std::to_string(day - 1)},
-                       output) != 0) {
+    if (device.control({"counters", "set", "host.memory.MemFree", "65536"}, output) != 0 ||
+        device.control(
+            {"counters", "set", "host.memory.MemFree", "65536", "--day", std::to_string(day - 1)},
+            output) != 0) {
       faults.push_back("a counter cannot be set: " + output);
     }
     if (device.runDaily() != 0) {

@@ -213,71 +213,6 @@ void setRegisters(pid_t thread, user_regs_struct& registers) {
   ptrace(PTRACE_SETREGS, thread, nullptr, &registers);
 }
 
-class Tracer {
- public:
-  Tracer(pid_t child, const std::string& folder, const Fault& fault)
-      : _child(child), _folder(folder), _fault(fault), _durability(folder) {}
-
-  /// Follows the program to its end.
-  Outcome run();
-
- private:
-  /// A thread's call between its entry and its exit.
-  struct Pending {
-    int number;
-    int error;         ///< the answer, when the call is not made
-    std::string from;  ///< of a call that gives a name: paths as they were before it
-    std::string to;
-  };
-
-  void atEntry(pid_t thread);
-  void atExit(pid_t thread);
-  void record(pid_t thread, const user_regs_struct& registers, Pending& pending);
-  void limitGrowth(pid_t thread, user_regs_struct& registers, Pending& pending);
-  void replaceCall(pid_t thread, user_regs_struct& registers, Pending& pending, int error);
-  void shorten(pid_t thread, user_regs_struct& registers, std::uint64_t size);
-
-  pid_t _child;
-  std::string _folder;
-  const Fault& _fault;
-  Durability _durability;
-  Outcome _outcome;
-  std::size_t _count = 0;
-  std::uint64_t _grown = 0;
-  std::uint64_t _break = 0;
-  std::map<pid_t, Pending> _pending;
-};
-
-void Tracer::replaceCall(pid_t thread, user_regs_struct& registers, Pending& pending, int error) {
-  pending.error = error;
-  _outcome.happened = true;
-  if (pending.number != SYS_close) {  // which closes, whatever it answers
-    registers.orig_rax = static_cast<unsigned long long>(-1);
-    setRegisters(thread, registers);
-  }
-}
-
-void Tracer::shorten(pid_t thread, user_regs_struct& registers, std::uint64_t size) {
-  registers.rdx = size;
-  setRegisters(thread, registers);
-  _outcome.happened = true;
-}
-
-void Tracer::limitGrowth(pid_t thread, user_regs_struct& registers, Pending& pending) {
-  if ((pending.number != SYS_write && pending.number != SYS_pwrite64) ||
-      !descriptorPath(thread, registers.rdi).starts_with(_folder + '/')) {
-    return;
-  }
-  const std::uint64_t left = _fault.room - _grown;
-  const std::uint64_t wanted = registers.rdx;
-  if (left == 0) {
-    replaceCall(thread, registers, pending, ENOSPC);
-  } else if (wanted > left) {
-    shorten(thread, registers, left);
-  }
-  _grown += std::min(wanted, left);
-}
-
 Call callOf(pid_t thread, const user_regs_struct& registers) {
   Call call{static_cast<int>(registers.orig_rax), {}, 0};
   const CallRow* row = rowOf(call.number);
@@ -298,158 +233,215 @@ Call callOf(pid_t thread, const user_regs_struct& registers) {
   return call;
 }
 
-void Tracer::record(pid_t thread, const user_regs_struct& registers, Pending& pending) {
-  Call call = callOf(thread, registers);
-  pending.from = call.path;
-  if (pending.number == SYS_renameat || pending.number == SYS_linkat) {
-    pending.to = pathAt(thread, registers.rdx, registers.r10);
-  } else if (pending.number == SYS_rename) {
-    pending.to = pathAt(thread, static_cast<std::uint64_t>(AT_FDCWD), registers.rsi);
-  }
-  _outcome.calls.push_back(std::move(call));
-}
-
-void Tracer::atEntry(pid_t thread) {
-  user_regs_struct registers = registersOf(thread);
-  Pending& pending = _pending[thread];
-  pending = {static_cast<int>(registers.orig_rax), 0, {}, {}};
-  ++_count;
-  if (_fault.kind == Fault::Kind::None) {
-    record(thread, registers, pending);
-    return;
-  }
-  if (_fault.kind == Fault::Kind::DiskFull) {
-    limitGrowth(thread, registers, pending);
-    return;
-  }
-  if (_count < _fault.call || _outcome.happened ||
-      (_fault.number >= 0 && _fault.number != pending.number)) {
-    return;
-  }
-  const Call call = callOf(thread, registers);
-  _outcome.place = nameOfCall(call.number) + ' ' + call.path;
-  if (_fault.kind == Fault::Kind::Error) {
-    replaceCall(thread, registers, pending, _fault.error);
-  } else if (_fault.kind == Fault::Kind::Short) {
-    shorten(thread, registers, std::max<std::uint64_t>(registers.rdx / 2, 1));
-  } else if (_fault.kind == Fault::Kind::Kill) {
-    kill(_child, SIGKILL);
-    _outcome.happened = true;
-  } else {
-    _fault.whilePaused();
-    _outcome.happened = true;
-  }
-}
-
-void Tracer::atExit(pid_t thread) {
-  user_regs_struct registers = registersOf(thread);
-  const Pending& pending = _pending[thread];
-  if (pending.error != 0) {
-    // A program break that cannot grow is answered by the one that was.
-    registers.rax =
-        pending.number == SYS_brk ? _break : static_cast<unsigned long long>(-pending.error);
-    setRegisters(thread, registers);
-  } else if (pending.number == SYS_brk) {
-    _break = registers.rax;
-  } else if (_fault.kind == Fault::Kind::None && static_cast<long long>(registers.rax) >= 0) {
-    switch (pending.number) {
-      case SYS_write:
-      case SYS_pwrite64:
-      case SYS_ftruncate:
-        _durability.written(pending.from);
-        break;
-      case SYS_fsync:
-      case SYS_fdatasync:
-        _durability.flushed(pending.from);
-        break;
-      case SYS_rename:
-      case SYS_renameat:
-      case SYS_linkat:
-        _durability.named(pending.from, pending.to);
-        break;
-      case SYS_unlink:
-      case SYS_unlinkat:
-        _durability.removed(pending.from);
-        break;
-      default:
-        break;
-    }
-  }
-}
-
-Outcome Tracer::run() {
-  const TimeLimit limit;
-  while (true) {
-    int status = 0;
-    const pid_t thread = waitpid(-_child, &status, __WALL);
-    if (thread < 0) {
-      if (errno == EINTR && TimeLimit::expired()) {
-        _outcome.late = true;
-        kill(_child, SIGKILL);
-        continue;
-      }
-      if (errno == EINTR) {
-        continue;
-      }
-      break;
-    }
-    if (WIFEXITED(status) || WIFSIGNALED(status)) {
-      if (thread == _child) {
-        _outcome.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-        _outcome.signal = WIFSIGNALED(status) ? WTERMSIG(status) : 0;
-        break;
-      }
-      continue;
-    }
-    int signal = WSTOPSIG(status);
-    if (signal == (SIGTRAP | 0x80)) {
-      __ptrace_syscall_info info{};
-      ptrace(PTRACE_GET_SYSCALL_INFO, thread, sizeof info, &info);
-      if (info.op == PTRACE_SYSCALL_INFO_ENTRY) {
-        atEntry(thread);
-      } else if (info.op == PTRACE_SYSCALL_INFO_EXIT) {
-        atExit(thread);
-      }
-      signal = 0;
-    } else if (status >> 16 != 0 || signal == SIGSTOP || signal == SIGTRAP) {
-      signal = 0;  // a new thread, or the program's start
-    }
-    ptrace(PTRACE_SYSCALL, thread, nullptr, signal);
-  }
-  _outcome.notDurable = _durability.atTheEnd();
-  return std::move(_outcome);
-}
-
-/// What the program prints goes into a file: a pipe would have to be emptied beside the tracing.
-class PrintedText {
+class Tracer {
  public:
-  PrintedText() : _file(memfd_create("printed", MFD_CLOEXEC)) {}
-  PrintedText(const PrintedText&) = delete;
-  PrintedText& operator=(const PrintedText&) = delete;
-  ~PrintedText() { close(_file); }
-  int descriptor() const { return _file; }
-  std::string text() const {
-    std::string text(static_cast<std::size_t>(std::max<off_t>(lseek(_file, 0, SEEK_END), 0)), ' ');
-    const ssize_t got = pread(_file, text.data(), text.size(), 0);
-    text.resize(static_cast<std::size_t>(std::max<ssize_t>(got, 0)));
-    return text;
+  Tracer(pid_t child, const std::string& folder, const Fault& fault)
+      : _child(child), _folder(folder), _fault(fault), _durability(folder) {}
+
+  /// Follows the program to its end.
+  Outcome run() {
+    const TimeLimit limit;
+    while (true) {
+      int status = 0;
+      const pid_t thread = waitpid(-_child, &status, __WALL);
+      if (thread < 0) {
+        if (errno == EINTR && TimeLimit::expired()) {
+          _outcome.late = true;
+          kill(_child, SIGKILL);
+          continue;
+        }
+        if (errno == EINTR) {
+          continue;
+        }
+        break;
+      }
+      if (WIFEXITED(status) || WIFSIGNALED(status)) {
+        if (thread == _child) {
+          _outcome.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+          _outcome.signal = WIFSIGNALED(status) ? WTERMSIG(status) : 0;
+          break;
+        }
+        continue;
+      }
+      int signal = WSTOPSIG(status);
+      if (signal == (SIGTRAP | 0x80)) {
+        __ptrace_syscall_info info{};
+        ptrace(PTRACE_GET_SYSCALL_INFO, thread, sizeof info, &info);
+        if (info.op == PTRACE_SYSCALL_INFO_ENTRY) {
+          atEntry(thread);
+        } else if (info.op == PTRACE_SYSCALL_INFO_EXIT) {
+          atExit(thread);
+        }
+        signal = 0;
+      } else if (status >> 16 != 0 || signal == SIGSTOP || signal == SIGTRAP) {
+        signal = 0;  // a new thread, or the program's start
+      }
+      ptrace(PTRACE_SYSCALL, thread, nullptr, signal);
+    }
+    _outcome.notDurable = _durability.atTheEnd();
+    return std::move(_outcome);
   }
 
  private:
-  int _file;
+  /// A thread's call between its entry and its exit.
+  struct Pending {
+    int number;
+    int error;         ///< the answer, when the call is not made
+    std::string from;  ///< of a call that gives a name: paths as they were before it
+    std::string to;
+  };
+
+  void atEntry(pid_t thread) {
+    user_regs_struct registers = registersOf(thread);
+    Pending& pending = _pending[thread];
+    pending = {static_cast<int>(registers.orig_rax), 0, {}, {}};
+    ++_count;
+    if (_fault.kind == Fault::Kind::None) {
+      record(thread, registers, pending);
+      return;
+    }
+    if (_fault.kind == Fault::Kind::DiskFull) {
+      limitGrowth(thread, registers, pending);
+      return;
+    }
+    if (_count < _fault.call || _outcome.happened ||
+        (_fault.number >= 0 && _fault.number != pending.number)) {
+      return;
+    }
+    const Call call = callOf(thread, registers);
+    _outcome.place = nameOfCall(call.number) + ' ' + call.path;
+    if (_fault.kind == Fault::Kind::Error) {
+      replaceCall(thread, registers, pending, _fault.error);
+    } else if (_fault.kind == Fault::Kind::Short) {
+      shorten(thread, registers, std::max<std::uint64_t>(registers.rdx / 2, 1));
+    } else if (_fault.kind == Fault::Kind::Kill) {
+      kill(_child, SIGKILL);
+      _outcome.happened = true;
+    } else {
+      _fault.whilePaused();
+      _outcome.happened = true;
+    }
+  }
+
+  void atExit(pid_t thread) {
+    user_regs_struct registers = registersOf(thread);
+    const Pending& pending = _pending[thread];
+    if (pending.error != 0) {
+      // A program break that cannot grow is answered by the one that was.
+      registers.rax =
+          pending.number == SYS_brk ? _break : static_cast<unsigned long long>(-pending.error);
+      setRegisters(thread, registers);
+    } else if (pending.number == SYS_brk) {
+      _break = registers.rax;
+    } else if (_fault.kind == Fault::Kind::None && static_cast<long long>(registers.rax) >= 0) {
+      switch (pending.number) {
+        case SYS_write:
+        case SYS_pwrite64:
+        case SYS_ftruncate:
+          _durability.written(pending.from);
+          break;
+        case SYS_fsync:
+        case SYS_fdatasync:
+          _durability.flushed(pending.from);
+          break;
+        case SYS_rename:
+        case SYS_renameat:
+        case SYS_linkat:
+          _durability.named(pending.from, pending.to);
+          break;
+        case SYS_unlink:
+        case SYS_unlinkat:
+          _durability.removed(pending.from);
+          break;
+        default:
+          break;
+      }
+    }
+  }
+
+  void record(pid_t thread, const user_regs_struct& registers, Pending& pending) {
+    Call call = callOf(thread, registers);
+    pending.from = call.path;
+    if (pending.number == SYS_renameat || pending.number == SYS_linkat) {
+      pending.to = pathAt(thread, registers.rdx, registers.r10);
+    } else if (pending.number == SYS_rename) {
+      pending.to = pathAt(thread, static_cast<std::uint64_t>(AT_FDCWD), registers.rsi);
+    }
+    _outcome.calls.push_back(std::move(call));
+  }
+
+  void limitGrowth(pid_t thread, user_regs_struct& registers, Pending& pending) {
+    if ((pending.number != SYS_write && pending.number != SYS_pwrite64) ||
+        !descriptorPath(thread, registers.rdi).starts_with(_folder + '/')) {
+      return;
+    }
+    const std::uint64_t left = _fault.room - _grown;
+    const std::uint64_t wanted = registers.rdx;
+    if (left == 0) {
+      replaceCall(thread, registers, pending, ENOSPC);
+    } else if (wanted > left) {
+      shorten(thread, registers, left);
+    }
+    _grown += std::min(wanted, left);
+  }
+
+  void replaceCall(pid_t thread, user_regs_struct& registers, Pending& pending, int error) {
+    pending.error = error;
+    _outcome.happened = true;
+    if (pending.number != SYS_close) {  // which closes, whatever it answers
+      registers.orig_rax = static_cast<unsigned long long>(-1);
+      setRegisters(thread, registers);
+    }
+  }
+
+  void shorten(pid_t thread, user_regs_struct& registers, std::uint64_t size) {
+    registers.rdx = size;
+    setRegisters(thread, registers);
+    _outcome.happened = true;
+  }
+
+  pid_t _child;
+  std::string _folder;
+  const Fault& _fault;
+  Durability _durability;
+  Outcome _outcome;
+  std::size_t _count = 0;
+  std::uint64_t _grown = 0;
+  std::uint64_t _break = 0;
+  std::map<pid_t, Pending> _pending;
 };
 
 }  // namespace
 
-Outcome runTraced(const std::vector<std::string>& command, const std::string& folder,
-                  const Fault& fault) {
+TextFile::TextFile(const std::string& text) : _file(memfd_create("text", MFD_CLOEXEC)) {
+  if (_file < 0 ||
+      pwrite(_file, text.data(), text.size(), 0) != static_cast<ssize_t>(text.size())) {
+    throw std::runtime_error("no temporary file can be made");
+  }
+}
+
+TextFile::~TextFile() { close(_file); }
+
+std::string TextFile::text() const {
+  std::string text(static_cast<std::size_t>(std::max<off_t>(lseek(_file, 0, SEEK_END), 0)), ' ');
+  const ssize_t got = pread(_file, text.data(), text.size(), 0);
+  text.resize(static_cast<std::size_t>(std::max<ssize_t>(got, 0)));
+  return text;
+}
+
+void runInstead(const std::vector<std::string>& command) {
   std::vector<char*> arguments;
   for (const std::string& argument : command) {
     arguments.push_back(const_cast<char*>(argument.c_str()));  // NOLINT: execv changes nothing
   }
   arguments.push_back(nullptr);
-  const PrintedText output;
-  const PrintedText errors;
+  execv(arguments[0], arguments.data());
+}
+
+Outcome runTraced(const std::vector<std::string>& command, const std::string& folder,
+                  const Fault& fault) {
+  const TextFile output;
+  const TextFile errors;
   const pid_t child = fork();
   if (child < 0) {
     throw std::runtime_error("fork: " + std::string(std::strerror(errno)));
@@ -462,7 +454,7 @@ Outcome runTraced(const std::vector<std::string>& command, const std::string& fo
     if (setpgid(0, 0) == 0 && chdir(folder.c_str()) == 0 &&
         ptrace(PTRACE_TRACEME, 0, nullptr, nullptr) == 0) {
       raise(SIGSTOP);
-      execv(arguments[0], arguments.data());
+      runInstead(command);
     }
     _exit(126);
   }

@@ -7,6 +7,25 @@
 
 namespace vesprun::torture {
 
+/// A file without a name, for what a program reads or prints: a pipe would have to be emptied
+/// meanwhile.
+class TextFile {
+ public:
+  explicit TextFile(const std::string& text = {});
+  TextFile(const TextFile&) = delete;
+  TextFile& operator=(const TextFile&) = delete;
+  ~TextFile();
+
+  int descriptor() const { return _file; }
+  std::string text() const;
+
+ private:
+  int _file;
+};
+
+/// Replaces this process by a program; comes back when that fails.
+void runInstead(const std::vector<std::string>& command);
+
 /// What goes wrong during one run of a program.
 struct Fault {
   enum class Kind {
@@ -41,7 +60,7 @@ struct Outcome {
   std::string standardError;
   std::vector<Call> calls;              ///< recorded only without a fault
   std::vector<std::string> notDurable;  ///< likewise: names given to bytes that were not flushed
-  bool happened = false;                ///< the fault came to pass
+  bool happened = false;                ///< the fault happened
   std::string place{};                  ///< the call that it happened to, with its path
 };
 

@@ -3,40 +3,33 @@
 #include <fcntl.h>
 #include <unistd.h>
 
+#include <chrono>
 #include <iostream>
+#include <sstream>
 
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/QuotedText.h"
-#include "platform/host/files/FileDescriptor.h"
-#include "platform/host/files/SystemError.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 
 std::unique_ptr<HostPlatform> openDevice(const std::string& directory) {
-  std::string error;
-  std::unique_ptr<HostPlatform> device = HostPlatform::open(directory, error);
-  if (!device) {
-    throw CommandFailure(error);
-  }
-  return device;
+  return orFail([&](std::string& error) { return HostPlatform::open(directory, error); });
 }
 
 std::unique_ptr<HostPlatform> openDeviceReadOnly(const std::string& directory, SystemLog& log) {
-  std::string error;
-  std::unique_ptr<HostPlatform> device = HostPlatform::openReadOnly(directory, log, error);
-  if (!device) {
-    throw CommandFailure(error);
-  }
-  return device;
+  return orFail([&](std::string& error) { return HostPlatform::open(directory, error, &log); });
 }
 
 DeviceDirectory openDirectory(const std::string& directory) {
-  std::string error;
-  std::optional<DeviceDirectory> opened = DeviceDirectory::open(directory, error);
-  if (!opened) {
-    throw CommandFailure(error);
-  }
-  return *std::move(opened);
+  return *orFail([&](std::string& error) { return DeviceDirectory::open(directory, error); });
+}
+
+FolderLock takeDailyWork(const DeviceDirectory& directory) {
+  constexpr std::chrono::minutes kLongestWait(5);
+  return *orFail([&](std::string& error) {
+    return FolderLock::take(directory.path(), error, FolderLock::Kind::Exclusive, kLongestWait);
+  });
 }
 
 std::string readInput(const std::string& file) {
@@ -59,9 +52,33 @@ std::string readInput(const std::string& file) {
   return content;
 }
 
+std::string contentIfThere(const std::string& file) {
+  return *orFail([&](std::string& error) {
+    bool missing = false;
+    std::optional<std::string> content = readWholeFile(file, error, &missing);
+    return missing ? std::optional<std::string>("") : std::move(content);
+  });
+}
+
+void forEachLine(const std::string& file, const std::function<void(PropertyDict* line)>& take) {
+  std::istringstream lines(contentIfThere(file));
+  for (std::string line; std::getline(lines, line);) {
+    std::string ignored;
+    std::optional<PropertyValue> value = valueFromJsonText(line, ignored);
+    take(value ? value->dict() : nullptr);
+  }
+}
+
 std::string inputName(const std::string& file) { return file == "-" ? "standard input" : file; }
 
 void printJson(const PropertyValue& value) { std::cout << jsonText(value) << '\n'; }
+
+CLI::App* addDeviceCommand(CLI::App& above, const std::string& name, const std::string& description,
+                           std::string& directory) {
+  CLI::App* command = above.add_subcommand(name, description);
+  command->add_option("DIR", directory, "The device directory")->required();
+  return command;
+}
 
 void allowOneCommand(CLI::App& subject, bool needed) {
   subject.require_subcommand(0, 1);

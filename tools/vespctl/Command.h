@@ -3,6 +3,7 @@
 #include <CLI/CLI.hpp>
 #include <charconv>
 #include <concepts>
+#include <functional>
 #include <limits>
 #include <memory>
 #include <stdexcept>
@@ -12,6 +13,7 @@
 #include "common/PropertyValue.h"
 #include "platform/host/HostPlatform.h"
 #include "platform/host/documents/QuotedText.h"
+#include "platform/host/files/FileLock.h"
 
 namespace vesprun {
 
@@ -21,17 +23,39 @@ class CommandFailure : public std::runtime_error {
   using std::runtime_error::runtime_error;
 };
 
+/// What `attempt` gives. It takes a text for its error, with which `CommandFailure` is thrown when
+/// it gives nothing.
+template <typename Attempt>
+auto orFail(const Attempt& attempt) {
+  std::string error;
+  auto result = attempt(error);
+  if (!result) {
+    throw CommandFailure(error);
+  }
+  return result;
+}
+
 /// Throws `CommandFailure` when the directory cannot be used; so do the next two.
 std::unique_ptr<HostPlatform> openDevice(const std::string& directory);
 
-/// Without changing anything on the device; see `HostPlatform::openReadOnly`.
+/// Without changing anything on the device; see `HostPlatform::open`.
 std::unique_ptr<HostPlatform> openDeviceReadOnly(const std::string& directory, SystemLog& log);
 
 /// The directory alone, without its description.
 DeviceDirectory openDirectory(const std::string& directory);
 
+/// Waits until no run is at the daily work, and keeps others from it as long as the result lives.
+/// Throws `CommandFailure` when one takes minutes.
+FolderLock takeDailyWork(const DeviceDirectory& directory);
+
 /// The content of a file or pipe; "-" is standard input.
 std::string readInput(const std::string& file);
+
+/// The content of a regular file; empty when there is none.
+std::string contentIfThere(const std::string& file);
+
+/// Hands on each line of a file that may be missing, null for one that is not a JSON object.
+void forEachLine(const std::string& file, const std::function<void(PropertyDict* line)>& take);
 
 /// A file's name in messages: "-" is "standard input".
 std::string inputName(const std::string& file);
@@ -58,6 +82,10 @@ CLI::Validator decimal() {
       },
       "");
 }
+
+/// Adds a command whose first argument is a device directory.
+CLI::App* addDeviceCommand(CLI::App& above, const std::string& name, const std::string& description,
+                           std::string& directory);
 
 /// Allows one of `subject`'s commands, and names them all to refuse any other word, or none when
 /// one is `needed`.

@@ -3,9 +3,9 @@
 #include <md5.h>
 
 #include <cstring>
-#include <type_traits>
 
 #include "Varint.h"
+#include "common/HexText.h"
 
 namespace vesprun {
 namespace {
@@ -36,19 +36,6 @@ constexpr Table kTables[] = {
      "(key, day, device, line)"},
 };
 
-template <typename T>
-void appendRaw(std::string& row, T value) {
-  static_assert(std::is_arithmetic_v<T>);
-  char raw[sizeof value];
-  std::memcpy(raw, &value, sizeof value);
-  row.append(raw, sizeof raw);
-}
-
-void appendText(std::string& row, std::string_view text) {
-  appendVarint(row, text.size());
-  row.append(text);
-}
-
 std::uint64_t digest(std::string_view text) {
   MD5_CTX context;
   MD5Init(&context);
@@ -62,11 +49,9 @@ std::uint64_t digest(std::string_view text) {
 
 /// A text literal of any bytes.
 std::string literal(std::string_view text) {
-  constexpr char kDigits[] = "0123456789ABCDEF";
   std::string sql = "unhex('";
   for (const char byte : text) {
-    sql += kDigits[static_cast<std::uint8_t>(byte) >> 4];
-    sql += kDigits[static_cast<std::uint8_t>(byte) & 0xF];
+    appendHex(sql, static_cast<std::uint8_t>(byte), kUpperHexDigits);
   }
   return sql + "')";
 }
@@ -101,47 +86,11 @@ std::string rowsOf(const char* table, const char* columns, std::string_view key,
          ") LIMIT 1 BY day, device FORMAT RowBinary";
 }
 
-/// Reads rows of RowBinary.
-class Rows {
- public:
-  explicit Rows(std::string_view bytes) : _bytes(bytes) {}
-
-  bool atEnd() const { return _bytes.empty(); }
-
-  template <typename T>
-  T raw() {
-    T value;
-    std::memcpy(&value, take(sizeof value).data(), sizeof value);
-    return value;
-  }
-
-  std::uint64_t varint() {
-    PackedReader reader(_bytes);
-    const std::uint64_t value = reader.varint();
-    _bytes.remove_prefix(static_cast<std::size_t>(reader.position() - _bytes.data()));
-    return value;
-  }
-
-  std::string text() { return std::string(take(varint())); }
-
- private:
-  std::string_view take(std::uint64_t count) {
-    if (_bytes.size() < count) {
-      throw std::out_of_range("cut");
-    }
-    const std::string_view taken = _bytes.substr(0, static_cast<std::size_t>(count));
-    _bytes.remove_prefix(taken.size());
-    return taken;
-  }
-
-  std::string_view _bytes;
-};
-
-/// Reads all rows of an answer by `row`.
+/// Reads all rows of an answer in RowBinary by `row`.
 template <typename Row>
 void readRows(const std::string& address, const std::string& answer, const Row& row) {
   try {
-    for (Rows rows(answer); !rows.atEnd();) {
+    for (PackedReader rows(answer); !rows.atEnd();) {
       row(rows);
     }
   } catch (const std::out_of_range&) {
@@ -234,7 +183,7 @@ void ClickHouseStore::finish() {
   _partitions.clear();
 }
 
-void ClickHouseStore::visitKeys(const std::function<void(const ReportedKey&)>& visit) {
+void ClickHouseStore::visitKeys(const VisitKey& visit) {
   const auto keysOf = [](const Table& table, KeyKind kind) {
     return "SELECT key, toUInt8(" + std::to_string(static_cast<int>(kind)) +
            ") AS kind, uniqExact(device) AS devices, uniqExact(day) AS days FROM " + table.name +
@@ -244,7 +193,7 @@ void ClickHouseStore::visitKeys(const std::function<void(const ReportedKey&)>& v
       _server.post("SELECT key, kind, devices, days FROM (" + keysOf(kTables[1], KeyKind::Scalar) +
                    " UNION ALL " + keysOf(kTables[2], KeyKind::Distribution) +
                    ") ORDER BY key, kind FORMAT RowBinary");
-  readRows(_address, answer, [&](Rows& rows) {
+  readRows(_address, answer, [&](PackedReader& rows) {
     ReportedKey key;
     key.key = rows.text();
     key.kind = static_cast<KeyKind>(rows.raw<std::uint8_t>());
@@ -255,20 +204,20 @@ void ClickHouseStore::visitKeys(const std::function<void(const ReportedKey&)>& v
 }
 
 void ClickHouseStore::visitScalars(std::string_view key, const DayRange& days,
-                                   const std::function<void(std::int32_t, std::int64_t)>& visit) {
-  readRows(_address, _server.post(rowsOf("vespfleet_scalar", "value", key, days)), [&](Rows& rows) {
-    const auto day = rows.raw<std::int32_t>();
-    visit(day, rows.raw<std::int64_t>());
-  });
+                                   const VisitScalar& visit) {
+  readRows(_address, _server.post(rowsOf("vespfleet_scalar", "value", key, days)),
+           [&](PackedReader& rows) {
+             const auto day = rows.raw<std::int32_t>();
+             visit(day, rows.raw<std::int64_t>());
+           });
 }
 
-void ClickHouseStore::visitDistributions(
-    std::string_view key, const DayRange& days,
-    const std::function<void(std::int32_t, const Distribution&)>& visit) {
+void ClickHouseStore::visitDistributions(std::string_view key, const DayRange& days,
+                                         const VisitDistribution& visit) {
   const char* const columns =
       "minimum, maximum, mean, deviations, count, hasHistogram, labels, counts";
   readRows(_address, _server.post(rowsOf("vespfleet_distribution", columns, key, days)),
-           [&](Rows& rows) {
+           [&](PackedReader& rows) {
              const auto day = rows.raw<std::int32_t>();
              Distribution distribution;
              distribution.statistics.minimum = rows.raw<double>();

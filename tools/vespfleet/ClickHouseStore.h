@@ -21,12 +21,10 @@ class ClickHouseStore : public FleetStore {
 
   void add(const ExportedLine& line) override;
   void finish() override;
-  void visitKeys(const std::function<void(const ReportedKey&)>& visit) override;
-  void visitScalars(std::string_view key, const DayRange& days,
-                    const std::function<void(std::int32_t, std::int64_t)>& visit) override;
-  void visitDistributions(
-      std::string_view key, const DayRange& days,
-      const std::function<void(std::int32_t, const Distribution&)>& visit) override;
+  void visitKeys(const VisitKey& visit) override;
+  void visitScalars(std::string_view key, const DayRange& days, const VisitScalar& visit) override;
+  void visitDistributions(std::string_view key, const DayRange& days,
+                          const VisitDistribution& visit) override;
 
  private:
   std::string _address;

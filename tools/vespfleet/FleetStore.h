@@ -48,15 +48,17 @@ class FleetStore {
   virtual void add(const ExportedLine& line) = 0;
   virtual void finish() = 0;
 
-  /// The keys of the lines that hold, by their bytes, a scalar before a distribution.
-  virtual void visitKeys(const std::function<void(const ReportedKey&)>& visit) = 0;
+  using VisitKey = std::function<void(const ReportedKey& key)>;
+  using VisitScalar = std::function<void(std::int32_t day, std::int64_t value)>;
+  using VisitDistribution = std::function<void(std::int32_t day, const Distribution& values)>;
 
+  /// The keys of the lines that hold, by their bytes, a scalar before a distribution.
+  virtual void visitKeys(const VisitKey& visit) = 0;
   /// What the devices reported under `key`, in any order.
   virtual void visitScalars(std::string_view key, const DayRange& days,
-                            const std::function<void(std::int32_t day, std::int64_t)>& visit) = 0;
-  virtual void visitDistributions(
-      std::string_view key, const DayRange& days,
-      const std::function<void(std::int32_t day, const Distribution&)>& visit) = 0;
+                            const VisitScalar& visit) = 0;
+  virtual void visitDistributions(std::string_view key, const DayRange& days,
+                                  const VisitDistribution& visit) = 0;
 };
 
 /// Opens the store at an address: a ClickHouse database when it begins with "http://", else an

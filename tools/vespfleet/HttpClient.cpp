@@ -56,21 +56,11 @@ std::string reasonIn(const std::string& answer) {
 
 }  // namespace
 
-struct HttpClient::Handle {
-  CURL* curl = curl_easy_init();
-
-  Handle() {
-    if (curl == nullptr) {
-      throw std::bad_alloc();
-    }
-  }
-  Handle(const Handle&) = delete;
-  Handle& operator=(const Handle&) = delete;
-  ~Handle() { curl_easy_cleanup(curl); }
-};
-
 HttpClient::HttpClient(const std::string& address)
-    : _address(address), _handle(std::make_unique<Handle>()) {
+    : _address(address), _curl(curl_easy_init(), curl_easy_cleanup) {
+  if (!_curl) {
+    throw std::bad_alloc();
+  }
   const Url url(curl_url());
   const bool parsed =
       url && curl_url_set(url.get(), CURLUPART_URL, address.c_str(), 0) == CURLUE_OK;
@@ -94,7 +84,7 @@ HttpClient::HttpClient(const std::string& address)
   }
   _url = text;
   curl_free(text);
-  CURL* curl = _handle->curl;
+  CURL* curl = _curl.get();
   curl_easy_setopt(curl, CURLOPT_NOSIGNAL, 1L);
   curl_easy_setopt(curl, CURLOPT_PROTOCOLS_STR, "http");
   curl_easy_setopt(curl, CURLOPT_PROXY, "");
@@ -109,10 +99,8 @@ HttpClient::HttpClient(const std::string& address)
   }
 }
 
-HttpClient::~HttpClient() = default;
-
 std::string HttpClient::post(const std::string& query, std::string_view data) {
-  CURL* curl = _handle->curl;
+  CURL* curl = _curl.get();
   std::string url = _url;
   if (!data.empty()) {
     char* escaped = curl_easy_escape(curl, query.c_str(), static_cast<int>(query.size()));

@@ -14,18 +14,15 @@ class HttpClient {
   /// `address` is "http://HOST:PORT/DATABASE". Throws `std::invalid_argument` for another form, and
   /// for one that holds a user or password.
   explicit HttpClient(const std::string& address);
-  ~HttpClient();
 
   /// Runs `query`, with `data` behind it when it inserts, and returns what the server answers.
   /// Throws `StoreFailure` with the server's reason.
   std::string post(const std::string& query, std::string_view data = {});
 
  private:
-  struct Handle;
-
   std::string _address;
   std::string _url;
-  std::unique_ptr<Handle> _handle;
+  std::unique_ptr<void, void (*)(void*)> _curl;
 };
 
 }  // namespace vesprun

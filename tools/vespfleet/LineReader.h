@@ -4,7 +4,7 @@
 #include <cstdint>
 #include <string>
 
-#include "platform/host/files/FileDescriptor.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 

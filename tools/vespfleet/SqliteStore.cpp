@@ -106,15 +106,6 @@ void makeStore(const std::string& path) {
   }
 }
 
-/// Reads one value of a chunk; `Value` is what the entries stand for.
-template <typename Value>
-Value readValue(PackedReader& entries);
-
-template <>
-std::int64_t readValue(PackedReader& entries) {
-  return entries.signedInteger();
-}
-
 /// Labels by their numbers in `label`.
 struct PackedDistribution {
   Statistics statistics;
@@ -122,13 +113,12 @@ struct PackedDistribution {
   std::vector<std::pair<std::int64_t, std::uint64_t>> counts;
 };
 
-template <>
-PackedDistribution readValue(PackedReader& entries) {
+PackedDistribution readDistribution(PackedReader& entries) {
   PackedDistribution value;
-  value.statistics.minimum = entries.real();
-  value.statistics.maximum = entries.real();
-  value.statistics.mean = entries.real();
-  value.statistics.deviations = entries.real();
+  value.statistics.minimum = entries.raw<double>();
+  value.statistics.maximum = entries.raw<double>();
+  value.statistics.mean = entries.raw<double>();
+  value.statistics.deviations = entries.raw<double>();
   value.statistics.count = static_cast<std::int64_t>(entries.varint());
   std::uint64_t labels = entries.varint();
   value.hasHistogram = labels != 0;
@@ -139,53 +129,41 @@ PackedDistribution readValue(PackedReader& entries) {
   return value;
 }
 
-/// What is read of a value when only its line matters.
-template <KeyKind kind>
-struct PassedOver {};
-
-template <>
-PassedOver<KeyKind::Scalar> readValue(PackedReader& entries) {
-  entries.varint();
-  return {};
-}
-
-template <>
-PassedOver<KeyKind::Distribution> readValue(PackedReader& entries) {
+/// Reads a value of which only the line matters.
+void passOver(KeyKind kind, PackedReader& entries) {
+  if (kind == KeyKind::Scalar) {
+    entries.varint();
+    return;
+  }
   for (int number = 0; number < 4; ++number) {
-    entries.real();
+    entries.raw<double>();
   }
   entries.varint();
   for (std::uint64_t labels = entries.varint(); labels > 1; --labels) {
     entries.varint();
     entries.varint();
   }
-  return {};
 }
 
 }  // namespace
 
-class SqliteStore::Statements {
- public:
-  explicit Statements(const SqliteConnection& database)
-      : find(database,
-             "SELECT number, revision, seconds, nanoseconds, size, text FROM line"
-             " WHERE day = ? AND device = ?"),
-        remove(database, "DELETE FROM line WHERE number = ?"),
-        insert(database,
-               "INSERT INTO line(day, device, revision, seconds, nanoseconds, size, text)"
-               " VALUES(?, ?, ?, ?, ?, ?, ?)"),
-        lastChunk(database,
-                  "SELECT number, last, entries FROM chunk WHERE number >= ? AND number < ?"
-                  " ORDER BY number DESC LIMIT 1"),
-        writeChunk(database, "INSERT OR REPLACE INTO chunk(number, last, entries) VALUES(?, ?, ?)"),
-        countReplaced(database, "UPDATE replaced SET lines = lines + 1") {}
+struct SqliteStore::Statements {
+  explicit Statements(const SqliteConnection& opened) : database(opened) {}
 
-  SqliteStatement find;
-  SqliteStatement remove;
-  SqliteStatement insert;
-  SqliteStatement lastChunk;
-  SqliteStatement writeChunk;
-  SqliteStatement countReplaced;
+  const SqliteConnection& database;
+  SqliteStatement findLine{database,
+                           "SELECT number, revision, seconds, nanoseconds, size, text FROM line"
+                           " WHERE day = ? AND device = ?"};
+  SqliteStatement remove{database, "DELETE FROM line WHERE number = ?"};
+  SqliteStatement insert{database,
+                         "INSERT INTO line(day, device, revision, seconds, nanoseconds, size, text)"
+                         " VALUES(?, ?, ?, ?, ?, ?, ?)"};
+  SqliteStatement lastChunk{database,
+                            "SELECT number, last, entries FROM chunk WHERE number >= ? AND"
+                            " number < ? ORDER BY number DESC LIMIT 1"};
+  SqliteStatement writeChunk{database,
+                             "INSERT OR REPLACE INTO chunk(number, last, entries) VALUES(?, ?, ?)"};
+  SqliteStatement countReplaced{database, "UPDATE replaced SET lines = lines + 1"};
 };
 
 /// Turns what goes wrong in the file into one line.
@@ -231,27 +209,33 @@ SqliteStore::SqliteStore(const std::string& path, bool toBeLoaded) : _path(path)
 
 SqliteStore::~SqliteStore() = default;
 
-std::int64_t SqliteStore::numberOf(const char* table, KeyKind kind, std::string_view text) {
-  const bool isKey = std::string_view(table) == "key";
+/// The number of a text in the tables `device`, `key` and `label`; only keys have a kind.
+std::optional<std::int64_t> SqliteStore::findNumber(const std::string& table, KeyKind kind,
+                                                    std::string_view text) {
+  const bool isKey = table == "key";
+  const std::string query =
+      "SELECT number FROM " + table + " WHERE name = ?" + (isKey ? " AND kind = ?" : "");
+  SqliteStatement find(*_database, query.c_str());
+  find.bind(1, text);
+  if (isKey) {
+    find.bind(2, static_cast<std::int64_t>(kind));
+  }
+  return find.step() ? std::optional(find.integer(0)) : std::nullopt;
+}
+
+/// The same, where a text that is not there gets a number.
+std::int64_t SqliteStore::numberOf(const std::string& table, KeyKind kind, std::string_view text) {
   std::string cached = table;
   cached.append(kind == KeyKind::Scalar ? "\1" : "\2").append(text);
   if (const auto known = _numbers.find(cached); known != _numbers.end()) {
     return known->second;
   }
-  const std::string where =
-      std::string(table) + (isKey ? " WHERE name = ? AND kind = ?" : " WHERE name = ?");
-  SqliteStatement find(*_database, ("SELECT number FROM " + where).c_str());
-  find.bind(1, text);
-  if (isKey) {
-    find.bind(2, static_cast<std::int64_t>(kind));
-  }
-  std::int64_t number = 0;
-  if (find.step()) {
-    number = find.integer(0);
-  } else {
-    SqliteStatement insert(*_database, (std::string("INSERT INTO ") + table +
-                                        (isKey ? "(name, kind) VALUES(?, ?)" : "(name) VALUES(?)"))
-                                           .c_str());
+  std::optional<std::int64_t> number = findNumber(table, kind, text);
+  if (!number) {
+    const bool isKey = table == "key";
+    const std::string query =
+        "INSERT INTO " + table + (isKey ? "(name, kind) VALUES(?, ?)" : "(name) VALUES(?)");
+    SqliteStatement insert(*_database, query.c_str());
     insert.bind(1, text);
     if (isKey) {
       insert.bind(2, static_cast<std::int64_t>(kind));
@@ -259,12 +243,12 @@ std::int64_t SqliteStore::numberOf(const char* table, KeyKind kind, std::string_
     insert.run();
     number = sqlite3_last_insert_rowid(_database->handle());
   }
-  return _numbers.emplace(std::move(cached), number).first->second;
+  return _numbers.emplace(std::move(cached), *number).first->second;
 }
 
-/// Removes the line that `line` takes the place of; false when that one holds on.
+/// Removes the line of the same device and day. False when it stays, as it ranks above `line`.
 bool SqliteStore::replacesEarlier(const ExportedLine& line, std::int64_t device) {
-  SqliteStatement& find = _statements->find;
+  SqliteStatement& find = _statements->findLine;
   find.bind(1, line.day).bind(2, device);
   bool replaces = true;
   std::optional<std::int64_t> earlier;
@@ -312,7 +296,7 @@ void SqliteStore::add(const ExportedLine& line) {
         value.clear();
         for (const double real :
              {statistics.minimum, statistics.maximum, statistics.mean, statistics.deviations}) {
-          appendDouble(value, real);
+          appendRaw(value, real);
         }
         appendVarint(value, static_cast<std::uint64_t>(statistics.count));
         appendVarint(value, histogram ? histogram->size() + 1 : 0);
@@ -410,10 +394,14 @@ void SqliteStore::writeAnew() {
   while (keys.step()) {
     const std::int64_t key = keys.integer(0);
     std::vector<std::pair<std::int64_t, std::string>> kept;
-    visitPackedEntries(static_cast<KeyKind>(keys.integer(1)), key, lines,
-                       [&kept](const Line& line, std::string_view packed) {
-                         kept.emplace_back(line.number, packed);
-                       });
+    const auto kind = static_cast<KeyKind>(keys.integer(1));
+    visitEntries(key, lines, [&](PackedReader& entries, const Line* line) {
+      const char* const begin = entries.position();
+      passOver(kind, entries);
+      if (line != nullptr) {
+        kept.emplace_back(line->number, std::string(begin, entries.position()));
+      }
+    });
     remove.bind(1, key * kChunksOfKey).bind(2, (key + 1) * kChunksOfKey).run();
     for (const auto& [line, packed] : kept) {
       append(key, line, packed);
@@ -441,16 +429,10 @@ std::vector<SqliteStore::Line> SqliteStore::linesThatHold(const DayRange& days) 
   return lines;
 }
 
-std::optional<std::int64_t> SqliteStore::findKey(KeyKind kind, std::string_view key) {
-  SqliteStatement find(*_database, "SELECT number FROM key WHERE name = ? AND kind = ?");
-  find.bind(1, key).bind(2, static_cast<std::int64_t>(kind));
-  return find.step() ? std::optional(find.integer(0)) : std::nullopt;
-}
-
-/// Visits the entries of a key whose lines hold. Both ascend by the lines' numbers.
-template <typename Value, typename Visit>
-void SqliteStore::visitEntries(std::int64_t key, const std::vector<Line>& lines,
-                               const Visit& visit) {
+/// Calls `read` for each entry of a key, to read its value, with its line, or null when that does
+/// not hold. Entries and lines ascend by the lines' numbers.
+template <typename Read>
+void SqliteStore::visitEntries(std::int64_t key, const std::vector<Line>& lines, const Read& read) {
   SqliteStatement chunks(*_database,
                          "SELECT entries FROM chunk WHERE number >= ? AND number < ?"
                          " ORDER BY number");
@@ -461,33 +443,15 @@ void SqliteStore::visitEntries(std::int64_t key, const std::vector<Line>& lines,
     std::int64_t number = 0;
     while (!entries.atEnd()) {
       number += static_cast<std::int64_t>(entries.varint());
-      const char* const begin = entries.position();
-      const Value value = readValue<Value>(entries);
       while (line != lines.end() && line->number < number) {
         ++line;
       }
-      if (line != lines.end() && line->number == number) {
-        visit(*line, value, std::string_view(begin, entries.position()));
-      }
+      read(entries, line != lines.end() && line->number == number ? &*line : nullptr);
     }
   }
 }
 
-/// The same without reading the values.
-template <typename Visit>
-void SqliteStore::visitPackedEntries(KeyKind kind, std::int64_t key, const std::vector<Line>& lines,
-                                     const Visit& visit) {
-  const auto pass = [&visit](const Line& line, const auto& /*value*/, std::string_view packed) {
-    visit(line, packed);
-  };
-  if (kind == KeyKind::Scalar) {
-    visitEntries<PassedOver<KeyKind::Scalar>>(key, lines, pass);
-  } else {
-    visitEntries<PassedOver<KeyKind::Distribution>>(key, lines, pass);
-  }
-}
-
-void SqliteStore::visitKeys(const std::function<void(const ReportedKey&)>& visit) {
+void SqliteStore::visitKeys(const VisitKey& visit) {
   guarded([&] {
     _database->execute("BEGIN");  // one state of the store, until it is closed
     std::vector<Line> lines = linesThatHold({});
@@ -505,12 +469,15 @@ void SqliteStore::visitKeys(const std::function<void(const ReportedKey&)>& visit
     while (keys.step()) {
       const std::int64_t key = keys.integer(0);
       ReportedKey reported{std::string(keys.text(1)), static_cast<KeyKind>(keys.integer(2)), 0, 0};
-      visitPackedEntries(reported.kind, key, lines, [&](const Line& line, std::string_view) {
-        std::int64_t& onDay = keyOfDay[static_cast<std::size_t>(line.day)];
-        std::int64_t& onDevice = keyOfDevice[static_cast<std::size_t>(line.device)];
-        reported.days += onDay != key ? 1 : 0;
-        reported.devices += onDevice != key ? 1 : 0;
-        onDay = onDevice = key;
+      visitEntries(key, lines, [&](PackedReader& entries, const Line* line) {
+        passOver(reported.kind, entries);
+        if (line != nullptr) {
+          std::int64_t& onDay = keyOfDay[static_cast<std::size_t>(line->day)];
+          std::int64_t& onDevice = keyOfDevice[static_cast<std::size_t>(line->device)];
+          reported.days += onDay != key ? 1 : 0;
+          reported.devices += onDevice != key ? 1 : 0;
+          onDay = onDevice = key;
+        }
       });
       if (reported.devices > 0) {
         visit(reported);
@@ -520,49 +487,53 @@ void SqliteStore::visitKeys(const std::function<void(const ReportedKey&)>& visit
 }
 
 void SqliteStore::visitScalars(std::string_view key, const DayRange& days,
-                               const std::function<void(std::int32_t, std::int64_t)>& visit) {
+                               const VisitScalar& visit) {
   guarded([&] {
     _database->execute("BEGIN");  // one state of the store, until it is closed
-    if (const auto number = findKey(KeyKind::Scalar, key)) {
-      visitEntries<std::int64_t>(
-          *number, linesThatHold(days),
-          [&](const Line& line, std::int64_t value, std::string_view) { visit(line.day, value); });
+    if (const auto number = findNumber("key", KeyKind::Scalar, key)) {
+      visitEntries(*number, linesThatHold(days), [&](PackedReader& entries, const Line* line) {
+        const std::int64_t value = entries.signedInteger();
+        if (line != nullptr) {
+          visit(line->day, value);
+        }
+      });
     }
   });
 }
 
-void SqliteStore::visitDistributions(
-    std::string_view key, const DayRange& days,
-    const std::function<void(std::int32_t, const Distribution&)>& visit) {
+void SqliteStore::visitDistributions(std::string_view key, const DayRange& days,
+                                     const VisitDistribution& visit) {
   guarded([&] {
     _database->execute("BEGIN");  // one state of the store, until it is closed
-    const auto number = findKey(KeyKind::Distribution, key);
+    const auto number = findNumber("key", KeyKind::Distribution, key);
     if (!number) {
       return;
     }
     std::unordered_map<std::int64_t, std::string> labels;
     SqliteStatement label(*_database, "SELECT name FROM label WHERE number = ?");
-    visitEntries<PackedDistribution>(
-        *number, linesThatHold(days),
-        [&](const Line& line, const PackedDistribution& packed, std::string_view) {
-          Distribution distribution{packed.statistics, std::nullopt};
-          if (packed.hasHistogram) {
-            distribution.histogram.emplace();
+    visitEntries(*number, linesThatHold(days), [&](PackedReader& entries, const Line* line) {
+      const PackedDistribution packed = readDistribution(entries);
+      if (line == nullptr) {
+        return;
+      }
+      Distribution distribution{packed.statistics, std::nullopt};
+      if (packed.hasHistogram) {
+        distribution.histogram.emplace();
+      }
+      for (const auto& [numberOfLabel, count] : packed.counts) {
+        const auto [name, isNew] = labels.try_emplace(numberOfLabel);
+        if (isNew) {
+          label.bind(1, numberOfLabel);
+          if (!label.step()) {
+            throw std::out_of_range("a label that is not there");
           }
-          for (const auto& [numberOfLabel, count] : packed.counts) {
-            const auto [name, isNew] = labels.try_emplace(numberOfLabel);
-            if (isNew) {
-              label.bind(1, numberOfLabel);
-              if (!label.step()) {
-                throw std::out_of_range("a label that is not there");
-              }
-              name->second = label.text(0);
-              label.reset();
-            }
-            (*distribution.histogram)[name->second] = count;
-          }
-          visit(line.day, distribution);
-        });
+          name->second = label.text(0);
+          label.reset();
+        }
+        (*distribution.histogram)[name->second] = count;
+      }
+      visit(line->day, distribution);
+    });
   });
 }
 

@@ -1,7 +1,5 @@
 #pragma once
 
-#include <functional>
-#include <map>
 #include <memory>
 #include <optional>
 #include <string>
@@ -33,12 +31,10 @@ class SqliteStore : public FleetStore {
 
   void add(const ExportedLine& line) override;
   void finish() override;
-  void visitKeys(const std::function<void(const ReportedKey&)>& visit) override;
-  void visitScalars(std::string_view key, const DayRange& days,
-                    const std::function<void(std::int32_t, std::int64_t)>& visit) override;
-  void visitDistributions(
-      std::string_view key, const DayRange& days,
-      const std::function<void(std::int32_t, const Distribution&)>& visit) override;
+  void visitKeys(const VisitKey& visit) override;
+  void visitScalars(std::string_view key, const DayRange& days, const VisitScalar& visit) override;
+  void visitDistributions(std::string_view key, const DayRange& days,
+                          const VisitDistribution& visit) override;
 
  private:
   /// A line that holds.
@@ -53,23 +49,21 @@ class SqliteStore : public FleetStore {
     std::int64_t last = 0;   ///< line number of its last entry, 0 when empty
     std::string entries;
   };
-  class Statements;
+  struct Statements;
 
   bool replacesEarlier(const ExportedLine& line, std::int64_t device);
   void append(std::int64_t key, std::int64_t line, std::string_view value);
   void write(Tail& tail);
   Tail& tailOf(std::int64_t key);
-  std::int64_t numberOf(const char* table, KeyKind kind, std::string_view text);
+  std::optional<std::int64_t> findNumber(const std::string& table, KeyKind kind,
+                                         std::string_view text);
+  std::int64_t numberOf(const std::string& table, KeyKind kind, std::string_view text);
   void beginBatch();
   void commitBatch();
   void writeAnew();
   std::vector<Line> linesThatHold(const DayRange& days);
-  std::optional<std::int64_t> findKey(KeyKind kind, std::string_view key);
-  template <typename Value, typename Visit>
-  void visitEntries(std::int64_t key, const std::vector<Line>& lines, const Visit& visit);
-  template <typename Visit>
-  void visitPackedEntries(KeyKind kind, std::int64_t key, const std::vector<Line>& lines,
-                          const Visit& visit);
+  template <typename Read>
+  void visitEntries(std::int64_t key, const std::vector<Line>& lines, const Read& read);
   template <typename Task>
   auto guarded(const Task& task);
 

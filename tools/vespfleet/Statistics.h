@@ -8,7 +8,7 @@
 
 namespace vesprun {
 
-/// What a daily log tells of the values of one distribution.
+/// The figures of one distribution in a daily log.
 struct Statistics {
   double minimum = 0;
   double maximum = 0;

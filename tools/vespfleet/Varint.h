@@ -1,11 +1,11 @@
 #pragma once
 
-#include <bit>
 #include <cstdint>
 #include <cstring>
 #include <stdexcept>
 #include <string>
 #include <string_view>
+#include <type_traits>
 
 namespace vesprun {
 
@@ -25,10 +25,19 @@ inline void appendSigned(std::string& bytes, std::int64_t value) {
                static_cast<std::uint64_t>(value) << 1 ^ static_cast<std::uint64_t>(value >> 63));
 }
 
-inline void appendDouble(std::string& bytes, double value) {
+/// The bytes of a number as they lie in memory.
+template <typename T>
+void appendRaw(std::string& bytes, T value) {
+  static_assert(std::is_arithmetic_v<T>);
   char raw[sizeof value];
   std::memcpy(raw, &value, sizeof value);
   bytes.append(raw, sizeof raw);
+}
+
+/// A text behind its length.
+inline void appendText(std::string& bytes, std::string_view text) {
+  appendVarint(bytes, text.size());
+  bytes.append(text);
 }
 
 /// Reads what these functions append. Reading beyond the end throws `std::out_of_range`.
@@ -56,19 +65,22 @@ class PackedReader {
     return static_cast<std::int64_t>(value >> 1 ^ (~(value & 1) + 1));
   }
 
-  double real() {
-    double value = 0;
+  template <typename T>
+  T raw() {
+    T value;
     std::memcpy(&value, take(sizeof value).data(), sizeof value);
     return value;
   }
 
+  std::string text() { return std::string(take(varint())); }
+
  private:
-  std::string_view take(std::size_t count) {
+  std::string_view take(std::uint64_t count) {
     if (_bytes.size() < count) {
       throw std::out_of_range("an entry that is cut");
     }
-    const std::string_view taken = _bytes.substr(0, count);
-    _bytes.remove_prefix(count);
+    const std::string_view taken = _bytes.substr(0, static_cast<std::size_t>(count));
+    _bytes.remove_prefix(taken.size());
     return taken;
   }
 

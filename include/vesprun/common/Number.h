@@ -60,7 +60,8 @@ class Number {
     if constexpr (std::floating_point<T>) {
       _real = value;
     } else {
-      _bits = static_cast<std::uint64_t>(value);  // sign-extends signed types
+      // NOLINTNEXTLINE(bugprone-signed-char-misuse,cert-str34-c): the sign is to be extended
+      _bits = static_cast<std::uint64_t>(value);
     }
   }
 

@@ -49,7 +49,10 @@ class PropertyKey : public std::string_view {
   PropertyKey(const PropertyKey& other)
       : PropertyKey({other._isCopy ? copyOf(other) : other.data(), other.size()}, other._hash,
                     other._isCopy) {}
-  PropertyKey(PropertyKey&& other) noexcept : PropertyKey() { swap(other); }
+  PropertyKey(PropertyKey&& other) noexcept
+      : PropertyKey(other, other._hash, std::exchange(other._isCopy, false)) {
+    other.remove_prefix(other.size());
+  }
   PropertyKey& operator=(PropertyKey other) noexcept {
     swap(other);
     return *this;

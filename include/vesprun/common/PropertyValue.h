@@ -42,7 +42,10 @@ class PropertyValue {
       : _number(0U), _type(Type::Boolean), _boolean(boolean) {}
 
   PropertyValue(const PropertyValue& other);
-  PropertyValue(PropertyValue&& other) noexcept : PropertyValue(false) { swap(other); }
+  PropertyValue(PropertyValue&& other) noexcept
+      : _number(other._number), _type(other._type), _boolean(other._boolean) {
+    other._type = Type::Boolean;  // of which no box is deleted
+  }
   PropertyValue& operator=(const PropertyValue& other) {
     PropertyValue(other).swap(*this);
     return *this;

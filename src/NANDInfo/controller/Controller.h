@@ -11,8 +11,6 @@ class Controller {
  public:
   Controller() : _service(findNandExporter(_exporter)) {}
   ~Controller() { close(); }
-  Controller(const Controller&) = delete;
-  Controller& operator=(const Controller&) = delete;
 
   /// False when it refuses, or, with a line that begins with `complainer`, when there is no
   /// controller.

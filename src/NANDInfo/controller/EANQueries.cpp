@@ -1,5 +1,7 @@
 #include "NANDInfo/controller/EANQueries.h"
 
+#include "platform/RegistryObject.h"
+
 namespace vesprun {
 namespace {
 
@@ -7,32 +9,17 @@ constexpr const char* kServiceClass = "QuillNVMeEAN";
 constexpr std::uint32_t kImageSizeMethod = 3;
 constexpr std::uint32_t kUpdateCountMethod = 7;
 
-/// The log names the two failures by different names.
-std::uint64_t ask(std::uint32_t method, const char* name, const char* callName,
-                  std::uint32_t code) {
-  const auto character = [code](unsigned index) {
-    return static_cast<int>(code >> (24 - 8 * index) & 0xFF);
-  };
-  EANConnection ean;
-  if (!getEANConnection(ean)) {
-    logMessage(LogLevel::Default,
-               "%s: Unable to get EAN Io service connection for key (%u): %c%c%c%c\n", name, code,
-               character(0), character(1), character(2), character(3));
-    return 0;
-  }
-  std::uint64_t answer = 0;
-  const RegistryResult result = platform().deviceRegistry().DevRegConnectCallScalarMethod(
-      ean.connection, method, code, answer);
-  if (result != kRegistrySuccess) {
-    logMessage(LogLevel::Default,
-               "%s: DevRegConnectCallMethod failed (key (%u): %c%c%c%c) kernResult:%x\n", callName,
-               code, character(0), character(1), character(2), character(3), result);
-    return 0;
-  }
-  return answer;
-}
+/// The service and the connection to it, closed at the end.
+struct EANConnection {
+  RegistryObject service{};
+  RegistryHandle connection = 0;
 
-}  // namespace
+  ~EANConnection() {
+    if (connection != 0) {
+      platform().deviceRegistry().DevRegServiceClose(connection);
+    }
+  }
+};
 
 bool getEANConnection(EANConnection& ean) {
   DeviceRegistry& registry = platform().deviceRegistry();
@@ -49,6 +36,31 @@ bool getEANConnection(EANConnection& ean) {
   }
   return true;
 }
+
+/// The log names the two failures by different names.
+std::uint64_t ask(std::uint32_t method, const char* name, const char* callName,
+                  std::uint32_t code) {
+  const char key[] = {static_cast<char>(code >> 24), static_cast<char>(code >> 16),
+                      static_cast<char>(code >> 8), static_cast<char>(code)};
+  EANConnection ean;
+  if (!getEANConnection(ean)) {
+    logMessage(LogLevel::Default,
+               "%s: Unable to get EAN Io service connection for key (%u): %.4s\n", name, code, key);
+    return 0;
+  }
+  std::uint64_t answer = 0;
+  const RegistryResult result = platform().deviceRegistry().DevRegConnectCallScalarMethod(
+      ean.connection, method, code, answer);
+  if (result != kRegistrySuccess) {
+    logMessage(LogLevel::Default,
+               "%s: DevRegConnectCallMethod failed (key (%u): %.4s) kernResult:%x\n", callName,
+               code, key, result);
+    return 0;
+  }
+  return answer;
+}
+
+}  // namespace
 
 std::uint64_t GetEANImageSize(std::uint32_t code) {
   return ask(kImageSizeMethod, "GetEANImageSize", "GetImageSize", code);

@@ -2,28 +2,11 @@
 
 #include <cstdint>
 
-#include "platform/RegistryObject.h"
-
 namespace vesprun {
 
 // Images stored by the controller's EAN service, named by four-character codes (first character in
 // the most significant byte). Each query opens and closes the service; a failure is a line in the
 // system log, at default level, and the answer 0.
-
-/// The service and the connection to it, closed at the end.
-struct EANConnection {
-  RegistryObject service{};
-  RegistryHandle connection = 0;
-
-  ~EANConnection() {
-    if (connection != 0) {
-      platform().deviceRegistry().DevRegServiceClose(connection);
-    }
-  }
-};
-
-/// False, without a connection, on failure.
-bool getEANConnection(EANConnection& ean);
 
 /// As the service reports it.
 std::uint64_t GetEANImageSize(std::uint32_t code);

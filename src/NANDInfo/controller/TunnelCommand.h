@@ -48,12 +48,10 @@ class TunnelBuffer {
   std::size_t _size = 0;
 };
 
-/// Asks the controller for the answer's size, then for the answer. `request` brings the argument,
-/// `length` goes into the request; everything else is set here.
-///
-/// True: `buffer` is a new block of the stated size, and `length` the driver's, cut to that size so
-/// that nobody reads outside. False, with the error recorded: when the size could not be had,
-/// `buffer` becomes empty and `length` 0, else both stay.
+/// Asks the controller for the answer's size, then for the answer. `request` brings the argument
+/// and `length` its input length. True: `buffer` is a new block of that size, and `length` the
+/// driver's, cut to it. False, with the error recorded: `buffer` is empty and `length` 0 if the
+/// size could not be had, else both stay.
 bool executeTunnelCommand(RegistryHandle connection, const nand_exporter_t& exporter,
                           const TunnelSelector* selector, TunnelRequest& request,
                           TunnelBuffer& buffer, std::uint64_t& length);

@@ -21,6 +21,7 @@ namespace {
 
 constexpr std::string_view kLogType = "165";
 constexpr std::string_view kLogName = "StorageStatus";
+constexpr std::string_view kDefaultsDomain = "vesprun";
 constexpr std::string_view kLastLoggedKey = "SSLastLoggedAt";
 constexpr double kSecondsBetweenLogs = 604'800.0;
 
@@ -116,20 +117,20 @@ std::string joinedFields(const PropertyDict& fields) {
 }
 
 std::string logText(const std::string& date, const PropertyDict& fields) {
-  DiagnosticHeader& header = platform().diagnosticHeader();
-  ProcessInformation& process = platform().processInformation();
-  const std::string record = date + ' ' + process.processName() + '[' +
-                             std::to_string(process.processIdentifier()) +
+  DeviceInformation& device = platform().deviceInformation();
+  const std::string record = date + ' ' + device.processName() + '[' +
+                             std::to_string(device.processIdentifier()) +
                              "]: " + joinedFields(fields) + '\n';
-  return "System ID: " + header.GetSysIDWithDescription(false) +
-         "\nHardware Model: " + header.GetHardwareModel() +
-         "\nOS Version: " + header.GetSystemVersion() + "\nDate: " + date +
-         "\nIncident ID: " + header.GetIncidentID() + "\nFaultline Key: " + GetFaultlineKey() +
+  return "System ID: " + device.GetSysIDWithDescription(false) +
+         "\nHardware Model: " + device.GetHardwareModel() +
+         "\nOS Version: " + device.GetSystemVersion() + "\nDate: " + date +
+         "\nIncident ID: " + device.GetIncidentID() + "\nFaultline Key: " + GetFaultlineKey() +
          "\n\n" + record;
 }
 
 bool wasLoggedLately(const Date& now) {
-  const std::optional<PropertyValue> stored = platform().userDefaults().valueForKey(kLastLoggedKey);
+  const std::optional<PropertyValue> stored =
+      platform().preferences().LGSPreferencesGetValue(kLastLoggedKey, kDefaultsDomain);
   const Date* last = stored ? stored->date() : nullptr;
   if (last == nullptr || secondsBetween(*last, now) >= kSecondsBetweenLogs) {
     return false;
@@ -143,16 +144,16 @@ void submitLog(std::string_view logType, const PropertyDict& fields, const Date&
   const std::string text = logText(platform().clock().localDateText(now), fields);
   // A failed submission counts: the next one is due in 7 days.
   platform().logsmith().LGSWriteLogForSubmission(
-      logType, kLogName, nullptr, [&text](LogFileHandle& file) { file.write(text); });
-  platform().userDefaults().setValueForKey(now, kLastLoggedKey);
-  platform().userDefaults().synchronize();
+      logType, kLogName, nullptr, [&text](const LogFileHandle& write) { write(text); });
+  platform().preferences().LGSPreferencesSetValue(kLastLoggedKey, now, kDefaultsDomain);
+  platform().preferences().LGSPreferencesSynchronize(kDefaultsDomain);
 }
 
 }  // namespace
 
 std::string GetFaultlineKey() {
   const std::optional<PropertyValue> answer =
-      platform().orrery().OrreryCopyAnswer("InverseDeviceID");
+      platform().deviceInformation().OrreryCopyAnswer("InverseDeviceID");
   return answer && answer->string() != nullptr ? *answer->string() : "error";
 }
 

@@ -40,13 +40,13 @@ WriteAmplification writeAmplification(const ORUStatsContext& statistics) {
   const std::uint32_t bytesPerBand = statistics.pagesPerVirtualBlock * statistics.bytesPerPage;
   std::uint64_t slcBlocksPerBand = 0;
   std::uint64_t intermediateErases = 0;
-  for (const auto field : statistics.fields) {
+  statistics.fields.forEach([&](const GenericParserCxt::Field& field) {
     if (field.name == "pagesPerVirtualBlockSlc") {
       slcBlocksPerBand = field.value * statistics.bytesPerPage >> kBlockShift;
     } else if (field.name == "intermediateBandErases") {
       intermediateErases = field.value;
     }
-  }
+  });
   WriteAmplification amplification;
   amplification.user =
       writesPerHostWrite(statistics.bandErases, bytesPerBand >> kBlockShift, statistics.hostWrites);

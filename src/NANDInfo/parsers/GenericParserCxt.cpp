@@ -1,5 +1,6 @@
 #include "NANDInfo/parsers/GenericParserCxt.h"
 
+#include <algorithm>
 #include <array>
 #include <charconv>
 #include <limits>
@@ -8,9 +9,19 @@
 #include "common/LittleEndian.h"
 
 namespace vesprun {
+
+void GenericParserCxt::reserve(std::size_t count) noexcept {
+  try {
+    _values.reserve(_values.size() + count);
+  } catch (const std::bad_alloc&) {
+    // Appending goes as far as it can.
+  }
+}
+
 bool GenericParserCxt::append(std::string_view prefix, std::string_view suffix,
                               std::uint64_t value) noexcept {
   const std::size_t begin = _names.size();
+  const std::size_t fields = _values.size();
   prefix = prefix.substr(0, kMaxNameLength);
   suffix = suffix.substr(0, kMaxNameLength - prefix.size());
   try {
@@ -18,11 +29,13 @@ bool GenericParserCxt::append(std::string_view prefix, std::string_view suffix,
       throw std::bad_alloc();
     }
     _names.append(prefix).append(suffix);
-    _entries.push_back({nullptr, static_cast<std::uint32_t>(_names.size() - begin),
-                        static_cast<std::uint32_t>(begin), value});
+    _values.push_back(value);
+    _runs.push_back({KnownNames(), static_cast<std::uint32_t>(_names.size() - begin),
+                     static_cast<std::uint32_t>(begin)});
     return true;
   } catch (const std::bad_alloc&) {
     _names.resize(begin);
+    _values.resize(fields);
     return false;
   }
 }
@@ -30,12 +43,11 @@ bool GenericParserCxt::append(std::string_view prefix, std::string_view suffix,
 bool GenericParserCxt::appendKnown(KnownNames names, const std::uint8_t* source, std::size_t width,
                                    std::size_t count) noexcept {
   try {
-    for (std::size_t i = 0; i < count; ++i) {
-      const KnownName name = names[i];
-      const std::uint8_t* const element = source + i * width;
-      _entries.push_back({name.text.data(), static_cast<std::uint32_t>(name.text.size()), name.hash,
-                          width == sizeof(std::uint64_t) ? loadLittleEndian<std::uint64_t>(element)
-                                                         : loadLittleEndian(element, width)});
+    Run& run = _runs.emplace_back(Run{names, 0, 0});
+    for (; run.size < count; ++run.size) {
+      const std::uint8_t* const element = source + run.size * width;
+      _values.push_back(width == sizeof(std::uint64_t) ? loadLittleEndian<std::uint64_t>(element)
+                                                       : loadLittleEndian(element, width));
     }
     return true;
   } catch (const std::bad_alloc&) {
@@ -73,12 +85,14 @@ bool AddMultipleFieldsToGenericContext(GenericParserCxt& ctx, std::string_view n
 
 void ReleaseGenericParserCxt(GenericParserCxt& ctx) { ctx.release(); }
 
-PropertyDict CreateDictFromCxt(const GenericParserCxt& ctx) {
+PropertyDict CreateDictFromCxt(const GenericParserCxt& ctx, const FieldTable* filter) {
   PropertyDict dict;
-  dict.reserve(ctx.size());
-  for (const GenericParserCxt::Field field : ctx) {
-    dict.set(field.key(), field.value);
-  }
+  dict.reserve(filter != nullptr ? std::min(ctx.size(), filter->size()) : ctx.size());
+  ctx.forEach([&](const GenericParserCxt::Field& field) {
+    if (filter == nullptr || filter->find(field.name, field.hash()) != nullptr) {
+      dict.set(field.key(), field.value);
+    }
+  });
   return dict;
 }
 

@@ -1,22 +1,21 @@
 #pragma once
 
-#include <concepts>
 #include <cstddef>
 #include <cstdint>
-#include <iterator>
 #include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
 #include "NANDInfo/parsers/KnownNames.h"
+#include "NANDInfo/tables/FieldTable.h"
 #include "common/PropertyDict.h"
 
 namespace vesprun {
 
 /// The result of the statistics parsers: an ordered list of named unsigned 64-bit fields, possibly
-/// with repeated names. Names of known fields are referred to; all others share one text, so that a
-/// field needs no allocation of its own.
+/// with repeated names. Names of known fields are referred to, a statistic at a time; all others
+/// share one text, so that a field needs no allocation of its own.
 class GenericParserCxt {
  public:
   static constexpr std::size_t kMaxNameLength = 98;  ///< longer names are cut
@@ -31,48 +30,30 @@ class GenericParserCxt {
     PropertyKey key() const {
       return knownHash ? PropertyKey::permanent(name, *knownHash) : PropertyKey(name);
     }
+    std::uint32_t hash() const { return knownHash ? *knownHash : hashOfText(name); }
   };
 
-  /// In the order in which fields were appended.
-  class const_iterator {
-   public:
-    using iterator_category = std::input_iterator_tag;
-    using value_type = Field;
-    using difference_type = std::ptrdiff_t;
-    using pointer = const Field*;
-    using reference = Field;
+  std::size_t size() const { return _values.size(); }
+  bool empty() const { return _values.empty(); }
 
-    const_iterator(const GenericParserCxt& ctx, std::size_t index) : _ctx(&ctx), _index(index) {}
-    Field operator*() const { return (*_ctx)[_index]; }
-    const_iterator& operator++() {
-      ++_index;
-      return *this;
+  /// Calls `visit(field)` for each, in the order in which they were appended.
+  template <typename Visit>
+  void forEach(Visit&& visit) const {
+    const std::uint64_t* value = _values.data();
+    for (const Run& run : _runs) {
+      if (!run.names.isKnown()) {
+        visit(Field{std::string_view(_names).substr(run.begin, run.size), *value++, {}});
+        continue;
+      }
+      for (std::size_t i = 0; i < run.size; ++i) {
+        const KnownName name = run.names[i];
+        visit(Field{name.text, *value++, name.hash});
+      }
     }
-    const_iterator operator++(int) {
-      const_iterator before = *this;
-      ++_index;
-      return before;
-    }
-    friend bool operator==(const const_iterator&, const const_iterator&) = default;
-
-   private:
-    const GenericParserCxt* _ctx;
-    std::size_t _index;
-  };
-
-  std::size_t size() const { return _entries.size(); }
-  bool empty() const { return _entries.empty(); }
-  /// `index` is below `size()`.
-  Field operator[](std::size_t index) const {
-    const Entry& entry = _entries[index];
-    if (entry.known != nullptr) {
-      return {{entry.known, entry.nameSize}, entry.value, entry.hashOrBegin};
-    }
-    return {std::string_view(_names).substr(entry.hashOrBegin, entry.nameSize), entry.value, {}};
   }
-  const_iterator begin() const { return {*this, 0}; }
-  const_iterator end() const { return {*this, size()}; }
 
+  /// Makes room for that many values more, if there is memory.
+  void reserve(std::size_t count) noexcept;
   /// Appends a field named `prefix` + `suffix`, cut to `kMaxNameLength`. False, and nothing
   /// appended, when memory runs out.
   bool append(std::string_view prefix, std::string_view suffix, std::uint64_t value) noexcept;
@@ -87,15 +68,16 @@ class GenericParserCxt {
   void release() { *this = GenericParserCxt(); }
 
  private:
-  struct Entry {
-    const char* known;  ///< the name; null when it is in `_names`
-    std::uint32_t nameSize;
-    std::uint32_t hashOrBegin;  ///< of a known name its hash, else its place in `_names`
-    std::uint64_t value;
+  /// Elements of a known statistic, or one field of another name.
+  struct Run {
+    KnownNames names;
+    std::uint32_t size;   ///< fields; of another name its characters
+    std::uint32_t begin;  ///< of another name in `_names`
   };
 
   std::string _names;
-  std::vector<Entry> _entries;
+  std::vector<Run> _runs;
+  std::vector<std::uint64_t> _values;  ///< of all fields
 };
 
 /// Appends a field named `prefix` + `suffix`, cut to 98 characters. False, and nothing appended,
@@ -118,20 +100,8 @@ bool AddMultipleFieldsToGenericContext(GenericParserCxt& ctx, std::string_view n
 /// Empties the context for further use.
 void ReleaseGenericParserCxt(GenericParserCxt& ctx);
 
-/// The fields whose names `keeps` accepts as a dictionary of unsigned 64-bit numbers. A repeated
-/// name keeps its first place and its last value.
-template <std::predicate<std::string_view> Filter>
-PropertyDict CreateDictFromCxt(const GenericParserCxt& ctx, const Filter& keeps) {
-  PropertyDict dict;
-  for (const GenericParserCxt::Field field : ctx) {
-    if (keeps(field.name)) {
-      dict.set(field.key(), field.value);
-    }
-  }
-  return dict;
-}
-
-/// The same for all fields.
-PropertyDict CreateDictFromCxt(const GenericParserCxt& ctx);
+/// The fields, of which only those that `filter` lists when it is given, as a dictionary of
+/// unsigned 64-bit numbers. A repeated name keeps its first place and its last value.
+PropertyDict CreateDictFromCxt(const GenericParserCxt& ctx, const FieldTable* filter = nullptr);
 
 }  // namespace vesprun

@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <string_view>
 
+#include "NANDInfo/tables/FieldName.h"
 #include "common/PropertyKey.h"
 
 namespace vesprun {
@@ -25,15 +26,17 @@ class KnownNames {
     std::uint32_t hash = 0;
   };
 
+  constexpr KnownNames() = default;
   constexpr KnownNames(const char* text, const Place* places) : _text(text), _places(places) {}
+  bool isKnown() const { return _text != nullptr; }
   KnownName operator[](std::size_t element) const {
     const Place& place = _places[element];
     return {{_text + place.begin, place.size}, place.hash};
   }
 
  private:
-  const char* _text;
-  const Place* _places;
+  const char* _text = nullptr;
+  const Place* _places = nullptr;
 };
 
 /// The names of all elements of all statistics in `kTable`, laid out when it is compiled: that of a
@@ -54,26 +57,14 @@ class KnownNamesOf {
   /// Calls `visit(row, name)` for each.
   template <typename Visit>
   static constexpr void forEach(Visit visit) {
-    std::array<char, 128> name{};
     for (std::size_t row = 0; row < kTable.size(); ++row) {
-      for (std::size_t element = 0; element < kTable[row].count; ++element) {
-        char* end = name.data();
-        const auto append = [&end](std::string_view text) {
-          for (const char character : text) {
-            *end++ = character;
-          }
-        };
-        append(kTable[row].name);
+      for (std::uint32_t element = 0; element < kTable[row].count; ++element) {
+        NameText name;
+        name.append(kTable[row].name);
         if (kTable[row].count > 1) {
-          append(kSeparator);
-          for (std::size_t power = element < 10    ? 1
-                                   : element < 100 ? 10
-                                                   : 100;
-               power != 0; power /= 10) {
-            *end++ = static_cast<char>('0' + element / power % 10);
-          }
+          name.append(kSeparator).append(element);
         }
-        visit(row, std::string_view(name.data(), end));
+        visit(row, std::string_view(name));
       }
     }
   }

@@ -59,9 +59,10 @@ Taken takeArray(GenericParserCxt& ctx, const ORUStatKey& key, const StatisticsRe
 }
 
 template <typename Take>
-std::uint32_t walk(std::span<const std::uint8_t> buffer, const Take& take) {
+std::uint32_t walk(GenericParserCxt& ctx, std::span<const std::uint8_t> buffer, const Take& take) {
   std::uint32_t total = 0;
   StatisticsRecordReader reader(buffer);
+  ctx.reserve(reader.remaining());
   while (reader.remaining() != 0) {
     const StatisticsRecordHeader header = reader.readHeader();
     if (header.count == 0) {
@@ -83,7 +84,7 @@ std::uint32_t walk(std::span<const std::uint8_t> buffer, const Take& take) {
 }  // namespace
 
 std::uint32_t ORUFTLParseBufferToCxt(GenericParserCxt& ctx, std::span<const std::uint8_t> buffer) {
-  return walk(buffer,
+  return walk(ctx, buffer,
               [&ctx](const StatisticsRecordHeader& header, const std::uint8_t* payload) -> Taken {
                 const ORUStatKey* key = findORUStatKey(header.id);
                 if (key == nullptr) {
@@ -96,9 +97,10 @@ std::uint32_t ORUFTLParseBufferToCxt(GenericParserCxt& ctx, std::span<const std:
 
 std::uint32_t ORUFTLParseStatKeyBufferToCxt(GenericParserCxt& ctx,
                                             std::span<const std::uint8_t> buffer) {
-  return walk(buffer, [&ctx](const StatisticsRecordHeader& header, const std::uint8_t* payload) {
-    return takeUnknown(ctx, header, payload);
-  });
+  return walk(ctx, buffer,
+              [&ctx](const StatisticsRecordHeader& header, const std::uint8_t* payload) {
+                return takeUnknown(ctx, header, payload);
+              });
 }
 
 }  // namespace vesprun

@@ -54,6 +54,7 @@ bool ORUParseBufferToCxt(ORUStatsContext& ctx, std::span<const std::uint8_t> buf
   if (reader.remaining() == 0) {
     return false;
   }
+  ctx.fields.reserve(reader.remaining());
   const std::size_t mostFields =
       ctx.fields.size() + std::max(reader.remaining(), kMostSharedFields);
   do {

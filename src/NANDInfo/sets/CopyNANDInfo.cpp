@@ -1,7 +1,6 @@
 #include "NANDInfo/sets/CopyNANDInfo.h"
 
 #include <array>
-#include <utility>
 
 #include "NANDInfo/controller/EntryPoint.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"

@@ -65,7 +65,7 @@ PropertyDict CreateFilteredDict_SigDig(const PropertyDict& source, const FieldTa
   PropertyDict filtered;
   filtered.reserve(std::min(source.size(), digits->size()));
   for (const auto& [key, value] : source) {
-    const FieldRange* field = digits->find(key);
+    const FieldRange* field = digits->find(key, key.hash());
     if (field == nullptr) {
       continue;
     }
@@ -76,6 +76,21 @@ PropertyDict CreateFilteredDict_SigDig(const PropertyDict& source, const FieldTa
       filtered.set(key, value);
     }
   }
+  return filtered;
+}
+
+PropertyDict CreateFilteredDict_SigDig(const GenericParserCxt& source, const FieldTable* digits,
+                                       bool round) {
+  if (digits == nullptr || !round) {
+    return CreateDictFromCxt(source, digits);
+  }
+  PropertyDict filtered;
+  filtered.reserve(std::min(source.size(), digits->size()));
+  source.forEach([&](const GenericParserCxt::Field& field) {
+    if (const FieldRange* range = digits->find(field.name, field.hash())) {
+      filtered.set(field.key(), roundSig(field.value, range->digits));
+    }
+  });
   return filtered;
 }
 

@@ -2,6 +2,7 @@
 
 #include <cstdint>
 
+#include "NANDInfo/parsers/GenericParserCxt.h"
 #include "NANDInfo/tables/FieldTable.h"
 #include "common/PropertyDict.h"
 
@@ -18,6 +19,9 @@ PropertyDict CreateFilteredDict(const PropertyDict& source, const FieldTable* ke
 /// The same; with `round`, numbers are read as unsigned 64-bit integers and keep the digits that
 /// the table gives.
 PropertyDict CreateFilteredDict_SigDig(const PropertyDict& source, const FieldTable* digits,
+                                       bool round);
+/// The same of the fields that a parser gave, without a dictionary of all of them in between.
+PropertyDict CreateFilteredDict_SigDig(const GenericParserCxt& source, const FieldTable* digits,
                                        bool round);
 
 }  // namespace vesprun

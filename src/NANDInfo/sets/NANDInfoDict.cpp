@@ -110,15 +110,15 @@ PropertyDict CreateNANDInfoDict(const ORUStatsContext& context, bool omitVersion
   }
 
   DerivedFigures figures;
-  for (const GenericParserCxt::Field field : context.fields) {
+  context.fields.forEach([&](const GenericParserCxt::Field& field) {
     if (takeUp(field, figures)) {
-      continue;
+      return;
     }
     if (const auto key = legacyKeyOf(field.name)) {
       info.set(*key, isRounded(field.name) ? roundSig(static_cast<std::uint32_t>(field.value), 3)
                                            : field.value);
     }
-  }
+  });
   if (figures.userPartitionStart != DerivedFigures::kNotSeen &&
       figures.intermediatePartitionStart != DerivedFigures::kNotSeen) {
     info.set("com.quill.NANDInfo.IntermediatePartitionSize",

@@ -10,30 +10,21 @@
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/GenericParserCxt.h"
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
+#include "NANDInfo/sets/FilteredDict.h"
 
 namespace vesprun {
 namespace {
 
-/// Closes what `findNandExporterNew` opened.
-class OpenExporter {
- public:
-  OpenExporter() = default;
-  OpenExporter(const OpenExporter&) = delete;
-  OpenExporter& operator=(const OpenExporter&) = delete;
-  ~OpenExporter() {
-    if (_exporter != nullptr) {
-      ReleaseIOInterfaces(*_exporter);
-    }
-  }
-
-  /// False when no controller opens.
-  bool open() { return findNandExporterNew(_exporter); }
-  const nand_exporter_t* operator->() const { return _exporter; }
-  const nand_exporter_t& operator*() const { return *_exporter; }
-
- private:
-  nand_exporter_t* _exporter = nullptr;
+struct ReleaseInterfaces {
+  void operator()(nand_exporter_t* exporter) const { ReleaseIOInterfaces(*exporter); }
 };
+
+/// The controller that `findNandExporterNew` opens, until the pointer goes; null when none opens.
+std::unique_ptr<nand_exporter_t, ReleaseInterfaces> openExporter() {
+  nand_exporter_t* exporter = nullptr;
+  const bool isOpen = findNandExporterNew(exporter);
+  return std::unique_ptr<nand_exporter_t, ReleaseInterfaces>(isOpen ? exporter : nullptr);
+}
 
 struct Answer {
   TunnelBuffer buffer;
@@ -66,55 +57,65 @@ std::uint32_t countMSPs(const nand_exporter_t& exporter) {
 
 }  // namespace
 
-std::optional<PropertyDict> gatherORUFTLData(bool useStatKeyParser, bool useStatsSelector,
-                                             std::uint32_t argument) {
-  OpenExporter exporter;
-  if (!exporter.open()) {
+bool gatherFTLFields(bool useStatKeyParser, bool useStatsSelector, std::uint32_t argument,
+                     const std::function<void(const FTLFields&)>& take) {
+  const auto exporter = openExporter();
+  if (!exporter) {
     SetAPIErrorMessage("gatherORUFTLData: Could not get nand_exporter_t");
-    return std::nullopt;
+    return false;
   }
   if (exporter->connection == 0) {
     SetAPIErrorMessage("gatherORUFTLData: No io_connection exist");
-    return std::nullopt;
+    return false;
   }
   const nand_exporter_t::SelectorGetter getSelector =
       useStatsSelector ? exporter->getStatsSelectors : exporter->getReadStatsSelectors;
   if (getSelector == nullptr) {
     SetAPIErrorMessage("gatherORUFTLData: No %s exist",
                        useStatsSelector ? "getStatsSelectors" : "getReadStatsSelectors");
-    return std::nullopt;
+    return false;
   }
   Answer answer;
   if (!fetch(exporter->connection, *exporter, getSelector, useStatsSelector ? 0 : argument,
              answer)) {
-    return std::nullopt;
+    return false;
   }
   const std::unique_ptr<GenericParserCxt> context(new (std::nothrow) GenericParserCxt());
   if (!context) {
     SetAPIErrorMessage("gatherORUFTLData: Could not allocate memory for pcxt.ftlData");
-    return std::nullopt;
+    return false;
   }
   const auto parse = useStatKeyParser ? exporter->parseFTLStatKey : exporter->parseFTL;
   if (parse(*context, answer.bytes()) == 0) {
     SetAPIErrorMessage("gatherORUFTLData: parseFTL failed");
-    return std::nullopt;
+    return false;
   }
-  PropertyDict fields = CreateDictFromCxt(*context);
+  bool hasMagazine = false;
+  context->forEach([&hasMagazine](const GenericParserCxt::Field& field) {
+    hasMagazine = hasMagazine || field.name == "magazineFWVersion_1";
+  });
+  take({*context, std::strcmp(exporter->name, "ORUStorage") == 0, hasMagazine});
   exporter->releaseGenericCxt(*context);
-
-  const bool isQNS1 = std::strcmp(exporter->name, "ORUStorage") == 0;
-  fields.set("com.quill.NANDInfo.IsQNS1Controller", std::int32_t{isQNS1});
-  const bool hasMagazine = fields.contains("magazineFWVersion_1");
-  fields.set(kIsStatMagSupportedKey, std::int32_t{hasMagazine});
   if (!hasMagazine) {
     SetAPIErrorMessage("Stat Magazine not supported");
   }
-  return fields;
+  return true;
 }
 
-std::optional<PropertyDict> gatherORUMSPData() {
-  OpenExporter exporter;
-  if (!exporter.open()) {
+std::optional<PropertyDict> gatherORUFTLData(bool useStatKeyParser, bool useStatsSelector,
+                                             std::uint32_t argument) {
+  std::optional<PropertyDict> dict;
+  gatherFTLFields(useStatKeyParser, useStatsSelector, argument, [&dict](const FTLFields& ftl) {
+    dict = CreateDictFromCxt(ftl.fields);
+    dict->set("com.quill.NANDInfo.IsQNS1Controller", std::int32_t{ftl.isQNS1Controller});
+    dict->set(kIsStatMagSupportedKey, std::int32_t{ftl.isStatMagSupported});
+  });
+  return dict;
+}
+
+std::optional<PropertyDict> gatherORUMSPData(const FieldTable* digits, bool round) {
+  const auto exporter = openExporter();
+  if (!exporter) {
     SetAPIErrorMessage("gatherORUMSPData: Could not get nand_exporter_t");
     return std::nullopt;
   }
@@ -147,7 +148,8 @@ std::optional<PropertyDict> gatherORUMSPData() {
       SetAPIErrorMessage("gatherORUMSPData: parseMSP failed !");
       break;
     }
-    fieldsByIndex.set(std::to_string(index), CreateDictFromCxt(contexts[index]));
+    fieldsByIndex.set(std::to_string(index),
+                      CreateFilteredDict_SigDig(contexts[index], digits, round));
     exporter->releaseGenericCxt(contexts[index]);
   }
   return fieldsByIndex;

@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <optional>
 #include <string>
-#include <string_view>
 
 #include "NANDInfo/VMFreezer.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
@@ -87,7 +86,21 @@ void addFieldsOfFTL(const PropertyDict& ftl, PropertyDict& fields) {
   }
 }
 
+constexpr unsigned kBootBlocks = 32;
+
+constexpr auto kSources = std::to_array<FieldRange>({
+    // clang-format off
+    "userPartitionStart", "intermediatePartitionStart", "utilFormatTime", "averageSLCPECycles",
+    "averageTLCPECycles", "hostWrites", "powerOnHours", "powerOnSeconds",
+    {"numBootBlockRefreshSuccess_", 0, kMSPs - 1}, {"numBootBlockRefreshFail_", 0, kMSPs - 1},
+    "mspBootBlockCountPerMsp", {"mspBootBlockReadFails_", 0, kBootBlocks - 1},
+    {"mspBootBlockProgFails_", 0, kBootBlocks - 1}, {"mspBootBlockEraseFails_", 0, kBootBlocks - 1},
+    // clang-format on
+});
+
 }  // namespace
+
+constinit const FieldTable kSourcesOfOtherData = fieldTable<kSources, 121>();
 
 void copyField(const PropertyDict& from, std::string_view name, PropertyDict& to,
                std::string_view newName) {
@@ -111,12 +124,12 @@ std::uint64_t weeksSince2000(std::uint64_t secondsSince1970) {
 
 PropertyDict getReclaimerInfo() {
   PropertyDict info;
-  Reclaimer& reclaimer = platform().reclaimer();
-  if (!reclaimer.isAvailable()) {
+  DeviceInformation& device = platform().deviceInformation();
+  if (!device.reclaimerIsAvailable()) {
     return info;
   }
   const std::optional<PropertyDict> answer =
-      reclaimer.ReclaimerCopyItemizedPurgeableSpaceWithInfo({{"RECLAIMER_VOLUME", "/private/var"}});
+      device.ReclaimerCopyItemizedPurgeableSpaceWithInfo({{"RECLAIMER_VOLUME", "/private/var"}});
   if (!answer) {
     SetAPIErrorMessage(
         "getReclaimerInfo: unable to get output from ReclaimerCopyItemizedPurgeableSpaceWithInfo");
@@ -144,12 +157,14 @@ PropertyDict gatherORUFTLOtherData(const PropertyDict* ftl) {
 
 PropertyDict gatherORUOtherData() {
   PropertyDict selected;
-  const std::optional<PropertyDict> ftl = gatherORUFTLData(false, true, 0);
-  if (!ftl) {
+  PropertyDict sources;
+  if (!gatherFTLFields(false, true, 0, [&sources](const FTLFields& ftl) {
+        sources = CreateDictFromCxt(ftl.fields, &kSourcesOfOtherData);
+      })) {
     SetAPIErrorMessage("gatherORUOtherData: Unable to get FTL counters");
     return selected;
   }
-  const PropertyDict derived = gatherORUFTLOtherData(&*ftl);
+  const PropertyDict derived = gatherORUFTLOtherData(&sources);
   FTLStats4MSPStats.forEach(
       [&](std::string_view name, const FieldRange&) { copyField(derived, name, selected, name); });
   return selected;

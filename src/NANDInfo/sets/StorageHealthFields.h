@@ -3,6 +3,7 @@
 #include <cstdint>
 #include <string_view>
 
+#include "NANDInfo/tables/FieldTable.h"
 #include "common/PropertyDict.h"
 
 namespace vesprun {
@@ -24,18 +25,16 @@ std::uint64_t weeksSince2000(std::uint64_t secondsSince1970);
 /// purgeable space gives them.
 PropertyDict getReclaimerInfo();
 
-/// The fields derived from the device and, if there are any, from FTL fields, in this order:
-///
-/// - the purgeable space (`getReclaimerInfo`), the VM freezer figure (`CopyVMFreezerNANDInfo`) and
-///   the disk figures (`GetDiskInfo`);
-/// - "HLT_storeDemoMode", a 32-bit number, 1 or 0;
-/// - unsigned 64-bit numbers, each if its source is there: "HLT_intermediatePartitionSize" in bands
-///   (wraps when negative), "HLT_formatWeeksSince2000", copies of the average P/E cycles, host
-///   writes and power-on hours and seconds, "HLT_numBootBlockRefreshes_max" (always), and six sums
-///   of boot-block failures, formed in 64 bits and wrapped when negative.
+/// In this order: the purgeable space, the VM freezer figure and the disk figures;
+/// "HLT_storeDemoMode", a 32-bit number; and, each if its source is there, unsigned 64-bit numbers
+/// made of FTL fields: partition size in bands, format time in weeks, copies, the most boot-block
+/// refreshes (always) and six sums of boot-block failures. Differences and sums wrap when negative.
 ///
 /// Without FTL fields (null) an error is recorded, and only the device's fields are there.
 PropertyDict gatherORUFTLOtherData(const PropertyDict* ftl);
+
+/// The FTL fields that these fields come from.
+extern const FieldTable kSourcesOfOtherData;
 
 /// The derived fields of other sets than the FTL's: those of `FTLStats4MSPStats` that are there, in
 /// its order, from the FTL fields of now. Empty, with the error recorded, without these.

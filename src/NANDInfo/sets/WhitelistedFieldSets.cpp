@@ -48,14 +48,16 @@ constexpr std::uint32_t fourCharacterCode(const char (&text)[5]) {
   return code;
 }
 
-void addFirmwareVersionParts(const PropertyDict& msp, PropertyDict& set) {
-  const Number* version = msp.findNumber(kFirmwareVersionKey);
-  if (version == nullptr) {
+/// The version keeps all of its digits when the set is rounded.
+void addFirmwareVersionParts(PropertyDict& set) {
+  const Number* number = set.findNumber(kFirmwareVersionKey);
+  if (number == nullptr) {
     return;
   }
+  const std::uint64_t version = number->asUInt64();
   for (unsigned part = 0; part < 4; ++part) {
     set.set(std::string(kFirmwareVersionKey) + '_' + std::to_string(part),
-            version->asUInt64() >> (16 * part) & 0xFFFF);
+            version >> (16 * part) & 0xFFFF);
   }
 }
 
@@ -80,10 +82,13 @@ std::optional<PropertyDict> CopyNANDFTLInfo(bool useStatKeyParser, std::uint32_t
 
 PropertyDict CopyWhitelistedNANDFTLInfo(bool round) noexcept {
   return runEntryPoint(__func__, [&] {
-    PropertyDict set;
-    if (std::optional<PropertyDict> fields = gatherORUFTLData(false, true, 0)) {
-      fields->merge(gatherORUFTLOtherData(&*fields));
-      set = CreateFilteredDict_SigDig(*fields, &WhitelistedRawNANDFTLCounters_SigDigDict, round);
+    const FieldTable* const digits = &WhitelistedRawNANDFTLCounters_SigDigDict;
+    PropertyDict set, sources;
+    if (gatherFTLFields(false, true, 0, [&](const FTLFields& ftl) {
+          set = CreateFilteredDict_SigDig(ftl.fields, digits, round);
+          sources = CreateDictFromCxt(ftl.fields, &kSourcesOfOtherData);
+        })) {
+      set.merge(CreateFilteredDict_SigDig(gatherORUFTLOtherData(&sources), digits, round));
     } else {
       SetAPIErrorMessage("CopyWhitelistedNANDFTLInfo: Unable to gather other FTL fields");
     }
@@ -97,14 +102,13 @@ std::optional<PropertyDict> CopyWhitelistedNANDFTLCountersInfo() noexcept { retu
 PropertyDict CopyWhitelistedNANDMSPInfo(bool round) noexcept {
   return runEntryPoint(__func__, [&] {
     PropertyDict sets;
-    if (const std::optional<PropertyDict> fieldsByIndex = gatherORUMSPData()) {
+    if (const std::optional<PropertyDict> fieldsByIndex =
+            gatherORUMSPData(&WhitelistedRawNANDMSPCounters_SigDigDict, round)) {
       const PropertyDict derived = gatherORUOtherData();
       for (const auto& [index, fields] : *fieldsByIndex) {
-        const PropertyDict& msp = *fields.dict();
-        PropertyDict set =
-            CreateFilteredDict_SigDig(msp, &WhitelistedRawNANDMSPCounters_SigDigDict, round);
+        PropertyDict set = *fields.dict();
         set.merge(derived);
-        addFirmwareVersionParts(msp, set);
+        addFirmwareVersionParts(set);
         sets.set(index, std::move(set));
       }
     } else {

@@ -1,11 +1,9 @@
 #pragma once
 
 #include <array>
-#include <charconv>
 #include <cstddef>
 #include <cstdint>
 #include <limits>
-#include <string>
 #include <string_view>
 
 namespace vesprun {
@@ -37,14 +35,35 @@ constexpr FieldName splitFieldName(std::string_view name) {
   return {name.substr(0, stemLength), number};
 }
 
-/// Puts the parts together.
-inline void assignFieldName(std::string& name, std::string_view stem, std::uint32_t number) {
-  name = stem;
-  if (number != FieldName::kNoNumber) {
-    std::array<char, 10> digits;
-    const auto [end, error] = std::to_chars(digits.data(), digits.data() + digits.size(), number);
-    name.append(digits.data(), end);
+/// A name in the making, also at compile time.
+class NameText {
+ public:
+  constexpr NameText& append(std::string_view text) {
+    for (const char character : text) {
+      _text.at(_size++) = character;
+    }
+    return *this;
   }
-}
+  /// Nothing for `FieldName::kNoNumber`.
+  constexpr NameText& append(std::uint32_t number) {
+    if (number != FieldName::kNoNumber) {
+      std::uint32_t power = 1;
+      while (number / power >= 10) {
+        power *= 10;
+      }
+      for (; power != 0; power /= 10) {
+        _text.at(_size++) = static_cast<char>('0' + number / power % 10);
+      }
+    }
+    return *this;
+  }
+  constexpr operator std::string_view() const { return {_text.data(), _size}; }
+
+ private:
+  static constexpr std::size_t kLongest = 128;
+
+  std::array<char, kLongest> _text{};
+  std::size_t _size = 0;
+};
 
 }  // namespace vesprun

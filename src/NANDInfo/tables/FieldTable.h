@@ -5,7 +5,6 @@
 #include <cstddef>
 #include <cstdint>
 #include <span>
-#include <string>
 #include <string_view>
 
 #include "NANDInfo/tables/FieldName.h"
@@ -35,36 +34,57 @@ struct FieldRange {
   }
 
   constexpr std::size_t size() const { return std::size_t{last - first} + 1; }
-  constexpr bool contains(std::uint32_t number) const { return first <= number && number <= last; }
+  constexpr bool contains(std::string_view name) const {
+    const FieldName parts = splitFieldName(name);
+    return parts.stem == stem && first <= parts.number && parts.number <= last;
+  }
+  /// Calls `visit(name)` for each name. It lives as long as the call.
+  template <typename Visit>
+  constexpr void forEach(Visit&& visit) const {
+    for (std::size_t i = 0; i < size(); ++i) {
+      visit(
+          std::string_view(NameText().append(stem).append(first + static_cast<std::uint32_t>(i))));
+    }
+  }
 
  private:
   consteval FieldRange(std::uint8_t digitCount, FieldName name)
       : stem(name.stem), first(name.number), last(name.number), digits(digitCount) {}
 };
 
-/// A compile-time hash index over the stems of a table's ranges; ranges of one stem are chained in
-/// table order. A duplicate name does not compile.
-template <std::size_t RangeCount>
-struct FieldIndex {
-  // Positions of ranges, counted from 1; 0: none.
-  std::array<std::uint16_t, std::bit_ceil(2 * RangeCount)> slots{};
-  std::array<std::uint16_t, RangeCount> nextOfStem{};
-  std::size_t fieldCount = 0;
+/// The number of names that the ranges hold.
+template <std::size_t kRangeCount>
+constexpr std::size_t countNames(const std::array<FieldRange, kRangeCount>& ranges) {
+  std::size_t names = 0;
+  for (const FieldRange& range : ranges) {
+    names += range.size();
+  }
+  return names;
+}
 
-  explicit consteval FieldIndex(const std::array<FieldRange, RangeCount>& ranges) {
-    for (std::size_t i = 0; i < RangeCount; ++i) {
-      fieldCount += ranges[i].size();
-      std::uint16_t* link = &slots[hashOfText(ranges[i].stem) % slots.size()];
-      while (*link != 0 && ranges[*link - 1].stem != ranges[i].stem) {
-        link = link == &slots.back() ? &slots.front() : link + 1;
-      }
-      for (; *link != 0; link = &nextOfStem[*link - 1U]) {
-        const FieldRange& earlier = ranges[*link - 1];
-        if (earlier.first <= ranges[i].last && ranges[i].first <= earlier.last) {
-          throw "a name is in the table twice";
+/// A name's place in the hash index of a table.
+struct FieldSlot {
+  std::uint16_t hash = 0;   ///< upper half of the name's hash, so that few others are compared
+  std::uint16_t range = 0;  ///< counted from 1; 0: the slot is free
+};
+
+/// A compile-time hash index over the names of `kRanges`. A duplicate name does not compile.
+template <const auto& kRanges>
+struct FieldIndex {
+  std::array<FieldSlot, std::bit_ceil(2 * countNames(kRanges))> slots{};
+
+  consteval FieldIndex() {
+    for (std::size_t i = 0; i < kRanges.size(); ++i) {
+      kRanges[i].forEach([&](std::string_view name) {
+        const std::uint32_t hash = hashOfText(name);
+        std::size_t slot = hash % slots.size();
+        for (; slots[slot].range != 0; slot = (slot + 1) % slots.size()) {
+          if (slots[slot].hash == hash >> 16 && kRanges[slots[slot].range - 1U].contains(name)) {
+            throw "a name is in the table twice";
+          }
         }
-      }
-      *link = static_cast<std::uint16_t>(i + 1);
+        slots[slot] = {static_cast<std::uint16_t>(hash >> 16), static_cast<std::uint16_t>(i + 1)};
+      });
     }
   }
 };
@@ -73,19 +93,24 @@ struct FieldIndex {
 /// built at start.
 class FieldTable {
  public:
-  template <std::size_t RangeCount>
-  constexpr FieldTable(const std::array<FieldRange, RangeCount>& ranges,
-                       const FieldIndex<RangeCount>& index)
-      : _ranges(ranges),
-        _slots(index.slots),
-        _nextOfStem(index.nextOfStem),
-        _fieldCount(index.fieldCount) {}
+  template <const auto& kRanges>
+  constexpr explicit FieldTable(const FieldIndex<kRanges>& index)
+      : _ranges(kRanges), _slots(index.slots), _size(countNames(kRanges)) {}
 
-  constexpr std::size_t size() const { return _fieldCount; }
+  constexpr std::size_t size() const { return _size; }
 
   /// The range of `name`, or null, in constant time and without memory.
-  const FieldRange* find(std::string_view name) const { return find(splitFieldName(name)); }
-  const FieldRange* find(const FieldName& name) const;
+  const FieldRange* find(std::string_view name) const { return find(name, hashOfText(name)); }
+  /// The same, with the name's hash.
+  const FieldRange* find(std::string_view name, std::uint32_t hash) const {
+    const std::size_t mask = _slots.size() - 1;
+    for (std::size_t slot = hash & mask; _slots[slot].range != 0; slot = (slot + 1) & mask) {
+      if (_slots[slot].hash == hash >> 16 && _ranges[_slots[slot].range - 1U].contains(name)) {
+        return &_ranges[_slots[slot].range - 1U];
+      }
+    }
+    return nullptr;
+  }
   bool contains(std::string_view name) const { return find(name) != nullptr; }
 
   std::span<const FieldRange> ranges() const { return _ranges; }
@@ -93,44 +118,25 @@ class FieldTable {
   /// Calls `visit(name, range)` for each name in table order. The name lives as long as the call.
   template <typename Visit>
   void forEach(Visit&& visit) const {
-    std::string name;
     for (const FieldRange& range : _ranges) {
-      for (std::size_t i = 0; i < range.size(); ++i) {
-        assignFieldName(name, range.stem, range.first + static_cast<std::uint32_t>(i));
-        visit(std::string_view(name), range);
-      }
+      range.forEach([&](std::string_view name) { visit(name, range); });
     }
   }
 
  private:
   std::span<const FieldRange> _ranges;
-  std::span<const std::uint16_t> _slots;
-  std::span<const std::uint16_t> _nextOfStem;
-  std::size_t _fieldCount;
+  std::span<const FieldSlot> _slots;
+  std::size_t _size;
 };
 
-inline const FieldRange* FieldTable::find(const FieldName& name) const {
-  const std::size_t mask = _slots.size() - 1;
-  std::size_t slot = hashOfText(name.stem) & mask;
-  while (_slots[slot] != 0 && _ranges[_slots[slot] - 1U].stem != name.stem) {
-    slot = (slot + 1) & mask;
-  }
-  for (std::size_t range = _slots[slot]; range != 0; range = _nextOfStem[range - 1]) {
-    if (_ranges[range - 1].contains(name.number)) {
-      return &_ranges[range - 1];
-    }
-  }
-  return nullptr;
-}
-
 template <const auto& kRanges>
-inline constexpr FieldIndex<kRanges.size()> kFieldIndexOf(kRanges);
+inline constexpr FieldIndex<kRanges> kFieldIndexOf;
 
 /// The table of ranges that hold `kFieldCount` names.
 template <const auto& kRanges, std::size_t kFieldCount>
 constexpr FieldTable fieldTable() {
-  static_assert(kFieldIndexOf<kRanges>.fieldCount == kFieldCount);
-  return FieldTable(kRanges, kFieldIndexOf<kRanges>);
+  static_assert(countNames(kRanges) == kFieldCount);
+  return FieldTable(kFieldIndexOf<kRanges>);
 }
 
 }  // namespace vesprun

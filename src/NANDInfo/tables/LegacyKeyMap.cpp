@@ -140,16 +140,17 @@ static_assert(std::ranges::all_of(kLegacyFields, [](const FieldRange& fields) {
 constinit const FieldTable keyMap = fieldTable<kLegacyFields, 709>();
 
 std::optional<std::string> legacyKeyOf(std::string_view field) {
-  const FieldName name = splitFieldName(field);
-  const FieldRange* fields = keyMap.find(name);
+  const FieldRange* fields = keyMap.find(field);
   if (fields == nullptr) {
     return std::nullopt;
   }
   const FieldRange& suffixes =
       kRows[static_cast<std::size_t>(fields - kLegacyFields.data())].suffixes;
-  std::string suffix;
-  assignFieldName(suffix, suffixes.stem, suffixes.first + (name.number - fields->first));
-  return "com.quill.NANDInfo." + suffix;
+  const std::uint32_t place = splitFieldName(field).number - fields->first;
+  return std::string(NameText()
+                         .append("com.quill.NANDInfo.")
+                         .append(suffixes.stem)
+                         .append(suffixes.first + place));
 }
 
 }  // namespace vesprun

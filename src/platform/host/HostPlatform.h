@@ -19,12 +19,11 @@ class HostPlatform : public Platform {
   /// Reads the device's description. Null, with the place in `error`, when the folder or its
   /// `device.json` cannot be used. A described time zone is set for the whole process, in TZ, until
   /// the platform is destroyed.
-  static std::unique_ptr<HostPlatform> open(const std::string& path, std::string& error);
-
-  /// The same without changing anything on the device, which need not be writable: changes of
-  /// preferences hold for this platform alone, and `log`, which outlives it, is the system log.
-  static std::unique_ptr<HostPlatform> openReadOnly(const std::string& path, SystemLog& log,
-                                                    std::string& error);
+  ///
+  /// With `readOnlyLog`, the system log, which outlives the platform, nothing on the device is
+  /// changed, and it need not be writable: changes of preferences hold for this platform alone.
+  static std::unique_ptr<HostPlatform> open(const std::string& path, std::string& error,
+                                            SystemLog* readOnlyLog = nullptr);
 
   ~HostPlatform();
 
@@ -40,10 +39,6 @@ class HostPlatform : public Platform {
   struct Services;
 
   explicit HostPlatform(std::unique_ptr<Services> services);
-
-  /// Read-only with a `log`.
-  static std::unique_ptr<HostPlatform> open(const std::string& path, SystemLog* log,
-                                            std::string& error);
 
   std::unique_ptr<Services> _services;
 };

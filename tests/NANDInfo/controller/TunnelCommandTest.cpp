@@ -1,9 +1,7 @@
 #include "NANDInfo/controller/TunnelCommand.h"
-#include "common/ProcessState.h"
-
-#include <cstring>
 
 #include "NANDInfo/parsers/APIErrorMessage.h"
+#include "common/ProcessState.h"
 #include "support/ControllerTest.h"
 #include "support/WatchedRegistry.h"
 
@@ -37,9 +35,7 @@ TEST_F(TunnelCommandTest, RequestIsExactToTheByte) {
     EXPECT_EQ(length, content.size());
     EXPECT_EQ(std::string(buffer.bytes().begin(), buffer.bytes().end()), content);
 
-    std::array<std::uint8_t, 8> address{};
-    const TunnelBuffer* variable = &buffer;
-    std::memcpy(address.data(), &variable, sizeof variable);
+    const auto address = std::bit_cast<std::array<std::uint8_t, 8>>(&buffer);
     std::size_t calls = 0;
     for (const WatchedRegistry::Call& call : watched.calls()) {
       if (call.operation == "struct") {

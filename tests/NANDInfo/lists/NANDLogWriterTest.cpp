@@ -77,11 +77,12 @@ TEST_F(NANDLogWriter, WritesOnceInSevenDays) {
   std::size_t logs = 0;
   const PropertyDict fields{{"text", "not written"}};
   for (const auto& [last, writes] : cases) {
-    platform().userDefaults().setValueForKey(last, kDateKey);
+    platform().preferences().LGSPreferencesSetValue(kDateKey, last, "vesprun");
     NLW_WriteLog("165", &fields);
     logs += writes ? 1U : 0U;
     EXPECT_EQ(device.names("outbox/logs").size(), logs);
-    EXPECT_EQ(platform().userDefaults().valueForKey(kDateKey), writes ? now : last);
+    EXPECT_EQ(platform().preferences().LGSPreferencesGetValue(kDateKey, "vesprun"),
+              writes ? now : last);
   }
   EXPECT_EQ(items(), "\n");
   EXPECT_THAT(device.log(),
@@ -94,7 +95,8 @@ TEST(NANDLogSubmission, KeepsTheDateWhenItFails) {
   const PropertyDict fields{{"n", 1}};
   NLW_WriteLog("165", &fields);
   EXPECT_FALSE(device.exists("outbox/logs"));
-  EXPECT_EQ(platform().userDefaults().valueForKey(kDateKey), platform().clock().now());
+  EXPECT_EQ(platform().preferences().LGSPreferencesGetValue(kDateKey, "vesprun"),
+            platform().clock().now());
   EXPECT_EQ(GetFaultlineKey(), "error");
 }
 
@@ -122,7 +124,7 @@ TEST_F(NANDLogWriter, SortsTheValidityListByListNumber) {
     EXPECT_EQ(errors, "data cannot be parsed");
   }
   EXPECT_EQ(log(), "");
-  EXPECT_EQ(platform().userDefaults().valueForKey(kDateKey), std::nullopt);
+  EXPECT_EQ(platform().preferences().LGSPreferencesGetValue(kDateKey, "vesprun"), std::nullopt);
   EXPECT_TRUE(handle(list, errors));
   EXPECT_EQ(items(),
             "IntermediateWamp:1.25;UserWamp:2.50;ValidityList[0]:20;ValidityList[2]:10,30;"

@@ -169,13 +169,5 @@ TEST_F(StructuredLog, FetchesOnlyWhatTheControllerOffers) {
   exporter = complete;
 }
 
-TEST_F(StructuredLog, ACustomControllerHasItsCharacteristicsElsewhere) {
-  for (const bool elsewhere : {false, true}) {
-    start(std::string(R"({"class": "ORUStorage", "userClient": {}, "properties": {")") +
-          (elsewhere ? "DevRegPropertyMatch" : "Controller Characteristics") + "\": {}}}");
-    EXPECT_EQ(dump().find("failed to create dictionary") == std::string::npos, elsewhere);
-  }
-}
-
 }  // namespace
 }  // namespace vesprun

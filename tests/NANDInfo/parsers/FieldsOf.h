@@ -13,9 +13,9 @@ using Fields = std::vector<std::pair<std::string, std::uint64_t>>;
 
 inline Fields fieldsOf(const GenericParserCxt& ctx) {
   Fields fields;
-  for (const GenericParserCxt::Field field : ctx) {
+  ctx.forEach([&fields](const GenericParserCxt::Field& field) {
     fields.emplace_back(field.name, field.value);
-  }
+  });
   return fields;
 }
 

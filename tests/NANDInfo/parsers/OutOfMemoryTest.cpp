@@ -2,7 +2,7 @@
 #include <cstdint>
 
 #include "FieldsOf.h"
-#include "NANDInfo/lists/TelemetryList.h"
+#include "NANDInfo/lists/ControllerLists.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/KernelSnapshot.h"
 #include "NANDInfo/parsers/ORUFTLParseBufferToCxt.h"
@@ -36,7 +36,7 @@ TEST(OutOfMemory, LeavesFieldsOutOfTheBaseStatistics) {
   const std::size_t kept = ctx.fields.size();
   EXPECT_GT(kept, 10U);
   EXPECT_LT(kept, 160U);
-  EXPECT_EQ(ctx.fields[kept - 1].name, "qosPerCmdQ" + std::to_string(kept - 1));
+  EXPECT_EQ(fieldsOf(ctx.fields).back().first, "qosPerCmdQ" + std::to_string(kept - 1));
   EXPECT_EQ(ctx.hostWrites, 5U);
   EXPECT_TRUE(AddSingleValueToGenericContext(ctx.fields, "a", "b", 1));
   EXPECT_EQ(fieldsOf(ctx.fields).back(), Fields::value_type("ab", 1));

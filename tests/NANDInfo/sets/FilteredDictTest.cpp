@@ -27,8 +27,7 @@ TEST(RoundSig, RoundsHalfUpOnTheDigitThatIsCutOff) {
 }
 
 constexpr auto kListedRanges = std::to_array<FieldRange>({{2, "a"}, {1, "b"}, {3, "bin", 9, 11}});
-constexpr FieldIndex kListedIndex(kListedRanges);
-constexpr FieldTable kListed(kListedRanges, kListedIndex);
+constexpr FieldTable kListed = fieldTable<kListedRanges, 5>();
 
 std::vector<std::string> keysOf(const PropertyDict& dict) {
   std::vector<std::string> keys;
@@ -49,6 +48,18 @@ TEST(FilteredDict, KeepsListedEntriesInTheOrderOfTheSource) {
 
   EXPECT_EQ(CreateFilteredDict(source, nullptr), source);
   EXPECT_EQ(CreateFilteredDict_SigDig(source, nullptr, true), source);
+
+  GenericParserCxt fields;
+  for (const char* name : {"bin10", "c", "a", "bin12", "bin9", "a"}) {
+    fields.append(name, 12345);
+  }
+  for (const bool round : {false, true}) {
+    const PropertyDict dict = CreateDictFromCxt(fields);
+    for (const FieldTable* table : {&kListed, static_cast<const FieldTable*>(nullptr)}) {
+      EXPECT_EQ(CreateFilteredDict_SigDig(fields, table, round),
+                CreateFilteredDict_SigDig(dict, table, round));
+    }
+  }
 }
 
 TEST(FilteredDict, RoundsNumbersOfEveryKindAndNothingElse) {

@@ -1,6 +1,7 @@
 #include "NANDInfo/sets/StorageHealthFields.h"
 
 #include "NANDInfo/StatisticsDevice.h"
+#include "NANDInfo/sets/FilteredDict.h"
 #include "buffers/DeviceBuffers.h"
 #include "vesprun.hpp"
 
@@ -114,7 +115,8 @@ TEST_F(StorageHealthFieldsTest, FieldsOfTheFTL) {
   };
   start("", kVolume);
   for (const auto& [ftl, expected] : cases) {
-    EXPECT_EQ(jsonText(gatherORUFTLOtherData(&ftl)),
+    const PropertyDict sources = CreateFilteredDict(ftl, &kSourcesOfOtherData);
+    EXPECT_EQ(jsonText(gatherORUFTLOtherData(&sources)),
               '{' + kDisk + R"("HLT_storeDemoMode":0,)" + expected);
   }
 }

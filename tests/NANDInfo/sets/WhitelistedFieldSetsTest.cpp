@@ -9,22 +9,6 @@ using Statistics = StatisticsBufferBuilder;
 
 class WhitelistedFieldSetsTest : public StatisticsDevice {};
 
-TEST_F(WhitelistedFieldSetsTest, FTLFieldsAreCutAndRounded) {
-  answer(13, 0, Statistics().add(4, {1'234'567'890}).add(23, {1254}).add(53, {17}).bytes());
-  startController();
-  const auto expected = [](const std::string& writes, const char* fails, const char* capacity) {
-    return R"({"hostWrites":)" + writes + R"(,"numEfail":)" + fails +
-           R"(,"HLT_OR_AmountDataAvailable_MB":15258,"HLT_OR_Diskfullness_BP":7500,)"
-           R"("HLT_OR_Capacity_GB":64,"HLT_Capacity_GB":64,"HLT_Diskfullness_BP":7500,)"
-           R"("HLT_UserCapacity_MB":)" +
-           capacity + R"(,"HLT_storeDemoMode":0,"HLT_hostWrites":)" + writes +
-           R"(,"HLT_numBootBlockRefreshes_max":0,)"
-           R"("HLT_APIErrorMessage":"Stat Magazine not supported"})";
-  };
-  EXPECT_EQ(jsonText(CopyWhitelistedNANDFTLInfo(false)), expected("1234567890", "1254", "61035"));
-  EXPECT_EQ(jsonText(CopyWhitelistedNANDFTLInfo(true)), expected("1234567900", "1300", "61040"));
-}
-
 TEST_F(WhitelistedFieldSetsTest, EachMSPHasTheDerivedFieldsUnrounded) {
   const Bytes msp =
       MSPBufferBuilder().add(8202, {12'345}).add(16'384, {0xFFFF'0003'0002'0001}).bytes();
@@ -43,14 +27,6 @@ TEST_F(WhitelistedFieldSetsTest, EachMSPHasTheDerivedFieldsUnrounded) {
                 R"("fw_version_identifier_2":3,"fw_version_identifier_3":65535},)"
                 R"("1":{"fw_updates":7)" +
                 derived + "}," + error);
-
-  answer(221, 0, msp);
-  startController();
-  EXPECT_EQ(jsonText(CopyWhitelistedNANDMSPInfo(false)),
-            R"({"0":{"fw_updates":12345,"fw_version_identifier":18446462611617873921,)"
-            R"("fw_version_identifier_0":1,"fw_version_identifier_1":2,)"
-            R"("fw_version_identifier_2":3,"fw_version_identifier_3":65535},)" +
-                error);
 }
 
 TEST_F(WhitelistedFieldSetsTest, StorageStatsAskForEveryImage) {

@@ -1,10 +1,8 @@
 #include "NANDInfo/tables/FieldTable.h"
 
-#include <gmock/gmock.h>
+#include <gtest/gtest.h>
 #include <set>
 
-#include "NANDInfo/parsers/ORUMSPKeyTable.h"
-#include "NANDInfo/parsers/ORUStatKeyTable.h"
 #include "NANDInfo/tables/EventFields.h"
 #include "NANDInfo/tables/FieldSets.h"
 #include "NANDInfo/tables/LegacyKeyMap.h"
@@ -12,9 +10,6 @@
 
 namespace vesprun {
 namespace {
-
-using ::testing::IsEmpty;
-using Names = std::set<std::string, std::less<>>;
 
 constexpr auto kRanges = std::to_array<FieldRange>(
     {{1, "step10"}, {2, "step", 12, 14}, {3, "step_2b"}, {4, "step"}, {5, "step", 0, 3}, {6, "7"}});
@@ -49,7 +44,7 @@ TEST(FieldTable, FindsEveryNameOfEveryTableInItsOwnRange) {
     tables.push_back(event.fields);
   }
   for (const FieldTable* table : tables) {
-    Names names;
+    std::set<std::string> names;
     table->forEach([&](std::string_view name, const FieldRange& range) {
       EXPECT_EQ(table->find(name), &range) << name;
       EXPECT_FALSE(table->contains(std::string(name) + "_")) << name;
@@ -57,41 +52,6 @@ TEST(FieldTable, FindsEveryNameOfEveryTableInItsOwnRange) {
     });
     EXPECT_EQ(names.size(), table->size());
   }
-}
-
-template <typename Key>
-void addFields(Names& names, const Key& key, const std::string& separator) {
-  for (std::uint32_t i = 0; i < key.count; ++i) {
-    names.insert(key.count == 1 ? std::string(key.name)
-                                : std::string(key.name) + separator + std::to_string(i));
-  }
-}
-
-/// The names of `table` that no decoder makes and that are no derived figures either.
-Names unknownIn(const FieldTable& table, const Names& known) {
-  Names unknown;
-  table.forEach([&](std::string_view name, const FieldRange&) {
-    if (!known.contains(name) && !name.starts_with("HLT_")) {
-      unknown.emplace(name);
-    }
-  });
-  return unknown;
-}
-
-TEST(FieldTable, NamesOnlyFieldsThatTheDecodersMake) {
-  Names base, ftl, msp;
-  for (const ORUStatKey& key : ORUStatKeyTable) {
-    addFields(base, key, "");
-    addFields(ftl, key, "_");
-  }
-  for (const ORUMSPKey& key : ORUMSPKeyTable) {
-    addFields(msp, key, "");
-  }
-  EXPECT_THAT(unknownIn(WhitelistedRawNANDFTLCounters_SigDigDict, ftl), IsEmpty());
-  EXPECT_THAT(unknownIn(WhitelistedRawNANDMSPCounters_SigDigDict, msp), IsEmpty());
-  EXPECT_THAT(unknownIn(PrivacyApprovedSMagNANDFTLCounters_Accum, ftl), IsEmpty());
-  EXPECT_THAT(unknownIn(PrivacyApprovedSMagNANDFTLCounters_Dynamic, ftl), IsEmpty());
-  EXPECT_THAT(unknownIn(keyMap, base), IsEmpty());
 }
 
 TEST(LegacyKeyMap, HasNoKeyForOtherFields) {

@@ -77,7 +77,7 @@ TEST(HostKernel, ReadsOnlyVariablesOfTheAskedWidth) {
 
 TEST(HostLanguages, MatchesTheNearestLocalization) {
   TestDevice device;
-  Languages& languages = device.platform().languages();
+  DeviceInformation& languages = device.platform().deviceInformation();
   const std::vector<std::string> available{"en", "en-US", "pt-BR", "zh-Hans", "fr"};
   using Tags = std::vector<std::string>;
   EXPECT_EQ(languages.bestLocalizations(available, {"en-GB", "fr", "en"}), (Tags{"en", "fr"}));
@@ -111,7 +111,7 @@ TEST(Outbox, NumbersLogsUpwardsAndKeepsHeadersBesideThem) {
   device.write("outbox/logs/0041-165-StorageStatus.log", "earlier");
   device.write("outbox/logs/note.txt", "not a log");
   Logsmith& logsmith = device.platform().logsmith();
-  const auto writer = [](LogFileHandle& file) { file.write("text"); };
+  const auto writer = [](const LogFileHandle& write) { write("text"); };
   const PropertyDict header{{"previous_os_version", "1"}};
   EXPECT_TRUE(logsmith.LGSWriteLogForSubmission("193", "log-aggregated", &header, writer));
   EXPECT_TRUE(logsmith.LGSWriteLogForSubmission("165", "StorageStatus", nullptr, writer));
@@ -132,8 +132,8 @@ TEST(Outbox, NumbersLogsUpwardsAndKeepsHeadersBesideThem) {
 TEST(Outbox, NumbersGoOnAfterWhateverHappenedToTheFolder) {
   TestDevice device;
   const auto nextName = [&device] {
-    const auto write = [](LogFileHandle& file) { file.write("text"); };
-    EXPECT_TRUE(platform().logsmith().LGSWriteLogForSubmission("165", "S", nullptr, write));
+    const auto writer = [](const LogFileHandle& write) { write("text"); };
+    EXPECT_TRUE(platform().logsmith().LGSWriteLogForSubmission("165", "S", nullptr, writer));
     return device.names("outbox/logs").back();
   };
   const std::filesystem::path logs = device.path("outbox/logs");
@@ -167,7 +167,7 @@ TEST(Outbox, SubmissionsAtOnceNeverShareANumber) {
       const PropertyDict header{{"n", i}};
       EXPECT_TRUE(logsmith.LGSWriteLogForSubmission(
           "193", "log-aggregated", &header,
-          [i](LogFileHandle& file) { file.write(std::to_string(i)); }));
+          [i](const LogFileHandle& write) { write(std::to_string(i)); }));
     }
   };
   std::thread other(submit);
@@ -186,7 +186,7 @@ TEST(Outbox, AFailedSubmissionLeavesWhatWasThereAndNothingElse) {
   const PropertyDict header{{"n", 1}};
   const auto submit = [&] {
     return platform().logsmith().LGSWriteLogForSubmission(
-        "165", "S", &header, [](LogFileHandle& file) { file.write(std::string(200'000, 'x')); });
+        "165", "S", &header, [](const LogFileHandle& write) { write(std::string(200'000, 'x')); });
   };
   {
     const FileSizeLimit limit(100'000);
@@ -227,7 +227,7 @@ TEST(HostServices, SayWhichFileCannotBeRead) {
 TEST(HostMurmur, OutlivesAHandlerThatThrows) {
   TestDevice device;
   std::promise<void> called;
-  const auto feed = platform().murmur().createUsageFeed(nullptr);
+  const auto feed = platform().murmur().createUsageFeed({});
   feed->usageToDateForNameKindReply({}, {}, [&](const auto*) {
     called.set_value();
     throw std::runtime_error("no room");
@@ -241,7 +241,7 @@ TEST(HostMurmur, OutlivesAHandlerThatThrows) {
 
 TEST(DiagnosticHeader, IsLiveWhenItIsNotDescribed) {
   TestDevice device;
-  DiagnosticHeader& header = device.platform().diagnosticHeader();
+  DeviceInformation& header = device.platform().deviceInformation();
   EXPECT_NE(header.GetHardwareModel(), "");
   EXPECT_NE(header.GetSystemVersion(), "");
   EXPECT_EQ(header.GetIncidentID().size(), 36U);

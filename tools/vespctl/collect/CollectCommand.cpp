@@ -36,9 +36,9 @@ void addCollectCommand(CLI::App& vespctl) {
     std::string root;
   };
   const auto arguments = std::make_shared<Arguments>();
-  CLI::App* command = vespctl.add_subcommand(
-      "collect", "Counts what the running system's figures have grown since the last time");
-  command->add_option("DIR", arguments->directory, "The device directory")->required();
+  CLI::App* command = addDeviceCommand(
+      vespctl, "collect", "Counts what the running system's figures have grown since the last time",
+      arguments->directory);
   command->add_option("--root", arguments->root,
                       "The folder that holds proc and sys, instead of /");
   command->callback([arguments] { collect(arguments->directory, arguments->root); });

@@ -55,11 +55,10 @@ std::string starterWhitelist() {
 }
 
 void writeWhitelist(const DeviceDirectory& directory, std::string_view document) {
-  std::string error;
-  const auto folder = directory.makeFolder(kWhitelistFolder, error);
-  if (!folder || !replaceFile(*folder + '/' + kWhitelistFile, document, error)) {
-    throw CommandFailure(error);
-  }
+  orFail([&](std::string& error) {
+    const auto folder = directory.makeFolder(kWhitelistFolder, error);
+    return folder && replaceFile(*folder + '/' + kWhitelistFile, document, error);
+  });
 }
 
 }  // namespace vesprun

@@ -1,16 +1,13 @@
-#include <algorithm>
 #include <cstdint>
-#include <limits>
 #include <optional>
 #include <set>
 #include <string>
 
 #include "Command.h"
-#include "days/DailyWork.h"
 #include "outbox/SubmittedLogs.h"
 #include "platform/Platform.h"
 #include "platform/host/counters/HostTallybook.h"
-#include "platform/host/device/PrunedLogs.h"
+#include "platform/host/device/LogNumbers.h"
 #include "report/LogSubmission.h"
 #include "report/ReportSources.h"
 #include "report/TBReport.h"
@@ -18,16 +15,12 @@
 namespace vesprun {
 namespace {
 
-/// The days that a daily log tells of, or did before it was removed.
+/// The days that have a daily log, or had one before it was pruned.
 std::set<std::int32_t> reportedDays(const DeviceDirectory& directory) {
   std::set<std::int32_t> days;
   nameUnreadable(
       forEachSubmittedLog(directory, [&days](SubmittedLog&& log) { days.insert(log.day); }));
-  std::string error;
-  const std::optional<PrunedLogs> pruned = readPrunedLogs(directory, error);
-  if (!pruned) {
-    throw CommandFailure(error);
-  }
+  const auto pruned = orFail([&](std::string& error) { return readPrunedLogs(directory, error); });
   for (const PrunedLog& log : *pruned) {
     days.insert(log.day);
   }
@@ -46,10 +39,7 @@ std::vector<std::int32_t> missedDays(HostTallybook& counters, std::int64_t first
       }
     }
   };
-  std::string error;
-  if (!counters.read(find, error)) {
-    throw CommandFailure(error);
-  }
+  orFail([&](std::string& error) { return counters.read(find, error); });
   return days;
 }
 
@@ -62,8 +52,7 @@ Submission submitReport(std::int32_t day) {
   if (!report.readHistory(day)) {
     return Submission::Failed;
   }
-  std::optional<PropertyDict> document =
-      report.makeDocument(day, nullptr, TBReport::SideEffects::LeftOut);
+  std::optional<PropertyDict> document = report.makeDocument(day, TBReport::SideEffects::LeftOut);
   if (!document) {
     return Submission::Empty;
   }
@@ -72,8 +61,7 @@ Submission submitReport(std::int32_t day) {
     scalars.remove(key);
   }
   document->set("TBScalars", std::move(scalars));
-  const std::optional<std::string> bytes = serializeDailyLog(*document);
-  return bytes && submitDailyLog(*bytes) ? Submission::Done : Submission::Failed;
+  return submitDailyLog(*document) ? Submission::Done : Submission::Failed;
 }
 
 void catchUp(const std::string& directory, std::uint32_t last) {
@@ -108,9 +96,10 @@ void addCatchUpCommand(CLI::App& vespctl) {
     std::uint32_t last = 7;
   };
   const auto arguments = std::make_shared<Arguments>();
-  CLI::App* command = vespctl.add_subcommand(
-      "catch-up", "Submits the reports of days that no daily log tells of, and prints the days");
-  command->add_option("DIR", arguments->directory, "The device directory")->required();
+  CLI::App* command = addDeviceCommand(
+      vespctl, "catch-up",
+      "Submits the reports of days that no daily log tells of, and prints the days",
+      arguments->directory);
   command->add_option("--last", arguments->last, "How many days, the day before yesterday the last")
       ->check(decimal<std::uint32_t>());
   command->callback([arguments] { catchUp(arguments->directory, arguments->last); });

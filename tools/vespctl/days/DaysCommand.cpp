@@ -4,13 +4,11 @@
 #include <limits>
 #include <map>
 #include <string>
-#include <vector>
 
 #include "Command.h"
 #include "Complaints.h"
 #include "common/Calendar.h"
 #include "outbox/SubmittedLogs.h"
-#include "platform/PreferenceNames.h"
 #include "platform/host/counters/HostTallybook.h"
 
 namespace vesprun {
@@ -28,7 +26,6 @@ std::string dateOf(std::int32_t day) {
 }
 
 void showDays(const std::string& directory, std::uint32_t last) {
-  std::string error;
   Complaints complaints;
   const auto device = openDeviceReadOnly(directory, complaints);
   const std::int32_t today = device->tallybook().TBDaysSince1970();
@@ -49,8 +46,8 @@ void showDays(const std::string& directory, std::uint32_t last) {
         "", first, today,
         [&](std::string_view, std::int32_t day, auto&, bool&) { ++days[day].distributions; });
   };
-  if (last != 0 && !device->counters().read(countKeys, error)) {
-    throw CommandFailure(error);
+  if (last != 0) {
+    orFail([&](std::string& error) { return device->counters().read(countKeys, error); });
   }
   for (std::int64_t day = first; day <= today; ++day) {
     Day& shown = days[static_cast<std::int32_t>(day)];
@@ -79,9 +76,9 @@ void addDaysCommand(CLI::App& vespctl) {
     std::uint32_t last = 14;
   };
   const auto arguments = std::make_shared<Arguments>();
-  CLI::App* command = vespctl.add_subcommand(
-      "days", "Prints what is kept of the last days, and which daily logs tell of them");
-  command->add_option("DIR", arguments->directory, "The device directory")->required();
+  CLI::App* command = addDeviceCommand(
+      vespctl, "days", "Prints what is kept of the last days, and which daily logs tell of them",
+      arguments->directory);
   command->add_option("--last", arguments->last, "How many days, today the last of them")
       ->check(decimal<std::uint32_t>());
   command->callback([arguments] { showDays(arguments->directory, arguments->last); });

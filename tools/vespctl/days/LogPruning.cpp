@@ -14,12 +14,10 @@
 #include "common/Calendar.h"
 #include "outbox/SubmittedLogs.h"
 #include "platform/host/device/LogNumbers.h"
-#include "platform/host/device/PrunedLogs.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/files/FileLock.h"
-#include "platform/host/files/FolderNames.h"
+#include "platform/host/files/Files.h"
 #include "platform/host/files/JsonLines.h"
-#include "platform/host/files/SystemError.h"
 
 namespace vesprun {
 namespace {
@@ -175,24 +173,19 @@ std::vector<const LogPruning::Log*> LogPruning::noteDailyLogs(const std::vector<
     }
   }
   JsonLines notes(_directory.hostPath(kPrunedLogsFile));
-  std::string error;
   bool isFlushed = true;
   for (const Log* const log : due) {
     const SubmittedLog& noted = daily[log->files.front()];
     if (!noted.isNoted) {
       isFlushed = false;
-      if (!notes.append(jsonText(PropertyDict{{"time", dateText(_now)},
-                                              {"name", noted.name},
-                                              {"day", noted.day},
-                                              {"revision", noted.revision}}),
-                        error)) {
-        throw CommandFailure(error);
-      }
+      const std::string note = jsonText(PropertyDict{{"time", dateText(_now)},
+                                                     {"name", noted.name},
+                                                     {"day", noted.day},
+                                                     {"revision", noted.revision}});
+      orFail([&](std::string& error) { return notes.append(note, error); });
     }
   }
-  if (!isFlushed && !notes.flush(error)) {
-    throw CommandFailure(error);
-  }
+  orFail([&](std::string& error) { return isFlushed || notes.flush(error); });
   return due;
 }
 

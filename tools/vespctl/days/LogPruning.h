@@ -28,7 +28,7 @@ class LogPruning {
   /// number of bytes, or no log is left.
   void removeUntilBelow(std::uint64_t bytes);
 
-  /// The files that went, but for headers that stood beside a log.
+  /// The files that were removed, without headers that went with their log.
   const std::vector<std::string>& removed() const { return _removed; }
 
   /// What could not be done.

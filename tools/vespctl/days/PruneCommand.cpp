@@ -10,7 +10,6 @@
 #include "Command.h"
 #include "Complaints.h"
 #include "common/Calendar.h"
-#include "days/DailyWork.h"
 #include "days/LogPruning.h"
 #include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/JsonForm.h"
@@ -127,8 +126,8 @@ void prune(const Pruning& wanted) {
 
 void addPruneCommand(CLI::App& vespctl) {
   const auto wanted = std::make_shared<Pruning>();
-  CLI::App* command = vespctl.add_subcommand("prune", "Removes what is old, and prints what went");
-  command->add_option("DIR", wanted->directory, "The device directory")->required();
+  CLI::App* command = addDeviceCommand(
+      vespctl, "prune", "Removes what is old, and prints what went", wanted->directory);
   command
       ->add_option("--counters", wanted->counterDays,
                    "Keeps the counters of the last N days, and those of three days in any case")

@@ -1,39 +1,26 @@
 #include "device/AppFile.h"
 
+#include <charconv>
+
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {
 namespace {
 
-constexpr std::string_view kUuidForm = "hhhhhhhh-hhhh-hhhh-hhhh-hhhhhhhhhhhh";
-
-int digitValue(char digit) {
-  return digit >= '0' && digit <= '9'   ? digit - '0'
-         : digit >= 'A' && digit <= 'F' ? digit - 'A' + 10
-         : digit >= 'a' && digit <= 'f' ? digit - 'a' + 10
-                                        : -1;
-}
-
 std::optional<Bytes> uuidBytes(std::string_view text) {
-  if (text.size() != kUuidForm.size()) {
-    return std::nullopt;
-  }
+  constexpr std::string_view kForm = "hhhhhhhh-hhhh-hhhh-hhhh-hhhhhhhhhhhh";
   Bytes bytes;
-  int high = -1;
-  for (std::size_t i = 0; i < text.size(); ++i) {
-    const int digit = digitValue(text[i]);
-    if (kUuidForm[i] == '-' ? text[i] != '-' : digit < 0) {
+  for (std::size_t i = 0; i < kForm.size() && text.size() == kForm.size(); i += 2) {
+    if (kForm[i] == '-' && text[i++] != '-') {
       return std::nullopt;
     }
-    if (digit >= 0 && high < 0) {
-      high = digit;
-    } else if (digit >= 0) {
-      bytes.push_back(static_cast<std::uint8_t>((high * 16) + digit));
-      high = -1;
+    const char* const end = text.data() + i + 2;
+    if (std::from_chars(text.data() + i, end, bytes.emplace_back(), 16).ptr != end) {
+      return std::nullopt;
     }
   }
-  return bytes;
+  return bytes.empty() ? std::nullopt : std::optional(std::move(bytes));
 }
 
 /// The value for the message; nothing, with the expectation in `wanted`, for a wrong one.

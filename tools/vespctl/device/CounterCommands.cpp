@@ -183,9 +183,9 @@ void dumpLines(const CounterArguments& arguments) {
 }  // namespace
 
 void addCounterCommands(CLI::App& vespctl) {
-  CLI::App* counters = vespctl.add_subcommand("counters", "Shows and changes counters");
   const auto arguments = std::make_shared<CounterArguments>();
-  counters->add_option("DIR", arguments->device, "The device directory")->required();
+  CLI::App* counters =
+      addDeviceCommand(vespctl, "counters", "Shows and changes counters", arguments->device);
 
   const auto addChange = [&](const char* name, const char* description) {
     CLI::App* command = counters->add_subcommand(name, description);

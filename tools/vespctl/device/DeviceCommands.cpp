@@ -23,25 +23,19 @@ void initDevice(const std::string& path, bool sample) {
   if (failure) {
     throw CommandFailure(path + ": " + failure.message());
   }
-  std::string error;
-  const std::optional<DeviceDirectory> directory = DeviceDirectory::open(path, error);
-  if (!directory) {
-    throw CommandFailure(error);
-  }
+  const DeviceDirectory directory = openDirectory(path);
   for (const char* folder :
        {"Library/Application Support/Tallybook", "Library/Logsmith", "var/mobile/Library/Tallybook",
         "var/mobile/Library/Preferences", "run", "kernel/ecc", "outbox/logs"}) {
-    if (!directory->makeFolder(folder, error)) {
-      throw CommandFailure(error);
-    }
+    orFail([&](std::string& error) { return directory.makeFolder(folder, error); });
   }
-  if (!replaceFile(directory->hostPath("device.json"), "{\n}\n", error)) {
-    throw CommandFailure(error);
-  }
+  orFail([&](std::string& error) {
+    return replaceFile(directory.hostPath("device.json"), "{\n}\n", error);
+  });
   if (sample) {
     fillSampleDevice(path);
   } else {
-    writeWhitelist(*directory, starterWhitelist());
+    writeWhitelist(directory, starterWhitelist());
   }
 }
 
@@ -72,8 +66,8 @@ void addDeviceCommands(CLI::App& vespctl) {
                  "for them, instead of one for what collect writes");
   init->callback([arguments] { initDevice(arguments->directory, arguments->sample); });
 
-  CLI::App* run = vespctl.add_subcommand("run", "Does what vesprun does, on that device");
-  run->add_option("DIR", arguments->directory, "The device directory")->required();
+  CLI::App* run = addDeviceCommand(vespctl, "run", "Does what vesprun does, on that device",
+                                   arguments->directory);
   run->add_option("ARG", arguments->job, "What vesprun is given, behind --");
   run->callback([arguments] { runJob(arguments->directory, arguments->job); });
 }

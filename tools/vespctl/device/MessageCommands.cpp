@@ -10,7 +10,6 @@
 #include "device/AppFile.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeWriter.h"
-#include "platform/host/files/WholeFile.h"
 #include "platform/host/messages/MessageFraming.h"
 #include "platform/host/messages/ServiceSocket.h"
 
@@ -25,20 +24,11 @@ constexpr timeval kLastLook{2, 0};
 
 std::string document(const PropertyDict& message) {
   std::string text;
-  std::string error;
-  if (!writePtree(message, text, error)) {
-    throw CommandFailure(error);
-  }
+  orFail([&](std::string& error) { return writePtree(message, text, error); });
   return text;
 }
 
-std::string operationDocument(std::int64_t operation) {
-  return document({{"operation", operation}});
-}
-
-std::string dailyDocument(std::int64_t day) {
-  return document({{"operation", std::int64_t{1}}, {"value", day}});
-}
+std::string loggingDocument() { return document({{"operation", std::int64_t{0}}}); }
 
 std::string appsDocument(const std::string& file) {
   std::string error;
@@ -105,7 +95,8 @@ void sendDocument(const std::string& path, const std::string& document) {
 class NewNotifications {
  public:
   explicit NewNotifications(const DeviceDirectory& directory)
-      : _file(directory.hostPath("outbox/notifications.jsonl")), _seen(content().size()) {}
+      : _file(directory.hostPath("outbox/notifications.jsonl")),
+        _seen(contentIfThere(_file).size()) {}
 
   /// Waits for one of that name, but not for ever.
   bool await(std::string_view name) const {
@@ -120,18 +111,8 @@ class NewNotifications {
   }
 
  private:
-  std::string content() const {
-    std::string error;
-    bool missing = false;
-    std::optional<std::string> text = readWholeFile(_file, error, &missing);
-    if (!text && !missing) {
-      throw CommandFailure(error);
-    }
-    return text ? *std::move(text) : "";
-  }
-
   bool isPosted(std::string_view name) const {
-    const std::string text = content();
+    const std::string text = contentIfThere(_file);
     // A shorter file is a new one.
     std::string_view rest = std::string_view(text).substr(text.size() < _seen ? 0 : _seen);
     for (auto end = rest.find('\n'); end != std::string_view::npos; end = rest.find('\n')) {
@@ -156,7 +137,7 @@ void runSession(const std::string& path, const std::string& file) {
   const DeviceDirectory directory = openDirectory(path);
   const NewNotifications notifications(directory);
   const Client client(directory);
-  client.send(operationDocument(0));
+  client.send(loggingDocument());
   if (!notifications.await(kLoggingNotification)) {
     throw CommandFailure("the notification " + std::string(kLoggingNotification) +
                          " did not come within " + std::to_string(kPatienceInSeconds) + " seconds");
@@ -175,11 +156,11 @@ void addMessageCommands(CLI::App& vespctl) {
   };
   const auto arguments = std::make_shared<Arguments>();
 
-  CLI::App* send = vespctl.add_subcommand("send", "Sends messages to a running vesprun");
-  send->add_option("DIR", arguments->device, "The device directory")->required();
+  CLI::App* send =
+      addDeviceCommand(vespctl, "send", "Sends messages to a running vesprun", arguments->device);
 
   send->add_subcommand("logging", "Notifies the logging status")->callback([arguments] {
-    sendDocument(arguments->device, operationDocument(0));
+    sendDocument(arguments->device, loggingDocument());
   });
 
   CLI::App* apps = send->add_subcommand("apps", "Delivers the active apps");
@@ -199,7 +180,10 @@ void addMessageCommands(CLI::App& vespctl) {
   daily->add_option("DAY", arguments->day, "The day number")
       ->required()
       ->transform(decimal<std::int64_t>());
-  daily->callback([arguments] { sendDocument(arguments->device, dailyDocument(arguments->day)); });
+  daily->callback([arguments] {
+    sendDocument(arguments->device,
+                 document({{"operation", std::int64_t{1}}, {"value", arguments->day}}));
+  });
 
   CLI::App* raw = send->add_subcommand("raw", "Sends a ptree document as it is");
   raw->add_option("FILE", arguments->file, "The document; - for standard input")->required();

@@ -60,9 +60,9 @@ void setPreference(const PreferenceArguments& arguments) {
 }  // namespace
 
 void addPreferenceCommands(CLI::App& vespctl) {
-  CLI::App* prefs = vespctl.add_subcommand("prefs", "Shows and changes preferences");
   const auto arguments = std::make_shared<PreferenceArguments>();
-  prefs->add_option("DIR", arguments->device, "The device directory")->required();
+  CLI::App* prefs =
+      addDeviceCommand(vespctl, "prefs", "Shows and changes preferences", arguments->device);
   prefs->add_option("--user", arguments->user, "Whose preferences, instead of mobile's");
 
   CLI::App* get = prefs->add_subcommand("get", "Prints a value, or all values of a domain");

@@ -2,14 +2,11 @@
 
 #include <array>
 #include <cstdint>
-#include <cstdio>
-#include <iostream>
 #include <limits>
 
 #include "Command.h"
 #include "common/TextForm.h"
 #include "outbox/SubmittedLogs.h"
-#include "platform/DiagnosticHeader.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/XmlText.h"
 
@@ -62,7 +59,7 @@ void run(const Export& wanted) {
   const std::string device =
       !wanted.device.empty()
           ? wanted.device
-          : pseudonymOf(platform->diagnosticHeader().GetSysIDWithDescription(false));
+          : pseudonymOf(platform->deviceInformation().GetSysIDWithDescription(false));
   const auto print = [&](SubmittedLog&& log) {
     if (log.day < wanted.from || log.day > wanted.to) {
       return;
@@ -89,9 +86,9 @@ void run(const Export& wanted) {
 
 void addExportCommand(CLI::App& vespctl) {
   const auto wanted = std::make_shared<Export>();
-  CLI::App* command =
-      vespctl.add_subcommand("export", "Prints each submitted daily log as one line for vespfleet");
-  command->add_option("DIR", wanted->directory, "The device directory")->required();
+  CLI::App* command = addDeviceCommand(vespctl, "export",
+                                       "Prints each submitted daily log as one line for vespfleet",
+                                       wanted->directory);
   command->add_option("--device", wanted->device, "A name instead of the device's pseudonym")
       ->check([](const std::string& name) -> std::string {
         constexpr std::size_t kLongest = 255;

@@ -2,17 +2,16 @@
 #include <filesystem>
 #include <iostream>
 #include <sstream>
-#include <system_error>
 #include <utility>
 
 #include "Command.h"
 #include "common/TextForm.h"
 #include "outbox/DailyLogView.h"
+#include "outbox/SubmittedLogs.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeReader.h"
 #include "platform/host/documents/QuotedText.h"
-#include "platform/host/files/FolderNames.h"
-#include "platform/host/files/WholeFile.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {
@@ -25,26 +24,15 @@ std::string entryText(const PropertyDict& line, const char* key) {
 /// Shows each line of the file; says which ones cannot be read.
 template <typename Show>
 void showLines(const std::string& file, Show show) {
-  std::string error;
-  bool missing = false;
-  const std::optional<std::string> content = readWholeFile(file, error, &missing);
-  if (!content) {
-    if (!missing) {
-      throw CommandFailure(error);
-    }
-    return;
-  }
-  std::istringstream lines(*content);
   int number = 0;
-  for (std::string line; std::getline(lines, line);) {
+  forEachLine(file, [&](const PropertyDict* line) {
     ++number;
-    const std::optional<PropertyValue> value = valueFromJsonText(line, error);
-    if (value && value->dict() != nullptr) {
-      show(*value->dict());
+    if (line != nullptr) {
+      show(*line);
     } else {
       std::cout << "(line " << number << " cannot be read)\n";
     }
-  }
+  });
 }
 
 void showEvents(const DeviceDirectory& directory, bool inFull) {
@@ -120,17 +108,13 @@ void showText(const std::string& content, bool inFull) {
 
 void showLog(const std::filesystem::path& file, bool inFull) {
   std::cout << printableText(file.filename().string()) << '\n';
-  std::string error;
-  const std::optional<std::string> content = readWholeFile(file, error);
-  if (!content) {
-    throw CommandFailure(error);
-  }
+  const auto content = orFail([&](std::string& error) { return readWholeFile(file, error); });
   const std::filesystem::path header =
       std::filesystem::path(file).replace_extension(".header.json");
-  std::string headerError;
-  if (const std::optional<std::string> text = readWholeFile(header, headerError)) {
-    const std::optional<PropertyValue> value = valueFromJsonText(*text, headerError);
-    std::cout << "  header     " << printableText(value ? textForm(*value) : headerError) << '\n';
+  std::string error;
+  if (const std::optional<std::string> text = readWholeFile(header, error)) {
+    const std::optional<PropertyValue> value = valueFromJsonText(*text, error);
+    std::cout << "  header     " << printableText(value ? textForm(*value) : error) << '\n';
   }
   if (file.extension() != ".ptree") {
     showText(*content, inFull);
@@ -145,14 +129,8 @@ void showLog(const std::filesystem::path& file, bool inFull) {
 }
 
 void showLogs(const DeviceDirectory& directory, bool inFull) {
-  const std::string folder = directory.hostPath("outbox/logs");
-  std::string error;
-  const std::optional<std::vector<std::string>> names = namesInFolder(folder, error);
-  if (!names) {
-    throw CommandFailure(error);
-  }
-  for (const std::string& name : *names) {
-    const std::filesystem::path file = folder + '/' + name;
+  for (const std::string& name : namesOfLogs(directory)) {
+    const std::filesystem::path file = directory.hostPath("outbox/logs/" + name);
     if (name.front() != '.' && (file.extension() == ".ptree" || file.extension() == ".log")) {
       showLog(file, inFull);
     }
@@ -178,8 +156,8 @@ void showAll(const DeviceDirectory& directory) {
 
 void addOutboxCommands(CLI::App& vespctl) {
   const auto path = std::make_shared<std::string>();
-  CLI::App* show = vespctl.add_subcommand("show", "Shows what the runs left in the outbox");
-  show->add_option("DIR", *path, "The device directory")->required();
+  CLI::App* show =
+      addDeviceCommand(vespctl, "show", "Shows what the runs left in the outbox", *path);
   show->callback([show, path] {
     if (show->get_subcommands().empty()) {
       showAll(openDirectory(*path));

@@ -9,11 +9,10 @@
 
 #include "Command.h"
 #include "common/Calendar.h"
-#include "platform/host/device/PrunedLogs.h"
+#include "platform/host/device/LogNumbers.h"
 #include "platform/host/documents/PtreeReader.h"
 #include "platform/host/documents/QuotedText.h"
-#include "platform/host/files/FolderNames.h"
-#include "platform/host/files/WholeFile.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {
@@ -84,13 +83,8 @@ class Revisions {
 
   /// For a log that has gone since its folder was read: it was noted before.
   void readNotes() {
-    std::string error;
-    std::optional<PrunedLogs> notes = readPrunedLogs(_directory, error);
-    if (!notes) {
-      throw CommandFailure(error);
-    }
-    std::ranges::stable_sort(*notes, {}, &PrunedLog::number);
-    _notes = *std::move(notes);
+    _notes = *orFail([&](std::string& error) { return readPrunedLogs(_directory, error); });
+    std::ranges::stable_sort(_notes, {}, &PrunedLog::number);
     _next = 0;
   }
 
@@ -125,18 +119,17 @@ class Revisions {
 
 }  // namespace
 
+std::vector<std::string> namesOfLogs(const DeviceDirectory& directory) {
+  const std::string folder = directory.hostPath("outbox/logs");
+  return *orFail([&](std::string& error) { return namesInFolder(folder, error); });
+}
+
 bool isDailyLogName(std::string_view name) { return numberOf(name).has_value(); }
 
 std::vector<UnreadableLog> forEachSubmittedLog(
     const DeviceDirectory& directory, const std::function<void(SubmittedLog&& log)>& take) {
-  const std::string folder = directory.hostPath("outbox/logs");
-  std::string error;
-  const std::optional<std::vector<std::string>> names = namesInFolder(folder, error);
-  if (!names) {
-    throw CommandFailure(error);
-  }
   std::set<std::pair<std::uint64_t, std::string>> files;
-  for (const std::string& name : *names) {
+  for (const std::string& name : namesOfLogs(directory)) {
     if (const auto number = numberOf(name)) {
       files.emplace(*number, name);
     }
@@ -146,7 +139,7 @@ std::vector<UnreadableLog> forEachSubmittedLog(
   for (const auto& [number, name] : files) {
     std::string why;
     bool missing = false;
-    const auto content = readWholeFile(folder + '/' + name, why, &missing);
+    const auto content = readWholeFile(directory.hostPath("outbox/logs/" + name), why, &missing);
     if (missing) {
       revisions.readNotes();
       continue;
@@ -176,13 +169,6 @@ void nameUnreadable(std::span<const UnreadableLog> logs) {
     std::fprintf(stderr, "vespctl: %s: %s\n", printableText(name).c_str(),
                  printableText(why).c_str());
   }
-}
-
-SubmittedLogs readSubmittedLogs(const DeviceDirectory& directory) {
-  SubmittedLogs found;
-  found.unreadable = forEachSubmittedLog(
-      directory, [&found](SubmittedLog&& log) { found.logs.push_back(std::move(log)); });
-  return found;
 }
 
 }  // namespace vesprun

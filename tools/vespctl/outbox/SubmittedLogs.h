@@ -28,10 +28,8 @@ struct UnreadableLog {
   bool wasRead;  ///< so that it will never be one
 };
 
-struct SubmittedLogs {
-  std::vector<SubmittedLog> logs;  ///< by number
-  std::vector<UnreadableLog> unreadable;
-};
+/// What lies in the folder of submitted logs. Throws `CommandFailure` when it cannot be read.
+std::vector<std::string> namesOfLogs(const DeviceDirectory& directory);
 
 /// True for the names that daily logs have.
 bool isDailyLogName(std::string_view name);
@@ -44,7 +42,5 @@ std::vector<UnreadableLog> forEachSubmittedLog(const DeviceDirectory& directory,
 
 /// Names unreadable logs on standard error.
 void nameUnreadable(std::span<const UnreadableLog> logs);
-
-SubmittedLogs readSubmittedLogs(const DeviceDirectory& directory);
 
 }  // namespace vesprun

@@ -8,8 +8,8 @@
 
 namespace vesprun {
 
-/// The installed platform of a device that a command only looks at. What would stand in the system
-/// log becomes the command's complaints.
+/// The installed platform of a device that a command only looks at. Lines for the system log
+/// become the command's complaints.
 struct LookedAtDevice {
   explicit LookedAtDevice(const std::string& directory, LogLevel least = LogLevel::Error)
       : complaints(nullptr, least),

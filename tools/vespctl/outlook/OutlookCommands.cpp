@@ -29,25 +29,26 @@ void previewLog(const OutlookArguments& arguments) {
   const LookedAtDevice looked(arguments.directory, LogLevel::Default);
   const std::int32_t day = arguments.day.value_or(yesterday());
   std::optional<PropertyDict> document;
-  std::optional<std::string> bytes;
   if (platform().logsmith().DiagnosticLogSubmissionEnabled()) {
     TBReport report;
     if (!report.readHistory(day)) {
       looked.complaints.fail(kUnreadableCounters);
     }
-    document = report.makeDocument(day, nullptr, TBReport::SideEffects::LeftOut);
-    bytes = document ? serializeDailyLog(*document) : std::nullopt;
-    if (bytes && looked.device->description().submission.fails) {
+    document = report.makeDocument(day, TBReport::SideEffects::LeftOut);
+    if (document && !canSerializeDailyLog(*document)) {
+      document.reset();
+    } else if (document && looked.device->description().submission.fails) {
       logMessage(LogLevel::Error, "%s", kSubmissionFailed);
-      bytes.reset();
+      document.reset();
     }
   }
   looked.complaints.print();
-  if (arguments.document) {
-    std::cout << bytes.value_or("");
-  } else if (bytes) {
+  if (document && arguments.document) {
+    platform().ptreeSerialization().serialize({*document},
+                                              [](std::string_view piece) { std::cout << piece; });
+  } else if (document) {
     printJson(*document);
-  } else {
+  } else if (!arguments.document) {
     std::cout << "null\n";
   }
 }
@@ -181,9 +182,8 @@ void explainKey(const OutlookArguments& arguments) {
 void addOutlookCommands(CLI::App& vespctl) {
   const auto arguments = std::make_shared<OutlookArguments>();
 
-  CLI::App* preview =
-      vespctl.add_subcommand("preview", "Prints the daily log that a run would submit now");
-  preview->add_option("DIR", arguments->directory, "The device directory")->required();
+  CLI::App* preview = addDeviceCommand(
+      vespctl, "preview", "Prints the daily log that a run would submit now", arguments->directory);
   preview->add_option("--day", arguments->day, "The day number, instead of yesterday's")
       ->transform(decimal<std::int32_t>());
   CLI::Option* document =
@@ -200,9 +200,8 @@ void addOutlookCommands(CLI::App& vespctl) {
     }
   });
 
-  CLI::App* explain =
-      vespctl.add_subcommand("explain", "Says why a key leaves the device or stays");
-  explain->add_option("DIR", arguments->directory, "The device directory")->required();
+  CLI::App* explain = addDeviceCommand(
+      vespctl, "explain", "Says why a key leaves the device or stays", arguments->directory);
   explain->add_option("KEY", arguments->key, "The key of a counter")->required();
   explain->add_flag("--distribution", arguments->isDistribution,
                     "The key is one of a distribution, not of a scalar");

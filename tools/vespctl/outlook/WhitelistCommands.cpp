@@ -40,7 +40,7 @@ void printFindings(const std::string& file) {
 
 using Keys = std::set<std::string, std::less<>>;
 
-/// What changes for the keys when `after` takes the place of `before`, which may be null.
+/// What changes for the keys when `after` replaces `before`, which may be null.
 template <typename Options>
 std::string differences(const TBConfig* before, const TBConfig& after, const Keys& keys) {
   JsonArray added;
@@ -117,9 +117,10 @@ void addWhitelistCommands(CLI::App& vespctl) {
   check->add_option("FILE", arguments->file, "The whitelist; - for standard input")->required();
   check->callback([arguments] { printFindings(arguments->file); });
 
-  CLI::App* diff = whitelist->add_subcommand(
-      "diff", "Prints what would leave the device, stay or change if it became the whitelist");
-  diff->add_option("DIR", arguments->directory, "The device directory")->required();
+  CLI::App* diff = addDeviceCommand(
+      *whitelist, "diff",
+      "Prints what would leave the device, stay or change if it became the whitelist",
+      arguments->directory);
   diff->add_option("FILE", arguments->file, "The whitelist; - for standard input")->required();
   diff->callback([arguments] { printDifferences(arguments->directory, arguments->file); });
 

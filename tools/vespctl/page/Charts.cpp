@@ -85,9 +85,6 @@ std::string lineThrough(const std::vector<Point>& points, std::size_t from, std:
   return steps.find('L') == std::string::npos ? steps + "h0" : steps;  // a dot is seen, too
 }
 
-double logarithmOf(double value) { return std::log10(value); }
-double valueItself(double value) { return value; }
-
 }  // namespace
 
 std::string sparkline(const std::vector<Point>& all, Period period, double longestStep,
@@ -111,14 +108,16 @@ std::string sparkline(const std::vector<Point>& all, Period period, double longe
   return picture("l", label, path("m", steps) + dot(across(last.day), up(last.value)));
 }
 
-bool isLogarithmic(const std::vector<BandPoint>& points) {
-  constexpr double kLeastRatio = 50;
-  double low = HUGE_VAL;
-  double high = 0;
+std::pair<double, double> rangeOf(const std::vector<BandPoint>& points) {
+  std::pair range(HUGE_VAL, -HUGE_VAL);
   for (const BandPoint& point : points) {
-    low = std::min(low, point.low);
-    high = std::max(high, point.high);
+    range = {std::min(range.first, point.low), std::max(range.second, point.high)};
   }
+  return range;
+}
+
+bool isLogarithmic(double low, double high) {
+  constexpr double kLeastRatio = 50;
   return low > 0 && high / low >= kLeastRatio;
 }
 
@@ -127,15 +126,11 @@ std::string bandChart(const std::vector<BandPoint>& points, Period period,
   if (points.empty()) {
     return "";
   }
-  const auto shown = isLogarithmic(points) ? logarithmOf : valueItself;
-  double low = HUGE_VAL;
-  double high = -HUGE_VAL;
-  for (const BandPoint& point : points) {
-    low = std::min(low, shown(point.low));
-    high = std::max(high, shown(point.high));
-  }
+  const auto [low, high] = rangeOf(points);
+  const bool isOverLogarithm = isLogarithmic(low, high);
+  const auto shown = [=](double value) { return isOverLogarithm ? std::log10(value) : value; };
   const Scale across(period.first, period.last, kMargin, kWidth - kMargin);
-  const Scale up(low, high, kHeight - 1, 1);
+  const Scale up(shown(low), shown(high), kHeight - 1, 1);
   std::string area;
   std::string line;
   for (const auto& [from, to] : runsOf(points, 1)) {

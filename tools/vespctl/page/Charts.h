@@ -1,6 +1,7 @@
 #pragma once
 
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace vesprun {
@@ -32,8 +33,11 @@ struct BandPoint {
   double high;
 };
 
-/// Whether the values are so far apart that their band is drawn over a logarithmic scale.
-bool isLogarithmic(const std::vector<BandPoint>& points);
+/// The lowest and the highest value.
+std::pair<double, double> rangeOf(const std::vector<BandPoint>& points);
+
+/// Whether the ends of a band are so far apart that it is drawn over a logarithmic scale.
+bool isLogarithmic(double low, double high);
 
 /// A band and its line over the days, interrupted where a day is missing.
 std::string bandChart(const std::vector<BandPoint>& points, Period period,

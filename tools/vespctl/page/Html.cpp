@@ -43,25 +43,16 @@ char32_t decoded(std::string_view character) {
 }
 
 void appendEscaped(std::string_view character, std::string& html) {
-  switch (character.front()) {
-    case '&':
-      html += "&amp;";
-      break;
-    case '<':
-      html += "&lt;";
-      break;
-    case '>':
-      html += "&gt;";
-      break;
-    case '"':
-      html += "&quot;";
-      break;
-    case '\'':
-      html += "&#39;";
-      break;
-    default:
-      html += character;
+  static constexpr struct {
+    char character;
+    std::string_view html;
+  } kEscapes[] = {{'&', "&amp;"}, {'<', "&lt;"}, {'>', "&gt;"}, {'"', "&quot;"}, {'\'', "&#39;"}};
+  for (const auto& escape : kEscapes) {
+    if (escape.character == character.front()) {
+      character = escape.html;
+    }
   }
+  html += character;
 }
 
 /// Moves a place in the text to the beginning of the character that it lies in.

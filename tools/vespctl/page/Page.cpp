@@ -53,16 +53,21 @@ std::string section(const char* anchor, const std::string& title, const std::str
          "</section>\n";
 }
 
-/// The keys in groups, each group written by `write` from the places of its keys.
+/// What `write` makes of each key, in groups that begin and end alike.
 template <typename Write>
-std::string inGroups(const std::vector<std::string_view>& keys, bool areOpen, Write write) {
+std::string inGroups(const std::vector<std::string_view>& keys, bool areOpen,
+                     const std::string& begin, Write write, const char* end) {
   std::string html;
   for (const KeyGroup& group : groupKeys(keys)) {
     std::string title =
         group.title.empty() ? (group.isRest ? "others" : "all") : htmlName(group.title);
     title += group.isRest && !group.title.empty() ? " others" : "";
-    html += fold(title + " <small>" + numeral(group.keys.size()) + "</small>", write(group.keys),
-                 areOpen);
+    std::string content = begin;
+    for (const std::size_t place : group.keys) {
+      content += write(keys[place]);
+    }
+    html +=
+        fold(title + " <small>" + numeral(group.keys.size()) + "</small>", content + end, areOpen);
   }
   return html;
 }
@@ -152,7 +157,7 @@ class PageWriter {
     std::string older;
     std::map<std::string, std::size_t> digests;
     std::size_t count = 0;
-    for (auto log = _data.submitted.logs.rbegin(); log != _data.submitted.logs.rend(); ++log) {
+    for (auto log = _data.submitted.rbegin(); log != _data.submitted.rend(); ++log) {
       (count++ < kShownReports ? newest : older) += reportRow(*log);
       ++digests[*log->document.findString("TBWhitelistDigest")];
     }
@@ -206,10 +211,8 @@ class PageWriter {
 
   std::string unreadableFiles() const {
     std::string html;
-    for (const auto* list : {&_data.submitted.unreadable, &_data.unreadable}) {
-      for (const UnreadableLog& file : *list) {
-        html += "<li>" + htmlName(file.name) + ": " + htmlText(file.why);
-      }
+    for (const UnreadableLog& file : _data.unreadable) {
+      html += "<li>" + htmlName(file.name) + ": " + htmlText(file.why);
     }
     return html.empty() ? "" : "<p class=act>Not on this page:</p><ul>" + html + "</ul>";
   }
@@ -288,39 +291,32 @@ class PageWriter {
            numeral(series.size()) + '\n';
   }
 
-  static std::string seriesTable(const char* count, const std::string& rows) {
+  static std::string seriesHead(const char* count) {
     return std::string(
                "<table class=series><thead><tr><th>Key<th>Over the days<th>Newest<th>Lowest<th>"
                "Highest<th>") +
-           count + "</thead>" + rows + "</table>";
+           count + "</thead>";
   }
 
   std::string scalars() const {
     const auto keys = keysOf(_data.scalars);
-    const auto rows = [&](const std::vector<std::size_t>& places) {
-      std::string html;
-      for (const std::size_t place : places) {
-        html += seriesRow(keys[place], _data.scalars.find(keys[place])->second, _period, 1);
-      }
-      return seriesTable("Days", html);
+    const auto row = [this](std::string_view key) {
+      return seriesRow(key, _data.scalars.at(key), _period, 1);
     };
     return section("scalars", "Scalars",
                    keys.empty() ? "<p>No scalar has been reported.</p>"
-                                : inGroups(keys, keys.size() <= kLongList, rows));
+                                : inGroups(keys, keys.size() <= kLongList, seriesHead("Days"), row,
+                                           "</table>"));
   }
 
   std::string distributions() const {
     const auto keys = keysOf(_data.distributions);
-    const auto articles = [&](const std::vector<std::size_t>& places) {
-      std::string html;
-      for (const std::size_t place : places) {
-        html += distribution(keys[place], _data.distributions.find(keys[place])->second);
-      }
-      return html;
+    const auto article = [this](std::string_view key) {
+      return distribution(key, _data.distributions.at(key));
     };
     return section("distributions", "Distributions",
                    keys.empty() ? "<p>No distribution has been reported.</p>"
-                                : inGroups(keys, keys.size() <= kLongList, articles));
+                                : inGroups(keys, keys.size() <= kLongList, "", article, ""));
   }
 
   static double deviation(const PageData::DistributionDay& day) {
@@ -360,15 +356,10 @@ class PageWriter {
     if (points.empty()) {
       return "";
     }
-    double low = points.front().low;
-    double high = points.front().high;
-    for (const BandPoint& point : points) {
-      low = std::min(low, point.low);
-      high = std::max(high, point.high);
-    }
+    const auto [low, high] = rangeOf(points);
     const std::string ends = numeral(low) + " to " + numeral(high);
     return "<figure><figcaption>Lowest, mean and highest of each day" +
-           std::string(isLogarithmic(points) ? ", logarithmic" : "") +
+           std::string(isLogarithmic(low, high) ? ", logarithmic" : "") +
            "</figcaption><p class=ends>" + numeral(high) + "</p>" +
            bandChart(points, _period,
                      countedNoun(points.size(), "day") + " with values from " + ends) +
@@ -489,7 +480,7 @@ class PageWriter {
         rows += seriesRow(field, series, {events.front().day, events.back().day}, HUGE_VAL);
       }
     }
-    return (rows.empty() ? "" : seriesTable("Events", rows)) +
+    return (rows.empty() ? "" : seriesHead("Events") + rows + "</table>") +
            (texts.empty() ? "" : "<table class=texts>" + texts + "</table>") +
            (zeros.empty() ? ""
                           : fold(countedNoun(zeroCount, "field") + " always 0",
@@ -517,16 +508,11 @@ class PageWriter {
         }
       }
       const std::vector<std::string_view> keys(sorted.begin(), sorted.end());
-      const auto list = [&keys](const std::vector<std::size_t>& places) {
-        std::string items = "<ul class=keys>";
-        for (const std::size_t place : places) {
-          items += "<li>" + foldedName(keys[place], "");
-        }
-        return items + "</ul>";
-      };
+      const auto item = [](std::string_view key) { return "<li>" + foldedName(key, ""); };
       if (!keys.empty()) {
         html += "<h3>" + countedNoun(keys.size(), isDistribution ? "distribution" : "scalar") +
-                "</h3>" + inGroups(keys, _keptBack.size() <= kLongList, list);
+                "</h3>" +
+                inGroups(keys, _keptBack.size() <= kLongList, "<ul class=keys>", item, "</ul>");
       }
     }
     const char* const explanation =

@@ -26,10 +26,7 @@ void writePage(const std::string& file, const std::string& page) {
   if (failure) {
     throw CommandFailure(file + ": " + failure.message());
   }
-  std::string error;
-  if (!replaceFile(path.string(), page, error)) {
-    throw CommandFailure(error);
-  }
+  orFail([&](std::string& error) { return replaceFile(path.string(), page, error); });
 }
 
 void makePage(const std::string& directory, const std::string& file) {
@@ -41,7 +38,6 @@ void makePage(const std::string& directory, const std::string& file) {
     looked.complaints.fail(kUnreadableCounters);
   }
   looked.complaints.print();
-  nameUnreadable(data.submitted.unreadable);
   nameUnreadable(data.unreadable);
   std::error_code ignored;
   const auto absolute = std::filesystem::canonical(looked.device->directory().path(), ignored);
@@ -59,9 +55,8 @@ void makePage(const std::string& directory, const std::string& file) {
 void addPageCommand(CLI::App& vespctl) {
   const auto directory = std::make_shared<std::string>();
   const auto file = std::make_shared<std::string>();
-  CLI::App* command =
-      vespctl.add_subcommand("page", "Writes one HTML page of all that the device reported");
-  command->add_option("DIR", *directory, "The device directory")->required();
+  CLI::App* command = addDeviceCommand(
+      vespctl, "page", "Writes one HTML page of all that the device reported", *directory);
   command->add_option("FILE", *file, "Where to write it, instead of standard output");
   command->callback([directory, file] { makePage(*directory, *file); });
 }

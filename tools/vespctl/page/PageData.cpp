@@ -1,6 +1,5 @@
 #include "page/PageData.h"
 
-#include <algorithm>
 #include <charconv>
 #include <sstream>
 #include <utility>
@@ -9,37 +8,13 @@
 #include "common/Calendar.h"
 #include "common/TextForm.h"
 #include "page/Html.h"
-#include "platform/host/documents/JsonForm.h"
-#include "platform/host/files/FolderNames.h"
-#include "platform/host/files/WholeFile.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {
 
 double dayOf(const Date& date) {
   return static_cast<double>(date.seconds) / static_cast<double>(kSecondsPerDay);
-}
-
-/// Hands on each line of a file that is a JSON object; how many are none.
-template <typename Take>
-std::size_t forEachObject(const std::string& file, Take take) {
-  std::string error;
-  bool missing = false;
-  const std::optional<std::string> content = readWholeFile(file, error, &missing);
-  if (!content && !missing) {
-    throw CommandFailure(error);
-  }
-  std::size_t malformed = 0;
-  std::istringstream lines(content.value_or(""));
-  for (std::string line; std::getline(lines, line);) {
-    std::optional<PropertyValue> value = valueFromJsonText(line, error);
-    if (value && value->dict() != nullptr) {
-      take(*value->dict());
-    } else {
-      ++malformed;
-    }
-  }
-  return malformed;
 }
 
 /// The last text log's fields: the part after the head, "date time process: name:value;…".
@@ -71,15 +46,8 @@ PageData::StorageLog parseStorageLog(const std::string& name, const std::string&
 
 }  // namespace
 
-PageData::PageData(const DeviceDirectory& directory) : submitted(readSubmittedLogs(directory)) {
-  takeDays();
-  takeLogs(directory);
-  takeEvents(directory);
-  takeRecords(directory);
-}
-
 void PageData::takeDays() {
-  for (const SubmittedLog& log : submitted.logs) {
+  for (const SubmittedLog& log : submitted) {
     days[log.day] = &log;
   }
   for (const auto& [day, log] : days) {
@@ -98,14 +66,8 @@ void PageData::takeDays() {
 
 void PageData::takeLogs(const DeviceDirectory& directory) {
   constexpr std::string_view kEnd = ".log";
-  const std::string folder = directory.hostPath("outbox/logs");
-  std::string error;
-  const auto names = namesInFolder(folder, error);
-  if (!names) {
-    throw CommandFailure(error);
-  }
   std::uint64_t newest = 0;
-  for (const std::string& name : *names) {
+  for (const std::string& name : namesOfLogs(directory)) {
     std::uint64_t number = 0;
     const char* const rest = std::from_chars(name.data(), name.data() + name.size(), number).ptr;
     std::string_view kind(rest, name.data() + name.size());
@@ -118,7 +80,8 @@ void PageData::takeLogs(const DeviceDirectory& directory) {
     if (!kind.starts_with("165-") || number < newest) {
       continue;
     }
-    if (const auto content = readWholeFile(folder + '/' + name, error)) {
+    std::string error;
+    if (const auto content = readWholeFile(directory.hostPath("outbox/logs/" + name), error)) {
       storageLog = parseStorageLog(name, *content);
       newest = number;
     } else {
@@ -127,42 +90,52 @@ void PageData::takeLogs(const DeviceDirectory& directory) {
   }
 }
 
-void PageData::takeEvents(const DeviceDirectory& directory) {
-  constexpr std::size_t kMostKept = 200;
-  const std::size_t malformed =
-      forEachObject(directory.hostPath("outbox/events.jsonl"), [this](PropertyDict& line) {
-        const std::string* const text = line.findString("event");
-        const std::string* const time = line.findString("time");
-        const std::optional<Date> date = parseDateText(time != nullptr ? *time : "");
-        const PropertyDict* const found = line.findDict("payload");
-        PropertyDict payload = found != nullptr ? *found : PropertyDict();
-        std::string name = text != nullptr ? *text : "";
-        if (const PropertyValue* index = payload.find("msp_index")) {
-          name += ", MSP " + textForm(*index);
-        }
-        auto& [count, newest] = events[name];
-        ++count;
-        newest.push_back({date ? dayOf(*date) : 0, std::move(payload)});
-        if (newest.size() > 2 * kMostKept) {
-          newest.erase(newest.begin(), newest.begin() + kMostKept);
-        }
-      });
+template <typename Take>
+void PageData::takeLines(const DeviceDirectory& directory, const std::string& name, Take take) {
+  std::size_t malformed = 0;
+  forEachLine(directory.hostPath("outbox/" + name), [&](const PropertyDict* line) {
+    if (line != nullptr) {
+      take(*line);
+    } else {
+      ++malformed;
+    }
+  });
   if (malformed > 0) {
-    unreadable.push_back(
-        {"events.jsonl", countedNoun(malformed, "line") + " cannot be read", true});
+    unreadable.push_back({name, countedNoun(malformed, "line") + " cannot be read", true});
   }
 }
 
-void PageData::takeRecords(const DeviceDirectory& directory) {
-  const std::size_t malformed =
-      forEachObject(directory.hostPath("outbox/records.jsonl"), [this](const PropertyDict& line) {
-        const PropertyValue* const type = line.find("type");
-        ++others["record of type " + (type != nullptr ? textForm(*type) : "?")];
-      });
-  if (malformed > 0) {
-    unreadable.push_back(
-        {"records.jsonl", countedNoun(malformed, "line") + " cannot be read", true});
+void PageData::takeEvent(const PropertyDict& line) {
+  constexpr std::size_t kMostKept = 200;
+  const std::string* const text = line.findString("event");
+  const std::string* const time = line.findString("time");
+  const std::optional<Date> date = parseDateText(time != nullptr ? *time : "");
+  const PropertyDict* const payload = line.findDict("payload");
+  Event event{date ? dayOf(*date) : 0, payload != nullptr ? *payload : PropertyDict()};
+  std::string name = text != nullptr ? *text : "";
+  if (const PropertyValue* index = event.payload.find("msp_index")) {
+    name += ", MSP " + textForm(*index);
   }
+  auto& [count, newest] = events[name];
+  ++count;
+  newest.push_back(std::move(event));
+  if (newest.size() > 2 * kMostKept) {
+    newest.erase(newest.begin(), newest.begin() + kMostKept);
+  }
+}
+
+void PageData::takeRecord(const PropertyDict& line) {
+  const PropertyValue* const type = line.find("type");
+  ++others["record of type " + (type != nullptr ? textForm(*type) : "?")];
+}
+
+PageData::PageData(const DeviceDirectory& directory) {
+  unreadable = forEachSubmittedLog(
+      directory, [this](SubmittedLog&& log) { submitted.push_back(std::move(log)); });
+  takeDays();
+  takeLogs(directory);
+  takeLines(directory, "events.jsonl", [this](const PropertyDict& line) { takeEvent(line); });
+  takeLines(directory, "records.jsonl", [this](const PropertyDict& line) { takeRecord(line); });
 }
 
 }  // namespace vesprun

@@ -32,7 +32,7 @@ struct PageData {
     PropertyDict payload;
   };
 
-  /// The events of one name, and for one that tells of an MSP, of that MSP.
+  /// The events of one name; those of each MSP apart.
   struct Events {
     std::size_t count = 0;
     std::vector<Event> newest;  ///< some hundred at most, in the order of their lines
@@ -49,20 +49,22 @@ struct PageData {
   PageData(const PageData&) = delete;
   PageData& operator=(const PageData&) = delete;
 
-  SubmittedLogs submitted;
+  std::vector<SubmittedLog> submitted;               ///< by number
   std::map<std::int32_t, const SubmittedLog*> days;  ///< the last revision of each
   std::map<std::string_view, Series> scalars;        ///< by key, by day
   std::map<std::string_view, std::vector<DistributionDay>> distributions;
   std::map<std::string, Events> events;       ///< by name
   std::optional<StorageLog> storageLog;       ///< the newest
   std::map<std::string, std::size_t> others;  ///< what else was submitted, and how often
-  std::vector<UnreadableLog> unreadable;      ///< other files, and lines of files
+  std::vector<UnreadableLog> unreadable;      ///< files, and lines of files
 
  private:
   void takeDays();
   void takeLogs(const DeviceDirectory& directory);
-  void takeEvents(const DeviceDirectory& directory);
-  void takeRecords(const DeviceDirectory& directory);
+  template <typename Take>
+  void takeLines(const DeviceDirectory& directory, const std::string& name, Take take);
+  void takeEvent(const PropertyDict& line);
+  void takeRecord(const PropertyDict& line);
 };
 
 }  // namespace vesprun

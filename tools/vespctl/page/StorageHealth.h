@@ -18,7 +18,7 @@ struct HealthStatement {
 
 /// What the newest figures that were submitted say: the StorageStatus log, the storage's analytics
 /// events, and the scalars of the daily logs. A figure that none of them has, or that is negative,
-/// which stands for unknown, is left out; so the list may be empty.
+/// which means unknown, is left out; so the list may be empty.
 std::vector<HealthStatement> storageHealth(const PageData& data);
 
 }  // namespace vesprun

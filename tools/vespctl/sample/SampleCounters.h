@@ -20,7 +20,7 @@ struct DistributionReadings {
   std::vector<double> values;
 };
 
-/// What a network interface has carried since it is there.
+/// What a network interface has carried since it came up.
 struct InterfaceReading {
   std::string name;
   std::int64_t bytesReceived = 0;

@@ -118,10 +118,9 @@ constexpr std::uint32_t kMagazineHours[] = {0, 4, 8, 12, 16, 20, 24, 168, 720};
 
 void writeFile(const DeviceDirectory& directory, std::string_view devicePath,
                std::string_view content) {
-  std::string error;
-  if (!replaceFile(directory.hostPath(devicePath), content, error)) {
-    throw CommandFailure(error);
-  }
+  orFail([&](std::string& error) {
+    return replaceFile(directory.hostPath(devicePath), content, error);
+  });
 }
 
 void writeFile(const DeviceDirectory& directory, std::string_view devicePath,
@@ -224,10 +223,7 @@ std::string bootSession(const Date& now) {
 
 void describeSampleDevice(const DeviceDirectory& directory, const Date& now) {
   constexpr std::string_view kSnapshotFile = "kernel/snapshot.bin";
-  std::string error;
-  if (!directory.makeFolder("controller", error)) {
-    throw CommandFailure(error);
-  }
+  orFail([&](std::string& error) { return directory.makeFolder("controller", error); });
   const Json& data = sampleData();
   Json controller = data.at("controller");
   controller["userClient"]["tunnel"] = writeControllerBuffers(directory, now);

@@ -1,7 +1,6 @@
 #include "sample/SampleDevice.h"
 
 #include <cstdlib>
-#include <string_view>
 #include <vector>
 
 #include "Command.h"
@@ -20,12 +19,10 @@ namespace {
 
 void writeSampleWhitelist(const DeviceDirectory& directory) {
   std::string document;
-  std::string error;
-  const std::optional<PropertyValue> whitelist =
-      valueFromJsonText(sampleData().at("whitelist").dump(), error);
-  if (!whitelist || !writePtree(*whitelist, document, error)) {
-    throw CommandFailure(error);
-  }
+  orFail([&](std::string& error) {
+    const auto whitelist = valueFromJsonText(sampleData().at("whitelist").dump(), error);
+    return whitelist && writePtree(*whitelist, document, error);
+  });
   writeWhitelist(directory, document);
 }
 
@@ -61,10 +58,7 @@ void recordCounters(HostPlatform& device) {
     recordDay(store, yesterday, later);
     return true;
   };
-  std::string error;
-  if (!counters.write(record, error)) {
-    throw CommandFailure(error);
-  }
+  orFail([&](std::string& error) { return counters.write(record, error); });
 }
 
 /// The time that the controller's statistics tell of: now, unless SOURCE_DATE_EPOCH asks for the

@@ -25,10 +25,10 @@ void printFields(const PropertyValue& result, const GenericParserCxt& fields) {
   std::cout << "{\"result\":" << jsonText(result)
             << ",\"error\":" << jsonText(PropertyValue(GetAPIErrorMessage())) << ",\"fields\":[";
   const char* separator = "";
-  for (const GenericParserCxt::Field field : fields) {
+  fields.forEach([&separator](const GenericParserCxt::Field& field) {
     std::cout << separator << "[\"" << field.name << "\"," << field.value << ']';
     separator = ",";
-  }
+  });
   std::cout << ']';
 }
 
@@ -83,12 +83,6 @@ constexpr Layout kLayouts[] = {
 
 constexpr const char* kSnapshot = "snapshot";
 
-const Layout* findLayout(const std::string& name) {
-  const auto* layout = std::find_if(std::begin(kLayouts), std::end(kLayouts),
-                                    [&name](const Layout& each) { return each.name == name; });
-  return layout != std::end(kLayouts) ? layout : nullptr;
-}
-
 /// Prints the whole 64-bit words of the thread's statistics.
 void printSnapshot(Buffer snapshot, const std::string& thread) {
   std::optional<Buffer> statistics;
@@ -113,8 +107,8 @@ struct Arguments {
 
 void decode(const Arguments& arguments) {
   const bool isSnapshot = arguments.layout == kSnapshot;
-  const Layout* layout = findLayout(arguments.layout);
-  if (layout == nullptr && !isSnapshot) {
+  const auto* layout = std::ranges::find(kLayouts, arguments.layout, &Layout::name);
+  if (layout == std::end(kLayouts) && !isSnapshot) {
     throw CLI::ValidationError("LAYOUT", "there is no layout " + arguments.layout);
   }
   if (isSnapshot != arguments.thread.has_value()) {

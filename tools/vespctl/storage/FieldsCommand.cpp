@@ -58,16 +58,8 @@ void printLegacyKeys() {
   });
 }
 
-constexpr std::string_view kindName(FigureKind kind) {
-  switch (kind) {
-    case FigureKind::Counter:
-      return "counter";
-    case FigureKind::Gauge:
-      return "gauge";
-    case FigureKind::Boots:
-      return "boots";
-  }
-  return "";
+constexpr const char* kindName(FigureKind kind) {
+  return kind == FigureKind::Counter ? "counter" : kind == FigureKind::Gauge ? "gauge" : "boots";
 }
 
 void printLinuxFigures() {

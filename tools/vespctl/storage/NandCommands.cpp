@@ -8,8 +8,7 @@
 
 #include "Command.h"
 #include "library/EntryPoints.h"
-#include "platform/host/files/FileDescriptor.h"
-#include "platform/host/files/SystemError.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {
@@ -67,9 +66,9 @@ void addParameter(CLI::App& command, const EntryPointParameter& parameter, Given
 }  // namespace
 
 void addNandCommands(CLI::App& vespctl) {
-  CLI::App* nand = vespctl.add_subcommand("nand", "Asks a device for its storage statistics");
   const auto directory = std::make_shared<std::string>();
-  nand->add_option("DIR", *directory, "The device directory")->required();
+  CLI::App* nand =
+      addDeviceCommand(vespctl, "nand", "Asks a device for its storage statistics", *directory);
   for (const EntryPointRow& row : entryPoints()) {
     CLI::App* command = nand->add_subcommand(row.command, row.help);
     const auto given = std::make_shared<std::vector<GivenArgument>>(row.parameters.size());

@@ -10,8 +10,7 @@
 
 #include "platform/host/files/AtomicFile.h"
 #include "platform/host/files/FileLock.h"
-#include "platform/host/files/NameAside.h"
-#include "platform/host/files/SystemError.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {

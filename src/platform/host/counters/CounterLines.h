@@ -10,7 +10,7 @@
 #include <system_error>
 
 #include "platform/host/counters/CounterStore.h"
-#include "platform/host/documents/NumberText.h"
+#include "platform/host/documents/RealText.h"
 
 namespace vesprun {
 

@@ -4,7 +4,6 @@
 
 #include "common/Calendar.h"
 #include "platform/Guarded.h"
-#include "platform/PreferenceNames.h"
 
 namespace vesprun {
 class HostTallybook::History final : public TBHistory {

@@ -2,10 +2,11 @@
 
 #include <algorithm>
 #include <functional>
-#include <initializer_list>
 #include <string_view>
 
 #include "common/Calendar.h"
+#include "common/LittleEndian.h"
+#include "platform/DeviceInformation.h"
 #include "platform/host/documents/JsonForm.h"
 
 namespace vesprun {
@@ -66,7 +67,7 @@ class Entry {
   }
 
   /// Reads a dictionary with these entries and no others.
-  void fields(std::initializer_list<Field> fields) const;
+  void fields(const std::vector<Field>& fields) const;
 
   /// With tagged objects resolved.
   PropertyValue resolved() const {
@@ -86,16 +87,24 @@ class Entry {
 enum class Presence { Optional, Required };
 constexpr Presence kRequired = Presence::Required;
 
-/// A named entry and its target.
+/// A named entry and what reads it.
 class Field {
  public:
+  using Reader = std::function<void(const Entry&)>;
+
+  Field(std::string_view name, Reader reader) : _name(name), _read(std::move(reader)) {}
   template <typename T>
-  Field(const char* name, T& target, Presence presence = Presence::Optional)
+  Field(std::string_view name, T& target, Presence presence = Presence::Optional)
       : _name(name),
         _presence(presence),
         _read([&target](const Entry& entry) { read(entry, target); }) {}
+  Field(std::string_view name, std::initializer_list<Field> fields)
+      : _name(name),
+        _read([fields = std::vector(fields)](const Entry& entry) { entry.fields(fields); }) {}
+  /// An entry that is read elsewhere.
+  explicit Field(std::string_view name) : _name(name), _read([](const Entry&) {}) {}
 
-  const std::string& name() const { return _name; }
+  std::string_view name() const { return _name; }
 
   void readFrom(const Entry& dictionary) const {
     if (dictionary.dict().contains(_name)) {
@@ -106,15 +115,14 @@ class Field {
   }
 
  private:
-  std::string _name;
-  Presence _presence;
-  std::function<void(const Entry&)> _read;
+  std::string_view _name;
+  Presence _presence = Presence::Optional;
+  Reader _read;
 };
 
-void Entry::fields(std::initializer_list<Field> fields) const {
+void Entry::fields(const std::vector<Field>& fields) const {
   forEachNamed([&fields](const std::string& name, const Entry& entry) {
-    if (std::none_of(fields.begin(), fields.end(),
-                     [&name](const Field& field) { return field.name() == name; })) {
+    if (std::ranges::find(fields, name, &Field::name) == fields.end()) {
       entry.fail("unknown entry");
     }
   });
@@ -122,11 +130,6 @@ void Entry::fields(std::initializer_list<Field> fields) const {
     field.readFrom(*this);
   }
 }
-
-/// An entry that is read elsewhere.
-struct Unread {};
-
-void read(const Entry& /*entry*/, Unread& /*unread*/) {}
 
 void read(const Entry& entry, bool& value) {
   value = entry.as(&PropertyValue::boolean, "not a boolean");
@@ -177,20 +180,19 @@ void read(const Entry& entry, std::optional<T>& value) {
 }
 
 template <typename T>
-void read(const Entry& entry, AnswerDescription<T>& answer) {
-  answer.isNull = entry.isNull();
-  if (!answer.isNull) {
-    read(entry, answer.value);
+void read(const Entry& entry, DescribedAnswer<T>& answer) {
+  answer.emplace();
+  if (!entry.isNull()) {
+    read(entry, *answer);
   }
 }
 
 void read(const Entry& entry, LogLevel& level) {
-  static constexpr std::string_view kLevels[] = {"error", "default", "notice", "info", "debug"};
-  const auto* found = std::find(std::begin(kLevels), std::end(kLevels), entry.text());
-  if (found == std::end(kLevels)) {
+  const auto* found = std::ranges::find(kLogLevelNames, entry.text());
+  if (found == std::end(kLogLevelNames)) {
     entry.fail("not a log level (error, default, notice, info, debug)");
   }
-  level = static_cast<LogLevel>(found - std::begin(kLevels));
+  level = static_cast<LogLevel>(found - std::begin(kLogLevelNames));
 }
 
 void read(const Entry& entry, Date& clock) {
@@ -201,83 +203,17 @@ void read(const Entry& entry, Date& clock) {
   clock = *date;
 }
 
-void read(const Entry& entry, SystemDescription& system) {
-  entry.fields({{"buildVersion", system.buildVersion},
-                {"osVersion", system.osVersion},
-                {"systemVersion", system.systemVersion},
-                {"hardwareModel", system.hardwareModel},
-                {"systemID", system.systemID},
-                {"incidentID", system.incidentID}});
-}
-
-struct DiskUsage {
-  PropertyDict answer;
-};
-
-void read(const Entry& entry, DiskUsage& usage) {
-  Unread unread;
-  entry.fields({{"TotalDiskCapacity", unread},
-                {"TotalDataAvailable", unread},
-                {"AmountDataAvailable", unread}});
-  entry.forEachNamed([&usage](const std::string& name, const Entry& value) {
-    std::int64_t number = 0;
-    read(value, number);
-    usage.answer.set(name, number);
-  });
-}
-
-void read(const Entry& entry, DevicePropertyDescription& properties) {
-  AnswerDescription<DiskUsage> usage;
-  entry.fields({{"InternalBuild", properties.internalBuild},
-                {"DiskUsage", usage},
-                {"InverseDeviceID", properties.inverseDeviceID}});
-  properties.diskUsage.isNull = usage.isNull;
-  if (usage.value) {
-    properties.diskUsage.value = std::move(usage.value->answer);
-  }
-}
-
 void read(const Entry& entry, FileSystemStatistics& volume) {
   entry.fields({{"blockSize", volume.blockSize, kRequired},
                 {"blocks", volume.blocks, kRequired},
                 {"available", volume.availableBlocks, kRequired}});
 }
 
-void read(const Entry& entry, SubmissionDescription& submission) {
-  entry.fields({{"enabled", submission.enabled}, {"fails", submission.fails}});
-}
-
-/// `true` means the same as no entry: every event is wanted.
-struct UsedEvents {
-  std::optional<std::set<std::string, std::less<>>>& names;
-};
-
-void read(const Entry& entry, UsedEvents& used) {
-  if (entry.value() != PropertyValue(true)) {
-    read(entry, used.names);
-  }
-}
-
-void read(const Entry& entry, EventHubDescription& events) {
-  UsedEvents used{events.used};
-  entry.fields({{"available", events.available}, {"used", used}, {"fails", events.fails}});
-}
-
 void read(const Entry& entry, ApplicationDescription& app) {
   entry.fields({{"bundle", app.bundle, kRequired}, {"user", app.user, kRequired}});
 }
 
-void read(const Entry& entry, LanguageDescription& languages) {
-  entry.fields({{"preferred", languages.preferred},
-                {"localizations", languages.localizations},
-                {"country", languages.country}});
-}
-
-void read(const Entry& entry, SupportLibraryDescription& library) {
-  entry.fields({{"available", library.available}, {"missing", library.missing}});
-}
-
-void read(const Entry& entry, KernelDescription::Ticks& ticks) {
+void read(const Entry& entry, DeviceDescription::Ticks& ticks) {
   entry.fields({{"value", ticks.value, kRequired},
                 {"numerator", ticks.ratio.numerator, kRequired},
                 {"denominator", ticks.ratio.denominator, kRequired}});
@@ -285,25 +221,23 @@ void read(const Entry& entry, KernelDescription::Ticks& ticks) {
 
 void read(const Entry& entry, KernelVariable& variable) {
   const PropertyValue value = entry.resolved();
-  if (value.string() != nullptr) {
-    variable = *value.string();
+  if (const std::string* text = value.string()) {
+    variable = KernelVariable::text(*text);
     return;
   }
-  if (value.data() != nullptr) {
-    variable = *value.data();
+  if (const Bytes* data = value.data()) {
+    variable.bytes = *data;
     return;
   }
-  Unread unread;
-  entry.fields({{"u32", unread}, {"u64", unread}});
+  entry.fields({Field("u32"), Field("u64")});
   const bool isNarrow = entry.dict().contains("u32");
   if (isNarrow == entry.dict().contains("u64")) {
     entry.fail("neither a string nor one of u32, u64 and data");
   }
-  if (isNarrow) {
-    read(entry.at("u32"), variable.emplace<std::uint32_t>());
-  } else {
-    read(entry.at("u64"), variable.emplace<std::uint64_t>());
-  }
+  std::uint32_t narrow = 0;
+  std::uint64_t wide = 0;
+  isNarrow ? read(entry.at("u32"), narrow) : read(entry.at("u64"), wide);
+  appendLittleEndian(variable.bytes, narrow | wide, isNarrow ? sizeof narrow : sizeof wide);
 }
 
 void read(const Entry& entry, std::map<std::string, KernelVariable, std::less<>>& variables) {
@@ -312,31 +246,11 @@ void read(const Entry& entry, std::map<std::string, KernelVariable, std::less<>>
   });
 }
 
-void read(const Entry& entry, KernelDescription& kernel) {
-  entry.fields({{"pageSize", kernel.pageSize},
-                {"ticks", kernel.ticks},
-                {"variables", kernel.variables},
-                {"snapshot", kernel.snapshotFile},
-                {"eccError", kernel.eccError}});
-}
-
 void read(const Entry& entry, ChannelDescription& channel) {
   entry.fields({{"name", channel.name, kRequired},
                 {"value", channel.value, kRequired},
                 {"format", channel.format},
                 {"categories", channel.categories}});
-}
-
-struct Channels {
-  std::vector<ChannelDescription>& described;
-  bool& areLive;
-};
-
-void read(const Entry& entry, Channels& channels) {
-  channels.areLive = entry.value() == PropertyValue("live");
-  if (!channels.areLive) {
-    read(entry, channels.described);
-  }
 }
 
 void read(const Entry& entry, UsageDescription& usage) {
@@ -403,28 +317,74 @@ void read(const Entry& entry, RegistryEntryDescription& described) {
                 {"userClient", described.userClient}});
 }
 
+void readDiskUsage(const Entry& entry, DescribedAnswer<PropertyDict>& answer) {
+  answer.emplace();
+  if (entry.isNull()) {
+    return;
+  }
+  entry.fields({Field(kDiskUsageTotalDiskCapacity), Field(kDiskUsageTotalDataAvailable),
+                Field(kDiskUsageAmountDataAvailable)});
+  PropertyDict& usage = answer->emplace();
+  entry.forEachNamed([&usage](const std::string& name, const Entry& value) {
+    std::int64_t number = 0;
+    read(value, number);
+    usage.set(name, number);
+  });
+}
+
 void read(const Entry& entry, DeviceDescription& device) {
-  AnswerDescription<PropertyDict> purgeable;
-  Channels channels{device.channels, device.liveChannels};
-  entry.fields({{"clock", device.clock},
-                {"timeZone", device.timeZone},
-                {"logLevel", device.logLevel},
-                {"system", device.system},
-                {"properties", device.properties},
-                {"userVolume", device.userVolume},
-                {"submission", device.submission},
-                {"logBlacklist", device.logBlacklist},
-                {"events", device.events},
-                {"apps", device.apps},
-                {"languages", device.languages},
-                {"supportLibrary", device.supportLibrary},
-                {"purgeable", purgeable},
-                {"kernel", device.kernel},
-                {"registry", device.registry},
-                {"channels", channels},
-                {"usage", device.usage}});
-  device.purgeableServiceAvailable = !purgeable.isLive();
-  device.purgeable = std::move(purgeable.value);
+  entry.fields(
+      {{"clock", device.clock},
+       {"timeZone", device.timeZone},
+       {"logLevel", device.logLevel},
+       {"system",
+        {{"buildVersion", device.system.buildVersion},
+         {"osVersion", device.system.osVersion},
+         {"systemVersion", device.system.systemVersion},
+         {"hardwareModel", device.system.hardwareModel},
+         {"systemID", device.system.systemID},
+         {"incidentID", device.system.incidentID}}},
+       {"properties",
+        {{"InternalBuild", device.properties.internalBuild},
+         {"DiskUsage",
+          [&](const Entry& usage) { readDiskUsage(usage, device.properties.diskUsage); }},
+         {"InverseDeviceID", device.properties.inverseDeviceID}}},
+       {"userVolume", device.userVolume},
+       {"submission", {{"enabled", device.submission.enabled}, {"fails", device.submission.fails}}},
+       {"logBlacklist", device.logBlacklist},
+       {"events",
+        {{"available", device.events.available},
+         {"used",
+          [&](const Entry& used) {
+            if (used.value() != PropertyValue(true)) {
+              read(used, device.events.used);
+            }
+          }},
+         {"fails", device.events.fails}}},
+       {"apps", device.apps},
+       {"languages",
+        {{"preferred", device.languages.preferred},
+         {"localizations", device.languages.localizations},
+         {"country", device.languages.country}}},
+       {"supportLibrary",
+        {{"available", device.supportLibrary.available},
+         {"missing", device.supportLibrary.missing}}},
+       {"purgeable", device.purgeable},
+       {"kernel",
+        {{"pageSize", device.kernel.pageSize},
+         {"ticks", device.kernel.ticks},
+         {"variables", device.kernel.variables},
+         {"snapshot", device.kernel.snapshotFile},
+         {"eccError", device.kernel.eccError}}},
+       {"registry", device.registry},
+       {"channels",
+        [&](const Entry& channels) {
+          device.liveChannels = channels.value() == PropertyValue("live");
+          if (!device.liveChannels) {
+            read(channels, device.channels);
+          }
+        }},
+       {"usage", device.usage}});
 }
 
 }  // namespace

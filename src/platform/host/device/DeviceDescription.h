@@ -6,7 +6,6 @@
 #include <optional>
 #include <set>
 #include <string>
-#include <variant>
 #include <vector>
 
 #include "common/PropertyDict.h"
@@ -16,74 +15,29 @@
 
 namespace vesprun {
 
-// The content of `device.json`. Where an entry is absent, the running Linux system answers ("live")
-// unless stated otherwise.
-
-/// An entry that can be absent (live) or null (no answer).
+/// Absent: the running Linux system answers. Null in the document: there is no answer.
 template <typename T>
-struct AnswerDescription {
-  bool isNull = false;
-  std::optional<T> value;
+using DescribedAnswer = std::optional<std::optional<T>>;
 
-  bool isLive() const { return !isNull && !value; }
-};
-
-struct SystemDescription {
-  std::optional<std::string> buildVersion;
-  std::optional<std::string> osVersion;
-  std::optional<std::string> systemVersion;
-  std::optional<std::string> hardwareModel;
-  std::optional<std::string> systemID;
-  std::optional<std::string> incidentID;
-};
-
-struct DevicePropertyDescription {
-  bool internalBuild = false;
-  AnswerDescription<PropertyDict> diskUsage;
-  std::optional<std::string> inverseDeviceID;  ///< absent: no answer
-};
-
-struct SubmissionDescription {
-  bool enabled = true;
-  bool fails = false;
-};
-
-struct EventHubDescription {
-  bool available = true;
-  std::optional<std::set<std::string, std::less<>>> used;  ///< absent: every event is wanted
-  std::set<std::string, std::less<>> fails;
-};
+/// What the description says, or else the live answer.
+template <typename T, typename Live>
+T describedOr(const std::optional<T>& described, Live live) {
+  return described ? *described : live();
+}
 
 struct ApplicationDescription {
   std::string bundle;
   bool user;
 };
 
-struct LanguageDescription {
-  std::optional<std::vector<std::string>> preferred;
-  std::optional<std::vector<std::string>> localizations;
-  AnswerDescription<std::string> country;
-};
+/// As the kernel gives it: numbers little-endian, a text with its final NUL.
+struct KernelVariable {
+  static KernelVariable text(const std::string& text) {
+    return {Bytes(text.c_str(), text.c_str() + text.size() + 1), true};
+  }
 
-struct SupportLibraryDescription {
-  bool available = true;
-  std::set<std::string, std::less<>> missing;
-};
-
-/// Text has no final NUL.
-using KernelVariable = std::variant<std::uint32_t, std::uint64_t, std::string, Bytes>;
-
-struct KernelDescription {
-  struct Ticks {
-    std::uint64_t value;
-    TickRatio ratio;
-  };
-
-  std::optional<std::uint64_t> pageSize;
-  AnswerDescription<Ticks> ticks;  ///< null: the ratio cannot be read
-  std::map<std::string, KernelVariable, std::less<>> variables;
-  std::optional<std::string> snapshotFile;
-  std::optional<int> eccError;
+  Bytes bytes;
+  bool isText = false;
 };
 
 struct ChannelDescription {
@@ -134,26 +88,64 @@ struct RegistryEntryDescription {
   std::optional<UserClientDescription> userClient;
 };
 
+/// The content of `device.json`. Where an entry is absent, the running Linux system answers
+/// ("live") unless stated otherwise.
 struct DeviceDescription {
+  using Names = std::set<std::string, std::less<>>;
+  struct Ticks {
+    std::uint64_t value;
+    TickRatio ratio;
+  };
+
   std::optional<Date> clock;  ///< present: the clock stops at it
   std::optional<std::string> timeZone;
   LogLevel logLevel = LogLevel::Info;
-  SystemDescription system;
-  DevicePropertyDescription properties;
-  AnswerDescription<FileSystemStatistics> userVolume;
-  SubmissionDescription submission;
+  struct {
+    std::optional<std::string> buildVersion;
+    std::optional<std::string> osVersion;
+    std::optional<std::string> systemVersion;
+    std::optional<std::string> hardwareModel;
+    std::optional<std::string> systemID;
+    std::optional<std::string> incidentID;
+  } system;
+  struct {
+    bool internalBuild = false;
+    DescribedAnswer<PropertyDict> diskUsage;
+    std::optional<std::string> inverseDeviceID;  ///< absent: no answer
+  } properties;
+  DescribedAnswer<FileSystemStatistics> userVolume;
+  struct {
+    bool enabled = true;
+    bool fails = false;
+  } submission;
   PropertyArray logBlacklist;
-  EventHubDescription events;
+  struct {
+    bool available = true;
+    std::optional<Names> used;  ///< absent: every event is wanted
+    Names fails;
+  } events;
   std::optional<std::vector<ApplicationDescription>> apps;
-  LanguageDescription languages;
-  SupportLibraryDescription supportLibrary;
-  bool purgeableServiceAvailable = false;
-  std::optional<PropertyDict> purgeable;  ///< absent: no answer
-  KernelDescription kernel;
+  struct {
+    std::optional<std::vector<std::string>> preferred;
+    std::optional<std::vector<std::string>> localizations;
+    DescribedAnswer<std::string> country;
+  } languages;
+  struct {
+    bool available = true;
+    Names missing;
+  } supportLibrary;
+  DescribedAnswer<PropertyDict> purgeable;  ///< absent: there is no such service
+  struct {
+    std::optional<std::uint64_t> pageSize;
+    DescribedAnswer<Ticks> ticks;  ///< null: the ratio cannot be read
+    std::map<std::string, KernelVariable, std::less<>> variables;
+    std::optional<std::string> snapshotFile;
+    std::optional<int> eccError;
+  } kernel;
   std::vector<RegistryEntryDescription> registry;
   std::vector<ChannelDescription> channels;
-  bool liveChannels = false;                  ///< the running system's instead
-  AnswerDescription<UsageDescription> usage;  ///< absent: an empty reply at once
+  bool liveChannels = false;                ///< the running system's instead
+  DescribedAnswer<UsageDescription> usage;  ///< absent: an empty reply at once
 };
 
 /// In bytes: 16 MiB.

@@ -3,9 +3,8 @@
 #include <sys/stat.h>
 
 #include <cerrno>
-#include <utility>
 
-#include "platform/host/files/SystemError.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {

@@ -8,12 +8,8 @@
 #include <cerrno>
 #include <cstdio>
 #include <optional>
-#include <string>
 #include <utility>
 #include <vector>
-
-#include "platform/host/files/FolderNames.h"
-#include "platform/host/files/SystemError.h"
 
 namespace vesprun {
 
@@ -77,20 +73,17 @@ int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length)
     return EINVAL;
   }
   for (const std::string& path : files) {
-    switch (take(path, buffer, error)) {
-      case Outcome::Taken:
-        length = kEventLength;
-        return 0;
-      case Outcome::Skipped:
-        break;
-      case Outcome::Unusable:
-        if (!setAside(path, error)) {
-          return EIO;
-        }
-        break;
-      case Outcome::Failed:
-        _log.write(LogLevel::Error, error);
-        return EIO;
+    const Outcome outcome = take(path, buffer, error);
+    if (outcome == Outcome::Taken) {
+      length = kEventLength;
+      return 0;
+    }
+    if (outcome == Outcome::Failed) {
+      _log.write(LogLevel::Error, error);
+      return EIO;
+    }
+    if (outcome == Outcome::Unusable && !setAside(path, error)) {
+      return EIO;
     }
   }
   return ENOENT;

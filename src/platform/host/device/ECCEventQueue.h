@@ -6,7 +6,7 @@
 
 #include "platform/SystemLog.h"
 #include "platform/host/device/DeviceDirectory.h"
-#include "platform/host/files/FileDescriptor.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 
@@ -23,8 +23,7 @@ class ECCEventQueue {
   /// Takes the oldest event that no other process has; its file stays, locked, until `removeTaken`.
   /// An earlier event that was not removed is back in the queue. 0, and the bytes in `buffer`; or
   /// ENOENT when the queue is empty, EINVAL when the buffer is not of an event's length, EROFS on a
-  /// read-only device, EIO, with an error in the system log, when the folder or an event cannot be
-  /// read now or a file in the way cannot be renamed.
+  /// read-only device, EIO, with an error in the system log, for what may be mended.
   ///
   /// A file that can never be an event (of another kind or length, or unreadable) is renamed to
   /// NAME.bin.unusable with an error in the system log, and the next one is taken.

@@ -11,42 +11,39 @@
 #include <cinttypes>
 #include <cstdio>
 #include <cstdlib>
-#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <limits>
-#include <map>
+#include <set>
 #include <sstream>
 #include <string_view>
 #include <utility>
 
 #include "common/LittleEndian.h"
-#include "platform/host/files/FolderNames.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun::live {
 namespace {
 
 /// The first of these entries (NAME=value or NAME="value") that /etc/os-release has.
 std::optional<std::string> osRelease(std::initializer_list<std::string_view> names) {
-  std::map<std::string, std::string, std::less<>> entries;
-  std::ifstream stream("/etc/os-release");
-  for (std::string line; std::getline(stream, line);) {
-    const auto end = line.find('=');
-    if (end == std::string::npos) {
-      continue;
-    }
-    std::string value = line.substr(end + 1);
-    if (value.size() >= 2 && value.front() == '"' && value.back() == '"') {
-      value = value.substr(1, value.size() - 2);
-    }
-    entries.emplace(line.substr(0, end), std::move(value));
-  }
   for (const std::string_view name : names) {
-    if (const auto entry = entries.find(name); entry != entries.end()) {
-      return entry->second;
+    std::ifstream stream("/etc/os-release");
+    for (std::string line; std::getline(stream, line);) {
+      if (line.substr(0, line.find('=')) == name && line.size() > name.size()) {
+        const std::string value = line.substr(name.size() + 1);
+        const bool isQuoted = value.size() >= 2 && value.front() == '"' && value.back() == '"';
+        return isQuoted ? value.substr(1, value.size() - 2) : value;
+      }
     }
   }
   return std::nullopt;
+}
+
+utsname kernelName() {
+  utsname name{};
+  uname(&name);
+  return name;
 }
 
 std::string firstLineOf(const std::string& file) {
@@ -56,10 +53,9 @@ std::string firstLineOf(const std::string& file) {
   return line;
 }
 
-std::string upperCase(std::string text) {
-  std::transform(text.begin(), text.end(), text.begin(),
-                 [](unsigned char c) { return static_cast<char>(std::toupper(c)); });
-  return text;
+std::vector<std::string> namesIn(const std::string& folder) {
+  std::string ignored;
+  return namesInFolder(folder, ignored).value_or(std::vector<std::string>());
 }
 
 /// "en_GB.UTF-8@euro" is {"en", "GB"}; nothing for locales without a language.
@@ -95,9 +91,7 @@ std::optional<LocaleName> processLocale(const char* category) {
 
 void appendDesktopEntries(const std::filesystem::path& folder, bool user,
                           std::vector<ApplicationDescription>& applications) {
-  std::string error;
-  for (const std::string& name :
-       namesInFolder(folder, error).value_or(std::vector<std::string>())) {
+  for (const std::string& name : namesIn(folder)) {
     const std::filesystem::path file(name);
     if (file.extension() == ".desktop") {
       applications.push_back({file.stem(), user});
@@ -108,18 +102,15 @@ void appendDesktopEntries(const std::filesystem::path& folder, bool user,
 }  // namespace
 
 std::string osVersion() {
-  utsname system{};
-  const bool isNamed = uname(&system) == 0;
-  return osRelease({"PRETTY_NAME"})
-      .value_or(isNamed ? std::string(system.sysname) + ' ' + system.release : "Linux");
+  const utsname system = kernelName();
+  return osRelease({"PRETTY_NAME"}).value_or(std::string(system.sysname) + ' ' + system.release);
 }
 
 std::string osBuild() {
-  utsname system{};
-  return osRelease({"BUILD_ID", "VERSION_ID"}).value_or(uname(&system) == 0 ? system.release : "");
+  return osRelease({"BUILD_ID", "VERSION_ID"}).value_or(kernelName().release);
 }
 
-std::optional<Bytes> swapUsage() {
+std::optional<KernelVariable> swapUsage() {
   struct sysinfo system {};
   if (sysinfo(&system) != 0) {
     return std::nullopt;
@@ -132,20 +123,19 @@ std::optional<Bytes> swapUsage() {
   appendLittleEndian(record, totalBytes - freeBytes, 8);
   appendLittleEndian(record, static_cast<std::uint64_t>(sysconf(_SC_PAGESIZE)), 4);
   appendLittleEndian(record, 0, 4);
-  return record;
+  return KernelVariable{std::move(record)};
 }
 
-std::optional<std::string> bootSessionIdentifier() {
-  std::string identifier = upperCase(firstLineOf("/proc/sys/kernel/random/boot_id"));
-  return identifier.empty() ? std::nullopt : std::optional(std::move(identifier));
+std::optional<KernelVariable> bootSessionIdentifier() {
+  std::string identifier = firstLineOf("/proc/sys/kernel/random/boot_id");
+  std::ranges::transform(identifier, identifier.begin(),
+                         [](unsigned char c) { return static_cast<char>(std::toupper(c)); });
+  return identifier.empty() ? std::nullopt : std::optional(KernelVariable::text(identifier));
 }
 
 std::string machineIdentifier() { return firstLineOf("/etc/machine-id"); }
 
-std::string hardwareModel() {
-  utsname system{};
-  return uname(&system) == 0 ? system.machine : "";
-}
+std::string hardwareModel() { return kernelName().machine; }
 
 std::string newIdentifier() {
   std::array<std::uint64_t, 2> bits{};
@@ -199,17 +189,13 @@ std::vector<std::string> preferredLanguages() {
 }
 
 std::vector<std::string> localizations() {
-  std::vector<std::string> languages;
-  std::string error;
-  for (const std::string& name :
-       namesInFolder("/usr/share/locale", error).value_or(std::vector<std::string>())) {
+  std::set<std::string> languages;
+  for (const std::string& name : namesIn("/usr/share/locale")) {
     if (const auto locale = parseLocaleName(name)) {
-      languages.push_back(languageTag(*locale));
+      languages.insert(languageTag(*locale));
     }
   }
-  std::sort(languages.begin(), languages.end());
-  languages.erase(std::unique(languages.begin(), languages.end()), languages.end());
-  return languages;
+  return {languages.begin(), languages.end()};
 }
 
 std::optional<std::string> countryCode() {

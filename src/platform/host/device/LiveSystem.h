@@ -1,6 +1,5 @@
 #pragma once
 
-#include <cstdint>
 #include <optional>
 #include <string>
 #include <vector>
@@ -16,10 +15,10 @@ std::string osVersion();  ///< as /etc/os-release names it, for example "Debian 
 std::string osBuild();
 
 /// "vm.swapusage": total, free and used bytes (u64), page size and a flag (u32).
-std::optional<Bytes> swapUsage();
+std::optional<KernelVariable> swapUsage();
 
-/// In upper case.
-std::optional<std::string> bootSessionIdentifier();
+/// "kern.bootsessionuuid", in upper case.
+std::optional<KernelVariable> bootSessionIdentifier();
 
 std::string machineIdentifier();  ///< empty when there is none
 std::string hardwareModel();      ///< the architecture, for example "x86_64"

@@ -7,14 +7,11 @@
 
 #include <algorithm>
 #include <charconv>
-#include <vector>
+#include <sstream>
 
-#include "platform/host/device/PrunedLogs.h"
+#include "platform/host/documents/JsonForm.h"
 #include "platform/host/files/AtomicFile.h"
-#include "platform/host/files/FileDescriptor.h"
-#include "platform/host/files/FolderNames.h"
-#include "platform/host/files/SystemError.h"
-#include "platform/host/files/WholeFile.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {
@@ -42,6 +39,11 @@ bool markFolder(const DeviceDirectory& directory) {
          status.st_mtim.tv_sec == times[1].tv_sec && status.st_mtim.tv_nsec == times[1].tv_nsec;
 }
 
+const Number* integer(const PropertyDict& line, std::string_view key) {
+  const Number* number = line.findNumber(key);
+  return number != nullptr && !number->isFloatingPoint() ? number : nullptr;
+}
+
 }  // namespace
 
 std::optional<std::uint64_t> logNumber(std::string_view name) {
@@ -50,6 +52,31 @@ std::optional<std::uint64_t> logNumber(std::string_view name) {
   const auto [rest, problem] = std::from_chars(name.data(), end, number);
   return problem == std::errc() && rest != end && *rest == '-' ? std::optional(number)
                                                                : std::nullopt;
+}
+
+std::optional<PrunedLogs> readPrunedLogs(const DeviceDirectory& directory, std::string& error) {
+  bool missing = false;
+  const auto content = readWholeFile(directory.hostPath(kPrunedLogsFile), error, &missing);
+  if (!content && !missing) {
+    return std::nullopt;
+  }
+  PrunedLogs logs;
+  std::istringstream lines(content.value_or(""));
+  std::string malformed;
+  for (std::string line; std::getline(lines, line);) {
+    const std::optional<PropertyValue> value = valueFromJsonText(line, malformed);
+    const PropertyDict* note = value ? value->dict() : nullptr;
+    if (note == nullptr) {
+      continue;
+    }
+    const std::string* name = note->findString("name");
+    const Number* day = integer(*note, "day");
+    const Number* revision = integer(*note, "revision");
+    if (name != nullptr && day != nullptr && revision != nullptr) {
+      logs.push_back({*name, logNumber(*name).value_or(0), day->asInt32(), revision->asInt64()});
+    }
+  }
+  return logs;
 }
 
 LogNumbers::LogNumbers(const DeviceDirectory& directory)

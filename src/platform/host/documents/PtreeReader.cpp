@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <array>
+#include <charconv>
 #include <cstdint>
 #include <exception>
 #include <memory>
@@ -14,9 +15,8 @@
 #include "common/Calendar.h"
 #include "platform/host/documents/Base64.h"
 #include "platform/host/documents/NestedPlace.h"
-#include "platform/host/documents/NumberText.h"
-#include "platform/host/documents/PlainPtree.h"
 #include "platform/host/documents/QuotedText.h"
+#include "platform/host/documents/RealText.h"
 #include "platform/host/documents/XmlText.h"
 
 namespace vesprun {
@@ -38,6 +38,21 @@ struct Fault {
   std::size_t line = 0;  ///< 0: no fault
   std::string message;
 };
+
+std::optional<Number> parseInteger(std::string_view text) {
+  const char* end = text.data() + text.size();
+  std::int64_t integer = 0;
+  if (const auto [stop, failure] = std::from_chars(text.data(), end, integer);
+      failure == std::errc() && stop == end) {
+    return Number(integer);
+  }
+  std::uint64_t large = 0;
+  if (const auto [stop, failure] = std::from_chars(text.data(), end, large);
+      failure == std::errc() && stop == end) {
+    return Number(large);
+  }
+  return std::nullopt;
+}
 
 /// Builds the value as expat goes through the document.
 class PtreeParser {
@@ -481,11 +496,6 @@ std::optional<PropertyValue> readPtree(std::string_view bytes, std::string& erro
 
 std::optional<PropertyValue> readPtreeEntries(std::string_view bytes, std::string& error,
                                               const PtreeEntryVisitor& visit) {
-  if (!visit && bytes.size() <= kLongestPtree) {
-    if (std::optional<PropertyValue> value = readPlainPtree(bytes)) {
-      return value;
-    }
-  }
   return PtreeParser(visit).read(bytes, error);
 }
 

@@ -3,6 +3,7 @@
 #include <string>
 
 #include "common/PropertyValue.h"
+#include "platform/PtreeSerialization.h"
 
 namespace vesprun {
 
@@ -15,5 +16,9 @@ namespace vesprun {
 /// unchanged.
 bool writePtree(const PropertyValue& value, std::string& document, std::string& error);
 bool writePtree(const PropertyDict& dict, std::string& document, std::string& error);
+
+/// Like these, but in two steps, and the text goes to `sink` piece by piece.
+bool isPtree(const PtreeDocument& document, std::string& error);
+void writePtree(const PtreeDocument& document, const PtreeSerialization::Sink& sink);
 
 }  // namespace vesprun

@@ -14,13 +14,13 @@
 #include <memory>
 #include <optional>
 
-#include "platform/host/files/FileDescriptor.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {
 
 constexpr std::size_t kLongestFile = 256 * 1024;
-constexpr std::size_t kMostDevices = 128;
+constexpr std::size_t kMostDevices = 512;
 constexpr std::size_t kLongestName = 40;
 constexpr std::size_t kAddressDigits = 12;
 constexpr std::string_view kClockFile = "clock";
@@ -46,13 +46,11 @@ std::string_view fieldOf(std::string_view text, std::string_view field) {
   const std::string_view label = space == std::string_view::npos ? "" : field.substr(0, space);
   const std::string_view selector = field.substr(space + 1);
   std::string_view line = nextLine(text);
-  if (!label.empty()) {
-    while (nextWord(line) != label) {
-      if (text.empty()) {
-        return {};
-      }
-      line = nextLine(text);
+  while (!label.empty() && nextWord(line) != label) {
+    if (text.empty()) {
+      return {};
     }
+    line = nextLine(text);
   }
   int position = 0;
   const bool isPosition =
@@ -83,19 +81,16 @@ std::optional<std::int64_t> numberOf(std::string_view word) {
 
 /// A device's name as a part of a key: short, without a hardware address, and of safe characters.
 std::string nameInKey(std::string_view name) {
-  const auto isHexDigit = [](char c) { return ('0' <= c && c <= '9') || ('a' <= c && c <= 'f'); };
+  static constexpr std::string_view kSafe =
+      "0123456789abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ-_";
+  static constexpr std::string_view kHexDigits = kSafe.substr(0, 16);
   if (name.size() > kAddressDigits &&
-      std::ranges::all_of(name.substr(name.size() - kAddressDigits), isHexDigit)) {
+      name.substr(name.size() - kAddressDigits).find_first_not_of(kHexDigits) == name.npos) {
     name.remove_suffix(kAddressDigits);
   }
   std::string text(name.substr(0, kLongestName));
   std::ranges::replace_if(
-      text,
-      [](char c) {
-        return !(('0' <= c && c <= '9') || ('a' <= c && c <= 'z') || ('A' <= c && c <= 'Z') ||
-                 c == '-' || c == '_');
-      },
-      '_');
+      text, [](char c) { return kSafe.find(c) == kSafe.npos; }, '_');
   return text;
 }
 
@@ -175,10 +170,8 @@ class FigureReader {
       if (content) {
         const std::string_view word = fieldOf(*content, figure.field);
         value = numberOf(word);
-        if (value) {
-          *value /= figure.divisor;
-        }
-        if (!value || *value < figure.lowest || *value > figure.highest) {
+        if (!value || *value < figure.lowest * figure.divisor ||
+            *value / figure.divisor > figure.highest) {
           complain(path, std::string(figure.field) + (word.empty() ? " is missing"
                                                       : value      ? " is out of range"
                                                                    : " is not a number"));
@@ -186,7 +179,7 @@ class FigureReader {
         }
       }
       if (value || (device.isThere && figure.kind == FigureKind::Counter)) {
-        add(figure, path, device, value.value_or(kUnread));
+        add(figure, path, device, value ? *value / figure.divisor : kUnread);
       }
     }
   }
@@ -214,8 +207,7 @@ class FigureReader {
       return failed(path);
     }
     if (!S_ISREG(status.st_mode)) {
-      complain(path, "not a regular file");
-      return std::nullopt;
+      return complain(path, "not a regular file");
     }
     std::size_t size = 0;
     ssize_t count = 0;
@@ -227,15 +219,13 @@ class FigureReader {
       return failed(path);
     }
     if (size > kLongestFile) {
-      complain(path, "longer than 256 KiB");
-      return std::nullopt;
+      return complain(path, "longer than 256 KiB");
     }
     const std::string_view content(_buffer.get(), size);
     if (size == 0 || !std::ranges::all_of(content, [](char c) {
           return (' ' <= c && c <= '~') || c == '\n' || c == '\t';
         })) {
-      complain(path, size == 0 ? "empty" : "not plain text");
-      return std::nullopt;
+      return complain(path, size == 0 ? "empty" : "not plain text");
     }
     return content;
   }
@@ -255,7 +245,7 @@ class FigureReader {
     return std::string_view(_buffer.get(), static_cast<std::size_t>(size));
   }
 
-  std::optional<std::string_view> failed(const std::string& path) {
+  std::nullopt_t failed(const std::string& path) {
     // Missing, or gone between opening and reading.
     if (errno != ENOENT && errno != ENOTDIR && errno != ENODEV) {
       complain(path, std::strerror(errno));
@@ -280,8 +270,7 @@ class FigureReader {
     };
     const std::unique_ptr<DIR, Close> stream(opendir((_root + folder).c_str()));
     if (!stream) {
-      failed(folder);
-      return std::nullopt;
+      return failed(folder);
     }
     std::vector<std::string> names;
     while (const dirent* entry = readdir(stream.get())) {
@@ -289,8 +278,7 @@ class FigureReader {
         continue;
       }
       if (names.size() == kMostDevices) {
-        complain(folder, "more than 128 devices");
-        return std::nullopt;
+        return complain(folder, "more than " + std::to_string(kMostDevices) + " devices");
       }
       names.emplace_back(entry->d_name);
     }
@@ -298,8 +286,12 @@ class FigureReader {
     return names;
   }
 
-  void complain(const std::string& path, const std::string& problem) {
-    _readings.problems.try_emplace(path, problem);
+  std::nullopt_t complain(const std::string& path, const std::string& problem) {
+    std::string& problems = _readings.problems[path];
+    if (problems.find(problem) == std::string::npos) {
+      problems += (problems.empty() ? "" : ", ") + problem;
+    }
+    return std::nullopt;
   }
 
   const std::string& _root;

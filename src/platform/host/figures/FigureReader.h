@@ -29,7 +29,7 @@ struct FigureReadings {
   std::vector<FigureReading> figures;  ///< counters and gauges, in the order of the table
   std::set<std::string_view> listed;   ///< each `file` with devices, when all of them are known
   std::string boot;                    ///< the identifier of the boot; empty when it is not known
-  std::map<std::string, std::string> problems;  ///< why existing files were left out, by path
+  std::map<std::string, std::string> problems;  ///< what was left out of existing files, by path
 };
 
 /// Reads the figures of the system below `root` (empty: the running one), of the files for which

@@ -178,7 +178,7 @@ bool matches(std::string_view name, std::string_view pattern) {
   name.remove_prefix(special);
   const std::string_view rest = pattern.substr(special + 1);
   if (pattern[special] == '*') {
-    while (!name.empty() && !matches(name, rest)) {
+    while (!name.empty() && name.front() != '.' && !matches(name, rest)) {
       name.remove_prefix(1);
     }
     return matches(name, rest);

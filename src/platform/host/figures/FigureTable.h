@@ -35,7 +35,7 @@ struct LinuxFigure {
 struct DeviceClass {
   std::string_view name;
   /// Names of folders or files, parted by spaces. '#' is for digits, '@' for small letters, at
-  /// least one each, and '*' for anything.
+  /// least one each, and '*' for anything without a dot.
   std::string_view patterns;
   /// What a device is called in keys: "." as it is named here, else as this file in it says. Empty:
   /// it is not named.

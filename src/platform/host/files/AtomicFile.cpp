@@ -6,11 +6,8 @@
 #include <unistd.h>
 
 #include <cerrno>
-#include <cstdio>
 #include <cstring>
 #include <utility>
-
-#include "platform/host/files/SystemError.h"
 
 namespace vesprun {
 namespace {
@@ -19,22 +16,18 @@ constexpr mode_t kOwnerOnly = 0600;
 constexpr std::size_t kWrittenPiece = 64 * 1024;
 constexpr int kMostUnfinished = 100;
 
+bool sync(const FileDescriptor& folder, const std::string& path, std::string& error) {
+  const bool synced = folder.isOpen() && fsync(folder.get()) == 0;
+  if (!synced) {
+    error = systemError(path);
+  }
+  return synced;
+}
+
 }  // namespace
 
-AtomicFile::AtomicFile(std::string folder, FileDescriptor folderDescriptor)
-    : _folder(std::move(folder)), _folderDescriptor(std::move(folderDescriptor)) {}
-
-AtomicFile::AtomicFile(AtomicFile&& other) noexcept
-    : _folder(std::move(other._folder)),
-      _folderDescriptor(std::move(other._folderDescriptor)),
-      _file(std::move(other._file)),
-      _unfinishedName(std::exchange(other._unfinishedName, {})),
-      _pending(std::move(other._pending)),
-      _failure(std::move(other._failure)),
-      _modified(other._modified) {}
-
 AtomicFile::~AtomicFile() {
-  if (!_unfinishedName.empty()) {
+  if (_folderDescriptor.isOpen() && !_unfinishedName.empty()) {
     unlinkat(_folderDescriptor.get(), _unfinishedName.c_str(), 0);
   }
 }
@@ -131,14 +124,6 @@ bool AtomicFile::makeDurable(const std::string& name, std::string& error) {
   return _failure.empty();
 }
 
-bool AtomicFile::syncFolder(std::string& error) const {
-  if (fsync(_folderDescriptor.get()) != 0) {
-    error = systemError(_folder);
-    return false;
-  }
-  return true;
-}
-
 bool AtomicFile::replace(const std::string& name, std::string& error) {
   if (!makeDurable(name, error)) {
     return false;
@@ -149,7 +134,7 @@ bool AtomicFile::replace(const std::string& name, std::string& error) {
     return false;
   }
   _unfinishedName.clear();
-  return syncFolder(error);
+  return sync(_folderDescriptor, _folder, error);
 }
 
 AtomicFile::Added AtomicFile::addNew(const std::string& name, std::string& error) {
@@ -166,7 +151,7 @@ AtomicFile::Added AtomicFile::addNew(const std::string& name, std::string& error
     return Added::Failed;
   }
   unlinkat(folder, std::exchange(_unfinishedName, {}).c_str(), 0);
-  if (!syncFolder(error)) {
+  if (!sync(_folderDescriptor, _folder, error)) {
     unlinkat(folder, name.c_str(), 0);
     return Added::Failed;
   }
@@ -186,12 +171,7 @@ bool replaceFile(const std::string& path, std::string_view content, std::string&
 }
 
 bool flushFolder(const std::string& folder, std::string& error) {
-  const FileDescriptor descriptor = openFolder(folder);
-  if (!descriptor.isOpen() || fsync(descriptor.get()) != 0) {
-    error = systemError(folder);
-    return false;
-  }
-  return true;
+  return sync(openFolder(folder), folder, error);
 }
 
 }  // namespace vesprun

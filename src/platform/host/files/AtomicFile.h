@@ -5,7 +5,7 @@
 #include <string_view>
 
 #include "common/Date.h"
-#include "platform/host/files/FileDescriptor.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 
@@ -19,7 +19,7 @@ class AtomicFile {
   /// The folder must exist.
   static std::optional<AtomicFile> create(const std::string& folder, std::string& error);
 
-  AtomicFile(AtomicFile&& other) noexcept;
+  AtomicFile(AtomicFile&&) = default;
   AtomicFile& operator=(AtomicFile&&) = delete;
   ~AtomicFile();
 
@@ -40,12 +40,12 @@ class AtomicFile {
   Added addNew(const std::string& name, std::string& error);
 
  private:
-  AtomicFile(std::string folder, FileDescriptor folderDescriptor);
+  AtomicFile(std::string folder, FileDescriptor descriptor)
+      : _folder(std::move(folder)), _folderDescriptor(std::move(descriptor)) {}
 
   bool openUnfinished(std::string& error);
   bool writeOut(std::string_view bytes);
   bool makeDurable(const std::string& name, std::string& error);
-  bool syncFolder(std::string& error) const;
   std::string pathOf(const std::string& name) const { return _folder + '/' + name; }
 
   std::string _folder;

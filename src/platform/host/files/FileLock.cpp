@@ -5,8 +5,6 @@
 #include <cerrno>
 #include <thread>
 
-#include "platform/host/files/SystemError.h"
-
 namespace vesprun {
 
 bool takeLock(int descriptor, int operation, std::chrono::milliseconds longestWait,

@@ -5,7 +5,7 @@
 #include <string>
 #include <utility>
 
-#include "platform/host/files/FileDescriptor.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 

@@ -6,15 +6,11 @@
 #include <unistd.h>
 
 #include <cerrno>
-#include <cstdio>
-#include <cstdlib>
 #include <cstring>
 #include <filesystem>
-#include <memory>
+#include <fstream>
 
 #include "platform/host/files/AtomicFile.h"
-#include "platform/host/files/FileLock.h"
-#include "platform/host/files/SystemError.h"
 
 namespace vesprun {
 
@@ -128,31 +124,16 @@ std::optional<std::uint64_t> JsonLines::removeLocked(
   if (!kept) {
     return std::nullopt;
   }
-  const auto close = [](std::FILE* stream) { std::fclose(stream); };
-  const std::unique_ptr<std::FILE, decltype(close)> stream(fdopen(dup(_file.get()), "r"), close);
-  if (!stream) {
-    error = systemError(_path);
-    return std::nullopt;
-  }
-  std::rewind(stream.get());
-  std::unique_ptr<char, decltype(&std::free)> buffer(nullptr, std::free);
-  std::size_t capacity = 0;
+  std::ifstream stream(path);
   std::uint64_t removed = 0;
-  for (;;) {
-    char* text = buffer.release();
-    const ssize_t length = getline(&text, &capacity, stream.get());
-    buffer.reset(text);
-    if (length <= 0) {
-      break;
-    }
-    const std::string_view line(text, static_cast<std::size_t>(length));
-    if (goes(line.substr(0, line.find('\n')))) {
+  for (std::string line; std::getline(stream, line);) {
+    if (goes(line)) {
       ++removed;
     } else {
-      kept->append(line);
+      kept->append(stream.eof() ? line : line + '\n');
     }
   }
-  if (std::ferror(stream.get()) != 0) {
+  if (!stream.is_open() || stream.bad()) {
     error = systemError(_path);
     return std::nullopt;
   }

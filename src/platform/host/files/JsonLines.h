@@ -8,8 +8,8 @@
 #include <string>
 #include <string_view>
 
-#include "platform/host/files/FileDescriptor.h"
 #include "platform/host/files/FileLock.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <cerrno>
 #include <chrono>
+#include <cmath>
 #include <thread>
 #include <utility>
 #include <vector>
@@ -15,14 +16,7 @@ namespace {
 using MonotonicClock = std::chrono::steady_clock;
 using Seconds = std::chrono::duration<double>;
 
-constexpr double kLongestSlice = 1e9;
 constexpr double kPauseAfterFailure = 0.1;
-
-timespec timespecOf(double seconds) {
-  const auto whole = static_cast<std::time_t>(seconds);
-  const double rest = (seconds - static_cast<double>(whole)) * 1e9;
-  return {whole, std::min(static_cast<long>(rest), 999'999'999L)};
-}
 
 }  // namespace
 
@@ -33,7 +27,7 @@ void HostMainLoop::watch(int descriptor, Work whenReady) {
 void HostMainLoop::unwatch(int descriptor) { _watched.erase(descriptor); }
 
 MainLoop::SliceResult HostMainLoop::runMainLoopSlice(double seconds) {
-  const double length = seconds > 0 ? std::min(seconds, kLongestSlice) : 0;  // 0 for NaN as well
+  const double length = seconds > 0 ? seconds : 0;  // 0 for NaN as well
   const auto start = MonotonicClock::now();
   for (bool looked = false; !doQueuedWork(); looked = true) {
     const double left = length - Seconds(MonotonicClock::now() - start).count();
@@ -61,8 +55,8 @@ void HostMainLoop::waitForReadiness(double seconds) {
   for (const auto& [descriptor, whenReady] : _watched) {
     descriptors.push_back({descriptor, POLLIN, 0});
   }
-  const timespec timeout = timespecOf(seconds);
-  const int ready = ppoll(descriptors.data(), descriptors.size(), &timeout, nullptr);
+  const auto timeout = static_cast<int>(std::ceil(std::min(seconds * 1e3, 1e9)));
+  const int ready = poll(descriptors.data(), descriptors.size(), timeout);
   if (ready < 0 && errno != EINTR) {
     // For instance out of memory: a pause keeps the loop from spinning.
     std::this_thread::sleep_for(Seconds(std::min(seconds, kPauseAfterFailure)));

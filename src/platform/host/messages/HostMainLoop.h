@@ -4,15 +4,13 @@
 #include <functional>
 #include <map>
 
-#include "platform/MainLoop.h"
+#include "platform/MessageService.h"
 
 namespace vesprun {
 
 /// The main thread's event loop: a queue of work, and file descriptors whose readiness leads to
-/// more.
-///
-/// An event is one piece of queued work, such as a message's delivery. Readiness alone does not
-/// count: bytes that never become a message do not prolong a slice.
+/// more. An event is one piece of queued work, such as a message's delivery; bytes that never
+/// become a message do not prolong a slice.
 class HostMainLoop final : public MainLoop {
  public:
   using Work = std::function<void()>;

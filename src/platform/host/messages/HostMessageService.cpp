@@ -10,6 +10,7 @@
 #include <map>
 #include <utility>
 
+#include "platform/host/documents/PtreeReader.h"
 #include "platform/host/messages/MessageFraming.h"
 #include "platform/host/messages/ServiceSocket.h"
 
@@ -19,36 +20,30 @@ namespace {
 constexpr std::size_t kMostPeers = 16;
 constexpr std::size_t kReceivedPiece = 64 * 1024;
 
-struct UnixPeer final : PeerConnection {
-  explicit UnixPeer(FileDescriptor descriptor) : socket(std::move(descriptor)) {}
-
-  void setMessageHandler(MessageHandler messageHandler) override {
-    handler = std::move(messageHandler);
-  }
-  void start() override { isStarted = true; }
-
+struct UnixPeer {
   /// Less worth: first a peer that has sent no whole message, then the one silent longest.
   bool isLessWorth(const UnixPeer& other) const {
     return std::pair(hasSentMessage, lastHeard) < std::pair(other.hasSentMessage, other.lastHeard);
   }
 
   FileDescriptor socket;
-  MessageHandler handler;
-  MessageAssembler assembler;
+  MessageAssembler assembler{};
   std::chrono::steady_clock::time_point lastHeard = std::chrono::steady_clock::now();
   bool hasSentMessage = false;
-  bool isStarted = false;
 };
 
 class UnixServiceListener final : public ServiceListener {
  public:
-  UnixServiceListener(ServiceSocket socket, std::string name, PtreeSerialization& serialization,
-                      SystemLog& log, HostMainLoop& mainLoop)
+  UnixServiceListener(ServiceSocket socket, std::string name,
+                      MessageService::MessageHandler handler, SystemLog& log,
+                      HostMainLoop& mainLoop)
       : _socket(std::move(socket)),
         _name(std::move(name)),
-        _serialization(serialization),
+        _handler(std::move(handler)),
         _log(log),
-        _mainLoop(mainLoop) {}
+        _mainLoop(mainLoop) {
+    watchForPeers();
+  }
 
   ~UnixServiceListener() override {
     _mainLoop.unwatch(_socket.descriptor());
@@ -57,16 +52,7 @@ class UnixServiceListener final : public ServiceListener {
     }
   }
 
-  void setPeerHandler(PeerHandler handler) override { _handler = std::move(handler); }
-
-  void start() override {
-    _started = true;
-    watchForPeers();
-  }
-
  private:
-  using PeerPointer = std::shared_ptr<UnixPeer>;
-
   /// Drops the work if the listener is gone by then.
   void queueWork(HostMainLoop::Work work) {
     _mainLoop.queueWork([alive = std::weak_ptr<bool>(_alive), work = std::move(work)] {
@@ -77,9 +63,7 @@ class UnixServiceListener final : public ServiceListener {
   }
 
   void watchForPeers() {
-    if (_started) {
-      _mainLoop.watch(_socket.descriptor(), [this] { acceptPeer(); });
-    }
+    _mainLoop.watch(_socket.descriptor(), [this] { acceptPeer(); });
   }
 
   void acceptPeer() {
@@ -100,68 +84,55 @@ class UnixServiceListener final : public ServiceListener {
     if (_peers.size() == kMostPeers) {
       const auto least =
           std::min_element(_peers.begin(), _peers.end(), [](const auto& left, const auto& right) {
-            return left.second->isLessWorth(*right.second);
+            return left.second.isLessWorth(right.second);
           });
-      drop(*PeerPointer(least->second), "others wait, and it has been silent longest");
+      drop(least->first, "others wait, and it has been silent longest");
     }
-    const auto peer = std::make_shared<UnixPeer>(std::move(socket));
-    _peers.emplace(peer->socket.get(), peer);
-    queueWork([this, peer] { introduce(peer); });
+    const int descriptor = socket.get();
+    _peers.emplace(descriptor, UnixPeer{std::move(socket)});
+    queueWork([this, descriptor] {
+      if (_peers.contains(descriptor)) {
+        _mainLoop.watch(descriptor, [this, descriptor] { receive(descriptor); });
+      }
+    });
   }
 
-  void introduce(const PeerPointer& peer) {
-    if (_handler) {
-      _handler(*peer);
-    }
-    if (peer->isStarted) {
-      _mainLoop.watch(peer->socket.get(), [this, peer] { receive(peer); });
-    } else {
-      drop(*peer, "");
-    }
-  }
-
-  void receive(const PeerPointer& peer) {
-    const ssize_t count = recv(peer->socket.get(), _piece.data(), _piece.size(), MSG_DONTWAIT);
+  void receive(int descriptor) {
+    const ssize_t count = recv(descriptor, _piece.data(), _piece.size(), MSG_DONTWAIT);
     if (count < 0) {
       if (errno != EAGAIN && errno != EINTR) {
-        drop(*peer, std::strerror(errno));
+        drop(descriptor, std::strerror(errno));
       }
       return;
     }
-    peer->lastHeard = std::chrono::steady_clock::now();
-    MessageAssembler& assembler = peer->assembler;
+    UnixPeer& peer = _peers.at(descriptor);
+    peer.lastHeard = std::chrono::steady_clock::now();
+    MessageAssembler& assembler = peer.assembler;
     if (count == 0) {
-      drop(*peer, assembler.isInsideMessage() ? "it ended in the middle of a message" : "");
+      drop(descriptor, assembler.isInsideMessage() ? "it ended in the middle of a message" : "");
       return;
     }
     std::string_view bytes(_piece.data(), static_cast<std::size_t>(count));
     MessageAssembler::Progress progress = assembler.take(bytes);
     for (; progress == MessageAssembler::Progress::Complete; progress = assembler.take(bytes)) {
       std::string error;
-      std::optional<PropertyValue> message = _serialization.parse(assembler.takeDocument(), error);
+      std::optional<PropertyValue> message = readPtree(assembler.takeDocument(), error);
       if (!message) {
-        drop(*peer, error);
+        drop(descriptor, error);
         return;
       }
-      peer->hasSentMessage = true;
-      queueWork([peer, message = *std::move(message)] {
-        if (peer->handler) {
-          peer->handler(message);
-        }
-      });
+      peer.hasSentMessage = true;
+      queueWork([this, message = *std::move(message)] { _handler(message); });
     }
     if (progress == MessageAssembler::Progress::TooLong) {
-      drop(*peer, "a message is longer than " + std::to_string(kLongestMessage) + " bytes");
+      drop(descriptor, "a message is longer than " + std::to_string(kLongestMessage) + " bytes");
     }
   }
 
-  void drop(const UnixPeer& peer, std::string_view why) {
+  void drop(int descriptor, std::string_view why) {
     if (!why.empty()) {
       tell("a peer is dropped: " + std::string(why));
     }
-    const int descriptor = peer.socket.get();
-    // Queued messages may keep the object for a while; end the connection now.
-    shutdown(descriptor, SHUT_RDWR);
     _mainLoop.unwatch(descriptor);
     _peers.erase(descriptor);
     watchForPeers();
@@ -171,19 +142,18 @@ class UnixServiceListener final : public ServiceListener {
 
   ServiceSocket _socket;
   std::string _name;
-  PtreeSerialization& _serialization;
+  MessageService::MessageHandler _handler;
   SystemLog& _log;
   HostMainLoop& _mainLoop;
-  PeerHandler _handler;
-  bool _started = false;
-  std::map<int, PeerPointer> _peers;
+  std::map<int, UnixPeer> _peers;  ///< by descriptor
   std::array<char, kReceivedPiece> _piece{};
   std::shared_ptr<bool> _alive = std::make_shared<bool>(true);
 };
 
 }  // namespace
 
-std::unique_ptr<ServiceListener> HostMessageService::createListener(std::string_view name) {
+std::unique_ptr<ServiceListener> HostMessageService::createListener(std::string_view name,
+                                                                    MessageHandler handler) {
   std::string error;
   std::optional<ServiceSocket> socket = ServiceSocket::listen(_directory, name, error);
   if (!socket) {
@@ -191,7 +161,7 @@ std::unique_ptr<ServiceListener> HostMessageService::createListener(std::string_
     return nullptr;
   }
   return std::make_unique<UnixServiceListener>(*std::move(socket), std::string(name),
-                                               _serialization, _log, _mainLoop);
+                                               std::move(handler), _log, _mainLoop);
 }
 
 }  // namespace vesprun

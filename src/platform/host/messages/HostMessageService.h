@@ -1,7 +1,6 @@
 #pragma once
 
 #include "platform/MessageService.h"
-#include "platform/PtreeSerialization.h"
 #include "platform/SystemLog.h"
 #include "platform/host/device/DeviceDirectory.h"
 #include "platform/host/messages/HostMainLoop.h"
@@ -13,23 +12,22 @@ namespace vesprun {
 ///
 /// A new peer is an event of the main loop, and so is each message. A peer of another user (except
 /// root), one that sends anything else and one that ends inside a message is disconnected, with the
-/// reason in the system log. With 16 peers, a further one takes the place of one without a whole
-/// message, or else of any: the one silent longest. A whole message is delivered even if its peer
-/// is gone.
+/// reason in the system log. With 16 peers, a further one takes the place of the one silent
+/// longest, of those without a whole message first. A message is delivered even if its peer is
+/// gone.
 ///
-/// Listeners must not outlive the references, nor be destroyed by one of their own handlers.
+/// Listeners must not outlive the references, nor be destroyed by their handler.
 class HostMessageService final : public MessageService {
  public:
-  HostMessageService(const DeviceDirectory& directory, PtreeSerialization& serialization,
-                     SystemLog& log, HostMainLoop& mainLoop)
-      : _directory(directory), _serialization(serialization), _log(log), _mainLoop(mainLoop) {}
+  HostMessageService(const DeviceDirectory& directory, SystemLog& log, HostMainLoop& mainLoop)
+      : _directory(directory), _log(log), _mainLoop(mainLoop) {}
 
   /// One at a time for a device: see `ServiceSocket`.
-  std::unique_ptr<ServiceListener> createListener(std::string_view name) override;
+  std::unique_ptr<ServiceListener> createListener(std::string_view name,
+                                                  MessageHandler handler) override;
 
  private:
   const DeviceDirectory& _directory;
-  PtreeSerialization& _serialization;
   SystemLog& _log;
   HostMainLoop& _mainLoop;
 };

@@ -1,6 +1,5 @@
 #pragma once
 
-#include <array>
 #include <cstddef>
 #include <cstdint>
 #include <optional>
@@ -30,14 +29,12 @@ class MessageAssembler {
   std::string takeDocument();
 
   /// True after a part of a message.
-  bool isInsideMessage() const { return _lengthBytes != 0; }
+  bool isInsideMessage() const { return !_frame.empty(); }
 
  private:
-  std::uint32_t announcedLength() const;
+  bool fill(std::string_view& bytes, std::size_t length);
 
-  std::array<char, 4> _length{};
-  std::size_t _lengthBytes = 0;
-  std::string _document;
+  std::string _frame;
 };
 
 }  // namespace vesprun

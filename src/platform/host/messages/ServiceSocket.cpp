@@ -12,8 +12,6 @@
 #include <cstring>
 #include <utility>
 
-#include "platform/host/files/SystemError.h"
-
 namespace vesprun {
 namespace {
 

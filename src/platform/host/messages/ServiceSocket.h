@@ -7,16 +7,13 @@
 #include <string_view>
 
 #include "platform/host/device/DeviceDirectory.h"
-#include "platform/host/files/FileDescriptor.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 
 /// The listening socket of a named service, `run/NAME`, for its owner alone; removed at the end if
-/// it is still ours.
-///
-/// The process holds the lock of the folder `run`, so that two cannot take the name from each
-/// other, and a file without a holder is left from a kill. A device therefore has one service at a
-/// time.
+/// it is still ours. The process holds the lock of the folder `run`: two cannot take the name from
+/// each other, a file without a holder is left from a kill, and a device has one service at a time.
 class ServiceSocket {
  public:
   /// Nothing, with a text in `error`, when another process offers a service or the socket fails.

@@ -1,7 +1,6 @@
 #pragma once
 
 #include <chrono>
-#include <functional>
 #include <map>
 #include <mutex>
 #include <optional>
@@ -14,7 +13,6 @@
 #include "platform/SystemLog.h"
 #include "platform/host/device/DeviceDirectory.h"
 #include "platform/host/files/FileLock.h"
-#include "platform/host/preferences/PreferenceFile.h"
 
 namespace vesprun {
 
@@ -23,12 +21,15 @@ struct PreferenceFolder {
   std::string path;
 };
 
-/// Preferences as ptree documents, one for each domain, in a device folder; `PreferenceFile`
-/// handles those that cannot be read. Safe from any thread.
+/// Preferences as ptree documents in a device folder, DOMAIN.ptree with a dictionary as its root
+/// for each domain. A document is read when it is first needed. Safe from any thread.
+///
+/// A malformed document counts as empty. When there is something to write, it is kept as
+/// DOMAIN.ptree.unreadable-TIME. A file that cannot be read is never overwritten. Both are errors
+/// in the system log, and so is a value that no document can carry, which is refused.
 ///
 /// Users and domains become parts of paths: empty names and names with a leading dot, a slash or
-/// NUL are refused with an error in the system log (once for a domain), read as empty and never
-/// written.
+/// NUL are refused with an error in the system log (once for a domain) and read as empty.
 class HostPreferences final : public Preferences {
  public:
   /// The preferences of a user in var/USER/Library/Preferences. The references must outlive the
@@ -45,21 +46,39 @@ class HostPreferences final : public Preferences {
   /// Synchronizes every domain.
   ~HostPreferences() override;
 
-  HostPreferences(const HostPreferences&) = delete;
-  HostPreferences& operator=(const HostPreferences&) = delete;
-
   std::optional<PropertyValue> LGSPreferencesGetValue(std::string_view key,
                                                       std::string_view domain) override;
   void LGSPreferencesSetValue(std::optional<std::string_view> key,
                               std::optional<PropertyValue> value, std::string_view domain) override;
-  /// Writes only changes, and forgets what was read, so that the next look-up sees what others
-  /// wrote.
+  /// Applies the changes to the current document, whoever wrote it, and writes it if that makes a
+  /// difference. Afterwards the document is read anew.
   bool LGSPreferencesSynchronize(std::string_view domain) override;
 
+  /// With the changes.
   PropertyDict valuesOfDomain(std::string_view domain);
 
  private:
-  PreferenceFile* file(std::string_view domain);
+  struct Content {
+    PropertyDict values;
+    std::string error;  ///< of a document that cannot be used: file, and line or cause
+    bool isMalformed = false;
+  };
+  struct Domain {
+    std::string path;  ///< of the document, on the host
+    std::optional<PropertyDict> stored{};
+    std::map<std::string, std::optional<PropertyValue>> changes{};
+    std::string reported{};  ///< the last complaint, made once
+
+    Content read() const;
+    void applyChanges(PropertyDict& values) const;
+  };
+
+  /// Null for a refused name.
+  Domain* find(std::string_view domain);
+  const PropertyDict& stored(Domain& domain);
+  bool synchronize(Domain& domain);
+  bool writeChanges(const Domain& domain, std::string& error);
+  bool keepAside(const std::string& path, std::string& error);
 
   const DeviceDirectory& _device;
   Clock& _clock;
@@ -67,7 +86,7 @@ class HostPreferences final : public Preferences {
   std::string _folder;  ///< empty for a refused user
   std::chrono::milliseconds _longestWait = kLongestLockWait;
   std::mutex _mutex;
-  std::map<std::string, PreferenceFile, std::less<>> _files;
+  std::map<std::string, Domain, std::less<>> _domains;
   std::set<std::string, std::less<>> _refused;  ///< domains
 };
 

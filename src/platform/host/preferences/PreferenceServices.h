@@ -6,9 +6,6 @@
 #include <string>
 #include <utility>
 
-#include "platform/ServicesClient.h"
-#include "platform/SystemConfiguration.h"
-#include "platform/UserDefaults.h"
 #include "platform/host/device/DeviceDescription.h"
 #include "platform/host/preferences/HostPreferences.h"
 
@@ -73,25 +70,6 @@ class HostSystemConfiguration final : public LGSSystemConfiguration {
   const DeviceDescription& _description;
   HostPreferences _values;
   std::set<std::string, std::less<>> _changed;  ///< domains to be written
-};
-
-/// One more domain among the mobile user's preferences.
-class HostUserDefaults final : public UserDefaults {
- public:
-  explicit HostUserDefaults(Preferences& preferences) : _preferences(preferences) {}
-
-  std::optional<PropertyValue> valueForKey(std::string_view key) override {
-    return _preferences.LGSPreferencesGetValue(key, kDomain);
-  }
-  void setValueForKey(std::optional<PropertyValue> value, std::string_view key) override {
-    _preferences.LGSPreferencesSetValue(key, std::move(value), kDomain);
-  }
-  bool synchronize() override { return _preferences.LGSPreferencesSynchronize(kDomain); }
-
- private:
-  static constexpr std::string_view kDomain = "vesprun";
-
-  Preferences& _preferences;
 };
 
 }  // namespace vesprun

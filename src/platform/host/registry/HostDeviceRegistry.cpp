@@ -21,28 +21,27 @@ void HostDeviceRegistry::layOut(const std::vector<RegistryEntryDescription>& ent
   _nodes[parent].end = _nodes.size();
 }
 
-RegistryHandle HostDeviceRegistry::handOut(Object object) {
-  _objects.emplace(++_lastHandle, object);
+RegistryHandle HostDeviceRegistry::handOut(std::size_t node) {
+  _entries.emplace(++_lastHandle, node);
   return _lastHandle;
 }
 
 const HostDeviceRegistry::Node* HostDeviceRegistry::nodeOf(RegistryHandle entry) const {
-  const auto object = _objects.find(entry);
-  const Entry* found = object != _objects.end() ? std::get_if<Entry>(&object->second) : nullptr;
-  return found != nullptr ? &_nodes[found->node] : nullptr;
+  const auto found = _entries.find(entry);
+  return found != _entries.end() ? &_nodes[found->second] : nullptr;
 }
 
 RegistryHandle HostDeviceRegistry::DevRegServiceGetMatchingService(const std::string& className) {
   for (std::size_t node = 0; node < _nodes.size(); ++node) {
     const RegistryEntryDescription& entry = *_nodes[node].description;
     if (entry.matching && conformsTo(entry, className)) {
-      return handOut(Entry{node});
+      return handOut(node);
     }
   }
   return 0;
 }
 
-RegistryHandle HostDeviceRegistry::DevRegRegistryGetRootEntry() { return handOut(Entry{0}); }
+RegistryHandle HostDeviceRegistry::DevRegRegistryGetRootEntry() { return handOut(0); }
 
 RegistryHandle HostDeviceRegistry::DevRegRegistryEntryCreateIterator(RegistryHandle entry) {
   const Node* node = nodeOf(entry);
@@ -50,13 +49,15 @@ RegistryHandle HostDeviceRegistry::DevRegRegistryEntryCreateIterator(RegistryHan
     return 0;
   }
   const auto place = static_cast<std::size_t>(node - _nodes.data());
-  return handOut(Iterator{place + 1, node->end});
+  _iterators.emplace(++_lastHandle, Iterator{place + 1, node->end});
+  return _lastHandle;
 }
 
 RegistryHandle HostDeviceRegistry::DevRegIteratorNext(RegistryHandle iterator) {
-  const auto object = _objects.find(iterator);
-  Iterator* range = object != _objects.end() ? std::get_if<Iterator>(&object->second) : nullptr;
-  return range != nullptr && range->next < range->end ? handOut(Entry{range->next++}) : 0;
+  const auto range = _iterators.find(iterator);
+  return range != _iterators.end() && range->second.next < range->second.end
+             ? handOut(range->second.next++)
+             : 0;
 }
 
 bool HostDeviceRegistry::DevRegObjectConformsTo(RegistryHandle object,
@@ -66,7 +67,7 @@ bool HostDeviceRegistry::DevRegObjectConformsTo(RegistryHandle object,
 }
 
 void HostDeviceRegistry::DevRegObjectRelease(RegistryHandle object) {
-  if (object != 0 && _objects.erase(object) == 0) {
+  if (object != 0 && _entries.erase(object) + _iterators.erase(object) == 0) {
     ++_falseReleases;
   }
 }

@@ -2,7 +2,6 @@
 
 #include <cstdint>
 #include <unordered_map>
-#include <variant>
 #include <vector>
 
 #include "platform/DeviceRegistry.h"
@@ -35,21 +34,16 @@ class HostDeviceRegistry : public DeviceRegistry {
                                                std::uint64_t input, std::uint64_t& output) override;
 
   /// Handles that are out, and returns of handles that were not.
-  std::size_t openObjects() const { return _objects.size(); }
+  std::size_t openObjects() const { return _entries.size() + _iterators.size(); }
   std::size_t openConnections() const { return _connections.size(); }
   std::size_t falseReleases() const { return _falseReleases; }
 
  private:
-  /// By place in `_nodes`.
-  struct Entry {
-    std::size_t node;
-  };
-  /// The entries from `next` up to, but not including, `end`.
+  /// The entries from `next` up to, but not including, `end`, by place in `_nodes`.
   struct Iterator {
     std::size_t next;
     std::size_t end;
   };
-  using Object = std::variant<Entry, Iterator>;
 
   /// The entries below a node are those after it, up to `end`.
   struct Node {
@@ -59,7 +53,7 @@ class HostDeviceRegistry : public DeviceRegistry {
   };
 
   void layOut(const std::vector<RegistryEntryDescription>& entries, std::size_t parent);
-  RegistryHandle handOut(Object object);
+  RegistryHandle handOut(std::size_t node);
   /// Null for any other handle.
   const Node* nodeOf(RegistryHandle entry) const;
 
@@ -67,7 +61,8 @@ class HostDeviceRegistry : public DeviceRegistry {
   const DeviceDirectory& _directory;
   SystemLog& _log;
   std::vector<Node> _nodes;  ///< the root, then everything below it, parents before children
-  std::unordered_map<RegistryHandle, Object> _objects;
+  std::unordered_map<RegistryHandle, std::size_t> _entries;  ///< places in `_nodes`
+  std::unordered_map<RegistryHandle, Iterator> _iterators;
   std::unordered_map<RegistryHandle, SimulatedDriver> _connections;
   RegistryHandle _lastHandle = 0;
   std::size_t _falseReleases = 0;

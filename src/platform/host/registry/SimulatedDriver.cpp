@@ -3,11 +3,10 @@
 #include <algorithm>
 #include <bit>
 #include <cstring>
-#include <iterator>
 #include <limits>
 
 #include "common/LittleEndian.h"
-#include "platform/host/files/WholeFile.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 namespace {

@@ -2,7 +2,6 @@
 
 #include <cstdint>
 #include <span>
-#include <string>
 
 #include "platform/DeviceRegistry.h"
 #include "platform/SystemLog.h"

@@ -4,9 +4,8 @@
 #include <time.h>
 
 #include <cstdlib>
-#include <utility>
 
-#include "platform/host/files/WholeFile.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 
@@ -26,9 +25,6 @@ std::string HostClock::localDateText(const Date& date) {
   char text[64];
   return {text, strftime(text, sizeof text, "%Y-%m-%d %H:%M:%S %z", &local)};
 }
-
-ProcessTimeZone::ProcessTimeZone(ProcessTimeZone&& other) noexcept
-    : _isSet(std::exchange(other._isSet, false)), _before(std::move(other._before)) {}
 
 ProcessTimeZone::~ProcessTimeZone() {
   if (_isSet) {

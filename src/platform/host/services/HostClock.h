@@ -25,8 +25,8 @@ class HostClock : public Clock {
 class ProcessTimeZone {
  public:
   ProcessTimeZone() = default;
-  ProcessTimeZone(ProcessTimeZone&& other) noexcept;
-  ProcessTimeZone& operator=(ProcessTimeZone&&) = delete;
+  ProcessTimeZone(const ProcessTimeZone&) = delete;
+  ProcessTimeZone& operator=(const ProcessTimeZone&) = delete;
   /// Restores the zone from before `set`.
   ~ProcessTimeZone();
 

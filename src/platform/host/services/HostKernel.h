@@ -10,7 +10,7 @@ namespace vesprun {
 /// The described kernel variables and figures, or those of Linux.
 class HostKernel : public Kernel {
  public:
-  HostKernel(const KernelDescription& description, const DeviceDirectory& directory, SystemLog& log)
+  HostKernel(const DeviceDescription& description, const DeviceDirectory& directory, SystemLog& log)
       : _description(description), _directory(directory), _log(log), _eccEvents(directory, log) {}
 
   int sysctlbyname(const std::string& name, std::span<std::uint8_t> buffer,
@@ -26,7 +26,7 @@ class HostKernel : public Kernel {
  private:
   std::optional<KernelVariable> variable(const std::string& name) const;
 
-  const KernelDescription& _description;
+  const DeviceDescription& _description;
   const DeviceDirectory& _directory;
   SystemLog& _log;
   ECCEventQueue _eccEvents;

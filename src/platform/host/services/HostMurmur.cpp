@@ -13,16 +13,18 @@
 
 namespace vesprun {
 
-/// The threads of replies. Feeds, and so the handlers that hold them, share it and may outlive the
-/// service; by then it holds no thread.
-class HostMurmur::Replies {
+/// Holds the threads of replies. Handlers that keep it may outlive the service; by then it holds
+/// none.
+class HostMurmur::Feed final : public UsageFeed {
  public:
-  Replies(const AnswerDescription<UsageDescription>& description, SystemLog& log)
-      : _description(description), _log(log) {}
+  Feed(const DeviceDescription& description, SystemLog& log)
+      : _usage(describedOr(description.usage, [] { return std::optional(UsageDescription()); })),
+        _log(log) {}
 
-  void send(UsageFeed::ReplyHandler handler) {
+  void usageToDateForNameKindReply(const std::set<std::string>& /*names*/, UsageNameKind /*kind*/,
+                                   ReplyHandler handler) override {
     const std::lock_guard lock(_mutex);
-    if (_ended || _description.isNull) {
+    if (_ended || !_usage) {
       return;
     }
     try {
@@ -46,21 +48,19 @@ class HostMurmur::Replies {
   }
 
  private:
-  void reply(const UsageFeed::ReplyHandler& handler) {
+  void reply(const ReplyHandler& handler) {
     constexpr double kLongestDelay = 1e8;  // three years; far more would overflow the clock
-    static const UsageDescription kEmptyAtOnce;
-    const UsageDescription& usage = _description.value ? *_description.value : kEmptyAtOnce;
-    const std::chrono::duration<double> delay(std::min(usage.delaySeconds, kLongestDelay));
+    const std::chrono::duration<double> delay(std::min(_usage->delaySeconds, kLongestDelay));
     {
       std::unique_lock lock(_mutex);
       if (_endedChanged.wait_for(lock, delay, [this] { return _ended; })) {
         return;
       }
     }
-    runGuarded(_log, "usage feed", [&] { handler(&usage.records); });
+    runGuarded(_log, "usage feed", [&] { handler(&_usage->records); });
   }
 
-  const AnswerDescription<UsageDescription>& _description;
+  const std::optional<UsageDescription> _usage;  ///< nothing: it never replies
   SystemLog& _log;
   std::mutex _mutex;
   std::condition_variable _endedChanged;
@@ -68,32 +68,13 @@ class HostMurmur::Replies {
   std::vector<std::thread> _threads;
 };
 
-class HostMurmur::Feed final : public UsageFeed {
- public:
-  Feed(std::shared_ptr<UsageWorkspace> workspace, std::shared_ptr<Replies> replies)
-      : _workspace(std::move(workspace)), _replies(std::move(replies)) {}
+HostMurmur::HostMurmur(const DeviceDescription& description, SystemLog& log)
+    : _feed(std::make_shared<Feed>(description, log)) {}
 
-  void usageToDateForNameKindReply(const std::set<std::string>& /*names*/, UsageNameKind /*kind*/,
-                                   ReplyHandler reply) override {
-    _replies->send(std::move(reply));
-  }
+HostMurmur::~HostMurmur() { _feed->end(); }
 
- private:
-  std::shared_ptr<UsageWorkspace> _workspace;
-  std::shared_ptr<Replies> _replies;
-};
-
-HostMurmur::HostMurmur(const AnswerDescription<UsageDescription>& description, SystemLog& log)
-    : _replies(std::make_shared<Replies>(description, log)) {}
-
-HostMurmur::~HostMurmur() { _replies->end(); }
-
-std::shared_ptr<UsageWorkspace> HostMurmur::createUsageWorkspace(std::string_view /*endpoint*/) {
-  return std::make_shared<UsageWorkspace>();
-}
-
-std::shared_ptr<UsageFeed> HostMurmur::createUsageFeed(std::shared_ptr<UsageWorkspace> workspace) {
-  return std::make_shared<Feed>(std::move(workspace), _replies);
+std::shared_ptr<UsageFeed> HostMurmur::createUsageFeed(const UsageWorkspace& /*workspace*/) {
+  return _feed;
 }
 
 }  // namespace vesprun

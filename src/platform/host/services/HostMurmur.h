@@ -13,19 +13,17 @@ namespace vesprun {
 class HostMurmur final : public Murmur {
  public:
   /// The references, and all that handlers use, must outlive the object.
-  HostMurmur(const AnswerDescription<UsageDescription>& description, SystemLog& log);
+  HostMurmur(const DeviceDescription& description, SystemLog& log);
   ~HostMurmur() override;
   HostMurmur(const HostMurmur&) = delete;
   HostMurmur& operator=(const HostMurmur&) = delete;
 
-  std::shared_ptr<UsageWorkspace> createUsageWorkspace(std::string_view endpoint) override;
-  std::shared_ptr<UsageFeed> createUsageFeed(std::shared_ptr<UsageWorkspace> workspace) override;
+  std::shared_ptr<UsageFeed> createUsageFeed(const UsageWorkspace& workspace) override;
 
  private:
-  class Replies;
   class Feed;
 
-  std::shared_ptr<Replies> _replies;
+  std::shared_ptr<Feed> _feed;
 };
 
 }  // namespace vesprun

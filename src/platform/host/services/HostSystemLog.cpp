@@ -9,31 +9,6 @@
 #include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {
-namespace {
-
-constexpr std::string_view levelName(LogLevel level) {
-  switch (level) {
-    case LogLevel::Error:
-      return "error";
-    case LogLevel::Default:
-      return "default";
-    case LogLevel::Notice:
-      return "notice";
-    case LogLevel::Info:
-      return "info";
-    case LogLevel::Debug:
-      return "debug";
-  }
-  return "";
-}
-
-}  // namespace
-
-HostSystemLog::HostSystemLog(const DeviceDirectory& directory, Clock& clock, LogLevel lowestKept)
-    : _directory(directory),
-      _clock(clock),
-      _lowestKept(lowestKept),
-      _lines(directory.hostPath("outbox/log.jsonl")) {}
 
 void HostSystemLog::write(LogLevel level, std::string_view message) {
   if (!keeps(level)) {
@@ -43,7 +18,8 @@ void HostSystemLog::write(LogLevel level, std::string_view message) {
   try {
     // Assembled here: a message may hold a long list, which no value should copy.
     std::string line =
-        jsonText(PropertyDict{{"time", dateText(_clock.now())}, {"level", levelName(level)}});
+        jsonText(PropertyDict{{"time", dateText(_clock.now())},
+                              {"level", kLogLevelNames[static_cast<std::size_t>(level)]}});
     line.back() = ',';
     line.reserve(line.size() + message.size() + message.size() / 8 + 32);
     line += "\"message\":";

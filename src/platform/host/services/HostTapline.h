@@ -11,11 +11,17 @@ class HostTapline final : public Tapline {
  public:
   explicit HostTapline(const DeviceDescription& description) : _description(description) {}
 
-  std::unique_ptr<TaplineChannels> TaplineCopyChannelsInCategories(
+  std::optional<TaplineChannels> TaplineCopyChannelsInCategories(
       std::uint64_t categoryMask, std::uint64_t firstSelection,
       std::uint64_t secondSelection) override;
-  std::unique_ptr<TaplineSubscription> TaplineCreateSubscription(
-      const TaplineChannels& wanted, std::unique_ptr<TaplineChannels>& subscribed) override;
+  std::optional<TaplineSubscription> TaplineCreateSubscription(
+      const TaplineChannels& wanted) override {
+    return TaplineSubscription{wanted};
+  }
+  std::optional<TaplineChannels> TaplineCreateSamples(
+      const TaplineSubscription& subscription) override {
+    return subscription.channels;
+  }
 
  private:
   const DeviceDescription& _description;

@@ -14,13 +14,13 @@ namespace {
 using ::testing::ElementsAre, ::testing::IsEmpty;
 
 TEST(LiveSystem, TheSwapRecordIsTotalFreeUsedAndPageSize) {
-  const std::optional<Bytes> record = live::swapUsage();
+  const std::optional<KernelVariable> record = live::swapUsage();
   struct sysinfo system {};
   ASSERT_EQ(sysinfo(&system), 0);
   ASSERT_TRUE(record);
-  ASSERT_EQ(record->size(), 32U);
+  ASSERT_EQ(record->bytes.size(), 32U);
   const auto field = [&](std::size_t at) {
-    return loadLittleEndian<std::uint64_t>(record->data() + at);
+    return loadLittleEndian<std::uint64_t>(record->bytes.data() + at);
   };
   EXPECT_EQ(field(0), std::uint64_t{system.totalswap} * system.mem_unit);
   EXPECT_EQ(field(8) + field(16), field(0));

@@ -1,13 +1,12 @@
-#include "platform/host/files/WholeFile.h"
+#include "platform/host/files/Files.h"
 
-#include <fcntl.h>
+#include <dirent.h>
 #include <sys/stat.h>
-#include <unistd.h>
 
-#include <cerrno>
+#include <algorithm>
+#include <memory>
 
-#include "platform/host/files/FileDescriptor.h"
-#include "platform/host/files/SystemError.h"
+#include "common/Calendar.h"
 
 namespace vesprun {
 namespace {
@@ -54,6 +53,42 @@ std::optional<std::string> readWholeFile(const std::string& path, std::string& e
     }
   }
   return content;
+}
+
+// The standard library's iterator ends the process when memory runs out.
+std::optional<std::vector<std::string>> namesInFolder(const std::string& folder,
+                                                      std::string& error) {
+  struct Close {
+    void operator()(DIR* stream) const { closedir(stream); }
+  };
+  std::vector<std::string> names;
+  const std::unique_ptr<DIR, Close> stream(opendir(folder.c_str()));
+  if (!stream && errno == ENOENT) {
+    return names;
+  }
+  for (errno = stream ? 0 : errno; stream;) {
+    const dirent* const entry = readdir(stream.get());
+    if (entry == nullptr) {
+      break;
+    }
+    const std::string_view name = entry->d_name;
+    if (name != "." && name != "..") {
+      names.emplace_back(name);
+    }
+    errno = 0;
+  }
+  if (errno != 0) {
+    error = systemError(folder);
+    return std::nullopt;
+  }
+  std::sort(names.begin(), names.end());
+  return names;
+}
+
+std::string nameAside(const std::string& path, std::string_view why, Clock& clock) {
+  std::string time = dateText({clock.now().seconds, 0});
+  std::erase_if(time, [](char c) { return c == '-' || c == ':'; });
+  return path + '.' + std::string(why) + '-' + time;
 }
 
 }  // namespace vesprun

@@ -1,4 +1,4 @@
-#include "platform/host/device/Outbox.h"
+#include "platform/host/services/HostOutbox.h"
 
 #include <unistd.h>
 
@@ -7,6 +7,7 @@
 #include <optional>
 
 #include "common/Calendar.h"
+#include "platform/host/device/LiveSystem.h"
 #include "platform/host/device/LogNumbers.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/files/AtomicFile.h"
@@ -15,16 +16,6 @@ namespace vesprun {
 namespace {
 
 constexpr std::string_view kPtreeLogType = "193";  // the other logs are text
-
-class OutboxLogFile : public LogFileHandle {
- public:
-  explicit OutboxLogFile(AtomicFile& file) : _file(file) {}
-
-  bool write(std::string_view bytes) override { return _file.append(bytes); }
-
- private:
-  AtomicFile& _file;
-};
 
 std::string baseName(std::uint64_t number, std::string_view type, std::string_view name) {
   char digits[24];
@@ -45,7 +36,35 @@ AtomicFile::Added addHeader(const std::string& folder, const std::string& name,
 
 }  // namespace
 
-bool Outbox::append(const std::string& file, const PropertyDict& entries) {
+bool HostOutbox::EventHubIsEventUsed(std::string_view event) {
+  return !_description.events.used || _description.events.used->contains(event);
+}
+
+bool HostOutbox::EventHubSendEventLazy(std::string_view event, const PayloadBuilder& build) {
+  if (!_description.events.available || _description.events.fails.contains(event)) {
+    return false;
+  }
+  return !EventHubIsEventUsed(event) ||
+         append("events.jsonl", {{"event", event}, {"payload", build()}});
+}
+
+void HostOutbox::PostNotification(std::string_view name) {
+  append("notifications.jsonl", {{"name", name}});
+}
+
+bool HostOutbox::FLLogStructuredData(std::int32_t type, const PropertyDict& record) {
+  return append("records.jsonl", {{"type", type}, {"record", record}});
+}
+
+std::string HostOutbox::LGSOSVersion() {
+  return describedOr(_description.system.osVersion, live::osVersion);
+}
+
+PropertyDict HostOutbox::CopySystemVersionDictionary() {
+  return {{"ProductBuildVersion", describedOr(_description.system.buildVersion, live::osBuild)}};
+}
+
+bool HostOutbox::append(const std::string& file, const PropertyDict& entries) {
   PropertyDict line{{"time", dateText(_clock.now())}};
   line.merge(entries);
   const std::lock_guard lock(_mutex);
@@ -58,18 +77,21 @@ bool Outbox::append(const std::string& file, const PropertyDict& entries) {
   return false;
 }
 
-bool Outbox::submitLog(std::string_view type, std::string_view name, const PropertyDict* header,
-                       const Logsmith::LogWriter& writer) {
+bool HostOutbox::LGSWriteLogForSubmission(std::string_view logType, std::string_view logName,
+                                          const PropertyDict* header, const LogWriter& writer) {
+  if (_description.submission.fails) {
+    return false;
+  }
   std::string error;
-  if (writeLog(type, name, header, writer, error)) {
+  if (writeLog(logType, logName, header, writer, error)) {
     return true;
   }
   _log.write(LogLevel::Error, error);
   return false;
 }
 
-bool Outbox::writeLog(std::string_view type, std::string_view name, const PropertyDict* header,
-                      const Logsmith::LogWriter& writer, std::string& error) const {
+bool HostOutbox::writeLog(std::string_view type, std::string_view name, const PropertyDict* header,
+                          const LogWriter& writer, std::string& error) const {
   const std::optional<std::string> folder = _directory.makeFolder(kLogFolder, error);
   if (!folder) {
     return false;
@@ -79,8 +101,7 @@ bool Outbox::writeLog(std::string_view type, std::string_view name, const Proper
   if (!file) {
     return false;
   }
-  OutboxLogFile handle(*file);
-  writer(handle);
+  writer([&file](std::string_view bytes) { return file->append(bytes); });
   // The machine's clock may be another one.
   const Date time = _clock.now();
   file->setModificationTime(time);
