@@ -6,6 +6,7 @@
 
 #include "NANDInfo/StructuredLogState.h"
 #include "buffers/DeviceBuffers.h"
+#include "support/ScarceMemory.h"
 #include "support/TestDevice.h"
 
 namespace vesprun {
@@ -88,6 +89,14 @@ TEST_F(NANDLogWriter, WritesOnceInSevenDays) {
   EXPECT_THAT(device.log(),
               testing::Contains("default: NANDLogWriter:Last written at 2024-02-27 10:15:02 +0000 "
                                 "current 2024-03-05 09:15:02 +0000 :skipped"));
+}
+
+TEST_F(NANDLogWriter, SaysThatMemoryRanOut) {
+  const PropertyDict fields{{"long", PropertyArray(5000, 1)}};
+  largestAllocation = 4000;
+  NLW_WriteLog("165", &fields);
+  largestAllocation = SIZE_MAX;
+  EXPECT_THAT(device.log(), testing::ElementsAre("error: An exception occurred: std::bad_alloc"));
 }
 
 TEST(NANDLogSubmission, KeepsTheDateWhenItFails) {
