@@ -20,9 +20,9 @@ class Kernel {
  public:
   virtual ~Kernel() = default;
 
-  /// Reads a variable into `buffer`. 0, and the bytes written in `length`; or a system error number,
-  /// and `buffer` untouched. The variable must have the buffer's size; text, with its final NUL, may
-  /// be shorter.
+  /// Reads a variable into `buffer`. 0, and the bytes written in `length`; or a system error
+  /// number, and `buffer` untouched. The variable must have the buffer's size; text, with its final
+  /// NUL, may be shorter.
   ///
   /// "kern.next_ecc_event" (72 bytes) is a queue: each read takes one event; error 2 when it is
   /// empty. An event that is not acknowledged comes back with the next process.

@@ -43,8 +43,8 @@ class UsageFeed {
 ///
 /// The platform ends this service first: it waits for a running handler and drops the others. A
 /// handler may use only services that are safe from any thread (`Tallybook`, `Preferences`,
-/// `PtreeSerialization`, `SystemLog`), by references taken before: another platform may be installed
-/// by then.
+/// `PtreeSerialization`, `SystemLog`), by references taken before: another platform may be
+/// installed by then.
 class Murmur {
  public:
   virtual ~Murmur() = default;

@@ -54,22 +54,14 @@ struct HostPlatform::Services {
 };
 
 HostPlatform::HostPlatform(std::unique_ptr<Services> services)
-    : Platform{services->clock,
-               services->deviceInformation,
-               services->deviceRegistry,
-               services->outbox,
-               services->fileSystem,
-               services->kernel,
-               services->outbox,
-               services->mainLoop,
-               services->messageService,
-               services->murmur,
-               services->preferences,
-               services->ptreeSerialization,
-               services->servicesClient,
-               services->systemConfiguration,
-               services->systemLog,
-               services->tallybook,
+    : Platform{services->clock,          services->deviceInformation,
+               services->deviceRegistry, services->outbox,
+               services->fileSystem,     services->kernel,
+               services->outbox,         services->mainLoop,
+               services->messageService, services->murmur,
+               services->preferences,    services->ptreeSerialization,
+               services->servicesClient, services->systemConfiguration,
+               services->systemLog,      services->tallybook,
                services->tapline},
       _services(std::move(services)) {}
 
