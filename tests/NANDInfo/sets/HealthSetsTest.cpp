@@ -32,24 +32,25 @@ class HealthSetsTest : public StatisticsDevice {
 };
 
 TEST_F(HealthSetsTest, FiguresAreReadAsSigned) {
-  using B = StatisticsBufferBuilder;
+  using Buffer = StatisticsBufferBuilder;
   struct Case {
     std::string className;
-    B statistics;
+    Buffer statistics;
     std::string health;
   };
   const std::string unknown = "NumGrownBadBlocks=-1 SpareAvailablePercent=-1 NumDieFailures=-1 ";
   const std::vector<std::uint64_t> endToEnd{0, 5, 0x1'0000'0003, 0, 0, 0, 0, 0, 0, 0, 0, 6};
-  const B used = B().add(47, {12}).add(531, {3}).add(kSpare, {98}).add(kE2EErrors, endToEnd);
-  const B worn = B().add(429, {7}).add(430, {30}).add(kPercentUsed, {0xFFFF'FFFF});
+  const Buffer used =
+      Buffer().add(47, {12}).add(531, {3}).add(kSpare, {98}).add(kE2EErrors, endToEnd);
+  const Buffer worn = Buffer().add(429, {7}).add(430, {30}).add(kPercentUsed, {0xFFFF'FFFF});
   const Case cases[] = {
-      {"QuillQNS3NVMeController", B().add(4, {1}),
+      {"QuillQNS3NVMeController", Buffer().add(4, {1}),
        "MaxPercentageNANDUsed=0 MaxE2EErrors=0 HostReadErrors=0 " + unknown},
-      {"ORUStorage", B(worn).add(kRaidSmartErrors, {9}).add(kUeccReads, {0x1'0000'0004}),
+      {"ORUStorage", Buffer(worn).add(kRaidSmartErrors, {9}).add(kUeccReads, {0x1'0000'0004}),
        "MaxPercentageNANDUsed=30 MaxE2EErrors=0 HostReadErrors=4294967300 " + unknown},
-      {"ORUStorage", B().add(kRaidSmartErrors, {9}).add(kUeccReads, {~std::uint64_t{2}}),
+      {"ORUStorage", Buffer().add(kRaidSmartErrors, {9}).add(kUeccReads, {~std::uint64_t{2}}),
        "MaxPercentageNANDUsed=0 MaxE2EErrors=0 HostReadErrors=0 " + unknown},
-      {"QuillEmbeddedNVMeController", B(used).add(kRaidSmartErrors, {9}).add(kUeccReads, {4}),
+      {"QuillEmbeddedNVMeController", Buffer(used).add(kRaidSmartErrors, {9}).add(kUeccReads, {4}),
        "MaxPercentageNANDUsed=0 MaxE2EErrors=6 HostReadErrors=9 NumGrownBadBlocks=12 "
        "SpareAvailablePercent=98 NumDieFailures=3 "}};
   for (const Case& given : cases) {

@@ -17,16 +17,17 @@ const std::string kNoRefreshes = R"("HLT_numBootBlockRefreshes_max":0})";
 class StorageHealthFieldsTest : public StatisticsDevice {};
 
 TEST_F(StorageHealthFieldsTest, FreezerFigureIsTheSwapOutThreadsFourthCounter) {
-  using B = SnapshotBuilder;
+  using Snapshot = SnapshotBuilder;
   Bytes counters(40, 0xFF);
   counters[24] = 0xFE;
   const std::pair<Bytes, std::string> cases[] = {
       {{}, ""},
-      {B().thread(1, "idle", 7).bytes, ""},
-      {B().thread(1, "VM_swapout", 7).bytes, "7"},
-      {B().begin(1).name("VM_swapout", 64).item(2305, counters).bytes, "18446744073709551614"},
-      {B().begin(1).name("VM_swapout").end(1).bytes, "0"},
-      {B().begin(1).name("VM_swapout").item(2305, Bytes(31, 9)).end(1).bytes, "0"},
+      {Snapshot().thread(1, "idle", 7).bytes, ""},
+      {Snapshot().thread(1, "VM_swapout", 7).bytes, "7"},
+      {Snapshot().begin(1).name("VM_swapout", 64).item(2305, counters).bytes,
+       "18446744073709551614"},
+      {Snapshot().begin(1).name("VM_swapout").end(1).bytes, "0"},
+      {Snapshot().begin(1).name("VM_swapout").item(2305, Bytes(31, 9)).end(1).bytes, "0"},
   };
   start("", kSnapshot);
   for (const auto& [snapshot, written] : cases) {
