@@ -123,6 +123,35 @@ TEST(PtreeWriter, NamesThePlaceOfWhatADocumentCannotCarry) {
               HasSubstr("\xE2\x80\xA6: nested deeper than 200 levels"));
 }
 
+TEST(PtreeWriter, WritesTheSameDocumentInPieces) {
+  PropertyArray elements;
+  const PropertyDict entries{{"first", 1}};
+  const PtreeDocument document{entries, "last", [&elements](const auto& take) {
+                                 for (const PropertyValue& element : elements) {
+                                   if (!take(*element.dict())) {
+                                     return;
+                                   }
+                                 }
+                               }};
+  std::string error;
+  for (const std::size_t count : {0U, 1U, 5000U}) {
+    elements.assign(count, PropertyDict{{"text", "some text of an element"}});
+    std::vector<std::string> pieces;
+    EXPECT_TRUE(isPtree(document, error)) << error;
+    writePtree(document, [&pieces](std::string_view piece) { pieces.emplace_back(piece); });
+    std::string text;
+    for (const std::string& piece : pieces) {
+      EXPECT_LT(piece.size(), 70'000U);
+      text += piece;
+    }
+    EXPECT_EQ(text, writtenOf(PropertyDict{{"first", 1}, {"last", elements}}));
+  }
+  elements[1] = PropertyDict{{"text", "\x01"}};
+  elements[2] = PropertyDict{{"text", "\x02"}};
+  EXPECT_FALSE(isPtree(document, error));
+  EXPECT_THAT(error, StartsWith("\"last\" > [1] > \"text\": the string"));
+}
+
 TEST(PtreeReader, ReadsBackEveryKindOfValue) {
   const PropertyDict original = everything();
   const PropertyValue read = readOf(writtenOf(original));
