@@ -3,6 +3,7 @@
 #include <atomic>
 #include <string>
 #include <string_view>
+#include <utility>
 
 #include "common/AppInfoList.h"
 #include "common/ProcessState.h"
@@ -33,21 +34,23 @@ std::int64_t integerField(const PropertyDict& dict, std::string_view key) {
   return number != nullptr ? number->asInt64() : 0;
 }
 
-std::string textForm(const AppInfoList& list) {
-  std::string text;
-  list.forEach([&text](const PropertyDict& app) {
-    text += (text.empty() ? "(" : ", ") + textForm(PropertyValue(app));
+void appendTextForm(const AppInfoList& list, std::string& text) {
+  const char* separator = "(";
+  list.forEach([&](const PropertyDict& app) {
+    text += std::exchange(separator, ", ") + textForm(PropertyValue(app));
     return true;
   });
-  return text.empty() ? "()" : text + ')';
+  text += *separator == '(' ? "()" : ")";
 }
 
 void takeActiveAppInfo(const PropertyDict& message) {
   const AppInfoList list(message.find("app_data"));
-  if (platform().systemLog().keeps(LogLevel::Default)) {
-    logMessage(LogLevel::Default, "vesprun got %sAAI:\n%s",
-               aaiRequested ? "requested" : "(unsolicited -- so ignoring) ",
-               textForm(list).c_str());
+  if (SystemLog& log = platform().systemLog(); log.keeps(LogLevel::Default)) {
+    std::string text = "vesprun got ";
+    text += aaiRequested ? "requested" : "(unsolicited -- so ignoring) ";
+    text += "AAI:\n";
+    appendTextForm(list, text);
+    log.write(LogLevel::Default, text);
   }
   if (aaiRequested) {
     runDayCheck(&list);

@@ -17,7 +17,7 @@
 namespace vesprun {
 namespace {
 
-using ::testing::AllOf, ::testing::HasSubstr, ::testing::IsEmpty, ::testing::StartsWith;
+using ::testing::HasSubstr, ::testing::IsEmpty, ::testing::StartsWith;
 
 constexpr const char* kFile = "var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
 
@@ -48,7 +48,7 @@ class VesprunLibraryTest : public ::testing::Test {
 
   std::string call(const char* entryPoint, const char* arguments = nullptr) {
     char* const json = vesprun_call(device, entryPoint, arguments);
-    const std::string text = json != nullptr ? json : vesprun_last_error();
+    std::string text = json != nullptr ? json : vesprun_last_error();
     vesprun_free(json);
     return text;
   }
@@ -104,6 +104,7 @@ TEST_F(VesprunLibraryTest, LosesNothingOfThreadsAndProcessesThatWriteAtOnce) {
   const auto work = [this] {
     open();
     std::vector<std::thread> threads;
+    threads.reserve(kWriters);
     for (int writer = 0; writer < kWriters; ++writer) {
       threads.emplace_back([this] {
         for (int i = 1; i <= kAdds; ++i) {

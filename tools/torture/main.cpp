@@ -144,20 +144,24 @@ int torture(const Options& options) {
   return total.failed == 0 ? 0 : 1;
 }
 
-}  // namespace
-}  // namespace vesprun::torture
-
-int main(int argc, char** argv) {
+int run(int argc, char** argv) {
   CLI::App app("Runs vesprun and vespctl under every fault that a system can show them.",
                "torture");
-  vesprun::torture::Options options;
+  Options options;
   app.add_option("--seed", options.seed, "Where the random choices begin");
   app.add_flag("--full", options.full, "Every error of every call and every byte of a full disk");
   app.add_option("--share", options.share, "Only every N-th case")->check(CLI::PositiveNumber);
   app.add_option("--only", options.only, "One case, by the name that a failure prints");
   CLI11_PARSE(app, argc, argv);
+  return torture(options);
+}
+
+}  // namespace
+}  // namespace vesprun::torture
+
+int main(int argc, char** argv) {
   try {
-    return vesprun::torture::torture(options);
+    return vesprun::torture::run(argc, argv);
   } catch (const std::exception& failure) {
     std::fprintf(stderr, "torture: %s\n", failure.what());
     return 2;

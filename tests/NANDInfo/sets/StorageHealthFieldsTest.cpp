@@ -73,8 +73,8 @@ TEST_F(StorageHealthFieldsTest, FieldsOfTheFTL) {
     failures.set("mspBootBlockReadFails_" + std::to_string(block), block + 1);
   }
   /// `main` and `backup` are the failures to read and to program.
-  const auto sums = [&](std::uint64_t blocksPerMSP, std::array<std::string, 2> main,
-                        std::array<std::string, 2> backup) {
+  const auto sums = [&](std::uint64_t blocksPerMSP, const std::array<std::string, 2>& main,
+                        const std::array<std::string, 2>& backup) {
     Entry entry(failures, R"("HLT_numBootBlockRefreshes_max":0)");
     entry.first.set("mspBootBlockCountPerMsp", blocksPerMSP);
     for (const auto& [part, sum] : {std::pair("main", main), std::pair("backup", backup)}) {

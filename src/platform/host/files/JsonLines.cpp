@@ -9,6 +9,7 @@
 #include <cstring>
 #include <filesystem>
 #include <fstream>
+#include <utility>
 
 #include "platform/host/files/AtomicFile.h"
 
@@ -33,8 +34,8 @@ bool JsonLines::open(std::string& error, int creating) {
   return true;
 }
 
-bool JsonLines::append(std::string_view line, std::string& error) {
-  if (line.find('\n') != std::string_view::npos) {
+bool JsonLines::append(std::string line, std::string& error) {
+  if (line.find('\n') != std::string::npos) {
     error = _path + ": a line cannot hold a line feed";
     return false;
   }
@@ -42,7 +43,7 @@ bool JsonLines::append(std::string_view line, std::string& error) {
   if (!lock(error, O_CREAT)) {
     return false;
   }
-  const bool appended = appendLocked(line, error);
+  const bool appended = appendLocked(std::move(line), error);
   flock(_file.get(), LOCK_UN);
   return appended;
 }
@@ -90,7 +91,7 @@ bool JsonLines::isNamed() const {
   return _file.isOpen() && fstat(_file.get(), &status) == 0 && status.st_nlink != 0;
 }
 
-bool JsonLines::appendLocked(std::string_view line, std::string& error) {
+bool JsonLines::appendLocked(std::string line, std::string& error) {
   struct stat before {};
   if (fstat(_file.get(), &before) != 0) {
     error = systemError(_path);
@@ -99,14 +100,15 @@ bool JsonLines::appendLocked(std::string_view line, std::string& error) {
   char last = '\n';
   const bool torn =
       before.st_size > 0 && pread(_file.get(), &last, 1, before.st_size - 1) == 1 && last != '\n';
-  std::string bytes = torn ? "\n" : "";
-  bytes += line;
-  bytes += '\n';
+  if (torn) {
+    line.insert(0, 1, '\n');
+  }
+  line += '\n';
   ssize_t written = 0;
   do {
-    written = write(_file.get(), bytes.data(), bytes.size());
+    written = write(_file.get(), line.data(), line.size());
   } while (written < 0 && errno == EINTR);
-  if (written == static_cast<ssize_t>(bytes.size())) {
+  if (written == static_cast<ssize_t>(line.size())) {
     return true;
   }
   error = written < 0 ? systemError(_path) : _path + ": no room for a line";

@@ -25,7 +25,7 @@ class JsonLines {
 
   /// Appends `line`, which holds no line feed. A partly written line is taken back; a torn line of
   /// someone else is ended first. False, with the file in `error`, when the line is not there.
-  bool append(std::string_view line, std::string& error);
+  bool append(std::string line, std::string& error);
 
   /// Makes what was appended durable.
   bool flush(std::string& error);
@@ -41,7 +41,7 @@ class JsonLines {
   bool isNamed() const;
   std::optional<std::uint64_t> removeLocked(const std::function<bool(std::string_view line)>& goes,
                                             std::string& error);
-  bool appendLocked(std::string_view line, std::string& error);
+  bool appendLocked(std::string line, std::string& error);
 
   std::string _path;
   std::chrono::milliseconds _longestWait;

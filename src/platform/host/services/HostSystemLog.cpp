@@ -3,6 +3,7 @@
 #include <cstdio>
 #include <exception>
 #include <string>
+#include <utility>
 
 #include "common/Calendar.h"
 #include "platform/host/documents/JsonForm.h"
@@ -25,7 +26,7 @@ void HostSystemLog::write(LogLevel level, std::string_view message) {
     line += "\"message\":";
     appendJsonText(message, line);
     line += '}';
-    if (_directory.makeFolder("outbox", error) && _lines.append(line, error)) {
+    if (_directory.makeFolder("outbox", error) && _lines.append(std::move(line), error)) {
       return;
     }
   } catch (const std::exception&) {
