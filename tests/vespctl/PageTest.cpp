@@ -64,11 +64,10 @@ TEST_F(PageTest, ShowsTheCourseOfEachKeyOverTheDays) {
         // The newest revision first, then what it replaced.
         "<tr><td>1970-01-03<td>2<td>1970-01-04 09:15<td>2<td>1<td>",
         "<tr><td>1970-01-03<td>1<td>1970-01-04 09:15<td>2<td>1<td>",
-        "<bdi>s.a</bdi></summary><p class=values>1970-01-02 10\n1970-01-03 30\n1970-01-05 "
-        "20000\n</p>",
+        "s.a</bdi></summary><p class=values>1970-01-02 10\n1970-01-03 30\n1970-01-05 20000\n</p>",
         // Broken where a day is missing.
-        "3 values from 10 to 20\u202F000, the newest 20\u202F000\"><path class=m "
-        "d=\"M5 84L102 84M295 15h0\"/><path class=e d=\"M295 15h0\"/></svg>",
+        "3 values from 10 to 20\u202F000, the newest 20\u202F000\"><path class=m d=\"M5 84L102",
+        "class=m d=\"M5 84L102 84M295 15h0\"/><path class=e d=\"M295 15h0\"/></svg>",
         // At its day of the period.
         "2 values from 7 to 7, the newest 7\"><path class=m d=\"M5 50L102 50\"/>",
         "<td>7 <small>1970-01-03</small><td>",
@@ -134,8 +133,8 @@ TEST_F(PageTest, NoTextOfOthersBecomesMarkup) {
                            "&lt;b&gt;&#60;b&#62;",
                            "<!--",
                            "]]>",
-                           "\u202Ecod.exe",
-                           "\u2066\u200Bx",
+                           "\u202Ecod.exe\u202C",
+                           "\u2066\u200Bx\u2069",
                            "שלום",
                            "\U000E0041"};
   std::string lines;
@@ -167,6 +166,7 @@ TEST_F(PageTest, NoTextOfOthersBecomesMarkup) {
                           HasSubstr(std::string(5000, 'k') + "&lt;i&gt;</bdi></p>"),
                           HasSubstr("5\u202F003 bytes"),
                           HasSubstr("default-src 'none'; style-src 'unsafe-inline'")));
+  // NOLINTNEXTLINE(misc-misleading-bidirectional)
   for (const char* const unseen : {"\u202E", "\u2066", "\u200B", "\U000E0041", "\x1B"}) {
     EXPECT_THAT(html, Not(HasSubstr(unseen)));
   }
