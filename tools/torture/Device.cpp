@@ -188,9 +188,8 @@ Sight Device::look() const {
     if (leaves && content.find("secret") != std::string::npos) {
       sight.faults.push_back(name + " holds a key that no list names");
     }
-    if (name.ends_with(".ptree") && !readPtree(content, error)) {
-      sight.faults.push_back(name + " is half a document: " + error);
-    } else if (name.ends_with(".json") && leaves && !valueFromJsonText(content, error)) {
+    if ((name.ends_with(".ptree") && !readPtree(content, error)) ||
+        (name.ends_with(".json") && leaves && !valueFromJsonText(content, error))) {
       sight.faults.push_back(name + " is half a document: " + error);
     } else if (name.ends_with(".jsonl")) {
       std::istringstream lines(content);

@@ -4,6 +4,7 @@
 #include <sys/stat.h>
 
 #include <algorithm>
+#include <array>
 #include <filesystem>
 #include <map>
 #include <sstream>
@@ -313,13 +314,13 @@ TEST_F(CollectionTest, GrowthIsCountedOnceWhateverHappensToTheProcess) {
     EXPECT_FALSE(collect());
   }
   EXPECT_THAT(counted(), IsEmpty());
-  std::vector<pid_t> others;
-  for (int process = 0; process < 3; ++process) {
-    others.push_back(startProcess([&] {
+  std::array<pid_t, 3> others{};
+  for (pid_t& process : others) {
+    process = startProcess([&] {
       for (int i = 0; i < 10; ++i) {
         collect();
       }
-    }));
+    });
   }
   for (int reads = 6; reads <= 30; ++reads) {
     machine.write("sys/block/aside", std::to_string(reads));
