@@ -5,6 +5,7 @@
 #include <sys/socket.h>
 
 #include <algorithm>
+#include <array>
 #include <limits>
 
 #include "common/AppInfoList.h"
@@ -228,13 +229,13 @@ TEST_F(DailyDriverTest, AMessageThatFailsStopsNoOther) {
 TEST_F(DailyDriverTest, OneProcessDoesTheDaysWorkAndTheOthersFindItDone) {
   DriverDevice device;
   device.endProcess();
-  std::vector<pid_t> starts;
-  for (int i = 0; i < 3; ++i) {
-    starts.push_back(startProcess([&device] {
+  std::array<pid_t, 3> starts{};
+  for (pid_t& start : starts) {
+    start = startProcess([&device] {
       device.platform();
       runDayCheck(nullptr);
       device.endProcess();
-    }));
+    });
   }
   for (const pid_t start : starts) {
     EXPECT_TRUE(hasSucceeded(start));
