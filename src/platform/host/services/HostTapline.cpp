@@ -17,6 +17,7 @@ std::vector<ChannelDescription> liveChannels() {
     mergeFigure(values, *reading.figure, reading.key, reading.value);
   }
   std::vector<ChannelDescription> channels;
+  channels.reserve(values.size());
   for (const auto& [name, value] : values) {
     channels.push_back({name, value});
   }
