@@ -488,7 +488,8 @@ std::vector<Case> collections(const Programs& programs, const fs::path& folder, 
     return (folder / ("machine-" + std::to_string(number))).string();
   };
   for (int number = 1; number <= 3; ++number) {
-    recordMachine(stage(number), static_cast<std::uint64_t>(number * number));
+    const auto growth = static_cast<std::uint64_t>(number);
+    recordMachine(stage(number), growth * growth);
   }
   const auto collect = [=](Device& device, int number) {
     Faults faults;
@@ -528,7 +529,8 @@ std::string damaged(std::string content, const std::string& how, std::mt19937& r
   if (how == "cut") {
     content.resize(random() % content.size());
   } else if (how == "flipped") {
-    content[random() % content.size()] ^= static_cast<char>(1U << (random() % 8));
+    char& byte = content[random() % content.size()];
+    byte = static_cast<char>(static_cast<unsigned char>(byte) ^ (1U << (random() % 8)));
   } else if (how == "torn") {
     // A block that was never written.
     const std::size_t from = random() % content.size();
