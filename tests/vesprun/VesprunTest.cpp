@@ -13,7 +13,6 @@ namespace {
 
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
-using ::testing::SizeIs;
 
 constexpr const char* kService = "com.quill.aggregated.vesprun";
 constexpr std::string_view kDescription =
@@ -65,7 +64,7 @@ class Process {
   }
 
   std::optional<PropertyValue> storedDay() {
-    const auto day = device.platform().preferences().LGSPreferencesGetValue(
+    auto day = device.platform().preferences().LGSPreferencesGetValue(
         "LastCrashLogSerializationDateInDaysSince1970", kService);
     device.endProcess();
     return day;
