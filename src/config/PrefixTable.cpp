@@ -68,7 +68,7 @@ PrefixTable::PrefixTable(const std::vector<std::string_view>& prefixes) {
     const std::size_t children = _nodes.size();
     _nodes[node] = {static_cast<std::uint32_t>(children), static_cast<std::uint8_t>(low),
                     static_cast<std::uint8_t>(high - low), at};
-    // Where there is no child, all entries have the same beginning in common with a key.
+    // A key without a child of its own shares the same beginning with all entries: any will do.
     _nodes.resize(children + high - low + 1, {from});
     for (std::uint32_t begin = from; begin != to;) {
       const unsigned half = halfByte(_sorted[begin].text, at);

@@ -16,7 +16,7 @@ namespace vesprun {
 struct PtreeDocument {
   const PropertyDict& entries;
   std::string_view lastKey = {};
-  /// Hands over each element until `take` returns false. Null: there is no such entry.
+  /// Calls `take` with each element until it returns false. Null: the document has no such array.
   std::function<void(const std::function<bool(const PropertyDict& element)>& take)> lastArray = {};
 };
 

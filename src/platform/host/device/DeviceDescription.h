@@ -15,7 +15,7 @@
 
 namespace vesprun {
 
-/// Absent: the running Linux system answers. Null in the document: there is no answer.
+/// When it is absent, the running Linux system answers; null in the document means no answer.
 template <typename T>
 using DescribedAnswer = std::optional<std::optional<T>>;
 
@@ -134,7 +134,7 @@ struct DeviceDescription {
     bool available = true;
     Names missing;
   } supportLibrary;
-  DescribedAnswer<PropertyDict> purgeable;  ///< absent: there is no such service
+  DescribedAnswer<PropertyDict> purgeable;  ///< absent: the device lacks the service
   struct {
     std::optional<std::uint64_t> pageSize;
     DescribedAnswer<Ticks> ticks;  ///< null: the ratio cannot be read
