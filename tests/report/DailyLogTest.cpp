@@ -88,31 +88,6 @@ TEST_F(DailyLogTest, HoldsItsEntriesInOrder) {
             "({bundle = b; version = ; adamID = 0; arch = 0; uuid = })");
 }
 
-TEST_F(DailyLogTest, HasTheKeysThatItComputesItself) {
-  device.emplace(R"({"clock": "2024-03-05T09:15:02Z", "apps": [{"bundle": "a", "user": true}],
-      "kernel": {"ticks": {"value": 9000000000, "numerator": 1, "denominator": 1},
-                 "variables": {"vm.swapusage": {"data":
-                     "AAAAAAEAAAAAAAAAAQAAAAAAAAABAAAAABAAAAAAAAA="}}}})");
-  device->writeWhitelistJson(R"({"G": {"ScalarKeyPrefixes": {"com.quill.": {}, "s": {}}}})");
-  count();
-  write();
-  const PropertyDict document = device->documents().at(0);
-  std::vector<std::string> keys;
-  for (const auto& [key, value] : *document.find("TBScalars")->dict()) {
-    keys.emplace_back(key);
-  }
-  EXPECT_THAT(
-      keys,
-      ::testing::ElementsAre(
-          "s", "com.quill.homeshell.numAllInstalledApps", "com.quill.homeshell.numThirdPartyApps",
-          "com.quill.logsmith.tlyd.database.size", "com.quill.logsmith.tlyd.database.corruptions",
-          "com.quill.usage.cur_boot_session_cpu_uptime",
-          "com.quill.kernel.memorystatus_freeze_count",
-          "com.quill.kernel.memorystatus_freeze_budget_pages_remaining",
-          "com.quill.kernel.memorystatus_thaw_count", "com.quill.kernel.swapusage",
-          "com.quill.memorystatus_freezer_thaw_percentage"));
-}
-
 TEST_F(DailyLogTest, NamesAPreviousOSVersionOnceThereIsALog) {
   start("false");
   write();

@@ -8,19 +8,10 @@
 
 #include "vespctl/VespctlTest.h"
 
-#ifdef VESPRUN_TRACES
-#include <sys/syscall.h>
-
-#include <set>
-
-#include "TracedRun.h"
-#endif
-
 namespace vesprun {
 namespace {
 
-using ::testing::AllOf, ::testing::ElementsAre, ::testing::EndsWith, ::testing::HasSubstr,
-    ::testing::StartsWith;
+using ::testing::AllOf, ::testing::ElementsAre, ::testing::HasSubstr, ::testing::StartsWith;
 
 /// A device whose whitelist lets "s" and "d" through and whose clock the test sets. Day 19787 is
 /// 2024-03-05.
@@ -284,61 +275,6 @@ TEST_F(DaysTest, PruneKeepsADailyLogThatItCannotNote) {
   EXPECT_THAT(print("prune \"$D\" --outbox-size 0"),
               HasSubstr("\"0003-193-log-aggregated.ptree\"]"));
 }
-
-#ifdef VESPRUN_TRACES
-TEST_F(DaysTest, PruneThatIsKilledOrFailsAnywhereIsMadeUpForByTheNext) {
-  count(19700, 19710);
-  count(19786, 19786);
-  print("counters \"$D\" sample d 1 --day 19701");
-  addLog(1, 4, "2024-02-01");
-  addLog(2, 4, "2024-03-05");
-  addLog(3, 4, "2024-02-01");
-  folder.write(logs + "/0003-193-log-aggregated.header.json", "{}");
-  folder.write(logs + "/0004-165-S.log", "the newest");
-  shell("touch -d 2024-02-01 " + logs + "/000[34]*");
-  const std::string old = "{\"time\":\"2024-02-01T00:00:00Z\"}\n";
-  folder.write("device/outbox/events.jsonl", old + "{\"time\":\"2024-03-05T00:00:00Z\"}\n" + old);
-  std::filesystem::rename(folder.path("device"), folder.path("original"));
-  const auto prune = [this](const torture::Fault& fault) {
-    shell("rm -r device; cp -a original device");
-    return torture::runTraced({VESPCTL_PROGRAM, "prune", ".", "--counters", "30", "--outbox", "30"},
-                              folder.path("device"), fault);
-  };
-  // What is there when the next prune has run, and after it a run.
-  const auto state = [this] {
-    print("prune \"$D\" --counters 30 --outbox 30");
-    std::string found = folder.read("device/outbox/pruned.jsonl") +
-                        folder.read("device/outbox/events.jsonl") + print("counters \"$D\" dump");
-    print("run \"$D\" -- -f");
-    for (const std::string& name : folder.names(logs)) {
-      found += name + ' ';
-    }
-    return found + revisions();
-  };
-  const torture::Outcome whole = prune({});
-  EXPECT_EQ(whole.status, 0) << whole.standardError;
-  EXPECT_THAT(whole.notDurable, ElementsAre());
-  const std::string expected = state();
-  EXPECT_THAT(expected, EndsWith("scalar\t19786\ts\t19786\n0002-193-log-aggregated.ptree "
-                                 "0005-193-log-aggregated.header.json "
-                                 "0005-193-log-aggregated.ptree 4:2 4:4 "));
-  std::size_t tried = 0;
-  for (std::size_t call = 1; call <= whole.calls.size(); ++call) {
-    const auto& [number, path, size] = whole.calls[call - 1];
-    const std::set<int> changing{SYS_write,     SYS_pwrite64, SYS_unlink, SYS_unlinkat,
-                                 SYS_rename,    SYS_renameat, SYS_linkat, SYS_fsync,
-                                 SYS_fdatasync, SYS_ftruncate};
-    if (changing.contains(number) && path.starts_with(folder.path("device"))) {
-      ++tried;
-      for (const auto kind : {torture::Fault::Kind::Kill, torture::Fault::Kind::Error}) {
-        prune({.kind = kind, .call = call, .error = EIO});
-        EXPECT_EQ(state(), expected) << torture::nameOfCall(number) << ' ' << path;
-      }
-    }
-  }
-  EXPECT_GT(tried, 20U);
-}
-#endif
 
 }  // namespace
 }  // namespace vesprun

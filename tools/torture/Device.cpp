@@ -144,6 +144,13 @@ Device::Device(const Device& original, const fs::path& folder)
     : _programs(original._programs), _path(folder.string()) {
   fs::remove_all(_path);
   fs::copy(original._path, _path, fs::copy_options::recursive);
+  // What is old stays old.
+  for (const fs::directory_entry& entry : fs::recursive_directory_iterator(original._path)) {
+    if (entry.is_regular_file()) {
+      fs::last_write_time(fs::path(_path) / entry.path().lexically_relative(original._path),
+                          entry.last_write_time());
+    }
+  }
 }
 
 void Device::describe(const std::string& change) {

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cstring>
+#include <iterator>
 #include <map>
 #include <memory>
 #include <random>
@@ -522,6 +523,54 @@ std::vector<Case> collections(const Programs& programs, const fs::path& folder, 
   return casesOf({"collect", original, {"collect", "--root", stage(2)}, judge}, folder, seed, full);
 }
 
+/// Whatever happened to one prune, the next one leaves the same behind, and so does a run after it.
+std::vector<Case> prunes(const Programs& programs, const fs::path& folder, std::uint32_t seed,
+                         bool full) {
+  constexpr int kLater = kFirstDay + 40;
+  const auto original = std::make_shared<Device>(programs, folder / "prunes");
+  original->runDaily();
+  original->setDay(kLater);
+  std::string output;
+  for (const int day : {kLater - 35, kLater - 1}) {
+    original->control({"counters", "set", "host.memory.MemFree", "7", "--day", std::to_string(day)},
+                      output);
+  }
+  original->control({"run", "--", "-f"}, output);
+  const std::vector<std::string> words{"prune", "--counters", "30", "--outbox", "30"};
+  const auto end = [=](Device& device) {
+    std::string printed;
+    std::string found = std::to_string(device.control(words, printed));
+    for (const char* const file : {"pruned.jsonl", "events.jsonl", "records.jsonl"}) {
+      found += readFile(device.path() + "/outbox/" + file);
+    }
+    for (const auto& [name, content] : device.look().logs) {
+      found += name + '\n';
+    }
+    found += std::to_string(device.control({"run", "--", "-f"}, printed));
+    for (const char* const command : {"counters dump", "export --device d"}) {
+      std::istringstream stream(command);
+      device.control({std::istream_iterator<std::string>(stream), {}}, printed);
+      found += printed;
+    }
+    return found;
+  };
+  Device device(*original, folder / "pruned");
+  const std::string expected = end(device);
+  const auto judge = [=](Device& changed, const Outcome& /*outcome*/, bool /*killed*/) {
+    return end(changed) == expected ? Faults() : Faults{"the next prune ends otherwise"};
+  };
+  std::vector<Case> cases = casesOf({"prune", original, words, judge}, folder, seed, full);
+  if (!full) {  // between two of these calls, nothing on the device changes
+    std::erase_if(cases, [](const Case& one) {
+      constexpr const char* kChanging[] = {"write",   "sync:", ":unlink",
+                                           ":rename", ":link", "trunc"};
+      return std::ranges::none_of(
+          kChanging, [&one](const char* call) { return one.name.find(call) != std::string::npos; });
+    });
+  }
+  return cases;
+}
+
 std::string damaged(std::string content, const std::string& how, std::mt19937& random) {
   if (content.empty()) {
     return how == "noise" ? std::string(100, '\xff') : content;
@@ -644,6 +693,7 @@ std::vector<Scenario> scenarios() {
       {"others write during a daily run", neighbours},
       {"every call of an import fails or is its last", imports},
       {"every call of a collection fails or is its last", collections},
+      {"every call of a prune fails or is its last", prunes},
       {"files are damaged", damages},
       {"the clock jumps through ten years", years},
   };

@@ -26,6 +26,7 @@ struct Options {
   std::size_t share = 1;
   unsigned workers = std::max(1U, std::thread::hardware_concurrency());
   std::string only;
+  std::string scenario;
 };
 
 struct Counts {
@@ -105,6 +106,9 @@ int torture(const Options& options) {
     if (!options.only.empty() && total.tried != 0) {
       break;
     }
+    if (scenario.name.find(options.scenario) == std::string::npos) {
+      continue;
+    }
     const std::vector<Case> cases =
         chosen(scenario.cases(programs, folder, options.seed, options.full), options);
     const std::size_t failedBefore = total.failed;
@@ -151,6 +155,7 @@ int run(int argc, char** argv) {
   app.add_option("--seed", options.seed, "Where the random choices begin");
   app.add_flag("--full", options.full, "Every error of every call and every byte of a full disk");
   app.add_option("--share", options.share, "Only every N-th case")->check(CLI::PositiveNumber);
+  app.add_option("--scenario", options.scenario, "Only scenarios whose title holds this text");
   app.add_option("--only", options.only, "One case, by the name that a failure prints");
   CLI11_PARSE(app, argc, argv);
   return torture(options);

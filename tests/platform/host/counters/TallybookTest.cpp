@@ -215,32 +215,6 @@ TEST_F(TallybookTest, RefusesKeysThatNoDocumentCarries) {
   EXPECT_EQ(dump(), "scalar\t19787\t" + longest + "\t1\n");
 }
 
-TEST_F(TallybookTest, LosesNoIncrementOfProcessesAndThreadsThatWriteAtOnce) {
-  constexpr int kRounds = 20;
-  const auto work = [&](HostTallybook& tallybook) {
-    for (int i = 0; i < kRounds; ++i) {
-      tallybook.TBClientAddValueForScalarKey("k", 1);
-      tallybook.TBClientCheckpoint();
-    }
-  };
-  const pid_t child = startProcess([&] {
-    {
-      HostTallybook tallybook(device, clock, preferences, log);
-      work(tallybook);
-    }
-    EXPECT_THAT(log.messages, IsEmpty());
-  });
-  {
-    HostTallybook tallybook(device, clock, preferences, log);
-    std::thread other([&] { work(tallybook); });
-    work(tallybook);
-    other.join();
-  }
-  EXPECT_TRUE(hasSucceeded(child));
-  EXPECT_EQ(dump(), scalar(3 * kRounds));
-  EXPECT_THAT(log.messages, IsEmpty());
-}
-
 TEST_F(TallybookTest, KeepsEveryCommittedCounterOfAKilledWriter) {
   std::mt19937 random(7);
   std::int64_t committed = 0;
