@@ -1,6 +1,11 @@
 #pragma once
 
+#include <cstdint>
+
 namespace vesprun {
+
+/// The type of the structured records that the handlers of the lists log.
+inline constexpr std::int32_t kListRecordType = 176;
 
 /// Logs the storage controller's lists: the band validity list when it is wanted, three telemetry
 /// lists and the factory defects. First leaves the write amplification, and whether the validity

@@ -3,7 +3,7 @@
 #include <gmock/gmock.h>
 
 #include "FieldsOf.h"
-#include "NANDInfo/lists/ControllerLists.h"
+#include "NANDInfo/lists/TelemetryList.h"
 #include "platform/DictionaryHelpers.h"
 #include "support/TestDevice.h"
 

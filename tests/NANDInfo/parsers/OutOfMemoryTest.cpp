@@ -2,7 +2,7 @@
 #include <cstdint>
 
 #include "FieldsOf.h"
-#include "NANDInfo/lists/ControllerLists.h"
+#include "NANDInfo/lists/TelemetryList.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/KernelSnapshot.h"
 #include "NANDInfo/parsers/ORUFTLParseBufferToCxt.h"

@@ -6,9 +6,6 @@
 
 #include "common/PropertyValue.h"
 
-// The handlers of a controller's telemetry and defect lists. They log structured records of type
-// 176.
-
 namespace vesprun {
 
 /// Logs a record for each NAND bus, in signed 32-bit numbers: wear figures of the bus, then its
@@ -28,11 +25,5 @@ std::uint8_t hexStringToByte(std::string_view text, std::uint32_t length);
 /// The same for eight characters, in pairs from the left: "12345678" is 0x12345678. A last odd one
 /// is a byte of its own: "123" is 0x1203.
 std::uint32_t hexStringToInt32(std::string_view text, std::uint32_t length);
-
-/// Logs factory defects: a record with "Factory Count" and, if `properties` (may be null) have it,
-/// "com.quill.NANDInfo.nandDesc"; then one for each defect wholly in the buffer. Numbers are signed
-/// 32-bit, "Temperature" signed 8-bit. Always true.
-bool LogFactoryDefectList(std::span<const std::uint8_t> buffer, const PropertyValue* properties,
-                          std::string_view className);
 
 }  // namespace vesprun
