@@ -4,8 +4,8 @@
 #include <optional>
 #include <utility>
 
+#include "common/ProcessState.h"
 #include "common/TextForm.h"
-#include "config/InternalDevice.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
@@ -14,6 +14,17 @@ namespace {
 constexpr const char* kWhitelistPath =
     "/Library/Application Support/Tallybook/Whitelist_Stagebox.ptree";
 constexpr std::uint64_t kMostBytes = 256 << 20;
+
+std::optional<bool> gIsInternalDevice;
+const ProcessState kInternalDeviceState([] { gIsInternalDevice.reset(); });
+
+/// The platform is asked once in a process.
+bool TBIsInternalDevice() {
+  if (!gIsInternalDevice) {
+    gIsInternalDevice = platform().deviceInformation().OrreryGetBoolAnswer("InternalBuild");
+  }
+  return *gIsInternalDevice;
+}
 
 std::optional<std::string> readWhitelist() {
   FileSystem& fileSystem = platform().fileSystem();
