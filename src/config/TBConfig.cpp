@@ -111,7 +111,6 @@ TBConfig::TBConfig(PropertyValue document)
   reportHeldBack(DistributionOptions::kKeyList, distributions.keys());
   reportHeldBack(ScalarOptions::kPrefixList, scalars.prefixes());
   reportHeldBack(DistributionOptions::kPrefixList, distributions.prefixes());
-  _tables.indexPrefixes();
 }
 
 void TBConfig::takeGroup(const WhitelistKeyGroup& group) {
@@ -127,18 +126,6 @@ void TBConfig::takeGroup(const WhitelistKeyGroup& group) {
 }
 
 template <typename Options>
-WhitelistDecision<Options> TBConfig::decide(std::string_view key) const {
-  WhitelistDecision<Options> decision = _tables.of<Options>().decide(key);
-  if (decision.by == DecidedBy::Nothing && _isInternalDevice) {
-    decision.by = DecidedBy::InternalDevice;
-  }
-  return decision;
-}
-
-template WhitelistDecision<ScalarOptions> TBConfig::decide(std::string_view) const;
-template WhitelistDecision<DistributionOptions> TBConfig::decide(std::string_view) const;
-
-template <typename Options>
 std::vector<PassedOverGroup> TBConfig::groupsPassedOver(std::string_view key) const {
   std::vector<PassedOverGroup> groups;
   for (const auto& [name, lists] : *_document.dict()) {
@@ -149,7 +136,6 @@ std::vector<PassedOverGroup> TBConfig::groupsPassedOver(std::string_view key) co
     }
     WhitelistTables ofGroup;
     ofGroup.take(group);
-    ofGroup.indexPrefixes();
     if (const DecidedBy by = ofGroup.of<Options>().decide(key).by; by != DecidedBy::Nothing) {
       groups.push_back({name, standing, by});
     }

@@ -46,7 +46,13 @@ class TBConfig {
 
   /// The same with the reason and without debug lines.
   template <typename Options>
-  WhitelistDecision<Options> decide(std::string_view key) const;
+  WhitelistDecision<Options> decide(std::string_view key) const {
+    WhitelistDecision<Options> decision = _tables.of<Options>().decide(key);
+    if (decision.by == DecidedBy::Nothing && _isInternalDevice) {
+      decision.by = DecidedBy::InternalDevice;
+    }
+    return decision;
+  }
 
   /// The groups, in document order, that do not count on this device although their lists of that
   /// kind name the key, or else a prefix of it.

@@ -5,7 +5,7 @@
 #include <cstddef>
 #include <optional>
 #include <string_view>
-#include <type_traits>
+#include <tuple>
 #include <vector>
 
 #include "common/PropertyDict.h"
@@ -68,9 +68,6 @@ class WhitelistTable {
   /// outlive the table.
   void take(std::string_view group, std::string_view list, const PropertyDict& entries);
 
-  /// Must be called between the last `take` and the first look-up of a prefix.
-  void indexPrefixes();
-
   const Entries& keys() const { return _keys; }
   const Entries& prefixes() const { return _prefixes; }
 
@@ -84,7 +81,7 @@ class WhitelistTable {
   Entries _keys;
   mutable std::size_t _expected = 0;  ///< the place after the key that was found last
   Entries _prefixes;
-  PrefixTable _prefixTable;
+  mutable std::optional<PrefixTable> _prefixTable;  ///< of `_prefixes`, once a look-up needs it
 };
 
 /// The tables of both kinds.
@@ -94,21 +91,13 @@ class WhitelistTables {
   /// skipped since they are none.
   std::vector<std::string_view> take(const WhitelistKeyGroup& group);
 
-  /// See `WhitelistTable`.
-  void indexPrefixes();
-
   template <typename Options>
   const WhitelistTable<Options>& of() const {
-    if constexpr (std::is_same_v<Options, ScalarOptions>) {
-      return _scalars;
-    } else {
-      return _distributions;
-    }
+    return std::get<WhitelistTable<Options>>(_tables);
   }
 
  private:
-  WhitelistTable<ScalarOptions> _scalars;
-  WhitelistTable<DistributionOptions> _distributions;
+  std::tuple<WhitelistTable<ScalarOptions>, WhitelistTable<DistributionOptions>> _tables;
 };
 
 }  // namespace vesprun

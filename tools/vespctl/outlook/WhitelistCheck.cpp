@@ -1,6 +1,7 @@
 #include "outlook/WhitelistCheck.h"
 
 #include <cmath>
+#include <type_traits>
 #include <unordered_map>
 #include <utility>
 
@@ -56,13 +57,11 @@ class WhitelistCheck {
       if (lists.dict() != nullptr) {
         const WhitelistKeyGroup group{name, lists};
         _onInternalDevices.take(group);
-        if (!group.isForInternalDevices()) {
+        if (!WhitelistKeyGroup::isForInternalDevices(name)) {
           _onOtherDevices.take(group);
         }
       }
     }
-    _onInternalDevices.indexPrefixes();
-    _onOtherDevices.indexPrefixes();
   }
 
   void judge(const WrittenGroup& group, bool isRepeated) {
@@ -131,9 +130,11 @@ class WhitelistCheck {
         judgeOption(Options(), std::string(name), value);
       }
     }
-    if (options && hasFallingIntervals(*options)) {
-      tell("intervals do not rise",
-           "a bucket that does not end above the one before it stays empty: put them in order");
+    if constexpr (std::is_same_v<Options, DistributionOptions>) {
+      if (options && options->intervals != nullptr && doNotRise(*options->intervals)) {
+        tell("intervals do not rise",
+             "a bucket that does not end above the one before it stays empty: put them in order");
+      }
     }
     if (isPrefix && entry.name.empty()) {
       tell("empty prefix", "it lets every key in: name what is meant to leave");
@@ -166,9 +167,8 @@ class WhitelistCheck {
 
   /// The groups that stand beside the one that is judged.
   const WhitelistTables& tables() const {
-    const PropertyValue none(false);
-    return WhitelistKeyGroup{_place.group, none}.isForInternalDevices() ? _onInternalDevices
-                                                                        : _onOtherDevices;
+    return WhitelistKeyGroup::isForInternalDevices(_place.group) ? _onInternalDevices
+                                                                 : _onOtherDevices;
   }
 
   void judgeOption(const ScalarOptions& /*kind*/, const std::string& name,
@@ -199,11 +199,6 @@ class WhitelistCheck {
   void tellUnread(const std::string& name) {
     tell("unread option",
          "nothing reads " + quotedText(name) + " in this list: correct the name or remove it");
-  }
-
-  static bool hasFallingIntervals(const ScalarOptions& /*options*/) { return false; }
-  static bool hasFallingIntervals(const DistributionOptions& options) {
-    return options.intervals != nullptr && doNotRise(*options.intervals);
   }
 
   WhitelistTables _onInternalDevices;
