@@ -57,9 +57,6 @@ class GenericParserCxt {
   /// Appends a field named `prefix` + `suffix`, cut to `kMaxNameLength`. False, and nothing
   /// appended, when memory runs out.
   bool append(std::string_view prefix, std::string_view suffix, std::uint64_t value) noexcept;
-  bool append(std::string_view name, std::uint64_t value) noexcept {
-    return append({}, name, value);
-  }
   /// Appends `count` fields under these names: the little-endian values of `width` bytes, 1 to 8,
   /// at `source`. False when memory ran out for some, which are missing.
   bool appendKnown(KnownNames names, const std::uint8_t* source, std::size_t width,
