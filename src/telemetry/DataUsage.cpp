@@ -22,10 +22,6 @@ constexpr std::string_view kBaselineDomain = "com.quill.logsmith.vesprun";
 constexpr std::array<std::string_view, 4> kUsageCounters = {"wifiInBytes", "wifiOutBytes",
                                                             "wwanInBytes", "wwanOutBytes"};
 
-std::int64_t numberOrZero(const Number* number) {
-  return number != nullptr ? number->asInt64() : 0;
-}
-
 /// A process's name in counter keys.
 struct UsageName {
   std::string prefix;
@@ -41,24 +37,6 @@ std::optional<UsageName> nameOf(const PropertyDict& record) {
   }
   return std::nullopt;
 }
-
-/// A process in the baseline: the date since which its counters count, and the counters.
-class BaselineEntry {
- public:
-  explicit BaselineEntry(const PropertyArray* stored) : _values(stored) {}
-
-  bool isSince(const Date& date) const {
-    return _values != nullptr && !_values->empty() && _values->front().date() != nullptr &&
-           *_values->front().date() == date;
-  }
-
-  std::int64_t counter(std::size_t index) const {
-    return index + 1 < _values->size() ? numberOrZero((*_values)[index + 1].number()) : 0;
-  }
-
- private:
-  const PropertyArray* _values;
-};
 
 /// Taken before the feed is asked: a late reply may find another platform, or none.
 struct Services {
@@ -196,18 +174,22 @@ class UsageReply {
     if (!name || since == nullptr) {
       return;
     }
-    const BaselineEntry before(_baseline.findArray(name->name));
-    const bool goesOn = before.isSince(*since);
+    // The date since which the counters count, and the counters.
+    const PropertyArray* before = _baseline.findArray(name->name);
+    const bool goesOn =
+        before != nullptr && !before->empty() && before->front() == PropertyValue(*since);
     const bool isRecent = daysSince1970(*since) >= _yesterday;
     const std::size_t additionsBefore = _additions.size();
     PropertyArray after{*since};
-    for (std::size_t i = 0; i < kUsageCounters.size(); ++i) {
-      const std::int64_t value = numberOrZero(record.findNumber(kUsageCounters[i]));
+    for (const std::string_view counter : kUsageCounters) {
+      const std::size_t place = after.size();
+      const std::int64_t value = record.integerOr(counter, 0);
       after.emplace_back(value);
       if (goesOn) {
-        addGrowth(kUsageCounters[i], *name, value, before.counter(i));
+        const Number* earlier = place < before->size() ? (*before)[place].number() : nullptr;
+        addGrowth(counter, *name, value, earlier != nullptr ? earlier->asInt64() : 0);
       } else if (isRecent) {
-        AddDataUsageKB(kUsageCounters[i], name->prefix, name->name, value);
+        AddDataUsageKB(counter, name->prefix, name->name, value);
       }
     }
     if (!goesOn && !isRecent) {

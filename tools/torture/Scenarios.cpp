@@ -94,14 +94,10 @@ std::map<std::string, long long> usageOf(const Sight& sight) {
   std::map<std::string, long long> sums;
   for (const std::string& row : sight.counters) {
     std::istringstream fields(row);
-    std::string kind;
-    std::string day;
-    std::string key;
-    std::string value;
-    std::getline(fields, kind, '\t');
-    std::getline(fields, day, '\t');
-    std::getline(fields, key, '\t');
-    std::getline(fields, value, '\t');
+    std::string kind, day, key, value;
+    for (std::string* field : {&kind, &day, &key, &value}) {
+      std::getline(fields, *field, '\t');
+    }
     if (key.starts_with("datausage.")) {
       sums[key] += std::stoll(value);
     }

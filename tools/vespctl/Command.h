@@ -49,8 +49,8 @@ std::string readInput(const std::string& file);
 /// The content of a regular file; empty when there is none.
 std::string contentIfThere(const std::string& file);
 
-/// Hands on each line of a file that may be missing, null for one that is not a JSON object.
-void forEachLine(const std::string& file, const std::function<void(PropertyDict* line)>& take);
+/// Calls `take` with each line of a text, null for one that is not a JSON object.
+void forEachLine(const std::string& text, const std::function<void(PropertyDict* line)>& take);
 
 /// A file's name in messages: "-" is "standard input".
 std::string inputName(const std::string& file);

@@ -41,24 +41,24 @@ std::optional<Bytes> uuidBytes(std::string_view text) {
 
 /// The value for the message; nothing, with the expectation in `wanted`, for a wrong one.
 std::optional<PropertyValue> messageValue(std::string_view name, const PropertyValue& value,
-                                          std::string& wanted) {
+                                          std::string& fault) {
   if (name == "bundle_id" || name == "version") {
-    wanted = "not a string";
+    fault = "not a string";
     return value.string() != nullptr ? std::optional(value) : std::nullopt;
   }
   if (name == "adam_id" || name == "arch") {
-    wanted = "not a signed 64-bit integer";
+    fault = "not a signed 64-bit integer";
     const Number* number = value.number();
     return number != nullptr && number->kind() == NumberKind::Int64 ? std::optional(value)
                                                                     : std::nullopt;
   }
   if (name == "uuid") {
-    wanted = "not a UUID text such as 00112233-4455-6677-8899-AABBCCDDEEFF";
+    fault = "not a UUID text such as 00112233-4455-6677-8899-AABBCCDDEEFF";
     std::optional<Bytes> bytes =
         value.string() != nullptr ? uuidBytes(*value.string()) : std::nullopt;
     return bytes ? std::optional<PropertyValue>(*std::move(bytes)) : std::nullopt;
   }
-  wanted = "unknown entry";
+  fault = "unknown entry";
   return std::nullopt;
 }
 
@@ -83,10 +83,10 @@ std::optional<PropertyArray> appDataFromJson(std::string_view json, std::string&
     }
     PropertyDict app;
     for (const auto& [name, entry] : *element.dict()) {
-      std::string wanted;
-      std::optional<PropertyValue> carried = messageValue(name, entry, wanted);
+      std::string fault;
+      std::optional<PropertyValue> carried = messageValue(name, entry, fault);
       if (!carried) {
-        error = place + quotedText(name) + ": " + wanted;
+        error = place + quotedText(name) + ": " + fault;
         return std::nullopt;
       }
       app.set(name, *std::move(carried));
@@ -187,19 +187,13 @@ class NewNotifications {
  private:
   bool isPosted(std::string_view name) const {
     const std::string text = contentIfThere(_file);
+    bool isThere = false;
     // A shorter file is a new one.
-    std::string_view rest = std::string_view(text).substr(text.size() < _seen ? 0 : _seen);
-    for (auto end = rest.find('\n'); end != std::string_view::npos; end = rest.find('\n')) {
-      std::string ignored;
-      const std::optional<PropertyValue> line = valueFromJsonText(rest.substr(0, end), ignored);
-      const PropertyDict* dict = line ? line->dict() : nullptr;
-      const std::string* posted = dict != nullptr ? dict->findString("name") : nullptr;
-      if (posted != nullptr && *posted == name) {
-        return true;
-      }
-      rest.remove_prefix(end + 1);
-    }
-    return false;
+    forEachLine(text.substr(text.size() < _seen ? 0 : _seen), [&](const PropertyDict* line) {
+      const std::string* posted = line != nullptr ? line->findString("name") : nullptr;
+      isThere = isThere || (posted != nullptr && *posted == name);
+    });
+    return isThere;
   }
 
   std::string _file;

@@ -1,7 +1,6 @@
 #include "outbox/SubmittedLogs.h"
 
 #include <algorithm>
-#include <charconv>
 #include <cstdio>
 #include <map>
 #include <optional>
@@ -20,12 +19,10 @@ namespace {
 constexpr std::string_view kNameAfterNumber = "-193-log-aggregated.ptree";
 
 std::optional<std::uint64_t> numberOf(std::string_view name) {
-  std::uint64_t number = 0;
-  const auto [end, error] = std::from_chars(name.data(), name.data() + name.size(), number);
-  const std::string_view rest = name.substr(static_cast<std::size_t>(end - name.data()));
-  return error == std::errc() && end - name.data() >= 4 && rest == kNameAfterNumber
-             ? std::optional(number)
-             : std::nullopt;
+  constexpr std::size_t kFewestDigits = 4;
+  const std::size_t digits = std::min(name.find('-'), name.size());
+  return digits >= kFewestDigits && name.substr(digits) == kNameAfterNumber ? logNumber(name)
+                                                                            : std::nullopt;
 }
 
 const char* faultOfDistribution(const PropertyValue& value) {
