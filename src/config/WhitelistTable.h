@@ -15,7 +15,7 @@
 
 namespace vesprun {
 
-/// What the whitelist says of a key or prefix. All of it lies in the document.
+/// What the whitelist says of a key or prefix; refers to the document.
 template <typename Options>
 struct WhitelistEntry {
   std::string_view group;          ///< the last one that names it
@@ -71,15 +71,15 @@ class WhitelistTable {
   const Entries& keys() const { return _keys; }
   const Entries& prefixes() const { return _prefixes; }
 
-  /// The exact key decides before the first prefix in order. Fastest for keys in the order of the
+  /// By the exact key, else by the first prefix in order. Fastest for keys in the order of the
   /// whitelist; not for several threads at a time.
   WhitelistDecision<Options> decide(std::string_view key) const;
-  /// What the first prefix would decide; on `prefix` itself, the one that is reached in its place.
+  /// By the first prefix alone. A prefix that another one decides is never reached.
   WhitelistDecision<Options> decideByPrefix(std::string_view key) const;
 
  private:
   Entries _keys;
-  mutable std::size_t _expected = 0;  ///< the place after the key that was found last
+  mutable std::size_t _expected = 0;  ///< the place after the last key that was found
   Entries _prefixes;
   mutable std::optional<PrefixTable> _prefixTable;  ///< of `_prefixes`, once a look-up needs it
 };
@@ -87,8 +87,8 @@ class WhitelistTable {
 /// The tables of both kinds.
 class WhitelistTables {
  public:
-  /// Takes the lists of a group, which must be a dictionary. Gives the names of those that are
-  /// skipped since they are none.
+  /// Takes the lists of a group, which must be a dictionary. Returns the names of those that are
+  /// not dictionaries and are skipped.
   std::vector<std::string_view> take(const WhitelistKeyGroup& group);
 
   template <typename Options>

@@ -9,7 +9,7 @@
 namespace vesprun {
 namespace {
 
-/// Longer than a day's work takes; a stopped holder must not block the others for ever.
+/// Seconds: more than a day's work takes, but a stopped process must not block the others for ever.
 constexpr double kLongestWaitForOthers = 300;
 
 bool lockDailyWork() { return platform().fileSystem().lockDailyWork(kLongestWaitForOthers); }

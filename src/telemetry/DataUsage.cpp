@@ -54,10 +54,10 @@ struct Services {
 };
 
 // Counters and baseline lie in two files, and a process can be killed, or a write can fail, in
-// between. So the baseline is written first, with a mark: the baseline before it, and a fingerprint
-// of the data-usage counters before the growth. Counters reach the database all or none: as long as
-// the fingerprint holds, the growth is not counted and the earlier baseline applies. The mark goes
-// when the counters are durable.
+// between. So the baseline is written first, with a mark: the earlier baseline, and a fingerprint
+// of the data-usage counters before the growth is added. Counters reach the database all or none:
+// while the fingerprint is unchanged, the growth is not counted and the earlier baseline applies.
+// The mark is removed when the counters are durable.
 
 /// The data-usage counters from a day on as one number; nothing when they cannot be read.
 std::optional<std::uint64_t> fingerprintSince(Tallybook& tallybook, std::int32_t day) {
@@ -246,7 +246,7 @@ void CollectDataUsage(std::chrono::nanoseconds replyTimeout) {
   const auto fingerprint =
       settleEarlierRun(services) ? fingerprintSince(services.tallybook, today) : std::nullopt;
   if (!fingerprint) {
-    return;  // unknown counters: the next run counts the growth
+    return;  // the counters cannot be read: the next run counts the growth
   }
   const auto feed = platform().murmur().createUsageFeed(UsageWorkspace{kUsageServiceEndpoint});
   const auto handled = std::make_shared<std::binary_semaphore>(0);

@@ -248,8 +248,8 @@ std::size_t firstOwnCall(const std::vector<Call>& calls) {
 
 using RunWithFault = std::function<Faults(const fs::path& work, const Fault& fault, bool started)>;
 
-/// Each call fails in one way or, when wanted, in all, transfers half where `alsoShort` asks for
-/// it, and is the last one.
+/// Each call fails in one way (`full`: in every way), with `alsoShort` transfers half, and is the
+/// last one.
 std::vector<Case> faultsOfCalls(const std::string& name, const std::vector<Call>& calls,
                                 std::uint32_t seed, bool full, bool alsoShort,
                                 const RunWithFault& run) {

@@ -162,7 +162,7 @@ class PropertyDict {
                         [key](const auto& entry) { return entry.first == key; });
   }
 
-  /// Keys that are set again mostly come in the order of the first time, which saves a search.
+  /// Keys that are set again mostly come in their first order: this saves a search.
   PropertyValue* findExpected(std::string_view key) {
     if (!_many || _expected >= _many->size()) {
       return nullptr;
@@ -187,7 +187,7 @@ class PropertyDict {
 
   Entries _few;
   std::unique_ptr<Map> _many;  // once there have been more than a few
-  std::size_t _expected = 0;   // of many, the place after the last one that was set
+  std::size_t _expected = 0;   // in `_many`, the place after the last one that was set
 };
 
 // What a value can only do where a dictionary is complete.

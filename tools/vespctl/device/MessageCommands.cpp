@@ -39,7 +39,7 @@ std::optional<Bytes> uuidBytes(std::string_view text) {
   return bytes.empty() ? std::nullopt : std::optional(std::move(bytes));
 }
 
-/// The value for the message; nothing, with the expectation in `wanted`, for a wrong one.
+/// The value as the message carries it; nothing, with the fault in `fault`, for a wrong one.
 std::optional<PropertyValue> messageValue(std::string_view name, const PropertyValue& value,
                                           std::string& fault) {
   if (name == "bundle_id" || name == "version") {
@@ -139,8 +139,8 @@ class Client {
     }
   }
 
-  /// Nothing comes back, but a service that ends before it has read the message resets the
-  /// connection. One that is still there after a moment has the message.
+  /// The service answers nothing, but when it ends before it has read the message, the connection
+  /// is reset. When it is still there after a moment, it has the message.
   void finish() const {
     setsockopt(_socket.get(), SOL_SOCKET, SO_RCVTIMEO, &kLastLook, sizeof kLastLook);
     char byte = 0;

@@ -78,15 +78,15 @@ class Revisions {
  public:
   explicit Revisions(const DeviceDirectory& directory) : _directory(directory) { readNotes(); }
 
-  /// For a log that has gone since its folder was read: it was noted before.
+  /// Once more when a log has gone since its folder was read: its note was written before.
   void readNotes() {
     _notes = *orFail([&](std::string& error) { return readPrunedLogs(_directory, error); });
     std::ranges::stable_sort(_notes, {}, &PrunedLog::number);
     _next = 0;
   }
 
-  /// That of the next log by number. One whose removal was noted and then did not happen keeps its
-  /// own.
+  /// Sets the revision of the next log by number. A log that was noted as removed, and was not,
+  /// keeps the noted one.
   void set(SubmittedLog& log, std::uint64_t number) {
     for (; _next < _notes.size() && _notes[_next].number < number; ++_next) {
       count(_notes[_next]);

@@ -70,8 +70,8 @@ void printLeftOut(const OutlookArguments& arguments) {
   std::cout << keptBack.text() << '\n';
 }
 
-/// Adds the rows of a key that a report of `day` reads, as they are stored and as the log would
-/// have them; without `options` it would not. False when the counters cannot be read.
+/// Adds the rows of a key that a report of `day` reads, as stored and as reported; without
+/// `options` they are not reported. False when the counters cannot be read.
 bool addValues(std::int32_t day, std::string_view key, const ScalarOptions* options,
                JsonArray& values) {
   const auto history = platform().tallybook().initWithDefaultPath();

@@ -12,7 +12,7 @@
 namespace vesprun {
 namespace {
 
-// The document as it is written, with what a later entry of the same name replaces.
+// The document as it is written, including entries that a later one of the same name replaces.
 struct WrittenEntry {
   std::string name;
   PropertyValue value;
@@ -28,7 +28,7 @@ struct WrittenGroup {
   std::vector<WrittenList> lists;
 };
 
-/// Calls `judge` with each and whether another of its name follows.
+/// Calls `judge` with each, and whether another one of that name follows.
 template <typename Written, typename Judge>
 void forEachWithRepeats(const std::vector<Written>& written, const Judge& judge) {
   std::unordered_map<std::string_view, std::size_t> last;
@@ -42,7 +42,7 @@ void forEachWithRepeats(const std::vector<Written>& written, const Judge& judge)
 
 bool doNotRise(const PropertyArray& intervals) {
   for (std::size_t i = 1; i < intervals.size(); ++i) {
-    // Not the other way round: NaN does not rise either.
+    // Not `>=`: a NaN does not rise either.
     if (!(intervals[i - 1].number()->asDouble() < intervals[i].number()->asDouble())) {
       return true;
     }
@@ -165,7 +165,7 @@ class WhitelistCheck {
     }
   }
 
-  /// The groups that stand beside the one that is judged.
+  /// The tables of the groups that count together with the judged one.
   const WhitelistTables& tables() const {
     return WhitelistKeyGroup::isForInternalDevices(_place.group) ? _onInternalDevices
                                                                  : _onOtherDevices;
@@ -214,7 +214,7 @@ std::optional<std::vector<WhitelistFinding>> checkWhitelist(std::string_view byt
   std::vector<WrittenGroup> groups;
   std::vector<WrittenList> lists;
   std::vector<WrittenEntry> entries;
-  // What is in a list or group is complete before it is.
+  // Entries come before the list that holds them, and lists before their group.
   const auto take = [&](std::span<const std::string_view> keys, const PropertyValue& value) {
     const std::string name(keys.back());
     const bool isDict = value.dict() != nullptr;
