@@ -18,11 +18,8 @@ using ::testing::AllOf, ::testing::ElementsAre, ::testing::HasSubstr, ::testing:
 class DaysTest : public VespctlTest {
  protected:
   DaysTest() {
-    folder.write(
-        kWhitelist,
-        R"(<?xml version="1.0" encoding="UTF-8"?><ptree version="1.0"><dict><key>G</key><dict>
-<key>ScalarKeys</key><dict><key>s</key><dict/><key>com.quill.kernel.swapusage</key><dict/></dict>
-<key>DistributionKeys</key><dict><key>d</key><dict><key>intervals</key><array><real>0.5</real></array></dict></dict></dict></dict></ptree>)");
+    writePtree(kWhitelist, R"({"G": {"ScalarKeys": {"s": {}, "com.quill.kernel.swapusage": {}},
+                                     "DistributionKeys": {"d": {"intervals": [0.5]}}}})");
     setTime("2024-03-05T09:15:02Z");
   }
 
@@ -44,11 +41,10 @@ class DaysTest : public VespctlTest {
   /// A daily log of a day of March 2024 that was written at midnight of a date.
   void addLog(int number, int day, const std::string& written) {
     const std::string name = logs + "/000" + std::to_string(number) + "-193-log-aggregated.ptree";
-    const std::string date = "<date>2024-03-0" + std::to_string(day) + "T00:00:00Z</date>";
-    folder.write(name, R"(<ptree version="1.0"><dict><key>TBStartDate</key>)" + date +
-                           "<key>TBLogCreationDate</key>" + date + R"(<key>TBWhitelistDigest</key>
-<string/><key>TBScalars</key><dict/><key>TBDistributions</key><dict/>
-<key>TBDistributionsHistogram</key><dict/></dict></ptree>)");
+    const std::string date = R"({"date": "2024-03-0)" + std::to_string(day) + R"(T00:00:00Z"})";
+    writePtree(name, R"({"TBStartDate": )" + date + R"(, "TBLogCreationDate": )" + date +
+                         R"(, "TBWhitelistDigest": "", "TBScalars": {}, "TBDistributions": {},
+                             "TBDistributionsHistogram": {}})");
     shell("touch -d " + written + "T00:00Z " + name);
   }
 

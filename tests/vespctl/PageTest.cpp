@@ -17,12 +17,8 @@ using ::testing::Not, ::testing::StartsWith;
 class PageTest : public VespctlTest {
  protected:
   PageTest() {
-    folder.write(
-        kWhitelist,
-        R"(<?xml version="1.0" encoding="UTF-8"?><ptree version="1.0"><dict><key>G</key><dict>
-<key>ScalarKeyPrefixes</key><dict><key>s.</key><dict/></dict>
-<key>DistributionKeyPrefixes</key><dict><key>d.</key><dict><key>intervals</key><array>
-<integer>10</integer><integer>100</integer></array></dict></dict></dict></dict></ptree>)");
+    writePtree(kWhitelist, R"({"G": {"ScalarKeyPrefixes": {"s.": {}},
+                                     "DistributionKeyPrefixes": {"d.": {"intervals": [10, 100]}}}})");
   }
 
   /// Counts what `lines` say of a day and reports it on the day after. Day 1 is 1970-01-02.

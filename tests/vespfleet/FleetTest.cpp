@@ -1,16 +1,13 @@
-#include <gmock/gmock.h>
 #include <signal.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <algorithm>
-#include <cstdlib>
 #include <random>
 #include <sstream>
 
 #include "HttpClient.h"
-#include "support/TemporaryFolder.h"
+#include "support/ProgramTest.h"
 
 namespace vesprun {
 namespace {
@@ -20,7 +17,7 @@ using ::testing::Not;
 
 /// The program on an SQLite store, and on a ClickHouse server where one is given by the
 /// environment.
-class FleetTest : public ::testing::TestWithParam<std::string> {
+class FleetTest : public ProgramTest, public ::testing::WithParamInterface<std::string> {
  protected:
   FleetTest() {
     if (GetParam() == "SQLite") {
@@ -50,15 +47,9 @@ class FleetTest : public ::testing::TestWithParam<std::string> {
     }
   }
 
-  /// What follows `vespfleet` in a shell; the exit status, with what was printed in `output` and
-  /// `error`.
+  /// What follows `vespfleet` in a shell; the exit status.
   int run(const std::string& arguments) {
-    const std::string command = "cd '" + folder.path() + "'; S='" + store + "'; '" +
-                                VESPFLEET_PROGRAM + "' " + arguments + " >output 2>error";
-    const int status = std::system(command.c_str());
-    output = folder.read("output");
-    error = folder.read("error");
-    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+    return runScript("S='" + store + "'; '" VESPFLEET_PROGRAM "' " + arguments);
   }
   /// The output of a question, which must have an answer.
   std::string ask(const std::string& question) {
@@ -79,10 +70,7 @@ class FleetTest : public ::testing::TestWithParam<std::string> {
     EXPECT_EQ(run("load \"$S\" lines"), 0) << error;
   }
 
-  TemporaryFolder folder;
   std::string store;
-  std::string output;
-  std::string error;
   std::unique_ptr<HttpClient> system;
   std::string dropDatabase;
 };
