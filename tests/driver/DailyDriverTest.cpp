@@ -168,7 +168,9 @@ TEST_F(DailyDriverTest, TheTasksReportCountAndSynchronize) {
   ASSERT_THAT(device.documents(), SizeIs(1));
   const PropertyDict document = device.documents()[0];
   EXPECT_EQ(*document.find("TBScalars")->dict()->find("k"), PropertyValue(1));
-  EXPECT_TRUE(document.contains("TBActivatedAppInfo"));
+  EXPECT_EQ((document.end() - 1)->first, "TBActivatedAppInfo");
+  EXPECT_EQ(textForm((document.end() - 1)->second),
+            "({bundle = b; version = ; adamID = 0; arch = 0; uuid = })");
   EXPECT_EQ(writtenScalars(device, "com.quill.tapline."), (Scalars{{"com.quill.tapline.c", 3}}));
   EXPECT_THAT(device.log(), Contains(kOSChange));
 }
