@@ -73,6 +73,15 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
   for (const char* const number : {"0", "08", "18446744073709551615"}) {
     print(std::string("nand \"$D\" magazine -- ") + number);
   }
+  EXPECT_EQ(print("days \"$D\" --last 010 | wc -l"), "10\n");
+  for (const char* const option :
+       {"days \"$D\" --last ", "catch-up \"$D\" --last ", "prune \"$D\" --counters ",
+        "prune \"$D\" --outbox ", "prune \"$D\" --outbox-size ", "export \"$D\" --from ",
+        "export \"$D\" --to ", "preview \"$D\" --day ", "send \"$D\" daily "}) {
+    EXPECT_NE(run(std::string(option) + "08"), 2) << error;
+    EXPECT_EQ(run(std::string(option) + "0x8"), 2) << option;
+    EXPECT_THAT(error, HasSubstr("\"0x8\" is not a number from ")) << option;
+  }
 }
 
 TEST_F(VespctlTest, DecodesAnEmptyBuffer) {

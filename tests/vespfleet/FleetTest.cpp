@@ -146,8 +146,10 @@ TEST_P(FleetTest, TellsNothingOfTooFewDevices) {
       "{\"day\":20000,\"devices\":5,\"minimum\":0,\"maximum\":4,\"mean\":2.0,\"quantiles\":"
       "{\"0.05\":0,\"0.25\":1,\"0.5\":2,\"0.75\":3,\"0.95\":4}}\n";
   EXPECT_EQ(ask("scalar \"$S\" a"), "{\"day\":-7,\"devices\":1}\n" + fifth);
-  EXPECT_EQ(ask("scalar \"$S\" a --from 0 --to 20000"), fifth);
+  EXPECT_EQ(ask("scalar \"$S\" a --from 00 --to 020000"), fifth);
   EXPECT_EQ(ask("scalar \"$S\" a --from 20001"), "");
+  EXPECT_EQ(ask("scalar \"$S\" a --from 020000 --least 08"), "{\"day\":20000,\"devices\":5}\n");
+  EXPECT_EQ(run("scalar \"$S\" a --from 0x1"), 2);
   EXPECT_EQ(ask("scalar \"$S\" b"), "{\"day\":20000,\"devices\":4}\n");
   EXPECT_EQ(ask("scalar \"$S\" d"), "") << "a key of the other kind";
   EXPECT_EQ(ask("distribution \"$S\" none") + ask("distribution \"$S\" nan"), "");
