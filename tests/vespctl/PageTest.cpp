@@ -27,14 +27,8 @@ class PageTest : public VespctlTest {
     std::snprintf(time, sizeof time, "1970-01-%02dT09:15:02Z", day + 2);
     folder.write("device/device.json",
                  std::string("{\"clock\": \"") + time + "\", \"registry\": []}");
-    std::string counters;
-    for (std::size_t from = 0, to; from < lines.size(); from = to + 1) {
-      to = std::min(lines.find('\n', from), lines.size());
-      const std::string line = lines.substr(from, to - from);
-      const std::size_t tab = line.find('\t');
-      counters += line.substr(0, tab + 1) + std::to_string(day) + line.substr(tab) + '\n';
-    }
-    import(counters);
+    import(std::regex_replace(lines, std::regex("(scalar|sample)\t"),
+                              "$1\t" + std::to_string(day) + '\t'));
     print("run \"$D\" -- -f");
   }
 

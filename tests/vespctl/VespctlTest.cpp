@@ -70,6 +70,9 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
     EXPECT_EQ(lines, status == 2 ? 2 : 1) << error << "where help is, too";
   }
   EXPECT_EQ(print("counters \"$D\" dump"), "") << "nothing was changed";
+}
+
+TEST_F(VespctlTest, TakesNumbersAsDecimalOnes) {
   for (const char* const number : {"0", "08", "18446744073709551615"}) {
     print(std::string("nand \"$D\" magazine -- ") + number);
   }
