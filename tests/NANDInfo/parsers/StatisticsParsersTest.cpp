@@ -115,23 +115,11 @@ TEST(BaseParser, GivesUpOnlyWhenRecordsThatOverlapMultiplyFields) {
 
 /// In the order of the context, without the driver version and the histogram.
 Words summaryOf(const ORUStatsContext& ctx) {
-  return {ctx.exportVersion,
-          ctx.numVirtualBlocks,
-          ctx.blocksPerVirtualBlock,
-          ctx.pagesPerVirtualBlock,
-          ctx.bytesPerPage,
-          ctx.hostReads,
-          ctx.hostWrites,
-          ctx.numFreeVirtualBlocks,
-          ctx.wearLevMoves,
-          ctx.nandReads,
-          ctx.nandWrites,
-          ctx.bandErases,
-          ctx.IND_pool_free,
-          ctx.IND_pool_count,
-          ctx.utilFormatTime,
-          ctx.numSleepOps,
-          ctx.maxHighEnduranceBlockErases};
+  Words values;
+  for (const ORUSummaryField& field : kORUSummaryFields) {
+    values.push_back(field.get(ctx));
+  }
+  return values;
 }
 
 TEST(BaseParser, FillsTheSummary) {
