@@ -11,7 +11,7 @@ namespace {
 
 using ::testing::AllOf, ::testing::AnyOf;
 using ::testing::HasSubstr;
-using ::testing::IsEmpty;
+using ::testing::IsEmpty, ::testing::MatchesRegex;
 using ::testing::Not;
 using ::testing::StartsWith;
 
@@ -19,6 +19,7 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
   folder.write("apps", R"([{"version": "1"}, {"uuid": "0011223-34455-6677-8899-AABBCCDDEEFF"}])");
   folder.write("bad", "sample\t1\tk\tnan(x)\t0\n");
   folder.write("file/outbox/logs", "");
+  folder.write("huge/device.json", std::string(17'000'000, ' '));
   const char* const noNumber = " is not a number from 0 to ";
   const struct {
     int status;  ///< 2: the arguments are wrong
@@ -70,6 +71,18 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
     EXPECT_EQ(lines, status == 2 ? 2 : 1) << error << "where help is, too";
   }
   EXPECT_EQ(print("counters \"$D\" dump"), "") << "nothing was changed";
+}
+
+TEST_F(VespctlTest, DumpsAllButKeysThatBreakALine) {
+  for (const char* const change :
+       {"set $'a\\nb' 1", "sample $'a\\nb' 1", "set k 2", "sample d 3"}) {
+    print("counters \"$D\" " + std::string(change) + " --day 7");
+  }
+  EXPECT_EQ(run("counters \"$D\" dump"), 1);
+  EXPECT_THAT(output, MatchesRegex("scalar\t7\tk\t2\nsample\t7\td\t3\t[0-9]+\n"));
+  EXPECT_EQ(error,
+            "vespctl: 2 counters, the first of them \"a\\x0ab\", are left out: no line can carry a "
+            "line feed in a key\n");
 }
 
 TEST_F(VespctlTest, TakesNumbersAsDecimalOnes) {
