@@ -9,7 +9,7 @@
 namespace vesprun {
 namespace {
 
-using ::testing::AllOf, ::testing::AnyOf;
+using ::testing::AllOf, ::testing::AnyOf, ::testing::EndsWith;
 using ::testing::HasSubstr;
 using ::testing::IsEmpty, ::testing::MatchesRegex;
 using ::testing::Not;
@@ -153,6 +153,44 @@ TEST_F(VespctlTest, ShowsSubmittedLogs) {
                             HasSubstr("count 2, min 1, mean 2, max 3, standard deviation 1\n"),
                             HasSubstr("  (-inf, 2]  " + std::string(40, '#') + " 1\n"),
                             HasSubstr("   (2, inf)   -4\n")));
+}
+
+TEST_F(VespctlTest, ExportsNothingOfAnUnsoundDailyLog) {
+  const std::string dates =
+      R"({"TBStartDate": {"date": "2024-03-05T00:00:00Z"}, "TBLogCreationDate": {"date": "2024-03-06T00:00:00Z"})";
+  const std::string digest = dates + R"(, "TBWhitelistDigest": "w")";
+  const auto log = [&](const char* scalars, const char* distributions, const char* histograms) {
+    return digest + R"(, "TBScalars": )" + scalars + R"(, "TBDistributions": )" + distributions +
+           R"(, "TBDistributionsHistogram": )" + histograms + "}";
+  };
+  const char* const notFive = "a distribution that is not five numbers";
+  const char* const notCounts = "a histogram that is no dictionary of counts";
+  const std::pair<std::string, const char*> cases[] = {
+      {"[]", "not a dictionary"},
+      {R"({"TBStartDate": 1, "TBLogCreationDate": 2})", "a date is missing"},
+      {dates + "}", "the whitelist digest is missing"},
+      {log("[]", "{}", "{}"), "its scalars, distributions or histograms are missing"},
+      {log(R"({"k": 1.5})", "{}", "{}"), "a scalar that is no integer"},
+      {log("{}", R"({"d": [1, 2, 3, 4]})", "{}"), notFive},
+      {log("{}", R"({"d": [1, 2, 3, 4, 5.5]})", "{}"), notFive},
+      {log("{}", R"({"d": [1, 2, 3, "4", 5]})", "{}"), notFive},
+      {log("{}", "{}", R"({"d": 1})"), notCounts},
+      {log("{}", "{}", R"({"d": {"(-inf, 1]": "1"}})"), notCounts},
+  };
+  std::string complaints;
+  for (const auto& [document, fault] : cases) {
+    const std::string name =
+        std::to_string(1000 + std::count(complaints.begin(), complaints.end(), '\n')) +
+        "-193-log-aggregated.ptree";
+    writePtree("device/outbox/logs/" + name, document);
+    complaints += "vespctl: " + name + ": " + fault + '\n';
+  }
+  writePtree("device/outbox/logs/2000-193-log-aggregated.ptree", log(R"({"k": 1})", "{}", "{}"));
+  EXPECT_EQ(run("export \"$D\" --device d"), 1);
+  EXPECT_EQ(error, complaints);
+  EXPECT_THAT(output, AllOf(HasSubstr(R"("day":19787,"revision":1,)"), EndsWith("{}}\n")));
+  EXPECT_THAT(print("show \"$D\""),
+              HasSubstr("1000-193-log-aggregated.ptree\n  cannot be read: not a dictionary\n"));
 }
 
 TEST_F(VespctlTest, CollectsWhatTheStarterWhitelistLetsLeave) {
