@@ -99,7 +99,7 @@ TEST_F(OutlookTest, PreviewsWhatTheRunSubmitsRightAfter) {
 }
 
 TEST_F(OutlookTest, PreviewsNullWhereNothingWouldBeSubmitted) {
-  import("scalar\t19786\ts\t1\n");
+  import("scalar\t19785\ts\t1\nscalar\t19786\ts\t1\n");
   const struct {
     const char* entries;
     const char* whitelist;
