@@ -4,8 +4,8 @@
 
 #include "Command.h"
 #include "DecimalNumber.h"
+#include "JsonObject.h"
 #include "driver/DailyTasks.h"
-#include "outlook/JsonObject.h"
 #include "outlook/KeptBack.h"
 #include "outlook/ReadOnlyDevice.h"
 #include "report/LogSubmission.h"

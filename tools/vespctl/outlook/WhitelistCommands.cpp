@@ -3,8 +3,8 @@
 #include <set>
 
 #include "Command.h"
+#include "JsonObject.h"
 #include "config/TBConfig.h"
-#include "outlook/JsonObject.h"
 #include "outlook/KeptBack.h"
 #include "outlook/ReadOnlyDevice.h"
 #include "outlook/WhitelistCheck.h"
