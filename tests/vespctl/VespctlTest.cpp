@@ -87,19 +87,6 @@ TEST_F(VespctlTest, TakesNumbersAsDecimalOnes) {
   }
 }
 
-TEST_F(VespctlTest, DecodesAnEmptyBuffer) {
-  const std::pair<const char*, const char*> cases[] = {
-      {"base /dev/null",
-       R"({"result":false,"error":"NA","fields":[],"summary":{"exportVersion":0,)"},
-      {"ftl - </dev/null", R"({"result":0,"error":"NA","fields":[]})"},
-      {"msp /dev/null", R"({"result":0,"error":"ORUMSPParseBufferToCxt: Passed in invalid buffer)"},
-      {"snapshot --thread t /dev/null", R"({"found":false,"ioStatistics":null})"}};
-  for (const auto& [arguments, answer] : cases) {
-    EXPECT_EQ(run(std::string("decode ") + arguments), 0) << error;
-    EXPECT_THAT(output, StartsWith(answer));
-  }
-}
-
 TEST_F(VespctlTest, TellsOfADamagedDatabase) {
   const char* const database = "device/var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
   const char* const kept = "is not a database; kept as ";
