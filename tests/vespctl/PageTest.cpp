@@ -1,6 +1,5 @@
 #include <sys/stat.h>
 
-#include <algorithm>
 #include <array>
 #include <regex>
 #include <set>

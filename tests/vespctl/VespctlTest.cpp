@@ -13,13 +13,12 @@ using ::testing::AllOf, ::testing::AnyOf, ::testing::EndsWith;
 using ::testing::HasSubstr;
 using ::testing::IsEmpty, ::testing::MatchesRegex;
 using ::testing::Not;
-using ::testing::StartsWith;
 
 TEST_F(VespctlTest, SaysWhatIsWrong) {
   folder.write("apps", R"([{"version": "1"}, {"uuid": "0011223-34455-6677-8899-AABBCCDDEEFF"}])");
   folder.write("bad", "sample\t1\tk\tnan(x)\t0\n");
   folder.write("file/outbox/logs", "");
-  folder.write("huge/device.json", std::string(17'000'000, ' '));
+  shell("mkdir huge && truncate -s 17000000 huge/device.json");
   const char* const noNumber = " is not a number from 0 to ";
   const struct {
     int status;  ///< 2: the arguments are wrong
