@@ -8,6 +8,7 @@
 #include <utility>
 #include <vector>
 
+#include "platform/host/documents/NumberText.h"
 #include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {
