@@ -290,9 +290,9 @@ class ValueBuilder final : public nlohmann::json_sax<Json> {
     NestedPlace place;
     for (auto container = _open.rbegin(); container != _open.rend(); ++container) {
       if (container->isObject) {
-        place.addOuterKey(container->name);
+        place.addOuter(container->name);
       } else {
-        place.addOuterIndex(container->array.size());
+        place.addOuter(container->array.size());
       }
     }
     return place.with(message);
