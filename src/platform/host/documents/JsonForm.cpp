@@ -14,15 +14,13 @@
 #include "common/TextForm.h"
 #include "platform/host/documents/Base64.h"
 #include "platform/host/documents/NestedPlace.h"
+#include "platform/host/documents/NumberText.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/documents/XmlText.h"
 
 namespace vesprun {
-namespace {
 
 using Json = nlohmann::ordered_json;
-
-}  // namespace
 
 // The library handles what is neither plain text nor a short escape.
 void appendJsonText(std::string_view string, std::string& text) {
@@ -115,12 +113,6 @@ void append(const PropertyValue& value, std::string& text) {
   }
 }
 
-PropertyValue integerValue(std::uint64_t integer) {
-  return integer <= static_cast<std::uint64_t>(std::numeric_limits<std::int64_t>::max())
-             ? PropertyValue(static_cast<std::int64_t>(integer))
-             : PropertyValue(integer);
-}
-
 /// The dictionary, or the value that an object of one tagged entry means.
 std::optional<PropertyValue> untagged(PropertyDict dict, std::string& error) {
   if (dict.size() != 1) {
@@ -143,33 +135,24 @@ std::optional<PropertyValue> untagged(PropertyDict dict, std::string& error) {
     return dict;
   }
   if (name == "real") {
-    if (*text == "nan") {
-      return PropertyValue(std::numeric_limits<double>::quiet_NaN());
-    }
-    if (*text == "inf" || *text == "-inf") {
-      const double infinity = std::numeric_limits<double>::infinity();
-      return PropertyValue(text->front() == '-' ? -infinity : infinity);
+    if (double real = 0; parseWholeText(*text, real) && !std::isfinite(real)) {
+      return PropertyValue(real);
     }
     error = "a \"real\" of " + quotedText(*text) + " instead of \"inf\", \"-inf\" or \"nan\"";
-    return std::nullopt;
-  }
-  if (name == "data") {
-    std::optional<Bytes> data = parseBase64(*text);
-    if (!data) {
-      error = quotedText(*text) + " is not base64";
-      return std::nullopt;
+  } else if (name == "data") {
+    if (std::optional<Bytes> data = parseBase64(*text)) {
+      return PropertyValue(*std::move(data));
     }
-    return PropertyValue(*std::move(data));
-  }
-  if (name == "date") {
-    const std::optional<Date> date = parseDateText(*text);
-    if (!date) {
-      error = quotedText(*text) + " is not a date";
-      return std::nullopt;
+    error = quotedText(*text) + " is not base64";
+  } else if (name == "date") {
+    if (const std::optional<Date> date = parseDateText(*text)) {
+      return PropertyValue(*date);
     }
-    return PropertyValue(*date);
+    error = quotedText(*text) + " is not a date";
+  } else {
+    return dict;
   }
-  return dict;
+  return std::nullopt;
 }
 
 /// Builds values as the library meets the parts: stricter than the library's own tree, and it sees
@@ -206,7 +189,9 @@ class ValueBuilder final : public nlohmann::json_sax<Json> {
   }
   bool boolean(bool value) override { return add(value); }
   bool number_integer(number_integer_t value) override { return add(value); }
-  bool number_unsigned(number_unsigned_t value) override { return add(integerValue(value)); }
+  bool number_unsigned(number_unsigned_t value) override {
+    return std::in_range<std::int64_t>(value) ? add(static_cast<std::int64_t>(value)) : add(value);
+  }
   bool number_float(number_float_t value, const std::string& text) override {
     if (text.find_first_of(".eE") == std::string::npos) {
       return fail("the integer " + text.substr(0, 40) + " does not fit 64 bits");
