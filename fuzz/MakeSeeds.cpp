@@ -145,6 +145,13 @@ std::vector<Seed> exportedLineSeeds() {
                            R"("histograms":{"b":{"(-inf, 10]":2}}})")}};
 }
 
+std::vector<Seed> figureSeeds() {
+  return {{"number", bytesOf("41000\n")},
+          {"many", bytesOf("1 2 3 4 5 6 7 8 9 10 11 12 13 14 15 16 17\n")},
+          {"hexadecimal", bytesOf("0x0b\n")},
+          {"labels", bytesOf("cpu 1 2.5 3\nMemAvailable: 4000000 kB\nsome avg10=0.00 total=5\n")}};
+}
+
 bool write(const std::filesystem::path& folder, const std::vector<Seed>& seeds) {
   std::filesystem::create_directories(folder);
   for (const Seed& seed : seeds) {
@@ -178,6 +185,7 @@ int main(int argc, char** argv) {
                        write(folder / "MessageFuzzer", messageSeeds()) &&
                        write(folder / "DeviceDescriptionFuzzer", descriptionSeeds()) &&
                        write(folder / "CounterLinesFuzzer", counterLineSeeds()) &&
-                       write(folder / "ExportedLineFuzzer", exportedLineSeeds());
+                       write(folder / "ExportedLineFuzzer", exportedLineSeeds()) &&
+                       write(folder / "FiguresFuzzer", figureSeeds());
   return written ? 0 : 1;
 }

@@ -12,10 +12,10 @@
 #include "common/TextForm.h"
 #include "driver/ActiveAppInfoListener.h"
 #include "driver/DailyTasks.h"
-#include "platform/host/documents/PtreeWriter.h"
 #include "platform/host/messages/HostMainLoop.h"
 #include "platform/host/messages/MessageFraming.h"
 #include "platform/host/messages/ServiceSocket.h"
+#include "support/Documents.h"
 #include "support/HostServiceTest.h"
 #include "telemetry/TodaysScalars.h"
 
@@ -88,9 +88,7 @@ class DailyDriverTest : public ::testing::Test {
       peer = connectToService(device.platform().directory(), kService, 5, error);
       std::string bytes;
       for (const PropertyValue& message : messages) {
-        std::string document;
-        EXPECT_TRUE(writePtree(message, document, error)) << error;
-        bytes += messageFrame(document).value();
+        bytes += messageFrame(ptreeOf(message)).value();
       }
       EXPECT_EQ(send(peer.get(), bytes.data(), bytes.size(), MSG_NOSIGNAL),
                 static_cast<ssize_t>(bytes.size()));
@@ -170,7 +168,9 @@ TEST_F(DailyDriverTest, TheTasksReportCountAndSynchronize) {
   ASSERT_THAT(device.documents(), SizeIs(1));
   const PropertyDict document = device.documents()[0];
   EXPECT_EQ(*document.find("TBScalars")->dict()->find("k"), PropertyValue(1));
-  EXPECT_TRUE(document.contains("TBActivatedAppInfo"));
+  EXPECT_EQ((document.end() - 1)->first, "TBActivatedAppInfo");
+  EXPECT_EQ(textForm((document.end() - 1)->second),
+            "({bundle = b; version = ; adamID = 0; arch = 0; uuid = })");
   EXPECT_EQ(writtenScalars(device, "com.quill.tapline."), (Scalars{{"com.quill.tapline.c", 3}}));
   EXPECT_THAT(device.log(), Contains(kOSChange));
 }

@@ -8,13 +8,11 @@
 #include "driver/DailyDriver.h"
 #include "platform/Guarded.h"
 #include "platform/host/counters/HostTallybook.h"
-#include "platform/host/documents/JsonForm.h"
-#include "platform/host/documents/PtreeReader.h"
-#include "platform/host/documents/PtreeWriter.h"
 #include "platform/host/messages/HostMainLoop.h"
 #include "platform/host/messages/MessageFraming.h"
 #include "platform/host/messages/ServiceSocket.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
+#include "support/Documents.h"
 #include "support/ScarceMemory.h"
 #include "telemetry/TodaysScalars.h"
 
@@ -159,22 +157,21 @@ class ScarceMemory : public ::testing::Test {
   }
 
   static void expectWholeFiles(const TestDevice& device) {
-    std::string error;
     for (const fs::directory_entry& entry : fs::recursive_directory_iterator(device.path())) {
       const std::string name = entry.path().filename().string();
       const std::string path = fs::relative(entry.path(), device.path()).string();
-      EXPECT_FALSE(name.starts_with(".unfinished")) << path;
-      EXPECT_FALSE(name.ends_with("-journal")) << path;
+      SCOPED_TRACE(path);
+      EXPECT_FALSE(name.starts_with(".unfinished") || name.ends_with("-journal"));
       if (name.ends_with(".ptree")) {
         const std::string text = device.read(path);
-        EXPECT_TRUE(readPtree(text, error)) << path << ": " << error << '\n' << text;
-        EXPECT_THAT(text, ::testing::Not(::testing::HasSubstr("secret"))) << path;
+        valueOfPtree(text);
+        EXPECT_THAT(text, ::testing::Not(::testing::HasSubstr("secret")));
       } else if (name.ends_with(".jsonl")) {
         std::string text = device.read(path);
-        EXPECT_TRUE(text.empty() || text.ends_with('\n')) << path;
+        EXPECT_TRUE(text.empty() || text.ends_with('\n'));
         std::istringstream lines(text);
         for (std::string line; std::getline(lines, line);) {
-          EXPECT_TRUE(valueFromJsonText(line, error)) << path << ": " << error;
+          valueOfJson(line);
         }
       }
     }
@@ -196,9 +193,8 @@ TEST_F(ScarceMemory, AFailedAllocationCostsTheListenerOneMessageOrStepAtMost) {
       std::string error;
       peer = connectToService(host.directory(), kServiceName, 5, error);
       for (const int operation : {0, 2}) {
-        std::string document;
-        EXPECT_TRUE(writePtree(PropertyDict{{"operation", operation}}, document, error)) << error;
-        const std::string frame = messageFrame(document).value();
+        const std::string frame =
+            messageFrame(ptreeOf(PropertyDict{{"operation", operation}})).value();
         send(peer.get(), frame.data(), frame.size(), MSG_NOSIGNAL);
       }
     });

@@ -5,9 +5,7 @@
 
 #include <algorithm>
 
-#include "platform/host/documents/JsonForm.h"
-#include "platform/host/documents/PtreeReader.h"
-#include "platform/host/documents/PtreeWriter.h"
+#include "support/Documents.h"
 #include "support/TestDevice.h"
 
 namespace vesprun {
@@ -23,8 +21,7 @@ const std::string kChanged[] = {kMobile + "com.a.ptree", "Library/Logsmith/com.b
 /// The value of a text with single quotes.
 PropertyValue json(std::string text) {
   std::replace(text.begin(), text.end(), '\'', '"');
-  std::string error;
-  return valueFromJsonText(text, error).value_or(error);
+  return valueOfJson(text);
 }
 
 PropertyValue sameBuildAnd(const std::string& entries) {
@@ -43,14 +40,9 @@ struct TaskingDevice : TestDevice {
                        "logBlacklist": ["101", "102", "101"]})") {}
 
   void store(const std::string& file, const PropertyValue& values) const {
-    std::string document, error;
-    EXPECT_TRUE(writePtree(values, document, error)) << error;
-    write(file, document);
+    write(file, ptreeOf(values));
   }
-  PropertyValue stored(const std::string& file) const {
-    std::string error;
-    return readPtree(read(file), error).value_or(error);
-  }
+  PropertyValue stored(const std::string& file) const { return valueOfPtree(read(file)); }
   void sync() {
     syncTaskingAndOSChange();
     endProcess();

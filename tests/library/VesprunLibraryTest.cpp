@@ -8,8 +8,6 @@
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "common/ProcessState.h"
 #include "platform/host/HostPlatform.h"
-#include "platform/host/counters/CounterLines.h"
-#include "platform/host/counters/HostTallybook.h"
 #include "support/HostServiceTest.h"
 #include "support/ScarceMemory.h"
 #include "vesprun.h"
@@ -38,12 +36,7 @@ class VesprunLibraryTest : public ::testing::Test {
   std::string dump() const {
     std::string error;
     const auto opened = HostPlatform::open(folder.path(), error);
-    std::string text;
-    const auto append = [&text](std::string_view piece) { return !text.append(piece).empty(); };
-    opened->counters().read(
-        [&](CounterStore& store) { exportCounterLines(store, 0, 99'999, append, error); }, error);
-    EXPECT_EQ(error, "");
-    return text;
+    return linesOf(opened->counters());
   }
 
   std::string call(const char* entryPoint, const char* arguments = nullptr) {

@@ -7,13 +7,12 @@
 namespace vesprun {
 namespace {
 
-using ::testing::Contains, ::testing::IsEmpty;
+using ::testing::IsEmpty;
 
 constexpr const char* kDomain = "com.quill.aggregated.vesprun";
 constexpr std::int32_t kYesterday = TestDevice::kToday - 1;
 
-/// A device that whitelists "s" (two digits) and "d" (intervals 10) and has counted both, and that
-/// has other whitelisted keys on one day alone.
+/// A device that whitelists "s", and whose submissions fail or not.
 class DailyLogTest : public ::testing::Test {
  protected:
   void start(const char* fails) {
@@ -22,23 +21,13 @@ class DailyLogTest : public ::testing::Test {
         "system": {"osVersion": "Vesper 2"}, "submission": {"fails": ?},
         "languages": {"preferred": ["en"], "localizations": ["en"], "country": "IE"}})";
     device.emplace(description.replace(description.find('?'), 1, fails));
-    device->writeWhitelistJson(R"({"G": {
-        "ScalarKeys": {"s": {"sig_fig": 2}}, "ScalarKeyPrefixes": {"day.": {}},
-        "DistributionKeys": {"d": {"intervals": [10]}}, "DistributionKeyPrefixes": {"day.": {}}}})");
+    device->writeWhitelistJson(R"({"G": {"ScalarKeys": {"s": {}}}})");
     preferences = &device->platform().preferences();
   }
   void count() {
     std::string error;
     const auto work = [](CounterStore& store) {
-      for (std::int32_t day = kYesterday - 2; day <= kYesterday + 1; ++day) {
-        store.setScalar(day, "s", 12345 + 2000 * (day - kYesterday));
-        store.setScalar(day, "unlisted", 1);
-        const Sample sample{2.5 * (kYesterday + 2 - day), 0};
-        store.appendSamples(day, "d", {&sample, 1});
-        const std::string onlyThatDay = "day." + std::to_string(day - kYesterday);
-        store.setScalar(day, onlyThatDay, 1);
-        store.appendSamples(day, onlyThatDay, {&sample, 1});
-      }
+      store.setScalar(kYesterday, "s", 1);
       return true;
     };
     ASSERT_TRUE(device->platform().counters().write(work, error)) << error;
@@ -53,40 +42,6 @@ class DailyLogTest : public ::testing::Test {
   Preferences* preferences = nullptr;
   std::optional<TestDevice> device;
 };
-
-TEST_F(DailyLogTest, HoldsItsEntriesInOrder) {
-  start("false");
-  count();
-  write();
-  ASSERT_EQ(device->documents().size(), 1U);
-  EXPECT_EQ(textForm(device->documents()[0]),
-            "{TBCrashLogVersion = 1; TBStartDate = 2024-03-04 00:00:00 +0000; "
-            "TBLogCreationDate = 2024-03-05 09:15:02 +0000; "
-            "TBMetadata = {TBUserInterfaceLanguage = en; TBPreferredUserInterfaceLanguage = en; "
-            "TBUserSetRegionFormat = IE}; TBScalars = {day.-1 = 1; s = 12000; day.0 = 1}; "
-            "TBDistributions = {d = (5, 5, 5, 0, 1); day.-1 = (7.5, 7.5, 7.5, 0, 1); "
-            "day.0 = (5, 5, 5, 0, 1)}; "
-            "TBDistributionsHistogram = {d = {(-inf, 10] = 1}}; TBTasking = (); "
-            "TBTaskID = (no tasking id); TBTaskDigest = (no tasking digest); "
-            "TBWhitelistDigest = " +
-                TBConfig::init()->configFileDigest() + "}");
-  EXPECT_THAT(device->log(), Contains("info: writing aggregated log. yesterday=19786"));
-
-  preferences->LGSPreferencesSetValue("TaskingID", "id", kDomain);
-  preferences->LGSPreferencesSetValue("TaskingDigest", Bytes{1}, kDomain);
-  preferences->LGSPreferencesSetValue("TaskingPayload", PropertyArray{PropertyDict{{"a", 1}}},
-                                      kDomain);
-  const PropertyValue data(PropertyArray{PropertyDict{{"bundle_id", "b"}}});
-  const AppInfoList apps(&data);
-  write(&apps);
-  const PropertyDict second = device->documents().back();
-  EXPECT_EQ(textForm(*second.find("TBTaskID")), "id");
-  EXPECT_EQ(textForm(*second.find("TBTaskDigest")), "<01>");
-  EXPECT_EQ(textForm(*second.find("TBTasking")), "({a = 1})");
-  EXPECT_EQ((second.end() - 1)->first, "TBActivatedAppInfo");
-  EXPECT_EQ(textForm((second.end() - 1)->second),
-            "({bundle = b; version = ; adamID = 0; arch = 0; uuid = })");
-}
 
 TEST_F(DailyLogTest, NamesAPreviousOSVersionOnceThereIsALog) {
   start("false");

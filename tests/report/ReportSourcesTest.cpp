@@ -26,25 +26,17 @@ std::string scalarsOf(const Source& source) {
   return textForm(report.scalarsOutput());
 }
 
-TEST(InstalledAppInfo, CountsForTheLogAndForTheEvent) {
+TEST(InstalledAppInfo, IsCountedForTheLogOrForTheEvent) {
   const std::string apps =
-      R"("apps": [{"bundle": "a", "user": true}, {"bundle": "b", "user": false},
-                                       {"bundle": "c", "user": true}])";
-  {
-    SourceDevice device(apps + R"(, "events": {"used": []})");
-    EXPECT_EQ(scalarsOf(addInstalledAppInfo),
-              "{com.quill.homeshell.numAllInstalledApps = 3; "
-              "com.quill.homeshell.numThirdPartyApps = 2}");
+      R"("apps": [{"bundle": "a", "user": true}, {"bundle": "b", "user": false}])";
+  const std::string unused = R"(, "events": {"used": []})";
+  for (const auto& [events, isListed, isCounted] :
+       {std::tuple(unused, true, true), {"", false, true}, {unused, false, false}}) {
+    SourceDevice device(apps + events, isListed);
+    TBReport report;
+    EXPECT_EQ(addInstalledAppInfo(report).has_value(), isCounted);
+    EXPECT_EQ(report.scalarsOutput().size(), isListed ? 2U : 0U);
   }
-  SourceDevice device(apps, false);
-  EXPECT_EQ(scalarsOf([](TBReport& report) {
-              offerAppInstallsEvent(addInstalledAppInfo(report).value());
-            }),
-            "{}");
-  EXPECT_EQ(device.read("outbox/events.jsonl"),
-            R"({"time":"2024-03-05T09:15:02Z","event":"com.quill.homeshell.appInstalls",)"
-            R"("payload":{"numThirdPartyApps":2,"numAllApps":3}})"
-            "\n");
 }
 
 TEST(Metadata, NamesLanguagesAndRegion) {
@@ -157,50 +149,6 @@ TEST(KernelMemoryStatistics, StandInTheLogOnceTheirGatesHold) {
     }
     EXPECT_EQ(added, expected) << variables;
   }
-}
-
-TEST(KernelMemoryStatistics, StandInTheirOrder) {
-  std::string variables =
-      R"("vm.swapusage": {"data": "AAAAAAEAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAAA="},
-         "kern.memorystatus_thaw_count_since_boot": {"u64": 10},
-         "kern.memorystatus_freezer_below_threshold_count": {"u64": 0},
-         "kern.memorystatus_freezer_refreeze_count": {"u64": 10},
-         "kern.memorystatus_freezer_bytes_refrozen": {"u64": 129})";
-  std::vector<std::string> expected;
-  const auto add = [&](const std::string& variable, const char* width, const std::string& value,
-                       const std::string& row) {
-    variables += ", \"" + variable + R"(": {")" + width + "\": " + value + "}";
-    expected.push_back(row);
-  };
-  int next = 100;
-  for (const std::string name :
-       {"total", "one_bit_flip", "not_found", "1_byte", "2_byte", "4_byte", "8_byte", "16_byte",
-        "32_byte", "64_byte", "128_byte", "256_byte", "undiagnosed"}) {
-    const std::string value = std::to_string(next++);
-    add("vm.vmtc_" + name, "u32", value, "kernel.vmtc_" + name + ' ' + value);
-  }
-  const auto addStatus = [&](const std::string& name, const char* width, const std::string& value,
-                             const std::string& prefix, const std::string& shown) {
-    add("kern.memorystatus_" + name, width, value, prefix + "memorystatus_" + name + ' ' + shown);
-  };
-  addStatus("freeze_count", "u32", "4294967294", "kernel.", "4294967294");
-  addStatus("freeze_pageouts", "u64", "98304", "kernel.", "98304");
-  expected.emplace_back("memorystatus_freezer_thaws_per_gb 6");
-  addStatus("freeze_budget_pages_remaining", "u64", "9223372036854775808", "kernel.",
-            "-9223372036854775808");
-  addStatus("thaw_count", "u32", "18", "kernel.", "18");
-  expected.emplace_back("kernel.swapusage 4294967296");
-  for (const char* name : {"no_compressor_space", "no_swap_space", "below_min_pages",
-                           "low_probability_of_use", "other"}) {
-    addStatus(std::string("freezer_error_") + name + "_count", "u64", std::to_string(next), "",
-              std::to_string(next / 3));
-    next += 3;
-  }
-  addStatus("freezer_process_considered_count", "u64", "300", "", "300");
-  addStatus("freezer_skipped_full_count", "u64", "1", "", "9223372036854775807");
-  addStatus("freezer_thaw_percentage", "u64", "55", "", "55");
-  expected.emplace_back("memorystatus_freezer_refreeze_average 12");
-  EXPECT_EQ(memoryStatistics(variables), expected);
 }
 
 }  // namespace

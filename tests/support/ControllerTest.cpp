@@ -1,5 +1,7 @@
 #include "support/ControllerTest.h"
 
+#include <utility>
+
 #include "buffers/DeviceBuffers.h"
 #include "common/ProcessState.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
@@ -20,6 +22,21 @@ HostPlatform& ControllerTest::start(const std::string& registry, const std::stri
   statistics.add(53, {17}).add(4, {1000}).add(11, {3});
   _device->write("statistics.bin", statistics.bytes());
   return _device->platform();
+}
+
+void ControllerTest::answer(std::uint32_t opcode, std::uint32_t argument, const Bytes& bytes) {
+  const std::string file = std::to_string(opcode) + '-' + std::to_string(argument);
+  _tunnel += (_tunnel.empty() ? R"({"opcode": )" : R"(, {"opcode": )") + std::to_string(opcode) +
+             R"(, "argument": )" + std::to_string(argument) + R"(, "file": ")" + file + "\"}";
+  _files.emplace_back(file, bytes);
+}
+
+void ControllerTest::startController(const std::string& className, const std::string& others,
+                                     const std::string& registry) {
+  start(controller(className, std::exchange(_tunnel, {})) + registry, kVolume + others);
+  for (const auto& [file, content] : std::exchange(_files, {})) {
+    device().write(file, content);
+  }
 }
 
 void ControllerTest::endDevice() {

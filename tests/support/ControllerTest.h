@@ -23,6 +23,13 @@ class ControllerTest : public ::testing::Test {
   HostPlatform& start(const std::string& registry, const std::string& others = "",
                       const std::string& clock = "2024-03-05T09:15:02Z");
 
+  /// Adds an answer to the device that `startController` makes.
+  void answer(std::uint32_t opcode, std::uint32_t argument, const Bytes& bytes);
+  /// A device on whose 64 GB volume a quarter is free, with a controller that gives these answers.
+  /// `others` are further entries of the description, `registry` further ones of the registry.
+  void startController(const std::string& className = "QuillQNS3NVMeController",
+                       const std::string& others = "", const std::string& registry = "");
+
   TestDevice& device() { return *_device; }
   /// Expects that nothing is held that the registry gave out, and nothing was given back twice.
   void expectNothingHeld();
@@ -36,12 +43,18 @@ class ControllerTest : public ::testing::Test {
   void endDevice();
 
   std::optional<TestDevice> _device;
+  std::string _tunnel;
+  std::vector<std::pair<std::string, Bytes>> _files;
 };
 
 /// A registry entry of a class with these tunnel answers (the inside of the array) and other
 /// entries of its user client.
 std::string controller(const std::string& className, const std::string& tunnel = "",
                        const std::string& userClient = "");
+
+/// A user volume of 64 GB of which a quarter is free.
+inline const std::string kVolume =
+    R"(, "userVolume": {"blockSize": 4096, "blocks": 15625000, "available": 3906250})";
 
 /// The answer that "statistics.bin" is.
 inline const std::string kStatisticsAnswer = R"({"opcode": 13, "file": "statistics.bin"})";

@@ -8,6 +8,8 @@
 #include <unistd.h>
 
 #include "platform/SystemLog.h"
+#include "platform/host/counters/CounterLines.h"
+#include "platform/host/counters/HostTallybook.h"
 #include "platform/host/device/DeviceDirectory.h"
 #include "support/TemporaryFolder.h"
 
@@ -24,6 +26,19 @@ class MessageList final : public SystemLog {
 
   std::vector<std::string> messages;
 };
+
+/// The counters of these days as lines.
+inline std::string linesOf(HostTallybook& tallybook, std::int32_t from = 0,
+                           std::int32_t to = 99'999) {
+  std::string error;
+  std::string text;
+  const auto append = [&text](std::string_view piece) { return !text.append(piece).empty(); };
+  const auto work = [&](CounterStore& store) {
+    EXPECT_TRUE(exportCounterLines(store, from, to, append, error)) << error;
+  };
+  EXPECT_TRUE(tallybook.read(work, error)) << error;
+  return text;
+}
 
 /// A test of one service on an empty device directory.
 class HostServiceTest : public ::testing::Test {

@@ -5,22 +5,16 @@
 
 #include "common/ProcessState.h"
 #include "common/TextForm.h"
-#include "platform/host/documents/JsonForm.h"
-#include "platform/host/documents/PtreeReader.h"
-#include "platform/host/documents/PtreeWriter.h"
 #include "platform/host/files/Files.h"
+#include "support/Documents.h"
 
 namespace vesprun {
 
 namespace {
 
-template <typename Parse>
-PropertyDict dictionaryOf(const Parse& parse, const std::string& text) {
-  std::string error;
-  const std::optional<PropertyValue> value = parse(text, error);
-  const bool isDictionary = value && value->dict() != nullptr;
-  EXPECT_TRUE(isDictionary) << text << ": " << error;
-  return isDictionary ? *value->dict() : PropertyDict();
+PropertyDict dictionaryOf(const PropertyValue& value) {
+  EXPECT_NE(value.dict(), nullptr) << textForm(value);
+  return value.dict() != nullptr ? *value.dict() : PropertyDict();
 }
 
 }  // namespace
@@ -42,11 +36,8 @@ bool TestDevice::exists(std::string_view devicePath) const {
 }
 
 void TestDevice::writeWhitelistJson(std::string_view groups) const {
-  std::string error;
-  std::string document;
-  const PropertyDict root = dictionaryOf(valueFromJsonText, std::string(groups));
-  EXPECT_TRUE(writePtree(root, document, error)) << error;
-  write("Library/Application Support/Tallybook/Whitelist_Stagebox.ptree", document);
+  write("Library/Application Support/Tallybook/Whitelist_Stagebox.ptree",
+        ptreeOf(valueOfJson(groups)));
 }
 
 HostPlatform& TestDevice::platform() {
@@ -71,7 +62,7 @@ std::vector<PropertyDict> TestDevice::lines(std::string_view file) const {
   std::vector<PropertyDict> lines;
   std::istringstream stream(read("outbox/" + std::string(file)));
   for (std::string line; std::getline(stream, line);) {
-    lines.push_back(dictionaryOf(valueFromJsonText, line));
+    lines.push_back(dictionaryOf(valueOfJson(line)));
   }
   return lines;
 }
@@ -88,7 +79,7 @@ std::vector<PropertyDict> TestDevice::documents() const {
   std::vector<PropertyDict> documents;
   for (const std::string& name : names("outbox/logs")) {
     if (name.ends_with(".ptree")) {
-      documents.push_back(dictionaryOf(readPtree, read("outbox/logs/" + name)));
+      documents.push_back(dictionaryOf(valueOfPtree(read("outbox/logs/" + name))));
     }
   }
   return documents;

@@ -4,7 +4,7 @@
 #include <thread>
 
 #include "platform/host/counters/HostTallybook.h"
-#include "platform/host/documents/JsonForm.h"
+#include "support/Documents.h"
 #include "support/HostServiceTest.h"
 #include "telemetry/ReportingChannels.h"
 #include "telemetry/TodaysScalars.h"
@@ -43,10 +43,8 @@ std::optional<PropertyValue> baseline(TestDevice& device) {
 }
 
 void setBaseline(TestDevice& device, const std::string& json) {
-  std::string error;
-  device.platform().preferences().LGSPreferencesSetValue("netUsageBaseline",
-                                                         valueFromJsonText(json, error), kDomain);
-  EXPECT_EQ(error, "");
+  device.platform().preferences().LGSPreferencesSetValue("netUsageBaseline", valueOfJson(json),
+                                                         kDomain);
 }
 
 std::string jsonOf(const std::optional<PropertyValue>& value) {

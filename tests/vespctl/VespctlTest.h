@@ -1,32 +1,18 @@
 #pragma once
 
-#include <gmock/gmock.h>
-#include <sys/wait.h>
-
-#include <cstdlib>
-#include <string>
-
-#include "support/TemporaryFolder.h"
+#include "support/Documents.h"
+#include "support/ProgramTest.h"
 
 namespace vesprun {
 
 /// The program itself, on the device directory "$D", which `init` has made.
-class VespctlTest : public ::testing::Test {
+class VespctlTest : public ProgramTest {
  protected:
   VespctlTest() { EXPECT_EQ(run("init \"$D\""), 0) << error; }
 
-  /// What follows `vespctl` in a shell; the exit status, with what was printed in `output` and
-  /// `error`.
+  /// What follows `vespctl` in a shell; the exit status.
   int run(const std::string& arguments) {
-    const std::string script = "D='" + folder.path("device") + "'; cd '" + folder.path() +
-                               "'; '" VESPCTL_PROGRAM "' " + arguments;
-    folder.write("script", script);
-    const int status = std::system(("bash '" + folder.path("script") + "' >'" +
-                                    folder.path("output") + "' 2>'" + folder.path("error") + '\'')
-                                       .c_str());
-    output = folder.read("output");
-    error = folder.read("error");
-    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+    return runScript("D='" + folder.path("device") + "'; '" VESPCTL_PROGRAM "' " + arguments);
   }
 
   /// Runs the command, which must succeed, and gives what it printed.
@@ -45,6 +31,11 @@ class VespctlTest : public ::testing::Test {
         "find device -type f -print0 | sort -z | xargs -0 sha256sum");
   }
 
+  /// Writes a JSON text as ptree document.
+  void writePtree(std::string_view name, const std::string& json) {
+    folder.write(name, ptreeOf(valueOfJson(json)));
+  }
+
   /// Counts the lines of a dump.
   void import(const std::string& lines) {
     folder.write("lines", lines);
@@ -53,9 +44,6 @@ class VespctlTest : public ::testing::Test {
 
   static constexpr const char* kWhitelist =
       "device/Library/Application Support/Tallybook/Whitelist_Stagebox.ptree";
-  TemporaryFolder folder;
-  std::string output;
-  std::string error;
 };
 
 }  // namespace vesprun

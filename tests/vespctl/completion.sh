@@ -53,6 +53,8 @@ vespctl counters x set --|--day,--help
 vespctl counters x set --day |
 vespctl counters x set --day 3 key -|--day,--help
 vespctl counters x import |a file,a folder,plain
+vespctl counters x import -- |a file,a folder,plain
+vespctl counters x import -- y |
 vespctl prefs --user someone x re|remove
 vespctl prefs --user |
 vespctl run x -- -|

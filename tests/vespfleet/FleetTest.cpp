@@ -1,16 +1,13 @@
-#include <gmock/gmock.h>
 #include <signal.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <algorithm>
-#include <cstdlib>
 #include <random>
 #include <sstream>
 
 #include "HttpClient.h"
-#include "support/TemporaryFolder.h"
+#include "support/ProgramTest.h"
 
 namespace vesprun {
 namespace {
@@ -20,7 +17,7 @@ using ::testing::Not;
 
 /// The program on an SQLite store, and on a ClickHouse server where one is given by the
 /// environment.
-class FleetTest : public ::testing::TestWithParam<std::string> {
+class FleetTest : public ProgramTest, public ::testing::WithParamInterface<std::string> {
  protected:
   FleetTest() {
     if (GetParam() == "SQLite") {
@@ -50,15 +47,9 @@ class FleetTest : public ::testing::TestWithParam<std::string> {
     }
   }
 
-  /// What follows `vespfleet` in a shell; the exit status, with what was printed in `output` and
-  /// `error`.
+  /// What follows `vespfleet` in a shell; the exit status.
   int run(const std::string& arguments) {
-    const std::string command = "cd '" + folder.path() + "'; S='" + store + "'; '" +
-                                VESPFLEET_PROGRAM + "' " + arguments + " >output 2>error";
-    const int status = std::system(command.c_str());
-    output = folder.read("output");
-    error = folder.read("error");
-    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+    return runScript("S='" + store + "'; '" VESPFLEET_PROGRAM "' " + arguments);
   }
   /// The output of a question, which must have an answer.
   std::string ask(const std::string& question) {
@@ -70,19 +61,19 @@ class FleetTest : public ::testing::TestWithParam<std::string> {
     return ask("keys \"$S\"") + ask("scalar \"$S\" a --least 1") +
            ask("scalar \"$S\" b --least 1") + ask("distribution \"$S\" d --least 1");
   }
-  void load(const std::vector<std::string>& lines) {
+  void write(const char* file, const std::vector<std::string>& lines) {
     std::string text;
     for (const std::string& line : lines) {
       text += line + '\n';
     }
-    folder.write("lines", text);
+    folder.write(file, text);
+  }
+  void load(const std::vector<std::string>& lines) {
+    write("lines", lines);
     EXPECT_EQ(run("load \"$S\" lines"), 0) << error;
   }
 
-  TemporaryFolder folder;
   std::string store;
-  std::string output;
-  std::string error;
   std::unique_ptr<HttpClient> system;
   std::string dropDatabase;
 };
@@ -155,8 +146,10 @@ TEST_P(FleetTest, TellsNothingOfTooFewDevices) {
       "{\"day\":20000,\"devices\":5,\"minimum\":0,\"maximum\":4,\"mean\":2.0,\"quantiles\":"
       "{\"0.05\":0,\"0.25\":1,\"0.5\":2,\"0.75\":3,\"0.95\":4}}\n";
   EXPECT_EQ(ask("scalar \"$S\" a"), "{\"day\":-7,\"devices\":1}\n" + fifth);
-  EXPECT_EQ(ask("scalar \"$S\" a --from 0 --to 20000"), fifth);
+  EXPECT_EQ(ask("scalar \"$S\" a --from 00 --to 020000"), fifth);
   EXPECT_EQ(ask("scalar \"$S\" a --from 20001"), "");
+  EXPECT_EQ(ask("scalar \"$S\" a --from 020000 --least 08"), "{\"day\":20000,\"devices\":5}\n");
+  EXPECT_EQ(run("scalar \"$S\" a --from 0x1"), 2);
   EXPECT_EQ(ask("scalar \"$S\" b"), "{\"day\":20000,\"devices\":4}\n");
   EXPECT_EQ(ask("scalar \"$S\" d"), "") << "a key of the other kind";
   EXPECT_EQ(ask("distribution \"$S\" none") + ask("distribution \"$S\" nan"), "");
@@ -222,38 +215,6 @@ TEST_P(FleetTest, SkipsMalformedLinesAndNamesThem) {
   EXPECT_EQ(ask("scalar \"$S\" a --least 1 | wc -l"), "1\n");
 }
 
-TEST_P(FleetTest, EndsTheSameAfterAKillAnywhere) {
-  std::vector<std::string> lines;
-  for (int line = 0; line < 3000; ++line) {
-    lines.push_back(text({.device = "D" + std::to_string(line % 500),
-                          .day = 20000 + line % 3,
-                          .revision = 1 + line / 1500,
-                          .scalars = "\"a\":" + std::to_string(line) + ",\"b\":-5"}));
-  }
-  std::string all;
-  for (const std::string& line : lines) {
-    all += line + '\n';
-  }
-  folder.write("all", all);
-  for (const useconds_t delay : {0U, 5000U, 20000U, 60000U}) {
-    const pid_t child = fork();
-    if (child == 0) {
-      execl(VESPFLEET_PROGRAM, "vespfleet", "load", store.c_str(), folder.path("all").c_str(),
-            nullptr);
-      _exit(1);
-    }
-    usleep(delay);
-    kill(child, SIGKILL);
-    waitpid(child, nullptr, 0);
-  }
-  EXPECT_EQ(run("load \"$S\" all"), 0) << error;
-  EXPECT_EQ(ask("keys \"$S\""),
-            "{\"key\":\"a\",\"kind\":\"scalar\",\"devices\":500,\"days\":3}\n"
-            "{\"key\":\"b\",\"kind\":\"scalar\",\"devices\":500,\"days\":3}\n");
-  EXPECT_THAT(ask("scalar \"$S\" a --from 20001 --to 20001"),
-              HasSubstr("\"devices\":500,\"minimum\":1501,\"maximum\":2998,\"mean\":2249.5"));
-}
-
 TEST_P(FleetTest, RefusesWhatIsNoFleetStore) {
   EXPECT_EQ(run("keys \"$S\""), 1) << "nothing was loaded yet";
   EXPECT_THAT(error, ::testing::StartsWith("vespfleet: " + store + ": "));
@@ -290,7 +251,7 @@ TEST_P(FleetTest, RefusesWhatIsNoFleetStore) {
   }
 }
 
-TEST_P(FleetTest, ForgetsWhatWasReplaced) {
+TEST_P(FleetTest, KeepsOnlyTheLastRevisionsWhereverALoadIsKilled) {
   std::vector<std::string> lines;
   for (int revision = 1; revision <= 40; ++revision) {
     for (int device = 0; device < 20; ++device) {
@@ -302,8 +263,19 @@ TEST_P(FleetTest, ForgetsWhatWasReplaced) {
                             .histograms = "\"d\":{\"x\":" + value + "}"}));
     }
   }
+  write("all", lines);
+  for (const useconds_t delay : {0U, 5000U, 20000U, 60000U}) {
+    const pid_t child = fork();
+    if (child == 0) {
+      execl(VESPFLEET_PROGRAM, "vespfleet", "load", store.c_str(), folder.path("all").c_str(),
+            nullptr);
+      _exit(1);
+    }
+    usleep(delay);
+    kill(child, SIGKILL);
+    waitpid(child, nullptr, 0);
+  }
   load(lines);
-  const std::vector<std::string> last(lines.end() - 20, lines.end());
   const std::string answered = answers();
   EXPECT_THAT(answered, HasSubstr("\"devices\":20,\"minimum\":40000,\"maximum\":40019"));
   EXPECT_THAT(answered, HasSubstr("\"histogram\":{\"x\":800190}"));

@@ -84,27 +84,10 @@ class Process {
   pid_t _child = -1;
 };
 
-TEST(Vesprun, RunsWhatItsArgumentSays) {
-  const PropertyValue yesterday(TestDevice::kToday - 1);
-  const std::string kUnknown = "default: Unknown arg: --help";
-  const struct {
-    const char* argument;
-    std::string says;
-    std::optional<PropertyValue> storedDay;
-  } kCases[] = {{"-d", kYesterdaysTasks, yesterday},
-                {"-f", kYesterdaysTasks, std::nullopt},
-                {"-t", "default: daily tasks for day 19787", std::nullopt},
-                {"--help", kUnknown, std::nullopt}};
-  for (const auto& [argument, says, storedDay] : kCases) {
-    Process process(argument);
-    EXPECT_EQ(process.wait(), 0) << argument;
-    std::vector<std::string> log{kStarted, says, kEnded};
-    if (says != kUnknown) {
-      log.insert(log.end() - 1, kOSChange);
-    }
-    EXPECT_EQ(process.device.log(), log) << argument;
-    EXPECT_EQ(process.storedDay(), storedDay) << argument;
-  }
+TEST(Vesprun, LooksAtItsArgument) {
+  const Process process("--help");
+  EXPECT_EQ(process.wait(), 0);
+  EXPECT_THAT(process.device.log(), ElementsAre(kStarted, "default: Unknown arg: --help", kEnded));
 }
 
 TEST(Vesprun, ExitsWithZeroWhereNoDeviceIs) {

@@ -73,6 +73,8 @@ std::string movedRows(const std::string& dump) {
 
 }  // namespace
 
+bool lacksCause(std::string_view message) { return message.ends_with(": "); }
+
 std::string readFile(const fs::path& path) {
   std::ifstream file(path, std::ios::binary);
   return {std::istreambuf_iterator<char>(file), {}};
@@ -201,8 +203,14 @@ Sight Device::look() const {
     } else if (name.ends_with(".jsonl")) {
       std::istringstream lines(content);
       for (std::string line; std::getline(lines, line);) {
-        if (!valueFromJsonText(line, error)) {
+        const auto value = valueFromJsonText(line, error);
+        if (!value) {
           sight.faults.push_back(name + " has half a line: " + error);
+          continue;
+        }
+        const std::string* const message = value->dict()->findString("message");
+        if (message != nullptr && lacksCause(*message)) {
+          sight.faults.push_back(name + " does not say why: " + *message);
         }
       }
     }

@@ -5,6 +5,7 @@
 #include <filesystem>
 #include <map>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "TracedRun.h"
@@ -83,6 +84,9 @@ class Companion {
   int _status = 0;
   bool _ended = false;
 };
+
+/// True when an error's text ends where its reason should stand.
+bool lacksCause(std::string_view message);
 
 std::string readFile(const std::filesystem::path& path);
 void writeFile(const std::filesystem::path& path, const std::string& content);

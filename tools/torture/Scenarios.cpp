@@ -155,6 +155,12 @@ Faults judgeRun(const Outcome& outcome, bool killed, bool started, int worst = 0
     faults.push_back("exit status " + std::to_string(outcome.status) + "; " +
                      outcome.standardError);
   }
+  std::istringstream lines(outcome.standardError);
+  for (std::string line; std::getline(lines, line);) {
+    if (lacksCause(line)) {
+      faults.push_back("it does not say why: " + line);
+    }
+  }
   return faults;
 }
 
@@ -259,8 +265,10 @@ std::vector<Case> faultsOfCalls(const std::string& name, const std::vector<Call>
     const bool started = index >= own;
     const auto add = [&](const std::string& what, Fault fault) {
       fault.call = index + 1;
+      const bool isError = started && fault.kind == Fault::Kind::Error;
       cases.push_back({name + what + ":" + nameOfCall(number) + ":" + std::to_string(index + 1),
-                       [=](const fs::path& work) { return run(work, fault, started); }});
+                       [=](const fs::path& work) { return run(work, fault, started); },
+                       isError ? nameOfCall(number) + ' ' + calls[index].path : std::string()});
     };
     const std::vector<int>& errors = fittingErrors(number);
     const std::size_t one = errors.empty() ? 0 : random() % errors.size();
@@ -425,9 +433,8 @@ std::vector<Case> casesOf(const Command& command, const fs::path& folder, std::u
 }
 
 /// All lines or none, and never "done" without them.
-std::vector<Case> imports(const Programs& programs, const fs::path& folder, std::uint32_t seed,
-                          bool full) {
-  const auto original = std::make_shared<Device>(programs, folder / "imports");
+std::vector<Case> importsInto(const std::shared_ptr<Device>& original, const std::string& name,
+                              const fs::path& folder, std::uint32_t seed, bool full) {
   std::string rows;
   for (int row = 0; row < 300; ++row) {
     rows += "scalar\t" + std::to_string(kFirstDay) + "\thost.imported." + std::to_string(row) +
@@ -451,7 +458,20 @@ std::vector<Case> imports(const Programs& programs, const fs::path& folder, std:
     }
     return faults;
   };
-  return casesOf({"import", original, words, judge}, folder, seed, full);
+  return casesOf({name, original, words, judge}, folder, seed, full);
+}
+
+std::vector<Case> imports(const Programs& programs, const fs::path& folder, std::uint32_t seed,
+                          bool full) {
+  const auto original = std::make_shared<Device>(programs, folder / "imports");
+  std::vector<Case> cases = importsInto(original, "import", folder, seed, full);
+  const auto emptied = std::make_shared<Device>(*original, folder / "emptied");
+  const std::string database =
+      emptied->path() + "/var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
+  fs::rename(database, database + "-journal");  // which must not be played into the new file
+  std::ranges::move(importsInto(emptied, "first import", folder, seed, full),
+                    std::back_inserter(cases));
+  return cases;
 }
 
 /// Recorded files of a small machine that has counted for `hours`.

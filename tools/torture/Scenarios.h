@@ -14,6 +14,7 @@ namespace vesprun::torture {
 struct Case {
   std::string name;
   std::function<std::vector<std::string>(const std::filesystem::path& folder)> run;
+  std::string kind{};  ///< cases of one kind are much the same
 };
 
 struct Scenario {

@@ -10,6 +10,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
+#include <map>
 #include <stdexcept>
 #include <thread>
 
@@ -81,10 +82,14 @@ std::vector<Case> chosen(std::vector<Case> cases, const Options& options) {
   if (!options.only.empty()) {
     return nearest(std::move(cases), options.only);
   }
+  std::map<std::string, std::size_t> ofKind;
   std::vector<Case> result;
-  for (std::size_t index = options.seed % options.share; index < cases.size();
-       index += options.share) {
-    result.push_back(std::move(cases[index]));
+  for (Case& one : cases) {
+    const std::size_t before = ofKind[one.kind]++;
+    if (one.kind.empty() ? before % options.share == options.seed % options.share
+                         : before % options.share == 0) {
+      result.push_back(std::move(one));
+    }
   }
   return result;
 }
@@ -154,7 +159,8 @@ int run(int argc, char** argv) {
   Options options;
   app.add_option("--seed", options.seed, "Where the random choices begin");
   app.add_flag("--full", options.full, "Every error of every call and every byte of a full disk");
-  app.add_option("--share", options.share, "Only every N-th case")->check(CLI::PositiveNumber);
+  app.add_option("--share", options.share, "Of each kind of case only every N-th")
+      ->check(CLI::PositiveNumber);
   app.add_option("--scenario", options.scenario, "Only scenarios whose title holds this text");
   app.add_option("--only", options.only, "One case, by the name that a failure prints");
   CLI11_PARSE(app, argc, argv);

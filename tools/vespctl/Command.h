@@ -1,18 +1,13 @@
 #pragma once
 
 #include <CLI/CLI.hpp>
-#include <charconv>
-#include <concepts>
 #include <functional>
-#include <limits>
 #include <memory>
 #include <stdexcept>
 #include <string>
-#include <system_error>
 
 #include "common/PropertyValue.h"
 #include "platform/host/HostPlatform.h"
-#include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/FileLock.h"
 
 namespace vesprun {
@@ -62,26 +57,6 @@ std::string inputName(const std::string& file);
 
 /// Prints the JSON form and a line end.
 void printJson(const PropertyValue& value);
-
-/// Accepts only a decimal integer that fits `T`; leading zeros are fine, a sign only if `T` has
-/// one.
-template <std::integral T>
-CLI::Validator decimal() {
-  return CLI::Validator(
-      [](std::string& text) {
-        T number = 0;
-        const char* const end = text.data() + text.size();
-        const auto [rest, error] = std::from_chars(text.data(), end, number);
-        if (error != std::errc() || rest != end) {
-          return quotedText(text) + " is not a number from " +
-                 std::to_string(std::numeric_limits<T>::min()) + " to " +
-                 std::to_string(std::numeric_limits<T>::max());
-        }
-        text = std::to_string(number);
-        return std::string();
-      },
-      "");
-}
 
 /// Adds a command whose first argument is a device directory.
 CLI::App* addDeviceCommand(CLI::App& above, const std::string& name, const std::string& description,

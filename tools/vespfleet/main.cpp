@@ -5,6 +5,7 @@
 #include <map>
 #include <new>
 
+#include "DecimalNumber.h"
 #include "ExportedLine.h"
 #include "FleetStore.h"
 #include "LineReader.h"
@@ -155,11 +156,13 @@ CLI::App* addQuestion(CLI::App& vespfleet, const char* name, const char* help, Q
   CLI::App* command = vespfleet.add_subcommand(name, help);
   command->add_option("STORE", question.store, "The store")->required();
   command->add_option("KEY", question.key, "The key")->required();
-  command->add_option("--from", question.days.from, "First day, in days since 1970");
-  command->add_option("--to", question.days.to, "Last day");
+  command->add_option("--from", question.days.from, "First day, in days since 1970")
+      ->transform(decimal<std::int32_t>());
+  command->add_option("--to", question.days.to, "Last day")->transform(decimal<std::int32_t>());
   command
       ->add_option("--least", question.least,
-                   "Of a day with fewer devices than this only their number is told")
+                   "A day with fewer devices than this shows only their number")
+      ->transform(decimal<std::uint64_t>())
       ->capture_default_str();
   return command;
 }

@@ -42,28 +42,6 @@ TEST(TelemetryList, PicksTheLayoutByChipAndManufacturer) {
   }
 }
 
-TEST(TelemetryList, LogsOneRecordForEachBus) {
-  TestDevice device;
-  const PropertyValue dictionary = characteristics("KX4", "0", 2);
-  EXPECT_TRUE(LogNANDTelemetryList(telemetryList(2), &dictionary, ""));
-  const auto lines = device.lines("records.jsonl");
-  ASSERT_EQ(lines.size(), 2U);
-  EXPECT_EQ(*lines[1].find("type"), PropertyValue(176));
-  std::string text;
-  for (const auto& [key, value] : *lines[1].find("record")->dict()) {
-    if (key.find('[') == std::string::npos || key.ends_with("[0]")) {
-      text += key + ' ' + textForm(value) + '\n';
-    }
-  }
-  EXPECT_EQ(text,
-            "RD 1\nPE 11\nMax_PE_rate 21\nt0 31\nRet 41\nblock_type 51\nnum_pages -1\n"
-            "readStage[0] 0\ninitialReadStage[0] 0\nnandStageOfLife[0] 20\n"
-            "dspExceptionParameter[0] 92\nreadStage18NumOfErrorsBin[0] 33\n"
-            "readStage9NumOfErrorsBin[0] 0\nreadStage10NumOfErrorsBin[0] 55\n"
-            "readStage17NumOfErrorsBin[0] 65\nreadStage19NumOfErrorsBin[0] 80\n"
-            "retentionIndication[0] 0\n");
-}
-
 TEST(TelemetryList, SaysWhatCannotBeUsed) {
   struct Case {
     std::optional<PropertyValue> properties;

@@ -4,6 +4,8 @@
 
 #include "FieldsOf.h"
 #include "NANDInfo/lists/TelemetryList.h"
+#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "common/ProcessState.h"
 #include "platform/DictionaryHelpers.h"
 #include "support/TestDevice.h"
 
@@ -117,6 +119,24 @@ TEST(HexText, ReadsPairsFromTheLeft) {
   ::testing::internal::CaptureStdout();
   EXPECT_EQ(hexStringToByte("g1", 2), 0x01);
   EXPECT_EQ(::testing::internal::GetCapturedStdout(), "unrecognized hex character: g");
+}
+
+TEST(APIErrorMessage, KeepsTheFirstTextCutAt1023Bytes) {
+  ProcessState::startAfresh();
+  EXPECT_EQ(GetAPIErrorMessage(), "NA");
+  SetAPIErrorMessage("open: %s failed with 0x%x", "controller", 0xE00002C2U);
+  SetAPIErrorMessage("second");
+  EXPECT_EQ(GetAPIErrorMessage(), "open: controller failed with 0xe00002c2");
+
+  ProcessState::startAfresh();
+  SetAPIErrorMessage("%s", std::string(1023, 'x').append("yz").c_str());
+  EXPECT_EQ(GetAPIErrorMessage(), std::string(1023, 'x'));
+
+  ProcessState::startAfresh();
+  SetAPIErrorMessage("%s", "");
+  SetAPIErrorMessage("second");
+  EXPECT_EQ(GetAPIErrorMessage(), "");
+  ProcessState::startAfresh();
 }
 
 }  // namespace

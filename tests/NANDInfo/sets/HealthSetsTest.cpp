@@ -1,7 +1,8 @@
 #include "NANDInfo/sets/HealthSets.h"
 
-#include "NANDInfo/StatisticsDevice.h"
+#include "buffers/DeviceBuffers.h"
 #include "common/TextForm.h"
+#include "support/ControllerTest.h"
 #include "vesprun.hpp"
 
 namespace vesprun {
@@ -13,7 +14,7 @@ constexpr std::uint32_t kUeccReads = 414;
 constexpr std::uint32_t kPercentUsed = 431;
 constexpr std::uint32_t kSpare = 532;
 
-class HealthSetsTest : public StatisticsDevice {
+class HealthSetsTest : public ControllerTest {
  protected:
   void startWith(const std::string& className, const StatisticsBufferBuilder& statistics) {
     answer(13, 0, statistics.bytes());
@@ -59,22 +60,6 @@ TEST_F(HealthSetsTest, FiguresAreReadAsSigned) {
   }
 }
 
-TEST_F(HealthSetsTest, SetsForOthers) {
-  startWith("ORUStorage", StatisticsBufferBuilder().add(kSpare, {99}).add(680, {1, 2, 3}));
-  const std::string common =
-      "MaxPercentageNANDUsed=0 MaxE2EErrors=0 HostReadErrors=0 NumGrownBadBlocks=-1 ";
-  EXPECT_EQ(textOf(CopyTendmarkNANDInfo()), common + "NumDieFailures=-1 HLT_APIErrorMessage=NA ");
-  EXPECT_EQ(textOf(CopyOTANANDInfo()), common);
-  EXPECT_EQ(textOf(CopyInternalLabNANDInfo()),
-            common + "SpareAvailablePercent=99 IsNANDRetirable=1 HLT_APIErrorMessage=NA ");
-
-  start("");
-  const std::string error = "HLT_APIErrorMessage=gatherORUFTLData: Could not get nand_exporter_t ";
-  EXPECT_EQ(textOf(CopyTendmarkNANDInfo()), error);
-  EXPECT_EQ(textOf(CopyOTANANDInfo()), "");
-  EXPECT_EQ(textOf(CopyInternalLabNANDInfo()), "IsNANDRetirable=0 " + error);
-}
-
 TEST_F(HealthSetsTest, RetiredWhenSparesAreUsedUpOrLifeIsOver) {
   const std::array<std::uint64_t, 3> cases[] = {{100, 40, 0}, {99, 40, 1}, {100, 100, 1},
                                                 {100, 99, 0}, {0, 0, 1},   {~0ULL, 100, 0}};
@@ -106,9 +91,6 @@ TEST_F(ContentDeletionTest, AsksControllersThatCanTell) {
       // Refusing, if they were opened.
       {controller("QuillQNS3NVMeController", "", R"(, "openError": 6)"), false, ""},
       {controller("QuillEmbeddedNVMeController", "", R"(, "openError": 6)"), false, ""},
-      {"", false,
-       kNoMatch +
-           "_load_nand_infoCould not get matching DevRegKit service for exporting classes\n"},
   };
   for (const auto& [registry, recommends, errors] : cases) {
     start(registry);

@@ -1,4 +1,6 @@
-#include "NANDInfo/StatisticsDevice.h"
+#include "buffers/DeviceBuffers.h"
+#include "platform/host/documents/JsonForm.h"
+#include "support/ControllerTest.h"
 #include "vesprun.hpp"
 
 namespace vesprun {
@@ -20,7 +22,7 @@ Statistics snapshot(std::uint64_t stamp) {
   return Statistics().add(680, {1, 2, 3}).add(677, {0xAB00'0000'00CD'EF01 | stamp << 24});
 }
 
-class MagazineTest : public StatisticsDevice {
+class MagazineTest : public ControllerTest {
  protected:
   void snapshotAt(std::uint32_t hours, const Statistics& fields) {
     answer(10, hours, fields.bytes());

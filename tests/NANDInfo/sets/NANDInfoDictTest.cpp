@@ -70,25 +70,6 @@ TEST_F(NANDInfoDictTest, SummaryInOrderWithItsWidths) {
             "MaintenanceRequestsFailedProg 0\nMaintenanceRequestsFailedErase 0\n");
 }
 
-TEST_F(NANDInfoDictTest, FieldsUnderTheirKeys) {
-  const PropertyDict info = infoOf({{"numFlushes", 12345},
-                                    {"bitflipAddr0", 0x1'0000'0001},
-                                    {"memChokeDuration", 12345},
-                                    {"numPfail", 1},
-                                    {"maxMemLowDuration", 12345},
-                                    {"maxMemChokeDuration", 0x7'0000'3039},
-                                    {"numPfail", 2},
-                                    {"hostWrites", 9}});
-  EXPECT_EQ(figure(info, "NumFlushes"), "12345");
-  EXPECT_EQ(figure(info, "BitFlipAddrE2E"), "4294967297");
-  EXPECT_EQ(figure(info, "maxMemChokeDuration"), "12300");
-  EXPECT_EQ(figure(info, "maxMemExtremeDuration"), "12300");
-  EXPECT_EQ(figure(info, "memChokeDuration"), "12345");
-  EXPECT_EQ(figure(info, "numPfail"), "2");
-  EXPECT_EQ(figure(info, "hostWrites"), "none");
-  EXPECT_EQ(info.size(), infoOf({}).size() + 6);
-}
-
 TEST_F(NANDInfoDictTest, PartitionSizeNeedsBothStarts) {
   const std::string user = "userPartitionStart";
   const std::string intermediate = "intermediatePartitionStart";
@@ -98,24 +79,6 @@ TEST_F(NANDInfoDictTest, PartitionSizeNeedsBothStarts) {
   EXPECT_EQ(figure(infoOf({{user, 0xFFFFFFFF}, {intermediate, 100}}), size), "none");
   EXPECT_EQ(figure(infoOf({{user, 300}, {intermediate, 100}}), size), "200");
   EXPECT_EQ(figure(infoOf({{user, 1}, {intermediate, 3}}), size), "18446744073709551614");
-}
-
-TEST_F(NANDInfoDictTest, MaintenanceIsSummedAndCounted) {
-  const PropertyDict info = infoOf({{"numBootBlockRefreshSuccess0", 5},
-                                    {"numBootBlockRefreshFail0", 7},
-                                    {"numBootBlockRefreshSuccess1", 100},
-                                    {"mspBootBlockReadFail0", 9},
-                                    {"mspBootBlockReadFail1", 9},
-                                    {"mspBootBlockReadFail2", 9},
-                                    {"mspBootBlockReadFail3", 9},
-                                    {"mspBootBlockProgFail0", 1},
-                                    {"mspBootBlockProgFail1", 0},
-                                    {"mspBootBlockProgFail2", 1},
-                                    {"mspBootBlockEraseFail2", 1}});
-  EXPECT_EQ(figure(info, "NumMaintenanceRequests"), "12");
-  EXPECT_EQ(figure(info, "MaintenanceRequestsFailedRead"), "3");
-  EXPECT_EQ(figure(info, "MaintenanceRequestsFailedProg"), "2");
-  EXPECT_EQ(figure(info, "MaintenanceRequestsFailedErase"), "1");
 }
 
 }  // namespace

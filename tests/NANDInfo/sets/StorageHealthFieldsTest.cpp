@@ -1,8 +1,9 @@
 #include "NANDInfo/sets/StorageHealthFields.h"
 
-#include "NANDInfo/StatisticsDevice.h"
 #include "NANDInfo/sets/FilteredDict.h"
 #include "buffers/DeviceBuffers.h"
+#include "platform/host/documents/JsonForm.h"
+#include "support/ControllerTest.h"
 #include "vesprun.hpp"
 
 namespace vesprun {
@@ -14,7 +15,7 @@ const std::string kDisk =
     R"("HLT_Capacity_GB":64,"HLT_Diskfullness_BP":7500,"HLT_UserCapacity_MB":61035,)";
 const std::string kNoRefreshes = R"("HLT_numBootBlockRefreshes_max":0})";
 
-class StorageHealthFieldsTest : public StatisticsDevice {};
+class StorageHealthFieldsTest : public ControllerTest {};
 
 TEST_F(StorageHealthFieldsTest, FreezerFigureIsTheSwapOutThreadsFourthCounter) {
   using Snapshot = SnapshotBuilder;

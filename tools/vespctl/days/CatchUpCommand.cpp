@@ -4,6 +4,7 @@
 #include <string>
 
 #include "Command.h"
+#include "DecimalNumber.h"
 #include "outbox/SubmittedLogs.h"
 #include "platform/Platform.h"
 #include "platform/host/counters/HostTallybook.h"
@@ -101,7 +102,7 @@ void addCatchUpCommand(CLI::App& vespctl) {
       "Submits the reports of days that no daily log tells of, and prints the days",
       arguments->directory);
   command->add_option("--last", arguments->last, "How many days, the day before yesterday the last")
-      ->check(decimal<std::uint32_t>());
+      ->transform(decimal<std::uint32_t>());
   command->callback([arguments] { catchUp(arguments->directory, arguments->last); });
 }
 

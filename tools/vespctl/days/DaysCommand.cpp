@@ -7,6 +7,7 @@
 
 #include "Command.h"
 #include "Complaints.h"
+#include "DecimalNumber.h"
 #include "common/Calendar.h"
 #include "outbox/SubmittedLogs.h"
 #include "platform/host/counters/HostTallybook.h"
@@ -80,7 +81,7 @@ void addDaysCommand(CLI::App& vespctl) {
       vespctl, "days", "Prints what is kept of the last days, and which daily logs tell of them",
       arguments->directory);
   command->add_option("--last", arguments->last, "How many days, today the last of them")
-      ->check(decimal<std::uint32_t>());
+      ->transform(decimal<std::uint32_t>());
   command->callback([arguments] { showDays(arguments->directory, arguments->last); });
 }
 

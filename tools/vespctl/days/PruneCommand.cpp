@@ -9,6 +9,7 @@
 
 #include "Command.h"
 #include "Complaints.h"
+#include "DecimalNumber.h"
 #include "common/Calendar.h"
 #include "days/LogPruning.h"
 #include "platform/host/counters/HostTallybook.h"
@@ -131,15 +132,15 @@ void addPruneCommand(CLI::App& vespctl) {
   command
       ->add_option("--counters", wanted->counterDays,
                    "Keeps the counters of the last N days, and those of three days in any case")
-      ->check(decimal<std::uint32_t>());
+      ->transform(decimal<std::uint32_t>());
   command
       ->add_option("--outbox", wanted->outboxDays,
                    "Keeps the logs and lines that were written in the last N days")
-      ->check(decimal<std::uint32_t>());
+      ->transform(decimal<std::uint32_t>());
   command
       ->add_option("--outbox-size", wanted->outboxMebibytes,
                    "Removes the oldest logs until the outbox is smaller than that, in MiB")
-      ->check(decimal<std::uint64_t>());
+      ->transform(decimal<std::uint64_t>());
   command->callback([wanted] { prune(*wanted); });
 }
 

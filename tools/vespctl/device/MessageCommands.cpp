@@ -7,6 +7,7 @@
 #include <thread>
 
 #include "Command.h"
+#include "DecimalNumber.h"
 #include "device/AppFile.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeWriter.h"

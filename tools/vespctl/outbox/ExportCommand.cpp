@@ -5,6 +5,7 @@
 #include <limits>
 
 #include "Command.h"
+#include "DecimalNumber.h"
 #include "common/TextForm.h"
 #include "outbox/SubmittedLogs.h"
 #include "platform/host/documents/JsonForm.h"
@@ -96,8 +97,9 @@ void addExportCommand(CLI::App& vespctl) {
                    ? ""
                    : "a device's name has 1 to 255 bytes of text";
       });
-  command->add_option("--from", wanted->from, "First day, in days since 1970");
-  command->add_option("--to", wanted->to, "Last day");
+  command->add_option("--from", wanted->from, "First day, in days since 1970")
+      ->transform(decimal<std::int32_t>());
+  command->add_option("--to", wanted->to, "Last day")->transform(decimal<std::int32_t>());
   command->callback([wanted] { run(*wanted); });
 }
 

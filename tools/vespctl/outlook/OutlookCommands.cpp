@@ -3,6 +3,7 @@
 #include <optional>
 
 #include "Command.h"
+#include "DecimalNumber.h"
 #include "driver/DailyTasks.h"
 #include "outlook/JsonObject.h"
 #include "outlook/KeptBack.h"

@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "Command.h"
+#include "DecimalNumber.h"
 #include "library/EntryPoints.h"
 #include "platform/host/files/Files.h"
 

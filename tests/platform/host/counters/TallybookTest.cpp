@@ -5,8 +5,6 @@
 #include <sstream>
 #include <thread>
 
-#include "platform/host/counters/CounterLines.h"
-#include "platform/host/counters/HostTallybook.h"
 #include "platform/host/preferences/HostPreferences.h"
 #include "platform/host/services/HostClock.h"
 #include "support/HostServiceTest.h"
@@ -26,20 +24,25 @@ constexpr std::chrono::milliseconds kShortWait{50};
 
 class TallybookTest : public HostServiceTest {
  protected:
-  std::string dump(std::int32_t from = kToday - 10, std::int32_t to = kToday + 10) {
+  std::string dump(std::int32_t from = 0, std::int32_t to = 99'999) {
     HostTallybook tallybook(device, clock, preferences, log);
-    std::string text;
-    const auto append = [&text](std::string_view piece) {
-      text += piece;
-      return true;
-    };
-    EXPECT_TRUE(tallybook.read(
-        [&](CounterStore& store) {
-          EXPECT_TRUE(exportCounterLines(store, from, to, append, error)) << error;
-        },
-        error))
-        << error;
-    return text;
+    return linesOf(tallybook, from, to);
+  }
+
+  /// Reads every counter up to today as the report does; the number of samples.
+  static int readAll(HostTallybook& tallybook) {
+    const std::unique_ptr<TBHistory> history = tallybook.initWithDefaultPath();
+    history->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+        "", 0, kToday, [](std::string_view, std::int32_t, std::int64_t, bool&) {});
+    int samples = 0;
+    history->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+        "", 0, kToday,
+        [&](std::string_view, std::int32_t, TBHistoryDistributionEnumerator& values, bool&) {
+          for (double value = 0; values.getNextValueSecondsInDayOffset(value, nullptr);) {
+            ++samples;
+          }
+        });
+    return samples;
   }
 
   bool import(const std::string& text) {
@@ -180,7 +183,7 @@ TEST_F(TallybookTest, GivesTheRoomOfRemovedDaysBack) {
       return true;
     };
     EXPECT_TRUE(tallybook.write(remove, error)) << error;
-    EXPECT_EQ(dump(0, 30), "scalar\t20\tk\t1\nsample\t21\td\t1\t1\n");
+    EXPECT_EQ(dump(), "scalar\t20\tk\t1\nsample\t21\td\t1\t1\n");
     EXPECT_LT(std::filesystem::file_size(folder.path(kFile)), before / 3) << form;
     const auto removeAll = [](CounterStore& store) { return store.removeBefore(30).scalars == 1; };
     EXPECT_TRUE(tallybook.write(removeAll, error)) << error;
@@ -213,42 +216,6 @@ TEST_F(TallybookTest, RefusesKeysThatNoDocumentCarries) {
   EXPECT_THAT(folder.names(), IsEmpty());
   add(longest, 1);
   EXPECT_EQ(dump(), "scalar\t19787\t" + longest + "\t1\n");
-}
-
-TEST_F(TallybookTest, KeepsEveryCommittedCounterOfAKilledWriter) {
-  std::mt19937 random(7);
-  std::int64_t committed = 0;
-  for (int round = 0; round < 12; ++round) {
-    int ends[2];
-    ASSERT_EQ(pipe(ends), 0);
-    const pid_t child = startProcess([&] {
-      HostTallybook tallybook(device, clock, preferences, log);
-      for (char done = 'x'; done != 0;) {
-        tallybook.TBClientAddValueForScalarKey("first", 1);
-        tallybook.TBClientAddValueForScalarKey("second", 1);
-        tallybook.TBClientCheckpoint();
-        done = write(ends[1], &done, 1) == 1 ? 'x' : '\0';
-      }
-    });
-    close(ends[1]);
-    if (char done; round % 2 != 0 && read(ends[0], &done, 1) == 1) {  // also on a slow machine
-      ++committed;
-    }
-    usleep(static_cast<useconds_t>(random() % 60'000));
-    kill(child, SIGKILL);
-    waitpid(child, nullptr, 0);
-    for (char done; read(ends[0], &done, 1) == 1;) {
-      ++committed;
-    }
-    close(ends[0]);
-    const std::string text = dump();
-    const auto both = [](std::int64_t count) { return count == 0 ? "" : scalars(count, count); };
-    // A kill between the commit and the word of it counts one more.
-    committed += text == both(committed + 1) ? 1 : 0;
-    EXPECT_EQ(text, both(committed));
-  }
-  EXPECT_GT(committed, 0);
-  EXPECT_EQ(corruptions(), 0);
 }
 
 /// Damages `content` in the way that `number` picks.
@@ -285,20 +252,11 @@ TEST_F(TallybookTest, MovesDamagedFilesAsideAndGoesOn) {
     log.messages.clear();
     {
       HostTallybook tallybook(device, clock, preferences, log);
-      const std::unique_ptr<TBHistory> history = tallybook.initWithDefaultPath();
-      const auto ignore = [](std::string_view, std::int32_t, std::int64_t, bool&) {};
-      const auto readAll = [](std::string_view, std::int32_t,
-                              TBHistoryDistributionEnumerator& values, bool&) {
-        for (double value = 0; values.getNextValueSecondsInDayOffset(value, nullptr);) {
-        }
-      };
       tallybook.TBClientAddValueForScalarKey("k", 1);
       if (number % 2 == 0) {
         tallybook.TBClientCheckpoint();  // sometimes writing comes across the damage first
       }
-      history->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler("", 0, 99999, ignore);
-      history->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler("", 0, 99999,
-                                                                                   readAll);
+      readAll(tallybook);
       tallybook.TBClientAddValueForScalarKey("k", 1);
     }
     const std::vector<std::string> names = folder.names(kFolder);
@@ -411,14 +369,12 @@ TEST_F(TallybookTest, NeverTakesAnErrorOfReadingForDamage) {
     {
       const FailingReads failing([bad](int, off_t place) { return place / kPage == bad / kPage; });
       HostTallybook tallybook(device, clock, preferences, log);
-      tallybook.initWithDefaultPath()
-          ->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
-              "", 0, kToday, [](std::string_view, std::int32_t, std::int64_t, bool&) {});
+      readAll(tallybook);
       const auto ignore = [](std::string_view) { return true; };
-      const auto readAll = [&](CounterStore& store) {
+      const auto exportAll = [&](CounterStore& store) {
         exportCounterLines(store, 0, kToday, ignore, error);
       };
-      if (!tallybook.read(readAll, error)) {  // not every page is needed
+      if (!tallybook.read(exportAll, error)) {  // not every page is needed
         EXPECT_THAT(error, HasSubstr("disk I/O error"));
       }
     }
@@ -449,17 +405,8 @@ TEST_F(TallybookTest, NoticesAChunkThatIsCutShort) {
     ASSERT_TRUE(import(text));
     SqliteConnection(folder.path(kFile), kShortWait).execute(change);
     log.messages.clear();
-    int count = 0;
     HostTallybook tallybook(device, clock, preferences, log);
-    tallybook.initWithDefaultPath()
-        ->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
-            "", 0, kToday,
-            [&](std::string_view, std::int32_t, TBHistoryDistributionEnumerator& values, bool&) {
-              for (double value = 0; values.getNextValueSecondsInDayOffset(value, nullptr);) {
-                ++count;
-              }
-            });
-    EXPECT_LT(count, 10'000);
+    EXPECT_LT(readAll(tallybook), 10'000);
     ASSERT_THAT(log.messages, SizeIs(2)) << change;
     EXPECT_THAT(log.messages[1], HasSubstr(std::string("a chunk of samples ") + cause));
   }

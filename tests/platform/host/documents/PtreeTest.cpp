@@ -4,8 +4,8 @@
 #include <cmath>
 #include <limits>
 
-#include "platform/host/documents/PtreeReader.h"
-#include "platform/host/documents/PtreeWriter.h"
+#include "platform/host/documents/XmlText.h"
+#include "support/Documents.h"
 
 namespace vesprun {
 namespace {
@@ -16,24 +16,10 @@ std::string inPtree(const std::string& content) {
   return "<ptree version=\"1.0\">" + content + "</ptree>";
 }
 
-PropertyValue readOf(const std::string& document) {
-  std::string error;
-  std::optional<PropertyValue> value = readPtree(document, error);
-  EXPECT_TRUE(value) << error << "\n" << document.substr(0, 300);
-  return value.value_or(PropertyValue("not read"));
-}
-
 std::string readingError(const std::string& document) {
   std::string error;
   EXPECT_FALSE(readPtree(document, error)) << document.substr(0, 300);
   return error;
-}
-
-std::string writtenOf(const PropertyValue& value) {
-  std::string document;
-  std::string error;
-  EXPECT_TRUE(writePtree(value, document, error)) << error;
-  return document;
 }
 
 std::string nestedArrays(std::size_t count) {
@@ -67,12 +53,12 @@ PropertyDict everything() {
 }
 
 TEST(PtreeWriter, WritesTabIndentedDocuments) {
-  EXPECT_EQ(writtenOf(PropertyDict{{"name", "text"},
-                                   {"list", PropertyArray{std::uint8_t{7}, 2.0, 0.25F, true}},
-                                   {"empty", PropertyDict{}},
-                                   {"data", Bytes{1, 2, 3, 4}},
-                                   {"date", Date{1709630102, 0}},
-                                   {"text", "a<b>&\r\n"}}),
+  EXPECT_EQ(ptreeOf(PropertyDict{{"name", "text"},
+                                 {"list", PropertyArray{std::uint8_t{7}, 2.0, 0.25F, true}},
+                                 {"empty", PropertyDict{}},
+                                 {"data", Bytes{1, 2, 3, 4}},
+                                 {"date", Date{1709630102, 0}},
+                                 {"text", "a<b>&\r\n"}}),
             R"(<?xml version="1.0" encoding="UTF-8"?>
 <ptree version="1.0">
 <dict>
@@ -118,7 +104,7 @@ TEST(PtreeWriter, NamesThePlaceOfWhatADocumentCannotCarry) {
   for (int level = 0; level < 200; ++level) {
     nested = PropertyArray{std::move(nested)};
   }
-  EXPECT_EQ(readOf(writtenOf(nested)), nested);
+  EXPECT_EQ(valueOfPtree(ptreeOf(nested)), nested);
   EXPECT_THAT(refuses(PropertyArray{nested}),
               HasSubstr("\xE2\x80\xA6: nested deeper than 200 levels"));
 }
@@ -144,7 +130,7 @@ TEST(PtreeWriter, WritesTheSameDocumentInPieces) {
       EXPECT_LT(piece.size(), 70'000U);
       text += piece;
     }
-    EXPECT_EQ(text, writtenOf(PropertyDict{{"first", 1}, {"last", elements}}));
+    EXPECT_EQ(text, ptreeOf(PropertyDict{{"first", 1}, {"last", elements}}));
   }
   elements[1] = PropertyDict{{"text", "\x01"}};
   elements[2] = PropertyDict{{"text", "\x02"}};
@@ -154,16 +140,16 @@ TEST(PtreeWriter, WritesTheSameDocumentInPieces) {
 
 TEST(PtreeReader, ReadsBackEveryKindOfValue) {
   const PropertyDict original = everything();
-  const PropertyValue read = readOf(writtenOf(original));
+  const PropertyValue read = valueOfPtree(ptreeOf(original));
   EXPECT_EQ(read, PropertyValue(original));
   ASSERT_NE(read.dict(), nullptr);
   auto entry = read.dict()->begin();
   for (const auto& [key, value] : original) {
     EXPECT_EQ((entry++)->first, key);  // in order
   }
-  EXPECT_TRUE(std::isnan(readOf(writtenOf(std::nan(""))).number()->asDouble()));
-  EXPECT_TRUE(std::isnan(readOf(writtenOf(-std::nan(""))).number()->asDouble()));
-  const auto kindOf = [](const char* text) { return readOf(inPtree(text)).number()->kind(); };
+  EXPECT_TRUE(std::isnan(valueOfPtree(ptreeOf(std::nan(""))).number()->asDouble()));
+  EXPECT_TRUE(std::isnan(valueOfPtree(ptreeOf(-std::nan(""))).number()->asDouble()));
+  const auto kindOf = [](const char* text) { return valueOfPtree(inPtree(text)).number()->kind(); };
   EXPECT_EQ(kindOf("<integer>9223372036854775807</integer>"), NumberKind::Int64);
   EXPECT_EQ(kindOf("<integer>9223372036854775808</integer>"), NumberKind::UInt64);
   EXPECT_EQ(kindOf("<real>2</real>"), NumberKind::Double);
@@ -174,31 +160,35 @@ TEST(PtreeReader, TakesWhatOtherWritersMayWrite) {
   for (const std::string start :
        {"", "\xEF\xBB\xBF", "\n", "<?xml version='1.0'?>",
         "<?xml version = \"1.0\" encoding='utf-8' standalone=\"yes\" ?>\r\n"}) {
-    EXPECT_EQ(readOf(start + inPtree("<array><integer>1</integer></array>") + " \n"), one);
+    EXPECT_EQ(valueOfPtree(start + inPtree("<array><integer>1</integer></array>") + " \n"), one);
   }
-  EXPECT_EQ(readOf("<ptree  version = '1.0' >\r\n<array >\r\n\t<integer >1</integer >\n</array>"
+  EXPECT_EQ(
+      valueOfPtree("<ptree  version = '1.0' >\r\n<array >\r\n\t<integer >1</integer >\n</array>"
                    "</ptree >"),
-            one);
-  EXPECT_EQ(readOf(inPtree("<string>&#x41;&#66;&lt;&gt;&amp;&quot;&apos;&#x1F600;&#10;</string>")),
-            PropertyValue("AB<>&\"'\xF0\x9F\x98\x80\n"));
-  EXPECT_EQ(readOf(inPtree("<string>a\r\nb\rc&#13;\n</string>")), PropertyValue("a\nb\nc\r\n"));
-  EXPECT_EQ(readOf(inPtree("<data>\n\tAQ\n ID\t</data>")), PropertyValue(Bytes{1, 2, 3}));
-  EXPECT_EQ(readOf(inPtree("<array><string/><string></string><true></true><data/></array>")),
+      one);
+  EXPECT_EQ(
+      valueOfPtree(inPtree("<string>&#x41;&#66;&lt;&gt;&amp;&quot;&apos;&#x1F600;&#10;</string>")),
+      PropertyValue("AB<>&\"'\xF0\x9F\x98\x80\n"));
+  EXPECT_EQ(valueOfPtree(inPtree("<string>a\r\nb\rc&#13;\n</string>")),
+            PropertyValue("a\nb\nc\r\n"));
+  EXPECT_EQ(valueOfPtree(inPtree("<data>\n\tAQ\n ID\t</data>")), PropertyValue(Bytes{1, 2, 3}));
+  EXPECT_EQ(valueOfPtree(inPtree("<array><string/><string></string><true></true><data/></array>")),
             PropertyValue(PropertyArray{"", "", true, Bytes{}}));
-  EXPECT_EQ(readOf(inPtree("<dict>\n</dict>")), PropertyValue(PropertyDict{}));
+  EXPECT_EQ(valueOfPtree(inPtree("<dict>\n</dict>")), PropertyValue(PropertyDict{}));
   const PropertyValue repeated =
-      readOf(inPtree("<dict><key>a</key><true/><key> </key><string> </string>"
-                     "<key>a</key><string>\n</string></dict>"));
+      valueOfPtree(inPtree("<dict><key>a</key><true/><key> </key><string> </string>"
+                           "<key>a</key><string>\n</string></dict>"));
   EXPECT_EQ(repeated, PropertyValue(PropertyDict{{"a", "\n"}, {" ", " "}}));
   EXPECT_EQ(repeated.dict()->begin()->first, "a");
 }
 
 TEST(PtreeReader, SkipsCommentsWhereverXmlAllowsThem) {
-  EXPECT_EQ(readOf("<?xml version=\"1.0\"?><!-- a > b --><ptree version=\"1.0\"><!----><dict><!--"
+  EXPECT_EQ(
+      valueOfPtree("<?xml version=\"1.0\"?><!-- a > b --><ptree version=\"1.0\"><!----><dict><!--"
                    "<x>&y;--><key>a<!--b-->c</key><!-- \xC3\xA4 -->\n<array><!-- \n -->"
                    "<true><!-- - --></true><integer>1<!--2-->3</integer></array></dict><!-- -->"
                    "</ptree>\n<!-- end -->\n"),
-            PropertyValue(PropertyDict{{"ac", PropertyArray{true, 13}}}));
+      PropertyValue(PropertyDict{{"ac", PropertyArray{true, 13}}}));
   EXPECT_THAT(readingError(inPtree("<!-- a\n\n --><string>\n<!--\n-->&b;</string>")),
               StartsWith("line 5: an unknown entity"));
 }
@@ -211,7 +201,7 @@ TEST(PtreeReader, ReadsLongTextsAndMarkupWhole) {
   }
   std::string expected = text;
   std::erase(expected, '\r');
-  EXPECT_TRUE(readOf(inPtree("<string>" + text + "<!--" + text + "--></string>")) ==
+  EXPECT_TRUE(valueOfPtree(inPtree("<string>" + text + "<!--" + text + "--></string>")) ==
               PropertyValue(expected));
   const auto lines = std::count(text.begin(), text.end(), '\n');
   EXPECT_EQ(readingError(inPtree("<string>" + text + "&bad;</string>")),
@@ -309,16 +299,35 @@ TEST(PtreeReader, NamesTheLine) {
   EXPECT_EQ(readingError(start + "\n\n"), "line 6: the document ends early");
   EXPECT_EQ(readingError(nestedArrays(201)), "line 1: nested deeper than 200 levels");
   EXPECT_THAT(readingError(nestedArrays(1'000'000)), HasSubstr("nested"));
-  readOf(nestedArrays(200));
+  valueOfPtree(nestedArrays(200));
 }
 
 TEST(PtreeReader, RefusesADocumentCutAtAnyByte) {
-  const std::string document = writtenOf(everything());
+  const std::string document = ptreeOf(everything());
   const std::size_t end = document.size() - 1;  // without the last line feed it is complete
   for (std::size_t size = 0; size < end; ++size) {
     EXPECT_THAT(readingError(document.substr(0, size)), StartsWith("line ")) << size;
   }
-  readOf(document.substr(0, end));
+  valueOfPtree(document.substr(0, end));
+}
+
+TEST(XmlText, TakesEveryWidthOfCharacterAtItsEnds) {
+  for (const char* text :
+       {"", "plain", "\t\n\r ", "\x7F", "\xC2\x80", "\xDF\xBF", "\xE0\xA0\x80", "\xED\x9F\xBF",
+        "\xEE\x80\x80", "\xEF\xBF\xBD", "\xF0\x90\x80\x80", "\xF4\x8F\xBF\xBF"}) {
+    EXPECT_TRUE(isXmlText(text)) << text;
+  }
+}
+
+TEST(XmlText, RefusesControlsSurrogatesNonCharactersAndMalformedUtf8) {
+  for (const char* text :
+       {"\x01", "\x1F", "\xEF\xBF\xBE", "\xEF\xBF\xBF", "\xED\xA0\x80", "\xED\xBF\xBF", "\x80",
+        "\xC0\xAF", "\xC1\xBF", "\xE0\x9F\xBF", "\xF0\x8F\xBF\xBF", "\xF4\x90\x80\x80", "\xF5",
+        "\xC3", "\xC3(", "\xE2\x82", "\xE2\x82(", "\xF0\x9F\x98", "\xF0(\x98\x80"}) {
+    EXPECT_FALSE(isXmlText(text)) << text;
+    EXPECT_EQ(xmlTextLength("good" + std::string(text) + "after"), 4U);
+  }
+  EXPECT_FALSE(isXmlText(std::string("a\0b", 3)));
 }
 
 }  // namespace
