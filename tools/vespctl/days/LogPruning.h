@@ -7,7 +7,7 @@
 
 #include "common/Date.h"
 #include "platform/host/device/DeviceDirectory.h"
-#include "platform/host/files/FileLock.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 
@@ -44,7 +44,8 @@ class LogPruning {
 
   const DeviceDirectory& _directory;
   Date _now;
-  std::optional<FolderLock> _lock;  ///< a header without a log is not one of a log that is coming
+  /// Of the folder: a header without a log is not one of a log that is coming.
+  std::optional<FileDescriptor> _lock;
   std::vector<std::string> _removed;
   std::vector<std::string> _problems;
 };

@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <memory>
+#include <thread>
 
 #include "common/Calendar.h"
 
@@ -31,6 +32,39 @@ bool readAll(int file, std::string& content) {
 }
 
 }  // namespace
+
+bool takeLock(int descriptor, int operation, std::chrono::milliseconds longestWait,
+              const std::string& path, std::string& error, bool* busy) {
+  constexpr std::chrono::milliseconds kPause(1);
+  const auto end = std::chrono::steady_clock::now() + longestWait;
+  while (flock(descriptor, operation | LOCK_NB) != 0) {
+    if (errno != EWOULDBLOCK && errno != EINTR) {
+      error = systemError(path);
+      return false;
+    }
+    if (std::chrono::steady_clock::now() >= end) {
+      error = path + ": another process keeps it locked";
+      if (busy != nullptr) {
+        *busy = true;
+      }
+      return false;
+    }
+    std::this_thread::sleep_for(kPause);
+  }
+  return true;
+}
+
+std::optional<FileDescriptor> lockFolder(const std::string& folder, std::string& error,
+                                         int operation, std::chrono::milliseconds longestWait,
+                                         bool* busy) {
+  FileDescriptor descriptor = openFolder(folder);
+  if (!descriptor.isOpen()) {
+    error = systemError(folder);
+  } else if (takeLock(descriptor.get(), operation, longestWait, folder, error, busy)) {
+    return descriptor;
+  }
+  return std::nullopt;
+}
 
 std::optional<std::string> readWholeFile(const std::string& path, std::string& error,
                                          bool* missing) {

@@ -170,8 +170,7 @@ bool HostPreferences::writeChanges(const Domain& domain, std::string& error) {
   if (!folder) {
     return false;
   }
-  const std::optional<FolderLock> lock =
-      FolderLock::take(*folder, error, FolderLock::Kind::Exclusive, _longestWait);
+  const std::optional<FileDescriptor> lock = lockFolder(*folder, error, LOCK_EX, _longestWait);
   if (!lock) {
     return false;
   }
