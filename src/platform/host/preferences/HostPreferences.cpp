@@ -85,9 +85,8 @@ void HostPreferences::LGSPreferencesSetValue(std::optional<std::string_view> key
     _log.write(LogLevel::Error, "no key to change in domain " + quotedText(domain));
     return;
   }
-  std::string document;
   std::string error;
-  if (value && !writePtree(PropertyDict{{std::string(*key), *value}}, document, error)) {
+  if (value && !isPtree({PropertyDict{{std::string(*key), *value}}}, error)) {
     _log.write(LogLevel::Error, found->path + ": " + error);
     return;
   }
