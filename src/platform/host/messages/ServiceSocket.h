@@ -9,8 +9,8 @@
 
 namespace vesprun {
 
-/// The listening socket of a named service, `run/NAME`, for its owner alone; removed at the end. The
-/// process holds the lock of the folder `run`: two cannot take the name from each other, a file
+/// The listening socket of a named service, `run/NAME`, for its owner alone; removed at the end.
+/// The process holds the lock of the folder `run`: two cannot take the name from each other, a file
 /// without a holder is left from a kill, and a device has one service at a time.
 class ServiceSocket {
  public:
