@@ -171,7 +171,8 @@ TEST_F(OutlookTest, LooksAtADeviceWithoutTouchingIt) {
 TEST_F(OutlookTest, ExplainsByWhatAKeyLeavesOrStays) {
   import(
       "scalar\t19785\tkey\t14\nscalar\t19786\tkey\t26\nscalar\t19787\tkey\t9\n"
-      "scalar\t19786\tkey.longer\t1\nsample\t19786\tpre.d\t3\t0\nsample\t19786\theld.d\t3\t0\n");
+      "scalar\t19786\tkey.longer\t1\nsample\t19786\tpre.d\t3\t0\nsample\t19786\theld.d\t3\t0\n"
+      "sample\t19786\tpre.d.longer\t9\t0\n");
   writePtree(kWhitelist, R"({
       "A": {"ScalarKeys": {"key": {}, "held": {"sig_fig": "2"}, "text": "x"},
             "ScalarKeyPrefixes": {"pre.": {}}, "DistributionKeyPrefixes": {"pre": {"intervals": [5]}}},
@@ -227,6 +228,7 @@ TEST_F(OutlookTest, FindsEachFaultOfAWhitelist) {
         "ScalarKeyPrefixes": {"p.": {"sig_fig": 2}, "p.x": {}, "t.x": {}}},
       "InternalTesting": {"ScalarKeys": {"tested": {}, "p.in": {"sig_fig": 2}}, "ScalarKeyPrefixes": {"t.": {}}},
       "B": {"ScalarKeys": {"again": {"sig_fig": 2}, "t.k": {}},
+        "DistributionKeys": {"e": {"sig_fig": 1}},
         "DistributionKeyPrefixes": {"": {"intervals": [1.0, 1]}}}})");
   folder.write("twice", R"(<ptree version="1.0"><dict><key>G</key><true/><key>G</key><dict>
       <key>ScalarKeys</key><true/><key>ScalarKeys</key><dict><key>k</key><true/><key>l</key><dict/>
@@ -242,6 +244,7 @@ TEST_F(OutlookTest, FindsEachFaultOfAWhitelist) {
        "A/ScalarKeys/p.same/same as its prefix\nA/ScalarKeys/again/replaced by a later group\n"
        "A/ScalarKeyPrefixes/p.x/prefix never reached\n"
        "InternalTesting/ScalarKeys/p.in/same as its prefix\n"
+       "B/DistributionKeys/e/unread option\n"
        "B/DistributionKeyPrefixes//intervals do not rise\n"
        "B/DistributionKeyPrefixes//empty prefix\n"},
       {"twice",

@@ -184,6 +184,24 @@ TEST_F(PageTest, PutsKeysThatBeginAlikeTogether) {
   }
 }
 
+TEST_F(PageTest, FoldsOldReportsAndLeavesOldEventsOut) {
+  std::string days;
+  std::string events;
+  for (int i = 1; i <= 450; ++i) {
+    days += i <= 20 ? "scalar\t" + std::to_string(i) + "\ts.a\t1\n" : "";
+    events += R"({"event":"e","time":"1970-01-02T00:00:00Z","payload":{"n":)" + std::to_string(i) +
+              "}}\n";
+  }
+  import(days);
+  folder.write("device/device.json", R"({"clock": "1970-01-23T09:00:00Z", "registry": []})");
+  print("catch-up \"$D\" --last 30");
+  folder.write("device/outbox/events.jsonl", events);
+  EXPECT_THAT(
+      page(),
+      AllOf(HasSubstr(">6 earlier reports<"), HasSubstr(">450 sent, the last 1970-01-02<"),
+            HasSubstr("<p class=values>1970-01-02 201\n"), HasSubstr("\n1970-01-02 450\n")));
+}
+
 TEST_F(PageTest, NamesWhatItCannotRead) {
   report(1, "scalar\ts.a\t1");
   folder.write("device/outbox/logs/0007-193-log-aggregated.ptree", "<ptree");

@@ -9,9 +9,9 @@
 namespace vesprun {
 namespace {
 
-using ::testing::AllOf, ::testing::AnyOf;
+using ::testing::AllOf, ::testing::AnyOf, ::testing::EndsWith;
 using ::testing::HasSubstr;
-using ::testing::IsEmpty;
+using ::testing::IsEmpty, ::testing::MatchesRegex;
 using ::testing::Not;
 using ::testing::StartsWith;
 
@@ -19,6 +19,7 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
   folder.write("apps", R"([{"version": "1"}, {"uuid": "0011223-34455-6677-8899-AABBCCDDEEFF"}])");
   folder.write("bad", "sample\t1\tk\tnan(x)\t0\n");
   folder.write("file/outbox/logs", "");
+  folder.write("huge/device.json", std::string(17'000'000, ' '));
   const char* const noNumber = " is not a number from 0 to ";
   const struct {
     int status;  ///< 2: the arguments are wrong
@@ -70,6 +71,18 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
     EXPECT_EQ(lines, status == 2 ? 2 : 1) << error << "where help is, too";
   }
   EXPECT_EQ(print("counters \"$D\" dump"), "") << "nothing was changed";
+}
+
+TEST_F(VespctlTest, DumpsAllButKeysThatBreakALine) {
+  for (const char* const change :
+       {"set $'a\\nb' 1", "sample $'a\\nb' 1", "set k 2", "sample d 3"}) {
+    print("counters \"$D\" " + std::string(change) + " --day 7");
+  }
+  EXPECT_EQ(run("counters \"$D\" dump"), 1);
+  EXPECT_THAT(output, MatchesRegex("scalar\t7\tk\t2\nsample\t7\td\t3\t[0-9]+\n"));
+  EXPECT_EQ(error,
+            "vespctl: 2 counters, the first of them \"a\\x0ab\", are left out: no line can carry a "
+            "line feed in a key\n");
 }
 
 TEST_F(VespctlTest, TakesNumbersAsDecimalOnes) {
@@ -140,6 +153,44 @@ TEST_F(VespctlTest, ShowsSubmittedLogs) {
                             HasSubstr("count 2, min 1, mean 2, max 3, standard deviation 1\n"),
                             HasSubstr("  (-inf, 2]  " + std::string(40, '#') + " 1\n"),
                             HasSubstr("   (2, inf)   -4\n")));
+}
+
+TEST_F(VespctlTest, ExportsNothingOfAnUnsoundDailyLog) {
+  const std::string dates =
+      R"({"TBStartDate": {"date": "2024-03-05T00:00:00Z"}, "TBLogCreationDate": {"date": "2024-03-06T00:00:00Z"})";
+  const std::string digest = dates + R"(, "TBWhitelistDigest": "w")";
+  const auto log = [&](const char* scalars, const char* distributions, const char* histograms) {
+    return digest + R"(, "TBScalars": )" + scalars + R"(, "TBDistributions": )" + distributions +
+           R"(, "TBDistributionsHistogram": )" + histograms + "}";
+  };
+  const char* const notFive = "a distribution that is not five numbers";
+  const char* const notCounts = "a histogram that is no dictionary of counts";
+  const std::pair<std::string, const char*> cases[] = {
+      {"[]", "not a dictionary"},
+      {R"({"TBStartDate": 1, "TBLogCreationDate": 2})", "a date is missing"},
+      {dates + "}", "the whitelist digest is missing"},
+      {log("[]", "{}", "{}"), "its scalars, distributions or histograms are missing"},
+      {log(R"({"k": 1.5})", "{}", "{}"), "a scalar that is no integer"},
+      {log("{}", R"({"d": [1, 2, 3, 4]})", "{}"), notFive},
+      {log("{}", R"({"d": [1, 2, 3, 4, 5.5]})", "{}"), notFive},
+      {log("{}", R"({"d": [1, 2, 3, "4", 5]})", "{}"), notFive},
+      {log("{}", "{}", R"({"d": 1})"), notCounts},
+      {log("{}", "{}", R"({"d": {"(-inf, 1]": "1"}})"), notCounts},
+  };
+  std::string complaints;
+  for (const auto& [document, fault] : cases) {
+    const std::string name =
+        std::to_string(1000 + std::count(complaints.begin(), complaints.end(), '\n')) +
+        "-193-log-aggregated.ptree";
+    writePtree("device/outbox/logs/" + name, document);
+    complaints += "vespctl: " + name + ": " + fault + '\n';
+  }
+  writePtree("device/outbox/logs/2000-193-log-aggregated.ptree", log(R"({"k": 1})", "{}", "{}"));
+  EXPECT_EQ(run("export \"$D\" --device d"), 1);
+  EXPECT_EQ(error, complaints);
+  EXPECT_THAT(output, AllOf(HasSubstr(R"("day":19787,"revision":1,)"), EndsWith("{}}\n")));
+  EXPECT_THAT(print("show \"$D\""),
+              HasSubstr("1000-193-log-aggregated.ptree\n  cannot be read: not a dictionary\n"));
 }
 
 TEST_F(VespctlTest, CollectsWhatTheStarterWhitelistLetsLeave) {

@@ -133,11 +133,14 @@ TEST_P(FleetTest, HoldsWhatTheHighestRevisionSaysInWhateverOrderItArrives) {
 TEST_P(FleetTest, TellsNothingOfTooFewDevices) {
   std::vector<std::string> lines;
   for (int device = 0; device < 5; ++device) {
-    Line line{.device = "D" + std::to_string(device),
-              .distributions =
-                  R"("d":[1.0,4.0,2.5,5.0,4],"none":[0,0,0,0,0],"nan":[1,2,{"real":"nan"},1,2])"};
+    Line line{
+        .device = "D" + std::to_string(device),
+        .distributions =
+            R"("d":[1.0,4.0,2.5,5.0,4],"none":[0,0,0,0,0],"nan":[1,2,{"real":"nan"},1,2],"e":[1.0,4.0,2.5,5.0,4])"};
     line.scalars = "\"a\":" + std::to_string(device) + (device < 4 ? ",\"b\":1" : "");
-    line.histograms = device < 4 ? R"~("d":{"(-inf, 2]":2,"(2, inf)":2})~" : "";
+    const std::string boundary = std::to_string(device);
+    line.histograms = R"~("e":{"(-inf, )~" + boundary + "]\":2,\"(" + boundary + ", inf)\":2}";
+    line.histograms += device < 4 ? R"~(,"d":{"(-inf, 2]":2,"(2, inf)":2})~" : "";
     lines.push_back(text(line));
   }
   lines.push_back(text({.device = "D0", .day = -7, .scalars = "\"a\":9223372036854775807"}));
@@ -158,10 +161,16 @@ TEST_P(FleetTest, TellsNothingOfTooFewDevices) {
   EXPECT_EQ(ask("distribution \"$S\" d"), statistics + "null}\n");
   EXPECT_EQ(ask("distribution \"$S\" d --least 4"),
             statistics + "{\"(-inf, 2]\":8,\"(2, inf)\":8}}\n");
+  EXPECT_EQ(error, "");
+  EXPECT_THAT(ask("distribution \"$S\" e"), HasSubstr(R"~({"(-inf, 0]":2,"(-inf, 1]":2,)~"));
+  EXPECT_THAT(error, HasSubstr("day 20000: devices counted between different boundaries"));
   EXPECT_EQ(ask("keys \"$S\""),
             "{\"key\":\"a\",\"kind\":\"scalar\",\"devices\":5,\"days\":2}\n"
             "{\"key\":\"b\",\"kind\":\"scalar\",\"devices\":4,\"days\":1}\n"
-            "{\"key\":\"d\",\"kind\":\"distribution\",\"devices\":5,\"days\":1}\n");
+            "{\"key\":\"d\",\"kind\":\"distribution\",\"devices\":5,\"days\":1}\n"
+            "{\"key\":\"e\",\"kind\":\"distribution\",\"devices\":5,\"days\":1}\n");
+  EXPECT_EQ(run("keys \"$S\" >/dev/full 2>error #"), 1);
+  EXPECT_EQ(error, "vespfleet: standard output cannot be written\n");
 }
 
 TEST_P(FleetTest, SkipsMalformedLinesAndNamesThem) {

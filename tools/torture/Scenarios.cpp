@@ -3,6 +3,7 @@
 #include <sys/syscall.h>
 
 #include <algorithm>
+#include <array>
 #include <cstring>
 #include <iterator>
 #include <map>
@@ -195,6 +196,23 @@ Faults lostSteps(const Device& device, const Sight& sight) {
                                              : Faults{"more than one step lost: " + lost};
 }
 
+/// What others left for the device is used, or the log says why not.
+Faults silence(const Device& device, const Outcome& outcome, int error) {
+  const std::string& place = outcome.place;
+  const auto holds = [&place](const std::string& part) { return place.find(part) != place.npos; };
+  const auto begins = [&place](const char* call) { return place.starts_with(call); };
+  const bool isInput =
+      holds(device.path()) &&
+      std::ranges::any_of(std::to_array({"/device.json", "/kernel/", "/controller/",
+                                         "/Library/Logsmith", "/Whitelist"}),
+                          holds) &&
+      std::ranges::any_of(std::to_array({"openat", "read", "pread", "getdents"}), begins);
+  const std::string said = readFile(device.path() + "/outbox/log.jsonl") + outcome.standardError;
+  return isInput && said.find(std::strerror(error)) == std::string::npos
+             ? Faults{"nothing is said of " + place}
+             : Faults();
+}
+
 Faults runWithFault(const Reference& reference, const fs::path& folder, const Fault& fault,
                     bool started) {
   Device device(reference.device, folder);
@@ -208,6 +226,7 @@ Faults runWithFault(const Reference& reference, const fs::path& folder, const Fa
   faults += halfway.faults;
   if (fault.kind == Fault::Kind::Error) {
     faults += lostSteps(device, halfway);
+    faults += silence(device, outcome, fault.error);
   }
   faults += finishTheDays(device);
   faults += judge(device.look(), reference, killed || fault.kind == Fault::Kind::Short);

@@ -85,20 +85,12 @@ void makeStore(const std::string& path) {
   if (std::filesystem::exists(std::filesystem::symlink_status(path, ignored))) {
     return;
   }
-  SqliteConnection empty(":memory:", kLongestWait);
-  empty.execute(kSchema);
-  sqlite3_int64 size = 0;
-  const std::unique_ptr<unsigned char, decltype(&sqlite3_free)> image(
-      sqlite3_serialize(empty.handle(), "main", &size, 0), sqlite3_free);
-  if (!image) {
-    throw std::bad_alloc();
-  }
   const std::filesystem::path file(path);
   const std::string folder = file.has_parent_path() ? file.parent_path().string() : ".";
   std::string error;
   auto added = AtomicFile::Added::Failed;
   if (auto document = AtomicFile::create(folder, error)) {
-    document->append(asText({image.get(), static_cast<std::size_t>(size)}));
+    document->append(newSqliteFile(kSchema));
     added = document->addNew(file.filename().string(), error);
   }
   if (added == AtomicFile::Added::Failed) {

@@ -1,6 +1,7 @@
 #include <CLI/CLI.hpp>
 #include <cstdio>
 #include <cstring>
+#include <fstream>
 #include <iostream>
 #include <map>
 #include <new>
@@ -8,16 +9,17 @@
 #include "DecimalNumber.h"
 #include "ExportedLine.h"
 #include "FleetStore.h"
-#include "LineReader.h"
 #include "Statistics.h"
 #include "common/PropertyDict.h"
 #include "platform/host/documents/JsonForm.h"
+#include "platform/host/files/LineReader.h"
 #include "platform/host/files/StandardStreams.h"
 
 namespace vesprun {
 namespace {
 
 constexpr std::uint64_t kLeastDevices = 5;
+constexpr std::size_t kLongestLine = std::size_t{64} * 1024 * 1024;
 
 /// A question about one key.
 struct Question {
@@ -35,10 +37,14 @@ bool load(const std::string& address, const std::vector<std::string>& files) {
   std::uint64_t taken = 0;
   std::uint64_t malformed = 0;
   std::uint64_t unreadable = 0;
-  std::string text;
+  std::string_view text;
   for (const std::string& file : files) {
     const std::string name = file == "-" ? "standard input" : file;
-    LineReader lines(file);
+    std::ifstream opened;
+    if (file != "-") {
+      opened.open(file, std::ios::binary);
+    }
+    LineReader lines(file == "-" ? std::cin : opened, kLongestLine);
     auto result = lines.next(text);
     for (; result == LineReader::Result::Line || result == LineReader::Result::TooLong;
          result = lines.next(text)) {
@@ -168,6 +174,7 @@ CLI::App* addQuestion(CLI::App& vespfleet, const char* name, const char* help, Q
 }
 
 int run(int argc, char** argv) {
+  std::ios::sync_with_stdio(false);  // standard input is read in large pieces
   CLI::App vespfleet(
       "Keeps the daily logs of many devices and answers questions about them.\n"
       "STORE is the path of an SQLite file, or http://HOST:PORT/DATABASE of a ClickHouse server.",

@@ -21,7 +21,8 @@ TEST(HostPlatform, SaysWhyADeviceCannotBeOpened) {
   EXPECT_EQ(HostPlatform::open("/nowhere/at/all", error), nullptr);
   EXPECT_EQ(error, "/nowhere/at/all: No such file or directory");
   const TemporaryFolder folder;
-  for (const std::string zone : {"Moon/Crater", "Europe", "zone.tab"}) {
+  for (const std::string zone : {"Moon/Crater", "Europe", "zone.tab", "", "/usr/share/zoneinfo/UTC",
+                                 "./UTC", "Europe/../UTC"}) {
     folder.write("device.json", R"({"timeZone": ")" + zone + "\"}");
     EXPECT_EQ(HostPlatform::open(folder.path(), error), nullptr);
     EXPECT_THAT(error,
@@ -30,6 +31,22 @@ TEST(HostPlatform, SaysWhyADeviceCannotBeOpened) {
   folder.write("device.json", R"({"usage": 1})");
   EXPECT_EQ(HostPlatform::open(folder.path(), error), nullptr);
   EXPECT_THAT(error, testing::EndsWith("device.json: usage: not a dictionary"));
+}
+
+TEST(HostPlatform, GivesTheProcessItsTimeZoneBack) {
+  EXPECT_TRUE(hasSucceeded(startProcess([] {
+    setenv("TZ", "Asia/Tokyo", 1);
+    const auto openAndClose = [] {
+      const TestDevice device(R"({"timeZone": "America/Lima"})");
+      EXPECT_STREQ(std::getenv("TZ"), "America/Lima");
+    };
+    openAndClose();
+    EXPECT_STREQ(std::getenv("TZ"), "Asia/Tokyo");
+    EXPECT_EQ(timezone, -9 * 3600) << "the C library goes by it again";
+    unsetenv("TZ");
+    openAndClose();
+    EXPECT_EQ(std::getenv("TZ"), nullptr);
+  })));
 }
 
 TEST(HostPlatform, LogKeepsLevelsDownToTheDescribedOne) {

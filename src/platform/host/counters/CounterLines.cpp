@@ -10,67 +10,14 @@
 
 #include "platform/host/documents/NumberText.h"
 #include "platform/host/documents/QuotedText.h"
+#include "platform/host/files/LineReader.h"
 
 namespace vesprun {
 namespace {
 
-constexpr std::size_t kReadSize = 256 * 1024;
+constexpr std::size_t kWrittenPiece = 256 * 1024;
 constexpr std::size_t kLongestLine = 2 * 1024 * 1024;  // the longest key fits
 constexpr std::size_t kMostBufferedBytes = 32 * 1024 * 1024;
-
-/// Splits a stream at line feeds; the last line may lack one.
-class LineReader {
- public:
-  explicit LineReader(std::istream& stream) : _stream(stream) {}
-
-  /// The next line, valid until the next call. Nothing at the end and, with a text in `error`, on
-  /// failure.
-  std::optional<std::string_view> next(std::string& error) {
-    std::size_t searched = _begin;
-    for (;;) {
-      const void* feed = std::memchr(_buffer.data() + searched, '\n', _end - searched);
-      if (feed != nullptr) {
-        const auto end = static_cast<std::size_t>(static_cast<const char*>(feed) - _buffer.data());
-        const std::string_view line(_buffer.data() + _begin, end - _begin);
-        _begin = end + 1;
-        return line;
-      }
-      if (_end - _begin > kLongestLine) {
-        error = "longer than 2 MiB";
-        return std::nullopt;
-      }
-      searched = _end - _begin;
-      if (!readMore(error)) {
-        if (!error.empty() || _begin == _end) {
-          return std::nullopt;
-        }
-        return std::string_view(_buffer.data() + std::exchange(_begin, _end), searched);
-      }
-    }
-  }
-
- private:
-  bool readMore(std::string& error) {
-    std::memmove(_buffer.data(), _buffer.data() + _begin, _end - _begin);
-    _end -= std::exchange(_begin, 0);
-    if (_buffer.size() < _end + kReadSize) {
-      _buffer.resize(_end + kReadSize);
-    }
-    errno = 0;
-    _stream.read(_buffer.data() + _end, static_cast<std::streamsize>(_buffer.size() - _end));
-    if (_stream.bad()) {
-      error = errno != 0 ? std::strerror(errno) : "cannot be read";
-      return false;
-    }
-    _end += static_cast<std::size_t>(_stream.gcount());
-    return _stream.gcount() > 0;
-  }
-
-  std::istream& _stream;
-  std::string _buffer;
-  std::size_t _begin = 0;
-  std::size_t _end = 0;
-};
 
 /// Collects samples by key, so that alternating keys reach the tables as runs.
 class SampleBuffer {
@@ -228,7 +175,7 @@ class LineWriter {
 
   void end() {
     _text += '\n';
-    if (_text.size() >= kReadSize) {
+    if (_text.size() >= kWrittenPiece) {
       flush();
     }
   }
@@ -241,20 +188,23 @@ class LineWriter {
 }  // namespace
 
 bool importCounterLines(std::istream& lines, CounterStore& counters, std::string& error) {
-  LineReader reader(lines);
+  using Result = LineReader::Result;
+  LineReader reader(lines, kLongestLine);
   SampleBuffer samples(counters);
-  std::string cause;
-  for (std::uint64_t number = 1;; ++number) {
-    const std::optional<std::string_view> line = reader.next(cause);
-    if (!line && cause.empty()) {
-      samples.flush();
-      return true;
-    }
-    if (!line || !importLine(*line, counters, samples, cause)) {
-      error = "line " + std::to_string(number) + ": " + cause;
-      return false;
-    }
+  std::string_view line;
+  Result result = reader.next(line);
+  for (; result == Result::Line && importLine(line, counters, samples, error);
+       result = reader.next(line)) {
   }
+  if (result == Result::End) {
+    samples.flush();
+    return true;
+  }
+  if (result != Result::Line) {
+    error = result == Result::TooLong ? "longer than 2 MiB" : std::strerror(errno);
+  }
+  error.insert(0, "line " + std::to_string(reader.number()) + ": ");
+  return false;
 }
 
 bool exportCounterLines(CounterStore& counters, std::int32_t firstDay, std::int32_t lastDay,

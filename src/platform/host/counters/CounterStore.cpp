@@ -121,17 +121,7 @@ void CounterStore::open() {
   _connection.execute(_access == Access::Writing ? "BEGIN IMMEDIATE" : "BEGIN");
 }
 
-std::string CounterStore::emptyDatabase() {
-  SqliteConnection database(":memory:", std::chrono::milliseconds::zero());
-  database.execute(kSchema);
-  sqlite3_int64 size = 0;
-  const std::unique_ptr<unsigned char, decltype(&sqlite3_free)> bytes(
-      sqlite3_serialize(database.handle(), "main", &size, 0), sqlite3_free);
-  if (!bytes) {
-    database.fail(SQLITE_NOMEM);
-  }
-  return {reinterpret_cast<const char*>(bytes.get()), static_cast<std::size_t>(size)};
-}
+std::string CounterStore::emptyDatabase() { return newSqliteFile(kSchema); }
 
 CounterStore::Writer& CounterStore::writer() {
   if (!_writer) {

@@ -177,6 +177,18 @@ void SqliteConnection::failAsCorrupt(const std::string& what) const {
   throw SqliteFailure{SQLITE_CORRUPT, _path + ": " + what};
 }
 
+std::string newSqliteFile(const char* schema) {
+  SqliteConnection database(":memory:", std::chrono::milliseconds::zero());
+  database.execute(schema);
+  sqlite3_int64 size = 0;
+  const std::unique_ptr<unsigned char, decltype(&sqlite3_free)> bytes(
+      sqlite3_serialize(database.handle(), "main", &size, 0), sqlite3_free);
+  if (!bytes) {
+    database.fail(SQLITE_NOMEM);
+  }
+  return {reinterpret_cast<const char*>(bytes.get()), static_cast<std::size_t>(size)};
+}
+
 SqliteStatement::SqliteStatement(const SqliteConnection& connection, const char* sql)
     : _connection(connection) {
   sqlite3_stmt* statement = nullptr;

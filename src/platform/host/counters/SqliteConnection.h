@@ -62,6 +62,9 @@ class SqliteConnection {
   std::unique_ptr<sqlite3, Close> _database;
 };
 
+/// The file of a database that the statements make. Throws `SqliteFailure`.
+std::string newSqliteFile(const char* schema);
+
 /// A prepared statement. Every operation throws `SqliteFailure`. A column of another type than the
 /// schema's counts as corruption.
 class SqliteStatement {

@@ -142,22 +142,26 @@ TEST_F(TallybookTest, ReadsBackWhatItDumps) {
       "sample\t19786\tc\t-0\t2147483647\nsample\t19786\tc\t5e-324\t-2147483648\n"
       "scalar\t19787\ta\t0\n";
   std::string interleaved = text;
-  // More than one chunk each, the keys in turn.
+  // Two full chunks, and two with a part of a third; the keys in turn.
   std::string first;
   std::string second;
   for (std::size_t i = 0; i < 2 * CounterStore::kSamplesPerChunk + 5; ++i) {
     const std::string value = std::to_string(i) + ".1\t" + std::to_string(i) + '\n';
-    first += "sample\t19787\tfirst\t" + value;
     second += "sample\t19787\tsecond\t" + value;
-    interleaved += "sample\t19787\tsecond\t" + value + "sample\t19787\tfirst\t" + value;
+    interleaved += "sample\t19787\tsecond\t" + value;
+    if (i < 2 * CounterStore::kSamplesPerChunk) {
+      first += "sample\t19787\tfirst\t" + value;
+      interleaved += "sample\t19787\tfirst\t" + value;
+    }
   }
   text += first + second;
   interleaved.pop_back();
   ASSERT_TRUE(import(interleaved)) << error;
   EXPECT_EQ(dump(), text);
-  ASSERT_TRUE(import("sample\t19787\tfirst\t-1\t3\n"));
-  EXPECT_EQ(dump(),
-            text.substr(0, text.size() - second.size()) + "sample\t19787\tfirst\t-1\t3\n" + second);
+  const std::string more = "sample\t19787\tfirst\t-1\t3\n";
+  const std::string most = "sample\t19787\tsecond\t-2\t4\n";
+  ASSERT_TRUE(import(more + most));
+  EXPECT_EQ(dump(), text.substr(0, text.size() - second.size()) + more + second + most);
   EXPECT_EQ(dump(19788), "");
 }
 
@@ -307,6 +311,42 @@ TEST_F(TallybookTest, MovesForeignFilesAsideWithTheirJournals) {
   EXPECT_THAT(folder.names(kFolder).back(), MatchesRegex(".*\\.corrupt-.*-journal"));
   EXPECT_EQ(dump(), scalar(1));
   EXPECT_EQ(corruptions(), count);
+}
+
+TEST_F(TallybookTest, MovesAsideWhatHasTheTablesAndNotTheirShape) {
+  const auto table = [](const std::string& rows) {
+    return "DROP TABLE scalar; CREATE TABLE scalar (day, key COLLATE NOCASE, value, "
+           "PRIMARY KEY (day, key)) WITHOUT ROWID; INSERT INTO scalar VALUES " +
+           rows;
+  };
+  const std::pair<std::string, const char*> cases[] = {
+      {"INSERT INTO scalar VALUES (7, 'a' || char(1), 1)", "a key is no text"},
+      {"INSERT INTO scalar VALUES (2147483648, 'k', 1)", "a day is out of range"},
+      {table("(19787, 'k', 'text')"), "a cell is not of its column's type"},
+      {table("(7, 'B', 1), (7, 'a', 1)"), "rows are out of order, after 1 scalars up to \"a\""},
+  };
+  for (const auto& [change, cause] : cases) {
+    unlink(folder.path(kFile).c_str());
+    add("k", 1);
+    SqliteConnection(folder.path(kFile), kShortWait).execute(change.c_str());
+    const std::string content = folder.read(kFile);
+    log.messages.clear();
+    HostTallybook tallybook(device, clock, preferences, log);
+    const auto read = [&](CounterStore& store) {
+      const auto ignore = [](std::string_view) { return true; };
+      exportCounterLines(store, 0, std::numeric_limits<std::int32_t>::max(), ignore, error);
+    };
+    EXPECT_FALSE(tallybook.read(read, error)) << change;
+    EXPECT_THAT(log.messages, ElementsAre(HasSubstr(cause)));
+  }
+  add("k", 1);
+  SqliteConnection(folder.path(kFile), kShortWait).execute(table("(19787, 'k', 'text')").c_str());
+  add("k", 2);
+  EXPECT_EQ(dump(), scalar(2)) << "what cannot be added to";
+  ASSERT_TRUE(import("sample\t19787\tk\t1\t1\n"));
+  SqliteConnection(folder.path(kFile), kShortWait).execute("UPDATE chunk SET samples = x'00'");
+  EXPECT_TRUE(HostTallybook(device, clock, preferences, log).addSample("k", 2, error));
+  EXPECT_EQ(dump(), "sample\t19787\tk\t2\t33302\n") << "what nothing can be added behind";
 }
 
 /// Lets the calls of `pread` by SQLite that `which` picks, by their number from 1 and their place
