@@ -10,29 +10,6 @@
 #include "common/Calendar.h"
 
 namespace vesprun {
-namespace {
-
-/// A file that shrinks or grows meanwhile gives what was there.
-bool readAll(int file, std::string& content) {
-  std::size_t length = 0;
-  for (;;) {
-    if (length == content.size()) {
-      content.resize(content.size() + (content.size() / 2) + 4096);
-    }
-    const ssize_t count = read(file, content.data() + length, content.size() - length);
-    if (count < 0 && errno == EINTR) {
-      continue;
-    }
-    if (count <= 0) {
-      content.resize(length);
-      return count == 0;
-    }
-    length += static_cast<std::size_t>(count);
-  }
-}
-
-}  // namespace
-
 bool takeLock(int descriptor, int operation, std::chrono::milliseconds longestWait,
               const std::string& path, std::string& error, bool* busy) {
   constexpr std::chrono::milliseconds kPause(1);
@@ -71,21 +48,32 @@ std::optional<std::string> readWholeFile(const std::string& path, std::string& e
   // A pipe or device must not block the reader.
   const FileDescriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
   struct stat status {};
-  std::optional<std::string> content;
   if (missing != nullptr) {
     *missing = !file.isOpen() && errno == ENOENT;
   }
   if (!file.isOpen() || fstat(file.get(), &status) != 0) {
     error = systemError(path);
-  } else if (!S_ISREG(status.st_mode)) {
-    error = path + (S_ISDIR(status.st_mode) ? ": Is a directory" : ": not a regular file");
-  } else {
-    content.emplace(static_cast<std::size_t>(status.st_size) + 1, '\0');
-    if (!readAll(file.get(), *content)) {
-      error = systemError(path);
-      content.reset();
-    }
+    return std::nullopt;
   }
+  if (!S_ISREG(status.st_mode)) {
+    error = path + (S_ISDIR(status.st_mode) ? ": Is a directory" : ": not a regular file");
+    return std::nullopt;
+  }
+  // A file that shrinks or grows meanwhile gives what was there.
+  std::string content(static_cast<std::size_t>(status.st_size) + 1, '\0');
+  std::size_t length = 0;
+  for (ssize_t count = 1; count != 0;) {
+    if (length == content.size()) {
+      content.resize(content.size() + (content.size() / 2) + 4096);
+    }
+    count = read(file.get(), content.data() + length, content.size() - length);
+    if (count < 0 && errno != EINTR) {
+      error = systemError(path);
+      return std::nullopt;
+    }
+    length += count > 0 ? static_cast<std::size_t>(count) : 0;
+  }
+  content.resize(length);
   return content;
 }
 
@@ -100,7 +88,8 @@ std::optional<std::vector<std::string>> namesInFolder(const std::string& folder,
   if (!stream && errno == ENOENT) {
     return names;
   }
-  for (errno = stream ? 0 : errno; stream;) {
+  while (stream) {
+    errno = 0;
     const dirent* const entry = readdir(stream.get());
     if (entry == nullptr) {
       break;
@@ -109,7 +98,6 @@ std::optional<std::vector<std::string>> namesInFolder(const std::string& folder,
     if (name != "." && name != "..") {
       names.emplace_back(name);
     }
-    errno = 0;
   }
   if (errno != 0) {
     error = systemError(folder);
