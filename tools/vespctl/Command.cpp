@@ -25,10 +25,10 @@ DeviceDirectory openDirectory(const std::string& directory) {
   return *orFail([&](std::string& error) { return DeviceDirectory::open(directory, error); });
 }
 
-FolderLock takeDailyWork(const DeviceDirectory& directory) {
+FileDescriptor takeDailyWork(const DeviceDirectory& directory) {
   constexpr std::chrono::minutes kLongestWait(5);
   return *orFail([&](std::string& error) {
-    return FolderLock::take(directory.path(), error, FolderLock::Kind::Exclusive, kLongestWait);
+    return lockFolder(directory.path(), error, LOCK_EX, kLongestWait);
   });
 }
 

@@ -8,7 +8,7 @@
 
 #include "common/PropertyValue.h"
 #include "platform/host/HostPlatform.h"
-#include "platform/host/files/FileLock.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 
@@ -40,7 +40,7 @@ DeviceDirectory openDirectory(const std::string& directory);
 
 /// Waits until no run is at the daily work, and keeps others from it as long as the result lives.
 /// Throws `CommandFailure` when that takes more than minutes.
-FolderLock takeDailyWork(const DeviceDirectory& directory);
+FileDescriptor takeDailyWork(const DeviceDirectory& directory);
 
 /// The content of a file or pipe; "-" is standard input.
 std::string readInput(const std::string& file);

@@ -69,7 +69,7 @@ Submission submitReport(std::int32_t day) {
 void catchUp(const std::string& directory, std::uint32_t last) {
   const auto device = openDevice(directory);
   const InstalledPlatform installed(*device);
-  const FolderLock lock = takeDailyWork(device->directory());
+  const FileDescriptor lock = takeDailyWork(device->directory());
   const std::int64_t today = device->tallybook().TBDaysSince1970();
   PropertyArray submitted;
   std::string failed;

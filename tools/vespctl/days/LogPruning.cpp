@@ -14,7 +14,6 @@
 #include "outbox/SubmittedLogs.h"
 #include "platform/host/device/LogNumbers.h"
 #include "platform/host/documents/JsonForm.h"
-#include "platform/host/files/FileLock.h"
 #include "platform/host/files/Files.h"
 #include "platform/host/files/JsonLines.h"
 
@@ -61,7 +60,7 @@ std::vector<LogPruning::Log> LogPruning::readFolder() {
   const std::string folder = _directory.hostPath("outbox/logs");
   std::string error;
   if (std::filesystem::is_directory(folder) && !_lock) {
-    _lock = FolderLock::take(folder, error);
+    _lock = lockFolder(folder, error);
   }
   const std::optional<std::vector<std::string>> names =
       error.empty() ? namesInFolder(folder, error) : std::nullopt;

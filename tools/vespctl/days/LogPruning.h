@@ -7,7 +7,7 @@
 
 #include "common/Date.h"
 #include "platform/host/device/DeviceDirectory.h"
-#include "platform/host/files/FileLock.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 
@@ -44,7 +44,8 @@ class LogPruning {
 
   const DeviceDirectory& _directory;
   Date _now;
-  std::optional<FolderLock> _lock;  ///< else a header without a log may be that of a coming log
+  /// Of the folder: else a header without a log may be that of a coming log.
+  std::optional<FileDescriptor> _lock;
   std::vector<std::string> _removed;
   std::vector<std::string> _problems;
 };

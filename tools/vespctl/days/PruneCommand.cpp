@@ -83,7 +83,7 @@ void prune(const Pruning& wanted) {
   constexpr std::int64_t kDaysKept = 2;
   constexpr std::uint64_t kBytesPerMebibyte = 1048576;
   const auto device = openDevice(wanted.directory);
-  const FolderLock lock = takeDailyWork(device->directory());
+  const FileDescriptor lock = takeDailyWork(device->directory());
   const Date now = device->clock().now();
   std::vector<std::string> problems;
   LogPruning logs(device->directory(), now);

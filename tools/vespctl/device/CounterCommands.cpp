@@ -11,6 +11,7 @@
 #include "common/Calendar.h"
 #include "platform/host/counters/CounterLines.h"
 #include "platform/host/counters/HostTallybook.h"
+#include "platform/host/documents/NumberText.h"
 #include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {

@@ -9,6 +9,7 @@
 #include "platform/host/counters/CounterLines.h"
 #include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/JsonForm.h"
+#include "platform/host/documents/NumberText.h"
 #include "platform/host/documents/PtreeWriter.h"
 #include "sample/SampleCounters.h"
 #include "sample/SampleData.h"

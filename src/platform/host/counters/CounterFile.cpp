@@ -9,7 +9,6 @@
 #include <string_view>
 
 #include "platform/host/files/AtomicFile.h"
-#include "platform/host/files/FileLock.h"
 #include "platform/host/files/Files.h"
 
 namespace vesprun {
@@ -56,7 +55,7 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
   }
   const std::string path = folder + '/' + kName;
   struct stat status {};
-  std::optional<FolderLock> shared;
+  std::optional<FileDescriptor> shared;
   // Between making and locking, another process may move the new file away.
   for (int attempt = 1; !shared; ++attempt) {
     if (stat(path.c_str(), &status) != 0 && errno == ENOENT) {
@@ -67,7 +66,7 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
         return false;
       }
     }
-    shared = FolderLock::take(folder, error, FolderLock::Kind::Shared, _longestWait);
+    shared = lockFolder(folder, error, LOCK_SH, _longestWait);
     if (!shared) {
       return false;
     }
@@ -125,8 +124,7 @@ bool CounterFile::make(std::string& error) {
   if (!folder) {
     return false;
   }
-  const auto exclusive =
-      FolderLock::take(*folder, error, FolderLock::Kind::Exclusive, _longestWait);
+  const auto exclusive = lockFolder(*folder, error, LOCK_EX, _longestWait);
   return exclusive && makeLocked(error);
 }
 
@@ -164,7 +162,7 @@ bool CounterFile::makeLocked(std::string& error) {
 std::optional<std::string> CounterFile::replace(const Damage& damage, std::string& error) {
   const std::string folder = _directory.hostPath(kFolder);
   const std::string path = folder + '/' + kName;
-  const auto exclusive = FolderLock::take(folder, error, FolderLock::Kind::Exclusive, _longestWait);
+  const auto exclusive = lockFolder(folder, error, LOCK_EX, _longestWait);
   if (!exclusive) {
     return std::nullopt;
   }

@@ -8,6 +8,7 @@
 #include <utility>
 #include <vector>
 
+#include "platform/host/documents/NumberText.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/LineReader.h"
 

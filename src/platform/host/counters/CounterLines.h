@@ -1,16 +1,12 @@
 #pragma once
 
-#include <charconv>
 #include <cstdint>
 #include <functional>
 #include <istream>
-#include <optional>
 #include <string>
 #include <string_view>
-#include <system_error>
 
 #include "platform/host/counters/CounterStore.h"
-#include "platform/host/documents/RealText.h"
 
 namespace vesprun {
 
@@ -21,20 +17,6 @@ namespace vesprun {
 //
 // DAY and OFFSET are signed 32-bit integers, a scalar's VALUE is a signed 64-bit one, a sample's a
 // decimal number, "inf", "-inf" or "nan". A key may hold tabs but no line feed.
-
-/// False unless the whole text is a number in range.
-template <typename T>
-bool parseWholeText(std::string_view text, T& value) {
-  const auto [end, failure] = std::from_chars(text.data(), text.data() + text.size(), value);
-  return failure == std::errc() && end == text.data() + text.size();
-}
-
-/// For a sample's value.
-inline bool parseWholeText(std::string_view text, double& value) {
-  const std::optional<double> real = parseReal(text);
-  value = real.value_or(value);
-  return real.has_value();
-}
 
 /// Sets scalars and appends samples, in order for each key. Lines are streamed. False, with "line
 /// N: ..." in `error`, at the first bad line. May throw `SqliteFailure`.

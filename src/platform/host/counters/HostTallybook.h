@@ -19,7 +19,7 @@
 #include "platform/host/counters/CounterFile.h"
 #include "platform/host/counters/CounterStore.h"
 #include "platform/host/device/DeviceDirectory.h"
-#include "platform/host/files/FileLock.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 

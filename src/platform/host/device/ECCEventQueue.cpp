@@ -63,26 +63,25 @@ int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length)
     _log.write(LogLevel::Error, error);
     return EIO;
   }
-  std::vector<std::string> files;
   for (const std::string& name : *names) {
-    if (name.ends_with(".bin") && name != ".bin") {
-      files.push_back(folder + '/' + name);
+    if (!name.ends_with(".bin") || name == ".bin") {
+      continue;
     }
-  }
-  if (!files.empty() && buffer.size() != kEventLength) {
-    return EINVAL;
-  }
-  for (const std::string& path : files) {
+    if (buffer.size() != kEventLength) {
+      return EINVAL;
+    }
+    const std::string path = folder + '/' + name;
     const Outcome outcome = take(path, buffer, error);
     if (outcome == Outcome::Taken) {
       length = kEventLength;
       return 0;
     }
-    if (outcome == Outcome::Failed) {
-      _log.write(LogLevel::Error, error);
-      return EIO;
+    if (outcome == Outcome::Skipped) {
+      continue;
     }
-    if (outcome == Outcome::Unusable && !setAside(path, error)) {
+    _log.write(LogLevel::Error, error);
+    if (outcome == Outcome::Failed ||
+        !isGone(path, std::rename(path.c_str(), (path + ".unusable").c_str()))) {
       return EIO;
     }
   }
@@ -91,16 +90,11 @@ int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length)
 
 bool ECCEventQueue::removeTaken() {
   const FileDescriptor taken = std::exchange(_taken, FileDescriptor());
-  if (!taken.isOpen() || unlink(_takenPath.c_str()) == 0 || errno == ENOENT) {
-    return true;
-  }
-  _log.write(LogLevel::Error, systemError(_takenPath));
-  return false;
+  return !taken.isOpen() || isGone(_takenPath, unlink(_takenPath.c_str()));
 }
 
-bool ECCEventQueue::setAside(const std::string& path, const std::string& why) {
-  _log.write(LogLevel::Error, why);
-  if (std::rename(path.c_str(), (path + ".unusable").c_str()) == 0 || errno == ENOENT) {
+bool ECCEventQueue::isGone(const std::string& path, int result) {
+  if (result == 0 || errno == ENOENT) {
     return true;
   }
   _log.write(LogLevel::Error, systemError(path));

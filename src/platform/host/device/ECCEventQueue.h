@@ -37,7 +37,8 @@ class ECCEventQueue {
   enum class Outcome { Taken, Skipped, Unusable, Failed };
 
   Outcome take(const std::string& path, std::span<std::uint8_t> buffer, std::string& error);
-  bool setAside(const std::string& path, const std::string& why);
+  /// After a call that takes the path away, by its result and `errno`; else logs why not.
+  bool isGone(const std::string& path, int result);
 
   const DeviceDirectory& _directory;
   SystemLog& _log;

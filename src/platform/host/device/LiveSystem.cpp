@@ -6,10 +6,7 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <array>
 #include <cctype>
-#include <cinttypes>
-#include <cstdio>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -58,35 +55,38 @@ std::vector<std::string> namesIn(const std::string& folder) {
   return namesInFolder(folder, ignored).value_or(std::vector<std::string>());
 }
 
-/// "en_GB.UTF-8@euro" is {"en", "GB"}; nothing for locales without a language.
-struct LocaleName {
-  std::string language;
-  std::string country;
-};
-
-std::optional<LocaleName> parseLocaleName(std::string_view name) {
-  name = name.substr(0, name.find_first_of(".@"));
-  if (name.empty() || name == "C" || name == "POSIX") {
-    return std::nullopt;
-  }
-  const auto separator = name.find('_');
-  return LocaleName{
-      std::string(name.substr(0, separator)),
-      separator == std::string_view::npos ? "" : std::string(name.substr(separator + 1))};
+std::string inUpperCase(std::string text) {
+  std::ranges::transform(text, text.begin(),
+                         [](unsigned char c) { return static_cast<char>(std::toupper(c)); });
+  return text;
 }
 
-std::string languageTag(const LocaleName& locale) {
-  return locale.country.empty() ? locale.language : locale.language + '-' + locale.country;
+/// "en_GB" of "en_GB.UTF-8@euro"; empty for locales without a language.
+std::string localeName(std::string_view locale) {
+  const std::string_view name = locale.substr(0, locale.find_first_of(".@"));
+  return std::string(name == "C" || name == "POSIX" ? "" : name);
 }
 
-std::optional<LocaleName> processLocale(const char* category) {
+std::string processLocale(const char* category) {
   for (const char* variable : {"LC_ALL", category, "LANG"}) {
     const char* value = std::getenv(variable);
     if (value != nullptr && *value != '\0') {
-      return parseLocaleName(value);
+      return localeName(value);
     }
   }
-  return std::nullopt;
+  return "";
+}
+
+/// The part of a locale's name behind the language.
+std::string countryOf(const std::string& name) {
+  const auto separator = name.find('_');
+  return separator == std::string::npos ? "" : name.substr(separator + 1);
+}
+
+/// "en-GB" for "en_GB".
+std::string languageTag(const std::string& name) {
+  const std::string country = countryOf(name);
+  return name.substr(0, name.find('_')) + (country.empty() ? "" : '-' + country);
 }
 
 void appendDesktopEntries(const std::filesystem::path& folder, bool user,
@@ -127,9 +127,7 @@ std::optional<KernelVariable> swapUsage() {
 }
 
 std::optional<KernelVariable> bootSessionIdentifier() {
-  std::string identifier = firstLineOf("/proc/sys/kernel/random/boot_id");
-  std::ranges::transform(identifier, identifier.begin(),
-                         [](unsigned char c) { return static_cast<char>(std::toupper(c)); });
+  const std::string identifier = inUpperCase(firstLineOf("/proc/sys/kernel/random/boot_id"));
   return identifier.empty() ? std::nullopt : std::optional(KernelVariable::text(identifier));
 }
 
@@ -137,17 +135,7 @@ std::string machineIdentifier() { return firstLineOf("/etc/machine-id"); }
 
 std::string hardwareModel() { return kernelName().machine; }
 
-std::string newIdentifier() {
-  std::array<std::uint64_t, 2> bits{};
-  std::array<char, 37> text{};
-  if (getentropy(bits.data(), sizeof(bits)) == 0) {
-    std::snprintf(text.data(), text.size(),
-                  "%08" PRIX64 "-%04" PRIX64 "-4%03" PRIX64 "-%04" PRIX64 "-%012" PRIX64,
-                  bits[0] >> 32, bits[0] >> 16 & 0xFFFF, bits[0] & 0xFFF,
-                  0x8000 | (bits[1] >> 48 & 0x3FFF), bits[1] & 0xFFFF'FFFF'FFFF);
-  }
-  return text.data();
-}
+std::string newIdentifier() { return inUpperCase(firstLineOf("/proc/sys/kernel/random/uuid")); }
 
 std::optional<FileSystemStatistics> volume(const std::string& path) {
   struct statvfs status {};
@@ -172,35 +160,36 @@ std::vector<ApplicationDescription> applications() {
 
 std::vector<std::string> preferredLanguages() {
   std::vector<std::string> languages;
+  const auto add = [&languages](const std::string& name) {
+    if (!name.empty()) {
+      languages.push_back(languageTag(name));
+    }
+  };
   if (const char* list = std::getenv("LANGUAGE")) {
-    std::istringstream names(list);
-    for (std::string name; std::getline(names, name, ':');) {
-      if (const auto locale = parseLocaleName(name)) {
-        languages.push_back(languageTag(*locale));
-      }
+    std::istringstream locales(list);
+    for (std::string locale; std::getline(locales, locale, ':');) {
+      add(localeName(locale));
     }
   }
   if (languages.empty()) {
-    if (const auto locale = processLocale("LC_MESSAGES")) {
-      languages.push_back(languageTag(*locale));
-    }
+    add(processLocale("LC_MESSAGES"));
   }
   return languages;
 }
 
 std::vector<std::string> localizations() {
   std::set<std::string> languages;
-  for (const std::string& name : namesIn("/usr/share/locale")) {
-    if (const auto locale = parseLocaleName(name)) {
-      languages.insert(languageTag(*locale));
+  for (const std::string& locale : namesIn("/usr/share/locale")) {
+    if (const std::string name = localeName(locale); !name.empty()) {
+      languages.insert(languageTag(name));
     }
   }
   return {languages.begin(), languages.end()};
 }
 
 std::optional<std::string> countryCode() {
-  const auto locale = processLocale("LC_ADDRESS");
-  return locale && !locale->country.empty() ? std::optional(locale->country) : std::nullopt;
+  const std::string country = countryOf(processLocale("LC_ADDRESS"));
+  return country.empty() ? std::nullopt : std::optional(country);
 }
 
 }  // namespace vesprun::live

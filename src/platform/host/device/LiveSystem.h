@@ -22,7 +22,7 @@ std::optional<KernelVariable> bootSessionIdentifier();
 
 std::string machineIdentifier();  ///< empty when there is none
 std::string hardwareModel();      ///< the architecture, for example "x86_64"
-std::string newIdentifier();      ///< a random UUID in upper case; empty without randomness
+std::string newIdentifier();      ///< a random UUID in upper case
 
 /// The file system of a path; nothing when it cannot be measured.
 std::optional<FileSystemStatistics> volume(const std::string& path);

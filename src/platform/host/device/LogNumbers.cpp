@@ -39,6 +39,14 @@ bool markFolder(const DeviceDirectory& directory) {
          status.st_mtim.tv_sec == times[1].tv_sec && status.st_mtim.tv_nsec == times[1].tv_nsec;
 }
 
+/// Takes the number off the front.
+std::optional<std::uint64_t> takeNumber(std::string_view& text) {
+  std::uint64_t number = 0;
+  const auto [rest, problem] = std::from_chars(text.data(), text.data() + text.size(), number);
+  text.remove_prefix(static_cast<std::size_t>(rest - text.data()));
+  return problem == std::errc() ? std::optional(number) : std::nullopt;
+}
+
 const Number* integer(const PropertyDict& line, std::string_view key) {
   const Number* number = line.findNumber(key);
   return number != nullptr && !number->isFloatingPoint() ? number : nullptr;
@@ -47,11 +55,8 @@ const Number* integer(const PropertyDict& line, std::string_view key) {
 }  // namespace
 
 std::optional<std::uint64_t> logNumber(std::string_view name) {
-  std::uint64_t number = 0;
-  const char* const end = name.data() + name.size();
-  const auto [rest, problem] = std::from_chars(name.data(), end, number);
-  return problem == std::errc() && rest != end && *rest == '-' ? std::optional(number)
-                                                               : std::nullopt;
+  const std::optional<std::uint64_t> number = takeNumber(name);
+  return name.starts_with('-') ? number : std::nullopt;
 }
 
 std::optional<PrunedLogs> readPrunedLogs(const DeviceDirectory& directory, std::string& error) {
@@ -83,20 +88,19 @@ LogNumbers::LogNumbers(const DeviceDirectory& directory)
     : _directory(directory), _stateBefore(stateOf(directory)) {}
 
 std::optional<std::uint64_t> LogNumbers::newest(std::string& error) const {
-  std::uint64_t newest = 0;
   std::string ignored;
   const std::string kept = readWholeFile(_directory.hostPath(kNumberFile), ignored).value_or("");
-  const char* const end = kept.data() + kept.size();
-  const auto [rest, problem] = std::from_chars(kept.data(), end, newest);
-  if (problem == std::errc() &&
-      std::string_view(rest, end).starts_with(' ' + _stateBefore + '\n')) {
-    return newest;
+  std::string_view state = kept;
+  const std::optional<std::uint64_t> remembered = takeNumber(state);
+  if (remembered && state.starts_with(' ' + _stateBefore + '\n')) {
+    return remembered;
   }
   const std::optional<std::vector<std::string>> names =
       namesInFolder(_directory.hostPath(kLogFolder), error);
   if (!names) {
     return std::nullopt;
   }
+  std::uint64_t newest = remembered.value_or(0);
   for (const std::string& name : *names) {
     newest = std::max(newest, logNumber(name).value_or(0));
   }

@@ -14,15 +14,13 @@
 #include "common/TextForm.h"
 #include "platform/host/documents/Base64.h"
 #include "platform/host/documents/NestedPlace.h"
+#include "platform/host/documents/NumberText.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/documents/XmlText.h"
 
 namespace vesprun {
-namespace {
 
 using Json = nlohmann::ordered_json;
-
-}  // namespace
 
 // The library handles what is neither plain text nor a short escape.
 void appendJsonText(std::string_view string, std::string& text) {
@@ -115,16 +113,11 @@ void append(const PropertyValue& value, std::string& text) {
   }
 }
 
-PropertyValue integerValue(std::uint64_t integer) {
-  return integer <= static_cast<std::uint64_t>(std::numeric_limits<std::int64_t>::max())
-             ? PropertyValue(static_cast<std::int64_t>(integer))
-             : PropertyValue(integer);
-}
-
-/// The dictionary, or the value that an object of one tagged entry means.
-std::optional<PropertyValue> untagged(PropertyDict dict, std::string& error) {
+/// What an object of one tagged entry means. Nothing for any other dictionary and, with a text in
+/// `fault`, for an entry that means nothing.
+std::optional<PropertyValue> meaningOf(const PropertyDict& dict, std::string& fault) {
   if (dict.size() != 1) {
-    return dict;
+    return std::nullopt;
   }
   const auto& [name, content] = *dict.begin();
   if (const Number* number = content.number(); number != nullptr && name == "float") {
@@ -132,7 +125,7 @@ std::optional<PropertyValue> untagged(PropertyDict dict, std::string& error) {
     // The shortest text of the largest float is slightly above it, but rounds to it up to here.
     constexpr double kBeyond = 0x1.ffffffp127;
     if (!(std::abs(real) < kBeyond)) {
-      error = "a \"float\" that single precision cannot hold";
+      fault = "a \"float\" that single precision cannot hold";
       return std::nullopt;
     }
     constexpr double kLargest = std::numeric_limits<float>::max();
@@ -140,52 +133,65 @@ std::optional<PropertyValue> untagged(PropertyDict dict, std::string& error) {
   }
   const std::string* text = content.string();
   if (text == nullptr) {
-    return dict;
-  }
-  if (name == "real") {
-    if (*text == "nan") {
-      return PropertyValue(std::numeric_limits<double>::quiet_NaN());
-    }
-    if (*text == "inf" || *text == "-inf") {
-      const double infinity = std::numeric_limits<double>::infinity();
-      return PropertyValue(text->front() == '-' ? -infinity : infinity);
-    }
-    error = "a \"real\" of " + quotedText(*text) + " instead of \"inf\", \"-inf\" or \"nan\"";
     return std::nullopt;
   }
-  if (name == "data") {
-    std::optional<Bytes> data = parseBase64(*text);
-    if (!data) {
-      error = quotedText(*text) + " is not base64";
-      return std::nullopt;
+  if (name == "real") {
+    if (double real = 0; parseWholeText(*text, real) && !std::isfinite(real)) {
+      return PropertyValue(real);
     }
-    return PropertyValue(*std::move(data));
-  }
-  if (name == "date") {
-    const std::optional<Date> date = parseDateText(*text);
-    if (!date) {
-      error = quotedText(*text) + " is not a date";
-      return std::nullopt;
+    fault = "a \"real\" of " + quotedText(*text) + " instead of \"inf\", \"-inf\" or \"nan\"";
+  } else if (name == "data") {
+    if (std::optional<Bytes> data = parseBase64(*text)) {
+      return PropertyValue(*std::move(data));
     }
-    return PropertyValue(*date);
+    fault = quotedText(*text) + " is not base64";
+  } else if (name == "date") {
+    if (const std::optional<Date> date = parseDateText(*text)) {
+      return PropertyValue(*date);
+    }
+    fault = quotedText(*text) + " is not a date";
   }
-  return dict;
+  return std::nullopt;
 }
 
-/// Builds values as the library meets the parts: stricter than the library's own tree, and it sees
-/// the digits of integers.
+/// Puts in their place what the objects of a plain value mean, up to a fault.
+void resolve(PropertyValue& value, std::string& fault, NestedPlace& place) {
+  const auto resolvePart = [&](const auto& step, const PropertyValue& part) {
+    // Containers show their parts as constants.
+    resolve(const_cast<PropertyValue&>(part), fault, place);
+    if (!fault.empty()) {
+      place.addOuter(step);
+    }
+    return fault.empty();
+  };
+  const PropertyValue& plain = value;
+  if (plain.data() != nullptr) {
+    fault = "null is no value";
+  } else if (const PropertyArray* array = plain.array()) {
+    for (std::size_t index = 0; index < array->size(); ++index) {
+      if (!resolvePart(index, (*array)[index])) {
+        return;
+      }
+    }
+  } else if (const PropertyDict* dict = plain.dict()) {
+    for (const auto& [name, entry] : *dict) {
+      if (!resolvePart(name, entry)) {
+        return;
+      }
+    }
+    if (std::optional<PropertyValue> meaning = meaningOf(*dict, fault)) {
+      value = *std::move(meaning);
+    }
+  }
+}
+
+/// Builds plain values as the library meets the parts: stricter than the library's own tree, and it
+/// sees the digits of integers.
 class ValueBuilder final : public nlohmann::json_sax<Json> {
  public:
-  ValueBuilder(bool plain, std::string& error) : _plain(plain), _error(error) {}
+  explicit ValueBuilder(std::string& error) : _error(error) {}
 
-  /// Nothing when some part is JSON without a value; the first such part is the error.
-  std::optional<PropertyValue> takeResult() {
-    if (!_valueError.empty()) {
-      _error = std::move(_valueError);
-      return std::nullopt;
-    }
-    return std::move(_result);
-  }
+  std::optional<PropertyValue> takeResult() { return std::move(_result); }
 
   bool add(PropertyValue value) {
     if (_open.empty()) {
@@ -198,15 +204,12 @@ class ValueBuilder final : public nlohmann::json_sax<Json> {
     return true;
   }
 
-  bool null() override {
-    if (_plain) {
-      return add(Bytes{});
-    }
-    return addInvalid("null is no value");
-  }
+  bool null() override { return add(Bytes{}); }
   bool boolean(bool value) override { return add(value); }
   bool number_integer(number_integer_t value) override { return add(value); }
-  bool number_unsigned(number_unsigned_t value) override { return add(integerValue(value)); }
+  bool number_unsigned(number_unsigned_t value) override {
+    return std::in_range<std::int64_t>(value) ? add(static_cast<std::int64_t>(value)) : add(value);
+  }
   bool number_float(number_float_t value, const std::string& text) override {
     if (text.find_first_of(".eE") == std::string::npos) {
       return fail("the integer " + text.substr(0, 40) + " does not fit 64 bits");
@@ -232,12 +235,7 @@ class ValueBuilder final : public nlohmann::json_sax<Json> {
     }
     PropertyDict dict = std::move(object.dict);
     _open.pop_back();
-    if (_plain) {
-      return add(std::move(dict));
-    }
-    std::string fault;
-    std::optional<PropertyValue> value = untagged(std::move(dict), fault);
-    return value ? add(*std::move(value)) : addInvalid(fault);
+    return add(std::move(dict));
   }
   bool start_array(std::size_t /*count*/) override { return open(false); }
   bool end_array() override {
@@ -273,65 +271,23 @@ class ValueBuilder final : public nlohmann::json_sax<Json> {
     return true;
   }
 
-  /// Goes on: malformed JSON further down takes precedence.
-  bool addInvalid(const std::string& why) {
-    if (_valueError.empty()) {
-      _valueError = placed(why);
-    }
-    return add(false);
-  }
-
   bool fail(const std::string& message) {
-    _error = placed(message);
-    return false;
-  }
-
-  std::string placed(const std::string& message) const {
     NestedPlace place;
     for (auto container = _open.rbegin(); container != _open.rend(); ++container) {
       if (container->isObject) {
-        place.addOuterKey(container->name);
+        place.addOuter(container->name);
       } else {
-        place.addOuterIndex(container->array.size());
+        place.addOuter(container->array.size());
       }
     }
-    return place.with(message);
+    _error = place.with(message);
+    return false;
   }
 
-  bool _plain;
   std::string& _error;
-  std::string _valueError;
   std::vector<Container> _open;
   std::optional<PropertyValue> _result;
 };
-
-std::optional<PropertyValue> read(std::string_view text, bool plain, std::string& error) {
-  ValueBuilder builder(plain, error);
-  return Json::sax_parse(text.begin(), text.end(), &builder) ? builder.takeResult() : std::nullopt;
-}
-
-/// Feeds a plain value to a builder again.
-void replay(const PropertyValue& plain, ValueBuilder& builder) {
-  if (const PropertyDict* dict = plain.dict()) {
-    builder.start_object(dict->size());
-    for (const auto& [name, content] : *dict) {
-      std::string copy(name);
-      builder.key(copy);
-      replay(content, builder);
-    }
-    builder.end_object();
-  } else if (const PropertyArray* array = plain.array()) {
-    builder.start_array(array->size());
-    for (const PropertyValue& content : *array) {
-      replay(content, builder);
-    }
-    builder.end_array();
-  } else if (plain.data() != nullptr) {
-    builder.null();
-  } else {
-    builder.add(plain);
-  }
-}
 
 }  // namespace
 
@@ -348,17 +304,24 @@ std::string jsonText(const PropertyDict& dict) {
 }
 
 std::optional<PropertyValue> plainValueFromJsonText(std::string_view text, std::string& error) {
-  return read(text, true, error);
+  ValueBuilder builder(error);
+  return Json::sax_parse(text.begin(), text.end(), &builder) ? builder.takeResult() : std::nullopt;
 }
 
-std::optional<PropertyValue> valueFromPlain(const PropertyValue& plain, std::string& error) {
-  ValueBuilder builder(false, error);
-  replay(plain, builder);
-  return builder.takeResult();
+std::optional<PropertyValue> valueFromPlain(PropertyValue plain, std::string& error) {
+  std::string fault;
+  NestedPlace place;
+  resolve(plain, fault, place);
+  if (fault.empty()) {
+    return plain;
+  }
+  error = place.with(fault);
+  return std::nullopt;
 }
 
 std::optional<PropertyValue> valueFromJsonText(std::string_view text, std::string& error) {
-  return read(text, false, error);
+  std::optional<PropertyValue> plain = plainValueFromJsonText(text, error);
+  return plain ? valueFromPlain(*std::move(plain), error) : std::nullopt;
 }
 
 }  // namespace vesprun

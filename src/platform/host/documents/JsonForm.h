@@ -34,6 +34,6 @@ std::optional<PropertyValue> valueFromJsonText(std::string_view text, std::strin
 /// The same in two steps, for a reader that decides itself which objects are dictionaries: in a
 /// plain value each object is one, and null is empty data.
 std::optional<PropertyValue> plainValueFromJsonText(std::string_view text, std::string& error);
-std::optional<PropertyValue> valueFromPlain(const PropertyValue& plain, std::string& error);
+std::optional<PropertyValue> valueFromPlain(PropertyValue plain, std::string& error);
 
 }  // namespace vesprun

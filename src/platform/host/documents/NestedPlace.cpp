@@ -4,9 +4,9 @@
 
 namespace vesprun {
 
-void NestedPlace::addOuterKey(std::string_view key) { _steps.push_back(quotedText(key)); }
+void NestedPlace::addOuter(std::string_view key) { _steps.push_back(quotedText(key)); }
 
-void NestedPlace::addOuterIndex(std::size_t index) {
+void NestedPlace::addOuter(std::size_t index) {
   _steps.push_back('[' + std::to_string(index) + ']');
 }
 

@@ -14,8 +14,8 @@ inline constexpr const char* kNestedTooDeeply = "nested deeper than 200 levels";
 /// The path to a place in a value, collected from the inside out as a recursive walk returns.
 class NestedPlace {
  public:
-  void addOuterKey(std::string_view key);
-  void addOuterIndex(std::size_t index);
+  void addOuter(std::string_view key);
+  void addOuter(std::size_t index);
 
   /// "STEP > STEP: MESSAGE" with the 8 outermost steps.
   std::string with(const std::string& message) const;

@@ -1,10 +1,11 @@
 #include "platform/host/documents/PtreeReader.h"
 
 #include <expat.h>
+#include <strings.h>
 
 #include <algorithm>
 #include <array>
-#include <charconv>
+#include <cctype>
 #include <cstdint>
 #include <exception>
 #include <memory>
@@ -15,8 +16,8 @@
 #include "common/Calendar.h"
 #include "platform/host/documents/Base64.h"
 #include "platform/host/documents/NestedPlace.h"
+#include "platform/host/documents/NumberText.h"
 #include "platform/host/documents/QuotedText.h"
-#include "platform/host/documents/RealText.h"
 #include "platform/host/documents/XmlText.h"
 
 namespace vesprun {
@@ -34,24 +35,28 @@ constexpr const char* kNoXmlVersion = "the XML declaration does not say version 
 constexpr const char* kNoVersion = "<ptree> does not say version=\"1.0\"";
 constexpr const char* kTextOutside = "text outside of a value";
 
+constexpr std::pair<std::string_view, const char*> kRefusedMarkup[] = {
+    {"<![CDATA[", "a ptree document holds no CDATA sections"},
+    {"<!--", "a malformed comment"},
+    {"<!", "a ptree document has no DOCTYPE"},
+    {"<?", "a ptree document holds no processing instructions"}};
+
 struct Fault {
-  std::size_t line = 0;  ///< 0: no fault
+  std::size_t line;
   std::string message;
 };
 
-std::optional<Number> parseInteger(std::string_view text) {
-  const char* end = text.data() + text.size();
-  std::int64_t integer = 0;
-  if (const auto [stop, failure] = std::from_chars(text.data(), end, integer);
-      failure == std::errc() && stop == end) {
-    return Number(integer);
-  }
-  std::uint64_t large = 0;
-  if (const auto [stop, failure] = std::from_chars(text.data(), end, large);
-      failure == std::errc() && stop == end) {
-    return Number(large);
-  }
-  return std::nullopt;
+/// As the first of the types that hold it.
+template <typename... Types>
+std::optional<Number> parseNumber(std::string_view text) {
+  std::optional<Number> number;
+  const auto holds = [&](auto value) {
+    const bool isParsed = parseWholeText(text, value);
+    number = isParsed ? std::optional<Number>(value) : std::nullopt;
+    return isParsed;
+  };
+  static_cast<void>((holds(Types()) || ...));
+  return number;
 }
 
 /// Builds the value as expat goes through the document.
@@ -64,54 +69,24 @@ class PtreeParser {
       throw std::bad_alloc();
     }
     XML_SetUserData(_expat.get(), this);
-    XML_SetXmlDeclHandler(_expat.get(), [](void* self, const XML_Char* version,
-                                           const XML_Char* encoding, int /*standalone*/) {
-      handle(self, [&](PtreeParser& parser) { parser.takeDeclaration(version, encoding); });
-    });
-    XML_SetElementHandler(
-        _expat.get(),
-        [](void* self, const XML_Char* name, const XML_Char** attributes) {
-          handle(self, [&](PtreeParser& parser) { parser.takeStart(name, attributes); });
-        },
-        [](void* self, const XML_Char* /*name*/) {
-          handle(self, [](PtreeParser& parser) { parser.takeEnd(); });
-        });
-    XML_SetCharacterDataHandler(_expat.get(), [](void* self, const XML_Char* text, int length) {
-      handle(self, [&](PtreeParser& parser) {
-        parser.takeText({text, static_cast<std::size_t>(length)});
-      });
-    });
-    XML_SetDefaultHandler(_expat.get(), [](void* self, const XML_Char* token, int length) {
-      handle(self, [&](PtreeParser& parser) {
-        parser.takeOther({token, static_cast<std::size_t>(length)});
-      });
-    });
+    XML_SetXmlDeclHandler(_expat.get(), handle<&PtreeParser::takeDeclaration>);
+    XML_SetElementHandler(_expat.get(), handle<&PtreeParser::takeStart>,
+                          handle<&PtreeParser::takeEnd>);
+    XML_SetCharacterDataHandler(_expat.get(), handle<&PtreeParser::takeText>);
+    XML_SetDefaultHandler(_expat.get(), handle<&PtreeParser::takeOther>);
   }
 
   std::optional<PropertyValue> read(std::string_view document, std::string& error) {
-    if (document.size() > kLongestPtree) {
-      _fault = {1, "the document is longer than 256 MiB"};
-    } else if (document.substr(0, 2).find_first_of(std::string_view("\0\xFE\xFF", 3)) !=
-               std::string_view::npos) {
-      _fault = {1, kNoPtree};  // UTF-16, which expat would read
-    }
-    for (bool isLast = false; _fault.line == 0 && !isLast;) {
-      // Expat scans an unfinished token anew with every piece.
-      const std::string_view piece =
-          document.substr(0, std::max(kParsedPiece, _taken - _tokenStart));
-      document.remove_prefix(piece.size());
-      isLast = document.empty();
-      takePiece(piece, isLast);
-      _taken += piece.size();
-    }
-    if (_fault.line == 0) {
-      _fault = std::move(_valueFault);
-    }
-    if (_fault.line != 0) {
-      error = "line " + std::to_string(_fault.line) + ": " + _fault.message;
+    try {
+      parse(document);
+      if (_valueFault) {
+        throw *std::move(_valueFault);
+      }
+      return std::move(_value);
+    } catch (const Fault& fault) {
+      error = "line " + std::to_string(fault.line) + ": " + fault.message;
       return std::nullopt;
     }
-    return std::move(_value);
   }
 
  private:
@@ -128,51 +103,46 @@ class PtreeParser {
   };
 
   /// No exception may cross expat's own code.
-  template <typename Work>
-  static void handle(void* self, Work work) {
+  template <auto take, typename... Arguments>
+  static void handle(void* self, Arguments... arguments) {
     PtreeParser& parser = *static_cast<PtreeParser*>(self);
-    if (parser._fault.line != 0 || parser._exception) {
+    if (parser._exception) {
       return;  // expat still delivers the rest of the token
     }
     const XML_Parser expat = parser._expat.get();
     parser._tokenStart =
         static_cast<std::size_t>(XML_GetCurrentByteIndex(expat) + XML_GetCurrentByteCount(expat));
     try {
-      work(parser);
-    } catch (Fault& fault) {
-      parser._fault = std::move(fault);
+      (parser.*take)(arguments...);
     } catch (...) {
       parser._exception = std::current_exception();
-    }
-    if (parser._fault.line != 0 || parser._exception) {
       XML_StopParser(expat, XML_FALSE);
     }
   }
 
-  void takePiece(std::string_view piece, bool isLast) {
-    // A buffer of 0 bytes cannot be had.
-    void* buffer = XML_GetBuffer(_expat.get(), static_cast<int>(piece.size()) + 1);
-    if (buffer == nullptr) {
-      throw std::bad_alloc();
+  void parse(std::string_view document) {
+    if (document.size() > kLongestPtree) {
+      throw Fault{1, "the document is longer than 256 MiB"};
     }
-    piece.copy(static_cast<char*>(buffer), piece.size());
-    const XML_Status status =
-        XML_ParseBuffer(_expat.get(), static_cast<int>(piece.size()), isLast ? 1 : 0);
-    if (_exception) {
-      std::rethrow_exception(_exception);
+    if (document.substr(0, 2).find_first_of(std::string_view("\0\xFE\xFF", 3)) != document.npos) {
+      throw Fault{1, kNoPtree};  // UTF-16, which expat would read
     }
-    if (status == XML_STATUS_OK || _fault.line != 0) {
-      return;
-    }
-    const XML_Error error = XML_GetErrorCode(_expat.get());
-    if (error == XML_ERROR_NO_MEMORY) {
-      throw std::bad_alloc();
-    }
-    try {
-      explain(error);
-    } catch (Fault& fault) {
-      _fault = std::move(fault);
-    }
+    std::size_t taken = 0;
+    do {
+      // Expat scans an unfinished token anew with every piece.
+      const std::string_view piece =
+          document.substr(0, std::max(kParsedPiece, taken - _tokenStart));
+      taken += piece.size();
+      document.remove_prefix(piece.size());
+      const XML_Status status = XML_Parse(_expat.get(), piece.data(),
+                                          static_cast<int>(piece.size()), document.empty() ? 1 : 0);
+      if (_exception) {
+        std::rethrow_exception(_exception);
+      }
+      if (status != XML_STATUS_OK) {
+        explain(XML_GetErrorCode(_expat.get()));
+      }
+    } while (!document.empty());
   }
 
   std::size_t line() const { return XML_GetCurrentLineNumber(_expat.get()) - _linesIntoToken; }
@@ -180,26 +150,23 @@ class PtreeParser {
 
   /// Notes a malformed value; faults of the grammar take precedence.
   void failValue(std::size_t line, std::string message) {
-    if (_valueFault.line == 0) {
+    if (!_valueFault) {
       _valueFault = {line, std::move(message)};
     }
   }
 
-  void takeDeclaration(std::string_view version, const XML_Char* encoding) const {
-    if (version != "1.0") {
+  void takeDeclaration(const XML_Char* version, const XML_Char* encoding,
+                       int /*standalone*/) const {
+    if (std::string_view(version) != "1.0") {
       fail(kNoXmlVersion);
     }
-    const auto sameLetter = [](char c, char upper) {
-      return c == upper || (c >= 'a' && c <= 'z' && c - 'a' + 'A' == upper);
-    };
-    constexpr std::string_view kUtf8 = "UTF-8";
-    if (const std::string_view name = encoding != nullptr ? encoding : kUtf8;
-        !std::equal(name.begin(), name.end(), kUtf8.begin(), kUtf8.end(), sameLetter)) {
+    if (encoding != nullptr && strcasecmp(encoding, "UTF-8") != 0) {
       fail("the encoding is not UTF-8");
     }
   }
 
-  void takeStart(std::string_view name, const XML_Char** attributes) {
+  void takeStart(const XML_Char* element, const XML_Char** attributes) {
+    const std::string_view name(element);
     if (_rootLine == 0) {
       if (name != "ptree") {
         fail(kNoPtree);
@@ -214,19 +181,18 @@ class PtreeParser {
       _rootLine = line();
       return;
     }
-    const Element element = place(name);
+    _element = place(name);
     if (attributes[0] != nullptr) {
       fail('<' + std::string(name) + "> cannot have attributes");
     }
-    if (element != Element::Dict && element != Element::Array) {
+    if (_element != Element::Dict && _element != Element::Array) {
       _inText = true;
-      _element = element;
       _elementLine = line();
       _text.clear();
     } else if (_open.size() == kMostNestedLevels) {
       fail(kNestedTooDeeply);
     } else {
-      _open.push_back({element == Element::Dict});
+      _open.push_back({_element == Element::Dict});
     }
   }
 
@@ -272,7 +238,7 @@ class PtreeParser {
                                  : "array";
   }
 
-  void takeEnd() {
+  void takeEnd(const XML_Char* /*name*/) {
     if (std::exchange(_inText, false)) {
       if (_element == Element::Key) {
         _open.back().key = _text;
@@ -324,9 +290,9 @@ class PtreeParser {
   PropertyValue textValue() {
     switch (_element) {
       case Element::Integer:
-        return parsed(parseInteger(_text), "is no integer of 64 bits");
+        return parsed(parseNumber<std::int64_t, std::uint64_t>(_text), "is no integer of 64 bits");
       case Element::Real:
-        return parsed(parseReal(_text), "is no real number that a double can hold");
+        return parsed(parseNumber<double>(_text), "is no real number that a double can hold");
       case Element::Data:
         return parsed(parseBase64(_text), "is not base64");
       case Element::Date:
@@ -353,7 +319,8 @@ class PtreeParser {
     return *std::move(content);
   }
 
-  void takeText(std::string_view text) {
+  void takeText(const XML_Char* bytes, int size) {
+    const std::string_view text(bytes, static_cast<std::size_t>(size));
     if (_inText) {
       _text += text;
       return;
@@ -367,7 +334,8 @@ class PtreeParser {
   }
 
   /// Comments, white space outside the root element and forbidden markup.
-  void takeOther(std::string_view token) const {
+  void takeOther(const XML_Char* bytes, int size) const {
+    const std::string_view token(bytes, static_cast<std::size_t>(size));
     if (token.starts_with("<!--") || token.find_first_not_of(kWhiteSpace) == token.npos) {
       return;
     }
@@ -378,22 +346,18 @@ class PtreeParser {
   }
 
   void failAtMarkup(std::string_view token) const {
-    if (token.starts_with("<![CDATA[")) {
-      fail("a ptree document holds no CDATA sections");
-    }
-    if (token.starts_with("<!--")) {
-      fail("a malformed comment");
-    }
-    if (token.starts_with("<!")) {
-      fail("a ptree document has no DOCTYPE");
-    }
-    if (token.starts_with("<?")) {
-      fail("a ptree document holds no processing instructions");
+    for (const auto& [start, fault] : kRefusedMarkup) {
+      if (token.starts_with(start)) {
+        fail(fault);
+      }
     }
   }
 
   /// Explains in the terms of ptree documents why expat refused the input.
   [[noreturn]] void explain(XML_Error error) {
+    if (error == XML_ERROR_NO_MEMORY) {
+      throw std::bad_alloc();
+    }
     int offset = 0;
     int size = 0;
     const char* context = XML_GetInputContext(_expat.get(), &offset, &size);
@@ -462,26 +426,24 @@ class PtreeParser {
   static std::string_view nameAt(std::string_view text) {
     constexpr std::size_t kLongest = 64;
     const auto* end = std::find_if(text.begin(), text.end(), [](char c) {
-      return !((c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') ||
-               c == '_' || c == ':' || c == '-' || c == '.' ||
-               static_cast<std::uint8_t>(c) >= 0x80);
+      const auto byte = static_cast<std::uint8_t>(c);
+      return byte < 0x80 && std::isalnum(byte) == 0 &&
+             std::string_view("_:-.").find(c) == std::string_view::npos;
     });
     return text.substr(0, std::min(static_cast<std::size_t>(end - text.begin()), kLongest));
   }
 
   std::unique_ptr<XML_ParserStruct, Free> _expat;
   const PtreeEntryVisitor& _visit;
-  Fault _fault;
-  Fault _valueFault;
-  std::exception_ptr _exception;
-  std::size_t _taken = 0;           ///< bytes of the document
-  std::size_t _tokenStart = 0;      ///< of the token after the last one that was handled
-  std::size_t _rootLine = 0;        ///< 0 before the root element
-  std::size_t _linesIntoToken = 0;  ///< where a fault lies
+  std::optional<Fault> _valueFault;  ///< the first
+  std::exception_ptr _exception;     ///< of a handler
+  std::size_t _tokenStart = 0;       ///< of the token after the last one that was handled
+  std::size_t _rootLine = 0;         ///< 0 before the root element
+  std::size_t _linesIntoToken = 0;   ///< where a fault lies
   bool _hasValue = false;
   bool _finished = false;
   bool _inText = false;  ///< in an element that holds no others
-  Element _element{};    ///< that element
+  Element _element{};    ///< the last that began
   std::size_t _elementLine = 0;
   std::string _text;
   std::vector<Container> _open;

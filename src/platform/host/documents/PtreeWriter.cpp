@@ -4,10 +4,13 @@
 #include <charconv>
 #include <cmath>
 #include <cstddef>
+#include <initializer_list>
+#include <iterator>
 #include <string_view>
 #include <utility>
 
 #include "common/Calendar.h"
+#include "common/TextForm.h"
 #include "platform/host/documents/Base64.h"
 #include "platform/host/documents/NestedPlace.h"
 #include "platform/host/documents/QuotedText.h"
@@ -22,276 +25,193 @@ constexpr const char* kStart =
 constexpr const char* kEnd = "</ptree>\n";
 constexpr std::size_t kPieceSize = 64 * 1024;
 
-/// Finds what a document cannot carry.
-class TreeCheck {
+/// Walks through a value, as far as a document can carry it, and writes it line by line.
+class TreeWalk {
  public:
+  /// Appends to `text`, which `sink` takes and leaves empty whenever it has grown large. Without a
+  /// sink (null) it keeps all; without a text (null) the walk only checks the value.
+  TreeWalk(std::string* text, const PtreeSerialization::Sink* sink) : _text(text), _sink(sink) {}
+
+  /// Of the part that ended the walk: `take` returned false.
   std::string error() const { return _place.with(_fault); }
 
-  bool passes(const PropertyValue& value) {
+  bool take(const PropertyValue& value) {
     if (const PropertyDict* dict = value.dict()) {
-      return passes(*dict);
+      return take(*dict);
     }
     if (const PropertyArray* array = value.array()) {
-      return passes(*array);
+      return takeContainer("array", array->empty(), [&] { return takeElements(*array); });
     }
     if (const std::string* string = value.string()) {
-      return isText("string", *string);
+      return takeText("string", *string);
     }
-    const Date* date = value.date();
-    return date == nullptr || parseDateText(dateText(*date)) == *date ||
-           fail("a date that has no text");
-  }
-
-  bool passes(const PropertyDict& dict) {
-    if (!enter() || !entriesPass(dict)) {
-      return false;
+    if (const Date* date = value.date()) {
+      const std::string text = dateText(*date);
+      writeLine({"<date>", text, "</date>"});
+      return parseDateText(text) == *date || fail("a date that has no text");
     }
-    --_level;
+    if (_text != nullptr) {
+      writeSimple(value);
+    }
     return true;
   }
 
-  bool passes(const PtreeDocument& document) {
-    ++_level;
-    if (!entriesPass(document.entries)) {
-      return false;
-    }
-    if (!document.lastArray) {
-      return true;
-    }
-    ++_level;
-    bool result = true;
-    std::size_t index = 0;
-    document.lastArray([&](const PropertyDict& element) {
-      result = passes(element) || failAt(index);
-      ++index;
-      return result;
+  bool take(const PropertyDict& dict) {
+    return takeContainer("dict", dict.empty(), [&] { return takeEntries(dict); });
+  }
+
+  bool take(const PtreeDocument& document) {
+    return takeContainer("dict", document.entries.empty() && !document.lastArray, [&] {
+      return takeEntries(document.entries) && (!document.lastArray || takeLastArray(document));
     });
-    return result || failAt(document.lastKey);
   }
 
  private:
-  bool passes(const PropertyArray& array) {
-    if (!enter()) {
+  template <typename Content>
+  bool takeContainer(std::string_view name, bool isEmpty, const Content& takeContent) {
+    writeLine({"<", name, isEmpty ? "/>" : ">"});
+    if (++_level > kMostNestedLevels) {
+      return fail(kNestedTooDeeply);
+    }
+    if (!takeContent()) {
       return false;
     }
-    for (std::size_t index = 0; index < array.size(); ++index) {
-      if (!passes(array[index])) {
-        return failAt(index);
-      }
-    }
     --_level;
+    if (!isEmpty) {
+      writeLine({"</", name, ">"});
+    }
     return true;
   }
 
-  bool entriesPass(const PropertyDict& dict) {
+  bool takeEntries(const PropertyDict& dict) {
     for (const auto& [key, value] : dict) {
-      if (!isText("key", key) || !passes(value)) {
+      if (!takeText("key", key) || !take(value)) {
         return failAt(key);
       }
     }
     return true;
   }
 
-  bool enter() { return ++_level <= kMostNestedLevels || fail(kNestedTooDeeply); }
+  bool takeElements(const PropertyArray& array) {
+    for (std::size_t index = 0; index < array.size(); ++index) {
+      if (!take(array[index])) {
+        return failAt(index);
+      }
+    }
+    return true;
+  }
 
-  bool isText(std::string_view name, std::string_view text) {
-    return isXmlText(text) || fail("the " + std::string(name) + ' ' + quotedText(text) +
-                                   " holds what XML cannot carry");
+  bool takeLastArray(const PtreeDocument& document) {
+    bool isEmpty = true;
+    document.lastArray([&isEmpty](const PropertyDict&) { return isEmpty = false; });
+    const auto takeAll = [&] {
+      bool isGood = true;
+      std::size_t index = 0;
+      document.lastArray([&](const PropertyDict& element) {
+        isGood = take(element) || failAt(index);
+        ++index;
+        return isGood;
+      });
+      return isGood;
+    };
+    return (takeText("key", document.lastKey) && takeContainer("array", isEmpty, takeAll)) ||
+           failAt(document.lastKey);
+  }
+
+  bool takeText(std::string_view name, std::string_view text) {
+    if (!isXmlText(text)) {
+      return fail("the " + std::string(name) + ' ' + quotedText(text) +
+                  " holds what XML cannot carry");
+    }
+    if (_text != nullptr) {
+      const bool isPlain = std::none_of(text.begin(), text.end(), isEscaped);
+      const std::string escapes = isPlain ? std::string() : escaped(text);
+      writeLine({"<", name, ">", isPlain ? text : escapes, "</", name, ">"});
+    }
+    return true;
+  }
+
+  static bool isEscaped(char c) { return c == '&' || c == '<' || c == '>' || c == '\r'; }
+
+  static std::string escaped(std::string_view text) {
+    std::string result;
+    for (const char& c : text) {
+      // XML readers turn a bare carriage return into a line feed.
+      result += c == '&'    ? "&amp;"
+                : c == '<'  ? "&lt;"
+                : c == '>'  ? "&gt;"
+                : c == '\r' ? "&#13;"
+                            : std::string_view(&c, 1);
+    }
+    return result;
+  }
+
+  /// A number, boolean or data: a document can carry all of them.
+  void writeSimple(const PropertyValue& value) {
+    if (const Bytes* data = value.data()) {
+      std::string text;
+      appendBase64(*data, text);
+      writeLine({"<data>", text, "</data>"});
+    } else if (const bool* boolean = value.boolean()) {
+      writeLine({*boolean ? "<true/>" : "<false/>"});
+    } else if (const Number* number = value.number()) {
+      writeNumber(*number);
+    }
+  }
+
+  void writeNumber(const Number& number) {
+    if (!number.isFloatingPoint()) {
+      return writeLine({"<integer>", textForm(number), "</integer>"});
+    }
+    const double real = number.asDouble();
+    char text[32];
+    // A NaN's sign means nothing.
+    const char* end = std::to_chars(text, std::end(text), std::isnan(real) ? NAN : real).ptr;
+    writeLine({"<real>", {text, end}, "</real>"});
+  }
+
+  void writeLine(std::initializer_list<std::string_view> parts) {
+    if (_text == nullptr) {
+      return;
+    }
+    _text->append(_level, '\t');
+    for (const std::string_view part : parts) {
+      *_text += part;
+    }
+    *_text += '\n';
+    if (_sink != nullptr && _text->size() >= kPieceSize) {
+      (*_sink)(*_text);
+      _text->clear();
+    }
   }
 
   bool fail(std::string message) {
     _fault = std::move(message);
     return false;
   }
-  bool failAt(std::string_view key) {
-    _place.addOuterKey(key);
-    return false;
-  }
-  bool failAt(std::size_t index) {
-    _place.addOuterIndex(index);
+  template <typename Step>
+  bool failAt(const Step& step) {
+    _place.addOuter(step);
     return false;
   }
 
-  std::string _fault;
-  NestedPlace _place;  ///< of the fault
-  std::size_t _level = 0;
-};
-
-/// Writes what the check lets pass.
-class TreeWriter {
- public:
-  /// Appends to `text`, which `sink` takes and leaves empty whenever it has grown large. Without a
-  /// sink (null) it keeps all.
-  TreeWriter(std::string& text, const PtreeSerialization::Sink* sink) : _text(text), _sink(sink) {}
-
-  void write(const PropertyValue& value) {
-    if (const PropertyDict* dict = value.dict()) {
-      return write(*dict);
-    }
-    if (const PropertyArray* array = value.array()) {
-      return write(*array);
-    }
-    indent();
-    if (const std::string* string = value.string()) {
-      writeText("string", *string);
-    } else if (const Number* number = value.number()) {
-      writeNumber(*number);
-    } else if (const bool* boolean = value.boolean()) {
-      _text += *boolean ? "<true/>\n" : "<false/>\n";
-    } else if (const Bytes* data = value.data()) {
-      _text += "<data>";
-      appendBase64(*data, _text);
-      _text += "</data>\n";
-    } else if (const Date* date = value.date()) {
-      _text += "<date>";
-      _text += dateText(*date);
-      _text += "</date>\n";
-    }
-    passOn();
-  }
-
-  void write(const PropertyDict& dict) {
-    open("dict", dict.empty());
-    writeEntries(dict);
-    close("dict", dict.empty());
-  }
-
-  void write(const PtreeDocument& document) {
-    const bool isEmpty = document.entries.empty() && !document.lastArray;
-    open("dict", isEmpty);
-    writeEntries(document.entries);
-    if (document.lastArray) {
-      writeLastArray(document);
-    }
-    close("dict", isEmpty);
-  }
-
- private:
-  void write(const PropertyArray& array) {
-    open("array", array.empty());
-    for (const PropertyValue& element : array) {
-      write(element);
-    }
-    close("array", array.empty());
-  }
-
-  void writeLastArray(const PtreeDocument& document) {
-    writeKey(document.lastKey);
-    bool isEmpty = true;
-    document.lastArray([&](const PropertyDict& element) {
-      if (std::exchange(isEmpty, false)) {
-        open("array", false);
-      }
-      write(element);
-      return true;
-    });
-    if (isEmpty) {
-      open("array", true);
-    }
-    close("array", isEmpty);
-  }
-
-  void writeEntries(const PropertyDict& dict) {
-    for (const auto& [key, value] : dict) {
-      writeKey(key);
-      write(value);
-    }
-  }
-
-  void writeKey(std::string_view key) {
-    indent();
-    writeText("key", key);
-  }
-
-  void passOn() {
-    if (_sink != nullptr && _text.size() >= kPieceSize) {
-      (*_sink)(_text);
-      _text.clear();
-    }
-  }
-
-  void open(std::string_view name, bool empty) {
-    indent();
-    tag("<", name, empty ? "/>\n" : ">\n");
-    ++_level;
-  }
-
-  void close(std::string_view name, bool empty) {
-    --_level;
-    if (!empty) {
-      indent();
-      tag("</", name, ">\n");
-    }
-  }
-
-  void tag(std::string_view start, std::string_view name, std::string_view end) {
-    _text.append(start).append(name).append(end);
-  }
-
-  void indent() { _text.append(_level, '\t'); }
-
-  void writeText(std::string_view name, std::string_view text) {
-    tag("<", name, ">");
-    while (true) {
-      const auto* const special = std::find_if(text.begin(), text.end(), isSpecial);
-      _text.append(text.begin(), special);
-      if (special == text.end()) {
-        break;
-      }
-      // XML readers turn a bare carriage return into a line feed.
-      _text += *special == '&'   ? "&amp;"
-               : *special == '<' ? "&lt;"
-               : *special == '>' ? "&gt;"
-                                 : "&#13;";
-      text = {special + 1, text.end()};
-    }
-    tag("</", name, ">\n");
-  }
-
-  static bool isSpecial(char c) { return c == '&' || c == '<' || c == '>' || c == '\r'; }
-
-  void writeNumber(const Number& number) {
-    char text[32];
-    char* const end = text + sizeof text;
-    const char* name = "integer";
-    char* last = nullptr;
-    if (number.isFloatingPoint()) {
-      name = "real";
-      const double real = number.asDouble();
-      // A NaN's sign means nothing.
-      last = std::to_chars(text, end, std::isnan(real) ? std::abs(real) : real).ptr;
-    } else if (number.isSigned()) {
-      last = std::to_chars(text, end, number.asInt64()).ptr;
-    } else {
-      last = std::to_chars(text, end, number.asUInt64()).ptr;
-    }
-    tag("<", name, ">");
-    _text.append(text, last);
-    tag("</", name, ">\n");
-  }
-
-  std::string& _text;
+  std::string* _text;
   const PtreeSerialization::Sink* _sink;
   std::size_t _level = 0;
+  std::string _fault;
+  NestedPlace _place;  ///< of the fault
 };
-
-template <typename T>
-bool check(const T& value, std::string& error) {
-  TreeCheck check;
-  if (!check.passes(value)) {
-    error = check.error();
-    return false;
-  }
-  return true;
-}
 
 template <typename T>
 bool writeWhole(const T& value, std::string& document, std::string& error) {
-  if (!check(value, error)) {
+  const std::size_t start = document.size();
+  document += kStart;
+  TreeWalk walk(&document, nullptr);
+  if (!walk.take(value)) {
+    document.resize(start);
+    error = walk.error();
     return false;
   }
-  document += kStart;
-  TreeWriter(document, nullptr).write(value);
   document += kEnd;
   return true;
 }
@@ -306,11 +226,16 @@ bool writePtree(const PropertyDict& dict, std::string& document, std::string& er
   return writeWhole(dict, document, error);
 }
 
-bool isPtree(const PtreeDocument& document, std::string& error) { return check(document, error); }
+bool isPtree(const PtreeDocument& document, std::string& error) {
+  TreeWalk check(nullptr, nullptr);
+  const bool result = check.take(document);
+  error = result ? error : check.error();
+  return result;
+}
 
 void writePtree(const PtreeDocument& document, const PtreeSerialization::Sink& sink) {
   std::string text = kStart;
-  TreeWriter(text, &sink).write(document);
+  TreeWalk(&text, &sink).take(document);
   text += kEnd;
   sink(text);
 }

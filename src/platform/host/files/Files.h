@@ -1,9 +1,11 @@
 #pragma once
 
 #include <fcntl.h>
+#include <sys/file.h>
 #include <unistd.h>
 
 #include <cerrno>
+#include <chrono>
 #include <cstring>
 #include <optional>
 #include <string>
@@ -47,6 +49,23 @@ inline FileDescriptor openFolder(const std::string& path) {
 inline std::string systemError(const std::string& path) {
   return path + ": " + std::strerror(errno);
 }
+
+/// How long to wait for another process's lock: longer than any of ours works, but not for one that
+/// is stopped.
+inline constexpr std::chrono::milliseconds kLongestLockWait(20'000);
+
+/// Takes the lock (LOCK_SH or LOCK_EX) of the open file or folder at `path`, waiting `longestWait`
+/// at most. On failure `error` names the path; `busy`, if given, becomes true when another holder
+/// is the reason.
+bool takeLock(int descriptor, int operation, std::chrono::milliseconds longestWait,
+              const std::string& path, std::string& error, bool* busy = nullptr);
+
+/// The folder, whose lock keeps other holders, in this process and others, from replacing files in
+/// it until the descriptor is closed. Nothing on failure, as `takeLock` reports it.
+std::optional<FileDescriptor> lockFolder(const std::string& folder, std::string& error,
+                                         int operation = LOCK_EX,
+                                         std::chrono::milliseconds longestWait = kLongestLockWait,
+                                         bool* busy = nullptr);
 
 /// The content of a regular file. Nothing, with the cause in `error`, when it cannot be read;
 /// `missing`, if given, tells whether it does not exist.

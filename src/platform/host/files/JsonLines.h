@@ -8,7 +8,6 @@
 #include <string>
 #include <string_view>
 
-#include "platform/host/files/FileLock.h"
 #include "platform/host/files/Files.h"
 
 namespace vesprun {

@@ -20,12 +20,6 @@ constexpr double kPauseAfterFailure = 0.1;
 
 }  // namespace
 
-void HostMainLoop::watch(int descriptor, Work whenReady) {
-  _watched.insert_or_assign(descriptor, std::move(whenReady));
-}
-
-void HostMainLoop::unwatch(int descriptor) { _watched.erase(descriptor); }
-
 MainLoop::SliceResult HostMainLoop::runMainLoopSlice(double seconds) {
   const double length = seconds > 0 ? seconds : 0;  // 0 for NaN as well
   const auto start = MonotonicClock::now();

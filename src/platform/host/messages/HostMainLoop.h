@@ -3,6 +3,7 @@
 #include <deque>
 #include <functional>
 #include <map>
+#include <utility>
 
 #include "platform/MessageService.h"
 
@@ -23,10 +24,12 @@ class HostMainLoop final : public MainLoop {
 
   /// Calls `whenReady` during slices while `descriptor` is readable, hung up or failed. It must not
   /// block and may watch and unwatch any descriptor. Watching again replaces the call.
-  void watch(int descriptor, Work whenReady);
+  void watch(int descriptor, Work whenReady) {
+    _watched.insert_or_assign(descriptor, std::move(whenReady));
+  }
 
   /// Call before the descriptor is closed.
-  void unwatch(int descriptor);
+  void unwatch(int descriptor) { _watched.erase(descriptor); }
 
  private:
   bool doQueuedWork();

@@ -21,10 +21,8 @@ constexpr std::size_t kMostPeers = 16;
 constexpr std::size_t kReceivedPiece = 64 * 1024;
 
 struct UnixPeer {
-  /// Less worth: first a peer that has sent no whole message, then the one silent longest.
-  bool isLessWorth(const UnixPeer& other) const {
-    return std::pair(hasSentMessage, lastHeard) < std::pair(other.hasSentMessage, other.lastHeard);
-  }
+  /// Grows with what a peer is worth: that it has sent a whole message, then when.
+  auto worth() const { return std::pair(hasSentMessage, lastHeard); }
 
   FileDescriptor socket;
   MessageAssembler assembler{};
@@ -82,10 +80,8 @@ class UnixServiceListener final : public ServiceListener {
       return;
     }
     if (_peers.size() == kMostPeers) {
-      const auto least =
-          std::min_element(_peers.begin(), _peers.end(), [](const auto& left, const auto& right) {
-            return left.second.isLessWorth(right.second);
-          });
+      const auto least = std::ranges::min_element(
+          _peers, {}, [](const auto& peer) { return peer.second.worth(); });
       drop(least->first, "others wait, and it has been silent longest");
     }
     const int descriptor = socket.get();

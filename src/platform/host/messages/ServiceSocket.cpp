@@ -38,7 +38,8 @@ const sockaddr* generic(const sockaddr_un& address) {
   return reinterpret_cast<const sockaddr*>(&address);
 }
 
-bool removeDeadSocket(int folder, const std::string& name) {
+/// Of whoever had the folder's lock, which is ours now.
+bool removeSocket(int folder, const std::string& name) {
   struct stat status {};
   if (fstatat(folder, name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) {
     return errno == ENOENT;
@@ -75,17 +76,10 @@ std::optional<ServiceSocket> ServiceSocket::listen(const DeviceDirectory& direct
     return std::nullopt;
   }
   const std::optional<sockaddr_un> address = addressOf(path, folder, service._name);
-  struct stat status {};
   // Nobody can connect before the socket listens; by then only its owner may.
-  if (!address || !removeDeadSocket(folder, service._name) ||
-      bind(socket, generic(*address), sizeof *address) != 0 ||
-      fstatat(folder, service._name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) {
-    error = systemError(path);
-    return std::nullopt;
-  }
-  service._device = status.st_dev;
-  service._file = status.st_ino;
-  if (fchmodat(folder, service._name.c_str(), kOwnerOnly, 0) != 0 ||
+  service._isBound = address && removeSocket(folder, service._name) &&
+                     bind(socket, generic(*address), sizeof *address) == 0;
+  if (!service._isBound || fchmodat(folder, service._name.c_str(), kOwnerOnly, 0) != 0 ||
       ::listen(socket, kWaitingPeers) != 0) {
     error = systemError(path);
     return std::nullopt;
@@ -94,11 +88,8 @@ std::optional<ServiceSocket> ServiceSocket::listen(const DeviceDirectory& direct
 }
 
 ServiceSocket::~ServiceSocket() {
-  struct stat status {};
-  if (_folder.isOpen() && _file != 0 &&
-      fstatat(_folder.get(), _name.c_str(), &status, AT_SYMLINK_NOFOLLOW) == 0 &&
-      status.st_dev == _device && status.st_ino == _file) {
-    unlinkat(_folder.get(), _name.c_str(), 0);
+  if (_folder.isOpen() && _isBound) {
+    removeSocket(_folder.get(), _name);
   }
 }
 

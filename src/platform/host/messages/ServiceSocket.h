@@ -1,7 +1,5 @@
 #pragma once
 
-#include <sys/types.h>
-
 #include <optional>
 #include <string>
 #include <string_view>
@@ -11,9 +9,9 @@
 
 namespace vesprun {
 
-/// The listening socket of a named service, `run/NAME`, for its owner alone; removed at the end if
-/// it is still ours. The process holds the lock of the folder `run`: two cannot take the name from
-/// each other, a file without a holder is left from a kill, and a device has one service at a time.
+/// The listening socket of a named service, `run/NAME`, for its owner alone; removed at the end.
+/// The process holds the lock of the folder `run`: two cannot take the name from each other, a file
+/// without a holder is left from a kill, and a device has one service at a time.
 class ServiceSocket {
  public:
   /// Nothing, with a text in `error`, when another process offers a service or the socket fails.
@@ -36,8 +34,7 @@ class ServiceSocket {
   FileDescriptor _folder;  ///< closing it releases the lock
   FileDescriptor _socket;
   std::string _name;
-  dev_t _device = 0;
-  ino_t _file = 0;
+  bool _isBound = false;
 };
 
 /// Connects to a service of the device; the socket blocks, `patienceInSeconds` at most in each

@@ -85,9 +85,8 @@ void HostPreferences::LGSPreferencesSetValue(std::optional<std::string_view> key
     _log.write(LogLevel::Error, "no key to change in domain " + quotedText(domain));
     return;
   }
-  std::string document;
   std::string error;
-  if (value && !writePtree(PropertyDict{{std::string(*key), *value}}, document, error)) {
+  if (value && !isPtree({PropertyDict{{std::string(*key), *value}}}, error)) {
     _log.write(LogLevel::Error, found->path + ": " + error);
     return;
   }
@@ -170,8 +169,7 @@ bool HostPreferences::writeChanges(const Domain& domain, std::string& error) {
   if (!folder) {
     return false;
   }
-  const std::optional<FolderLock> lock =
-      FolderLock::take(*folder, error, FolderLock::Kind::Exclusive, _longestWait);
+  const std::optional<FileDescriptor> lock = lockFolder(*folder, error, LOCK_EX, _longestWait);
   if (!lock) {
     return false;
   }

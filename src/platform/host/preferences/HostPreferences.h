@@ -12,7 +12,7 @@
 #include "platform/Preferences.h"
 #include "platform/SystemLog.h"
 #include "platform/host/device/DeviceDirectory.h"
-#include "platform/host/files/FileLock.h"
+#include "platform/host/files/Files.h"
 
 namespace vesprun {
 

@@ -75,20 +75,17 @@ RegistryResult SimulatedDriver::tunnel(std::span<const std::uint8_t> input,
   if (const RegistryResult error = asksForSize ? answer->sizeError : answer->dataError) {
     return error;
   }
-  std::string content;
-  if (answer->file) {
-    std::string error;
-    std::optional<std::string> read = readWholeFile(_directory.hostPath(*answer->file), error);
-    if (!read) {
-      _log.write(LogLevel::Error, "Storage controller: " + error);
-      return kBadArgument;
-    }
-    content = *std::move(read);
-  }
-  if (!answer->size && content.size() > std::numeric_limits<std::uint32_t>::max()) {
+  std::string error;
+  const std::optional<std::string> content =
+      answer->file ? readWholeFile(_directory.hostPath(*answer->file), error) : std::string();
+  if (!content) {
+    _log.write(LogLevel::Error, "Storage controller: " + error);
     return kBadArgument;
   }
-  const std::uint32_t size = answer->size.value_or(static_cast<std::uint32_t>(content.size()));
+  if (!answer->size && content->size() > std::numeric_limits<std::uint32_t>::max()) {
+    return kBadArgument;
+  }
+  const std::uint32_t size = answer->size.value_or(static_cast<std::uint32_t>(content->size()));
   if (output.size() < (asksForSize ? sizeof size : size)) {
     return kBadArgument;
   }
@@ -96,8 +93,8 @@ RegistryResult SimulatedDriver::tunnel(std::span<const std::uint8_t> input,
     std::memcpy(output.data(), &size, sizeof size);
     outputLength = sizeof size;
   } else {
-    std::copy_n(content.begin(), std::min(content.size(), output.size()), output.begin());
-    outputLength = answer->length.value_or(content.size());
+    std::copy_n(content->begin(), std::min(content->size(), output.size()), output.begin());
+    outputLength = answer->length.value_or(content->size());
   }
   return kRegistrySuccess;
 }

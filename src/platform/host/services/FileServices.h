@@ -13,7 +13,6 @@
 #include "platform/host/device/LiveSystem.h"
 #include "platform/host/documents/PtreeReader.h"
 #include "platform/host/documents/PtreeWriter.h"
-#include "platform/host/files/FileLock.h"
 #include "platform/host/files/Files.h"
 
 namespace vesprun {
@@ -55,8 +54,7 @@ class HostFileSystem final : public FileSystem {
     const std::chrono::milliseconds longestWait(static_cast<std::int64_t>(seconds * 1000));
     std::string error;
     bool busy = false;
-    _dailyWork =
-        FolderLock::take(_directory.path(), error, FolderLock::Kind::Exclusive, longestWait, &busy);
+    _dailyWork = lockFolder(_directory.path(), error, LOCK_EX, longestWait, &busy);
     if (!_dailyWork) {
       _log.write(LogLevel::Error, error);
     }
@@ -67,7 +65,7 @@ class HostFileSystem final : public FileSystem {
   const DeviceDirectory& _directory;
   const DeviceDescription& _description;
   SystemLog& _log;
-  std::optional<FolderLock> _dailyWork;
+  std::optional<FileDescriptor> _dailyWork;
 };
 
 class HostPtreeSerialization final : public PtreeSerialization {

@@ -106,7 +106,7 @@ bool HostOutbox::writeLog(std::string_view type, std::string_view name, const Pr
   const Date time = _clock.now();
   file->setModificationTime(time);
   // Two submissions at once must not share a number, or a header would go with the other's log.
-  const std::optional<FolderLock> lock = FolderLock::take(*folder, error);
+  const std::optional<FileDescriptor> lock = lockFolder(*folder, error);
   if (!lock) {
     return false;
   }

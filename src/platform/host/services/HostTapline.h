@@ -1,7 +1,10 @@
 #pragma once
 
+#include <map>
+
 #include "platform/Tapline.h"
 #include "platform/host/device/DeviceDescription.h"
+#include "platform/host/figures/FigureReader.h"
 
 namespace vesprun {
 
@@ -12,8 +15,17 @@ class HostTapline final : public Tapline {
   explicit HostTapline(const DeviceDescription& description) : _description(description) {}
 
   std::optional<TaplineChannels> TaplineCopyChannelsInCategories(
-      std::uint64_t categoryMask, std::uint64_t firstSelection,
-      std::uint64_t secondSelection) override;
+      std::uint64_t categoryMask, std::uint64_t /*firstSelection*/,
+      std::uint64_t /*secondSelection*/) override {
+    std::vector<TaplineChannel> selected;
+    for (const auto& [name, value, format, categories] :
+         _description.liveChannels ? liveChannels() : _description.channels) {
+      if ((categories & categoryMask) != 0) {
+        selected.emplace_back(name, format, value);
+      }
+    }
+    return selected.empty() ? std::nullopt : std::optional(TaplineChannels(std::move(selected)));
+  }
   std::optional<TaplineSubscription> TaplineCreateSubscription(
       const TaplineChannels& wanted) override {
     return TaplineSubscription{wanted};
@@ -24,6 +36,23 @@ class HostTapline final : public Tapline {
   }
 
  private:
+  static std::vector<ChannelDescription> liveChannels() {
+    const auto isChannel = [](const LinuxFigure& figure) {
+      return figure.key.starts_with("linux.temperature.") ||
+             figure.key.starts_with("linux.pressure.");
+    };
+    std::map<std::string, std::int64_t> values;
+    for (const FigureReading& reading : readFigures("", isChannel).figures) {
+      mergeFigure(values, *reading.figure, reading.key, reading.value);
+    }
+    std::vector<ChannelDescription> channels;
+    channels.reserve(values.size());
+    for (const auto& [name, value] : values) {
+      channels.push_back({name, value});
+    }
+    return channels;
+  }
+
   const DeviceDescription& _description;
 };
 

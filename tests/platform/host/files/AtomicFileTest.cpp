@@ -7,7 +7,6 @@
 #include <sstream>
 #include <thread>
 
-#include "platform/host/files/FileLock.h"
 #include "platform/host/files/JsonLines.h"
 #include "support/HostServiceTest.h"
 

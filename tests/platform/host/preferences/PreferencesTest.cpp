@@ -142,7 +142,7 @@ TEST_F(PreferencesTest, AreNotWrittenWhileAnotherProcessKeepsTheFolder) {
   folder.write(kFile, kOneKey);
   here.LGSPreferencesSetValue("first", 2, "a");
   {
-    const auto kept = FolderLock::take(folder.path(kFolder), error);
+    const auto kept = lockFolder(folder.path(kFolder), error);
     EXPECT_FALSE(here.LGSPreferencesSynchronize("a"));
     EXPECT_THAT(log.messages,
                 ElementsAre(folder.path(kFolder) + ": another process keeps it locked"));
