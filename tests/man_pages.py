@@ -1,8 +1,9 @@
 #!/usr/bin/env python3
 """Compares a manual page with the commands and options that its program knows: man_pages.py PAGE PROGRAM
 
-Every command and option of the program is in the page, and every one in the page is in the program. A
-section of COMMANDS that has a command's name tells of the commands below it.
+Every command and option of the program is in the page, and every one in the page is in the program; so are
+the names of arguments, somewhere. A section of COMMANDS that has a command's name tells of the commands
+below it.
 """
 
 import re
@@ -11,10 +12,11 @@ import sys
 
 
 def tree(program, path=(), words=()):
-    """The options of each command, by the words that lead to it. `words` has its arguments, too."""
+    """The options and arguments of each command, by the words that lead to it; `words` has arguments, too."""
     text = subprocess.run([program, *words, "--help"], check=True, capture_output=True, text=True).stdout
     found = {path: set(re.findall(r"^  (?:-\w,)?(--[\w-]+)", text, re.M)) - {"--help"}}
-    arguments = re.findall(r"^  \S", text.partition("\nPositionals:\n")[2].partition("\n\n")[0], re.M)
+    arguments = re.findall(r"^  (\S+)", text.partition("\nPositionals:\n")[2].partition("\n\n")[0], re.M)
+    found[path] |= set(arguments)
     for name in re.findall(r"^  ([\w-]+)", text.partition("\nSubcommands:\n")[2], re.M):
         found |= tree(program, (*path, name), (*words, *["x"] * len(arguments), name))
     return found
@@ -28,8 +30,9 @@ def plain(roff):
 
 def main(page_file, program):
     commands = tree(program)
-    with open(page_file, encoding="utf-8") as page:
-        body = re.split(r"^\.SH (?!OPTIONS)", page.read().partition(".SH COMMANDS\n")[2], flags=re.M)[0]
+    with open(page_file, encoding="utf-8") as file:
+        page = file.read()
+    body = re.split(r"^\.SH (?!OPTIONS)", page.partition(".SH COMMANDS\n")[2], flags=re.M)[0]
     complaints = []
     named = {()}
     for section in re.split(r"^\.SS ", "\n" + body, flags=re.M):
@@ -53,11 +56,13 @@ def main(page_file, program):
         words = set(re.findall(r"[\w-]+", text))
         here |= {path for path in commands if path[:-1] in here - {above} and path[-1] in words}
         shown = set(re.findall(r"--[a-z][\w-]*", text))
-        known = set().union(*(commands[path] for path in here))
+        known = {name for path in here for name in commands[path] if name.startswith("--")}
         complaints += [f"{title}: no command has {option}" for option in sorted(shown - known)]
         complaints += [f"{title}: {option} is missing" for option in sorted(known - shown)]
         named |= here
     complaints += [f"{' '.join(path)} is missing" for path in sorted(set(commands) - named)]
+    arguments = {name for names in commands.values() for name in names if not name.startswith("--")}
+    complaints += [f"{name} is missing" for name in sorted(arguments - set(re.findall(r"\w+", page)))]
     for complaint in complaints:
         print(f"{page_file}: {complaint}", file=sys.stderr)
     return 1 if complaints or len(commands) < 4 else 0
