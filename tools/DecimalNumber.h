@@ -11,8 +11,8 @@
 
 namespace vesprun {
 
-/// To transform an option: accepts only a decimal integer that fits `T`. CLI11 itself takes `010`
-/// for eight. Leading zeros are fine, a sign only if `T` has one.
+/// For `transform`: accepts only a decimal integer that fits `T`, with leading zeros, and a sign if
+/// `T` has one. CLI11 itself would take `010` for eight.
 template <std::integral T>
 CLI::Validator decimal() {
   return CLI::Validator(

@@ -18,16 +18,16 @@ class Device {
   VESPRUN_EXPORT static std::unique_ptr<Device> open(const std::string& path,
                                                      std::string& error) noexcept;
 
-  /// Writes what the device's services held back, counters as `checkpoint` does.
+  /// Writes what the services still hold in memory; counters as `checkpoint` does.
   VESPRUN_EXPORT ~Device();
 
   Device(const Device&) = delete;
   Device& operator=(const Device&) = delete;
 
   // Counters of today, by the device's clock; days begin at 00:00 UTC. A key is UTF-8 text that an
-  // XML 1.0 document can carry, 1 MiB at most. Any thread may change counters; the changes are
-  // collected in memory until the next checkpoint. False, with a text in `error`, when an operation
-  // failed: nothing was changed then.
+  // XML 1.0 document can carry, 1 MiB at most. Any thread may change counters; the changes stay in
+  // memory until the next checkpoint. False, with a text in `error` and nothing changed, on
+  // failure.
 
   VESPRUN_EXPORT bool setScalar(std::string_view key, std::int64_t value,
                                 std::string& error) noexcept;
@@ -37,9 +37,8 @@ class Device {
   /// Adds one more value to a distribution.
   VESPRUN_EXPORT bool addToDistribution(std::string_view key, double value,
                                         std::string& error) noexcept;
-  /// Writes all that was collected in one transaction, which outlives a loss of power; on failure
-  /// it waits for the next checkpoint. What other processes have locked is waited for, 20 seconds
-  /// at most.
+  /// Writes all changes in one transaction, which survives a loss of power; on failure they wait
+  /// for the next checkpoint. Waits for the locks of other processes, 20 seconds at most.
   VESPRUN_EXPORT bool checkpoint(std::string& error) noexcept;
 
  private:

@@ -6,11 +6,11 @@
  * statistics of its storage as JSON. C++ programs have `vesprun.hpp` as well.
  *
  * No function ends the program, throws, or keeps a pointer that it was given. Texts are UTF-8 with
- * a zero at the end. A null pointer where something is needed is an error like any other. What
- * fails leaves its text with `vesprun_last_error`.
+ * a zero at the end. A null pointer where something is needed is an error like any other. After a
+ * failure `vesprun_last_error` has the text.
  *
- * The functions may be called from any thread; `vesprun_close` when no other thread uses the device
- * any more. A process that has forked uses the device in one of the two processes only.
+ * The functions may be called from any thread, `vesprun_close` only when no other thread uses the
+ * device any more. After a fork only one of the two processes may use it.
  */
 
 #include <stdint.h>
@@ -28,8 +28,8 @@ typedef struct vesprun_device vesprun_device;
 VESPRUN_EXPORT const char* vesprun_version(void);
 
 /**
- * Why the last call of this thread that failed did so, naming the place; "" before. Valid until the
- * thread's next call that fails.
+ * The error of this thread's last call that failed, which names the place; "" when none has. Valid
+ * until the thread's next call that fails.
  */
 VESPRUN_EXPORT const char* vesprun_last_error(void);
 
@@ -41,15 +41,15 @@ VESPRUN_EXPORT const char* vesprun_last_error(void);
 VESPRUN_EXPORT vesprun_device* vesprun_open(const char* directory);
 
 /**
- * Makes a last checkpoint and closes the device. What cannot be written is lost, and the device's
- * system log says so; who wants to know calls `vesprun_checkpoint` first. Null is allowed.
+ * Makes a last checkpoint and closes the device. When that fails, the changes are lost and only the
+ * device's system log says so: call `vesprun_checkpoint` first to know. Null is allowed.
  */
 VESPRUN_EXPORT void vesprun_close(vesprun_device* device);
 
 /*
  * Counters of today, by the device's clock; days begin at 00:00 UTC. A key is text that an XML 1.0
- * document can carry, 1 MiB at most. Changes are collected in memory until the next checkpoint.
- * Each function gives 0, or -1 when it failed: nothing was changed then.
+ * document can carry, 1 MiB at most. Changes stay in memory until the next checkpoint. Each
+ * function returns 0, or -1 on failure, with nothing changed.
  */
 
 /** Sets a scalar. */
@@ -63,9 +63,9 @@ VESPRUN_EXPORT int vesprun_add_to_distribution(vesprun_device* device, const cha
                                                double value);
 
 /**
- * Writes all that was collected in one transaction: all of it outlives a loss of power when 0 is
- * returned. With -1 nothing was written, and it waits for the next checkpoint. What other processes
- * have locked is waited for, 20 seconds at most.
+ * Writes all changes in one transaction, which survives a loss of power once 0 is returned. On
+ * failure nothing was written, and the changes wait for the next checkpoint. Waits for the locks of
+ * other processes, 20 seconds at most.
  */
 VESPRUN_EXPORT int vesprun_checkpoint(vesprun_device* device);
 
@@ -74,15 +74,15 @@ VESPRUN_EXPORT int vesprun_checkpoint(vesprun_device* device);
  * "CopyInternalLabNANDInfo" or "lab". `arguments` is a JSON object of the command's arguments, such
  * as {"hours":24,"raw":true}, or null for none.
  *
- * Gives {"result":VALUE,"error":TEXT}, in the JSON form of `vespctl`: null for an entry point that
- * answers nothing, and the first error text of the process or "NA". The text is released with
- * `vesprun_free`. Null when there is no such entry point or argument, or memory runs out. Calls
- * from several threads wait for each other; some entry points print lines on the standard streams.
+ * Returns {"result":VALUE,"error":TEXT}, to be released with `vesprun_free`: the value in the JSON
+ * form of `vespctl`, null when there is none, and the first error text of the process or "NA". Null
+ * when there is no such entry point or argument, or memory runs out. Calls from several threads
+ * wait for each other. Some entry points print lines on the standard streams.
  */
 VESPRUN_EXPORT char* vesprun_call(vesprun_device* device, const char* entry_point,
                                   const char* arguments);
 
-/** Releases what `vesprun_call` gave. Null is allowed. */
+/** Releases what `vesprun_call` returned. Null is allowed. */
 VESPRUN_EXPORT void vesprun_free(char* text);
 
 #ifdef __cplusplus

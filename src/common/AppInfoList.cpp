@@ -1,6 +1,5 @@
 #include "common/AppInfoList.h"
 
-#include <cstdint>
 #include <string>
 #include <string_view>
 
@@ -8,11 +7,6 @@
 
 namespace vesprun {
 namespace {
-
-std::int64_t appInteger(const PropertyDict& dict, std::string_view key) {
-  const Number* number = dict.findNumber(key);
-  return number != nullptr ? number->asInt64() : 0;
-}
 
 std::string appText(const PropertyDict& dict, std::string_view key) {
   const std::string* text = dict.findString(key);
@@ -47,8 +41,8 @@ void AppInfoList::forEach(const std::function<bool(const PropertyDict& app)>& ta
       info.reserve(5);
       info.set("bundle", appText(*app, "bundle_id"));
       info.set("version", appText(*app, "version"));
-      info.set("adamID", appInteger(*app, "adam_id"));
-      info.set("arch", appInteger(*app, "arch"));
+      info.set("adamID", app->integerOr("adam_id", 0));
+      info.set("arch", app->integerOr("arch", 0));
       info.set("uuid", appUUID(*app, "uuid"));
       if (!take(info)) {
         return;

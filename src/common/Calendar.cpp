@@ -8,8 +8,8 @@
 namespace vesprun {
 namespace {
 
-// std::chrono's calendar ends at the year 32767, day numbers do not: it counts within an era of 400
-// years, which all have the same number of days.
+// std::chrono's calendar ends with the year 32767. So it is used within one era of 400 years: all
+// eras have the same number of days.
 constexpr std::int64_t kDaysPerEra = 146097;
 constexpr std::int64_t kYearsPerEra = 400;
 constexpr std::int64_t kLargestYear = 10'000'000;  // beyond every 32-bit day number

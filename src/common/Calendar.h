@@ -17,7 +17,7 @@ double secondsBetween(const Date& earlier, const Date& later);
 /// The first instant (UTC) of any 32-bit day number.
 Date startOfDay(std::int32_t daysSince1970);
 
-/// The day number (UTC), cut to 32 bits.
+/// The day number (UTC), saturated to 32 bits.
 std::int32_t daysSince1970(const Date& date);
 
 /// "2024-03-05T09:15:02Z", with up to nine digits of a fraction. Years have at least four digits

@@ -4,9 +4,8 @@
 
 namespace vesprun {
 
-/// Something that lives as long as the process. Each has an object of this class beside it, in
-/// static memory, with the function that brings it back to its first state. Then tests and fuzzers
-/// can play one process after another.
+/// A static object beside each state that lives as long as the process, with the function that
+/// resets it. Tests and fuzzers can so play one process after another.
 class ProcessState {
  public:
   using Reset = void (*)();

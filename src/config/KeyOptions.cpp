@@ -40,7 +40,7 @@ bool DistributionOptions::operator==(const DistributionOptions& other) const {
   if (intervals == nullptr || other.intervals == nullptr) {
     return intervals == other.intervals;
   }
-  // As labels show them, in which NaN is like itself.
+  // As labels show them: there NaN equals NaN.
   return std::equal(
       intervals->begin(), intervals->end(), other.intervals->begin(), other.intervals->end(),
       [](const auto& left, const auto& right) { return textForm(left) == textForm(right); });

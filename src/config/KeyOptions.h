@@ -8,12 +8,12 @@
 
 namespace vesprun {
 
-// Options of whitelisted keys. If an entry has a wrong type, the key must stay out of the log: no
+// Options of whitelisted keys. A key with an option of a wrong type must stay out of the log: no
 // value may leave finer than was meant.
 
 /// How coarse a scalar is reported: unsigned 64-bit integers, converted as `Number` does.
 struct ScalarOptions {
-  // The whitelist's names: of the lists of such keys and prefixes in a group, and of the options.
+  // Names in the whitelist: a group's lists of such keys and prefixes, and the options.
   static constexpr std::string_view kKeyList = "ScalarKeys";
   static constexpr std::string_view kPrefixList = "ScalarKeyPrefixes";
   static constexpr std::string_view kBucketInterval = "bucket_interval";
@@ -38,7 +38,7 @@ struct DistributionOptions {
   /// Nothing when "intervals" is not an array of numbers.
   static std::optional<DistributionOptions> read(const PropertyDict& options);
 
-  /// Whether all values get the same bucket and label.
+  /// Whether every value gets the same bucket and label.
   bool operator==(const DistributionOptions& other) const;
 };
 

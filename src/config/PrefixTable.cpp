@@ -10,7 +10,7 @@ std::size_t commonLength(std::string_view left, std::string_view right) {
   return static_cast<std::size_t>(end - left.begin());
 }
 
-/// The half byte at that place, counted from 1; 0 behind the end. They order as texts do.
+/// The half byte at that place plus 1, or 0 behind the end: these numbers sort as the texts do.
 unsigned halfByte(std::string_view text, std::size_t at) {
   if (at / 2 >= text.size()) {
     return 0;
@@ -68,7 +68,8 @@ PrefixTable::PrefixTable(const std::vector<std::string_view>& prefixes) {
     const std::size_t children = _nodes.size();
     _nodes[node] = {static_cast<std::uint32_t>(children), static_cast<std::uint8_t>(low),
                     static_cast<std::uint8_t>(high - low), at};
-    // A key without a child of its own shares the same beginning with all entries: any will do.
+    // A key without a child of its own has the same beginning in common with all entries: any will
+    // do.
     _nodes.resize(children + high - low + 1, {from});
     for (std::uint32_t begin = from; begin != to;) {
       const unsigned half = halfByte(_sorted[begin].text, at);

@@ -8,12 +8,12 @@
 
 namespace vesprun {
 
-/// Finds the first prefix, in the given order, with which a key begins; the empty one fits every
-/// key.
+/// Finds the first prefix, in the given order, with which a key begins; every key begins with the
+/// empty one.
 ///
-/// A tree over the half bytes in which the prefixes differ leads to the one that has the longest
-/// beginning in common with a key, without a look at those in between. What the key begins with is
-/// then this prefix, or one that it begins with itself.
+/// A tree that branches on the half bytes in which the prefixes differ leads to the prefix that
+/// shares the longest beginning with the key. The key then begins with this prefix, or with
+/// prefixes of it, or with none.
 class PrefixTable {
  public:
   /// Fewer than a hundred million different prefixes, whose texts outlive the table.
@@ -26,8 +26,8 @@ class PrefixTable {
 
   struct Entry {
     std::string_view text;
-    std::uint32_t first;  ///< lowest place of this prefix and of those that it begins with
-    std::uint32_t longest = kNone;  ///< other prefix that it begins with
+    std::uint32_t first;            ///< lowest place of this prefix and of those it begins with
+    std::uint32_t longest = kNone;  ///< the longest other prefix that it begins with
   };
 
   struct Node {

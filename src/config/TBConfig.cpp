@@ -4,8 +4,8 @@
 #include <optional>
 #include <utility>
 
+#include "common/ProcessState.h"
 #include "common/TextForm.h"
-#include "config/InternalDevice.h"
 #include "platform/Platform.h"
 
 namespace vesprun {
@@ -14,6 +14,17 @@ namespace {
 constexpr const char* kWhitelistPath =
     "/Library/Application Support/Tallybook/Whitelist_Stagebox.ptree";
 constexpr std::uint64_t kMostBytes = 256 << 20;
+
+std::optional<bool> gIsInternalDevice;
+const ProcessState kInternalDeviceState([] { gIsInternalDevice.reset(); });
+
+/// The platform is asked once in a process.
+bool TBIsInternalDevice() {
+  if (!gIsInternalDevice) {
+    gIsInternalDevice = platform().deviceInformation().OrreryGetBoolAnswer("InternalBuild");
+  }
+  return *gIsInternalDevice;
+}
 
 std::optional<std::string> readWhitelist() {
   FileSystem& fileSystem = platform().fileSystem();
@@ -100,7 +111,6 @@ TBConfig::TBConfig(PropertyValue document)
   reportHeldBack(DistributionOptions::kKeyList, distributions.keys());
   reportHeldBack(ScalarOptions::kPrefixList, scalars.prefixes());
   reportHeldBack(DistributionOptions::kPrefixList, distributions.prefixes());
-  _tables.indexPrefixes();
 }
 
 void TBConfig::takeGroup(const WhitelistKeyGroup& group) {
@@ -116,18 +126,6 @@ void TBConfig::takeGroup(const WhitelistKeyGroup& group) {
 }
 
 template <typename Options>
-WhitelistDecision<Options> TBConfig::decide(std::string_view key) const {
-  WhitelistDecision<Options> decision = _tables.of<Options>().decide(key);
-  if (decision.by == DecidedBy::Nothing && _isInternalDevice) {
-    decision.by = DecidedBy::InternalDevice;
-  }
-  return decision;
-}
-
-template WhitelistDecision<ScalarOptions> TBConfig::decide(std::string_view) const;
-template WhitelistDecision<DistributionOptions> TBConfig::decide(std::string_view) const;
-
-template <typename Options>
 std::vector<PassedOverGroup> TBConfig::groupsPassedOver(std::string_view key) const {
   std::vector<PassedOverGroup> groups;
   for (const auto& [name, lists] : *_document.dict()) {
@@ -138,7 +136,6 @@ std::vector<PassedOverGroup> TBConfig::groupsPassedOver(std::string_view key) co
     }
     WhitelistTables ofGroup;
     ofGroup.take(group);
-    ofGroup.indexPrefixes();
     if (const DecidedBy by = ofGroup.of<Options>().decide(key).by; by != DecidedBy::Nothing) {
       groups.push_back({name, standing, by});
     }

@@ -31,8 +31,8 @@ struct PassedOverGroup {
 /// one error line, with the number of them and the first. A file above 256 MiB is not read.
 class TBConfig {
  public:
-  /// Null, with an error line, when the whitelist file cannot be read or parsed; so for
-  /// `fromBytes`.
+  /// From the whitelist file, or the bytes of one. Null, with an error line, when it cannot be read
+  /// or parsed.
   static std::unique_ptr<TBConfig> init();
   static std::unique_ptr<TBConfig> fromBytes(std::string_view bytes);
 
@@ -44,9 +44,15 @@ class TBConfig {
 
   // For both kinds, `ScalarOptions` and `DistributionOptions`:
 
-  /// The same with the reason and without debug lines.
+  /// The same decision with its reason, without debug lines.
   template <typename Options>
-  WhitelistDecision<Options> decide(std::string_view key) const;
+  WhitelistDecision<Options> decide(std::string_view key) const {
+    WhitelistDecision<Options> decision = _tables.of<Options>().decide(key);
+    if (decision.by == DecidedBy::Nothing && _isInternalDevice) {
+      decision.by = DecidedBy::InternalDevice;
+    }
+    return decision;
+  }
 
   /// The groups, in document order, that do not count on this device although their lists of that
   /// kind name the key, or else a prefix of it.

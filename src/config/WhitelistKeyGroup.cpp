@@ -8,7 +8,7 @@ WhitelistKeyGroup::Standing WhitelistKeyGroup::standing(bool isInternalDevice) c
   if (isInternalDevice) {
     return Standing::Taken;
   }
-  if (isForInternalDevices()) {
+  if (isForInternalDevices(name)) {
     return Standing::InternalDevicesOnly;
   }
   bool found = false;

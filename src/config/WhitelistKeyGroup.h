@@ -14,8 +14,8 @@ struct WhitelistKeyGroup {
   /// with a false preference in "com.quill.da".
   Standing standing(bool isInternalDevice) const;
 
-  /// True for the group that counts on internal devices alone.
-  bool isForInternalDevices() const { return name == "InternalTesting"; }
+  /// True for the name of the group that counts on internal devices alone.
+  static bool isForInternalDevices(std::string_view name) { return name == "InternalTesting"; }
 
   std::string_view name;       ///< a key of the document, with its zero byte behind it
   const PropertyValue& lists;  ///< skipped unless it is a dictionary

@@ -3,18 +3,11 @@
 #include <algorithm>
 
 namespace vesprun {
-namespace {
-
-template <typename Options>
-bool isListOf(std::string_view name) {
-  return name == Options::kKeyList || name == Options::kPrefixList;
-}
-
-}  // namespace
 
 template <typename Options>
 void WhitelistTable<Options>::take(std::string_view group, std::string_view list,
                                    const PropertyDict& entries) {
+  _prefixTable.reset();
   Entries& table = list == Options::kKeyList ? _keys : _prefixes;
   for (const auto& [key, written] : entries) {
     const PropertyDict* options = written.dict();
@@ -22,16 +15,6 @@ void WhitelistTable<Options>::take(std::string_view group, std::string_view list
         key, WhitelistEntry<Options>{group, &written,
                                      options != nullptr ? Options::read(*options) : std::nullopt});
   }
-}
-
-template <typename Options>
-void WhitelistTable<Options>::indexPrefixes() {
-  std::vector<std::string_view> texts;
-  texts.reserve(_prefixes.size());
-  for (const auto& [prefix, entry] : _prefixes) {
-    texts.push_back(prefix);
-  }
-  _prefixTable = PrefixTable(texts);
 }
 
 template <typename Options>
@@ -49,7 +32,15 @@ WhitelistDecision<Options> WhitelistTable<Options>::decide(std::string_view key)
 
 template <typename Options>
 WhitelistDecision<Options> WhitelistTable<Options>::decideByPrefix(std::string_view key) const {
-  if (const std::optional<std::size_t> place = _prefixTable.find(key)) {
+  if (!_prefixTable) {
+    std::vector<std::string_view> texts;
+    texts.reserve(_prefixes.size());
+    for (const auto& [prefix, entry] : _prefixes) {
+      texts.push_back(prefix);
+    }
+    _prefixTable.emplace(texts);
+  }
+  if (const std::optional<std::size_t> place = _prefixTable->find(key)) {
     const auto& [prefix, entry] = *_prefixes.nth(*place);
     return {DecidedBy::Prefix, prefix, &entry};
   }
@@ -58,25 +49,22 @@ WhitelistDecision<Options> WhitelistTable<Options>::decideByPrefix(std::string_v
 
 std::vector<std::string_view> WhitelistTables::take(const WhitelistKeyGroup& group) {
   std::vector<std::string_view> skipped;
+  const auto takeIfOfKind = [&]<typename Options>(WhitelistTable<Options>& table,
+                                                  std::string_view list,
+                                                  const PropertyValue& entries) {
+    if (list == Options::kKeyList || list == Options::kPrefixList) {
+      if (entries.dict() != nullptr) {
+        table.take(group.name, list, *entries.dict());
+      } else {
+        skipped.push_back(list);
+      }
+    }
+  };
   for (const auto& [list, entries] : *group.lists.dict()) {
-    const bool ofScalars = isListOf<ScalarOptions>(list);
-    if (!ofScalars && !isListOf<DistributionOptions>(list)) {
-      continue;
-    }
-    if (entries.dict() == nullptr) {
-      skipped.push_back(list);
-    } else if (ofScalars) {
-      _scalars.take(group.name, list, *entries.dict());
-    } else {
-      _distributions.take(group.name, list, *entries.dict());
-    }
+    takeIfOfKind(std::get<0>(_tables), list, entries);
+    takeIfOfKind(std::get<1>(_tables), list, entries);
   }
   return skipped;
-}
-
-void WhitelistTables::indexPrefixes() {
-  _scalars.indexPrefixes();
-  _distributions.indexPrefixes();
 }
 
 template class WhitelistTable<ScalarOptions>;

@@ -5,7 +5,7 @@
 #include <cstddef>
 #include <optional>
 #include <string_view>
-#include <type_traits>
+#include <tuple>
 #include <vector>
 
 #include "common/PropertyDict.h"
@@ -15,7 +15,7 @@
 
 namespace vesprun {
 
-/// What the whitelist says of a key or prefix. All of it lies in the document.
+/// What the whitelist says of a key or prefix; refers to the document.
 template <typename Options>
 struct WhitelistEntry {
   std::string_view group;          ///< the last one that names it
@@ -68,47 +68,36 @@ class WhitelistTable {
   /// outlive the table.
   void take(std::string_view group, std::string_view list, const PropertyDict& entries);
 
-  /// Must be called between the last `take` and the first look-up of a prefix.
-  void indexPrefixes();
-
   const Entries& keys() const { return _keys; }
   const Entries& prefixes() const { return _prefixes; }
 
-  /// The exact key decides before the first prefix in order. Fastest for keys in the order of the
+  /// By the exact key, else by the first prefix in order. Fastest for keys in the order of the
   /// whitelist; not for several threads at a time.
   WhitelistDecision<Options> decide(std::string_view key) const;
-  /// What the first prefix would decide; on `prefix` itself, the one that is reached in its place.
+  /// By the first prefix alone. A prefix that another one decides is never reached.
   WhitelistDecision<Options> decideByPrefix(std::string_view key) const;
 
  private:
   Entries _keys;
-  mutable std::size_t _expected = 0;  ///< the place after the key that was found last
+  mutable std::size_t _expected = 0;  ///< the place after the last key that was found
   Entries _prefixes;
-  PrefixTable _prefixTable;
+  mutable std::optional<PrefixTable> _prefixTable;  ///< of `_prefixes`, once a look-up needs it
 };
 
 /// The tables of both kinds.
 class WhitelistTables {
  public:
-  /// Takes the lists of a group, which must be a dictionary. Gives the names of those that are
-  /// skipped since they are none.
+  /// Takes the lists of a group, which must be a dictionary. Returns the names of those that are
+  /// not dictionaries and are skipped.
   std::vector<std::string_view> take(const WhitelistKeyGroup& group);
-
-  /// See `WhitelistTable`.
-  void indexPrefixes();
 
   template <typename Options>
   const WhitelistTable<Options>& of() const {
-    if constexpr (std::is_same_v<Options, ScalarOptions>) {
-      return _scalars;
-    } else {
-      return _distributions;
-    }
+    return std::get<WhitelistTable<Options>>(_tables);
   }
 
  private:
-  WhitelistTable<ScalarOptions> _scalars;
-  WhitelistTable<DistributionOptions> _distributions;
+  std::tuple<WhitelistTable<ScalarOptions>, WhitelistTable<DistributionOptions>> _tables;
 };
 
 }  // namespace vesprun

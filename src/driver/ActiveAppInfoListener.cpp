@@ -29,11 +29,6 @@ const ProcessState kMessageState([] {
   gMessageGateClosed.clear();
 });
 
-std::int64_t integerField(const PropertyDict& dict, std::string_view key) {
-  const Number* number = dict.findNumber(key);
-  return number != nullptr ? number->asInt64() : 0;
-}
-
 void appendTextForm(const AppInfoList& list, std::string& text) {
   const char* separator = "(";
   list.forEach([&](const PropertyDict& app) {
@@ -65,14 +60,14 @@ void requestActiveAppInfo() {
 }
 
 void handle(const PropertyDict& message) {
-  const auto operation = static_cast<std::uint32_t>(integerField(message, "operation"));
+  const auto operation = static_cast<std::uint32_t>(message.integerOr("operation", 0));
   if (operation == kActiveAppInfo) {
     takeActiveAppInfo(message);
   } else if (!gMessageGateClosed.test_and_set()) {
     if (operation == kLoggingStatus) {
       requestActiveAppInfo();
     } else if (operation == kDailyTasks) {
-      runDailyTasks(static_cast<std::int32_t>(integerField(message, "value")), nullptr);
+      runDailyTasks(static_cast<std::int32_t>(message.integerOr("value", 0)), nullptr);
     }
   }
 }

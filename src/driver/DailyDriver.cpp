@@ -12,7 +12,7 @@
 namespace vesprun {
 namespace {
 
-constexpr int kMostFailures = 100;  // of the main loop, one behind the other
+constexpr int kMostFailures = 100;  // of the main loop, in a row
 constexpr std::string_view kServiceName = "com.quill.aggregated.vesprun";
 
 void runOption(const char* argument) {

@@ -4,7 +4,7 @@
 
 namespace vesprun {
 
-/// The listener mode ends after so many seconds without a message.
+/// The listener mode ends after this time without a message, in seconds.
 inline constexpr double kQuietSeconds = 10.0;
 
 /// The job of a process. `commandLine` begins with the program name, without which nothing runs.
@@ -17,8 +17,8 @@ inline constexpr double kQuietSeconds = 10.0;
 void runDailyDriver(std::span<const char* const> commandLine) noexcept;
 
 /// Offers the service for active-app-info messages and runs the main loop until `quietSeconds` pass
-/// without an event. Then runs the day check if requested app info never came. A service that
-/// cannot be offered changes nothing else.
+/// without an event, also when the service cannot be offered. Then runs the day check if requested
+/// app info never came.
 void runListenerMode(double quietSeconds = kQuietSeconds);
 
 }  // namespace vesprun

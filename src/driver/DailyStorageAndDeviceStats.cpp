@@ -10,7 +10,7 @@
 #include "platform/Guarded.h"
 #include "platform/Platform.h"
 #include "telemetry/DataUsage.h"
-#include "telemetry/DiskUsage.h"
+#include "telemetry/DiskInfo.h"
 #include "telemetry/KernelECCEvents.h"
 #include "telemetry/ReportingChannels.h"
 

@@ -9,10 +9,10 @@
 namespace vesprun {
 namespace {
 
-/// Longer than a day's work takes; a stopped holder must not block the others for ever.
+/// Seconds: more than a day's work takes, but a stopped process must not block the others for ever.
 constexpr double kLongestWaitForOthers = 300;
 
-bool isAlone() { return platform().fileSystem().lockDailyWork(kLongestWaitForOthers); }
+bool lockDailyWork() { return platform().fileSystem().lockDailyWork(kLongestWaitForOthers); }
 
 std::int32_t yesterday() { return dayBefore(platform().tallybook().TBDaysSince1970()); }
 
@@ -52,7 +52,7 @@ std::int32_t dayBefore(std::int32_t day) {
 
 void runDayCheck(const AppInfoList* appInfo) {
   if (!isDoneFor(yesterday())) {
-    if (!isAlone()) {
+    if (!lockDailyWork()) {
       return;
     }
     const std::int32_t day = yesterday();
@@ -67,7 +67,7 @@ void runDayCheck(const AppInfoList* appInfo) {
 }
 
 void runDailyTasks(std::int32_t day, const AppInfoList* appInfo) {
-  if (isAlone()) {
+  if (lockDailyWork()) {
     runTasks(day, appInfo);
   }
 }

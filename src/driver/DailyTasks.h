@@ -17,8 +17,8 @@ std::int32_t dayBefore(std::int32_t day);
 /// line in the system log.
 void runDayCheck(const AppInfoList* appInfo);
 
-/// Runs the daily tasks for a day, whether or not they have run, unless another process is at them
-/// (see `runDayCheck`). Every task runs, whatever the earlier ones did. When this returns, their
+/// Runs the daily tasks for a day, even if they have run, unless another process is at them (see
+/// `runDayCheck`). Every task runs, whatever the earlier ones did. When this returns, their
 /// counters are durable. `appInfo` goes into the daily log and may be null.
 void runDailyTasks(std::int32_t day, const AppInfoList* appInfo);
 

@@ -2,8 +2,8 @@
 
 namespace vesprun {
 
-/// Records a change of the OS build; when the scheduled tasking or the build is new (a build
-/// missing on both sides is not), undoes the earlier tasking and applies this one; announces the
+/// Records a change of the OS build. When the scheduled tasking or the build is new, undoes the
+/// earlier tasking and applies this one; a build that was and is missing is not new. Announces the
 /// disabled log types as events.
 ///
 /// Records are taken in order. Without "Value" the key is removed; a missing or non-text "Domain",

@@ -12,7 +12,7 @@ namespace {
 /// Held while a device is opened or closed: of two threads that open one, the second is refused.
 std::mutex gInstallationMutex;
 
-/// What the body gives, or false, with a text in `error`, when it throws.
+/// What the body returns; false, with a text in `error`, when it throws.
 template <typename Body>
 bool runForProgram(std::string& error, const Body& body) noexcept {
   try {

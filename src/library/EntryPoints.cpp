@@ -166,9 +166,9 @@ std::optional<std::string> callByName(std::string_view name, std::string_view ar
         error = place + "there is no argument " + quotedText(key);
         return std::nullopt;
       }
-      auto& place_ = given[static_cast<std::size_t>(parameter - row->parameters.begin())];
-      place_ = argumentValue(*parameter, argument);
-      if (!place_) {
+      auto& taken = given[static_cast<std::size_t>(parameter - row->parameters.begin())];
+      taken = argumentValue(*parameter, argument);
+      if (!taken) {
         error =
             place + key +
             (parameter->isFlag() ? " is neither true nor false"

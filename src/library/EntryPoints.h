@@ -33,11 +33,11 @@ struct EntryPointRow {
 
 std::span<const EntryPointRow> entryPoints();
 
-/// What the call gives, and the first error text of the process: {"result":VALUE,"error":TEXT}, the
-/// value null for nothing. Throws `std::bad_alloc`.
+/// The result of the call, or null, and the first error text of the process:
+/// {"result":VALUE,"error":TEXT}. Throws `std::bad_alloc`.
 std::string callToJson(const EntryPointRow& entryPoint, std::span<const std::uint64_t> values);
 
-/// The same for an entry point by either name, and a JSON object of its arguments. Nothing, with a
+/// The same for an entry point by either name and a JSON object of its arguments. Nothing, with a
 /// text in `error`, when there is no such entry point or argument.
 std::optional<std::string> callByName(std::string_view name, std::string_view arguments,
                                       std::string& error);

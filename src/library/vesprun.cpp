@@ -36,8 +36,7 @@ class WithoutCancellation {
   int _before = PTHREAD_CANCEL_ENABLE;
 };
 
-/// What the body gives; `failed`, with the last error set, when it leaves a text in its argument or
-/// throws.
+/// What the body returns. When that is `failed`, or it throws, its error becomes the last error.
 template <typename Result, typename Body>
 Result callFromC(Result failed, const Body& body) noexcept {
   const WithoutCancellation uncancelled;

@@ -41,10 +41,10 @@ class UsageFeed {
 
 /// The platform's usage feed.
 ///
-/// The platform ends this service first: it waits for a running handler and drops the others. A
-/// handler may use only services that are safe from any thread (`Tallybook`, `Preferences`,
-/// `PtreeSerialization`, `SystemLog`), by references taken before: another platform may be
-/// installed by then.
+/// At its end the platform first waits for a running handler of this service and drops the others.
+/// A handler may use only services that are safe from any thread (`Tallybook`, `Preferences`,
+/// `PtreeSerialization`, `SystemLog`), by references taken before the query: another platform may
+/// be installed by then.
 class Murmur {
  public:
   virtual ~Murmur() = default;

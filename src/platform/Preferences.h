@@ -6,8 +6,8 @@
 
 #include "common/PropertyValue.h"
 
-// Stored values. This process sees a change at once; it is written when it is synchronized, or when
-// the process ends. A value of nothing removes the key.
+// Stored values. A process sees its own change at once; it is written when it is synchronized, or
+// when the process ends. Setting nothing removes the key.
 //
 // Keys, domains and users may come from foreign data. A missing key, an empty (or missing) domain
 // or user and an impossible name are refused with an error in the system log.
@@ -78,13 +78,13 @@ class LGSSystemConfiguration {
                                                                        std::string_view domain,
                                                                        std::uint32_t options) = 0;
 
-  /// With `sync` the next `synchronize` makes the domain durable; else it is when it is next
-  /// written or the process ends.
+  /// With `sync` the next `synchronize` writes the domain durably; without, the change waits for
+  /// the domain's next write or the end of the process.
   virtual void setPrefsKeyValueForDomainWithSync(std::optional<std::string_view> key,
                                                  std::optional<PropertyValue> value,
                                                  std::string_view domain, bool sync) = 0;
 
-  /// Writes each domain that was changed with `sync` once. The system log has what failed.
+  /// Writes each domain that was changed with `sync` once; failures go to the system log.
   virtual void synchronize() = 0;
 
   /// Log types that are disabled unless the user's preferences say otherwise, in order.

@@ -20,9 +20,9 @@ class TBHistoryDistributionEnumerator {
   /// False, and both untouched, after the last one.
   virtual bool getNextValueSecondsInDayOffset(double& value, std::int32_t* secondsInDay) = 0;
 
-  /// Fills `values`, which must not be empty, with the next ones, without their offsets. Gives
-  /// their number: less than asked for when they end or where they are stored apart, 0 after the
-  /// last one.
+  /// Fills `values`, which must not be empty, with the next ones, without their offsets, and
+  /// returns their number: 0 after the last one; fewer than asked for at the end, or where the next
+  /// one is stored elsewhere.
   virtual std::size_t getNextValues(std::span<double> values) {
     return getNextValueSecondsInDayOffset(values[0], nullptr) ? 1 : 0;
   }
@@ -30,8 +30,8 @@ class TBHistoryDistributionEnumerator {
 
 /// The rows of the counter database. Both queries deliver the rows from `minDay` to `maxDay`, both
 /// included, whose key begins with `keyPrefix`, by day and then by key (byte order). Setting `stop`
-/// ends the query. Of a damaged database they deliver what comes before the damage, which goes to
-/// the system log, and give false.
+/// ends the query. Of a damaged database they deliver what comes before the damage and return
+/// false; the system log has the damage.
 class TBHistory {
  public:
   using ScalarRowHandler =

@@ -15,16 +15,16 @@
 
 namespace vesprun {
 
-/// Computes the statistics of a few distributions at a time, side by side: each step of one waits
-/// for its division, meanwhile the others go on. Every distribution takes its values in order.
+/// Computes the statistics of a few distributions side by side: while one waits for a division, the
+/// others go on. Each takes its values in order.
 class DistributionBatch {
  public:
   /// The outputs must outlive the object.
   DistributionBatch(PropertyDict& distributions, PropertyDict& histograms)
       : _distributions(distributions), _histograms(histograms) {}
 
-  /// Takes all values. What becomes of them is stored here or in `finish`, in the order of the
-  /// calls. The intervals must stay until then.
+  /// Takes all values. The results are stored, in the order of the calls, by this or a later call
+  /// or by `finish`; until then the intervals must stay.
   void add(TBHistoryDistributionEnumerator& values, std::string_view key,
            const DistributionOptions& options);
 
@@ -46,7 +46,7 @@ class DistributionBatch {
     std::size_t pending = 0;  ///< values that have been read but not counted
   };
   static constexpr std::size_t kMostRows = 8;
-  /// Rows of so many values begin in different lines of the processor's cache.
+  /// Not a power of two, so that the rows begin in different sets of the processor's cache.
   static constexpr std::size_t kMostPending = 2040;
 
   static std::optional<HistogramCounters> allocateCounters(const PropertyArray& intervals,

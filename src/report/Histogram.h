@@ -20,14 +20,14 @@ class HistogramBoundaries {
  private:
   friend std::uint32_t determineHistBucketForValueWithIntervals(double, const HistogramBoundaries&);
 
-  std::vector<double> _highest;  ///< of the boundaries up to each; NaN before the first number
+  std::vector<double> _highest;  ///< running maximum of the boundaries; NaN before the first number
 };
 
 /// The index of the first boundary, in array order, that is not below `value`; n if there is none,
 /// as for NaN.
 inline std::uint32_t determineHistBucketForValueWithIntervals(
     double value, const HistogramBoundaries& intervals) {
-  // The first boundary that reaches a value is where the sorted running maximum first does.
+  // The running maximum is sorted, and first reaches a value where a boundary first does.
   // Branchless: values come in any order.
   std::size_t bucket = 0;
   for (std::size_t rest = intervals._highest.size(); rest > 0;) {

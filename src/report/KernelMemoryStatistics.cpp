@@ -30,13 +30,13 @@ std::uint64_t read64OrAllOnes(const char* name) {
 
 double gibibytes(std::uint64_t bytes) { return static_cast<double>(bytes) * 0x1p-30; }
 
-/// The number if it holds, else nothing.
-template <typename Holds>
-std::optional<std::uint64_t> onlyIf(std::optional<std::uint64_t> number, Holds holds) {
-  return number && holds(*number) ? number : std::nullopt;
+/// The number if it meets the condition, else nothing.
+template <typename Condition>
+std::optional<std::uint64_t> onlyIf(std::optional<std::uint64_t> number, Condition isMet) {
+  return number && isMet(*number) ? number : std::nullopt;
 }
 
-/// Conditions of rows: numbers, which the row's value may need.
+/// Conditions of rows. Each is a number that the row's value may need; without it there is no row.
 struct Gates {
   std::optional<std::uint64_t> always = 0;
   std::optional<std::uint64_t> corruptions =

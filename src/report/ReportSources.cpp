@@ -3,9 +3,9 @@
 #include <string>
 #include <vector>
 
+#include "common/ProcessState.h"
 #include "platform/Platform.h"
 #include "report/KernelMemoryStatistics.h"
-#include "report/SupportLibraryFunctions.h"
 
 namespace vesprun {
 namespace {
@@ -21,6 +21,32 @@ constexpr const char* kDatabasePath = "/var/mobile/Library/Tallybook/TBDataStore
 
 std::string firstOrUnknown(const std::vector<std::string>& languages) {
   return languages.empty() ? "<unknown>" : languages.front();
+}
+
+bool gBothResolved = false;
+const ProcessState kResolvedState([] { gBothResolved = false; });
+
+/// Finds the two preference functions in the crash-report support library. False, with an error
+/// line for each missing part, until both are there; then the library is not asked again.
+bool resolveSupportLibraryFunctions() {
+  if (gBothResolved) {
+    return true;
+  }
+  DeviceInformation& device = platform().deviceInformation();
+  if (!device.loadSupportLibrary()) {
+    logMessage(LogLevel::Error, "Failed to dynamically load the FaultlineSupport framework");
+    return false;
+  }
+  const bool reads = device.supportLibraryOffers("LGSPreferencesGetIntegerValue");
+  if (!reads) {
+    logMessage(LogLevel::Error, "Failed to dyanmically link LGSPreferencesGetIntegerValue");
+  }
+  const bool writes = device.supportLibraryOffers("LGSPreferencesSetValue");
+  if (!writes) {
+    logMessage(LogLevel::Error, "Failed to dynamically link LGSPreferencesSetValue");
+  }
+  gBothResolved = reads && writes;
+  return gBothResolved;
 }
 
 std::int64_t databaseMebibytes() {

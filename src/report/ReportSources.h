@@ -8,10 +8,10 @@
 
 namespace vesprun {
 
-// The daily log's own sources. Adding them to a report changes nothing on the device; what a
-// submitted report changes has functions of its own.
+// The daily log's own sources. Adding them to a report changes nothing on the device; functions of
+// their own do what only a submitted report does.
 
-/// The keys of the scalars, on every device and in the order in which they are added.
+/// The keys of all their scalars, in the order in which they are added.
 std::vector<std::string_view> ownScalarKeys();
 
 struct InstalledAppCounts {
@@ -31,10 +31,10 @@ void addMetadataKeys(PropertyDict& metadata);
 
 /// "com.quill.logsmith.tlyd.database.size": MiB of the counter database, −1 if unknown.
 /// "com.quill.logsmith.tlyd.database.corruptions": since the last report; 0 if the functions to
-/// read and reset it cannot be resolved. True when it was read.
+/// read and reset the count cannot be resolved. True when it was read.
 bool reportDatabaseSize(TBReport& report);
 
-/// Lets the count of corruptions, which has been reported, start from 0.
+/// Sets the count of corruptions, which has been reported, to 0.
 void restartCorruptionCount();
 
 /// "com.quill.usage.cur_boot_session_cpu_uptime": minutes awake since boot, −1 without a tick

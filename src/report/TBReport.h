@@ -21,7 +21,7 @@ std::int32_t firstDayOfReport(std::int32_t day);
 /// the document. Used once. Without a whitelist it stays empty.
 ///
 /// A later value for a key replaces the earlier one. Nothing fails: what a service does not answer
-/// is left out or has the failure value stated below.
+/// is left out or has a failure value (`ReportSources.h`).
 class TBReport {
  public:
   using ScalarProducer = std::function<std::int64_t()>;
@@ -40,7 +40,7 @@ class TBReport {
   /// document of `day`, moving the outputs into it.
   void serializeWithDateAndAppInfo(std::int32_t day, const AppInfoList* appInfo);
 
-  // The steps of these two, to look at a report that is not submitted.
+  // The steps of these two, for a report that is not submitted.
 
   /// Collects the rows of `day` and the day before it. False when the history could not be read to
   /// its end; what came before is collected.
@@ -65,8 +65,8 @@ class TBReport {
   void addScalarForKeyByExecutingBlock(std::string_view key, const ScalarProducer& producer);
 
   /// Stores the statistics of the values and, if the options have "intervals", their histogram; an
-  /// empty histogram removes the key's earlier one. Needs a counter and a boundary for each bucket;
-  /// without memory for them a log line says so and only the statistics are stored.
+  /// empty histogram removes the key's earlier one. Without memory for the histogram a log line
+  /// says so, and only the statistics are stored.
   void computeAndAddDistributionForKeyWithOptions(TBHistoryDistributionEnumerator& values,
                                                   std::string_view key,
                                                   const DistributionOptions& options);

@@ -22,10 +22,6 @@ constexpr std::string_view kBaselineDomain = "com.quill.logsmith.vesprun";
 constexpr std::array<std::string_view, 4> kUsageCounters = {"wifiInBytes", "wifiOutBytes",
                                                             "wwanInBytes", "wwanOutBytes"};
 
-std::int64_t numberOrZero(const Number* number) {
-  return number != nullptr ? number->asInt64() : 0;
-}
-
 /// A process's name in counter keys.
 struct UsageName {
   std::string prefix;
@@ -41,24 +37,6 @@ std::optional<UsageName> nameOf(const PropertyDict& record) {
   }
   return std::nullopt;
 }
-
-/// A process in the baseline: the date since which its counters count, and the counters.
-class BaselineEntry {
- public:
-  explicit BaselineEntry(const PropertyArray* stored) : _values(stored) {}
-
-  bool isSince(const Date& date) const {
-    return _values != nullptr && !_values->empty() && _values->front().date() != nullptr &&
-           *_values->front().date() == date;
-  }
-
-  std::int64_t counter(std::size_t index) const {
-    return index + 1 < _values->size() ? numberOrZero((*_values)[index + 1].number()) : 0;
-  }
-
- private:
-  const PropertyArray* _values;
-};
 
 /// Taken before the feed is asked: a late reply may find another platform, or none.
 struct Services {
@@ -76,10 +54,10 @@ struct Services {
 };
 
 // Counters and baseline lie in two files, and a process can be killed, or a write can fail, in
-// between. So the baseline is written first, with a mark: the baseline before it, and a fingerprint
-// of the data-usage counters before the growth. Counters reach the database all or none: as long as
-// the fingerprint holds, the growth is not counted and the earlier baseline applies. The mark goes
-// when the counters are durable.
+// between. So the baseline is written first, with a mark: the earlier baseline, and a fingerprint
+// of the data-usage counters before the growth is added. Counters reach the database all or none:
+// while the fingerprint is unchanged, the growth is not counted and the earlier baseline applies.
+// The mark is removed when the counters are durable.
 
 /// The data-usage counters from a day on as one number; nothing when they cannot be read.
 std::optional<std::uint64_t> fingerprintSince(Tallybook& tallybook, std::int32_t day) {
@@ -196,18 +174,22 @@ class UsageReply {
     if (!name || since == nullptr) {
       return;
     }
-    const BaselineEntry before(_baseline.findArray(name->name));
-    const bool goesOn = before.isSince(*since);
+    // The date since which the counters count, and the counters.
+    const PropertyArray* before = _baseline.findArray(name->name);
+    const bool goesOn =
+        before != nullptr && !before->empty() && before->front() == PropertyValue(*since);
     const bool isRecent = daysSince1970(*since) >= _yesterday;
     const std::size_t additionsBefore = _additions.size();
     PropertyArray after{*since};
-    for (std::size_t i = 0; i < kUsageCounters.size(); ++i) {
-      const std::int64_t value = numberOrZero(record.findNumber(kUsageCounters[i]));
+    for (const std::string_view counter : kUsageCounters) {
+      const std::size_t place = after.size();
+      const std::int64_t value = record.integerOr(counter, 0);
       after.emplace_back(value);
       if (goesOn) {
-        addGrowth(kUsageCounters[i], *name, value, before.counter(i));
+        const Number* earlier = place < before->size() ? (*before)[place].number() : nullptr;
+        addGrowth(counter, *name, value, earlier != nullptr ? earlier->asInt64() : 0);
       } else if (isRecent) {
-        AddDataUsageKB(kUsageCounters[i], name->prefix, name->name, value);
+        AddDataUsageKB(counter, name->prefix, name->name, value);
       }
     }
     if (!goesOn && !isRecent) {
@@ -264,7 +246,7 @@ void CollectDataUsage(std::chrono::nanoseconds replyTimeout) {
   const auto fingerprint =
       settleEarlierRun(services) ? fingerprintSince(services.tallybook, today) : std::nullopt;
   if (!fingerprint) {
-    return;  // unknown counters: the next run counts the growth
+    return;  // the counters cannot be read: the next run counts the growth
   }
   const auto feed = platform().murmur().createUsageFeed(UsageWorkspace{kUsageServiceEndpoint});
   const auto handled = std::make_shared<std::binary_semaphore>(0);

@@ -2,11 +2,7 @@
 
 #include <bit>
 
-#include <cstdint>
-#include <optional>
-
 #include "platform/Platform.h"
-#include "telemetry/DiskUsage.h"
 
 namespace vesprun {
 namespace {
@@ -75,6 +71,13 @@ std::uint32_t GetUserCapacityInGB(std::uint64_t userCapacityMB) {
 PropertyDict GetDiskInfo() {
   PropertyDict measured = measureFileSystem();
   return isPlausible(measured) ? measured : askForDiskUsage();
+}
+
+std::optional<std::int64_t> diskUsageInMebibytes(const std::optional<PropertyValue>& answer,
+                                                 std::string_view name) {
+  const PropertyDict* usage = answer ? answer->dict() : nullptr;
+  const Number* bytes = usage != nullptr ? usage->findNumber(name) : nullptr;
+  return bytes != nullptr ? std::optional(bytes->asInt64() >> 20) : std::nullopt;
 }
 
 }  // namespace vesprun

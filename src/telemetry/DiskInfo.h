@@ -1,6 +1,8 @@
 #pragma once
 
 #include <cstdint>
+#include <optional>
+#include <string_view>
 
 #include "common/PropertyDict.h"
 
@@ -21,5 +23,10 @@ PropertyDict GetDiskInfo();
 /// The nominal capacity in GB of a user area of so many MB (low 32 bits): 1536 from 1,376,256 to
 /// 1,770,495 MB, else the next power of two MB above, in units of 1024 MB, up to 4,194,304 GB.
 std::uint32_t GetUserCapacityInGB(std::uint64_t userCapacityMB);
+
+/// A byte count of an answer to "DiskUsage" (`OrreryCopyAnswer`) in MiB, rounded down; nothing
+/// without a dictionary or a number of that name.
+std::optional<std::int64_t> diskUsageInMebibytes(const std::optional<PropertyValue>& answer,
+                                                 std::string_view name);
 
 }  // namespace vesprun

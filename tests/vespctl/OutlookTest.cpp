@@ -99,7 +99,7 @@ TEST_F(OutlookTest, PreviewsWhatTheRunSubmitsRightAfter) {
 }
 
 TEST_F(OutlookTest, PreviewsNullWhereNothingWouldBeSubmitted) {
-  import("scalar\t19786\ts\t1\n");
+  import("scalar\t19785\ts\t1\nscalar\t19786\ts\t1\n");
   const struct {
     const char* entries;
     const char* whitelist;
@@ -221,11 +221,11 @@ TEST_F(OutlookTest, ExplainsByWhatAKeyLeavesOrStays) {
 
 TEST_F(OutlookTest, FindsEachFaultOfAWhitelist) {
   writePtree("w", R"({"None": [],
-      "A": {"Scalars": {}, "DistributionKeys": true,
+      "A": {"Scalars": {},
         "ScalarKeys": {"held": true, "odd": {"bucket_interval": {"real": "nan"}, "sig_fig": 1.5},
           "zero": {"bucket_interval": 0, "sig_fig": 0.0}, "far": {"bucket_interval": -1, "sig_fig": true},
           "unread": {"intervals": []}, "p.same": {"sig_fig": 2.0}, "p.other": {}, "again": {}, "tested": {}},
-        "ScalarKeyPrefixes": {"p.": {"sig_fig": 2}, "p.x": {}, "t.x": {}}},
+        "ScalarKeyPrefixes": {"p.": {"sig_fig": 2}, "p.x": {}, "t.x": {}}, "DistributionKeys": true},
       "InternalTesting": {"ScalarKeys": {"tested": {}, "p.in": {"sig_fig": 2}}, "ScalarKeyPrefixes": {"t.": {}}},
       "B": {"ScalarKeys": {"again": {"sig_fig": 2}, "t.k": {}},
         "DistributionKeys": {"e": {"sig_fig": 1}},
@@ -235,22 +235,20 @@ TEST_F(OutlookTest, FindsEachFaultOfAWhitelist) {
       <key>k</key><dict/></dict></dict></dict></ptree>)");
   const std::pair<const char*, const char*> cases[] = {
       {"w",
-       "None/null/null/wrong kind\nA/Scalars/null/unknown list\nA/DistributionKeys/null/wrong "
-       "kind\n"
+       "None/null/null/wrong kind\nA/Scalars/null/unknown list\n"
        "A/ScalarKeys/held/unreadable options\nA/ScalarKeys/odd/doubtful number\n"
        "A/ScalarKeys/odd/doubtful number\nA/ScalarKeys/zero/interval is 0\n"
        "A/ScalarKeys/zero/digit count is 0\nA/ScalarKeys/far/unreadable options\n"
        "A/ScalarKeys/far/doubtful number\nA/ScalarKeys/unread/unread option\n"
        "A/ScalarKeys/p.same/same as its prefix\nA/ScalarKeys/again/replaced by a later group\n"
-       "A/ScalarKeyPrefixes/p.x/prefix never reached\n"
+       "A/ScalarKeyPrefixes/p.x/prefix never reached\nA/DistributionKeys/null/wrong kind\n"
        "InternalTesting/ScalarKeys/p.in/same as its prefix\n"
        "B/DistributionKeys/e/unread option\n"
        "B/DistributionKeyPrefixes//intervals do not rise\n"
        "B/DistributionKeyPrefixes//empty prefix\n"},
       {"twice",
-       "G/null/null/stands twice\nG/ScalarKeys/null/stands twice\nG/ScalarKeys/k/unreadable "
-       "options\n"
-       "G/ScalarKeys/k/stands twice\n"}};
+       "G/null/null/stands twice\nG/ScalarKeys/null/stands twice\n"
+       "G/ScalarKeys/k/unreadable options\nG/ScalarKeys/k/stands twice\n"}};
   for (const auto& [file, expected] : cases) {
     EXPECT_EQ(run("whitelist check " + std::string(file)), 1);
     const auto count = std::count(expected, expected + std::strlen(expected), '\n');

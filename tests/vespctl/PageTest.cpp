@@ -1,6 +1,5 @@
 #include <sys/stat.h>
 
-#include <algorithm>
 #include <array>
 #include <regex>
 #include <set>
@@ -52,6 +51,7 @@ TEST_F(PageTest, ShowsTheCourseOfEachKeyOverTheDays) {
         "s.a</bdi></summary><p class=values>1970-01-02 10\n1970-01-03 30\n1970-01-05 20000\n</p>",
         // Broken where a day is missing.
         "3 values from 10 to 20\u202F000, the newest 20\u202F000\"><path class=m d=\"M5 84L102",
+        "class=m d=\"M5 84L102 84M295 15h0\"/><path class=e d=\"M295 15h0\"/></svg>",
         "<td>7 <small>1970-01-03</small><td>", ", logarithmic</figcaption>"}) {
     EXPECT_THAT(output, HasSubstr(shown));
   }

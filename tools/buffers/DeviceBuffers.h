@@ -55,8 +55,7 @@ class MSPBufferBuilder {
   Bytes _bytes;
 };
 
-/// A full record of every known statistic in table order. Elements that `valuesOf` leaves out are
-/// 0.
+/// A full record of every known statistic in table order. Elements missing in `valuesOf` are 0.
 Bytes everyStatistic(const std::function<std::vector<std::uint64_t>(const ORUStatKey&)>& valuesOf);
 Bytes everyMSPStatistic(
     const std::function<std::vector<std::uint64_t>(const ORUMSPKey&)>& valuesOf);
@@ -68,9 +67,9 @@ class SnapshotBuilder {
   SnapshotBuilder& begin(std::uint64_t id) { return item(19, Bytes(4), id); }
   SnapshotBuilder& end(std::uint64_t id) { return item(20, {}, id); }
   SnapshotBuilder& bufferEnd() { return item(0xF19158ED, {}); }
-  /// `size` of the item, padded with zeros; 0: the text's.
+  /// An item of `size` bytes, padded with zeros; 0: as long as the text.
   SnapshotBuilder& name(std::string_view text, std::size_t size = 0);
-  /// Requests and bytes, each read and written.
+  /// The fourth counter is the number of bytes written.
   SnapshotBuilder& ioStatistics(const std::array<std::uint64_t, 4>& counters);
   SnapshotBuilder& written(std::uint64_t count) { return ioStatistics({0, 0, 0, count}); }
   SnapshotBuilder& thread(std::uint64_t id, std::string_view text, std::uint64_t count) {

@@ -5,12 +5,12 @@
 
 #include <algorithm>
 #include <cerrno>
-#include <chrono>
 #include <fstream>
 #include <nlohmann/json.hpp>
 #include <sstream>
 #include <stdexcept>
 
+#include "common/Calendar.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeReader.h"
 
@@ -47,14 +47,6 @@ constexpr const char* kTasking = R"(<?xml version="1.0" encoding="UTF-8"?>
 <dict><key>User</key><string>root</string><key>Domain</key><string>c</string>
 <key>Key</key><string>k</string><key>Value</key><true/></dict>
 </array></dict></dict></ptree>)";
-
-std::string clockOf(int day) {
-  const std::chrono::year_month_day date{std::chrono::sys_days(std::chrono::days(day))};
-  char text[32];
-  std::snprintf(text, sizeof text, "%04d-%02u-%02uT09:15:02Z", static_cast<int>(date.year()),
-                static_cast<unsigned>(date.month()), static_cast<unsigned>(date.day()));
-  return text;
-}
 
 // The sample's days end today; the same rows, in the days before the first run.
 std::string movedRows(const std::string& dump) {
@@ -161,7 +153,10 @@ void Device::describe(const std::string& change) {
   writeFile(_path + "/device.json", description.dump());
 }
 
-void Device::setDay(int day) { describe(R"({"clock": ")" + clockOf(day) + R"("})"); }
+void Device::setDay(int day) {
+  constexpr std::int64_t kTimeOfDay = 9 * 3600 + 15 * 60 + 2;
+  describe(R"({"clock": ")" + dateText({startOfDay(day).seconds + kTimeOfDay, 0}) + R"("})");
+}
 
 std::vector<std::string> Device::controlCommand(std::vector<std::string> words) const {
   words.insert(words.begin() + 1, _path);

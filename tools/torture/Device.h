@@ -52,8 +52,8 @@ class Device {
   int runDaily() const;
   std::vector<std::string> dailyCommand() const { return {_programs->vesprun, "-d"}; }
 
-  /// Reads everything and judges what can be judged without knowing what happened: half documents
-  /// and lines, keys that no list names, files that nobody would miss.
+  /// Reads everything, and finds the faults that need no knowledge of what happened: half documents
+  /// and lines, keys that no list names, counters that cannot be read.
   Sight look() const;
 
  private:

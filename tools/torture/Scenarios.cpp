@@ -95,14 +95,10 @@ std::map<std::string, long long> usageOf(const Sight& sight) {
   std::map<std::string, long long> sums;
   for (const std::string& row : sight.counters) {
     std::istringstream fields(row);
-    std::string kind;
-    std::string day;
-    std::string key;
-    std::string value;
-    std::getline(fields, kind, '\t');
-    std::getline(fields, day, '\t');
-    std::getline(fields, key, '\t');
-    std::getline(fields, value, '\t');
+    std::string kind, day, key, value;
+    for (std::string* field : {&kind, &day, &key, &value}) {
+      std::getline(fields, *field, '\t');
+    }
     if (key.starts_with("datausage.")) {
       sums[key] += std::stoll(value);
     }
@@ -271,8 +267,8 @@ std::size_t firstOwnCall(const std::vector<Call>& calls) {
 
 using RunWithFault = std::function<Faults(const fs::path& work, const Fault& fault, bool started)>;
 
-/// Each call fails in one way or, when wanted, in all, transfers half where `alsoShort` asks for
-/// it, and is the last one.
+/// Each call fails in one way (`full`: in every way), with `alsoShort` transfers half, and is the
+/// last one.
 std::vector<Case> faultsOfCalls(const std::string& name, const std::vector<Call>& calls,
                                 std::uint32_t seed, bool full, bool alsoShort,
                                 const RunWithFault& run) {

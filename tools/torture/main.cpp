@@ -60,7 +60,7 @@ void runCases(const std::vector<Case>& cases, const Options& options, unsigned w
   }
 }
 
-/// A case whose name ends in the number of a call, or else in 0, and what stands before the number.
+/// The number of a call with which a case's name ends, else 0, and what comes before it.
 std::pair<std::string, long> placeOf(const std::string& name) {
   const std::size_t end = name.rfind(':') + 1;
   return {name.substr(0, end), std::strtol(name.c_str() + end, nullptr, 10)};

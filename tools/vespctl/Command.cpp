@@ -60,8 +60,8 @@ std::string contentIfThere(const std::string& file) {
   });
 }
 
-void forEachLine(const std::string& file, const std::function<void(PropertyDict* line)>& take) {
-  std::istringstream lines(contentIfThere(file));
+void forEachLine(const std::string& text, const std::function<void(PropertyDict* line)>& take) {
+  std::istringstream lines(text);
   for (std::string line; std::getline(lines, line);) {
     std::string ignored;
     std::optional<PropertyValue> value = valueFromJsonText(line, ignored);

@@ -18,8 +18,7 @@ class CommandFailure : public std::runtime_error {
   using std::runtime_error::runtime_error;
 };
 
-/// What `attempt` gives. It takes a text for its error, with which `CommandFailure` is thrown when
-/// it gives nothing.
+/// The result of `attempt(error)`. When it is empty, throws `CommandFailure` with the error.
 template <typename Attempt>
 auto orFail(const Attempt& attempt) {
   std::string error;
@@ -40,7 +39,7 @@ std::unique_ptr<HostPlatform> openDeviceReadOnly(const std::string& directory, S
 DeviceDirectory openDirectory(const std::string& directory);
 
 /// Waits until no run is at the daily work, and keeps others from it as long as the result lives.
-/// Throws `CommandFailure` when one takes minutes.
+/// Throws `CommandFailure` when that takes more than minutes.
 FileDescriptor takeDailyWork(const DeviceDirectory& directory);
 
 /// The content of a file or pipe; "-" is standard input.
@@ -49,8 +48,8 @@ std::string readInput(const std::string& file);
 /// The content of a regular file; empty when there is none.
 std::string contentIfThere(const std::string& file);
 
-/// Hands on each line of a file that may be missing, null for one that is not a JSON object.
-void forEachLine(const std::string& file, const std::function<void(PropertyDict* line)>& take);
+/// Calls `take` with each line of a text, null for one that is not a JSON object.
+void forEachLine(const std::string& text, const std::function<void(PropertyDict* line)>& take);
 
 /// A file's name in messages: "-" is "standard input".
 std::string inputName(const std::string& file);
@@ -62,8 +61,8 @@ void printJson(const PropertyValue& value);
 CLI::App* addDeviceCommand(CLI::App& above, const std::string& name, const std::string& description,
                            std::string& directory);
 
-/// Allows one of `subject`'s commands, and names them all to refuse any other word, or none when
-/// one is `needed`.
+/// Allows one of `subject`'s commands. Refuses any other word, and a missing command that is
+/// `needed`, with the names of all.
 void allowOneCommand(CLI::App& subject, bool needed = true);
 
 // Each in the file of its subject.

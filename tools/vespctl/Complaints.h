@@ -8,8 +8,8 @@
 
 namespace vesprun {
 
-/// Collects errors that a service logs, or messages down to another level, for the command to
-/// report. A message repeated at once counts once.
+/// Collects what services log, down to a level, for the command to report. A message that is
+/// repeated at once counts once.
 class Complaints final : public SystemLog {
  public:
   /// `also`, unless null, gets all that is logged.
@@ -21,9 +21,9 @@ class Complaints final : public SystemLog {
 
   /// Throws the first error as `CommandFailure`.
   void failIfAny() const;
-  /// Throws all errors and, unless the last one begins with it, `error`.
+  /// Throws all errors followed by `error`, unless the last one begins with it.
   [[noreturn]] void fail(const std::string& error) const;
-  /// Prints them, when the command succeeded nevertheless.
+  /// Prints them, for a command that succeeded nevertheless.
   void print() const;
 
  private:

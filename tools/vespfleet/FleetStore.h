@@ -35,9 +35,8 @@ struct ReportedKey {
 };
 
 /// What many devices reported. For each device and day one line holds: that of the highest
-/// revision; of one revision the one created later; then the one whose text is greater byte by
-/// byte. What the others said is never seen. Neither the order in which lines arrive nor how often
-/// one does makes a difference.
+/// revision; of equal revisions the one created later; then the one whose text is greater byte by
+/// byte. The others are never seen. Order and repetition of lines make no difference.
 ///
 /// Every operation throws `StoreFailure`.
 class FleetStore {

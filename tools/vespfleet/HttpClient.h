@@ -15,7 +15,7 @@ class HttpClient {
   /// for one that holds a user or password.
   explicit HttpClient(const std::string& address);
 
-  /// Runs `query`, with `data` behind it when it inserts, and returns what the server answers.
+  /// Runs `query`, which inserts `data` if there is any, and returns what the server answers.
   /// Throws `StoreFailure` with the server's reason.
   std::string post(const std::string& query, std::string_view data = {});
 

@@ -43,8 +43,7 @@ inline constexpr int kPercents[] = {5, 25, 50, 75, 95};
 Summary summaryOf(std::vector<std::int64_t> values);
 
 /// The labels of a histogram by their boundaries, from low to high; labels of another form last.
-/// `overlap` becomes true when two buckets hold a part of the line of numbers both, so that
-/// devices counted between different boundaries.
+/// `overlap` becomes true when two buckets overlap: devices counted between different boundaries.
 std::vector<std::string> labelsInOrder(const Histogram& histogram, bool& overlap);
 
 }  // namespace vesprun

@@ -9,8 +9,8 @@
 
 namespace vesprun {
 
-/// Appends an integer in groups of seven bits, the low ones first, the highest bit of a byte saying
-/// that more follow.
+/// Appends an integer in groups of seven bits, low ones first. The highest bit of a byte is set
+/// when more follow.
 inline void appendVarint(std::string& bytes, std::uint64_t value) {
   while (value >= 0x80) {
     bytes.push_back(static_cast<char>(value | 0x80));

@@ -7,9 +7,9 @@ namespace vesprun {
 
 // Figures on the storage's health, from the current FTL fields. Keys begin with
 // "com.quill.NANDInfo.Health."; values are signed. "MaxPercentageNANDUsed", "MaxE2EErrors" (32
-// bits) and "HostReadErrors" (64) are at least 0; "NumGrownBadBlocks", "SpareAvailablePercent" and
-// "NumDieFailures" (64) are -1 when unknown. Without FTL fields there are none, and the error is
-// recorded.
+// bits) and "HostReadErrors" (64) are never negative; "NumGrownBadBlocks", "SpareAvailablePercent"
+// and "NumDieFailures" (64) are -1 when unknown. Without FTL fields there are no figures, and the
+// error is recorded.
 
 /// For service plans: all but the spare blocks, with "HLT_APIErrorMessage".
 VESPRUN_EXPORT PropertyDict CopyTendmarkNANDInfo() noexcept;

@@ -7,7 +7,7 @@ namespace vesprun {
 
 struct nand_exporter_t;
 
-/// A connection to the storage controller, the caller's from `openORUConnection` to
+/// A connection to the storage controller, which the caller owns from `openORUConnection` to
 /// `closeORUConnection`.
 struct ORUConnection {
   RegistryHandle service = 0;
@@ -15,12 +15,12 @@ struct ORUConnection {
   nand_exporter_t* exporter = nullptr;  ///< the library's own entry for the controller's class
 };
 
-/// Opens the storage controller. The handle also stays in the exporter, even after closing. False,
-/// with lines on standard error and nothing left open, when there is no controller, it refuses, or
-/// it has no base statistics.
+/// Opens the storage controller. The exporter keeps the handle, even after closing. False, with
+/// lines on standard error and nothing left open, when there is no controller, it refuses, or it
+/// has no base statistics.
 VESPRUN_EXPORT bool openORUConnection(ORUConnection& connection) noexcept;
 
-/// Closes the connection and releases the service, if any, and forgets them.
+/// Closes the connection and releases the service, if there are any, and sets both to 0.
 VESPRUN_EXPORT void closeORUConnection(ORUConnection& connection) noexcept;
 
 }  // namespace vesprun

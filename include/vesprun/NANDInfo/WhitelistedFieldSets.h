@@ -13,14 +13,14 @@ namespace vesprun {
 VESPRUN_EXPORT std::optional<PropertyDict> CopyNANDFTLInfo(bool useStatKeyParser,
                                                            std::uint32_t enabled) noexcept;
 
-// Storage statistics that may leave the device: the fields of each set's table, as far as they can
-// be had, with `round` cut to the table's digits, and "HLT_APIErrorMessage", the first error text
-// of the process.
+// Storage statistics that may leave the device: the fields of each set's table that are known, with
+// `round` rounded to the table's digits, and "HLT_APIErrorMessage", the first error text of the
+// process.
 
 /// The current FTL fields and those derived from them; only the error text without the former.
 VESPRUN_EXPORT PropertyDict CopyWhitelistedNANDFTLInfo(bool round) noexcept;
 
-/// Nothing. Other programs look the name up.
+/// Always nothing; other programs look the name up.
 VESPRUN_EXPORT std::optional<PropertyDict> CopyWhitelistedNANDFTLCountersInfo() noexcept;
 
 /// The set of each MSP by index ("0", "1", ...), and the error text beside them. Each also has,

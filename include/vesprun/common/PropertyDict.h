@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cstddef>
+#include <cstdint>
 #include <functional>
 #include <initializer_list>
 #include <memory>
@@ -67,6 +68,11 @@ class PropertyDict {
     return find(key, &PropertyValue::string);
   }
   const Number* findNumber(std::string_view key) const { return find(key, &PropertyValue::number); }
+  /// A number as a 64-bit integer, `otherwise` when there is none.
+  std::int64_t integerOr(std::string_view key, std::int64_t otherwise) const {
+    const Number* number = findNumber(key);
+    return number != nullptr ? number->asInt64() : otherwise;
+  }
   const Bytes* findData(std::string_view key) const { return find(key, &PropertyValue::data); }
   const Date* findDate(std::string_view key) const { return find(key, &PropertyValue::date); }
 
@@ -156,7 +162,7 @@ class PropertyDict {
                         [key](const auto& entry) { return entry.first == key; });
   }
 
-  /// Keys that are set again mostly come in the order of the first time, which saves a search.
+  /// Keys that are set again mostly come in their first order: this saves a search.
   PropertyValue* findExpected(std::string_view key) {
     if (!_many || _expected >= _many->size()) {
       return nullptr;
@@ -181,7 +187,7 @@ class PropertyDict {
 
   Entries _few;
   std::unique_ptr<Map> _many;  // once there have been more than a few
-  std::size_t _expected = 0;   // of many, the place after the last one that was set
+  std::size_t _expected = 0;   // in `_many`, the place after the last one that was set
 };
 
 // What a value can only do where a dictionary is complete.
@@ -232,23 +238,15 @@ inline bool operator==(const PropertyValue& left, const PropertyValue& right) {
   if (left._type != right._type) {
     return false;
   }
-  switch (left._type) {
-    case PropertyValue::Type::Number:
-      return left._number == right._number;
-    case PropertyValue::Type::Boolean:
-      return left._boolean == right._boolean;
-    case PropertyValue::Type::Dict:
-      return *left.dict() == *right.dict();
-    case PropertyValue::Type::Array:
-      return *left.array() == *right.array();
-    case PropertyValue::Type::String:
-      return *left.string() == *right.string();
-    case PropertyValue::Type::Data:
-      return *left.data() == *right.data();
-    case PropertyValue::Type::Date:
-      return *left.date() == *right.date();
+  if (left._type == PropertyValue::Type::Number) {
+    return left._number == right._number;
   }
-  return false;
+  bool areEqual = left._boolean == right._boolean;
+  left.visitBox([&](const auto* box) {
+    using Content = std::decay_t<decltype(*box)>;
+    areEqual = *left.content<Content>(left._type) == *right.content<Content>(right._type);
+  });
+  return areEqual;
 }
 
 inline bool operator==(const PropertyDict& left, const PropertyDict& right) {

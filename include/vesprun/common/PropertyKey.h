@@ -29,12 +29,12 @@ constexpr std::uint32_t hashOfText(std::string_view text) {
     hash ^= hash >> 32;
     text.remove_prefix(length);
   }
-  // The high bits: what the last bytes change has not come down to the lowest ones.
+  // The high bits: the last bytes have not changed the lowest ones yet.
   return static_cast<std::uint32_t>(hash * kFactor >> 32);
 }
 
-/// A key of a `PropertyDict`: a copy of a text, or a text that lives as long as the program, which
-/// costs no memory however often it is copied. It ends with a zero byte.
+/// A key of a `PropertyDict`, with a zero byte behind it: a copy of a text, or a text that lives as
+/// long as the program, so that copies of the key cost no memory.
 class PropertyKey : public std::string_view {
  public:
   PropertyKey() : PropertyKey({}, hashOfText({}), false) {}

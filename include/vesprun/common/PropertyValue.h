@@ -20,8 +20,8 @@ using PropertyArray = std::vector<PropertyValue>;
 using Bytes = std::vector<std::uint8_t>;
 
 /// A dynamically typed value: dictionary, array, string, number, boolean, data or date. It owns its
-/// content; copies are deep, moves cheap. It takes 16 bytes, and no others for an empty dictionary,
-/// array, string or data.
+/// content; copies are deep, moves cheap. It takes 16 bytes; an empty dictionary, array, string or
+/// data takes no others.
 ///
 /// The readers `dict()` to `date()` return null for another type. Their pointer is valid until the
 /// value is changed, moved or destroyed.
@@ -44,7 +44,7 @@ class PropertyValue {
   PropertyValue(const PropertyValue& other);
   PropertyValue(PropertyValue&& other) noexcept
       : _number(other._number), _type(other._type), _boolean(other._boolean) {
-    other._type = Type::Boolean;  // of which no box is deleted
+    other._type = Type::Boolean;  // has no box
   }
   PropertyValue& operator=(const PropertyValue& other) {
     PropertyValue(other).swap(*this);
@@ -76,7 +76,7 @@ class PropertyValue {
  private:
   enum class Type : std::uint8_t { Number, Boolean, Dict, Array, String, Data, Date };
 
-  // Other types lie in a box on the heap, whose address is kept as the number; 0 when it is empty.
+  // Other types lie in a box on the heap. The number is its address, or 0 for empty content.
   template <typename T>
   PropertyValue(Type type, T content) : _number(0U), _type(type) {
     if (content != T()) {

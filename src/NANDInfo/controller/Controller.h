@@ -5,20 +5,19 @@
 
 namespace vesprun {
 
-/// The storage controller as `findNandExporter` finds it and one user client of it, both returned
-/// at the end. Failures are lines on standard error.
+/// The storage controller that `findNandExporter` finds, and one user client of it; both are
+/// released at the end. Failures are lines on standard error.
 class Controller {
  public:
   Controller() : _service(findNandExporter(_exporter)) {}
   ~Controller() { close(); }
 
-  /// False when it refuses, or, with a line that begins with `complainer`, when there is no
-  /// controller.
+  /// False when the controller refuses, or when there is none; that line begins with `complainer`.
   bool open(const char* complainer = "");
-  /// False when closing fails; nothing to close is fine.
+  /// False when closing fails; true also without a connection.
   bool close();
 
-  /// Its table entry; the ending one without a controller.
+  /// Its entry in `nand_exporters_tunnel`; the ending one without a controller.
   nand_exporter_t& exporter() const { return *_exporter; }
   RegistryHandle service() const { return _service.get(); }
   RegistryHandle connection() const { return _connection; }

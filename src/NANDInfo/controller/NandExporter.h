@@ -80,7 +80,7 @@ RegistryHandle findNandExporter(nand_exporter_t*& exporter);
 /// without handles.
 bool findNandExporterNew(nand_exporter_t*& exporter);
 
-/// Closes the connection and releases the service, if any, and forgets them.
+/// Closes the connection and releases the service, if there are any, and sets both to 0.
 void ReleaseIOInterfaces(nand_exporter_t& exporter);
 
 /// The same for other handles.

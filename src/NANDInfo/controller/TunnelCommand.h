@@ -48,10 +48,10 @@ class TunnelBuffer {
   std::size_t _size = 0;
 };
 
-/// Asks the controller for the answer's size, then for the answer. `request` brings the argument
-/// and `length` its input length. True: `buffer` is a new block of that size, and `length` the
-/// driver's, cut to it. False, with the error recorded: `buffer` is empty and `length` 0 if the
-/// size could not be had, else both stay.
+/// Asks the controller for the answer's size, then for the answer. The argument comes in `request`,
+/// the input length in `length`. True: `buffer` is a new block of that size, and `length` what the
+/// driver reports, at most that size. False, with the error recorded: if the size could not be had,
+/// `buffer` is empty and `length` 0, else both are unchanged.
 bool executeTunnelCommand(RegistryHandle connection, const nand_exporter_t& exporter,
                           const TunnelSelector* selector, TunnelRequest& request,
                           TunnelBuffer& buffer, std::uint64_t& length);

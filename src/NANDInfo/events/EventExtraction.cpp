@@ -12,7 +12,7 @@
 namespace vesprun {
 namespace {
 
-/// The last step has only a name.
+/// The last step has nothing but its name.
 constexpr std::array kEH_Extraction_Step_Names{
     "FTL big view",       "MSP stats",           "storage stats",        "NVRAM stat",
     "FTL statsMag daily", "FTL statsMag weekly", "FTL statsMag monthly", "FTL counters"};

@@ -6,9 +6,9 @@
 
 namespace vesprun {
 
-// Steps of the event extraction. They send unrounded statistics and return what was sent: the
-// payloads that the event service took in one dictionary, or only "com.quill.NANDInfo.ErrorMessage"
-// when there was nothing to send.
+// Steps of the event extraction. They send unrounded statistics and return one dictionary of the
+// payloads that the event service took, or only "com.quill.NANDInfo.ErrorMessage" when there was
+// nothing to send.
 
 /// One event of FTL counters, two of FTL histograms.
 PropertyDict createAndLogFTLStatFieldsToEventHubForEvent();
@@ -20,8 +20,8 @@ PropertyDict createAndLogMSPFieldsToEventHubForEvent();
 
 PropertyDict createAndLogStorageStatsToEventHubForEvent();
 
-/// The stats magazine's view of a day (0, with `CopySMagNANDFTLCustomHistoryInfo`), a week (1) or a
-/// month (2).
+/// The stats magazine's view of a day (0, also with `CopySMagNANDFTLCustomHistoryInfo`), a week (1)
+/// or a month (2).
 PropertyDict createAndLogSMagFTLFieldsToEventHubForEvent(std::uint32_t view);
 
 }  // namespace vesprun

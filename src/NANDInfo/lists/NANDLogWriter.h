@@ -18,7 +18,7 @@ bool WriteValidityListNANDLog(std::span<const std::uint8_t> buffer, const Proper
 /// Submits a text log "StorageStatus": the diagnostic header and one line of `fields`, in order,
 /// with only numbers and arrays that hold a number. Its date is kept in the user defaults, even
 /// when the submission fails; until 7 days later, and while the date lies in the future, nothing is
-/// written. Nor is it without fields (null).
+/// written. Null `fields` are never written.
 void NLW_WriteLog(std::string_view logType, const PropertyDict* fields);
 
 /// The device's identifier for fault reports, or "error" when it is unknown.

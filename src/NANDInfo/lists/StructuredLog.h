@@ -12,8 +12,8 @@ inline constexpr std::int32_t kListRecordType = 176;
 /// list is wanted, in the state of `StructuredLogState.h`. `callersFlag` goes to the controller.
 ///
 /// False, with lines on standard error, when the controller, its connection, its properties or a
-/// selector cannot be had, or a list could not be handled. A list that is not delivered costs only
-/// a line.
+/// selector cannot be had, or a list cannot be handled. A list that the controller does not deliver
+/// is only a line.
 bool DumpStorageStructuredLog(bool callersFlag);
 
 }  // namespace vesprun

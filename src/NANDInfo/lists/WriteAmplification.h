@@ -4,9 +4,9 @@
 
 namespace vesprun {
 
-/// How often each 4 KiB block of the host is written to flash, computed in double precision and
-/// kept in single. Before the first host write a figure is infinite, or NaN when nothing was
-/// erased.
+/// How many 4 KiB blocks are written to flash for each that the host writes, computed in double
+/// precision and kept in single. Before the first host write a figure is infinite, or NaN when
+/// nothing was erased.
 struct WriteAmplification {
   float user = 0.0F;
   float intermediate = 0.0F;  ///< 0 when not known

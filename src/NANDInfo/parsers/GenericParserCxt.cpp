@@ -70,15 +70,15 @@ bool AddMultipleFieldsToGenericContext(GenericParserCxt& ctx, std::string_view n
     return false;
   }
   if (count == 1) {
-    return ctx.append(name, loadLittleEndian(source, width));
+    return AddSingleValueToGenericContext(ctx, "", name, loadLittleEndian(source, width));
   }
   bool allAppended = true;
   for (std::uint32_t i = 0; i < count; ++i) {
     std::array<char, std::numeric_limits<std::uint32_t>::digits10 + 1> digits;
     const char* const end = std::to_chars(digits.data(), digits.data() + digits.size(), i).ptr;
-    allAppended =
-        ctx.append(name, {digits.data(), end}, loadLittleEndian(source + i * width, width)) &&
-        allAppended;
+    allAppended = AddSingleValueToGenericContext(ctx, name, {digits.data(), end},
+                                                 loadLittleEndian(source + i * width, width)) &&
+                  allAppended;
   }
   return allAppended;
 }

@@ -14,8 +14,8 @@
 namespace vesprun {
 
 /// The result of the statistics parsers: an ordered list of named unsigned 64-bit fields, possibly
-/// with repeated names. Names of known fields are referred to, a statistic at a time; all others
-/// share one text, so that a field needs no allocation of its own.
+/// with repeated names. No field needs an allocation of its own: the names of known statistics are
+/// constants, and all other names share one text.
 class GenericParserCxt {
  public:
   static constexpr std::size_t kMaxNameLength = 98;  ///< longer names are cut
@@ -52,27 +52,23 @@ class GenericParserCxt {
     }
   }
 
-  /// Makes room for that many values more, if there is memory.
+  /// Makes room for that many more values, if there is memory.
   void reserve(std::size_t count) noexcept;
-  /// Appends a field named `prefix` + `suffix`, cut to `kMaxNameLength`. False, and nothing
-  /// appended, when memory runs out.
+  /// See `AddSingleValueToGenericContext`.
   bool append(std::string_view prefix, std::string_view suffix, std::uint64_t value) noexcept;
-  bool append(std::string_view name, std::uint64_t value) noexcept {
-    return append({}, name, value);
-  }
   /// Appends `count` fields under these names: the little-endian values of `width` bytes, 1 to 8,
-  /// at `source`. False when memory ran out for some, which are missing.
+  /// at `source`. False when memory runs out; fields are then missing.
   bool appendKnown(KnownNames names, const std::uint8_t* source, std::size_t width,
                    std::size_t count) noexcept;
   /// Empties the context and frees its memory.
   void release() { *this = GenericParserCxt(); }
 
  private:
-  /// Elements of a known statistic, or one field of another name.
+  /// Elements of a known statistic, or one field of another name, which lies in `_names`.
   struct Run {
     KnownNames names;
-    std::uint32_t size;   ///< fields; of another name its characters
-    std::uint32_t begin;  ///< of another name in `_names`
+    std::uint32_t size;   ///< the number of elements, or the length of the other name
+    std::uint32_t begin;  ///< of the other name
   };
 
   std::string _names;
@@ -80,19 +76,19 @@ class GenericParserCxt {
   std::vector<std::uint64_t> _values;  ///< of all fields
 };
 
-/// Appends a field named `prefix` + `suffix`, cut to 98 characters. False, and nothing appended,
-/// when memory runs out.
+/// Appends a field named `prefix` + `suffix`, cut to `kMaxNameLength` characters. False, and
+/// nothing appended, when memory runs out.
 bool AddSingleValueToGenericContext(GenericParserCxt& ctx, std::string_view prefix,
                                     std::string_view suffix, std::uint64_t value);
 
 inline constexpr std::uint32_t kMaxFieldsOfOneCall = 65'535;
 
 /// Appends the `count` little-endian elements of `width` bytes at `source`, at any address. A
-/// single element is named `name`, several `name` + index from 0, cut to 98 characters.
+/// single element is named `name`, several `name` + index from 0.
 ///
 /// True, and nothing appended, when `width` or `count` is 0. False, and nothing appended, when
 /// `width` is above 8, or `count` above `kMaxFieldsOfOneCall`: a part of the array would pass for
-/// all of it. False also when memory runs out for some elements, which are missing.
+/// all of it. False also when memory runs out; elements are then missing.
 bool AddMultipleFieldsToGenericContext(GenericParserCxt& ctx, std::string_view name,
                                        const std::uint8_t* source, std::uint32_t width,
                                        std::uint32_t count);

@@ -19,7 +19,7 @@ struct KnownName {
 /// The names of one statistic's elements.
 class KnownNames {
  public:
-  // By number, not by address: nothing of a table changes when a program starts.
+  // Offsets and not pointers, which the loader would have to relocate at each start.
   struct Place {
     std::uint32_t begin = 0;
     std::uint32_t size = 0;
@@ -39,8 +39,8 @@ class KnownNames {
   const Place* _places = nullptr;
 };
 
-/// The names of all elements of all statistics in `kTable`, laid out when it is compiled: that of a
-/// single value is the statistic's, that of an array's element has `kSeparator` and the index
+/// The names of all elements of all statistics in `kTable`, laid out at compile time: the
+/// statistic's own for a single value; for an array's element with `kSeparator` and the index
 /// behind it.
 template <const auto& kTable, const char* kSeparator>
 class KnownNamesOf {

@@ -7,7 +7,7 @@
 
 namespace vesprun {
 
-/// Consecutive counters of one kind, reported as NAME[0], NAME[1] and so on.
+/// Consecutive counters of one kind, reported as `name[0]`, `name[1]` and so on.
 struct CounterField {
   std::string_view name;  ///< empty: not reported
   std::size_t first;      ///< word of `NandChannelCounters`

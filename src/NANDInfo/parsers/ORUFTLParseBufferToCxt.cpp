@@ -48,7 +48,8 @@ Taken takeArray(GenericParserCxt& ctx, const ORUStatKey& key, const StatisticsRe
   const std::uint32_t count = std::min<std::uint32_t>(header.count, key.count);
   const bool appended =
       count == 1
-          ? ctx.append(key.name, "_", loadLittleEndian<std::uint64_t>(payload))
+          ? AddSingleValueToGenericContext(ctx, key.name, "_",
+                                           loadLittleEndian<std::uint64_t>(payload))
           : ctx.appendKnown(FTLNamesOf(key), payload, StatisticsRecordReader::kWordSize, count);
   if (!appended) {
     SetAPIErrorMessage("ORUFTLParseBufferToCxt: %s(%d): Cannot add %d elements to context",

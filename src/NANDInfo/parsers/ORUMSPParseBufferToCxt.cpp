@@ -22,7 +22,8 @@ bool take(GenericParserCxt& ctx, const ORUMSPKey& key, std::span<const std::uint
   const std::uint32_t count = std::min<std::uint32_t>(size / key.width(), key.count);
   // The lone element that is left of an array is named as a single value.
   const bool appended = count == 1 && key.count > 1
-                            ? ctx.append(key.name, loadLittleEndian(payload.data(), key.width()))
+                            ? AddSingleValueToGenericContext(
+                                  ctx, "", key.name, loadLittleEndian(payload.data(), key.width()))
                             : ctx.appendKnown(MSPNamesOf(key), payload.data(), key.width(), count);
   if (!appended) {
     SetAPIErrorMessage("ORUMSPParseBufferToCxt: %s(%d): Error adding %d elements to context",

@@ -11,8 +11,9 @@ namespace {
 
 constexpr std::uint32_t kReadCountHisto = 265;
 
-// A full record gives fewer fields than it has words. Arrays cut short share the words behind them,
-// so that a buffer of headers alone could give 256 fields for each word: 1,024 words may.
+// A full record gives fewer fields than it has words. But an array that is cut short takes the
+// words behind it, which are read again: a buffer of headers alone could give 256 fields a word. Up
+// to 1,024 words may.
 constexpr std::size_t kMostSharedFields = 1024 * 256;
 
 /// By id; null for statistics outside the summary.

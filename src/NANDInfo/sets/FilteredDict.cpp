@@ -21,8 +21,8 @@ constexpr std::array<std::uint64_t, 20> kPowersOfTen = [] {
 
 constexpr std::uint64_t kMostCutDigits = 18;
 
-/// The whole part of the base-ten logarithm in double precision, and one. The two ways can only
-/// differ near a power of ten; elsewhere digits are counted, which takes less time.
+/// The whole part of log10(x) in double precision, plus 1. Counting digits is faster and can only
+/// differ near a power of ten.
 std::uint64_t digitsOf(std::uint64_t x) {
   const auto least =
       static_cast<std::size_t>(std::bit_width(x)) * 1233 >> 12;  // 1233/4096: log10(2)

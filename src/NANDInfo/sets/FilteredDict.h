@@ -20,7 +20,7 @@ PropertyDict CreateFilteredDict(const PropertyDict& source, const FieldTable* ke
 /// the table gives.
 PropertyDict CreateFilteredDict_SigDig(const PropertyDict& source, const FieldTable* digits,
                                        bool round);
-/// The same of the fields that a parser gave, without a dictionary of all of them in between.
+/// The same, straight from a parser's fields, without a dictionary of all of them in between.
 PropertyDict CreateFilteredDict_SigDig(const GenericParserCxt& source, const FieldTable* digits,
                                        bool round);
 

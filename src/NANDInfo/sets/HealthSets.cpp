@@ -62,13 +62,8 @@ std::int64_t hostReadErrors(const PropertyDict& ftl) {
   if (isQNS1 == nullptr) {
     return 0;
   }
-  const Number* errors = ftl.findNumber(isQNS1->asInt64() != 0 ? "ueccReads" : "raidSmartErrors");
-  return errors != nullptr ? std::max<std::int64_t>(errors->asInt64(), 0) : 0;
-}
-
-std::int64_t numberOrMinusOne(const PropertyDict& fields, std::string_view name) {
-  const Number* number = fields.findNumber(name);
-  return number != nullptr ? number->asInt64() : -1;
+  const char* const errors = isQNS1->asInt64() != 0 ? "ueccReads" : "raidSmartErrors";
+  return std::max<std::int64_t>(ftl.integerOr(errors, 0), 0);
 }
 
 bool isRetirable(const PropertyDict& health) {
@@ -89,9 +84,9 @@ PropertyDict gatherNANDHealthInfo() {
   return {{kMaxPercentageNANDUsed, maxPercentageUsed(*ftl)},
           {kMaxE2EErrors, maxE2EErrors(*ftl)},
           {kHostReadErrors, hostReadErrors(*ftl)},
-          {kNumGrownBadBlocks, numberOrMinusOne(*ftl, "numGrownBad")},
-          {kSpareAvailablePercent, numberOrMinusOne(*ftl, "spareAvailablePercent")},
-          {kNumDieFailures, numberOrMinusOne(*ftl, "numDieFailures")}};
+          {kNumGrownBadBlocks, ftl->integerOr("numGrownBad", -1)},
+          {kSpareAvailablePercent, ftl->integerOr("spareAvailablePercent", -1)},
+          {kNumDieFailures, ftl->integerOr("numDieFailures", -1)}};
 }
 
 PropertyDict CopyTendmarkNANDInfo() noexcept {

@@ -99,7 +99,7 @@ constexpr std::array<std::string_view, 6> kHLT_instantaneous_gc_wamp_array{
     "HLT_instantaneous_gc_wamp_0", "HLT_instantaneous_gc_wamp_1", "HLT_instantaneous_gc_wamp_2",
     "HLT_instantaneous_gc_wamp_3", "HLT_instantaneous_gc_wamp_4", "HLT_instantaneous_gc_wamp_5"};
 
-/// Did garbage collection write anything between the two? Counts only if their stamps say that time
+/// Did garbage collection write anything between the two? No, unless their stamps say that time
 /// passed.
 bool collectedGarbage(const PropertyDict& newer, const PropertyDict& older) {
   const Number* newerStamp = newer.findNumber(kTimeStampKey);

@@ -9,7 +9,6 @@
 #include "NANDInfo/controller/TunnelCommand.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/GenericParserCxt.h"
-#include "NANDInfo/parsers/ORUParseBufferToCxt.h"
 #include "NANDInfo/sets/FilteredDict.h"
 
 namespace vesprun {

@@ -29,8 +29,8 @@ struct FTLFields {
 bool gatherFTLFields(bool useStatKeyParser, bool useStatsSelector, std::uint32_t argument,
                      const std::function<void(const FTLFields&)>& take);
 
-/// All of these fields, unsigned 64-bit numbers, or nothing on failure. Two 32-bit numbers, 1 or 0,
-/// come with them: "com.quill.NANDInfo.IsQNS1Controller" and `kIsStatMagSupportedKey`.
+/// All of these fields as unsigned 64-bit numbers, with two 32-bit numbers, 1 or 0:
+/// "com.quill.NANDInfo.IsQNS1Controller" and `kIsStatMagSupportedKey`. Nothing on failure.
 std::optional<PropertyDict> gatherORUFTLData(bool useStatKeyParser, bool useStatsSelector,
                                              std::uint32_t argument);
 
@@ -41,8 +41,8 @@ std::optional<PropertyDict> gatherORUMSPData(const FieldTable* digits = nullptr,
                                              bool round = false);
 
 /// Fills a zeroed context with the base statistics. `exporter` becomes the controller's table
-/// entry, or the ending one. False, with lines on standard error when the controller cannot be
-/// used, if the context was not filled or closing failed; it may then hold some fields.
+/// entry, or the ending one. False when the controller cannot be used, with lines on standard
+/// error, or when the statistics cannot be parsed, which may leave some fields in the context.
 bool GatherNANDStats(nand_exporter_t*& exporter, ORUStatsContext& context);
 
 }  // namespace vesprun

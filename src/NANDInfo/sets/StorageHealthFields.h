@@ -36,8 +36,8 @@ PropertyDict gatherORUFTLOtherData(const PropertyDict* ftl);
 /// The FTL fields that these fields come from.
 extern const FieldTable kSourcesOfOtherData;
 
-/// The derived fields of other sets than the FTL's: those of `FTLStats4MSPStats` that are there, in
-/// its order, from the FTL fields of now. Empty, with the error recorded, without these.
+/// The derived fields that go into other sets than the FTL's: those of `FTLStats4MSPStats` that are
+/// there, in its order, from the current FTL fields. Empty, with the error recorded, without these.
 PropertyDict gatherORUOtherData();
 
 }  // namespace vesprun

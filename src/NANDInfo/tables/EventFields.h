@@ -8,14 +8,14 @@
 namespace vesprun {
 
 // The fields of each analytics event, by its view.
-extern const FieldTable massStorage_NANDInfo_FTLCounters_1;              ///< 443
-extern const FieldTable massStorage_NANDInfo_FTLHistograms_1;            ///< 990
-extern const FieldTable massStorage_NANDInfo_FTLHistograms_2;            ///< 104
-extern const FieldTable massStorage_NANDInfo_MSPCounters_1;              ///< 822
-extern const FieldTable massStorage_NANDInfo_StorageStats_1;             ///< 17
-extern const FieldTable massStorage_NANDInfo_SM_Daily_FTLCounters_1;     ///< 52
-extern const FieldTable massStorage_NANDInfo_SM_WeeklyMA_FTLCounters_1;  ///< 33
-extern const FieldTable massStorage_NANDInfo_SM_Monthly_FTLCounters_1;   ///< 33
+extern const FieldTable massStorage_NANDInfo_FTLCounters_1;
+extern const FieldTable massStorage_NANDInfo_FTLHistograms_1;
+extern const FieldTable massStorage_NANDInfo_FTLHistograms_2;
+extern const FieldTable massStorage_NANDInfo_MSPCounters_1;
+extern const FieldTable massStorage_NANDInfo_StorageStats_1;
+extern const FieldTable massStorage_NANDInfo_SM_Daily_FTLCounters_1;
+extern const FieldTable massStorage_NANDInfo_SM_WeeklyMA_FTLCounters_1;
+extern const FieldTable massStorage_NANDInfo_SM_Monthly_FTLCounters_1;
 
 struct StorageEvent {
   const char* event;

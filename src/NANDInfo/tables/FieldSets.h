@@ -6,11 +6,11 @@ namespace vesprun {
 
 // The fields of each set of storage statistics, and their significant digits when the set is
 // rounded.
-extern const FieldTable WhitelistedRawNANDFTLCounters_SigDigDict;  ///< 1447: the FTL set
-extern const FieldTable WhitelistedRawNANDMSPCounters_SigDigDict;  ///< 825: the set of one MSP
-extern const FieldTable WhitelistedStorageStats_SigDigDict;        ///< 20: the storage statistics
+extern const FieldTable WhitelistedRawNANDFTLCounters_SigDigDict;  ///< the FTL set
+extern const FieldTable WhitelistedRawNANDMSPCounters_SigDigDict;  ///< the set of one MSP
+extern const FieldTable WhitelistedStorageStats_SigDigDict;        ///< the storage statistics
 
-/// 30: the derived fields in the sets of the MSPs, in this order.
+/// The derived fields in the sets of the MSPs, in this order.
 extern const FieldTable FTLStats4MSPStats;
 
 }  // namespace vesprun

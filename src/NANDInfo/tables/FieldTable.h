@@ -12,8 +12,8 @@
 
 namespace vesprun {
 
-/// A row of a field table: consecutively numbered fields, or a single one, with the significant
-/// digits that they keep, where the table says so.
+/// A row of a field table: consecutively numbered fields, or a single one, and in tables of digits
+/// the significant digits that they keep.
 struct FieldRange {
   std::string_view stem;
   std::uint32_t first;  ///< `FieldName::kNoNumber`, as `last`, for a name without a number
@@ -89,8 +89,7 @@ struct FieldIndex {
   }
 };
 
-/// An ordered set of field names with their digits. Ranges and index are constants; nothing is
-/// built at start.
+/// An ordered set of field names with their digits. Ranges and index are compile-time constants.
 class FieldTable {
  public:
   template <const auto& kRanges>
@@ -99,7 +98,7 @@ class FieldTable {
 
   constexpr std::size_t size() const { return _size; }
 
-  /// The range of `name`, or null, in constant time and without memory.
+  /// The range of `name`, or null. Takes constant time and allocates nothing.
   const FieldRange* find(std::string_view name) const { return find(name, hashOfText(name)); }
   /// The same, with the name's hash.
   const FieldRange* find(std::string_view name, std::uint32_t hash) const {

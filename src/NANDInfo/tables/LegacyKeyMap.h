@@ -8,7 +8,7 @@
 
 namespace vesprun {
 
-/// 709: the base statistics with a key in the legacy NAND info. Names are shorter than 100
+/// The base statistics with a key in the legacy NAND info. Names are shorter than 100
 /// characters.
 extern const FieldTable keyMap;
 

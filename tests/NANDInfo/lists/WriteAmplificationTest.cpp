@@ -14,10 +14,10 @@ TEST(WriteAmplification, IsKeptInSinglePrecision) {
   statistics.pagesPerVirtualBlock = 0x40100;  // times 16384 is 256 times 16384 in 32 bits
   statistics.bytesPerPage = 16384;
   statistics.hostWrites = 30'000;
-  statistics.fields.append("pagesPerVirtualBlockSlc", 128);
+  statistics.fields.append("pagesPerVirtualBlockSlc", "", 128);
   EXPECT_EQ(writeAmplification(statistics).user, static_cast<float>(102'400.0 / 30'000.0));
   EXPECT_EQ(writeAmplification(statistics).intermediate, 0.0F);
-  statistics.fields.append("intermediateBandErases", 10);
+  statistics.fields.append("intermediateBandErases", "", 10);
   EXPECT_EQ(writeAmplification(statistics).intermediate, static_cast<float>(5120.0 / 30'000.0));
   statistics.hostWrites = 0;
   EXPECT_EQ(writeAmplification(statistics).user, std::numeric_limits<float>::infinity());

@@ -51,7 +51,7 @@ TEST(FilteredDict, KeepsListedEntriesInTheOrderOfTheSource) {
 
   GenericParserCxt fields;
   for (const char* name : {"bin10", "c", "a", "bin12", "bin9", "a"}) {
-    fields.append(name, 12345);
+    fields.append(name, "", 12345);
   }
   for (const bool round : {false, true}) {
     const PropertyDict dict = CreateDictFromCxt(fields);

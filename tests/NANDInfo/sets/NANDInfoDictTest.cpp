@@ -17,7 +17,7 @@ class NANDInfoDictTest : public ControllerTest {
       const std::vector<std::pair<std::string_view, std::uint64_t>>& fields) {
     ORUStatsContext context;
     for (const auto& [name, value] : fields) {
-      context.fields.append(name, value);
+      context.fields.append(name, "", value);
     }
     return CreateNANDInfoDict(context, true);
   }

@@ -7,8 +7,8 @@
 
 namespace vesprun {
 
-/// The document of a whitelist that lets every figure of the running system through, coarsely, and
-/// says of each in a comment what it is good for.
+/// The document of a whitelist that lets every figure of the running system through, coarsely, with
+/// a comment on what each is good for.
 std::string starterWhitelist();
 
 /// Makes a document the whitelist of a device. Throws `CommandFailure` when that failed.

@@ -9,10 +9,13 @@ namespace vesprun {
 namespace {
 
 // Each script holds the table of the command tree in place of the line @TABLE@, and walks over the
-// words before the cursor to find the command that they lead to. A row is PATH|KIND|NAME|HELP:
-// commands and options below the words of PATH, where an option's kind is that of its value or
-// "flag", and as "argument" the kind of each positional argument, the last with a star when more
-// may follow. Kinds of values are "dir", "file" and "word".
+// words before the cursor to find the command that they lead to. PATH are the words of a command:
+//
+//   PATH|command|NAME|HELP    a command below it
+//   PATH|KIND|--NAME|HELP     an option; KIND is "flag" or that of its value
+//   PATH|argument|KIND|       a positional argument; a star behind KIND: it may be repeated
+//
+// Kinds of values are "dir", "file" and "word".
 
 constexpr std::string_view kBash = R"SCRIPT(# bash completion of vespctl
 _vespctl() {

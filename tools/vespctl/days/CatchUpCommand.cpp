@@ -46,7 +46,8 @@ std::vector<std::int32_t> missedDays(HostTallybook& counters, std::int64_t first
 
 enum class Submission { Done, Empty, Failed };
 
-/// Submits what the run of the day after would have, without the keys that tell of its moment.
+/// Submits what the next day's run would have submitted, without the keys that it would have
+/// measured at that moment.
 Submission submitReport(std::int32_t day) {
   logMessage(LogLevel::Default, "catching up on day %d", day);
   TBReport report;
@@ -98,8 +99,7 @@ void addCatchUpCommand(CLI::App& vespctl) {
   };
   const auto arguments = std::make_shared<Arguments>();
   CLI::App* command = addDeviceCommand(
-      vespctl, "catch-up",
-      "Submits the reports of days that no daily log tells of, and prints the days",
+      vespctl, "catch-up", "Submits the reports of days without a daily log, and prints these days",
       arguments->directory);
   command->add_option("--last", arguments->last, "How many days, the day before yesterday the last")
       ->transform(decimal<std::uint32_t>());

@@ -78,7 +78,7 @@ void addDaysCommand(CLI::App& vespctl) {
   };
   const auto arguments = std::make_shared<Arguments>();
   CLI::App* command = addDeviceCommand(
-      vespctl, "days", "Prints what is kept of the last days, and which daily logs tell of them",
+      vespctl, "days", "Prints what is kept of the last days, and the names of their daily logs",
       arguments->directory);
   command->add_option("--last", arguments->last, "How many days, today the last of them")
       ->transform(decimal<std::uint32_t>());

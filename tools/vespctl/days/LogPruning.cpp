@@ -1,6 +1,5 @@
 #include "days/LogPruning.h"
 
-#include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -53,7 +52,7 @@ std::uint64_t bytesOfFiles(const std::string& folder) {
 struct LogPruning::Log {
   std::vector<std::string> files;  ///< the header last
   std::uint64_t bytes = 0;
-  Date written;  ///< the header's own time does not count beside a log
+  Date written;  ///< of the header only when there is no log
 };
 
 /// By number.
@@ -140,8 +139,8 @@ void LogPruning::remove(const std::vector<Log>& logs) {
   std::ranges::stable_sort(_removed, {}, [](const std::string& name) { return *logNumber(name); });
 }
 
-/// Removes the logs that need no note, which on a full disk makes room for notes, and gives the
-/// others when their notes are durable. Throws `CommandFailure`.
+/// Removes the logs that need no note, which makes room for notes on a full disk, and returns the
+/// others once their notes are durable. Throws `CommandFailure`.
 std::vector<const LogPruning::Log*> LogPruning::noteDailyLogs(const std::vector<Log>& logs) {
   std::vector<const Log*> named;
   for (const Log& log : logs) {

@@ -11,10 +11,10 @@
 
 namespace vesprun {
 
-/// Removes logs from the outbox of a device, each with its header. What is to be remembered of a
-/// log is durable before the log goes: its number, and of a daily log a note in `pruned.jsonl`. A
-/// command that is killed in between has then noted a log that is still there, which keeps its
-/// revision and is not noted again.
+/// Removes logs from the outbox of a device, each with its header. Before a log is removed, what is
+/// to be remembered of it is durable: its number, and for a daily log a note in `pruned.jsonl`.
+/// When a command was killed in between, the noted log is still there; it keeps its revision and is
+/// not noted again.
 class LogPruning {
  public:
   /// `now` is the time of the notes. The directory must outlive the object.
@@ -24,8 +24,8 @@ class LogPruning {
   /// Removes the logs that were written before `time`.
   void removeBefore(const Date& time);
 
-  /// Removes the logs with the lowest numbers until all files in the outbox are together below a
-  /// number of bytes, or no log is left.
+  /// Removes the logs with the lowest numbers until all files in the outbox together have fewer
+  /// bytes, or no log is left.
   void removeUntilBelow(std::uint64_t bytes);
 
   /// The files that were removed, without headers that went with their log.
@@ -44,7 +44,7 @@ class LogPruning {
 
   const DeviceDirectory& _directory;
   Date _now;
-  /// Of the folder: a header without a log is not one of a log that is coming.
+  /// Of the folder: else a header without a log may be that of a coming log.
   std::optional<FileDescriptor> _lock;
   std::vector<std::string> _removed;
   std::vector<std::string> _problems;

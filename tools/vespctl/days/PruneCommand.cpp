@@ -27,14 +27,14 @@ struct Pruning {
   std::optional<std::uint64_t> outboxMebibytes;
 };
 
-/// Removes the lines of a file in the outbox that were written before `time`, and gives their
-/// number. One that does not tell its time stays.
+/// Removes the lines of a file in the outbox that were written before `time`, and returns their
+/// number. A line without a time stays.
 std::uint64_t removeLines(const std::string& path, const Date& time,
                           std::vector<std::string>& problems) {
   static constexpr std::string_view kBegin = "{\"time\":\"";
   std::string error;
   const auto isOlder = [&time](std::string_view text) {
-    if (text.starts_with(kBegin)) {  // as every line of ours: most are not old and need no parsing
+    if (text.starts_with(kBegin)) {  // as our lines do; most are not old and need no parsing
       const std::string_view rest = text.substr(kBegin.size());
       const std::optional<Date> date = parseDateText(rest.substr(0, rest.find('"')));
       if (date && *date >= time) {
@@ -69,7 +69,7 @@ CounterStore::Removed removeCounters(HostPlatform& device, std::int64_t day,
     store.giveRoomBack();
     return true;
   };
-  // Nothing is written, and no database made, for nothing.
+  // A write without anything to remove would still lock the database, or even make it.
   if (!counters.read([&](CounterStore& store) { first = store.nextDay(kBeforeAllDays); }, error) ||
       (first && *first < day && !counters.write(remove, error))) {
     problems.push_back(error);
@@ -79,7 +79,7 @@ CounterStore::Removed removeCounters(HostPlatform& device, std::int64_t day,
 }
 
 void prune(const Pruning& wanted) {
-  // Neither today's run nor the one that may still make up for its day lack what they read.
+  // Today's and tomorrow's reports read these days.
   constexpr std::int64_t kDaysKept = 2;
   constexpr std::uint64_t kBytesPerMebibyte = 1048576;
   const auto device = openDevice(wanted.directory);

@@ -2,15 +2,16 @@
 #include <sys/time.h>
 
 #include <cerrno>
+#include <charconv>
 #include <chrono>
 #include <cstring>
 #include <thread>
 
 #include "Command.h"
 #include "DecimalNumber.h"
-#include "device/AppFile.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeWriter.h"
+#include "platform/host/documents/QuotedText.h"
 #include "platform/host/messages/MessageFraming.h"
 #include "platform/host/messages/ServiceSocket.h"
 
@@ -22,6 +23,78 @@ constexpr std::string_view kLoggingNotification = "com.quill.aggregated.vesprun.
 constexpr int kPatienceInSeconds = 10;
 constexpr std::chrono::milliseconds kLookAgain(20);
 constexpr timeval kLastLook{2, 0};
+
+std::optional<Bytes> uuidBytes(std::string_view text) {
+  constexpr std::string_view kForm = "hhhhhhhh-hhhh-hhhh-hhhh-hhhhhhhhhhhh";
+  Bytes bytes;
+  for (std::size_t i = 0; i < kForm.size() && text.size() == kForm.size(); i += 2) {
+    if (kForm[i] == '-' && text[i++] != '-') {
+      return std::nullopt;
+    }
+    const char* const end = text.data() + i + 2;
+    if (std::from_chars(text.data() + i, end, bytes.emplace_back(), 16).ptr != end) {
+      return std::nullopt;
+    }
+  }
+  return bytes.empty() ? std::nullopt : std::optional(std::move(bytes));
+}
+
+/// The value as the message carries it; nothing, with the fault in `fault`, for a wrong one.
+std::optional<PropertyValue> messageValue(std::string_view name, const PropertyValue& value,
+                                          std::string& fault) {
+  if (name == "bundle_id" || name == "version") {
+    fault = "not a string";
+    return value.string() != nullptr ? std::optional(value) : std::nullopt;
+  }
+  if (name == "adam_id" || name == "arch") {
+    fault = "not a signed 64-bit integer";
+    const Number* number = value.number();
+    return number != nullptr && number->kind() == NumberKind::Int64 ? std::optional(value)
+                                                                    : std::nullopt;
+  }
+  if (name == "uuid") {
+    fault = "not a UUID text such as 00112233-4455-6677-8899-AABBCCDDEEFF";
+    std::optional<Bytes> bytes =
+        value.string() != nullptr ? uuidBytes(*value.string()) : std::nullopt;
+    return bytes ? std::optional<PropertyValue>(*std::move(bytes)) : std::nullopt;
+  }
+  fault = "unknown entry";
+  return std::nullopt;
+}
+
+/// "app_data" from a JSON array of app dictionaries: "bundle_id" and "version" (strings), "adam_id"
+/// and "arch" (integers), "uuid" (8-4-4-4-12 hexadecimal digits in either case). Absent entries
+/// stay absent. Nothing, with the place in `error` ("app 2: \"uuid\": ..."), for anything else.
+std::optional<PropertyArray> appDataFromJson(std::string_view json, std::string& error) {
+  const std::optional<PropertyValue> value = valueFromJsonText(json, error);
+  if (!value) {
+    return std::nullopt;
+  }
+  if (value->array() == nullptr) {
+    error = "not an array of app dictionaries";
+    return std::nullopt;
+  }
+  PropertyArray apps;
+  for (const PropertyValue& element : *value->array()) {
+    const std::string place = "app " + std::to_string(apps.size() + 1) + ": ";
+    if (element.dict() == nullptr) {
+      error = place + "not a dictionary";
+      return std::nullopt;
+    }
+    PropertyDict app;
+    for (const auto& [name, entry] : *element.dict()) {
+      std::string fault;
+      std::optional<PropertyValue> carried = messageValue(name, entry, fault);
+      if (!carried) {
+        error = place + quotedText(name) + ": " + fault;
+        return std::nullopt;
+      }
+      app.set(name, *std::move(carried));
+    }
+    apps.emplace_back(std::move(app));
+  }
+  return apps;
+}
 
 std::string document(const PropertyDict& message) {
   std::string text;
@@ -66,8 +139,8 @@ class Client {
     }
   }
 
-  /// Nothing comes back, but a service that ends before it has read the message resets the
-  /// connection. One that is still there after a moment has the message.
+  /// The service answers nothing, but when it ends before it has read the message, the connection
+  /// is reset. When it is still there after a moment, it has the message.
   void finish() const {
     setsockopt(_socket.get(), SOL_SOCKET, SO_RCVTIMEO, &kLastLook, sizeof kLastLook);
     char byte = 0;
@@ -114,19 +187,13 @@ class NewNotifications {
  private:
   bool isPosted(std::string_view name) const {
     const std::string text = contentIfThere(_file);
+    bool isThere = false;
     // A shorter file is a new one.
-    std::string_view rest = std::string_view(text).substr(text.size() < _seen ? 0 : _seen);
-    for (auto end = rest.find('\n'); end != std::string_view::npos; end = rest.find('\n')) {
-      std::string ignored;
-      const std::optional<PropertyValue> line = valueFromJsonText(rest.substr(0, end), ignored);
-      const PropertyDict* dict = line ? line->dict() : nullptr;
-      const std::string* posted = dict != nullptr ? dict->findString("name") : nullptr;
-      if (posted != nullptr && *posted == name) {
-        return true;
-      }
-      rest.remove_prefix(end + 1);
-    }
-    return false;
+    forEachLine(text.substr(text.size() < _seen ? 0 : _seen), [&](const PropertyDict* line) {
+      const std::string* posted = line != nullptr ? line->findString("name") : nullptr;
+      isThere = isThere || (posted != nullptr && *posted == name);
+    });
+    return isThere;
   }
 
   std::string _file;

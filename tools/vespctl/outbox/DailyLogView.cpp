@@ -65,7 +65,7 @@ void showHistogram(std::ostream& out, const PropertyDict& histogram) {
   const auto width = static_cast<int>(longestKey(histogram));
   for (const auto& [label, count] : histogram) {
     const double value = count.number() != nullptr ? count.number()->asDouble() : 0.0;
-    // A foreign log may hold any counts.
+    // The counts of a foreign log may be anything.
     const double share = value > 0 ? value / largest : 0.0;
     const auto length = share <= 1 ? static_cast<std::size_t>(std::ceil(share * kLongestBar)) : 0;
     out << "      " << std::right << std::setw(width) << printableText(label) << "  "

@@ -8,7 +8,6 @@
 #include "DecimalNumber.h"
 #include "common/TextForm.h"
 #include "outbox/SubmittedLogs.h"
-#include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/XmlText.h"
 
 namespace vesprun {

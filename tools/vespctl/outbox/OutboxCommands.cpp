@@ -25,7 +25,7 @@ std::string entryText(const PropertyDict& line, const char* key) {
 template <typename Show>
 void showLines(const std::string& file, Show show) {
   int number = 0;
-  forEachLine(file, [&](const PropertyDict* line) {
+  forEachLine(contentIfThere(file), [&](const PropertyDict* line) {
     ++number;
     if (line != nullptr) {
       show(*line);

@@ -1,7 +1,6 @@
 #include "outbox/SubmittedLogs.h"
 
 #include <algorithm>
-#include <charconv>
 #include <cstdio>
 #include <map>
 #include <optional>
@@ -20,12 +19,10 @@ namespace {
 constexpr std::string_view kNameAfterNumber = "-193-log-aggregated.ptree";
 
 std::optional<std::uint64_t> numberOf(std::string_view name) {
-  std::uint64_t number = 0;
-  const auto [end, error] = std::from_chars(name.data(), name.data() + name.size(), number);
-  const std::string_view rest = name.substr(static_cast<std::size_t>(end - name.data()));
-  return error == std::errc() && end - name.data() >= 4 && rest == kNameAfterNumber
-             ? std::optional(number)
-             : std::nullopt;
+  constexpr std::size_t kFewestDigits = 4;
+  const std::size_t digits = std::min(name.find('-'), name.size());
+  return digits >= kFewestDigits && name.substr(digits) == kNameAfterNumber ? logNumber(name)
+                                                                            : std::nullopt;
 }
 
 const char* faultOfDistribution(const PropertyValue& value) {
@@ -81,15 +78,15 @@ class Revisions {
  public:
   explicit Revisions(const DeviceDirectory& directory) : _directory(directory) { readNotes(); }
 
-  /// For a log that has gone since its folder was read: it was noted before.
+  /// Once more when a log has gone since its folder was read: its note was written before.
   void readNotes() {
     _notes = *orFail([&](std::string& error) { return readPrunedLogs(_directory, error); });
     std::ranges::stable_sort(_notes, {}, &PrunedLog::number);
     _next = 0;
   }
 
-  /// That of the next log by number. One whose removal was noted and then did not happen keeps its
-  /// own.
+  /// Sets the revision of the next log by number. A log that was noted as removed, and was not,
+  /// keeps the noted one.
   void set(SubmittedLog& log, std::uint64_t number) {
     for (; _next < _notes.size() && _notes[_next].number < number; ++_next) {
       count(_notes[_next]);

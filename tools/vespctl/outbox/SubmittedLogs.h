@@ -17,7 +17,7 @@ struct SubmittedLog {
   std::string name;           ///< of its file
   std::int32_t day = 0;       ///< that it reports
   std::int64_t revision = 0;  ///< of that day, from 1
-  bool isNoted = false;       ///< as removed, by a command that was killed before it removed it
+  bool isNoted = false;       ///< as removed, by a command that was killed before the removal
   PropertyDict document;
 };
 
@@ -25,18 +25,18 @@ struct SubmittedLog {
 struct UnreadableLog {
   std::string name;
   std::string why;
-  bool wasRead;  ///< so that it will never be one
+  bool wasRead;  ///< and so will never be one; else it may be read another time
 };
 
-/// What lies in the folder of submitted logs. Throws `CommandFailure` when it cannot be read.
+/// The names in the folder of submitted logs. Throws `CommandFailure` when it cannot be read.
 std::vector<std::string> namesOfLogs(const DeviceDirectory& directory);
 
 /// True for the names that daily logs have.
 bool isDailyLogName(std::string_view name);
 
-/// Gives `take` the daily logs in the outbox, by number. A log's revision is one more than the
-/// highest of its day so far, pruned logs included. Throws `CommandFailure` when the outbox cannot
-/// be read.
+/// Calls `take` with the daily logs in the outbox, by number. A log's revision is one more than the
+/// highest of its day so far, pruned logs included. Returns the files that are no daily logs.
+/// Throws `CommandFailure` when the outbox cannot be read.
 std::vector<UnreadableLog> forEachSubmittedLog(const DeviceDirectory& directory,
                                                const std::function<void(SubmittedLog&& log)>& take);
 

@@ -4,10 +4,10 @@
 
 #include "Command.h"
 #include "DecimalNumber.h"
+#include "JsonObject.h"
 #include "driver/DailyTasks.h"
-#include "outlook/JsonObject.h"
 #include "outlook/KeptBack.h"
-#include "outlook/LookedAtDevice.h"
+#include "outlook/ReadOnlyDevice.h"
 #include "report/LogSubmission.h"
 #include "report/ReportSources.h"
 #include "report/TBReport.h"
@@ -27,23 +27,23 @@ struct OutlookArguments {
 std::int32_t yesterday() { return dayBefore(platform().tallybook().TBDaysSince1970()); }
 
 void previewLog(const OutlookArguments& arguments) {
-  const LookedAtDevice looked(arguments.directory, LogLevel::Default);
+  const ReadOnlyDevice opened(arguments.directory, LogLevel::Default);
   const std::int32_t day = arguments.day.value_or(yesterday());
   std::optional<PropertyDict> document;
   if (platform().logsmith().DiagnosticLogSubmissionEnabled()) {
     TBReport report;
     if (!report.readHistory(day)) {
-      looked.complaints.fail(kUnreadableCounters);
+      opened.complaints.fail(kUnreadableCounters);
     }
     document = report.makeDocument(day, TBReport::SideEffects::LeftOut);
     if (document && !canSerializeDailyLog(*document)) {
       document.reset();
-    } else if (document && looked.device->description().submission.fails) {
+    } else if (document && opened.device->description().submission.fails) {
       logMessage(LogLevel::Error, "%s", kSubmissionFailed);
       document.reset();
     }
   }
-  looked.complaints.print();
+  opened.complaints.print();
   if (document && arguments.document) {
     platform().ptreeSerialization().serialize({*document},
                                               [](std::string_view piece) { std::cout << piece; });
@@ -55,23 +55,23 @@ void previewLog(const OutlookArguments& arguments) {
 }
 
 void printLeftOut(const OutlookArguments& arguments) {
-  const LookedAtDevice looked(arguments.directory, LogLevel::Default);
+  const ReadOnlyDevice opened(arguments.directory, LogLevel::Default);
   const std::int32_t day = arguments.day.value_or(yesterday());
   const auto keys = keysKeptBack(firstDayOfReport(day), day);
   if (!keys) {
-    looked.complaints.fail(kUnreadableCounters);
+    opened.complaints.fail(kUnreadableCounters);
   }
   JsonArray keptBack;
   for (const auto& [isDistribution, key] : *keys) {
     const char* const kind = isDistribution ? "distribution" : "scalar";
     keptBack.add(JsonObject().add("kind", kind).add("key", key).text());
   }
-  looked.complaints.print();
+  opened.complaints.print();
   std::cout << keptBack.text() << '\n';
 }
 
-/// Adds the rows of a key that a report of `day` reads, as they are stored and as the log would
-/// have them; without `options` it would not. False when the counters cannot be read.
+/// Adds the rows of a key that a report of `day` reads, as stored and as reported; without
+/// `options` they are not reported. False when the counters cannot be read.
 bool addValues(std::int32_t day, std::string_view key, const ScalarOptions* options,
                JsonArray& values) {
   const auto history = platform().tallybook().initWithDefaultPath();
@@ -133,7 +133,7 @@ std::optional<PropertyValue> nameOf(DecidedBy by) {
 template <typename Options>
 void explainKey(const OutlookArguments& arguments) {
   constexpr bool kIsScalar = std::is_same_v<Options, ScalarOptions>;
-  const LookedAtDevice looked(arguments.directory);
+  const ReadOnlyDevice opened(arguments.directory);
   const std::string_view key = arguments.key;
   const std::unique_ptr<TBConfig> config = TBConfig::init();
   WhitelistDecision<Options> decision;
@@ -153,9 +153,9 @@ void explainKey(const OutlookArguments& arguments) {
   }
   JsonArray values;
   if (!addValues(yesterday(), key, decision.options(), values)) {
-    looked.complaints.fail(kUnreadableCounters);
+    opened.complaints.fail(kUnreadableCounters);
   }
-  looked.complaints.print();
+  opened.complaints.print();
   const std::vector<std::string_view> sources = ownScalarKeys();
   const bool isSource =
       kIsScalar && std::find(sources.begin(), sources.end(), key) != sources.end();

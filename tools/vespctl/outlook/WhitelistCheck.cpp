@@ -1,6 +1,7 @@
 #include "outlook/WhitelistCheck.h"
 
 #include <cmath>
+#include <type_traits>
 #include <unordered_map>
 #include <utility>
 
@@ -11,7 +12,7 @@
 namespace vesprun {
 namespace {
 
-// The document as it is written, with what a later entry of the same name replaces.
+// The document as it is written, including entries that a later one of the same name replaces.
 struct WrittenEntry {
   std::string name;
   PropertyValue value;
@@ -27,7 +28,7 @@ struct WrittenGroup {
   std::vector<WrittenList> lists;
 };
 
-/// Calls `judge` with each and whether another of its name follows.
+/// Calls `judge` with each, and whether another one of that name follows.
 template <typename Written, typename Judge>
 void forEachWithRepeats(const std::vector<Written>& written, const Judge& judge) {
   std::unordered_map<std::string_view, std::size_t> last;
@@ -41,7 +42,7 @@ void forEachWithRepeats(const std::vector<Written>& written, const Judge& judge)
 
 bool doNotRise(const PropertyArray& intervals) {
   for (std::size_t i = 1; i < intervals.size(); ++i) {
-    // Not the other way round: NaN does not rise either.
+    // Not `>=`: a NaN does not rise either.
     if (!(intervals[i - 1].number()->asDouble() < intervals[i].number()->asDouble())) {
       return true;
     }
@@ -56,13 +57,11 @@ class WhitelistCheck {
       if (lists.dict() != nullptr) {
         const WhitelistKeyGroup group{name, lists};
         _onInternalDevices.take(group);
-        if (!group.isForInternalDevices()) {
+        if (!WhitelistKeyGroup::isForInternalDevices(name)) {
           _onOtherDevices.take(group);
         }
       }
     }
-    _onInternalDevices.indexPrefixes();
-    _onOtherDevices.indexPrefixes();
   }
 
   void judge(const WrittenGroup& group, bool isRepeated) {
@@ -131,9 +130,11 @@ class WhitelistCheck {
         judgeOption(Options(), std::string(name), value);
       }
     }
-    if (options && hasFallingIntervals(*options)) {
-      tell("intervals do not rise",
-           "a bucket that does not end above the one before it stays empty: put them in order");
+    if constexpr (std::is_same_v<Options, DistributionOptions>) {
+      if (options && options->intervals != nullptr && doNotRise(*options->intervals)) {
+        tell("intervals do not rise",
+             "a bucket that does not end above the one before it stays empty: put them in order");
+      }
     }
     if (isPrefix && entry.name.empty()) {
       tell("empty prefix", "it lets every key in: name what is meant to leave");
@@ -164,11 +165,10 @@ class WhitelistCheck {
     }
   }
 
-  /// The groups that stand beside the one that is judged.
+  /// The tables of the groups that count together with the judged one.
   const WhitelistTables& tables() const {
-    const PropertyValue none(false);
-    return WhitelistKeyGroup{_place.group, none}.isForInternalDevices() ? _onInternalDevices
-                                                                        : _onOtherDevices;
+    return WhitelistKeyGroup::isForInternalDevices(_place.group) ? _onInternalDevices
+                                                                 : _onOtherDevices;
   }
 
   void judgeOption(const ScalarOptions& /*kind*/, const std::string& name,
@@ -201,11 +201,6 @@ class WhitelistCheck {
          "nothing reads " + quotedText(name) + " in this list: correct the name or remove it");
   }
 
-  static bool hasFallingIntervals(const ScalarOptions& /*options*/) { return false; }
-  static bool hasFallingIntervals(const DistributionOptions& options) {
-    return options.intervals != nullptr && doNotRise(*options.intervals);
-  }
-
   WhitelistTables _onInternalDevices;
   WhitelistTables _onOtherDevices;
   WhitelistFinding _place{};
@@ -219,7 +214,7 @@ std::optional<std::vector<WhitelistFinding>> checkWhitelist(std::string_view byt
   std::vector<WrittenGroup> groups;
   std::vector<WrittenList> lists;
   std::vector<WrittenEntry> entries;
-  // What is in a list or group is complete before it is.
+  // Entries come before the list that holds them, and lists before their group.
   const auto take = [&](std::span<const std::string_view> keys, const PropertyValue& value) {
     const std::string name(keys.back());
     const bool isDict = value.dict() != nullptr;

@@ -17,8 +17,8 @@ struct WhitelistFinding {
 };
 
 /// What is wrong or useless in a whitelist document, in its order. It is judged as if no group were
-/// switched off; "InternalTesting", which most devices skip, neither covers nor replaces what
-/// stands outside it. Nothing, with a text in `error`, when the bytes are not a ptree document with
+/// switched off; "InternalTesting", which most devices skip, neither covers nor replaces entries of
+/// other groups. Nothing, with a text in `error`, when the bytes are not a ptree document with
 /// a dictionary at its root.
 std::optional<std::vector<WhitelistFinding>> checkWhitelist(std::string_view bytes,
                                                             std::string& error);

@@ -3,9 +3,10 @@
 #include <set>
 
 #include "Command.h"
+#include "JsonObject.h"
 #include "config/TBConfig.h"
-#include "outlook/JsonObject.h"
-#include "outlook/LookedAtDevice.h"
+#include "outlook/KeptBack.h"
+#include "outlook/ReadOnlyDevice.h"
 #include "outlook/WhitelistCheck.h"
 #include "report/ReportSources.h"
 
@@ -72,28 +73,23 @@ std::string differences(const TBConfig* before, const TBConfig& after, const Key
 }
 
 void printDifferences(const std::string& directory, const std::string& file) {
-  const LookedAtDevice looked(directory);
+  const ReadOnlyDevice opened(directory);
   const std::unique_ptr<TBConfig> after = TBConfig::fromBytes(readInput(file));
   if (!after) {
-    looked.complaints.fail(inputName(file) + ": is not a whitelist");
+    opened.complaints.fail(inputName(file) + ": is not a whitelist");
   }
   const std::unique_ptr<TBConfig> before = TBConfig::init();
   using Days = std::numeric_limits<std::int32_t>;
   const std::vector<std::string_view> sources = ownScalarKeys();
   Keys scalars(sources.begin(), sources.end());
   Keys distributions;
-  const std::unique_ptr<TBHistory> history = platform().tallybook().initWithDefaultPath();
-  if (!history->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
-          "", Days::min(), Days::max(),
-          [&](std::string_view key, std::int32_t, std::int64_t, bool&) { scalars.emplace(key); }) ||
-      !history->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
-          "", Days::min(), Days::max(),
-          [&](std::string_view key, std::int32_t, TBHistoryDistributionEnumerator&, bool&) {
-            distributions.emplace(key);
-          })) {
-    looked.complaints.fail(kUnreadableCounters);
+  const auto take = [&](bool isDistribution, std::string_view key) {
+    (isDistribution ? distributions : scalars).emplace(key);
+  };
+  if (!forEachRow(Days::min(), Days::max(), take)) {
+    opened.complaints.fail(kUnreadableCounters);
   }
-  looked.complaints.print();
+  opened.complaints.print();
   std::cout << JsonObject()
                    .addText("scalars", differences<ScalarOptions>(before.get(), *after, scalars))
                    .addText("distributions",

@@ -34,11 +34,13 @@ std::string place(std::int64_t x, std::int64_t y) {
   return std::to_string(x) + ' ' + std::to_string(y);
 }
 
-std::string picture(const char* kind, const std::string& label, const std::string& content) {
+std::string picture(const char* kind, const std::string& label, const std::string& content,
+                    const char* width = "300") {
   std::string text = "<svg class=";
   text += kind;
-  return text + " viewBox=\"0 0 300 99\" preserveAspectRatio=none role=img aria-label=\"" + label +
-         "\">" + content + "</svg>";
+  return text + " viewBox=\"0 0 " + width +
+         " 99\" preserveAspectRatio=none role=img aria-label=\"" + label + "\">" + content +
+         "</svg>";
 }
 
 std::string path(const char* kind, const std::string& steps) {
@@ -181,8 +183,7 @@ std::string dayStrip(const std::vector<double>& days, const std::string& label) 
       steps += "M" + place(start, 0) + 'H' + std::to_string(end) + "V99H" + std::to_string(start);
     }
   }
-  return "<svg class=s viewBox=\"0 0 3000 99\" preserveAspectRatio=none role=img aria-label=\"" +
-         label + "\"><path d=\"" + steps + "\"/></svg>";
+  return picture("s", label, "<path d=\"" + steps + "\"/>", "3000");
 }
 
 }  // namespace vesprun

@@ -6,9 +6,9 @@
 
 namespace vesprun {
 
-// Small pictures in SVG. They have no size of their own and no text but their label.
+// Small pictures in SVG, without a size of their own and without text but a label.
 
-/// The days, with fractions, from the left to the right end of a picture.
+/// The days, with fractions, at the left and the right end of a picture.
 struct Period {
   double first;
   double last;
@@ -46,7 +46,7 @@ std::string bandChart(const std::vector<BandPoint>& points, Period period,
 /// A bar of a length from 0 to 1, with a mark at another length.
 std::string bar(double length, double mark);
 
-/// One row of cells from the first to the last of the ascending days, filled for these.
+/// A row of cells from the first to the last of the ascending days, with those of `days` filled.
 std::string dayStrip(const std::vector<double>& days, const std::string& label);
 
 }  // namespace vesprun

@@ -9,9 +9,8 @@
 
 namespace vesprun {
 
-/// Somebody's text between tags or in a quoted attribute: it can neither end there nor begin a tag.
-/// A byte that is not UTF-8 becomes "\xnn", and a character that is invisible or changes the
-/// direction of others "\u{N}".
+/// Foreign text, escaped for use between tags or in a quoted attribute. A byte that is not UTF-8
+/// becomes "\xnn", and a character that is invisible or changes the direction of others "\u{N}".
 std::string htmlText(std::string_view text);
 
 /// The same for a key or another name: in an element of its own, so that its direction changes

@@ -13,9 +13,8 @@ struct KeyGroup {
   std::vector<std::size_t> keys;  ///< places in the list
 };
 
-/// Parts a sorted list of dotted keys where it is long: by what they begin with up to a dot, deeper
-/// where a part is still long. Small parts at one level are put together. Every key is in one
-/// group.
+/// Parts a long list of sorted, dotted keys by their beginnings up to a dot, and a part that is
+/// still long by the next dot. Small parts of one level form one group. Every key is in one group.
 std::vector<KeyGroup> groupKeys(const std::vector<std::string_view>& keys);
 
 }  // namespace vesprun

@@ -1,12 +1,10 @@
-#include <sys/stat.h>
-
 #include <filesystem>
 #include <iostream>
 #include <limits>
 #include <system_error>
 
 #include "Command.h"
-#include "outlook/LookedAtDevice.h"
+#include "outlook/ReadOnlyDevice.h"
 #include "page/Page.h"
 #include "platform/host/files/AtomicFile.h"
 
@@ -31,16 +29,16 @@ void writePage(const std::string& file, const std::string& page) {
 
 void makePage(const std::string& directory, const std::string& file) {
   using Days = std::numeric_limits<std::int32_t>;
-  const LookedAtDevice looked(directory);
-  const PageData data(looked.device->directory());
+  const ReadOnlyDevice opened(directory);
+  const PageData data(opened.device->directory());
   const auto keptBack = keysKeptBack(Days::min(), Days::max());
   if (!keptBack) {
-    looked.complaints.fail(kUnreadableCounters);
+    opened.complaints.fail(kUnreadableCounters);
   }
-  looked.complaints.print();
+  opened.complaints.print();
   nameUnreadable(data.unreadable);
   std::error_code ignored;
-  const auto absolute = std::filesystem::canonical(looked.device->directory().path(), ignored);
+  const auto absolute = std::filesystem::canonical(opened.device->directory().path(), ignored);
   const std::string page =
       pageText(absolute.filename().string(), platform().clock().now(), data, *keptBack);
   if (file.empty() || file == "-") {

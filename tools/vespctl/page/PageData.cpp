@@ -8,6 +8,7 @@
 #include "common/Calendar.h"
 #include "common/TextForm.h"
 #include "page/Html.h"
+#include "platform/host/device/LogNumbers.h"
 #include "platform/host/files/Files.h"
 
 namespace vesprun {
@@ -68,22 +69,21 @@ void PageData::takeLogs(const DeviceDirectory& directory) {
   constexpr std::string_view kEnd = ".log";
   std::uint64_t newest = 0;
   for (const std::string& name : namesOfLogs(directory)) {
-    std::uint64_t number = 0;
-    const char* const rest = std::from_chars(name.data(), name.data() + name.size(), number).ptr;
-    std::string_view kind(rest, name.data() + name.size());
-    if (rest == name.data() || !kind.starts_with('-') || !kind.ends_with(kEnd)) {
+    const std::optional<std::uint64_t> number = logNumber(name);
+    if (!number || !name.ends_with(kEnd)) {
       continue;
     }
-    kind.remove_prefix(1);
+    std::string_view kind = name;
+    kind.remove_prefix(name.find('-') + 1);
     kind.remove_suffix(kEnd.size());
     ++others["log " + std::string(kind)];
-    if (!kind.starts_with("165-") || number < newest) {
+    if (!kind.starts_with("165-") || *number < newest) {
       continue;
     }
     std::string error;
     if (const auto content = readWholeFile(directory.hostPath("outbox/logs/" + name), error)) {
       storageLog = parseStorageLog(name, *content);
-      newest = number;
+      newest = *number;
     } else {
       unreadable.push_back({name, error, false});
     }
@@ -93,7 +93,7 @@ void PageData::takeLogs(const DeviceDirectory& directory) {
 template <typename Take>
 void PageData::takeLines(const DeviceDirectory& directory, const std::string& name, Take take) {
   std::size_t malformed = 0;
-  forEachLine(directory.hostPath("outbox/" + name), [&](const PropertyDict* line) {
+  forEachLine(contentIfThere(directory.hostPath("outbox/" + name)), [&](const PropertyDict* line) {
     if (line != nullptr) {
       take(*line);
     } else {

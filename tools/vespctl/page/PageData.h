@@ -12,7 +12,7 @@
 
 namespace vesprun {
 
-/// What the outbox of a device tells, read once. Later parts refer to earlier ones.
+/// All that the page shows of a device's outbox, read once. Later members refer to earlier ones.
 struct PageData {
   struct Value {
     double day;  ///< since 1970, with a fraction for a time within the day
@@ -35,7 +35,7 @@ struct PageData {
   /// The events of one name; those of each MSP apart.
   struct Events {
     std::size_t count = 0;
-    std::vector<Event> newest;  ///< some hundred at most, in the order of their lines
+    std::vector<Event> newest;  ///< a few hundred at most, in the order of their lines
   };
 
   /// The fields of a submitted text log of type 165, "name:value;name:value".

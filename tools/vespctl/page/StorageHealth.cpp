@@ -24,7 +24,9 @@ struct Fact {
   double day;
 };
 
-/// The newest value of each figure, by its name without what all have in front.
+using Names = std::initializer_list<std::string_view>;
+
+/// The newest value of each figure, by its name without the prefix that all have.
 class Facts {
  public:
   explicit Facts(const PageData& data) {
@@ -48,7 +50,7 @@ class Facts {
   }
 
   /// The newest figure under any of the names.
-  std::optional<Fact> find(std::initializer_list<std::string_view> names) const {
+  std::optional<Fact> find(Names names) const {
     std::optional<Fact> newest;
     for (const std::string_view name : names) {
       const auto fact = _facts.find(name);
@@ -86,13 +88,8 @@ class Facts {
 };
 
 /// Collects the sentences; one is made when its figure is known.
-class Statements {
- public:
-  explicit Statements(const PageData& data) : _facts(data) {}
-
-  using Names = std::initializer_list<std::string_view>;
-
-  std::optional<Fact> find(Names names) const { return _facts.find(names); }
+struct Statements : Facts {
+  using Facts::Facts;
 
   template <typename... Days>
   void add(Level level, const std::string& text, Days... days) {
@@ -110,15 +107,12 @@ class Statements {
   }
 
   std::vector<HealthStatement> list;
-
- private:
-  Facts _facts;
 };
 
 std::string percentText(double value) { return numeral(value) + "\u202F%"; }
 
 void addWear(Statements& statements) {
-  const auto addUsed = [&statements](Statements::Names names, const char* where) {
+  const auto addUsed = [&statements](Names names, const char* where) {
     if (const auto used = statements.find(names)) {
       statements.add(used->value >= kWearToActOn    ? Level::Act
                      : used->value >= kWearToLookAt ? Level::Look
@@ -188,7 +182,7 @@ void addUse(Statements& statements) {
         amplification->day);
   }
   const auto written = statements.find({"hostWrites", "NumLogicalWrites", "HLT_hostWrites"});
-  const auto addGrowth = [&](Statements::Names names, const char* period) {
+  const auto addGrowth = [&](Names names, const char* period) {
     const auto growth = statements.find(names);
     if (growth && written && written->value > 0) {
       statements.add(Level::Plain,

@@ -27,7 +27,8 @@ void writeSampleWhitelist(const DeviceDirectory& directory) {
   writeWhitelist(directory, document);
 }
 
-/// The readings of one moment stand for a day, those of a burst for its hours.
+/// A day of the sample: its scalars are readings of one moment, its distributions a burst of
+/// readings that is spread over the day.
 struct DayReadings {
   std::vector<ScalarReading> scalars;
   std::vector<DistributionReadings> distributions;
@@ -62,8 +63,8 @@ void recordCounters(HostPlatform& device) {
   orFail([&](std::string& error) { return counters.write(record, error); });
 }
 
-/// The time that the controller's statistics tell of: now, unless SOURCE_DATE_EPOCH asks for the
-/// same bytes each time.
+/// The time of the controller's statistics: now, or SOURCE_DATE_EPOCH, which makes the same bytes
+/// each time.
 Date sampleTime(Clock& clock) {
   const char* const epoch = std::getenv("SOURCE_DATE_EPOCH");
   std::int64_t seconds = 0;

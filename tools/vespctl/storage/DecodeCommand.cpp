@@ -1,10 +1,10 @@
 #include <algorithm>
 #include <iostream>
 #include <iterator>
-#include <nlohmann/json.hpp>
 #include <optional>
 
 #include "Command.h"
+#include "JsonObject.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/KernelSnapshot.h"
 #include "NANDInfo/parsers/ORUFTLParseBufferToCxt.h"
@@ -13,7 +13,6 @@
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
 #include "NANDInfo/parsers/VendorCounterParsers.h"
 #include "common/LittleEndian.h"
-#include "platform/host/documents/JsonForm.h"
 
 namespace vesprun {
 namespace {
@@ -86,17 +85,17 @@ constexpr const char* kSnapshot = "snapshot";
 /// Prints the whole 64-bit words of the thread's statistics.
 void printSnapshot(Buffer snapshot, const std::string& thread) {
   std::optional<Buffer> statistics;
-  nlohmann::ordered_json answer;
-  answer["found"] = getIOStatsWithThreadnameFromSnapData(snapshot, thread.c_str(), statistics);
-  answer["ioStatistics"] = nullptr;
+  const bool found = getIOStatsWithThreadnameFromSnapData(snapshot, thread.c_str(), statistics);
+  std::optional<PropertyValue> words;
   if (statistics) {
-    answer["ioStatistics"] = nlohmann::ordered_json::array();
-    for (std::size_t at = 0; at + sizeof(std::uint64_t) <= statistics->size();
-         at += sizeof(std::uint64_t)) {
-      answer["ioStatistics"].push_back(loadLittleEndian<std::uint64_t>(statistics->data() + at));
+    PropertyArray array;
+    for (Buffer rest = *statistics; rest.size() >= sizeof(std::uint64_t);
+         rest = rest.subspan(sizeof(std::uint64_t))) {
+      array.emplace_back(loadLittleEndian<std::uint64_t>(rest.data()));
     }
+    words = std::move(array);
   }
-  std::cout << answer.dump() << '\n';
+  std::cout << JsonObject().add("found", found).add("ioStatistics", words).text() << '\n';
 }
 
 struct Arguments {

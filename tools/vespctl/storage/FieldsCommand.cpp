@@ -16,9 +16,8 @@
 namespace vesprun {
 namespace {
 
-/// The words that select a list.
 struct List {
-  std::string name;
+  std::string name;  ///< the words that select it
   std::function<void()> print;
 };
 

@@ -14,8 +14,8 @@
 namespace vesprun {
 namespace {
 
-/// Sends what is printed to standard output to standard error as long as it lives: entry points
-/// print there, and would come between a reader and the result.
+/// Redirects standard output to standard error as long as it lives: lines that entry points print
+/// must not mix with the result.
 class StandardOutputAside {
  public:
   StandardOutputAside() : _kept(dup(STDOUT_FILENO)) {

@@ -3,7 +3,6 @@
 #include <limits>
 #include <random>
 #include <sstream>
-#include <thread>
 
 #include "platform/host/preferences/HostPreferences.h"
 #include "platform/host/services/HostClock.h"

@@ -52,39 +52,6 @@ PropertyDict everything() {
           {"list", PropertyArray{PropertyDict{{"in", 1}}, PropertyArray{}, PropertyDict{}, "x"}}};
 }
 
-TEST(PtreeWriter, WritesTabIndentedDocuments) {
-  EXPECT_EQ(ptreeOf(PropertyDict{{"name", "text"},
-                                 {"list", PropertyArray{std::uint8_t{7}, 2.0, 0.25F, true}},
-                                 {"empty", PropertyDict{}},
-                                 {"data", Bytes{1, 2, 3, 4}},
-                                 {"date", Date{1709630102, 0}},
-                                 {"text", "a<b>&\r\n"}}),
-            R"(<?xml version="1.0" encoding="UTF-8"?>
-<ptree version="1.0">
-<dict>
-	<key>name</key>
-	<string>text</string>
-	<key>list</key>
-	<array>
-		<integer>7</integer>
-		<real>2</real>
-		<real>0.25</real>
-		<true/>
-	</array>
-	<key>empty</key>
-	<dict/>
-	<key>data</key>
-	<data>AQIDBA==</data>
-	<key>date</key>
-	<date>2024-03-05T09:15:02Z</date>
-	<key>text</key>
-	<string>a&lt;b&gt;&amp;&#13;
-</string>
-</dict>
-</ptree>
-)");
-}
-
 TEST(PtreeWriter, NamesThePlaceOfWhatADocumentCannotCarry) {
   std::string document = "before";
   std::string error;

@@ -8,10 +8,10 @@
 
 namespace vesprun {
 
-/// The installed platform of a device that a command only looks at. Lines for the system log
-/// become the command's complaints.
-struct LookedAtDevice {
-  explicit LookedAtDevice(const std::string& directory, LogLevel least = LogLevel::Error)
+/// The device of a command that changes nothing on it, installed as the platform. Lines for the
+/// system log become the command's complaints.
+struct ReadOnlyDevice {
+  explicit ReadOnlyDevice(const std::string& directory, LogLevel least = LogLevel::Error)
       : complaints(nullptr, least),
         device(openDeviceReadOnly(directory, complaints)),
         installed(*device) {}
