@@ -5,6 +5,8 @@
 #include <string_view>
 #include <vector>
 
+#include "platform/host/documents/QuotedText.h"
+
 namespace vesprun {
 
 /// How deep dictionaries and arrays may nest, in ptree documents and in JSON.
@@ -14,11 +16,21 @@ inline constexpr const char* kNestedTooDeeply = "nested deeper than 200 levels";
 /// The path to a place in a value, collected from the inside out as a recursive walk returns.
 class NestedPlace {
  public:
-  void addOuter(std::string_view key);
-  void addOuter(std::size_t index);
+  void addOuter(std::string_view key) { _steps.push_back(quotedText(key)); }
+  void addOuter(std::size_t index) { _steps.push_back('[' + std::to_string(index) + ']'); }
 
   /// "STEP > STEP: MESSAGE" with the 8 outermost steps.
-  std::string with(const std::string& message) const;
+  std::string with(const std::string& message) const {
+    constexpr std::size_t kMostSteps = 8;
+    std::string text;
+    for (std::size_t step = 0; step < _steps.size() && step < kMostSteps; ++step) {
+      text += (step == 0 ? "" : " > ") + _steps[_steps.size() - 1 - step];
+    }
+    if (_steps.size() > kMostSteps) {
+      text += " > \xE2\x80\xA6";
+    }
+    return text.empty() ? message : text + ": " + message;
+  }
 
  private:
   std::vector<std::string> _steps;
