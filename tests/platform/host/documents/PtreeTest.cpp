@@ -190,9 +190,9 @@ TEST(PtreeReader, RefusesWhatTheGrammarDoesNotKnow) {
       {"more than one value", {"<true/><true/>"}},
       {"an element inside <string>", {"<string><true/></string>"}},
       {"malformed comment", {"<string>a<!-- b -- c --></string>", "<!-- a --->", "<!-- a"}},
-      {"DOCTYPE", {"<!DOCTYPE ptree><true/>"}},
-      {"CDATA", {"<string><![CDATA[a]]></string>"}},
-      {"processing instructions", {"<?php ?><true/>"}},
+      {"a ptree document has no DOCTYPE", {"<!DOCTYPE ptree><true/>"}},
+      {"a ptree document holds no CDATA sections", {"<string><![CDATA[a]]></string>"}},
+      {"a ptree document holds no processing instructions", {"<?php ?><true/>"}},
       {"<string> cannot have attributes", {"<string id=\"1\">a</string>"}},
       {"unknown element \"text\"", {"<text>a</text>"}},
       {"unknown element \"String\"", {"<String>a</String>"}},
@@ -206,13 +206,13 @@ TEST(PtreeReader, RefusesWhatTheGrammarDoesNotKnow) {
        {"<string>&#0;</string>", "<string>&#xD800;</string>", "<string>&#4294967361;</string>",
         "<string>&#;</string>", "<string>\x01</string>"}},
       {"malformed character reference", {"<string>&#X41;</string>", "<string>&#1a;</string>"}},
-      {"\"]]>\"", {"<string>a]]>b</string>"}},
+      {"\"]]>\" in a text", {"<string>a]]>b</string>"}},
       {"not UTF-8", {"<string>\xFF</string>"}},
-      {"\"\" is no integer", {"<integer></integer>"}},
+      {"\"\" is no integer of 64 bits", {"<integer></integer>"}},
       {"no integer",
        {"<integer>+1</integer>", "<integer> 1</integer>", "<integer>0x10</integer>",
         "<integer>-9223372036854775809</integer>", "<integer>18446744073709551616</integer>"}},
-      {"no real number",
+      {" is no real number that a double can hold",
        {"<real>1e999</real>", "<real>infinity</real>", "<real>0x1p3</real>", "<real>1.5 </real>",
         "<real/>"}},
       {"is not base64",
@@ -227,17 +227,30 @@ TEST(PtreeReader, RefusesWhatTheGrammarDoesNotKnow) {
 }
 
 TEST(PtreeReader, RefusesWhatIsNoPtreeDocument) {
-  for (const char* document :
-       {"", "plain", "<", "<ptree>", "<ptree version=\"1.0\"/>", "<ptreeversion=\"1.0\"><true/>",
-        "<ptree><true/></ptree>", "<ptree version=\"2.0\"><true/></ptree>",
-        "<ptree version=\"1.0\" x=\"y\"><true/></ptree>", "<dict></dict>", "<!-- a --><true/>",
-        "<?xml?><ptree version=\"1.0\">",
-        "<?xml version=\"1.1\"?><ptree version=\"1.0\"><true/></ptree>",
-        "<?xml version=\"1.0\" encoding=\"UTF-16\"?><ptree version=\"1.0\"><true/></ptree>",
-        "<?xml version=\"1.0\"encoding=\"UTF-8\"?><ptree version=\"1.0\"><true/></ptree>",
-        "<ptree version=\"1.0\"><true/></ptree><ptree version=\"1.0\"><true/></ptree>",
-        "<ptree version=\"1.0\"><true/></ptree>x", " <?xml version=\"1.0\"?>"}) {
-    EXPECT_THAT(readingError(document), StartsWith("line 1: ")) << document;
+  const std::pair<const char*, std::vector<const char*>> cases[] = {
+      {"line 1: the document does not begin with <ptree>",
+       {"", "plain", "<", "<ptreeversion=\"1.0\"><true/>", "<dict></dict>", "<!-- a --><true/>"}},
+      {"line 1: <ptree> does not say version=\"1.0\"",
+       {"<ptree>", "<ptree><true/></ptree>", "<ptree version=\"2.0\"><true/></ptree>"}},
+      {"line 1: a document without a value", {"<ptree version=\"1.0\"/>"}},
+      {"line 1: malformed <ptree> tag",
+       {"<ptree version=\"1.0\" x=\"y\"><true/></ptree>", "<ptree version=\"1.0\"/ >"}},
+      {"line 1: the XML declaration does not say version 1.0",
+       {"<?xml?><ptree version=\"1.0\">",
+        "<?xml version=\"1.1\"?><ptree version=\"1.0\"><true/></ptree>"}},
+      {"line 1: the encoding is not UTF-8",
+       {"<?xml version=\"1.0\" encoding=\"UTF-16\"?><ptree version=\"1.0\"><true/></ptree>"}},
+      {"line 1: malformed XML declaration",
+       {"<?xml version=\"1.0\"encoding=\"UTF-8\"?><ptree version=\"1.0\"><true/></ptree>"}},
+      {"line 1: something follows the end of the document",
+       {"<ptree version=\"1.0\"><true/></ptree><ptree version=\"1.0\"><true/></ptree>",
+        "<ptree version=\"1.0\"><true/></ptree>x"}},
+      {"line 1: a ptree document holds no processing instructions", {" <?xml version=\"1.0\"?>"}},
+  };
+  for (const auto& [message, documents] : cases) {
+    for (const char* document : documents) {
+      EXPECT_EQ(readingError(document), message) << document;
+    }
   }
   for (const char* trailing : {"x", "<ptree version=\"1.0\"/>", "<!-- a --><?x?>", "&amp;", "<!"}) {
     EXPECT_EQ(readingError(inPtree("<true/>") + "\n" + trailing),
