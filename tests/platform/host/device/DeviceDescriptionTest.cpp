@@ -22,6 +22,7 @@ TEST(DeviceDescription, NamesTheEntryThatIsWrong) {
       {R"({"userVolume": {"blockSize": -1, "blocks": 1, "available": 1}})",
        "userVolume.blockSize: out of range"},
       {R"({"apps": [{"bundle": "a", "user": true}, {"bundle": "b"}]})", "apps[1].user: missing"},
+      {R"({"apps": [{"bundle": "a", "user": 1}]})", "apps[0].user: not a boolean"},
       {R"({"kernel": {"variables": {"v": {"u32": 4294967296}}}})",
        "kernel.variables.v.u32: out of range"},
       {R"({"kernel": {"variables": {"v": {"u32": 1, "u64": 1}}}})",

@@ -60,17 +60,18 @@ TEST(JsonForm, NamesWhatItRefuses) {
       {"[1] 2", "line 1, column 5"},
       {"\"\xFF\"", "UTF-8"},
       {"{\"a\":[1,null]}", "\"a\" > [1]: null"},
-      {"[18446744073709551616]", "[0]: the integer 18446744073709551616 does not fit"},
+      {"[18446744073709551616]", "[0]: the integer 18446744073709551616 does not fit 64 bits"},
       {"-9223372036854775809", "does not fit"},
       {"{\"a\":[1e999]}", "\"a\" > [0]: number overflow"},
       {R"([{"a":1,"b":2,"a":3}])", "[0] > \"a\": there twice"},
-      {R"({"a":{"real":"Inf"}})", "\"a\": a \"real\" of \"Inf\""},
+      {R"({"a":{"real":"Inf"}})",
+       "\"a\": a \"real\" of \"Inf\" instead of \"inf\", \"-inf\" or \"nan\""},
       {R"([{"data":"A"}])", "[0]: \"A\" is not base64"},
       {R"({"date":"today"})", "\"today\" is not a date"},
-      {R"({"float":1e39})", "single precision"},
+      {R"({"float":1e39})", "a \"float\" that single precision cannot hold"},
       {std::string(201, '[') + std::string(201, ']'),
        "[0] > [0] > [0] > [0] > [0] > [0] > [0] > [0] > \xE2\x80\xA6: nested deeper than 200"},
-      {std::string(1'000'000, '['), "nested deeper than 200"}};
+      {std::string(1'000'000, '['), "nested deeper than 200 levels"}};
   for (const auto& [text, message] : cases) {
     std::string error;
     EXPECT_FALSE(valueFromJsonText(text, error)) << text.substr(0, 50);

@@ -112,7 +112,7 @@ TEST_F(MessageServiceTest, DropsOnlyThePeerThatSendsNoMessage) {
     shutdown(bad.get(), SHUT_WR);
     eventsUntilQuiet();
     EXPECT_TRUE(isEnded(bad));
-    EXPECT_THAT(log.messages, ElementsAre(HasSubstr(reason)));
+    EXPECT_THAT(log.messages, ElementsAre(HasSubstr("a peer is dropped: " + std::string(reason))));
   }
   EXPECT_THAT(received, ElementsAre("good"));
   send(staller, std::string_view(frame(text("late"))).substr(20));
