@@ -1,12 +1,11 @@
 #pragma once
 
 #include <CLI/CLI.hpp>
-#include <charconv>
 #include <concepts>
 #include <limits>
 #include <string>
-#include <system_error>
 
+#include "platform/host/documents/NumberText.h"
 #include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {
@@ -18,9 +17,7 @@ CLI::Validator decimal() {
   return CLI::Validator(
       [](std::string& text) {
         T number = 0;
-        const char* const end = text.data() + text.size();
-        const auto [rest, error] = std::from_chars(text.data(), end, number);
-        if (error != std::errc() || rest != end) {
+        if (!parseWholeText(text, number)) {
           return quotedText(text) + " is not a number from " +
                  std::to_string(std::numeric_limits<T>::min()) + " to " +
                  std::to_string(std::numeric_limits<T>::max());

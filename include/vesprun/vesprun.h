@@ -74,10 +74,10 @@ VESPRUN_EXPORT int vesprun_checkpoint(vesprun_device* device);
  * "CopyInternalLabNANDInfo" or "lab". `arguments` is a JSON object of the command's arguments, such
  * as {"hours":24,"raw":true}, or null for none.
  *
- * Returns {"result":VALUE,"error":TEXT}, to be released with `vesprun_free`: the value in the JSON
- * form of `vespctl`, null when there is none, and the first error text of the process or "NA". Null
- * when there is no such entry point or argument, or memory runs out. Calls from several threads
- * wait for each other. Some entry points print lines on the standard streams.
+ * Returns {"result":VALUE,"error":TEXT}, to be released with `vesprun_free`: the value, or null, in
+ * the JSON form of `vespctl`, and the first error text of the process or "NA". Returns a null
+ * pointer for an unknown entry point or argument, or when memory runs out. Calls from several
+ * threads wait for each other. Some entry points print lines on the standard streams.
  */
 VESPRUN_EXPORT char* vesprun_call(vesprun_device* device, const char* entry_point,
                                   const char* arguments);

@@ -38,7 +38,7 @@ std::span<const EntryPointRow> entryPoints();
 std::string callToJson(const EntryPointRow& entryPoint, std::span<const std::uint64_t> values);
 
 /// The same for an entry point by either name and a JSON object of its arguments. Nothing, with a
-/// text in `error`, when there is no such entry point or argument.
+/// text in `error`, for an unknown entry point or argument.
 std::optional<std::string> callByName(std::string_view name, std::string_view arguments,
                                       std::string& error);
 

@@ -10,7 +10,7 @@ namespace vesprun {
 /// The platform's codes for kinds of number in memory.
 enum class PVNumberType : std::uint32_t { Int8 = 1, Int64 = 4, Int = 9, Double = 13 };
 
-/// The value under `key`, or the 32-bit number 0 when there is none.
+/// The value under `key`, or the 32-bit number 0 if the key is missing.
 PropertyValue GetNumberFromDictionarySafe(const PropertyDict& dict, std::string_view key);
 
 /// Stores under `key` the number of that kind at `value`, aligned or not. A null `value` or an

@@ -74,7 +74,7 @@ class Tapline {
  public:
   virtual ~Tapline() = default;
 
-  /// The channels in any category of the mask; nothing when there are none. Selections are the
+  /// The channels in any category of the mask; nothing if it matches none. Selections are the
   /// platform's own: 1 and 0 select every such channel.
   virtual std::optional<TaplineChannels> TaplineCopyChannelsInCategories(
       std::uint64_t categoryMask, std::uint64_t firstSelection, std::uint64_t secondSelection) = 0;

@@ -36,7 +36,8 @@ std::optional<std::uint64_t> onlyIf(std::optional<std::uint64_t> number, Conditi
   return number && isMet(*number) ? number : std::nullopt;
 }
 
-/// Conditions of rows. Each is a number that the row's value may need; without it there is no row.
+/// Conditions of rows. Each is a number that the row's value may need; without it the row is left
+/// out.
 struct Gates {
   std::optional<std::uint64_t> always = 0;
   std::optional<std::uint64_t> corruptions =

@@ -199,7 +199,7 @@ Sight Device::look() const {
       std::istringstream lines(content);
       for (std::string line; std::getline(lines, line);) {
         const auto value = valueFromJsonText(line, error);
-        if (!value) {
+        if (!value || value->dict() == nullptr) {
           sight.faults.push_back(name + " has half a line: " + error);
           continue;
         }

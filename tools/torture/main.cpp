@@ -86,8 +86,9 @@ std::vector<Case> chosen(std::vector<Case> cases, const Options& options) {
   std::vector<Case> result;
   for (Case& one : cases) {
     const std::size_t before = ofKind[one.kind]++;
-    if (one.kind.empty() ? before % options.share == options.seed % options.share
-                         : before % options.share == 0) {
+    // Few are of one kind: of each the first is among them.
+    const std::size_t first = one.kind.empty() ? options.seed % options.share : 0;
+    if (before % options.share == first) {
       result.push_back(std::move(one));
     }
   }

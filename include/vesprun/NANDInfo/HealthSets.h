@@ -8,8 +8,8 @@ namespace vesprun {
 // Figures on the storage's health, from the current FTL fields. Keys begin with
 // "com.quill.NANDInfo.Health."; values are signed. "MaxPercentageNANDUsed", "MaxE2EErrors" (32
 // bits) and "HostReadErrors" (64) are never negative; "NumGrownBadBlocks", "SpareAvailablePercent"
-// and "NumDieFailures" (64) are -1 when unknown. Without FTL fields there are no figures, and the
-// error is recorded.
+// and "NumDieFailures" (64) are -1 when unknown. If the FTL fields cannot be read, the sets have no
+// figures and the error is recorded.
 
 /// For service plans: all but the spare blocks, with "HLT_APIErrorMessage".
 VESPRUN_EXPORT PropertyDict CopyTendmarkNANDInfo() noexcept;

@@ -16,8 +16,8 @@ struct ORUConnection {
 };
 
 /// Opens the storage controller. The exporter keeps the handle, even after closing. False, with
-/// lines on standard error and nothing left open, when there is no controller, it refuses, or it
-/// has no base statistics.
+/// lines on standard error and nothing left open, when no controller is found, the controller
+/// refuses, or it lacks base statistics.
 VESPRUN_EXPORT bool openORUConnection(ORUConnection& connection) noexcept;
 
 /// Closes the connection and releases the service, if there are any, and sets both to 0.

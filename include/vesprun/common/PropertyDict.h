@@ -46,7 +46,7 @@ class PropertyDict {
   PropertyDict& operator=(PropertyDict&&) noexcept = default;
   ~PropertyDict() = default;
 
-  /// Null if there is none. Valid until the dictionary is changed.
+  /// Null for a missing key. Valid until the dictionary is changed.
   const PropertyValue* find(std::string_view key) const {
     if (_many) {
       const auto entry = _many->find(key);
@@ -68,7 +68,7 @@ class PropertyDict {
     return find(key, &PropertyValue::string);
   }
   const Number* findNumber(std::string_view key) const { return find(key, &PropertyValue::number); }
-  /// A number as a 64-bit integer, `otherwise` when there is none.
+  /// The key's number as a 64-bit integer, or `otherwise` if it has none.
   std::int64_t integerOr(std::string_view key, std::int64_t otherwise) const {
     const Number* number = findNumber(key);
     return number != nullptr ? number->asInt64() : otherwise;

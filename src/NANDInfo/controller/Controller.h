@@ -12,7 +12,7 @@ class Controller {
   Controller() : _service(findNandExporter(_exporter)) {}
   ~Controller() { close(); }
 
-  /// False when the controller refuses, or when there is none; that line begins with `complainer`.
+  /// False when the controller refuses, or none is found; that line begins with `complainer`.
   bool open(const char* complainer = "");
   /// False when closing fails; true also without a connection.
   bool close();

@@ -40,7 +40,7 @@ struct nand_exporter_t {
   const char* propertyKey;              ///< registry property of the characteristics
   RegistryHandle connection;            ///< user client, see `findNandExporterNew`
   RegistryHandle service;               ///< its service, see `findNandExporterNew`
-  std::uint32_t contentDeletionMethod;  ///< `kMethodNotOffered` when there is none
+  std::uint32_t contentDeletionMethod;  ///< or `kMethodNotOffered`
   std::uint32_t tunnelSizeMethod;
   std::uint32_t tunnelDataMethod;
   SelectorGetter getStatsSelectors;          ///< base statistics

@@ -191,20 +191,23 @@ bool importCounterLines(std::istream& lines, CounterStore& counters, std::string
   using Result = LineReader::Result;
   LineReader reader(lines, kLongestLine);
   SampleBuffer samples(counters);
+  const auto fail = [&](const std::string& cause) {
+    error = "line " + std::to_string(reader.number()) + ": " + cause;
+    return false;
+  };
   std::string_view line;
-  Result result = reader.next(line);
-  for (; result == Result::Line && importLine(line, counters, samples, error);
-       result = reader.next(line)) {
+  std::string cause;
+  Result result{};
+  while ((result = reader.next(line)) == Result::Line) {
+    if (!importLine(line, counters, samples, cause)) {
+      return fail(cause);
+    }
   }
-  if (result == Result::End) {
-    samples.flush();
-    return true;
+  if (result != Result::End) {
+    return fail(result == Result::TooLong ? "longer than 2 MiB" : std::strerror(errno));
   }
-  if (result != Result::Line) {
-    error = result == Result::TooLong ? "longer than 2 MiB" : std::strerror(errno);
-  }
-  error.insert(0, "line " + std::to_string(reader.number()) + ": ");
-  return false;
+  samples.flush();
+  return true;
 }
 
 bool exportCounterLines(CounterStore& counters, std::int32_t firstDay, std::int32_t lastDay,

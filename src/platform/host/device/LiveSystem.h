@@ -20,9 +20,9 @@ std::optional<KernelVariable> swapUsage();
 /// "kern.bootsessionuuid", in upper case.
 std::optional<KernelVariable> bootSessionIdentifier();
 
-std::string machineIdentifier();  ///< empty when there is none
+std::string machineIdentifier();  ///< empty without one
 std::string hardwareModel();      ///< the architecture, for example "x86_64"
-std::string newIdentifier();      ///< a random UUID in upper case
+std::string newIdentifier();      ///< a random UUID in upper case; empty without /proc
 
 /// The file system of a path; nothing when it cannot be measured.
 std::optional<FileSystemStatistics> volume(const std::string& path);

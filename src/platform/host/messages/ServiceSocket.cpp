@@ -38,7 +38,7 @@ const sockaddr* generic(const sockaddr_un& address) {
   return reinterpret_cast<const sockaddr*>(&address);
 }
 
-/// Of whoever had the folder's lock, which is ours now.
+/// Removes the socket of that name, if any. Call with the folder's lock: then nobody uses it.
 bool removeSocket(int folder, const std::string& name) {
   struct stat status {};
   if (fstatat(folder, name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) {
