@@ -25,6 +25,8 @@ struct Scenario {
       cases;
 };
 
-std::vector<Scenario> scenarios();
+/// Of the daily run, and of `vespctl` commands.
+std::vector<Scenario> dailyScenarios();
+std::vector<Scenario> commandScenarios();
 
 }  // namespace vesprun::torture

@@ -10,6 +10,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
+#include <iterator>
 #include <map>
 #include <stdexcept>
 #include <thread>
@@ -108,7 +109,9 @@ int torture(const Options& options) {
     throw std::runtime_error(std::string("mmap: ") + std::strerror(errno));
   }
   Counts& total = *new (shared) Counts{};
-  for (const Scenario& scenario : scenarios()) {
+  std::vector<Scenario> scenarios = dailyScenarios();
+  std::ranges::move(commandScenarios(), std::back_inserter(scenarios));
+  for (const Scenario& scenario : scenarios) {
     if (!options.only.empty() && total.tried != 0) {
       break;
     }

@@ -1,18 +1,13 @@
-#include "Scenarios.h"
-
-#include <sys/syscall.h>
-
 #include <algorithm>
 #include <array>
 #include <cstring>
-#include <iterator>
 #include <map>
 #include <memory>
 #include <random>
 #include <set>
 #include <sstream>
 
-#include "TracedRun.h"
+#include "Faults.h"
 #include "platform/host/documents/PtreeReader.h"
 
 namespace vesprun::torture {
@@ -20,7 +15,6 @@ namespace {
 
 namespace fs = std::filesystem;
 
-using Faults = std::vector<std::string>;
 constexpr const char* kDailyLog = "-193-log-aggregated.ptree";
 
 /// What a day and the next one leave behind when nothing goes wrong.
@@ -30,11 +24,6 @@ struct Reference {
   Sight before;
   Sight after;
 };
-
-Faults& operator+=(Faults& faults, const Faults& more) {
-  faults.insert(faults.end(), more.begin(), more.end());
-  return faults;
-}
 
 // A later start on the same day, and the first one of the next.
 Faults finishTheDays(Device& device) {
@@ -73,21 +62,6 @@ std::vector<std::string> dailyLogs(const Sight& sight) {
     }
   }
   return logs;
-}
-
-Faults missingFrom(const std::vector<std::string>& wanted, const std::vector<std::string>& there,
-                   const std::string& what) {
-  Faults faults;
-  const std::set<std::string_view> known(there.begin(), there.end());
-  for (const std::string& one : wanted) {
-    if (!known.contains(one)) {
-      faults.push_back(what + ": " + one.substr(0, 200));
-    }
-  }
-  if (faults.size() > 3) {
-    faults.resize(3);
-  }
-  return faults;
 }
 
 // Growth that an earlier day missed is counted by a later one, so days are added up.
@@ -136,27 +110,6 @@ Faults judge(const Sight& sight, const Reference& reference, bool whole) {
     faults += missingFrom(reference.after.counters, sight.counters, "a row is missing");
     faults += missingFrom(sight.counters, reference.after.counters, "a row is too much");
     faults += missingFrom(dailyLogs(reference.after), logs, "a day's log is missing");
-  }
-  return faults;
-}
-
-/// `started`: not while the loader was at work. `worst`: the highest exit status that is promised.
-Faults judgeRun(const Outcome& outcome, bool killed, bool started, int worst = 0) {
-  Faults faults;
-  if (outcome.late) {
-    faults.push_back("took longer than " + std::to_string(kLongestRun) + " seconds");
-  } else if (!killed && started && outcome.signal != 0) {
-    faults.push_back(std::string("ended by a signal: ") + strsignal(outcome.signal) + "; " +
-                     outcome.standardError);
-  } else if (!killed && started && outcome.status > worst) {
-    faults.push_back("exit status " + std::to_string(outcome.status) + "; " +
-                     outcome.standardError);
-  }
-  std::istringstream lines(outcome.standardError);
-  for (std::string line; std::getline(lines, line);) {
-    if (lacksCause(line)) {
-      faults.push_back("it does not say why: " + line);
-    }
   }
   return faults;
 }
@@ -256,49 +209,6 @@ std::shared_ptr<Reference> makeReference(const Programs& programs, const fs::pat
   }
   reference->calls = std::move(outcome.calls);
   return reference;
-}
-
-// Before it the system's loader is at work, and what fails there keeps the program from starting.
-// Its last act is to let go of its list of libraries.
-std::size_t firstOwnCall(const std::vector<Call>& calls) {
-  const auto last = std::ranges::find(calls, SYS_munmap, &Call::number);
-  return static_cast<std::size_t>(last - calls.begin()) + 1;
-}
-
-using RunWithFault = std::function<Faults(const fs::path& work, const Fault& fault, bool started)>;
-
-/// Each call fails in one way (`full`: in every way), with `alsoShort` transfers half, and is the
-/// last one.
-std::vector<Case> faultsOfCalls(const std::string& name, const std::vector<Call>& calls,
-                                std::uint32_t seed, bool full, bool alsoShort,
-                                const RunWithFault& run) {
-  const std::size_t own = firstOwnCall(calls);
-  std::vector<Case> cases;
-  std::mt19937 random(seed);
-  for (std::size_t index = 0; index < calls.size(); ++index) {
-    const int number = calls[index].number;
-    const bool started = index >= own;
-    const auto add = [&](const std::string& what, Fault fault) {
-      fault.call = index + 1;
-      const bool isError = started && fault.kind == Fault::Kind::Error;
-      cases.push_back({name + what + ":" + nameOfCall(number) + ":" + std::to_string(index + 1),
-                       [=](const fs::path& work) { return run(work, fault, started); },
-                       isError ? nameOfCall(number) + ' ' + calls[index].path : std::string()});
-    };
-    const std::vector<int>& errors = fittingErrors(number);
-    const std::size_t one = errors.empty() ? 0 : random() % errors.size();
-    for (std::size_t each = 0; each < errors.size(); ++each) {
-      if (full || each == one) {
-        add(strerrorname_np(errors[each]),
-            {.kind = Fault::Kind::Error, .number = number, .error = errors[each]});
-      }
-    }
-    if (alsoShort && started && transfersBytes(number)) {
-      add("short", {.kind = Fault::Kind::Short, .number = number});
-    }
-    add("kill", {.kind = Fault::Kind::Kill});
-  }
-  return cases;
 }
 
 std::vector<Case> failingCalls(const Programs& programs, const fs::path& folder, std::uint32_t seed,
@@ -403,205 +313,6 @@ std::vector<Case> neighbours(const Programs& programs, const fs::path& folder, s
           {neighbour.name + " beside call " + std::to_string(call),
            [=](const fs::path& work) { return runBeside(*reference, work, call, neighbour); }});
     }
-  }
-  return cases;
-}
-
-/// A `vespctl` command on a device; `judge` says what is wrong after a run with a fault.
-struct Command {
-  std::string name;
-  std::shared_ptr<Device> original;
-  std::vector<std::string> words;
-  std::function<Faults(Device& device, const Outcome& outcome, bool killed)> judge;
-};
-
-Faults runCommand(const Command& command, const fs::path& folder, const Fault& fault,
-                  bool started) {
-  Device device(*command.original, folder);
-  const bool killed = fault.kind == Fault::Kind::Kill;
-  const Outcome outcome = runTraced(device.controlCommand(command.words), device.path(), fault);
-  Faults faults = judgeRun(outcome, killed, started, 1);
-  if (outcome.status == 1 && outcome.standardError.empty()) {
-    faults.emplace_back("it failed without a word");
-  }
-  faults += command.judge(device, outcome, killed);
-  if (!faults.empty()) {
-    faults.push_back("the fault came at: " + outcome.place);
-  }
-  return faults;
-}
-
-std::vector<Case> casesOf(const Command& command, const fs::path& folder, std::uint32_t seed,
-                          bool full) {
-  Device device(*command.original, folder / "reference");
-  const Outcome reference = runTraced(device.controlCommand(command.words), device.path());
-  Faults wrong = reference.notDurable;
-  wrong += judgeRun(reference, false, true);
-  wrong += command.judge(device, reference, false);
-  if (!wrong.empty()) {
-    throw std::runtime_error(command.name + " without any fault: " + wrong.front());
-  }
-  return faultsOfCalls(command.name + ":", reference.calls, seed, full, false,
-                       [=](const fs::path& work, const Fault& fault, bool started) {
-                         return runCommand(command, work, fault, started);
-                       });
-}
-
-/// All lines or none, and never "done" without them.
-std::vector<Case> importsInto(const std::shared_ptr<Device>& original, const std::string& name,
-                              const fs::path& folder, std::uint32_t seed, bool full) {
-  std::string rows;
-  for (int row = 0; row < 300; ++row) {
-    rows += "scalar\t" + std::to_string(kFirstDay) + "\thost.imported." + std::to_string(row) +
-            "\t" + std::to_string(row) + '\n';
-  }
-  writeFile(original->path() + "/rows", rows);
-  const std::vector<std::string> words{"counters", "import", original->path() + "/rows"};
-  const std::vector<std::string> before = original->look().counters;
-  Device device(*original, folder / "imported");
-  std::string output;
-  device.control(words, output);
-  const std::vector<std::string> after = device.look().counters;
-  const auto judge = [=](Device& changed, const Outcome& outcome, bool /*killed*/) {
-    const Sight sight = changed.look();
-    Faults faults = sight.faults;
-    if (sight.counters != before && sight.counters != after) {
-      faults.emplace_back("some lines are there and some are not");
-    }
-    if (outcome.status == 0 && sight.counters != after) {
-      faults.emplace_back("it said done, and nothing is there");
-    }
-    return faults;
-  };
-  return casesOf({name, original, words, judge}, folder, seed, full);
-}
-
-std::vector<Case> imports(const Programs& programs, const fs::path& folder, std::uint32_t seed,
-                          bool full) {
-  const auto original = std::make_shared<Device>(programs, folder / "imports");
-  std::vector<Case> cases = importsInto(original, "import", folder, seed, full);
-  const auto emptied = std::make_shared<Device>(*original, folder / "emptied");
-  const std::string database =
-      emptied->path() + "/var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
-  fs::rename(database, database + "-journal");  // which must not be played into the new file
-  std::ranges::move(importsInto(emptied, "first import", folder, seed, full),
-                    std::back_inserter(cases));
-  return cases;
-}
-
-/// Recorded files of a small machine that has counted for `hours`.
-void recordMachine(const fs::path& root, std::uint64_t hours) {
-  const std::string n = std::to_string(hours * 3600);
-  const std::string ticks = std::to_string(hours * 360000);
-  writeFile(root / "proc/sys/kernel/random/boot_id", "6f0c1e2d-0000-4000-8000-000000000001\n");
-  writeFile(root / "proc/uptime", n + ".00 " + n + ".00\n");
-  writeFile(root / "proc/stat", "cpu  " + ticks + " 0 " + ticks + " " + ticks + " 0 0 0 0 0 0\n" +
-                                    "ctxt " + n + "\nprocesses " + n + "\n");
-  writeFile(root / "proc/meminfo", "MemTotal: 9000000 kB\nMemAvailable: 4000000 kB\n");
-  writeFile(root / "proc/vmstat", "pgpgin " + n + "\npgpgout " + n + "\noom_kill 3\n");
-  writeFile(root / "proc/pressure/io",
-            "some avg10=0.00 avg60=0.00 avg300=0.00 total=" + n +
-                "000\nfull avg10=0.00 avg60=0.00 avg300=0.00 total=" + n + "000\n");
-  for (const char* disk : {"sda", "sdb"}) {
-    const fs::path block = root / "sys/block" / disk;
-    writeFile(block / "stat", n + " 0 " + n + " 1 " + n + " 0 " + n + " 1 0 " + n + " 2\n");
-    writeFile(block / "diskseq", "1\n");
-  }
-  const fs::path statistics = root / "sys/class/net/eth0/statistics";
-  for (const char* name : {"rx_bytes", "tx_bytes", "rx_packets", "tx_packets"}) {
-    writeFile(statistics / name, n + '\n');
-  }
-  writeFile(root / "sys/class/net/eth0/ifindex", "2\n");
-  writeFile(root / "sys/class/thermal/thermal_zone0/type", "cpu\n");
-  writeFile(root / "sys/class/thermal/thermal_zone0/temp", "41000\n");
-}
-
-/// Growth is counted once, whichever of three collections fails.
-std::vector<Case> collections(const Programs& programs, const fs::path& folder, std::uint32_t seed,
-                              bool full) {
-  const auto original = std::make_shared<Device>(programs, folder / "collections");
-  const auto stage = [=](int number) {
-    return (folder / ("machine-" + std::to_string(number))).string();
-  };
-  for (int number = 1; number <= 3; ++number) {
-    const auto growth = static_cast<std::uint64_t>(number);
-    recordMachine(stage(number), growth * growth);
-  }
-  const auto collect = [=](Device& device, int number) {
-    Faults faults;
-    std::string output;
-    if (device.control({"collect", "--root", stage(number)}, output) != 0) {
-      faults.push_back("a collection failed: " + output);
-    }
-    return faults;
-  };
-  const auto figures = [](const Sight& sight) {
-    std::vector<std::string> rows = sight.counters;
-    std::erase_if(rows, [](const std::string& row) {
-      return !row.starts_with("scalar") || row.find("\tlinux.") == std::string::npos;
-    });
-    return rows;
-  };
-  collect(*original, 1);
-  Device device(*original, folder / "collected");
-  collect(device, 2);
-  collect(device, 3);
-  const std::vector<std::string> expected = figures(device.look());
-  const auto judge = [=](Device& changed, const Outcome& /*outcome*/, bool /*killed*/) {
-    Faults faults = collect(changed, 3);
-    const Sight sight = changed.look();
-    faults += sight.faults;
-    faults += missingFrom(expected, figures(sight), "growth is not what it was");
-    faults += missingFrom(figures(sight), expected, "growth from nowhere");
-    return faults;
-  };
-  return casesOf({"collect", original, {"collect", "--root", stage(2)}, judge}, folder, seed, full);
-}
-
-/// Whatever happened to one prune, the next one leaves the same behind, and so does a run after it.
-std::vector<Case> prunes(const Programs& programs, const fs::path& folder, std::uint32_t seed,
-                         bool full) {
-  constexpr int kLater = kFirstDay + 40;
-  const auto original = std::make_shared<Device>(programs, folder / "prunes");
-  original->runDaily();
-  original->setDay(kLater);
-  std::string output;
-  for (const int day : {kLater - 35, kLater - 1}) {
-    original->control({"counters", "set", "host.memory.MemFree", "7", "--day", std::to_string(day)},
-                      output);
-  }
-  original->control({"run", "--", "-f"}, output);
-  const std::vector<std::string> words{"prune", "--counters", "30", "--outbox", "30"};
-  const auto end = [=](Device& device) {
-    std::string printed;
-    std::string found = std::to_string(device.control(words, printed));
-    for (const char* const file : {"pruned.jsonl", "events.jsonl", "records.jsonl"}) {
-      found += readFile(device.path() + "/outbox/" + file);
-    }
-    for (const auto& [name, content] : device.look().logs) {
-      found += name + '\n';
-    }
-    found += std::to_string(device.control({"run", "--", "-f"}, printed));
-    for (const char* const command : {"counters dump", "export --device d"}) {
-      std::istringstream stream(command);
-      device.control({std::istream_iterator<std::string>(stream), {}}, printed);
-      found += printed;
-    }
-    return found;
-  };
-  Device device(*original, folder / "pruned");
-  const std::string expected = end(device);
-  const auto judge = [=](Device& changed, const Outcome& /*outcome*/, bool /*killed*/) {
-    return end(changed) == expected ? Faults() : Faults{"the next prune ends otherwise"};
-  };
-  std::vector<Case> cases = casesOf({"prune", original, words, judge}, folder, seed, full);
-  if (!full) {  // between two of these calls, nothing on the device changes
-    std::erase_if(cases, [](const Case& one) {
-      constexpr const char* kChanging[] = {"write",   "sync:", ":unlink",
-                                           ":rename", ":link", "trunc"};
-      return std::ranges::none_of(
-          kChanging, [&one](const char* call) { return one.name.find(call) != std::string::npos; });
-    });
   }
   return cases;
 }
@@ -721,14 +432,11 @@ std::vector<Case> years(const Programs& programs, const fs::path& folder, std::u
 
 }  // namespace
 
-std::vector<Scenario> scenarios() {
+std::vector<Scenario> dailyScenarios() {
   return {
       {"every call of a daily run fails or is its last", failingCalls},
       {"the disk gets full during a daily run", fullDisk},
       {"others write during a daily run", neighbours},
-      {"every call of an import fails or is its last", imports},
-      {"every call of a collection fails or is its last", collections},
-      {"every call of a prune fails or is its last", prunes},
       {"files are damaged", damages},
       {"the clock jumps through ten years", years},
   };
