@@ -18,7 +18,8 @@ constexpr std::int64_t kSchemaVersion = 1;
 constexpr int kNewestFormat = 2;  // of SQLite's files
 constexpr std::size_t kLongestKey = 1024 * 1024;
 
-// Pages of 16 KiB: a chunk of samples is read by few calls.
+// Pages of 16 KiB: a chunk of samples is read by few calls. Files are compared with this text,
+// spaces included.
 constexpr const char* kSchema = R"(
   PRAGMA page_size = 16384;
   PRAGMA auto_vacuum = INCREMENTAL;
@@ -44,6 +45,16 @@ constexpr const char* kSchema = R"(
   PRAGMA application_id = 0x56455350;
   PRAGMA user_version = 1;
 )";
+
+constexpr const char* kMarkTable =
+    "CREATE TABLE IF NOT EXISTS mark (place TEXT PRIMARY KEY, device INTEGER NOT "
+    "NULL, value INTEGER NOT NULL, text TEXT NOT NULL) STRICT, WITHOUT ROWID";
+
+bool isOurs(const std::string& schema) {
+  static const std::string withoutMarks = schemaOf(kSchema);
+  static const std::string withMarks = schemaOf(std::string(kSchema) + kMarkTable);
+  return schema == withoutMarks || schema == withMarks;
+}
 
 /// `wrapping_sum` in statements: one look-up of the row is enough to add to it.
 void sumInStatement(sqlite3_context* context, int /*count*/, sqlite3_value** values) {
@@ -119,9 +130,15 @@ void CounterStore::open() {
     _connection.failAsCorrupt("the header is damaged");
   }
   _connection.execute(_access == Access::Writing ? "BEGIN IMMEDIATE" : "BEGIN");
+  // A view or trigger in place of our tables could do anything, or never end.
+  if (!isOurs(_connection.schema())) {
+    _connection.failAsCorrupt("its tables are not those of a counter database");
+  }
 }
 
 std::string CounterStore::emptyDatabase() { return newSqliteFile(kSchema); }
+
+void CounterStore::makeMarkTable() { _connection.execute(kMarkTable); }
 
 CounterStore::Writer& CounterStore::writer() {
   if (!_writer) {

@@ -54,6 +54,9 @@ class CounterStore {
 
   const SqliteConnection& connection() const { return _connection; }
 
+  /// Makes the table `mark` (place, device, value, text), unless it is there.
+  void makeMarkTable();
+
   // Keys are those that `isCounterKey` allows.
 
   void setScalar(std::int32_t day, std::string_view key, std::int64_t value);

@@ -6,7 +6,14 @@ namespace vesprun {
 namespace {
 
 // Our cells are far smaller; a damaged one may claim any size.
-constexpr int kLongestCell = 16 * 1024 * 1024;
+constexpr int kMaxCell = 16 * 1024 * 1024;
+constexpr int kMaxStatement = 64 * 1024;
+
+// Steps of SQLite's machine. Our longest statements, over all rows, take some tens a row.
+constexpr int kStepsCounted = 1000;
+constexpr std::int64_t kMaxOpeningWork = 2;  // some hundred tables
+constexpr std::int64_t kMinAllowedWork = 200'000;
+constexpr std::int64_t kBytesPerWork = 10;
 
 /// SQLite's own file system with one difference: SQLite treats a read that fails with EIO as
 /// damage; here it stays a read error. The one to look with also leaves all files alone: SQLite
@@ -96,6 +103,7 @@ bool SqliteFailure::isCorruption() const {
     case SQLITE_MISMATCH:
     case SQLITE_TOOBIG:
     case SQLITE_CONSTRAINT:  // rows that contradict the schema
+    case SQLITE_INTERRUPT:   // too much work
       return true;
     default:
       return false;
@@ -118,12 +126,31 @@ SqliteConnection::SqliteConnection(const std::string& path, std::chrono::millise
   sqlite3_busy_timeout(database, static_cast<int>(longestWait.count()));
   sqlite3_db_config(database, SQLITE_DBCONFIG_DEFENSIVE, 1, nullptr);
   sqlite3_db_config(database, SQLITE_DBCONFIG_TRUSTED_SCHEMA, 0, nullptr);
-  sqlite3_limit(database, SQLITE_LIMIT_LENGTH, kLongestCell);
+  sqlite3_limit(database, SQLITE_LIMIT_LENGTH, kMaxCell);
+  sqlite3_limit(database, SQLITE_LIMIT_SQL_LENGTH, kMaxStatement);
+  _workLeft = std::make_unique<std::int64_t>(kMaxOpeningWork);
+  sqlite3_progress_handler(database, kStepsCounted, countWork, _workLeft.get());
   // EXTRA: the end of a transaction is the removal of its journal, which must be durable too.
   execute("PRAGMA cell_size_check = ON; PRAGMA synchronous = EXTRA; PRAGMA mmap_size = 0");
+  sqlite3_file* file = nullptr;
+  sqlite3_int64 size = 0;
+  if (sqlite3_file_control(database, "main", SQLITE_FCNTL_FILE_POINTER, &file) == SQLITE_OK &&
+      file->pMethods != nullptr && file->pMethods->xFileSize(file, &size) != SQLITE_OK) {
+    size = 0;
+  }
+  _allowedWork = kMinAllowedWork + size / kBytesPerWork;
 }
 
+void SqliteConnection::allowWork() const {
+  if (_allowedWork != 0) {
+    *_workLeft = _allowedWork;
+  }
+}
+
+int SqliteConnection::countWork(void* left) { return --*static_cast<std::int64_t*>(left) < 0; }
+
 void SqliteConnection::execute(const char* sql) {
+  allowWork();
   const int result = sqlite3_exec(handle(), sql, nullptr, nullptr, nullptr);
   if (result != SQLITE_OK) {
     fail(result);
@@ -133,6 +160,19 @@ void SqliteConnection::execute(const char* sql) {
 std::int64_t SqliteConnection::queryInteger(const char* sql) {
   SqliteStatement statement(*this, sql);
   return statement.step() ? statement.integer(0) : 0;
+}
+
+std::string SqliteConnection::schema() const {
+  SqliteStatement rows(*this,
+                       "SELECT quote(type), quote(name), quote(tbl_name), quote(sql) "
+                       "FROM sqlite_schema ORDER BY name");
+  std::string text;
+  while (rows.step()) {
+    for (int column = 0; column < 4; ++column) {
+      text.append(rows.text(column)).append(column < 3 ? " " : "\n");
+    }
+  }
+  return text;
 }
 
 void SqliteConnection::commit() {
@@ -168,6 +208,9 @@ void SqliteConnection::fail(int code) const {
   if ((code & 0xFF) == SQLITE_BUSY) {
     throw SqliteFailure{code, _path + ": another process keeps it locked"};
   }
+  if ((code & 0xFF) == SQLITE_INTERRUPT) {
+    throw SqliteFailure{code, _path + ": takes more work than its size explains"};
+  }
   const bool ofThisCall = handle() != nullptr && sqlite3_extended_errcode(handle()) == code;
   throw SqliteFailure{
       code, _path + ": " + (ofThisCall ? sqlite3_errmsg(handle()) : sqlite3_errstr(code))};
@@ -177,9 +220,9 @@ void SqliteConnection::failAsCorrupt(const std::string& what) const {
   throw SqliteFailure{SQLITE_CORRUPT, _path + ": " + what};
 }
 
-std::string newSqliteFile(const char* schema) {
+std::string newSqliteFile(const std::string& statements) {
   SqliteConnection database(":memory:", std::chrono::milliseconds::zero());
-  database.execute(schema);
+  database.execute(statements.c_str());
   sqlite3_int64 size = 0;
   const std::unique_ptr<unsigned char, decltype(&sqlite3_free)> bytes(
       sqlite3_serialize(database.handle(), "main", &size, 0), sqlite3_free);
@@ -187,6 +230,12 @@ std::string newSqliteFile(const char* schema) {
     database.fail(SQLITE_NOMEM);
   }
   return {reinterpret_cast<const char*>(bytes.get()), static_cast<std::size_t>(size)};
+}
+
+std::string schemaOf(const std::string& statements) {
+  SqliteConnection database(":memory:", std::chrono::milliseconds::zero());
+  database.execute(statements.c_str());
+  return database.schema();
 }
 
 SqliteStatement::SqliteStatement(const SqliteConnection& connection, const char* sql)
@@ -214,6 +263,9 @@ SqliteStatement& SqliteStatement::bind(int parameter, std::span<const std::uint8
 }
 
 bool SqliteStatement::step() {
+  if (sqlite3_stmt_busy(_statement.get()) == 0) {
+    _connection.allowWork();
+  }
   const int result = sqlite3_step(_statement.get());
   if (result == SQLITE_ROW) {
     return true;

@@ -23,7 +23,9 @@ struct SqliteFailure {
   bool isBusy() const { return (code & 0xFF) == SQLITE_BUSY; }
 };
 
-/// An open SQLite database that distrusts its content. System errors never count as damage.
+/// An open SQLite database that distrusts its content. System errors never count as damage; a
+/// statement that takes more steps than the file's size explains does, such as one on a view
+/// without end, or one in a file whose pages lead in circles.
 class SqliteConnection {
  public:
   SqliteConnection() = default;
@@ -41,6 +43,11 @@ class SqliteConnection {
   /// The result of a one-row query.
   std::int64_t queryInteger(const char* sql);
 
+  /// The tables, indexes, views and triggers, as text that is equal for equal ones. Nothing in the
+  /// file is run for it. To be compared within the transaction that relies on it, and before any
+  /// other statement names a table.
+  std::string schema() const;
+
   /// Without a commit the transaction ends with the connection.
   void commit();
 
@@ -48,6 +55,9 @@ class SqliteConnection {
   int formatVersion() const;
 
   sqlite3* handle() const { return _database.get(); }
+
+  /// A statement begins.
+  void allowWork() const;
 
   [[noreturn]] void fail(int code) const;
   [[noreturn]] void failAsCorrupt(const std::string& what) const;
@@ -57,13 +67,20 @@ class SqliteConnection {
     void operator()(sqlite3* database) const { sqlite3_close_v2(database); }
   };
 
+  static int countWork(void* left);
+
   std::string _path;
   bool _looks = false;
+  std::int64_t _allowedWork = 0;
+  std::unique_ptr<std::int64_t> _workLeft;  ///< of the statement, in calls of `countWork`
   std::unique_ptr<sqlite3, Close> _database;
 };
 
 /// The file of a database that the statements make. Throws `SqliteFailure`.
-std::string newSqliteFile(const char* schema);
+std::string newSqliteFile(const std::string& statements);
+
+/// What `SqliteConnection::schema` gives for such a file. Throws `SqliteFailure`.
+std::string schemaOf(const std::string& statements);
 
 /// A prepared statement. Every operation throws `SqliteFailure`. A column of another type than the
 /// schema's counts as corruption.

@@ -25,10 +25,6 @@ constexpr const char* kBootPlace = "boot";
 using Marks = std::map<std::string, Mark>;
 
 Marks readMarks(const SqliteConnection& connection) {
-  SqliteStatement(connection,
-                  "CREATE TABLE IF NOT EXISTS mark (place TEXT PRIMARY KEY, device INTEGER NOT "
-                  "NULL, value INTEGER NOT NULL, text TEXT NOT NULL) STRICT, WITHOUT ROWID")
-      .run();
   SqliteStatement rows(connection, "SELECT place, device, value, text FROM mark");
   Marks marks;
   while (rows.step()) {
@@ -174,6 +170,7 @@ class Collection {
 std::vector<std::string> collectFigures(CounterStore& store, const std::string& root,
                                         const Date& now) {
   // Read within the transaction: no other process can have counted a later reading.
+  store.makeMarkTable();
   const Marks last = readMarks(store.connection());
   Collection collection(last, readFigures(root, [](const LinuxFigure&) { return true; }));
   collection.addTo(store, now);
