@@ -18,7 +18,8 @@ class ProgramTest : public ::testing::Test {
   int runScript(const std::string& script) {
     const std::string start = "cd '" + folder.path() + "'; ";
     folder.write("script", start + script);
-    const int status = std::system((start + "bash script >output 2>error").c_str());
+    // The shell has its say on a locale that the system does not know.
+    const int status = std::system((start + "LC_ALL=C TZ=UTC bash script >output 2>error").c_str());
     output = folder.read("output");
     error = folder.read("error");
     return WIFEXITED(status) ? WEXITSTATUS(status) : -1;

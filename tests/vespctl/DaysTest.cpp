@@ -23,8 +23,9 @@ class DaysTest : public VespctlTest {
 
   void setTime(const std::string& time, const std::string& submission = "{}") {
     folder.write("device/device.json",
-                 R"({"system": {"osVersion": "1"}, "registry": [], "submission": )" + submission +
-                     R"(, "clock": ")" + time + "\"}");
+                 R"({"system": {"osVersion": "1"}, "registry": [], "timeZone": "UTC",
+                     "kernel": {"variables": {"kern.bootsessionuuid": "0"}}, "submission": )" +
+                     submission + R"(, "clock": ")" + time + "\"}");
   }
 
   /// Scalars of these days.
