@@ -337,7 +337,6 @@ class Tracer {
       switch (pending.number) {
         case SYS_write:
         case SYS_pwrite64:
-        case SYS_ftruncate:
           _durability.written(pending.from);
           break;
         case SYS_fsync:
