@@ -67,6 +67,7 @@ const Options* optionsOf(std::string_view key, const WhitelistDecision<Options>&
 }  // namespace
 
 std::unique_ptr<TBConfig> TBConfig::init() {
+  TBIsInternalDevice();  // asked before the file is read, whether there is one or not
   const std::optional<std::string> bytes = readWhitelist();
   if (!bytes) {
     logMessage(LogLevel::Error, "Couldn't load whitelist");

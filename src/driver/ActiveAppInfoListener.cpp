@@ -48,7 +48,8 @@ void takeActiveAppInfo(const PropertyDict& message) {
     log.write(LogLevel::Default, text);
   }
   if (aaiRequested) {
-    runDayCheck(&list);
+    // Served whatever becomes of the check: another one would do the day's work again.
+    runGuarded([&list] { runDayCheck(&list); });
     aaiRequested = false;
   }
 }

@@ -40,8 +40,10 @@ void runCommandLine(std::span<const char* const> commandLine) {
 }  // namespace
 
 void runListenerMode(double quietSeconds) {
-  const std::unique_ptr<ServiceListener> listener =
-      platform().messageService().createListener(kServiceName, handlePeerMessage);
+  std::unique_ptr<ServiceListener> listener;
+  runGuarded([&listener] {
+    listener = platform().messageService().createListener(kServiceName, handlePeerMessage);
+  });
   auto result = MainLoop::SliceResult::HandledEvent;
   // A failed slice has probably used up its event, such as a message too large to read.
   for (int failures = 0; result == MainLoop::SliceResult::HandledEvent && failures < kMostFailures;

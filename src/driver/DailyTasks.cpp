@@ -58,8 +58,10 @@ void runDayCheck(const AppInfoList* appInfo) {
     const std::int32_t day = yesterday();
     if (isStillDue(day)) {
       runTasks(day, appInfo);
-      platform().preferences().LGSPreferencesSetValue(kStoredDayKey, day, kOwnDomain);
-      platform().preferences().LGSPreferencesSynchronize(kOwnDomain);
+      runGuarded([day] {
+        platform().preferences().LGSPreferencesSetValue(kStoredDayKey, day, kOwnDomain);
+        platform().preferences().LGSPreferencesSynchronize(kOwnDomain);
+      });
       return;
     }
   }

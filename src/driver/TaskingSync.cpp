@@ -131,8 +131,7 @@ void synchronize(DomainSet changed) {
   }
 }
 
-void noteOSChange(const OptionalValue& build) {
-  const std::int32_t today = platform().tallybook().TBDaysSince1970();
+void noteOSChange(const OptionalValue& build, std::int32_t today) {
   const OptionalValue lastBuild = entryOf(storedValue(kLastUpdateKey), "version");
   if (!build || build == lastBuild) {
     return;
@@ -213,12 +212,12 @@ PropertyArray distinctEntries(const PropertyArray& entries) {
 }
 
 void announceDisabledLogs() {
+  PropertyArray disabled = platform().systemConfiguration().getLogBlacklist();
   const OptionalValue preferred =
       platform().preferences().LGSPreferencesGetValue("disabledLogs", "com.quill.da");
-  const PropertyArray* chosen = preferred ? preferred->array() : nullptr;
-  const PropertyArray disabled = chosen != nullptr
-                                     ? distinctEntries(*chosen)
-                                     : platform().systemConfiguration().getLogBlacklist();
+  if (preferred && preferred->array() != nullptr) {
+    disabled = distinctEntries(*preferred->array());
+  }
   for (const PropertyValue& logType : disabled) {
     platform().eventHub().EventHubSendEventLazy("com.quill.logsmith.disabledLogs", [&logType] {
       return PropertyDict{{"bugType", logType}};
@@ -229,9 +228,10 @@ void announceDisabledLogs() {
 }  // namespace
 
 void syncTaskingAndOSChange() {
+  const std::int32_t today = platform().tallybook().TBDaysSince1970();
   const PropertyDict version = platform().logsmith().CopySystemVersionDictionary();
   const OptionalValue build = entryOf(version, "ProductBuildVersion");
-  noteOSChange(build);
+  noteOSChange(build, today);
   syncTasking(build);
   announceDisabledLogs();
 }

@@ -34,7 +34,8 @@ class PtreeSerialization {
   /// False, with the place in `error`, when the dictionary holds a string that XML cannot carry.
   virtual bool canSerialize(const PtreeDocument& document, std::string& error) = 0;
 
-  /// Hands the text of a document that can be serialized to `sink`, piece by piece.
+  /// Hands the text of a document that can be serialized to `sink`, in one piece
+  /// when it has at most 1 MiB, else in pieces of about that size.
   virtual void serialize(const PtreeDocument& document, const Sink& sink) = 0;
 
   /// The MD5 digest (RFC 1321) of a document or any other bytes.

@@ -30,32 +30,44 @@ std::uint64_t read64OrAllOnes(const char* name) {
 
 double gibibytes(std::uint64_t bytes) { return static_cast<double>(bytes) * 0x1p-30; }
 
-/// The number if it meets the condition, else nothing.
-template <typename Condition>
-std::optional<std::uint64_t> onlyIf(std::optional<std::uint64_t> number, Condition isMet) {
-  return number && isMet(*number) ? number : std::nullopt;
+using Number64 = std::optional<std::uint64_t>;
+
+/// The condition of neighbouring rows: a number that their values may need; without it they are
+/// left out. It is evaluated once, when the first of them is due, and knows the number of the
+/// condition before it.
+using Gate = Number64 (*)(const Number64& before);
+
+Number64 always(const Number64& /*before*/) { return 0; }
+
+Number64 corruptions(const Number64& /*before*/) {
+  const auto total = readVariable<std::uint32_t>("vm.vmtc_total");
+  return total && *total != 0 ? Number64(*total) : std::nullopt;
 }
 
-/// Conditions of rows. Each is a number that the row's value may need; without it the row is left
-/// out.
-struct Gates {
-  std::optional<std::uint64_t> always = 0;
-  std::optional<std::uint64_t> corruptions =
-      onlyIf(readVariable<std::uint32_t>("vm.vmtc_total"), [](auto total) { return total != 0; });
-  std::optional<std::uint64_t> pageouts = read64("kern.memorystatus_freeze_pageouts");
-  std::optional<std::uint64_t> bytesPagedOut =
-      onlyIf(platform().kernel().pageSize() * pageouts.value_or(0),
-             [](auto bytes) { return gibibytes(bytes) >= 1.0; });
-  std::optional<std::uint64_t> considered =
-      read64("kern.memorystatus_freezer_process_considered_count");
-  std::optional<std::uint64_t> belowThreshold =
-      read64("kern.memorystatus_freezer_below_threshold_count");
-  std::optional<std::uint64_t> refreezes =
-      onlyIf(read64("kern.memorystatus_freezer_refreeze_count"), [](auto count) {
-        // All ones is a failed read.
-        return count >= 10 && count != std::numeric_limits<std::uint64_t>::max();
-      });
-};
+Number64 pageouts(const Number64& /*before*/) {
+  return read64("kern.memorystatus_freeze_pageouts");
+}
+
+Number64 bytesPagedOut(const Number64& pageouts) {
+  const std::uint64_t bytes = pageouts ? platform().kernel().pageSize() * *pageouts : 0;
+  return gibibytes(bytes) >= 1.0 ? Number64(bytes) : std::nullopt;
+}
+
+Number64 considered(const Number64& /*before*/) {
+  return read64("kern.memorystatus_freezer_process_considered_count");
+}
+
+Number64 belowThreshold(const Number64& /*before*/) {
+  return read64("kern.memorystatus_freezer_below_threshold_count");
+}
+
+Number64 refreezes(const Number64& /*before*/) {
+  const Number64 count = read64("kern.memorystatus_freezer_refreeze_count");
+  // All ones is a failed read.
+  return count && *count >= 10 && *count != std::numeric_limits<std::uint64_t>::max()
+             ? count
+             : std::nullopt;
+}
 
 /// How a row's value is made from its variable and its gate's number.
 enum class Value {
@@ -70,52 +82,51 @@ enum class Value {
 
 struct Row {
   const char* key;
-  std::optional<std::uint64_t> Gates::*gate;
+  Gate gate;
   Value value;
   const char* variable;
 };
 
 using enum Value;
 constexpr Row kRows[] = {
-    {"com.quill.kernel.vmtc_total", &Gates::corruptions, Read32, "vm.vmtc_total"},
-    {"com.quill.kernel.vmtc_one_bit_flip", &Gates::corruptions, Read32, "vm.vmtc_one_bit_flip"},
-    {"com.quill.kernel.vmtc_not_found", &Gates::corruptions, Read32, "vm.vmtc_not_found"},
-    {"com.quill.kernel.vmtc_1_byte", &Gates::corruptions, Read32, "vm.vmtc_1_byte"},
-    {"com.quill.kernel.vmtc_2_byte", &Gates::corruptions, Read32, "vm.vmtc_2_byte"},
-    {"com.quill.kernel.vmtc_4_byte", &Gates::corruptions, Read32, "vm.vmtc_4_byte"},
-    {"com.quill.kernel.vmtc_8_byte", &Gates::corruptions, Read32, "vm.vmtc_8_byte"},
-    {"com.quill.kernel.vmtc_16_byte", &Gates::corruptions, Read32, "vm.vmtc_16_byte"},
-    {"com.quill.kernel.vmtc_32_byte", &Gates::corruptions, Read32, "vm.vmtc_32_byte"},
-    {"com.quill.kernel.vmtc_64_byte", &Gates::corruptions, Read32, "vm.vmtc_64_byte"},
-    {"com.quill.kernel.vmtc_128_byte", &Gates::corruptions, Read32, "vm.vmtc_128_byte"},
-    {"com.quill.kernel.vmtc_256_byte", &Gates::corruptions, Read32, "vm.vmtc_256_byte"},
-    {"com.quill.kernel.vmtc_undiagnosed", &Gates::corruptions, Read32, "vm.vmtc_undiagnosed"},
-    {"com.quill.kernel.memorystatus_freeze_count", &Gates::always, Read32,
+    {"com.quill.kernel.vmtc_total", corruptions, Read32, "vm.vmtc_total"},
+    {"com.quill.kernel.vmtc_one_bit_flip", corruptions, Read32, "vm.vmtc_one_bit_flip"},
+    {"com.quill.kernel.vmtc_not_found", corruptions, Read32, "vm.vmtc_not_found"},
+    {"com.quill.kernel.vmtc_1_byte", corruptions, Read32, "vm.vmtc_1_byte"},
+    {"com.quill.kernel.vmtc_2_byte", corruptions, Read32, "vm.vmtc_2_byte"},
+    {"com.quill.kernel.vmtc_4_byte", corruptions, Read32, "vm.vmtc_4_byte"},
+    {"com.quill.kernel.vmtc_8_byte", corruptions, Read32, "vm.vmtc_8_byte"},
+    {"com.quill.kernel.vmtc_16_byte", corruptions, Read32, "vm.vmtc_16_byte"},
+    {"com.quill.kernel.vmtc_32_byte", corruptions, Read32, "vm.vmtc_32_byte"},
+    {"com.quill.kernel.vmtc_64_byte", corruptions, Read32, "vm.vmtc_64_byte"},
+    {"com.quill.kernel.vmtc_128_byte", corruptions, Read32, "vm.vmtc_128_byte"},
+    {"com.quill.kernel.vmtc_256_byte", corruptions, Read32, "vm.vmtc_256_byte"},
+    {"com.quill.kernel.vmtc_undiagnosed", corruptions, Read32, "vm.vmtc_undiagnosed"},
+    {"com.quill.kernel.memorystatus_freeze_count", always, Read32,
      "kern.memorystatus_freeze_count"},
-    {"com.quill.kernel.memorystatus_freeze_pageouts", &Gates::pageouts, GateNumber, ""},
-    {"com.quill.memorystatus_freezer_thaws_per_gb", &Gates::bytesPagedOut, PerGibibyte,
+    {"com.quill.kernel.memorystatus_freeze_pageouts", pageouts, GateNumber, ""},
+    {"com.quill.memorystatus_freezer_thaws_per_gb", bytesPagedOut, PerGibibyte,
      "kern.memorystatus_thaw_count_since_boot"},
-    {"com.quill.kernel.memorystatus_freeze_budget_pages_remaining", &Gates::always, Read64,
+    {"com.quill.kernel.memorystatus_freeze_budget_pages_remaining", always, Read64,
      "kern.memorystatus_freeze_budget_pages_remaining"},
-    {"com.quill.kernel.memorystatus_thaw_count", &Gates::always, Read32,
-     "kern.memorystatus_thaw_count"},
-    {"com.quill.kernel.swapusage", &Gates::always, SwapTotal, "vm.swapusage"},
-    {"com.quill.memorystatus_freezer_error_no_compressor_space_count", &Gates::considered,
-     Percentage, "kern.memorystatus_freezer_error_no_compressor_space_count"},
-    {"com.quill.memorystatus_freezer_error_no_swap_space_count", &Gates::considered, Percentage,
+    {"com.quill.kernel.memorystatus_thaw_count", always, Read32, "kern.memorystatus_thaw_count"},
+    {"com.quill.kernel.swapusage", always, SwapTotal, "vm.swapusage"},
+    {"com.quill.memorystatus_freezer_error_no_compressor_space_count", considered, Percentage,
+     "kern.memorystatus_freezer_error_no_compressor_space_count"},
+    {"com.quill.memorystatus_freezer_error_no_swap_space_count", considered, Percentage,
      "kern.memorystatus_freezer_error_no_swap_space_count"},
-    {"com.quill.memorystatus_freezer_error_below_min_pages_count", &Gates::considered, Percentage,
+    {"com.quill.memorystatus_freezer_error_below_min_pages_count", considered, Percentage,
      "kern.memorystatus_freezer_error_below_min_pages_count"},
-    {"com.quill.memorystatus_freezer_error_low_probability_of_use_count", &Gates::considered,
-     Percentage, "kern.memorystatus_freezer_error_low_probability_of_use_count"},
-    {"com.quill.memorystatus_freezer_error_other_count", &Gates::considered, Percentage,
+    {"com.quill.memorystatus_freezer_error_low_probability_of_use_count", considered, Percentage,
+     "kern.memorystatus_freezer_error_low_probability_of_use_count"},
+    {"com.quill.memorystatus_freezer_error_other_count", considered, Percentage,
      "kern.memorystatus_freezer_error_other_count"},
-    {"com.quill.memorystatus_freezer_process_considered_count", &Gates::considered, GateNumber, ""},
-    {"com.quill.memorystatus_freezer_skipped_full_count", &Gates::belowThreshold, Percentage,
+    {"com.quill.memorystatus_freezer_process_considered_count", considered, GateNumber, ""},
+    {"com.quill.memorystatus_freezer_skipped_full_count", belowThreshold, Percentage,
      "kern.memorystatus_freezer_skipped_full_count"},
-    {"com.quill.memorystatus_freezer_thaw_percentage", &Gates::always, Read64,
+    {"com.quill.memorystatus_freezer_thaw_percentage", always, Read64,
      "kern.memorystatus_freezer_thaw_percentage"},
-    {"com.quill.memorystatus_freezer_refreeze_average", &Gates::refreezes, Quotient,
+    {"com.quill.memorystatus_freezer_refreeze_average", refreezes, Quotient,
      "kern.memorystatus_freezer_bytes_refrozen"},
 };
 static_assert(std::size(kRows) == 28);
@@ -156,9 +167,14 @@ std::vector<std::string_view> vmStatisticKeys() {
 }
 
 void reportVMStats(TBReport& report) {
-  const Gates gates;
+  Gate gate = nullptr;
+  Number64 number;
   for (const Row& row : kRows) {
-    if (const std::optional<std::uint64_t>& number = gates.*row.gate) {
+    if (row.gate != gate) {
+      gate = row.gate;
+      number = gate(number);
+    }
+    if (number) {
       report.addScalarForKeyByExecutingBlock(row.key, [&] { return valueOf(row, *number); });
     }
   }

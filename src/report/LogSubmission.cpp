@@ -41,9 +41,10 @@ bool submitDailyLog(const PropertyDict& document, const AppInfoList* appInfo) {
     return false;
   }
   Preferences& preferences = platform().preferences();
+  const std::optional<PropertyValue> last =
+      preferences.LGSPreferencesGetValue(kLastOSVersionKey, kOwnDomain);
   const PropertyValue osVersion = platform().logsmith().LGSOSVersion();
-  const PropertyDict header =
-      headerOf(preferences.LGSPreferencesGetValue(kLastOSVersionKey, kOwnDomain), osVersion);
+  const PropertyDict header = headerOf(last, osVersion);
   if (!header.empty()) {
     preferences.LGSPreferencesSetValue(kLastOSVersionKey, osVersion, kOwnDomain);
     preferences.LGSPreferencesSynchronize(kOwnDomain);

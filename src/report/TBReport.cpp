@@ -94,6 +94,9 @@ std::optional<PropertyDict> TBReport::makeDocument(std::int32_t day, SideEffects
   addOwnSources(sideEffects);
   const std::string whitelistDigest = _config ? _config->configFileDigest() : "";
   _config.reset();
+  PropertyValue identifier = preferenceOr(kTaskingIDKey, "(no tasking id)");
+  PropertyValue digest = preferenceOr(kTaskingDigestKey, "(no tasking digest)");
+  PropertyValue payload = preferenceOr(kTaskingPayloadKey, PropertyArray());
   PropertyDict document;
   document.set("TBCrashLogVersion", 1);
   document.set("TBStartDate", platform().tallybook().dateForDaysSince1970(day));
@@ -102,9 +105,9 @@ std::optional<PropertyDict> TBReport::makeDocument(std::int32_t day, SideEffects
   document.set("TBScalars", std::exchange(_scalarsOutput, {}));
   document.set("TBDistributions", std::exchange(_distributionsOutput, {}));
   document.set("TBDistributionsHistogram", std::exchange(_histogramsOutput, {}));
-  document.set("TBTasking", preferenceOr(kTaskingPayloadKey, PropertyArray()));
-  document.set("TBTaskID", preferenceOr(kTaskingIDKey, "(no tasking id)"));
-  document.set("TBTaskDigest", preferenceOr(kTaskingDigestKey, "(no tasking digest)"));
+  document.set("TBTasking", std::move(payload));
+  document.set("TBTaskID", std::move(identifier));
+  document.set("TBTaskDigest", std::move(digest));
   document.set("TBWhitelistDigest", whitelistDigest);
   return document;
 }

@@ -118,14 +118,17 @@ std::string joinedFields(const PropertyDict& fields) {
 
 std::string logText(const std::string& date, const PropertyDict& fields) {
   DeviceInformation& device = platform().deviceInformation();
-  const std::string record = date + ' ' + device.processName() + '[' +
-                             std::to_string(device.processIdentifier()) +
-                             "]: " + joinedFields(fields) + '\n';
-  return "System ID: " + device.GetSysIDWithDescription(false) +
-         "\nHardware Model: " + device.GetHardwareModel() +
-         "\nOS Version: " + device.GetSystemVersion() + "\nDate: " + date +
-         "\nIncident ID: " + device.GetIncidentID() + "\nFaultline Key: " + GetFaultlineKey() +
-         "\n\n" + record;
+  std::string record = date + ' ' + device.processName();
+  record += '[' + std::to_string(device.processIdentifier()) + "]: ";
+  record += joinedFields(fields) + '\n';
+  // One by one: a sum may ask in any order.
+  std::string text = "System ID: " + device.GetSysIDWithDescription(false);
+  text += "\nHardware Model: " + device.GetHardwareModel();
+  text += "\nOS Version: " + device.GetSystemVersion();
+  text += "\nDate: " + date;
+  text += "\nIncident ID: " + device.GetIncidentID();
+  text += "\nFaultline Key: " + GetFaultlineKey();
+  return text + "\n\n" + record;
 }
 
 bool wasLoggedLately(const Date& now) {

@@ -32,7 +32,7 @@ namespace vesprun {
 /// line, and the work continues. Lasting locks, permissions, full disks and other system errors are
 /// not damage: an error line names them, and unwritten changes stay collected. Several processes
 /// may use the database at once.
-class HostTallybook final : public Tallybook {
+class HostTallybook : public Tallybook {
  public:
   /// The references must outlive the object. An operation waits `longestWait` at most for other
   /// processes.

@@ -23,7 +23,7 @@ constexpr const char* kStart =
     "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
     "<ptree version=\"1.0\">\n";
 constexpr const char* kEnd = "</ptree>\n";
-constexpr std::size_t kPieceSize = 64 * 1024;
+constexpr std::size_t kPieceSize = 1 << 20;
 
 /// Walks through a value, as far as a document can carry it, and writes it line by line.
 class TreeWalk {

@@ -30,7 +30,7 @@ struct PreferenceFolder {
 ///
 /// Users and domains become parts of paths: empty names and names with a leading dot, a slash or
 /// NUL are refused with an error in the system log (once for a domain) and read as empty.
-class HostPreferences final : public Preferences {
+class HostPreferences : public Preferences {
  public:
   /// The preferences of a user in var/USER/Library/Preferences. The references must outlive the
   /// object; the log is written from several threads. `LGSPreferencesSynchronize` waits

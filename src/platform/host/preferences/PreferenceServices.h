@@ -39,7 +39,7 @@ class HostServicesClient final : public LGSServicesClient {
 };
 
 /// Documents in Library/Logsmith.
-class HostSystemConfiguration final : public LGSSystemConfiguration {
+class HostSystemConfiguration : public LGSSystemConfiguration {
  public:
   HostSystemConfiguration(const DeviceDescription& description, const DeviceDirectory& device,
                           Clock& clock, SystemLog& log)

@@ -12,7 +12,7 @@
 namespace vesprun {
 
 /// The described answers, or else those of Linux.
-class HostDeviceInformation final : public DeviceInformation {
+class HostDeviceInformation : public DeviceInformation {
  public:
   HostDeviceInformation(const DeviceDescription& description, const DeviceDirectory& directory)
       : _description(description), _directory(directory) {}

@@ -16,7 +16,7 @@
 namespace vesprun {
 
 /// The described kernel variables and figures, or those of Linux.
-class HostKernel final : public Kernel {
+class HostKernel : public Kernel {
  public:
   HostKernel(const DeviceDescription& description, const DeviceDirectory& directory, SystemLog& log)
       : _description(description), _directory(directory), _log(log), _eccEvents(directory, log) {}

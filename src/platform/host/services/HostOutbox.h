@@ -17,7 +17,7 @@ namespace vesprun {
 
 /// The folder `outbox`: everything that the program gives to the platform, until someone collects
 /// it. Failures go to the system log. Safe from any thread.
-class HostOutbox final : public EventHub, public Logsmith {
+class HostOutbox : public EventHub, public Logsmith {
  public:
   HostOutbox(const DeviceDirectory& directory, const DeviceDescription& description, Clock& clock,
              SystemLog& log)
