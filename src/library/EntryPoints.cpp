@@ -105,7 +105,9 @@ constexpr EntryPointRow kEntryPoints[] = {
     {"structured-log", "DumpStorageStructuredLog",
      "Logs the controller's lists: true when all could be handled",
      [](Values values) {
-       gForceCollectionSet = values[1] != 0 ? 1 : 0;
+       if (values[1] != 0) {  // else it stays as a program has set it
+         gForceCollectionSet = 1;
+       }
        return answer(DumpStorageStructuredLog(values[0] != 0));
      },
      kStructuredLog},
