@@ -1,8 +1,7 @@
 #include "config/KeyOptions.h"
 
 #include <algorithm>
-
-#include "common/TextForm.h"
+#include <cmath>
 
 namespace vesprun {
 namespace {
@@ -40,10 +39,27 @@ bool DistributionOptions::operator==(const DistributionOptions& other) const {
   if (intervals == nullptr || other.intervals == nullptr) {
     return intervals == other.intervals;
   }
-  // As labels show them: there NaN equals NaN.
-  return std::equal(
-      intervals->begin(), intervals->end(), other.intervals->begin(), other.intervals->end(),
-      [](const auto& left, const auto& right) { return textForm(left) == textForm(right); });
+  return std::equal(intervals->begin(), intervals->end(), other.intervals->begin(),
+                    other.intervals->end(), [](const auto& left, const auto& right) {
+                      const bool areNaN = std::isnan(left.number()->asDouble()) &&
+                                          std::isnan(right.number()->asDouble());
+                      return areNaN || left == right;
+                    });
+}
+
+EntryMetadata EntryMetadata::read(const PropertyDict* options, const PropertyDict* about) {
+  EntryMetadata metadata;
+  for (const PropertyDict* from : {about, options}) {
+    if (from != nullptr) {
+      const auto take = [](const auto* found, auto& member) {
+        member = found != nullptr ? found : member;
+      };
+      take(from->findString(kOwner), metadata.owner);
+      take(from->findString(kReason), metadata.reason);
+      take(from->findDate(kExpires), metadata.expires);
+    }
+  }
+  return metadata;
 }
 
 }  // namespace vesprun

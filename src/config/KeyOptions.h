@@ -2,6 +2,7 @@
 
 #include <cstdint>
 #include <optional>
+#include <string>
 #include <string_view>
 
 #include "common/PropertyDict.h"
@@ -22,6 +23,10 @@ struct ScalarOptions {
   std::optional<std::uint64_t> bucketInterval;     ///< "bucket_interval"
   std::optional<std::uint64_t> significantDigits;  ///< "sig_fig"
 
+  static bool isRead(std::string_view name) {
+    return name == kBucketInterval || name == kSignificantDigits;
+  }
+
   /// Nothing when an entry is not a number; booleans are not.
   static std::optional<ScalarOptions> read(const PropertyDict& options);
 
@@ -35,11 +40,45 @@ struct DistributionOptions {
 
   const PropertyArray* intervals = nullptr;  ///< "intervals", in the dictionary; null: absent
 
+  static bool isRead(std::string_view name) { return name == kIntervals; }
+
   /// Nothing when "intervals" is not an array of numbers.
   static std::optional<DistributionOptions> read(const PropertyDict& options);
 
-  /// Whether every value gets the same bucket and label.
+  /// Boundaries compare by value, in their order; NaN equals NaN.
   bool operator==(const DistributionOptions& other) const;
 };
+
+/// Who wants an entry, why and until when. The report does not read it.
+struct EntryMetadata {
+  static constexpr std::string_view kOwner = "owner";
+  static constexpr std::string_view kReason = "reason";
+  static constexpr std::string_view kExpires = "expires";
+  /// A group's dictionary of the three, for its entries that do not say otherwise.
+  static constexpr std::string_view kAbout = "About";
+
+  static bool isName(std::string_view name) {
+    return name == kOwner || name == kReason || name == kExpires;
+  }
+
+  const std::string* owner = nullptr;
+  const std::string* reason = nullptr;
+  const Date* expires = nullptr;
+
+  /// Those of the options as written, else those of "About"; both may be null. What is not of its
+  /// kind counts as absent.
+  static EntryMetadata read(const PropertyDict* options, const PropertyDict* about);
+};
+
+/// The first option that nothing reads in a list of that kind; null when there is none.
+template <typename Options>
+const PropertyKey* unreadOption(const PropertyDict& options) {
+  for (const auto& [name, value] : options) {
+    if (!Options::isRead(name) && !EntryMetadata::isName(name)) {
+      return &name;
+    }
+  }
+  return nullptr;
+}
 
 }  // namespace vesprun

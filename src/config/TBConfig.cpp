@@ -11,8 +11,6 @@
 namespace vesprun {
 namespace {
 
-constexpr const char* kWhitelistPath =
-    "/Library/Application Support/Tallybook/Whitelist_Stagebox.ptree";
 constexpr std::uint64_t kMostBytes = 256 << 20;
 
 std::optional<bool> gIsInternalDevice;
@@ -28,10 +26,11 @@ bool TBIsInternalDevice() {
 
 std::optional<std::string> readWhitelist() {
   FileSystem& fileSystem = platform().fileSystem();
-  if (fileSystem.fileSize(kWhitelistPath).value_or(0) > kMostBytes) {
+  const std::string path = TBConfig::path();
+  if (fileSystem.fileSize(path).value_or(0) > kMostBytes) {
     return std::nullopt;
   }
-  return fileSystem.readFile(kWhitelistPath);
+  return fileSystem.readFile(path);
 }
 
 template <typename Entries>
@@ -48,6 +47,34 @@ void reportHeldBack(std::string_view list, const Entries& entries) {
                "Whitelist: %s: options of %zu keys cannot be read, which are left out; the first "
                "is %s",
                list.data(), count, first.c_str());
+  }
+}
+
+template <typename Options>
+void reportUnread(std::string_view list, const typename WhitelistTable<Options>::Entries& entries) {
+  std::size_t count = 0;
+  const PropertyKey* option = nullptr;
+  const WhitelistEntry<Options>* first = nullptr;
+  std::string_view firstKey;
+  for (const auto& [key, entry] : entries) {
+    const PropertyDict* written = entry.written->dict();
+    const PropertyKey* unread = written != nullptr ? unreadOption<Options>(*written) : nullptr;
+    if (unread == nullptr) {
+      continue;
+    }
+    ++count;
+    if (first == nullptr || entry.place < first->place) {
+      option = unread;
+      first = &entry;
+      firstKey = key;
+    }
+  }
+  if (count > 0) {
+    logMessage(LogLevel::Error,
+               "Whitelist: %s: %zu keys have options that nothing reads, so they leave as if these "
+               "were not there; the first is %s in group %s with %s",
+               list.data(), count, std::string(firstKey).c_str(), std::string(first->group).c_str(),
+               option->c_str());
   }
 }
 
@@ -112,6 +139,10 @@ TBConfig::TBConfig(PropertyValue document)
   reportHeldBack(DistributionOptions::kKeyList, distributions.keys());
   reportHeldBack(ScalarOptions::kPrefixList, scalars.prefixes());
   reportHeldBack(DistributionOptions::kPrefixList, distributions.prefixes());
+  reportUnread<ScalarOptions>(ScalarOptions::kKeyList, scalars.keys());
+  reportUnread<DistributionOptions>(DistributionOptions::kKeyList, distributions.keys());
+  reportUnread<ScalarOptions>(ScalarOptions::kPrefixList, scalars.prefixes());
+  reportUnread<DistributionOptions>(DistributionOptions::kPrefixList, distributions.prefixes());
 }
 
 void TBConfig::takeGroup(const WhitelistKeyGroup& group) {

@@ -28,9 +28,15 @@ struct PassedOverGroup {
 ///
 /// Groups and tables that are not dictionaries are skipped with an error line. A key or prefix with
 /// unreadable options is held back, even on an internal device or from a prefix; each table gets
-/// one error line, with the number of them and the first. A file above 256 MiB is not read.
+/// one error line, with the number of them and the first. So does each with options that nothing
+/// reads, which leave a value as exact as if they were not there. A file above 256 MiB is not read.
 class TBConfig {
  public:
+  /// Where a device has its whitelist.
+  static constexpr std::string_view kFolder = "/Library/Application Support/Tallybook";
+  static constexpr std::string_view kFile = "Whitelist_Stagebox.ptree";
+  static std::string path() { return std::string(kFolder).append("/").append(kFile); }
+
   /// From the whitelist file, or the bytes of one. Null, with an error line, when it cannot be read
   /// or parsed.
   static std::unique_ptr<TBConfig> init();

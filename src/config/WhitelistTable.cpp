@@ -13,7 +13,8 @@ void WhitelistTable<Options>::take(std::string_view group, std::string_view list
     const PropertyDict* options = written.dict();
     table.insert_or_assign(
         key, WhitelistEntry<Options>{group, &written,
-                                     options != nullptr ? Options::read(*options) : std::nullopt});
+                                     options != nullptr ? Options::read(*options) : std::nullopt,
+                                     _taken++});
   }
 }
 

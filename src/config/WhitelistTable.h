@@ -21,6 +21,7 @@ struct WhitelistEntry {
   std::string_view group;          ///< the last one that names it
   const PropertyValue* written;    ///< its options as they stand there
   std::optional<Options> options;  ///< nothing when they cannot be read: held back
+  std::size_t place;               ///< among the taken entries of all groups
 };
 
 enum class DecidedBy { Nothing, Key, Prefix, InternalDevice };
@@ -78,6 +79,7 @@ class WhitelistTable {
   WhitelistDecision<Options> decideByPrefix(std::string_view key) const;
 
  private:
+  std::size_t _taken = 0;
   Entries _keys;
   mutable std::size_t _expected = 0;  ///< the place after the last key that was found
   Entries _prefixes;

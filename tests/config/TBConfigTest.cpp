@@ -110,6 +110,24 @@ TEST(TBConfig, HoldsBackWhatItCannotRead) {
   EXPECT_EQ(config->configOptionsForDistributionKey("e"), nullptr);
 }
 
+TEST(TBConfig, TellsOfOptionsThatNothingReads) {
+  TestDevice device;
+  device.writeWhitelistJson(R"({"A": {
+      "ScalarKeys": {"later": {}, "a": {"sigfig": 2, "x": 1}, "mended": {"sigfig": 2},
+                     "told": {"owner": 1, "reason": [], "expires": "", "sig_fig": 1}},
+      "DistributionKeys": {"d": {"sig_fig": 2}}, "DistributionKeyPrefixes": {"d.": {"intervals": []}}},
+    "InternalTesting": {"ScalarKeyPrefixes": {"p.": {"intervals": []}}},
+    "B": {"About": {"x": 1}, "ScalarKeys": {"later": {"interval": 5}, "mended": {}}}})");
+  TBConfig::init();
+  const std::string rest =
+      " keys have options that nothing reads, so they leave as if these were "
+      "not there; the first is ";
+  EXPECT_THAT(
+      device.log(),
+      ElementsAre("error: Whitelist: ScalarKeys: 2" + rest + "a in group A with sigfig",
+                  "error: Whitelist: DistributionKeys: 1" + rest + "d in group A with sig_fig"));
+}
+
 TEST(TBConfig, FailsOnAnyFileThatIsNoWhitelist) {
   TestDevice device;
   EXPECT_EQ(TBConfig::init(), nullptr);

@@ -215,7 +215,8 @@ std::optional<std::vector<WhitelistFinding>> checkWhitelist(std::string_view byt
   std::vector<WrittenList> lists;
   std::vector<WrittenEntry> entries;
   // Entries come before the list that holds them, and lists before their group.
-  const auto take = [&](std::span<const std::string_view> keys, const PropertyValue& value) {
+  const auto take = [&](std::span<const std::string_view> keys, std::size_t,
+                        const PropertyValue& value) {
     const std::string name(keys.back());
     const bool isDict = value.dict() != nullptr;
     if (keys.size() == 1) {

@@ -284,7 +284,7 @@ class PtreeParser {
       }
       keys.push_back(container.key);
     }
-    _visit(keys, value);
+    _visit(keys, _open.back().keyLine, value);
   }
 
   PropertyValue textValue() {

@@ -32,9 +32,9 @@ inline constexpr std::size_t kLongestPtree = std::size_t{256} << 20;
 std::optional<PropertyValue> readPtree(std::string_view bytes, std::string& error);
 
 /// Gets an entry of a dictionary when its value is complete. `keys` lead from the root to it
-/// through dictionaries alone, its own is the last.
-using PtreeEntryVisitor =
-    std::function<void(std::span<const std::string_view> keys, const PropertyValue& value)>;
+/// through dictionaries alone, its own is the last and begins on `line`, counted from 1.
+using PtreeEntryVisitor = std::function<void(std::span<const std::string_view> keys,
+                                             std::size_t line, const PropertyValue& value)>;
 
 /// The same, and `visit` gets each entry in the order of the document, an entry that a later one
 /// with its key replaces as well. Also of a document that turns out to be none.
