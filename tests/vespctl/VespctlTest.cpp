@@ -72,6 +72,30 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
   EXPECT_EQ(print("counters \"$D\" dump"), "") << "nothing was changed";
 }
 
+TEST_F(VespctlTest, InitIsWholeAndCanBeRepeated) {
+  // Cut short with a mark, and by a version that made none: the same device comes out.
+  for (const char* const left :
+       {"cp -r device half && rm half/device.json && touch half/.init-unfinished",
+        "cp -r device half && rm half/Library/*/*/* && touch half/.unfinished-1",
+        "mkdir half && touch half/.init-unfinished && mkdir half/Library"}) {
+    shell(left);
+    print("init half");
+    shell("rm -f half/.unfinished-1; diff -r device half && rm -r half");
+  }
+  print("init half --sample");
+  shell("mv half/device.json . && touch half/.init-unfinished");
+  const std::string rows = print("counters half dump");
+  print("init half --sample");
+  EXPECT_EQ(std::ranges::count(print("counters half dump"), '\n'), std::ranges::count(rows, '\n'));
+  // A device, and what is none, are not touched.
+  for (const char* const foreign : {"rm half/Library/*/*/*", "rm half/device.json", "true"}) {
+    shell(foreign);
+    const std::string before = shell("find half -printf '%p %T@ %m\n' | sort");
+    EXPECT_EQ(run("init half"), 1);
+    EXPECT_EQ(shell("find half -printf '%p %T@ %m\n' | sort"), before);
+  }
+}
+
 TEST_F(VespctlTest, DumpsAllButKeysThatBreakALine) {
   for (const char* const change :
        {"set $'a\\nb' 1", "sample $'a\\nb' 1", "set k 2", "sample d 3"}) {

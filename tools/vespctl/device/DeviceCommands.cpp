@@ -1,42 +1,124 @@
+#include <fcntl.h>
+#include <unistd.h>
+
+#include <cerrno>
 #include <filesystem>
+#include <string_view>
 #include <vector>
 
 #include "Command.h"
 #include "collect/StarterWhitelist.h"
 #include "driver/DailyDriver.h"
 #include "platform/host/files/AtomicFile.h"
+#include "platform/host/files/Files.h"
 #include "sample/SampleDevice.h"
 
 namespace vesprun {
 namespace {
 
+/// Lies in the folder while `init` is at work, so that one that was cut short can be repeated.
+constexpr const char* kInitMark = ".init-unfinished";
+
+constexpr const char* kFolders[] = {"Library/Application Support/Tallybook",
+                                    "Library/Logsmith",
+                                    "var/mobile/Library/Tallybook",
+                                    "var/mobile/Library/Preferences",
+                                    "run",
+                                    "kernel/ecc",
+                                    "outbox/logs"};
+
+constexpr std::string_view kEmptyDescription = "{\n}\n";
+
+/// Whether an `init` without a mark, as earlier versions had it, was cut short before it wrote the
+/// whitelist: all folders are there, and no file but the empty description.
+bool isCutShortWithoutMark(const DeviceDirectory& directory) {
+  std::error_code failure;
+  for (const char* folder : kFolders) {
+    if (!std::filesystem::is_directory(directory.hostPath(folder), failure)) {
+      return false;
+    }
+  }
+  std::filesystem::recursive_directory_iterator entry(directory.path(), failure);
+  for (; !failure && entry != std::filesystem::recursive_directory_iterator();
+       entry.increment(failure)) {
+    const bool isFolder = std::filesystem::is_directory(entry->symlink_status(failure));
+    if (!failure && !isFolder && entry->path() != directory.hostPath("device.json") &&
+        !entry->path().filename().string().starts_with(".unfinished-")) {
+      return false;
+    }
+  }
+  std::string error;
+  return !failure && readWholeFile(directory.hostPath("device.json"), error) == kEmptyDescription;
+}
+
+void removeFile(const std::string& path) {
+  if (unlink(path.c_str()) != 0 && errno != ENOENT) {
+    throw CommandFailure(systemError(path));
+  }
+}
+
+/// Marks the folder as one in which `init` is at work. False if a device is there already, whose
+/// `init` was cut short behind its last file.
+bool beginInit(const DeviceDirectory& directory) {
+  const std::string mark = directory.hostPath(kInitMark);
+  const std::string description = directory.hostPath("device.json");
+  std::error_code failure;
+  const bool isMarked = std::filesystem::exists(std::filesystem::symlink_status(mark, failure));
+  if (isMarked) {
+    if (std::filesystem::exists(std::filesystem::symlink_status(description, failure))) {
+      return false;
+    }
+  } else if (!std::filesystem::is_empty(directory.path(), failure) || failure) {
+    if (failure || !isCutShortWithoutMark(directory)) {
+      throw CommandFailure(directory.path() +
+                           (failure ? ": " + failure.message() : ": is not empty"));
+    }
+  }
+  std::filesystem::permissions(directory.path(), std::filesystem::perms::owner_all, failure);
+  if (failure) {
+    throw CommandFailure(directory.path() + ": " + failure.message());
+  }
+  if (!FileDescriptor(
+           ::open(mark.c_str(), O_WRONLY | O_CREAT | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC, 0600))
+           .isOpen()) {
+    throw CommandFailure(systemError(mark));
+  }
+  // Before anything else is there: without the mark the folder would be a foreign one.
+  orFail([&](std::string& error) { return flushFolder(directory.path(), error); });
+  removeFile(description);
+  // The sample's counters are added to those that are there.
+  const std::string database =
+      directory.hostPath("var/mobile/Library/Tallybook/TBDataStore.sqlitedb");
+  removeFile(database);
+  removeFile(database + "-journal");
+  return true;
+}
+
+/// `device.json` is written last: without it the folder is no device.
 void initDevice(const std::string& path, bool sample) {
   std::error_code failure;
   std::filesystem::create_directories(path, failure);
   if (failure) {
     throw CommandFailure(path + ": " + failure.message());
   }
-  if (!std::filesystem::is_empty(path, failure) || failure) {
-    throw CommandFailure(path + (failure ? ": " + failure.message() : ": is not empty"));
-  }
-  std::filesystem::permissions(path, std::filesystem::perms::owner_all, failure);
-  if (failure) {
-    throw CommandFailure(path + ": " + failure.message());
+  if (!std::filesystem::is_directory(path, failure)) {
+    throw CommandFailure(path + ": is not empty");
   }
   const DeviceDirectory directory = openDirectory(path);
-  for (const char* folder :
-       {"Library/Application Support/Tallybook", "Library/Logsmith", "var/mobile/Library/Tallybook",
-        "var/mobile/Library/Preferences", "run", "kernel/ecc", "outbox/logs"}) {
-    orFail([&](std::string& error) { return directory.makeFolder(folder, error); });
+  if (beginInit(directory)) {
+    for (const char* folder : kFolders) {
+      orFail([&](std::string& error) { return directory.makeFolder(folder, error); });
+    }
+    if (sample) {
+      fillSampleDevice(path);
+    } else {
+      writeWhitelist(directory, starterWhitelist());
+      orFail([&](std::string& error) {
+        return replaceFile(directory.hostPath("device.json"), kEmptyDescription, error);
+      });
+    }
   }
-  orFail([&](std::string& error) {
-    return replaceFile(directory.hostPath("device.json"), "{\n}\n", error);
-  });
-  if (sample) {
-    fillSampleDevice(path);
-  } else {
-    writeWhitelist(directory, starterWhitelist());
-  }
+  removeFile(directory.hostPath(kInitMark));
 }
 
 void runJob(const std::string& path, const std::vector<std::string>& arguments) {
