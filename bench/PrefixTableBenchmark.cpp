@@ -57,7 +57,7 @@ void lookUp(benchmark::State& state) {
 
 /// What a look-up in a hash table would begin with.
 void hashWholeKey(benchmark::State& state) {
-  const std::vector<std::string> hashed = keys(10'000);
+  const std::vector<std::string> hashed = keys(100);
   while (state.KeepRunningBatch(kKeys)) {
     for (const std::string& key : hashed) {
       benchmark::DoNotOptimize(std::hash<std::string_view>()(key));
@@ -65,7 +65,7 @@ void hashWholeKey(benchmark::State& state) {
   }
 }
 
-BENCHMARK(lookUp)->Arg(10)->Arg(10'000);
+BENCHMARK(lookUp)->Arg(100);
 BENCHMARK(hashWholeKey);
 
 }  // namespace

@@ -13,7 +13,7 @@ library=$(find "$prefix" -name libvesprun.so)
 export LD_LIBRARY_PATH=${library%/*} PKG_CONFIG_PATH=${library%/*}/pkgconfig
 
 # The shared library shows what the public headers mark, under the version of its language, and
-# nothing else.
+# nothing else. PropertyDict is marked as a whole.
 marked() {
   cat "$@" | grep -v '#define' | tr '\n' ' ' | grep -oP 'VESPRUN_EXPORT [^(;]*?\K[\w~]+(?=\(|;)'
 }
@@ -22,6 +22,7 @@ marked() {
   marked "$prefix"/include/vesprun/{Device.h,NANDInfo/*.h} | sed 's/$/ VESPRUN_CXX_0.1/'
 } | sort -u >"$work/marked"
 nm -DC --defined-only "$library" | grep -v ' A VESPRUN' | cut -d' ' -f3- |
+  grep -v '^vesprun::\(PropertyDict::\|operator==(\)' |
   sed -E 's/(\(.*|\[.*)@/@/; s/.*:://; s/@+/ /' |
   sort -u >"$work/visible"
 diff "$work/marked" "$work/visible"

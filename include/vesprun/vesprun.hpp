@@ -22,5 +22,4 @@
 // Every operation closes its connection to the storage controller and releases its registry handles
 // before it returns, except `openORUConnection`.
 //
-// Values are header-only: build with the same C++ library and version of tsl::ordered_map as the
-// shared library.
+// Values are types of the C++ library: build with the same one as the shared library.

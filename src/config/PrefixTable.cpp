@@ -1,6 +1,7 @@
 #include "config/PrefixTable.h"
 
 #include <algorithm>
+#include <cstring>
 
 namespace vesprun {
 namespace {
@@ -10,19 +11,15 @@ std::size_t commonLength(std::string_view left, std::string_view right) {
   return static_cast<std::size_t>(end - left.begin());
 }
 
-/// The half byte at that place plus 1, or 0 behind the end: these numbers sort as the texts do.
-unsigned halfByte(std::string_view text, std::size_t at) {
-  if (at / 2 >= text.size()) {
-    return 0;
+/// The first eight bytes as a number that orders as the text does; a shorter text may tie.
+std::uint64_t head(std::string_view text) {
+  std::uint64_t bytes = 0;
+  if (text.size() >= sizeof bytes) {
+    std::memcpy(&bytes, text.data(), sizeof bytes);
+  } else if (!text.empty()) {
+    std::memcpy(&bytes, text.data(), text.size());
   }
-  const auto byte = static_cast<std::uint8_t>(text[at / 2]);
-  return (at % 2 == 0 ? byte >> 4 : byte & 0xF) + 1;
-}
-
-/// The first half byte in which two different texts differ.
-std::size_t firstDifference(std::string_view left, std::string_view right) {
-  const std::size_t at = 2 * commonLength(left, right);
-  return halfByte(left, at) != halfByte(right, at) ? at : at + 1;
+  return __builtin_bswap64(bytes);
 }
 
 }  // namespace
@@ -36,73 +33,55 @@ PrefixTable::PrefixTable(const std::vector<std::string_view>& prefixes) {
   }
   std::sort(_sorted.begin(), _sorted.end(),
             [](const Entry& left, const Entry& right) { return left.text < right.text; });
-  std::uint32_t longest = kNone;
+  const std::string_view front = _sorted.front().text;
+  _common = front.substr(0, commonLength(front, _sorted.back().text));
+  const Entry* longest = nullptr;
   for (Entry& entry : _sorted) {
-    while (longest != kNone && !entry.text.starts_with(_sorted[longest].text)) {
-      longest = _sorted[longest].longest;
+    while (longest != nullptr && !entry.text.starts_with(longest->text)) {
+      longest = longest->longest;
     }
-    if (longest != kNone) {
+    if (longest != nullptr) {
       entry.longest = longest;
-      entry.first = std::min(entry.first, _sorted[longest].first);
+      entry.first = std::min(entry.first, longest->first);
     }
-    longest = static_cast<std::uint32_t>(&entry - _sorted.data());
-  }
-
-  /// The entries below a node.
-  struct Range {
-    std::size_t node;
-    std::uint32_t from, to;
-  };
-  std::vector<Range> ranges = {{0, 0, static_cast<std::uint32_t>(_sorted.size())}};
-  _nodes.push_back({0});
-  while (!ranges.empty()) {
-    const auto [node, from, to] = ranges.back();
-    ranges.pop_back();
-    if (to - from == 1) {
-      _nodes[node] = {from};
-      continue;
-    }
-    const std::size_t at = firstDifference(_sorted[from].text, _sorted[to - 1].text);
-    const unsigned low = halfByte(_sorted[from].text, at);
-    const unsigned high = halfByte(_sorted[to - 1].text, at);
-    const std::size_t children = _nodes.size();
-    _nodes[node] = {static_cast<std::uint32_t>(children), static_cast<std::uint8_t>(low),
-                    static_cast<std::uint8_t>(high - low), at};
-    // A key without a child of its own has the same beginning in common with all entries: any will
-    // do.
-    _nodes.resize(children + high - low + 1, {from});
-    for (std::uint32_t begin = from; begin != to;) {
-      const unsigned half = halfByte(_sorted[begin].text, at);
-      std::uint32_t end = begin + 1;
-      while (end != to && halfByte(_sorted[end].text, at) == half) {
-        ++end;
-      }
-      ranges.push_back({children + half - low, begin, end});
-      begin = end;
-    }
+    longest = &entry;
+    _heads.push_back(head(entry.text.substr(_common.size())));
   }
 }
 
+const PrefixTable::Entry* PrefixTable::nearest(std::string_view key) const {
+  if (_sorted.empty() || key.size() < _common.size()) {
+    return nullptr;
+  }
+  const std::uint64_t sought = head(key.substr(_common.size()));
+  // Without branches, which a processor could not foresee.
+  const std::uint64_t* last = _heads.data();
+  for (std::size_t rest = _heads.size(); rest > 1; rest -= rest / 2) {
+    const std::uint64_t* const middle = last + rest / 2;
+    last = *middle <= sought ? middle : last;
+  }
+  const auto place = last - _heads.data();
+  if (place == 0 || last[0] != sought || last[-1] != sought) {
+    return &_sorted[static_cast<std::size_t>(place)];
+  }
+  const auto tied = std::lower_bound(_heads.begin(), _heads.begin() + place, sought);
+  const Entry* const first = &_sorted[static_cast<std::size_t>(tied - _heads.begin())];
+  return std::upper_bound(
+             first + 1, _sorted.data() + place + 1, key,
+             [](std::string_view text, const Entry& entry) { return text < entry.text; }) -
+         1;
+}
+
 std::optional<std::size_t> PrefixTable::find(std::string_view key) const {
-  if (_nodes.empty()) {
-    return std::nullopt;
+  const Entry* entry = nearest(key);
+  if (entry != nullptr && !key.starts_with(entry->text)) {
+    entry = entry->longest;
+    const std::size_t length = entry != nullptr ? commonLength(entry->text, key) : 0;
+    while (entry != nullptr && entry->text.size() > length) {
+      entry = entry->longest;
+    }
   }
-  const Node* node = _nodes.data();
-  while (node->span != 0) {
-    node =
-        &_nodes[node->next + std::min<unsigned>(halfByte(key, node->at) - node->low, node->span)];
-  }
-  const Entry* entry = &_sorted[node->next];
-  if (!key.starts_with(entry->text)) {
-    const std::size_t length = entry->longest != kNone ? commonLength(entry->text, key) : 0;
-    do {
-      if (entry->longest == kNone) {
-        return std::nullopt;
-      }
-      entry = &_sorted[entry->longest];
-    } while (entry->text.size() > length);
-  }
-  return entry->first;
+  return entry != nullptr ? std::optional<std::size_t>(entry->first) : std::nullopt;
 }
 
 }  // namespace vesprun

@@ -1,7 +1,5 @@
 #include "config/WhitelistTable.h"
 
-#include <algorithm>
-
 namespace vesprun {
 
 template <typename Options>
@@ -20,15 +18,9 @@ void WhitelistTable<Options>::take(std::string_view group, std::string_view list
 
 template <typename Options>
 WhitelistDecision<Options> WhitelistTable<Options>::decide(std::string_view key) const {
-  auto named = _keys.nth(std::min(_expected, _keys.size()));
-  if (named == _keys.end() || named.key() != key) {
-    named = _keys.find(key);
-  }
-  if (named != _keys.end()) {
-    _expected = static_cast<std::size_t>(named - _keys.begin()) + 1;
-    return {DecidedBy::Key, {}, &named->second};
-  }
-  return decideByPrefix(key);
+  const auto named = _keys.find(key);
+  return named != _keys.end() ? WhitelistDecision<Options>{DecidedBy::Key, {}, &named->second}
+                              : decideByPrefix(key);
 }
 
 template <typename Options>

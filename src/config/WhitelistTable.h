@@ -8,6 +8,7 @@
 #include <tuple>
 #include <vector>
 
+#include "common/KeyHash.h"
 #include "common/PropertyDict.h"
 #include "config/KeyOptions.h"
 #include "config/PrefixTable.h"
@@ -62,7 +63,7 @@ template <typename Options>
 class WhitelistTable {
  public:
   /// In the order in which they were first named.
-  using Entries = tsl::ordered_map<std::string_view, WhitelistEntry<Options>>;
+  using Entries = tsl::ordered_map<std::string_view, WhitelistEntry<Options>, KeyHash>;
 
   /// Takes the entries of a group's list, `Options::kKeyList` or `Options::kPrefixList`. A key or
   /// prefix that is there takes the later options in its earlier place. Texts and options must
@@ -72,8 +73,7 @@ class WhitelistTable {
   const Entries& keys() const { return _keys; }
   const Entries& prefixes() const { return _prefixes; }
 
-  /// By the exact key, else by the first prefix in order. Fastest for keys in the order of the
-  /// whitelist; not for several threads at a time.
+  /// By the exact key, else by the first prefix in order. Not for several threads at a time.
   WhitelistDecision<Options> decide(std::string_view key) const;
   /// By the first prefix alone. A prefix that another one decides is never reached.
   WhitelistDecision<Options> decideByPrefix(std::string_view key) const;
@@ -81,7 +81,6 @@ class WhitelistTable {
  private:
   std::size_t _taken = 0;
   Entries _keys;
-  mutable std::size_t _expected = 0;  ///< the place after the last key that was found
   Entries _prefixes;
   mutable std::optional<PrefixTable> _prefixTable;  ///< of `_prefixes`, once a look-up needs it
 };

@@ -1,7 +1,7 @@
 #include "driver/TaskingSync.h"
 
+#include <array>
 #include <cstdint>
-#include <functional>
 #include <optional>
 #include <set>
 #include <string>
@@ -9,6 +9,7 @@
 #include <unordered_set>
 #include <utility>
 
+#include "common/KeyHash.h"
 #include "common/PropertyDict.h"
 #include "common/TextForm.h"
 #include "platform/Platform.h"
@@ -168,26 +169,23 @@ void syncTasking(const OptionalValue& build) {
 /// Equal for equal values (-0.0 and 0 too, whatever the kinds of numbers and the order of a
 /// dictionary's entries), and seldom for others.
 std::size_t hashOf(const PropertyValue& value) {
+  const auto hashOfBytes = [](const auto& object) {
+    return KeyHash()({reinterpret_cast<const char*>(&object), sizeof object});
+  };
   if (const Number* number = value.number()) {
-    return std::hash<double>{}(number->asDouble());
-  }
-  if (const std::string* text = value.string()) {
-    return hashOfText(*text);
-  }
-  if (const Bytes* data = value.data()) {
-    return hashOfText({reinterpret_cast<const char*>(data->data()), data->size()});
+    return hashOfBytes(number->asDouble() + 0.0);
   }
   std::size_t hash = 0;
   if (const PropertyArray* array = value.array()) {
     for (const PropertyValue& element : *array) {
-      hash = hash * 31 + hashOf(element);
+      hash = hashOfBytes(std::array{hash, hashOf(element)});
     }
   } else if (const PropertyDict* dict = value.dict()) {
     for (const auto& [key, entry] : *dict) {
-      hash += key.hash() * (hashOf(entry) | 1);
+      hash += hashOfBytes(std::array{KeyHash()(key), hashOf(entry)});
     }
   } else {
-    hash = hashOfText(textForm(value));
+    hash = KeyHash()(textForm(value));
   }
   return hash;
 }

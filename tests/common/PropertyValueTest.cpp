@@ -1,9 +1,13 @@
 #include "common/PropertyValue.h"
 
 #include <gtest/gtest.h>
+#include <array>
 #include <cmath>
 #include <limits>
+#include <set>
+#include <string>
 
+#include "common/KeyHash.h"
 #include "common/TextForm.h"
 
 namespace vesprun {
@@ -57,38 +61,45 @@ TEST(PropertyDict, KeepsThePlaceOfAKey) {
   EXPECT_NE(dict, (PropertyDict{{"a", 4}, {"b", "replaced"}, {"c", 1}}));
 }
 
-TEST(PropertyDict, IsTheSameWithFewEntriesAndWithMany) {
-  for (const bool reserved : {false, true}) {
-    PropertyDict dict;
-    dict.reserve(reserved ? 30 : 0);
-    for (int i = 0; i < 30; ++i) {
-      EXPECT_FALSE(dict.contains(std::to_string(i)));
-      dict.set(std::to_string(i), -1);
-      dict.set(std::to_string(i / 2), i / 2);
-      const PropertyDict copy = dict;
-      ASSERT_EQ(copy.size(), static_cast<std::size_t>(i + 1));
-      ASSERT_EQ(copy, dict);
-    }
-    PropertyDict moved = std::move(dict);
-    int at = 0;
-    for (const auto& [key, value] : moved) {
-      EXPECT_EQ(key, std::to_string(at));
-      EXPECT_EQ(value, PropertyValue(at < 15 ? at : -1));
-      ++at;
-    }
-    for (int i = 29; i > 0; i -= 1) {
-      EXPECT_TRUE(moved.remove(std::to_string(i)));
-      EXPECT_FALSE(moved.remove(std::to_string(i)));
-      EXPECT_EQ(moved.begin()->first, "0");
-    }
-    moved.clear();
-    EXPECT_TRUE(moved.empty());
-    EXPECT_EQ(moved, PropertyDict());
+TEST(PropertyDict, KeepsTheOrderOfManyKeysThroughCopiesAndRemovals) {
+  PropertyDict dict;
+  for (int i = 0; i < 30; ++i) {
+    dict.set(std::to_string(i), -1);
+    dict.set(std::to_string(i / 2), i / 2);
+    ASSERT_EQ(PropertyDict(dict), dict);
   }
+  int at = 0;
+  for (const auto& [key, value] : dict) {
+    EXPECT_EQ(key, std::to_string(at));
+    EXPECT_EQ(value, PropertyValue(at < 15 ? at : -1));
+    ++at;
+  }
+  PropertyDict moved = std::move(dict);
+  for (int i = 29; i >= 0; --i) {
+    EXPECT_EQ(moved.begin()->first, "0");
+    EXPECT_TRUE(moved.remove(std::to_string(i)));
+    EXPECT_FALSE(moved.contains(std::to_string(i)));
+  }
+  EXPECT_EQ(moved, PropertyDict());
 }
 
-TEST(PropertyValue, IsSmallAndCopiesWhatItHolds) {
-  EXPECT_EQ(sizeof(PropertyValue), 16U);
+// All have the same hash where each eight bytes are multiplied by one known factor.
+TEST(KeyHash, TellsApartKeysThatWereChosenToCollide) {
+  std::set<std::size_t> hashes;
+  for (unsigned choice = 0; choice < 4096; ++choice) {
+    std::array<std::uint64_t, 24> words{};
+    for (unsigned pair = 0; pair < 12; ++pair) {
+      if ((choice >> pair & 1) != 0) {
+        words[2 * pair] = std::uint64_t{1} << 63;
+        words[2 * pair + 1] = std::uint64_t{1} << 63 | std::uint64_t{1} << 31;
+      }
+    }
+    hashes.insert(KeyHash()({reinterpret_cast<const char*>(words.data()), sizeof words}));
+  }
+  EXPECT_EQ(hashes.size(), 4096U);
+}
+
+TEST(PropertyValue, CopiesWhatItHolds) {
   PropertyArray all{PropertyDict{},  PropertyDict{{"k", PropertyArray{1}}},
                     PropertyArray{}, "",
                     "text",          Bytes{},

@@ -42,17 +42,20 @@ bool GenericParserCxt::append(std::string_view prefix, std::string_view suffix,
 
 bool GenericParserCxt::appendKnown(KnownNames names, const std::uint8_t* source, std::size_t width,
                                    std::size_t count) noexcept {
+  const std::size_t fields = _values.size();
   try {
-    Run& run = _runs.emplace_back(Run{names, 0, 0});
-    for (; run.size < count; ++run.size) {
-      const std::uint8_t* const element = source + run.size * width;
-      _values.push_back(width == sizeof(std::uint64_t) ? loadLittleEndian<std::uint64_t>(element)
-                                                       : loadLittleEndian(element, width));
-    }
-    return true;
+    _values.resize(fields + count);
+    _runs.push_back({names, static_cast<std::uint32_t>(count), 0});
   } catch (const std::bad_alloc&) {
+    _values.resize(fields);
     return false;
   }
+  for (std::size_t i = 0; i < count; ++i) {
+    const std::uint8_t* const element = source + i * width;
+    _values[fields + i] = width == sizeof(std::uint64_t) ? loadLittleEndian<std::uint64_t>(element)
+                                                         : loadLittleEndian(element, width);
+  }
+  return true;
 }
 
 bool AddSingleValueToGenericContext(GenericParserCxt& ctx, std::string_view prefix,
@@ -90,7 +93,7 @@ PropertyDict CreateDictFromCxt(const GenericParserCxt& ctx, const FieldTable* fi
   dict.reserve(filter != nullptr ? std::min(ctx.size(), filter->size()) : ctx.size());
   ctx.forEach([&](const GenericParserCxt::Field& field) {
     if (filter == nullptr || filter->find(field.name, field.hash()) != nullptr) {
-      dict.set(field.key(), field.value);
+      dict.set(field.name, field.value);
     }
   });
   return dict;

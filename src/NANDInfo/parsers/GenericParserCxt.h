@@ -27,10 +27,7 @@ class GenericParserCxt {
 
     /// In decimal.
     std::string text() const { return std::to_string(value); }
-    PropertyKey key() const {
-      return knownHash ? PropertyKey::permanent(name, *knownHash) : PropertyKey(name);
-    }
-    std::uint32_t hash() const { return knownHash ? *knownHash : hashOfText(name); }
+    std::uint32_t hash() const { return knownHash ? *knownHash : hashOfFieldName(name); }
   };
 
   std::size_t size() const { return _values.size(); }
@@ -57,7 +54,7 @@ class GenericParserCxt {
   /// See `AddSingleValueToGenericContext`.
   bool append(std::string_view prefix, std::string_view suffix, std::uint64_t value) noexcept;
   /// Appends `count` fields under these names: the little-endian values of `width` bytes, 1 to 8,
-  /// at `source`. False when memory runs out; fields are then missing.
+  /// at `source`. False, and nothing appended, when memory runs out.
   bool appendKnown(KnownNames names, const std::uint8_t* source, std::size_t width,
                    std::size_t count) noexcept;
   /// Empties the context and frees its memory.

@@ -6,14 +6,13 @@
 #include <string_view>
 
 #include "NANDInfo/tables/FieldName.h"
-#include "common/PropertyKey.h"
 
 namespace vesprun {
 
-/// The name of a known field. It lives as long as the program, with a zero byte behind it.
+/// The name of a known field. It lives as long as the program.
 struct KnownName {
   std::string_view text;
-  std::uint32_t hash;  ///< `hashOfText` of it
+  std::uint32_t hash;  ///< `hashOfFieldName` of it
 };
 
 /// The names of one statistic's elements.
@@ -76,7 +75,7 @@ class KnownNamesOf {
     } sizes;
     forEach([&sizes](std::size_t, std::string_view name) {
       ++sizes.names;
-      sizes.characters += name.size() + 1;
+      sizes.characters += name.size();
     });
     return sizes;
   }();
@@ -97,11 +96,10 @@ class KnownNamesOf {
         layout.firstOfRow[row] = names;
         lastRow = row;
       }
-      layout.places[names++] = {begin, static_cast<std::uint32_t>(name.size()), hashOfText(name)};
+      layout.places[names++] = {begin, static_cast<std::uint32_t>(name.size()), hashOfFieldName(name)};
       for (const char character : name) {
         layout.text[begin++] = character;
       }
-      ++begin;  // the zero byte
     });
     return layout;
   }();

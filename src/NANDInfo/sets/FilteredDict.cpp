@@ -65,7 +65,7 @@ PropertyDict CreateFilteredDict_SigDig(const PropertyDict& source, const FieldTa
   PropertyDict filtered;
   filtered.reserve(std::min(source.size(), digits->size()));
   for (const auto& [key, value] : source) {
-    const FieldRange* field = digits->find(key, key.hash());
+    const FieldRange* field = digits->find(key);
     if (field == nullptr) {
       continue;
     }
@@ -88,7 +88,7 @@ PropertyDict CreateFilteredDict_SigDig(const GenericParserCxt& source, const Fie
   filtered.reserve(std::min(source.size(), digits->size()));
   source.forEach([&](const GenericParserCxt::Field& field) {
     if (const FieldRange* range = digits->find(field.name, field.hash())) {
-      filtered.set(field.key(), roundSig(field.value, range->digits));
+      filtered.set(field.name, roundSig(field.value, range->digits));
     }
   });
   return filtered;

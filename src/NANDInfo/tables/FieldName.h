@@ -3,8 +3,10 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
 #include <limits>
 #include <string_view>
+#include <type_traits>
 
 namespace vesprun {
 
@@ -33,6 +35,29 @@ constexpr FieldName splitFieldName(std::string_view name) {
     number = number * 10 + static_cast<std::uint32_t>(digit - '0');
   }
   return {name.substr(0, stemLength), number};
+}
+
+/// The same value when a table is compiled and when it is searched. Takes eight bytes at a time, as
+/// names are long and looked up by the thousand.
+constexpr std::uint32_t hashOfFieldName(std::string_view name) {
+  constexpr std::uint64_t kFactor = 0x9E3779B97F4A7C15U;
+  std::uint64_t hash = name.size();
+  while (!name.empty()) {
+    const std::size_t length = name.size() < 8 ? name.size() : 8;
+    std::uint64_t word = 0;
+    if (length == 8 && !std::is_constant_evaluated()) {
+      std::memcpy(&word, name.data(), 8);
+    } else {
+      for (std::size_t i = 0; i < length; ++i) {
+        word |= std::uint64_t{static_cast<unsigned char>(name[i])} << (8 * i);
+      }
+    }
+    hash = (hash ^ word) * kFactor;
+    hash ^= hash >> 32;
+    name.remove_prefix(length);
+  }
+  // The high bits: the last bytes have not changed the lowest ones yet.
+  return static_cast<std::uint32_t>(hash * kFactor >> 32);
 }
 
 /// A name in the making, also at compile time.

@@ -8,7 +8,6 @@
 #include <string_view>
 
 #include "NANDInfo/tables/FieldName.h"
-#include "common/PropertyKey.h"
 
 namespace vesprun {
 
@@ -35,8 +34,11 @@ struct FieldRange {
 
   constexpr std::size_t size() const { return std::size_t{last - first} + 1; }
   constexpr bool contains(std::string_view name) const {
-    const FieldName parts = splitFieldName(name);
-    return parts.stem == stem && first <= parts.number && parts.number <= last;
+    if (!name.starts_with(stem)) {
+      return false;
+    }
+    const FieldName rest = splitFieldName(name.substr(stem.size()));
+    return rest.stem.empty() && first <= rest.number && rest.number <= last;
   }
   /// Calls `visit(name)` for each name. It lives as long as the call.
   template <typename Visit>
@@ -76,7 +78,7 @@ struct FieldIndex {
   consteval FieldIndex() {
     for (std::size_t i = 0; i < kRanges.size(); ++i) {
       kRanges[i].forEach([&](std::string_view name) {
-        const std::uint32_t hash = hashOfText(name);
+        const std::uint32_t hash = hashOfFieldName(name);
         std::size_t slot = hash % slots.size();
         for (; slots[slot].range != 0; slot = (slot + 1) % slots.size()) {
           if (slots[slot].hash == hash >> 16 && kRanges[slots[slot].range - 1U].contains(name)) {
@@ -99,7 +101,7 @@ class FieldTable {
   constexpr std::size_t size() const { return _size; }
 
   /// The range of `name`, or null. Takes constant time and allocates nothing.
-  const FieldRange* find(std::string_view name) const { return find(name, hashOfText(name)); }
+  const FieldRange* find(std::string_view name) const { return find(name, hashOfFieldName(name)); }
   /// The same, with the name's hash.
   const FieldRange* find(std::string_view name, std::uint32_t hash) const {
     const std::size_t mask = _slots.size() - 1;

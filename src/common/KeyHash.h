@@ -1,0 +1,47 @@
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
+#include <string_view>
+
+namespace vesprun {
+
+/// The hash of keys that others choose. It multiplies by a random number of each process, so that
+/// nobody can send keys that collide.
+class KeyHash {
+ public:
+  using is_transparent = void;
+
+  std::size_t operator()(std::string_view key) const {
+    std::uint64_t hash = key.size();
+    std::uint64_t word = 0;
+    for (std::size_t at = 0; at + kWordSize < key.size(); at += kWordSize) {
+      std::memcpy(&word, key.data() + at, kWordSize);
+      hash = mix(hash ^ word);
+    }
+    if (key.size() >= kWordSize) {
+      std::memcpy(&word, key.data() + key.size() - kWordSize, kWordSize);
+    } else {
+      key.copy(reinterpret_cast<char*>(&word), kWordSize);
+    }
+    return static_cast<std::size_t>(mix(hash ^ word));
+  }
+
+ private:
+  static constexpr std::size_t kWordSize = sizeof(std::uint64_t);
+
+  // Both halves of the product: without the factor, nobody knows which inputs give the same.
+  static std::uint64_t mix(std::uint64_t value) {
+    __extension__ using Product = unsigned __int128;
+    const Product product = Product{value ^ kMask} * kFactor;
+    return static_cast<std::uint64_t>(product) ^ static_cast<std::uint64_t>(product >> 64);
+  }
+
+  static std::uint64_t randomNumber();
+
+  static inline const std::uint64_t kMask = randomNumber();
+  static inline const std::uint64_t kFactor = randomNumber() | 1;
+};
+
+}  // namespace vesprun
