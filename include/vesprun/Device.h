@@ -14,7 +14,7 @@ namespace vesprun {
 class Device {
  public:
   /// Null, with the place in `error`, when the folder or its `device.json` cannot be used or
-  /// another device is open. The device's time zone becomes the process's, in TZ.
+  /// another device is open. Sets the process's TZ to the device's time zone.
   VESPRUN_EXPORT static std::unique_ptr<Device> open(const std::string& path,
                                                      std::string& error) noexcept;
 

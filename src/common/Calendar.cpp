@@ -12,7 +12,7 @@ namespace {
 // eras have the same number of days.
 constexpr std::int64_t kDaysPerEra = 146097;
 constexpr std::int64_t kYearsPerEra = 400;
-constexpr std::int64_t kLargestYear = 10'000'000;  // beyond every 32-bit day number
+constexpr std::int64_t kMaxYear = 10'000'000;  // beyond every 32-bit day number
 
 constexpr std::string_view kDateForm = "-##-##T##:##:##";  // after the year; # is a digit
 
@@ -112,8 +112,7 @@ std::optional<Date> parseDateText(std::string_view text) {
   const std::chrono::year_month_day inEra(
       std::chrono::year(static_cast<int>(year - era * kYearsPerEra)),
       std::chrono::month(twoDigits(1)), std::chrono::day(twoDigits(4)));
-  if (rest != "Z" || years > kLargestYear || !inEra.ok() || hour > 23 || minute > 59 ||
-      second > 59) {
+  if (rest != "Z" || years > kMaxYear || !inEra.ok() || hour > 23 || minute > 59 || second > 59) {
     return std::nullopt;
   }
   const std::int64_t days =

@@ -4,8 +4,8 @@
 
 namespace vesprun {
 
-/// A static object beside each state that lives as long as the process, with the function that
-/// resets it. Tests and fuzzers can so play one process after another.
+/// A static object next to each state that lives as long as the process, with the function that
+/// resets it, so that tests and fuzzers can simulate several processes in one.
 class ProcessState {
  public:
   using Reset = void (*)();

@@ -11,7 +11,7 @@
 namespace vesprun {
 namespace {
 
-constexpr std::uint64_t kMostBytes = 256 << 20;
+constexpr std::uint64_t kMaxBytes = 256 << 20;
 
 std::optional<bool> gIsInternalDevice;
 const ProcessState kInternalDeviceState([] { gIsInternalDevice.reset(); });
@@ -27,7 +27,7 @@ bool TBIsInternalDevice() {
 std::optional<std::string> readWhitelist() {
   FileSystem& fileSystem = platform().fileSystem();
   const std::string path = TBConfig::path();
-  if (fileSystem.fileSize(path).value_or(0) > kMostBytes) {
+  if (fileSystem.fileSize(path).value_or(0) > kMaxBytes) {
     return std::nullopt;
   }
   return fileSystem.readFile(path);

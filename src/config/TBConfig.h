@@ -12,7 +12,7 @@
 
 namespace vesprun {
 
-/// A group that does not count on this device although it names a key.
+/// A group that names the key but is disabled on this device.
 struct PassedOverGroup {
   std::string_view name;
   WhitelistKeyGroup::Standing standing;

@@ -17,17 +17,17 @@ namespace {
 using Values = std::span<const std::uint64_t>;
 using Answer = std::optional<PropertyValue>;
 
-constexpr std::uint64_t kMost32 = std::numeric_limits<std::uint32_t>::max();
-constexpr std::uint64_t kMost64 = std::numeric_limits<std::uint64_t>::max();
+constexpr std::uint64_t kMax32 = std::numeric_limits<std::uint32_t>::max();
+constexpr std::uint64_t kMax64 = std::numeric_limits<std::uint64_t>::max();
 
 constexpr EntryPointParameter kStatKeys[] = {{"stat-keys", "Names the fields by their ids"}};
 constexpr EntryPointParameter kRound[] = {
     {"round", "Rounds the numbers to their significant digits"}};
 constexpr EntryPointParameter kMagazine[] = {
-    {"hours", "How long ago the snapshot was taken", kMost64, 0, true},
+    {"hours", "How long ago the snapshot was taken", kMax64, 0, true},
     {"raw", "The counters as the snapshot has them, not what they grew by"},
-    {"mode", "0: counters that accumulate, 1: instantaneous values, 2: both", kMost32, 2}};
-constexpr EntryPointParameter kEvents[] = {{"from-step", "The step to begin with, 0 to 6", kMost32},
+    {"mode", "0: counters that accumulate, 1: instantaneous values, 2: both", kMax32, 2}};
+constexpr EntryPointParameter kEvents[] = {{"from-step", "The step to begin with, 0 to 6", kMax32},
                                            {"no-monthly", "Leaves out the step of a month"}};
 constexpr EntryPointParameter kStructuredLog[] = {
     {"flag", "Passes the caller's flag on to the controller"},

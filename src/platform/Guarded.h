@@ -21,7 +21,7 @@ void runGuarded(SystemLog& log, const char* what, const Work& work) noexcept {
   }
 }
 
-/// For a job that must go on even when memory runs out.
+/// For work that must continue even when an allocation fails.
 template <typename Step>
 void runGuarded(const Step& step) noexcept {
   runGuarded(platform().systemLog(), "unexpected failure", step);

@@ -9,7 +9,7 @@
 
 namespace vesprun {
 
-/// Writes to the file of a log under submission. False when it failed; the submission then fails.
+/// Writes to the log file being submitted. False when it failed; the submission then fails.
 using LogFileHandle = std::function<bool(std::string_view bytes)>;
 
 /// The platform's diagnostics services.
@@ -22,8 +22,8 @@ class Logsmith {
   /// True when the user allows diagnostic logs to be submitted.
   virtual bool DiagnosticLogSubmissionEnabled() = 0;
 
-  /// Has `writer` fill a new log file and submits it. `header` may be null. False, and no log
-  /// appears, when the service refuses it or the file could not be written.
+  /// Creates a log file, lets `writer` fill it, and submits it. `header` may be null. False, and no
+  /// log appears, when the service refuses it or the file could not be written.
   virtual bool LGSWriteLogForSubmission(std::string_view logType, std::string_view logName,
                                         const PropertyDict* header, const LogWriter& writer) = 0;
 

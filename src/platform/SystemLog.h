@@ -5,7 +5,7 @@
 
 namespace vesprun {
 
-/// Gravest first; a log that keeps one level keeps all graver ones.
+/// Most severe first; keeping a level keeps all more severe ones.
 enum class LogLevel : std::uint8_t { Error, Default, Notice, Info, Debug };
 
 inline constexpr std::string_view kLogLevelNames[] = {"error", "default", "notice", "info",

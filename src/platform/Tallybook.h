@@ -31,7 +31,7 @@ class TBHistoryDistributionEnumerator {
 /// The rows of the counter database. Both queries deliver the rows from `minDay` to `maxDay`, both
 /// included, whose key begins with `keyPrefix`, by day and then by key (byte order). Setting `stop`
 /// ends the query. Of a damaged database they deliver what comes before the damage and return
-/// false; the system log has the damage.
+/// false; the damage is reported in the system log.
 class TBHistory {
  public:
   using ScalarRowHandler =

@@ -31,13 +31,13 @@ void DistributionBatch::add(TBHistoryDistributionEnumerator& values, std::string
   }
   double* const read = valuesOf(row);
   while (const std::size_t count =
-             values.getNextValues({read + row.pending, kMostPending - row.pending})) {
+             values.getNextValues({read + row.pending, kMaxPending - row.pending})) {
     row.pending += count;
-    if (row.pending == kMostPending) {
+    if (row.pending == kMaxPending) {
       countPending();
     }
   }
-  if (_rows.size() == kMostRows) {
+  if (_rows.size() == kMaxRows) {
     finish();
   }
 }
@@ -53,7 +53,7 @@ void DistributionBatch::countPending() {
       if (i < row.pending) {
         row.statistics.add(*value);
       }
-      value += kMostPending;
+      value += kMaxPending;
     }
   }
   for (Row& row : _rows) {

@@ -15,8 +15,8 @@
 
 namespace vesprun {
 
-/// Computes the statistics of a few distributions side by side: while one waits for a division, the
-/// others go on. Each takes its values in order.
+/// Interleaves the statistics of up to eight distributions to hide division latency. Each takes its
+/// values in order.
 class DistributionBatch {
  public:
   /// The outputs must outlive the object.
@@ -45,14 +45,14 @@ class DistributionBatch {
     DistributionStats statistics{};
     std::size_t pending = 0;  ///< values that have been read but not counted
   };
-  static constexpr std::size_t kMostRows = 8;
+  static constexpr std::size_t kMaxRows = 8;
   /// Not a power of two, so that the rows begin in different sets of the processor's cache.
-  static constexpr std::size_t kMostPending = 2040;
+  static constexpr std::size_t kMaxPending = 2040;
 
   static std::optional<HistogramCounters> allocateCounters(const PropertyArray& intervals,
                                                            const std::string& key);
   double* valuesOf(const Row& row) {
-    return &_values[static_cast<std::size_t>(&row - _rows.data()) * kMostPending];
+    return &_values[static_cast<std::size_t>(&row - _rows.data()) * kMaxPending];
   }
   void countPending();
 
@@ -60,7 +60,7 @@ class DistributionBatch {
   PropertyDict& _histograms;
   std::vector<Row> _rows;
   std::unique_ptr<double[]> _values =
-      std::make_unique_for_overwrite<double[]>(kMostRows * kMostPending);
+      std::make_unique_for_overwrite<double[]>(kMaxRows * kMaxPending);
 };
 
 }  // namespace vesprun

@@ -10,8 +10,8 @@ namespace vesprun {
 /// Minimum, maximum, mean and sum of squared deviations in one pass (Welford's algorithm, in double
 /// precision); 0.0 before the first value.
 ///
-/// The count is a signed 32-bit number and stops at 2^31 − 1: further values count everywhere else,
-/// with the weight of that one.
+/// The count is a signed 32-bit number and stops at 2^31 − 1: later values no longer raise
+/// the count but still move the mean.
 class DistributionStats {
  public:
   void add(double value) {

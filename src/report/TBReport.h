@@ -46,7 +46,7 @@ class TBReport {
   /// its end; what came before is collected.
   bool readHistory(std::int32_t day);
 
-  /// What a submitted report does on the device beside the log: offers the event of the installed
+  /// Side effects of submitting a report: offers the event of the installed
   /// apps, restarts the count of corruptions.
   enum class SideEffects { Done, LeftOut };
 

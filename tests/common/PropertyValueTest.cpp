@@ -13,18 +13,18 @@
 namespace vesprun {
 namespace {
 
-constexpr std::int64_t kSmallest = std::numeric_limits<std::int64_t>::min();
-constexpr std::int64_t kLargest = std::numeric_limits<std::int64_t>::max();
+constexpr std::int64_t kMin = std::numeric_limits<std::int64_t>::min();
+constexpr std::int64_t kMax = std::numeric_limits<std::int64_t>::max();
 constexpr std::uint64_t kAllOnes = std::numeric_limits<std::uint64_t>::max();
 
 TEST(Number, TruncationSaturates) {
   EXPECT_EQ(saturatingTruncate(-0.9), 0);
   EXPECT_EQ(saturatingTruncate(2.9), 2);
   EXPECT_EQ(saturatingTruncate(-2.9), -2);
-  EXPECT_EQ(saturatingTruncate(9223372036854775807.0), kLargest);
+  EXPECT_EQ(saturatingTruncate(9223372036854775807.0), kMax);
   EXPECT_EQ(saturatingTruncate(std::nextafter(9223372036854775808.0, 0)), 9223372036854774784);
-  EXPECT_EQ(saturatingTruncate(-9223372036854775808.0), kSmallest);
-  EXPECT_EQ(saturatingTruncate(-1e300), kSmallest);
+  EXPECT_EQ(saturatingTruncate(-9223372036854775808.0), kMin);
+  EXPECT_EQ(saturatingTruncate(-1e300), kMin);
   EXPECT_EQ(saturatingTruncate(std::nan("")), 0);
 }
 
@@ -42,10 +42,10 @@ TEST(Number, ReadsAsOtherTypesByTheLowBits) {
 
 TEST(Number, EqualsByValue) {
   EXPECT_EQ(Number(std::int8_t{5}), Number(5.0));
-  EXPECT_EQ(Number(kSmallest), Number(-9223372036854775808.0));
+  EXPECT_EQ(Number(kMin), Number(-9223372036854775808.0));
   EXPECT_EQ(Number(std::int32_t{0}), Number(-0.0));
   EXPECT_NE(Number(std::int64_t{-1}), Number(kAllOnes));
-  EXPECT_NE(Number(kLargest), Number(9223372036854775808.0));
+  EXPECT_NE(Number(kMax), Number(9223372036854775808.0));
   EXPECT_NE(Number(kAllOnes), Number(18446744073709551616.0));
   EXPECT_NE(Number(std::nan("")), Number(std::nan("")));
 }

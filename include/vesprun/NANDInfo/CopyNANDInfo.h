@@ -19,7 +19,8 @@ VESPRUN_EXPORT PropertyDict CopyNANDInfo() noexcept;
 VESPRUN_EXPORT std::optional<PropertyDict> CopyNANDInfoWithOptions(
     const PropertyDict& options) noexcept;
 
-/// Sets the legacy NAND info without version fields in `info`. Nothing happens without statistics.
+/// Sets the legacy NAND info without version fields in `info`. Leaves `info`
+/// unchanged if no statistics are available.
 VESPRUN_EXPORT void DumpNANDInfo(PropertyDict& info) noexcept;
 
 }  // namespace vesprun

@@ -12,7 +12,7 @@ namespace vesprun {
 /// `allowMonthly`. Each step is logged at default level. Step 7 has only a name, and records an
 /// error. From step 8 on nothing happens. `context` is ignored.
 ///
-/// Nothing unless `collectResults` is not 0. Then one dictionary of the payloads that the service
+/// Empty if `collectResults` is 0. Else one dictionary of the payloads that the service
 /// took, wanted or not, and the NVRAM statistics; a later entry replaces an earlier one of its key.
 /// "msp_index" is the payload of the last MSP taken, "com.quill.NANDInfo.ErrorMessage" the first
 /// error text of the process.

@@ -12,7 +12,7 @@ namespace vesprun {
 /// What happened since the snapshot of `hours` hours ago (low 32 bits).
 ///
 /// Accumulating counters, doubles, are reported if `mode` is 0 or 2: their growth with
-/// `deltaWanted` (not 0) if time lies between the snapshots, else the old values. Instantaneous
+/// `deltaWanted` (not 0) if the snapshots' time stamps differ, else the old values. Instantaneous
 /// values of the old snapshot are reported if `mode` is 1 or 2.
 ///
 /// In this order: "com.quill.NANDInfo.IsStatMagSupported"; if both snapshots have a time stamp

@@ -20,7 +20,7 @@ VESPRUN_EXPORT std::optional<PropertyDict> CopyNANDFTLInfo(bool useStatKeyParser
 /// The current FTL fields and those derived from them; only the error text without the former.
 VESPRUN_EXPORT PropertyDict CopyWhitelistedNANDFTLInfo(bool round) noexcept;
 
-/// Always nothing; other programs look the name up.
+/// Always empty; kept because programs look up the symbol.
 VESPRUN_EXPORT std::optional<PropertyDict> CopyWhitelistedNANDFTLCountersInfo() noexcept;
 
 /// The set of each MSP by index ("0", "1", ...), and the error text beside them. Each also has,

@@ -142,9 +142,9 @@ std::optional<Characteristics> readCharacteristics(const PropertyValue* properti
 
 PropertyDict busRecord(const std::uint8_t* busEntry, const NandChannelCounters& counters,
                        const CounterLayout& layout) {
-  constexpr std::size_t kMostEntries = 175;
+  constexpr std::size_t kMaxEntries = 175;
   PropertyDict record;
-  record.reserve(kMostEntries);
+  record.reserve(kMaxEntries);
   for (std::size_t i = 0; i < kBusEntryKeys.size(); ++i) {
     setNumberValueForType(record, kBusEntryKeys[i], busEntry + i * kWordSize, PVNumberType::Int);
   }

@@ -96,7 +96,8 @@ class KnownNamesOf {
         layout.firstOfRow[row] = names;
         lastRow = row;
       }
-      layout.places[names++] = {begin, static_cast<std::uint32_t>(name.size()), hashOfFieldName(name)};
+      layout.places[names++] = {begin, static_cast<std::uint32_t>(name.size()),
+                                hashOfFieldName(name)};
       for (const char character : name) {
         layout.text[begin++] = character;
       }

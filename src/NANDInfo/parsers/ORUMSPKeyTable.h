@@ -1,8 +1,8 @@
 #pragma once
 
-#include <array>
 #include <cstddef>
 #include <cstdint>
+#include <span>
 #include <string_view>
 
 #include "NANDInfo/parsers/KnownNames.h"
@@ -24,10 +24,8 @@ struct ORUMSPKey {
   constexpr std::uint32_t size() const { return count * width(); }
 };
 
-inline constexpr std::size_t kORUMSPKeyCount = 234;
-
 /// All known statistics, by ascending key.
-extern const std::array<ORUMSPKey, kORUMSPKeyCount> ORUMSPKeyTable;
+extern const std::span<const ORUMSPKey> ORUMSPKeyTable;
 
 /// The statistic with that key, or null. Takes constant time.
 const ORUMSPKey* findORUMSPKey(std::uint16_t key);

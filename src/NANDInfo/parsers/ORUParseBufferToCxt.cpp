@@ -14,7 +14,7 @@ constexpr std::uint32_t kReadCountHisto = 265;
 // A full record gives fewer fields than it has words. But an array that is cut short takes the
 // words behind it, which are read again: a buffer of headers alone could give 256 fields a word. Up
 // to 1,024 words may.
-constexpr std::size_t kMostSharedFields = 1024 * 256;
+constexpr std::size_t kMaxSharedFields = 1024 * 256;
 
 /// By id; null for statistics outside the summary.
 constexpr auto kSummaryFieldOfId = [] {
@@ -56,8 +56,7 @@ bool ORUParseBufferToCxt(ORUStatsContext& ctx, std::span<const std::uint8_t> buf
     return false;
   }
   ctx.fields.reserve(reader.remaining());
-  const std::size_t mostFields =
-      ctx.fields.size() + std::max(reader.remaining(), kMostSharedFields);
+  const std::size_t mostFields = ctx.fields.size() + std::max(reader.remaining(), kMaxSharedFields);
   do {
     const StatisticsRecordHeader header = reader.readHeader();
     if (!reader.holds(header) || ctx.fields.size() > mostFields) {

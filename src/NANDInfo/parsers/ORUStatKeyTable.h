@@ -1,8 +1,8 @@
 #pragma once
 
-#include <array>
 #include <cstddef>
 #include <cstdint>
+#include <span>
 #include <string_view>
 
 #include "NANDInfo/parsers/KnownNames.h"
@@ -18,10 +18,8 @@ struct ORUStatKey {
   constexpr bool isArray() const { return count > 1; }
 };
 
-inline constexpr std::size_t kORUStatKeyCount = 657;
-
 /// All known statistics, by ascending id.
-extern const std::array<ORUStatKey, kORUStatKeyCount> ORUStatKeyTable;
+extern const std::span<const ORUStatKey> ORUStatKeyTable;
 
 /// The statistic with that id, or null. Takes constant time.
 const ORUStatKey* findORUStatKey(std::uint32_t id);

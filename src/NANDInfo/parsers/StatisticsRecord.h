@@ -18,7 +18,7 @@ namespace vesprun {
 /// a buffer, too few for a word, are ignored.
 struct StatisticsRecordHeader {
   /// The largest valid id.
-  static constexpr std::uint32_t kLargestId = 0x30000000;
+  static constexpr std::uint32_t kMaxId = 0x30000000;
 
   std::uint32_t id;
   std::uint32_t count;  ///< words that follow the header
@@ -54,7 +54,7 @@ class StatisticsRecordReader {
   }
   /// True when the header just read has a valid id and the buffer holds its payload.
   bool holds(const StatisticsRecordHeader& header) const {
-    return header.id <= StatisticsRecordHeader::kLargestId && header.count <= remaining();
+    return header.id <= StatisticsRecordHeader::kMaxId && header.count <= remaining();
   }
   /// There must be as many.
   void skip(std::size_t words) { _rest = _rest.subspan(words * kWordSize); }

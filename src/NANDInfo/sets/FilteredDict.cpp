@@ -19,7 +19,7 @@ constexpr std::array<std::uint64_t, 20> kPowersOfTen = [] {
   return powers;
 }();
 
-constexpr std::uint64_t kMostCutDigits = 18;
+constexpr std::uint64_t kMaxCutDigits = 18;
 
 /// The whole part of log10(x) in double precision, plus 1. Counting digits is faster and can only
 /// differ near a power of ten.
@@ -45,7 +45,7 @@ std::uint64_t roundSig(std::uint64_t x, std::uint64_t sig) {
     return x;
   }
   const std::uint64_t cut = digits - sig;
-  if (cut > kMostCutDigits) {
+  if (cut > kMaxCutDigits) {
     return 0;
   }
   const std::uint64_t power = kPowersOfTen[static_cast<std::size_t>(cut)];

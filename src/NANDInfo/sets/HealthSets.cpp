@@ -27,16 +27,16 @@ constexpr unsigned kE2EErrorCounters = 12;
 
 constexpr auto kTendmarkKeys = std::to_array<FieldRange>(
     {kMaxPercentageNANDUsed, kHostReadErrors, kMaxE2EErrors, kNumGrownBadBlocks, kNumDieFailures});
-constinit const FieldTable kTendmarkFields = fieldTable<kTendmarkKeys, 5>();
+constinit const FieldTable kTendmarkFields = fieldTable<kTendmarkKeys>();
 
 constexpr auto kOTAKeys = std::to_array<FieldRange>(
     {kMaxPercentageNANDUsed, kHostReadErrors, kMaxE2EErrors, kNumGrownBadBlocks});
-constinit const FieldTable kOTAFields = fieldTable<kOTAKeys, 4>();
+constinit const FieldTable kOTAFields = fieldTable<kOTAKeys>();
 
 constexpr auto kInternalLabKeys =
     std::to_array<FieldRange>({kMaxPercentageNANDUsed, kHostReadErrors, kMaxE2EErrors,
                                kSpareAvailablePercent, kNumGrownBadBlocks});
-constinit const FieldTable kInternalLabFields = fieldTable<kInternalLabKeys, 5>();
+constinit const FieldTable kInternalLabFields = fieldTable<kInternalLabKeys>();
 
 /// As a signed 32-bit number; 0 when negative or missing.
 std::int32_t atLeastZero(const PropertyDict& fields, std::string_view name) {

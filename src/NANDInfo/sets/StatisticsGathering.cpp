@@ -40,15 +40,15 @@ bool fetch(RegistryHandle connection, const nand_exporter_t& exporter,
                               answer.buffer, answer.length);
 }
 
-/// Up to `kMostMSPs`.
+/// Up to `kMaxMSPs`.
 std::uint32_t countMSPs(const nand_exporter_t& exporter) {
-  constexpr std::uint32_t kMostMSPs = 10;
+  constexpr std::uint32_t kMaxMSPs = 10;
   std::uint32_t count = 0;
   const auto answers = [&] {
     Answer answer;
     return fetch(exporter.connection, exporter, exporter.getMspStatsSelectors, count, answer);
   };
-  while (count < kMostMSPs && answers()) {
+  while (count < kMaxMSPs && answers()) {
     ++count;
   }
   return count;

@@ -100,7 +100,7 @@ constexpr auto kSources = std::to_array<FieldRange>({
 
 }  // namespace
 
-constinit const FieldTable kSourcesOfOtherData = fieldTable<kSources, 121>();
+constinit const FieldTable kSourcesOfOtherData = fieldTable<kSources>();
 
 void copyField(const PropertyDict& from, std::string_view name, PropertyDict& to,
                std::string_view newName) {

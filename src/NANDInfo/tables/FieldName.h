@@ -85,9 +85,9 @@ class NameText {
   constexpr operator std::string_view() const { return {_text.data(), _size}; }
 
  private:
-  static constexpr std::size_t kLongest = 128;
+  static constexpr std::size_t kMaxLength = 128;
 
-  std::array<char, kLongest> _text{};
+  std::array<char, kMaxLength> _text{};
   std::size_t _size = 0;
 };
 

@@ -133,10 +133,8 @@ class FieldTable {
 template <const auto& kRanges>
 inline constexpr FieldIndex<kRanges> kFieldIndexOf;
 
-/// The table of ranges that hold `kFieldCount` names.
-template <const auto& kRanges, std::size_t kFieldCount>
+template <const auto& kRanges>
 constexpr FieldTable fieldTable() {
-  static_assert(countNames(kRanges) == kFieldCount);
   return FieldTable(kFieldIndexOf<kRanges>);
 }
 

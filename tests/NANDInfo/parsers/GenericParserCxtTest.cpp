@@ -55,7 +55,7 @@ TEST(GenericParserCxt, CutsNamesAt98Characters) {
 }
 
 constexpr auto kFilterRanges = std::to_array<FieldRange>({"b", "c"});
-constexpr FieldTable kFilter = fieldTable<kFilterRanges, 2>();
+constexpr FieldTable kFilter = fieldTable<kFilterRanges>();
 
 TEST(GenericParserCxt, KeepsOrderAndRepeatsUntilReleased) {
   GenericParserCxt ctx;

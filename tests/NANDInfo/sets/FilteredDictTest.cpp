@@ -27,7 +27,7 @@ TEST(RoundSig, RoundsHalfUpOnTheDigitThatIsCutOff) {
 }
 
 constexpr auto kListedRanges = std::to_array<FieldRange>({{2, "a"}, {1, "b"}, {3, "bin", 9, 11}});
-constexpr FieldTable kListed = fieldTable<kListedRanges, 5>();
+constexpr FieldTable kListed = fieldTable<kListedRanges>();
 
 std::vector<std::string> keysOf(const PropertyDict& dict) {
   std::vector<std::string> keys;

@@ -13,7 +13,7 @@ namespace {
 
 constexpr auto kRanges = std::to_array<FieldRange>(
     {{1, "step10"}, {2, "step", 12, 14}, {3, "step_2b"}, {4, "step"}, {5, "step", 0, 3}, {6, "7"}});
-constexpr FieldTable kTable = fieldTable<kRanges, 11>();
+constexpr FieldTable kTable = fieldTable<kRanges>();
 
 TEST(FieldTable, TellsNumbersAndTheirSpellingApart) {
   const std::pair<int, std::vector<const char*>> cases[] = {

@@ -126,7 +126,7 @@ class Client {
   void send(std::string_view document) const {
     const std::optional<std::string> frame = messageFrame(document);
     if (!frame) {
-      throw CommandFailure("the document is longer than the " + std::to_string(kLongestMessage) +
+      throw CommandFailure("the document is longer than the " + std::to_string(kMaxMessageSize) +
                            " bytes that a message may carry");
     }
     for (std::string_view rest = *frame; !rest.empty();) {

@@ -113,7 +113,7 @@ void append(const PropertyValue& value, std::string& text) {
   }
 }
 
-/// What an object of one tagged entry means. Nothing for any other dictionary and, with a text in
+/// Decodes a tagged object (`{"date": ...}`). Nothing for any other dictionary and, with a text in
 /// `fault`, for an entry that means nothing.
 std::optional<PropertyValue> meaningOf(const PropertyDict& dict, std::string& fault) {
   if (dict.size() != 1) {
@@ -128,8 +128,8 @@ std::optional<PropertyValue> meaningOf(const PropertyDict& dict, std::string& fa
       fault = "a \"float\" that single precision cannot hold";
       return std::nullopt;
     }
-    constexpr double kLargest = std::numeric_limits<float>::max();
-    return PropertyValue(static_cast<float>(std::clamp(real, -kLargest, kLargest)));
+    constexpr double kMax = std::numeric_limits<float>::max();
+    return PropertyValue(static_cast<float>(std::clamp(real, -kMax, kMax)));
   }
   const std::string* text = content.string();
   if (text == nullptr) {
@@ -154,7 +154,7 @@ std::optional<PropertyValue> meaningOf(const PropertyDict& dict, std::string& fa
   return std::nullopt;
 }
 
-/// Puts in their place what the objects of a plain value mean, up to a fault.
+/// Replaces tagged objects by the values they encode; stops at the first fault.
 void resolve(PropertyValue& value, std::string& fault, NestedPlace& place) {
   const auto resolvePart = [&](const auto& step, const PropertyValue& part) {
     // Containers show their parts as constants.
@@ -264,7 +264,7 @@ class ValueBuilder final : public nlohmann::json_sax<Json> {
   };
 
   bool open(bool isObject) {
-    if (_open.size() == kMostNestedLevels) {
+    if (_open.size() == kMaxNestedLevels) {
       return fail(kNestedTooDeeply);
     }
     _open.push_back({isObject});

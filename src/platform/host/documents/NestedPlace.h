@@ -10,7 +10,7 @@
 namespace vesprun {
 
 /// How deep dictionaries and arrays may nest, in ptree documents and in JSON.
-inline constexpr std::size_t kMostNestedLevels = 200;
+inline constexpr std::size_t kMaxNestedLevels = 200;
 inline constexpr const char* kNestedTooDeeply = "nested deeper than 200 levels";
 
 /// The path to a place in a value, collected from the inside out as a recursive walk returns.
@@ -21,12 +21,12 @@ class NestedPlace {
 
   /// "STEP > STEP: MESSAGE" with the 8 outermost steps.
   std::string with(const std::string& message) const {
-    constexpr std::size_t kMostSteps = 8;
+    constexpr std::size_t kMaxSteps = 8;
     std::string text;
-    for (std::size_t step = 0; step < _steps.size() && step < kMostSteps; ++step) {
+    for (std::size_t step = 0; step < _steps.size() && step < kMaxSteps; ++step) {
       text += (step == 0 ? "" : " > ") + _steps[_steps.size() - 1 - step];
     }
-    if (_steps.size() > kMostSteps) {
+    if (_steps.size() > kMaxSteps) {
       text += " > \xE2\x80\xA6";
     }
     return text.empty() ? message : text + ": " + message;

@@ -46,7 +46,7 @@ struct Fault {
   std::string message;
 };
 
-/// As the first of the types that hold it.
+/// Parses as the first type that can hold it.
 template <typename... Types>
 std::optional<Number> parseNumber(std::string_view text) {
   std::optional<Number> number;
@@ -121,7 +121,7 @@ class PtreeParser {
   }
 
   void parse(std::string_view document) {
-    if (document.size() > kLongestPtree) {
+    if (document.size() > kMaxPtreeSize) {
       throw Fault{1, "the document is longer than 256 MiB"};
     }
     if (document.substr(0, 2).find_first_of(std::string_view("\0\xFE\xFF", 3)) != document.npos) {
@@ -189,7 +189,7 @@ class PtreeParser {
       _inText = true;
       _elementLine = line();
       _text.clear();
-    } else if (_open.size() == kMostNestedLevels) {
+    } else if (_open.size() == kMaxNestedLevels) {
       fail(kNestedTooDeeply);
     } else {
       _open.push_back({_element == Element::Dict});
@@ -424,13 +424,13 @@ class PtreeParser {
   }
 
   static std::string_view nameAt(std::string_view text) {
-    constexpr std::size_t kLongest = 64;
+    constexpr std::size_t kMaxLength = 64;
     const auto* end = std::find_if(text.begin(), text.end(), [](char c) {
       const auto byte = static_cast<std::uint8_t>(c);
       return byte < 0x80 && std::isalnum(byte) == 0 &&
              std::string_view("_:-.").find(c) == std::string_view::npos;
     });
-    return text.substr(0, std::min(static_cast<std::size_t>(end - text.begin()), kLongest));
+    return text.substr(0, std::min(static_cast<std::size_t>(end - text.begin()), kMaxLength));
   }
 
   std::unique_ptr<XML_ParserStruct, Free> _expat;

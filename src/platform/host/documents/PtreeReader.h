@@ -12,7 +12,7 @@
 namespace vesprun {
 
 /// In bytes: 256 MiB.
-inline constexpr std::size_t kLongestPtree = std::size_t{256} << 20;
+inline constexpr std::size_t kMaxPtreeSize = std::size_t{256} << 20;
 
 /// Reads a ptree document in XML form. Nothing, with "line 12: ..." in `error`, when the bytes are
 /// not one.
@@ -37,7 +37,7 @@ using PtreeEntryVisitor = std::function<void(std::span<const std::string_view> k
                                              std::size_t line, const PropertyValue& value)>;
 
 /// The same, and `visit` gets each entry in the order of the document, an entry that a later one
-/// with its key replaces as well. Also of a document that turns out to be none.
+/// with its key replaces as well. Also for input that later proves malformed.
 std::optional<PropertyValue> readPtreeEntries(std::string_view bytes, std::string& error,
                                               const PtreeEntryVisitor& visit);
 

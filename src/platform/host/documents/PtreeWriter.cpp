@@ -70,7 +70,7 @@ class TreeWalk {
   template <typename Content>
   bool takeContainer(std::string_view name, bool isEmpty, const Content& takeContent) {
     writeLine({"<", name, isEmpty ? "/>" : ">"});
-    if (++_level > kMostNestedLevels) {
+    if (++_level > kMaxNestedLevels) {
       return fail(kNestedTooDeeply);
     }
     if (!takeContent()) {

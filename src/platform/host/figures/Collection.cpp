@@ -11,7 +11,7 @@ namespace vesprun {
 namespace {
 
 // Vanished devices are remembered, since they may come back; but names must not pile up.
-constexpr std::size_t kMostMarks = 8192;
+constexpr std::size_t kMaxMarks = 8192;
 
 /// What is remembered of a figure, of a file that was left out, or of the boot.
 struct Mark {
@@ -115,7 +115,7 @@ class Collection {
       }
     }
     for (const auto& [place, mark] : _last) {
-      if (_goesOn && _next.size() < kMostMarks) {
+      if (_goesOn && _next.size() < kMaxMarks) {
         _next.try_emplace(place, mark);
       }
     }

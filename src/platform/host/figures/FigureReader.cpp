@@ -19,9 +19,9 @@
 namespace vesprun {
 namespace {
 
-constexpr std::size_t kLongestFile = 256 * 1024;
-constexpr std::size_t kMostDevices = 512;
-constexpr std::size_t kLongestName = 40;
+constexpr std::size_t kMaxFileSize = 256 * 1024;
+constexpr std::size_t kMaxDevices = 512;
+constexpr std::size_t kMaxNameLength = 40;
 constexpr std::size_t kAddressDigits = 12;
 constexpr std::string_view kClockFile = "clock";
 
@@ -88,7 +88,7 @@ std::string nameInKey(std::string_view name) {
       name.substr(name.size() - kAddressDigits).find_first_not_of(kHexDigits) == name.npos) {
     name.remove_suffix(kAddressDigits);
   }
-  std::string text(name.substr(0, kLongestName));
+  std::string text(name.substr(0, kMaxNameLength));
   std::ranges::replace_if(
       text, [](char c) { return kSafe.find(c) == kSafe.npos; }, '_');
   return text;
@@ -111,8 +111,8 @@ class FigureReader {
   }
 
   std::string boot(std::string_view file) {
-    return std::string(
-        fieldOf(text(std::string(file)).value_or(std::string_view()), "1").substr(0, kLongestName));
+    return std::string(fieldOf(text(std::string(file)).value_or(std::string_view()), "1")
+                           .substr(0, kMaxNameLength));
   }
 
  private:
@@ -212,13 +212,13 @@ class FigureReader {
     std::size_t size = 0;
     ssize_t count = 0;
     do {
-      count = ::read(file.get(), _buffer.get() + size, kLongestFile + 1 - size);
+      count = ::read(file.get(), _buffer.get() + size, kMaxFileSize + 1 - size);
       size += count > 0 ? static_cast<std::size_t>(count) : 0;
-    } while ((count > 0 && size <= kLongestFile) || (count < 0 && errno == EINTR));
+    } while ((count > 0 && size <= kMaxFileSize) || (count < 0 && errno == EINTR));
     if (count < 0) {
       return failed(path);
     }
-    if (size > kLongestFile) {
+    if (size > kMaxFileSize) {
       return complain(path, "longer than 256 KiB");
     }
     const std::string_view content(_buffer.get(), size);
@@ -239,7 +239,7 @@ class FigureReader {
       return std::nullopt;
     }
     const int size =
-        std::snprintf(_buffer.get(), kLongestFile, "awake %lld\nasleep %lld\n",
+        std::snprintf(_buffer.get(), kMaxFileSize, "awake %lld\nasleep %lld\n",
                       static_cast<long long>(awake.tv_sec),
                       static_cast<long long>(std::max(all.tv_sec - awake.tv_sec, time_t{0})));
     return std::string_view(_buffer.get(), static_cast<std::size_t>(size));
@@ -277,8 +277,8 @@ class FigureReader {
       if (!matchesPatterns(entry->d_name, patterns)) {
         continue;
       }
-      if (names.size() == kMostDevices) {
-        return complain(folder, "more than " + std::to_string(kMostDevices) + " devices");
+      if (names.size() == kMaxDevices) {
+        return complain(folder, "more than " + std::to_string(kMaxDevices) + " devices");
       }
       names.emplace_back(entry->d_name);
     }
@@ -299,7 +299,7 @@ class FigureReader {
   std::span<const LinuxFigure> _figures;
   bool _isListed = false;
   std::unique_ptr<char[]> _buffer{
-      new char[kLongestFile + 1]};  // pages that nothing is read into cost nothing
+      new char[kMaxFileSize + 1]};  // pages that nothing is read into cost nothing
   std::map<std::string, std::optional<std::vector<std::string>>> _devices;  ///< by folder and class
 };
 

@@ -1,16 +1,17 @@
 #include "platform/host/figures/FigureTable.h"
 
 #include <algorithm>
+#include <iterator>
 
 namespace vesprun {
 namespace {
 
 // Far above what a system counts between two starts, and low enough that sums do not overflow.
-constexpr std::int64_t kHighestCount = std::int64_t{1} << 48;
+constexpr std::int64_t kMaxCount = std::int64_t{1} << 48;
 
 constexpr LinuxFigure counter(std::string_view file, std::string_view field, std::string_view key,
                               std::string_view unit, std::int64_t divisor, std::string_view why) {
-  return {file, field, key, unit, FigureKind::Counter, divisor, 0, kHighestCount, why};
+  return {file, field, key, unit, FigureKind::Counter, divisor, 0, kMaxCount, why};
 }
 
 constexpr std::int32_t kMebibytes[] = {64, 256, 1024, 2048, 4096, 8192, 16384, 65536};
@@ -166,6 +167,36 @@ constexpr DeviceClass kClasses[] = {
     {"<nvme>", "nvme#", "", ""},
     {"<watchdog>", "watchdog#", "", ""},
 };
+
+// A file is read once for the rows that stand together.
+constexpr bool rowsOfAFileAreTogether() {
+  for (std::size_t row = 1; row < std::size(kFigures); ++row) {
+    const std::string_view file = kFigures[row].file;
+    for (std::size_t other = 0; file != kFigures[row - 1].file && other < row; ++other) {
+      if (kFigures[other].file == file) {
+        return false;
+      }
+    }
+  }
+  return true;
+}
+static_assert(rowsOfAFileAreTogether());
+
+constexpr bool classesOfFilesAreKnown() {
+  for (const LinuxFigure& figure : kFigures) {
+    std::string_view rest = figure.file;
+    for (std::size_t begin; (begin = rest.find('<')) != std::string_view::npos;) {
+      rest.remove_prefix(begin);
+      const std::string_view name = rest.substr(0, rest.find('>') + 1);
+      if (std::ranges::find(kClasses, name, &DeviceClass::name) == std::end(kClasses)) {
+        return false;
+      }
+      rest.remove_prefix(name.size());
+    }
+  }
+  return true;
+}
+static_assert(classesOfFilesAreKnown());
 
 bool matches(std::string_view name, std::string_view pattern) {
   const std::size_t special = pattern.find_first_of("#@*");

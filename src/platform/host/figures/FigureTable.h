@@ -34,7 +34,7 @@ struct LinuxFigure {
 /// The devices that stand in a path for a name such as "<disk>".
 struct DeviceClass {
   std::string_view name;
-  /// Names of folders or files, parted by spaces. '#' is for digits, '@' for small letters, at
+  /// Names of folders or files, separated by spaces. '#' is for digits, '@' for small letters, at
   /// least one each, and '*' for anything without a dot.
   std::string_view patterns;
   /// What a device is called in keys: "." as it is named here, else as this file in it says. Empty:
@@ -44,7 +44,7 @@ struct DeviceClass {
   std::string_view identity;
 };
 
-/// All figures; those of one file stand together.
+/// All figures. Those of one file stand together, or the table does not compile.
 extern const std::span<const LinuxFigure> linuxFigures;
 extern const std::span<const DeviceClass> linuxDeviceClasses;
 

@@ -17,7 +17,7 @@
 namespace vesprun {
 namespace {
 
-constexpr std::size_t kMostPeers = 16;
+constexpr std::size_t kMaxPeers = 16;
 constexpr std::size_t kReceivedPiece = 64 * 1024;
 
 struct UnixPeer {
@@ -79,7 +79,7 @@ class UnixServiceListener final : public ServiceListener {
       tell("a peer of another user is turned away");
       return;
     }
-    if (_peers.size() == kMostPeers) {
+    if (_peers.size() == kMaxPeers) {
       const auto least = std::ranges::min_element(
           _peers, {}, [](const auto& peer) { return peer.second.worth(); });
       drop(least->first, "others wait, and it has been silent longest");
@@ -121,7 +121,7 @@ class UnixServiceListener final : public ServiceListener {
       queueWork([this, message = *std::move(message)] { _handler(message); });
     }
     if (progress == MessageAssembler::Progress::TooLong) {
-      drop(descriptor, "a message is longer than " + std::to_string(kLongestMessage) + " bytes");
+      drop(descriptor, "a message is longer than " + std::to_string(kMaxMessageSize) + " bytes");
     }
   }
 

@@ -15,7 +15,7 @@ constexpr std::size_t kLengthSize = sizeof(std::uint32_t);
 }  // namespace
 
 std::optional<std::string> messageFrame(std::string_view document) {
-  if (document.size() > kLongestMessage) {
+  if (document.size() > kMaxMessageSize) {
     return std::nullopt;
   }
   std::vector<std::uint8_t> length;
@@ -36,7 +36,7 @@ MessageAssembler::Progress MessageAssembler::take(std::string_view& bytes) {
   }
   const auto length =
       loadLittleEndian<std::uint32_t>(reinterpret_cast<const std::uint8_t*>(_frame.data()));
-  if (length > kLongestMessage) {
+  if (length > kMaxMessageSize) {
     return Progress::TooLong;
   }
   return fill(bytes, kLengthSize + length) ? Progress::Complete : Progress::Incomplete;

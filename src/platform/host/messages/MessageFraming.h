@@ -9,7 +9,7 @@
 namespace vesprun {
 
 /// The longest document of a message, in bytes.
-inline constexpr std::uint32_t kLongestMessage = 16 * 1024 * 1024;
+inline constexpr std::uint32_t kMaxMessageSize = 16 * 1024 * 1024;
 
 /// A message on the wire: the document's length as a 32-bit little-endian number, then the
 /// document. Nothing when it is too long.

@@ -199,8 +199,8 @@ bool HostPreferences::writeChanges(const Domain& domain, std::string& error) {
 
 bool HostPreferences::keepAside(const std::string& path, std::string& error) {
   const std::string aside = nameAside(path, "unreadable", _clock);
-  constexpr int kMostInOneSecond = 1000;
-  for (int number = 1; number <= kMostInOneSecond; ++number) {
+  constexpr int kMaxInOneSecond = 1000;
+  for (int number = 1; number <= kMaxInOneSecond; ++number) {
     const std::string name = number == 1 ? aside : aside + '-' + std::to_string(number);
     // A second name never replaces a file, and the domain's file is never missing.
     if (link(path.c_str(), name.c_str()) == 0) {

@@ -175,7 +175,7 @@ TEST(PtreeReader, ReadsLongTextsAndMarkupWhole) {
             "line " + std::to_string(lines + 1) + ": an unknown entity");
   EXPECT_EQ(readingError(inPtree("<array " + text + "/>")),
             "line 1: <array> cannot have attributes");
-  EXPECT_EQ(readingError(std::string(kLongestPtree + 1, ' ')),
+  EXPECT_EQ(readingError(std::string(kMaxPtreeSize + 1, ' ')),
             "line 1: the document is longer than 256 MiB");
 }
 

@@ -1,0 +1,142 @@
+#pragma once
+
+#include <algorithm>
+#include <array>
+#include <compare>
+#include <cstddef>
+#include <cstdint>
+#include <limits>
+#include <string_view>
+#include <utility>
+
+#include "NANDInfo/tables/FieldTable.h"
+
+namespace vesprun {
+
+/// What a field can be in: the sets that may leave the device, the views of the stats magazine, the
+/// derived fields that go into other sets than the FTL's, and the analytics events.
+enum class FieldList : std::uint8_t {
+  None,
+  InNoSet,  ///< an event adds the field itself, or lists it and never has it
+  FTL,
+  MSP,
+  Storage,
+  Accumulating,
+  Dynamic,
+  Derived,
+  FTLCounters,
+  FTLHistograms1,
+  FTLHistograms2,
+  MSPCounters,
+  StorageStats,
+  Daily,
+  Weekly,
+  Monthly,
+};
+
+/// A list that a field is in.
+struct FieldListEntry {
+  FieldList list = FieldList::None;
+  /// Orders the list; fields without one come last. Sets have the fields with the fewest digits
+  /// first, views of the magazine are sorted by name.
+  std::uint16_t place = std::numeric_limits<std::uint16_t>::max();
+
+  consteval FieldListEntry() = default;
+  consteval FieldListEntry(FieldList fieldList) : list(fieldList) {}
+  consteval FieldListEntry(FieldList fieldList, std::uint16_t placeInList)
+      : list(fieldList), place(placeInList) {}
+};
+
+/// All that is known of a field, or of consecutively numbered ones.
+struct FieldRow {
+  FieldRange fields;  ///< digits: of the sets that round
+  std::array<FieldListEntry, 10> lists;
+
+  /// A field that is in an event but in no set would never be sent: it does not compile.
+  consteval FieldRow(FieldRange range, std::array<FieldListEntry, 10> entries)
+      : fields(range), lists(entries) {
+    bool isInSet = false;
+    bool isInEvent = false;
+    bool isInNoSet = false;
+    for (const FieldListEntry& entry : lists) {
+      isInSet = isInSet || (FieldList::FTL <= entry.list && entry.list <= FieldList::Derived);
+      isInEvent = isInEvent || FieldList::FTLCounters <= entry.list;
+      isInNoSet = isInNoSet || entry.list == FieldList::InNoSet;
+    }
+    if (isInEvent && isInSet == isInNoSet) {
+      throw "a field of an event is in a set, or marked as in none";
+    }
+  }
+
+  /// Null when it is not in the list.
+  constexpr const FieldListEntry* in(FieldList list) const {
+    for (const FieldListEntry& entry : lists) {
+      if (entry.list == list) {
+        return &entry;
+      }
+    }
+    return nullptr;
+  }
+};
+
+namespace fieldRows {
+
+using enum FieldList;
+
+inline constexpr auto kFieldRows = std::to_array<FieldRow>({
+#include "NANDInfo/tables/StorageFields.inc"
+// The sets have this order where digits are the same.
+#include "NANDInfo/tables/FTLFields.inc"
+#include "NANDInfo/tables/MSPFields.inc"
+});
+
+}  // namespace fieldRows
+
+/// The fields of a list, in its order.
+template <FieldList kList>
+inline constexpr auto kFieldsOf = [] {
+  struct Sorted {
+    std::uint16_t place;
+    std::uint8_t digits;
+    std::string_view stem;
+    std::uint32_t number;
+    std::size_t row;
+
+    constexpr auto operator<=>(const Sorted&) const = default;
+  };
+  constexpr const auto& kRows = fieldRows::kFieldRows;
+  constexpr bool kSortedByDigits = kList <= FieldList::Storage;
+  constexpr bool kSortedByName = kList == FieldList::Accumulating || kList == FieldList::Dynamic;
+  constexpr auto kCount = [] {
+    std::size_t count = 0;
+    for (const FieldRow& row : kRows) {
+      if (row.in(kList) != nullptr) {
+        ++count;
+      }
+    }
+    return count;
+  }();
+  std::array<Sorted, kCount> sorted{};
+  std::size_t count = 0;
+  for (std::size_t i = 0; i < kRows.size(); ++i) {
+    const auto& [fields, lists] = kRows[i];
+    if (const FieldListEntry* entry = kRows[i].in(kList)) {
+      sorted[count++] = {entry->place, kSortedByDigits ? fields.digits : std::uint8_t{0},
+                         kSortedByName ? fields.stem : std::string_view(),
+                         kSortedByName ? fields.first : 0, i};
+    }
+  }
+  std::sort(sorted.begin(), sorted.end());
+  return [&]<std::size_t... kAt>(std::index_sequence<kAt...>) {
+    return std::array<FieldRange, kCount>{kRows[sorted[kAt].row].fields...};
+  }
+  (std::make_index_sequence<kCount>());
+}();
+
+/// The same as a table, to be searched.
+template <FieldList kList>
+constexpr FieldTable fieldTableOf() {
+  return fieldTable<kFieldsOf<kList>>();
+}
+
+}  // namespace vesprun
