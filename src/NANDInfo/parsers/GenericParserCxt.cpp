@@ -42,20 +42,17 @@ bool GenericParserCxt::append(std::string_view prefix, std::string_view suffix,
 
 bool GenericParserCxt::appendKnown(KnownNames names, const std::uint8_t* source, std::size_t width,
                                    std::size_t count) noexcept {
-  const std::size_t fields = _values.size();
   try {
-    _values.resize(fields + count);
-    _runs.push_back({names, static_cast<std::uint32_t>(count), 0});
+    Run& run = _runs.emplace_back(Run{names, 0, 0});
+    for (; run.size < count; ++run.size) {
+      const std::uint8_t* const element = source + run.size * width;
+      _values.push_back(width == sizeof(std::uint64_t) ? loadLittleEndian<std::uint64_t>(element)
+                                                       : loadLittleEndian(element, width));
+    }
+    return true;
   } catch (const std::bad_alloc&) {
-    _values.resize(fields);
     return false;
   }
-  for (std::size_t i = 0; i < count; ++i) {
-    const std::uint8_t* const element = source + i * width;
-    _values[fields + i] = width == sizeof(std::uint64_t) ? loadLittleEndian<std::uint64_t>(element)
-                                                         : loadLittleEndian(element, width);
-  }
-  return true;
 }
 
 bool AddSingleValueToGenericContext(GenericParserCxt& ctx, std::string_view prefix,

@@ -54,7 +54,7 @@ class GenericParserCxt {
   /// See `AddSingleValueToGenericContext`.
   bool append(std::string_view prefix, std::string_view suffix, std::uint64_t value) noexcept;
   /// Appends `count` fields under these names: the little-endian values of `width` bytes, 1 to 8,
-  /// at `source`. False, and nothing appended, when memory runs out.
+  /// at `source`. False when memory runs out; fields are then missing.
   bool appendKnown(KnownNames names, const std::uint8_t* source, std::size_t width,
                    std::size_t count) noexcept;
   /// Empties the context and frees its memory.
