@@ -72,7 +72,7 @@ struct EntryMetadata {
 
 /// The first option that nothing reads in a list of that kind; null when there is none.
 template <typename Options>
-const PropertyKey* unreadOption(const PropertyDict& options) {
+const std::string* unreadOption(const PropertyDict& options) {
   for (const auto& [name, value] : options) {
     if (!Options::isRead(name) && !EntryMetadata::isName(name)) {
       return &name;

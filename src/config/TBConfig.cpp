@@ -53,12 +53,12 @@ void reportHeldBack(std::string_view list, const Entries& entries) {
 template <typename Options>
 void reportUnread(std::string_view list, const typename WhitelistTable<Options>::Entries& entries) {
   std::size_t count = 0;
-  const PropertyKey* option = nullptr;
+  const std::string* option = nullptr;
   const WhitelistEntry<Options>* first = nullptr;
   std::string_view firstKey;
   for (const auto& [key, entry] : entries) {
     const PropertyDict* written = entry.written->dict();
-    const PropertyKey* unread = written != nullptr ? unreadOption<Options>(*written) : nullptr;
+    const std::string* unread = written != nullptr ? unreadOption<Options>(*written) : nullptr;
     if (unread == nullptr) {
       continue;
     }
