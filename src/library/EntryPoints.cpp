@@ -138,10 +138,9 @@ std::optional<std::uint64_t> argumentValue(const EntryPointParameter& parameter,
 
 std::span<const EntryPointRow> entryPoints() { return kEntryPoints; }
 
-std::string callToJson(const EntryPointRow& entryPoint, std::span<const std::uint64_t> values) {
-  const Answer result = entryPoint.call(values);
-  return "{\"result\":" + (result ? jsonText(*result) : "null") +
-         ",\"error\":" + jsonText(PropertyValue(GetAPIErrorMessage())) + '}';
+Json callToJson(const EntryPointRow& entryPoint, std::span<const std::uint64_t> values) {
+  Json result = jsonOrNull(entryPoint.call(values));
+  return {{"result", std::move(result)}, {"error", GetAPIErrorMessage()}};
 }
 
 std::optional<std::string> callByName(std::string_view name, std::string_view arguments,
@@ -187,7 +186,7 @@ std::optional<std::string> callByName(std::string_view name, std::string_view ar
     }
     values.push_back(given[i].value_or(row->parameters[i].absent));
   }
-  return callToJson(*row, values);
+  return jsonText(callToJson(*row, values));
 }
 
 }  // namespace vesprun

@@ -7,6 +7,7 @@
 #include <string_view>
 
 #include "common/PropertyValue.h"
+#include "platform/host/documents/JsonForm.h"
 
 namespace vesprun {
 
@@ -35,7 +36,7 @@ std::span<const EntryPointRow> entryPoints();
 
 /// The result of the call, or null, and the first error text of the process:
 /// {"result":VALUE,"error":TEXT}. Throws `std::bad_alloc`.
-std::string callToJson(const EntryPointRow& entryPoint, std::span<const std::uint64_t> values);
+Json callToJson(const EntryPointRow& entryPoint, std::span<const std::uint64_t> values);
 
 /// The same for an entry point by either name and a JSON object of its arguments. Nothing, with a
 /// text in `error`, for an unknown entry point or argument.

@@ -77,11 +77,11 @@ TEST_F(OutlookTest, PreviewsWhatTheRunSubmitsRightAfter) {
     const bool today = seed % 4 == 3;
     const std::string day = today ? " --day 19787" : "";
     const std::string before = snapshot();
-    const std::string preview = print("preview \"$D\" --document" + day);
-    const std::string json = print("preview \"$D\"" + day);
-    const PropertyValue leftOut = valueOfJson(print("preview \"$D\" --left-out" + day));
+    const std::string preview = print("preview --document" + day);
+    const std::string json = print("preview" + day);
+    const PropertyValue leftOut = valueOfJson(print("preview --left-out" + day));
     EXPECT_EQ(snapshot(), before) << seed;
-    print(std::string("run \"$D\" -- ") + (today ? "-t" : "-f"));
+    print(std::string("run -- ") + (today ? "-t" : "-f"));
     const bool hasLog = run("ptree device/outbox/logs/*-193-*.ptree") == 0;
     EXPECT_EQ(json, hasLog ? output : "null\n") << seed;
     EXPECT_EQ(preview, hasLog ? shell("cat device/outbox/logs/*-193-*.ptree") : "") << seed;
@@ -89,7 +89,7 @@ TEST_F(OutlookTest, PreviewsWhatTheRunSubmitsRightAfter) {
     if (!leftOut.array()->empty()) {
       const PropertyDict& row = *leftOut.array()->back().dict();
       const bool isScalar = *row.findString("kind") == "scalar";
-      print("explain \"$D\" " + *row.findString("key") + (isScalar ? "" : " --distribution"));
+      print("explain " + *row.findString("key") + (isScalar ? "" : " --distribution"));
       EXPECT_THAT(output, HasSubstr("\"leaves\":false")) << seed;
     }
     std::filesystem::remove_all(folder.path("device/outbox"));
@@ -118,13 +118,13 @@ TEST_F(OutlookTest, PreviewsNullWhereNothingWouldBeSubmitted) {
   for (const auto& [entries, whitelist, complaint] : cases) {
     describe(entries);
     writePtree(kWhitelist, whitelist);
-    EXPECT_EQ(print("preview \"$D\""), "null\n") << whitelist;
+    EXPECT_EQ(print("preview"), "null\n") << whitelist;
     EXPECT_TRUE(error.starts_with(complaint) && error.empty() == (*complaint == '\0')) << error;
-    EXPECT_EQ(print("preview \"$D\" --document"), "");
+    EXPECT_EQ(print("preview --document"), "");
   }
-  EXPECT_EQ(print("preview \"$D\" --left-out"), "[{\"kind\":\"scalar\",\"key\":\"s\"}]\n");
-  EXPECT_EQ(run("preview \"$D\" --left-out --document"), 2);
-  EXPECT_EQ(run("preview \"$D\" --day x"), 2);
+  EXPECT_EQ(print("preview --left-out"), "[{\"kind\":\"scalar\",\"key\":\"s\"}]\n");
+  EXPECT_EQ(run("preview --left-out --document"), 2);
+  EXPECT_EQ(run("preview --day x"), 2);
 }
 
 TEST_F(OutlookTest, LooksAtADeviceWithoutTouchingIt) {
@@ -156,8 +156,8 @@ TEST_F(OutlookTest, LooksAtADeviceWithoutTouchingIt) {
     shell("chmod -R a-w device");
     const std::string before = snapshot();
     for (const char* command :
-         {"preview \"$D\"", "preview \"$D\" --left-out", "explain \"$D\" s", "page \"$D\"",
-          "whitelist diff \"$D\" device/Library/*/*/Whitelist_Stagebox.ptree"}) {
+         {"preview", "preview --left-out", "explain s", "page",
+          "whitelist diff device/Library/*/*/Whitelist_Stagebox.ptree"}) {
       EXPECT_EQ(run(command), *complaint == '\0' ? 0 : 1) << command << complaint << output;
       EXPECT_THAT(error, HasSubstr(complaint)) << command;
       EXPECT_EQ(std::count(error.begin(), error.end(), '\n'), *complaint == '\0' ? 0 : 1) << error;
@@ -203,7 +203,7 @@ TEST_F(OutlookTest, ExplainsByWhatAKeyLeavesOrStays) {
        R"("options":{"intervals":1},"source":false,"passedOver":[],"values":[{"day":19786,"statistics":null,"histogram":null}]})"},
   };
   for (const auto& [key, answer] : cases) {
-    EXPECT_THAT(print(std::string("explain \"$D\" ") + key), HasSubstr(answer));
+    EXPECT_THAT(print(std::string("explain ") + key), HasSubstr(answer));
   }
   describe(R"(, "properties": {"InternalBuild": true})");
   const std::pair<const char*, const char*> onInternalDevice[] = {
@@ -213,10 +213,10 @@ TEST_F(OutlookTest, ExplainsByWhatAKeyLeavesOrStays) {
       {"key.longer",
        R"("leaves":true,"by":"internal device","prefix":null,"group":null,"options":{},)"}};
   for (const auto& [key, answer] : onInternalDevice) {
-    EXPECT_THAT(print(std::string("explain \"$D\" ") + key), HasSubstr(answer));
+    EXPECT_THAT(print(std::string("explain ") + key), HasSubstr(answer));
   }
   std::filesystem::remove(folder.path(kWhitelist));
-  EXPECT_THAT(print("explain \"$D\" key"), HasSubstr(R"("leaves":false,"by":null,)" + nothing));
+  EXPECT_THAT(print("explain key"), HasSubstr(R"("leaves":false,"by":null,)" + nothing));
 }
 
 TEST_F(OutlookTest, FindsEachFaultOfAWhitelist) {
@@ -274,12 +274,12 @@ TEST_F(OutlookTest, TellsWhatAnotherWhitelistWouldChange) {
   writePtree("next", R"({"G": {"ScalarKeyPrefixes": {"a": {"sig_fig": 2.0}, "b": {}},
       "DistributionKeys": {"d": {"intervals": [1.0, 3]}, "e": {"sig_fig": 1}}}})");
   EXPECT_EQ(
-      print("whitelist diff \"$D\" next"),
+      print("whitelist diff next"),
       R"({"scalars":{"added":["b"],"removed":["com.quill.usage.cur_boot_session_cpu_uptime"],)"
       R"("changed":[]},"distributions":{"added":[],"removed":[],"changed":[{"key":"d",)"
       R"("before":{"intervals":[1,2]},"after":{"intervals":[1.0,3]}}]}})"
       "\n");
-  EXPECT_EQ(run("whitelist diff \"$D\" - <<<'<ptree>'"), 1);
+  EXPECT_EQ(run("whitelist diff - <<<'<ptree>'"), 1);
   EXPECT_THAT(error, HasSubstr("standard input"));
 }
 

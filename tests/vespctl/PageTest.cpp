@@ -28,11 +28,11 @@ class PageTest : public VespctlTest {
                  std::string("{\"clock\": \"") + time + "\", \"registry\": []}");
     import(std::regex_replace(lines, std::regex("(scalar|sample)\t"),
                               "$1\t" + std::to_string(day) + '\t'));
-    print("run \"$D\" -- -f");
+    print("run -- -f");
   }
 
   const std::string& page() {
-    print("page \"$D\"");
+    print("page");
     EXPECT_THAT(output, StartsWith("<!DOCTYPE html>\n"));
     return output;
   }
@@ -194,7 +194,7 @@ TEST_F(PageTest, FoldsOldReportsAndLeavesOldEventsOut) {
   }
   import(days);
   folder.write("device/device.json", R"({"clock": "1970-01-23T09:00:00Z", "registry": []})");
-  print("catch-up \"$D\" --last 30");
+  print("catch-up --last 30");
   folder.write("device/outbox/events.jsonl", events);
   EXPECT_THAT(
       page(),
@@ -220,8 +220,8 @@ TEST_F(PageTest, NamesWhatItCannotRead) {
 TEST_F(PageTest, WritesAFileWholeOrNotAtAll) {
   folder.write("page.html", "earlier");
   folder.write("folder/kept", "");
-  EXPECT_EQ(run("page \"$D\" - >standard; ln -s page.html link; mkfifo pipe"), 0);
-  EXPECT_EQ(run("page \"$D\" link"), 0) << error;
+  EXPECT_EQ(run("page - >standard; ln -s page.html link; mkfifo pipe"), 0);
+  EXPECT_EQ(run("page link"), 0) << error;
   EXPECT_EQ(folder.read("page.html"), folder.read("standard"));
   struct stat status {};
   EXPECT_EQ(stat(folder.path("page.html").c_str(), &status), 0);
@@ -229,10 +229,10 @@ TEST_F(PageTest, WritesAFileWholeOrNotAtAll) {
   for (const auto& [file, complaint] :
        {std::pair("folder", "not a regular file"), std::pair("pipe", "not a regular file"),
         std::pair("nowhere/page", "No such file"), std::pair("page.html/x", "Not a directory")}) {
-    EXPECT_EQ(run("page \"$D\" " + std::string(file)), 1) << file;
+    EXPECT_EQ(run("page " + std::string(file)), 1) << file;
     EXPECT_THAT(error, HasSubstr(complaint)) << file;
   }
-  EXPECT_EQ(run("page \"$D\" >/dev/full"), 1);
+  EXPECT_EQ(run("page >/dev/full"), 1);
   EXPECT_THAT(folder.names("folder"), ElementsAre("kept"));
 }
 

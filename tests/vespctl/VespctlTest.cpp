@@ -27,40 +27,40 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
   } cases[] = {
       {2, "frob", "unknown command \"frob\"; one of init, run,"},
       {2, "", "a command is missing; one of init, run,"},
-      {2, "counters \"$D\" frob 1",
+      {2, "counters frob 1",
        "unknown command \"frob\"; one of set, add, sample, import, dump"},
-      {2, "counters \"$D\"", "a command is missing; one of set"},
-      {2, "counters \"$D\" set k 1 2", "VALUE: At Most 1"},
+      {2, "counters", "a command is missing; one of set"},
+      {2, "counters set k 1 2", "VALUE: At Most 1"},
       {2, "ptree a b", "not expected"},
-      {2, "show \"$D\" frob", "unknown command \"frob\"; one of logs"},
-      {2, "prefs \"$D\" get d k --frob", "not expected"},
-      {2, "counters \"$D\" set k abc", "\"abc\" is not a signed 64-bit integer"},
-      {2, "counters \"$D\" set k 1 --day x", "\"x\" is not a day number"},
-      {2, "counters \"$D\" sample k 1 infinity", "\"infinity\" is not a double"},
-      {2, "counters \"$D\" dump --from a", "\"a\" is not a day number"},
-      {2, "prefs \"$D\" set d k '{'", "JSON: \"{\""},
+      {2, "show frob", "unknown command \"frob\"; one of logs"},
+      {2, "prefs get d k --frob", "not expected"},
+      {2, "counters set k abc", "\"abc\" is not a signed 64-bit integer"},
+      {2, "counters set k 1 --day x", "\"x\" is not a day number"},
+      {2, "counters sample k 1 infinity", "\"infinity\" is not a double"},
+      {2, "counters dump --from a", "\"a\" is not a day number"},
+      {2, "prefs set d k '{'", "JSON: \"{\""},
       {2, "fields frob", "there is no list \"frob\""},
-      {2, "nand \"$D\" magazine -- -1", noNumber},
-      {2, "nand \"$D\" magazine 18446744073709551616", noNumber},
-      {2, "nand \"$D\" magazine 0x8", noNumber},
-      {2, "nand \"$D\" magazine 1 --mode 0x1", noNumber},
-      {2, "nand \"$D\" magazine 1 --mode=-1", noNumber},
-      {2, "nand \"$D\" magazine 1 --mode 4294967296", noNumber},
+      {2, "nand magazine -- -1", noNumber},
+      {2, "nand magazine 18446744073709551616", noNumber},
+      {2, "nand magazine 0x8", noNumber},
+      {2, "nand magazine 1 --mode 0x1", noNumber},
+      {2, "nand magazine 1 --mode=-1", noNumber},
+      {2, "nand magazine 1 --mode 4294967296", noNumber},
       {1, "show nowhere", "nowhere: No such file"},
       {1, "show file logs", "file/outbox/logs: Not a directory"},
       {1, "init file", "file: is not empty"},
-      {1, "collect \"$D\" --root nowhere", "nowhere: No such file"},
+      {1, "collect --root nowhere", "nowhere: No such file"},
       {1, "ptree - </tmp", "standard input: Is a directory"},
       {1, "ptree nowhere", "nowhere: No such file"},
       {1, "ptree $'\\e[2J'", "vespctl: \\x1b[2J: No such file or directory\n"},
       {1, "ptree <(echo '<dict>')", "line 1: "},
       {1, "decode base nowhere", "nowhere: No such file"},
-      {1, "prefs \"$D\" get d k", "no key \"k\" in domain \"d\""},
-      {1, "counters \"$D\" import bad", "bad: line 1: \"nan(x)\" is not a double"},
-      {1, "send \"$D\" apps apps", "apps: app 2: \"uuid\": not a UUID text"},
-      {1, "send \"$D\" apps - <<<'[7]'", "standard input: app 1: not a dictionary"},
-      {1, "send \"$D\" apps - <<<'[{\"arch\": true}]'", "app 1: \"arch\": not a signed 64-bit"},
-      {1, "nand \"$D\" disk >&-", "standard output cannot be written"},
+      {1, "prefs get d k", "no key \"k\" in domain \"d\""},
+      {1, "counters import bad", "bad: line 1: \"nan(x)\" is not a double"},
+      {1, "send apps apps", "apps: app 2: \"uuid\": not a UUID text"},
+      {1, "send apps - <<<'[7]'", "standard input: app 1: not a dictionary"},
+      {1, "send apps - <<<'[{\"arch\": true}]'", "app 1: \"arch\": not a signed 64-bit"},
+      {1, "nand disk >&-", "standard output cannot be written"},
   };
   for (const auto& [status, arguments, complaint] : cases) {
     EXPECT_EQ(run(arguments), status) << arguments;
@@ -69,7 +69,7 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
     const auto lines = std::count(error.begin(), error.end(), '\n');
     EXPECT_EQ(lines, status == 2 ? 2 : 1) << error << "where help is, too";
   }
-  EXPECT_EQ(print("counters \"$D\" dump"), "") << "nothing was changed";
+  EXPECT_EQ(print("counters dump"), "") << "nothing was changed";
 }
 
 TEST_F(VespctlTest, InitIsWholeAndCanBeRepeated) {
@@ -99,9 +99,9 @@ TEST_F(VespctlTest, InitIsWholeAndCanBeRepeated) {
 TEST_F(VespctlTest, DumpsAllButKeysThatBreakALine) {
   for (const char* const change :
        {"set $'a\\nb' 1", "sample $'a\\nb' 1", "set k 2", "sample d 3"}) {
-    print("counters \"$D\" " + std::string(change) + " --day 7");
+    print("counters " + std::string(change) + " --day 7");
   }
-  EXPECT_EQ(run("counters \"$D\" dump"), 1);
+  EXPECT_EQ(run("counters dump"), 1);
   EXPECT_THAT(output, MatchesRegex("scalar\t7\tk\t2\nsample\t7\td\t3\t[0-9]+\n"));
   EXPECT_EQ(error,
             "vespctl: 2 counters, the first of them \"a\\x0ab\", are left out: no line can carry a "
@@ -110,13 +110,13 @@ TEST_F(VespctlTest, DumpsAllButKeysThatBreakALine) {
 
 TEST_F(VespctlTest, TakesNumbersAsDecimalOnes) {
   for (const char* const number : {"0", "08", "18446744073709551615"}) {
-    print(std::string("nand \"$D\" magazine -- ") + number);
+    print(std::string("nand magazine -- ") + number);
   }
-  EXPECT_EQ(print("days \"$D\" --last 010 | wc -l"), "10\n");
+  EXPECT_EQ(print("days --last 010 | wc -l"), "10\n");
   for (const char* const option :
-       {"days \"$D\" --last ", "catch-up \"$D\" --last ", "prune \"$D\" --counters ",
-        "prune \"$D\" --outbox ", "prune \"$D\" --outbox-size ", "export \"$D\" --from ",
-        "export \"$D\" --to ", "preview \"$D\" --day ", "send \"$D\" daily "}) {
+       {"days --last ", "catch-up --last ", "prune --counters ",
+        "prune --outbox ", "prune --outbox-size ", "export --from ",
+        "export --to ", "preview --day ", "send daily "}) {
     EXPECT_NE(run(std::string(option) + "08"), 2) << error;
     EXPECT_EQ(run(std::string(option) + "0x8"), 2) << option;
     EXPECT_THAT(error, HasSubstr("\"0x8\" is not a number from ")) << option;
@@ -127,12 +127,12 @@ TEST_F(VespctlTest, TellsOfADamagedDatabase) {
   const char* const database = "device/var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
   const char* const kept = "is not a database; kept as ";
   folder.write(database, "no database");
-  EXPECT_EQ(run("counters \"$D\" set k 1"), 0);
+  EXPECT_EQ(run("counters set k 1"), 0);
   EXPECT_THAT(error, HasSubstr(kept));
-  EXPECT_EQ(run("counters \"$D\" set k 2 --day 5"), 0);
+  EXPECT_EQ(run("counters set k 2 --day 5"), 0);
   EXPECT_THAT(error, IsEmpty());
   folder.write(database, "no database");
-  EXPECT_EQ(run("counters \"$D\" dump"), 1);
+  EXPECT_EQ(run("counters dump"), 1);
   EXPECT_THAT(error, HasSubstr(kept));
   EXPECT_EQ(std::count(error.begin(), error.end(), '\n'), 1) << error;
 }
@@ -152,11 +152,11 @@ TEST_F(VespctlTest, ShowsSubmittedLogs) {
 <key>TBDistributionsHistogram</key><dict><key>d</key><dict>
 <key>(-inf, 2]</key><integer>1</integer><key>(2, inf)</key><integer>-4</integer></dict></dict>
 </dict></ptree>)");
-  EXPECT_EQ(run("show \"$D\""), 0);
+  EXPECT_EQ(run("show"), 0);
   EXPECT_THAT(output,
               AllOf(HasSubstr("\n  vesprun: a:0\n    a:1\n"), HasSubstr("\n    … "),
                     HasSubstr(" more; "), Not(HasSubstr("a:49")), HasSubstr("\n0002-193-log")));
-  EXPECT_EQ(run("show \"$D\" logs"), 0);
+  EXPECT_EQ(run("show logs"), 0);
   EXPECT_THAT(output, AllOf(HasSubstr("\n    a:49\n0002-193-log.ptree\n"),
                             HasSubstr("  day        2024-03-05T00:00:00Z\n"),
                             HasSubstr("  created    (absent)\n"), HasSubstr("    k  7\n"),
@@ -196,10 +196,10 @@ TEST_F(VespctlTest, ExportsNothingOfAnUnsoundDailyLog) {
     complaints += "vespctl: " + name + ": " + fault + '\n';
   }
   writePtree("device/outbox/logs/2000-193-log-aggregated.ptree", log(R"({"k": 1})", "{}", "{}"));
-  EXPECT_EQ(run("export \"$D\" --device d"), 1);
+  EXPECT_EQ(run("export --device d"), 1);
   EXPECT_EQ(error, complaints);
   EXPECT_THAT(output, AllOf(HasSubstr(R"("day":19787,"revision":1,)"), EndsWith("{}}\n")));
-  EXPECT_THAT(print("show \"$D\""),
+  EXPECT_THAT(print("show"),
               HasSubstr("1000-193-log-aggregated.ptree\n  cannot be read: not a dictionary\n"));
 }
 
@@ -230,12 +230,12 @@ TEST_F(VespctlTest, CollectsWhatTheStarterWhitelistLetsLeave) {
     }
     folder.write(path, text);
   }
-  EXPECT_EQ(run("collect \"$D\""), 0) << error;
-  EXPECT_EQ(run("collect \"$D\" --root root"), 0) << error;
-  EXPECT_EQ(run("collect \"$D\""), 0) << error;
-  EXPECT_EQ(run("counters \"$D\" dump | cut -f 3 | sort -u"), 0);
+  EXPECT_EQ(run("collect"), 0) << error;
+  EXPECT_EQ(run("collect --root root"), 0) << error;
+  EXPECT_EQ(run("collect"), 0) << error;
+  EXPECT_EQ(run("counters dump | cut -f 3 | sort -u"), 0);
   const std::string counted = output;
-  EXPECT_EQ(run("run \"$D\" -- -t; '" VESPCTL_PROGRAM "' ptree device/outbox/logs/0001*.ptree"), 0);
+  EXPECT_EQ(run("run -- -t; '" VESPCTL_PROGRAM "' ptree device/outbox/logs/0001*.ptree"), 0);
   for (const LinuxFigure& figure : linuxFigures) {
     const std::string end = figure.key.ends_with('.') ? "" : "\":";
     EXPECT_THAT(output, HasSubstr('"' + std::string(figure.key) + end)) << figure.file;
@@ -260,7 +260,7 @@ TEST_F(VespctlTest, LetsNoControlCharacterFromAFileReachTheTerminal) {
         R"("record":{"\u001b":"\u001b"},"name":"\u001b","level":"\b","message":"\u001b"})");
   }
   for (const char* part : {"", " events", " records", " logs"}) {
-    EXPECT_EQ(run("show \"$D\"" + std::string(part)), 0);
+    EXPECT_EQ(run("show" + std::string(part)), 0);
     EXPECT_EQ(output.find_first_of("\x1B\x7F\b\a\r\x9B"), std::string::npos) << output;
     EXPECT_THAT(output, AnyOf(HasSubstr("\\x1b"), HasSubstr("\\x08")));
   }

@@ -12,7 +12,8 @@ class VespctlTest : public ProgramTest {
 
   /// What follows `vespctl` in a shell; the exit status.
   int run(const std::string& arguments) {
-    return runScript("D='" + folder.path("device") + "'; '" VESPCTL_PROGRAM "' " + arguments);
+    return runScript("D='" + folder.path("device") +
+                     "'; export VESPRUN_DEVICE=\"$D\"; '" VESPCTL_PROGRAM "' " + arguments);
   }
 
   /// Runs the command, which must succeed, and gives what it printed.
@@ -39,7 +40,7 @@ class VespctlTest : public ProgramTest {
   /// Counts the lines of a dump.
   void import(const std::string& lines) {
     folder.write("lines", lines);
-    print("counters \"$D\" import lines");
+    print("counters import lines");
   }
 
   static constexpr const char* kWhitelist =

@@ -4,25 +4,76 @@
 #include <unistd.h>
 
 #include <chrono>
-#include <iostream>
+#include <cstdlib>
 #include <sstream>
 
 #include "platform/host/documents/JsonForm.h"
-#include "platform/host/documents/QuotedText.h"
-#include "platform/host/files/Files.h"
 
 namespace vesprun {
+namespace {
 
-std::unique_ptr<HostPlatform> openDevice(const std::string& directory) {
-  return orFail([&](std::string& error) { return HostPlatform::open(directory, error); });
+std::string givenDirectory;
+
+std::string makeOne(const std::string& path) {
+  return "; make one with \"vespctl init " + path + "\", or name another with -C DIR";
 }
 
-std::unique_ptr<HostPlatform> openDeviceReadOnly(const std::string& directory, SystemLog& log) {
-  return orFail([&](std::string& error) { return HostPlatform::open(directory, error, &log); });
+std::string belongsTo(const std::string& path, const struct stat& status) {
+  return path + ": belongs to " + nameOfUser(status.st_uid) + ": use sudo";
 }
 
-DeviceDirectory openDirectory(const std::string& directory) {
-  return *orFail([&](std::string& error) { return DeviceDirectory::open(directory, error); });
+}  // namespace
+
+void addDeviceOption(CLI::App& vespctl) {
+  vespctl
+      .add_option("-C", givenDirectory,
+                  std::string("The device directory, instead of that in VESPRUN_DEVICE or ") +
+                      VESPRUN_DEVICE_DIRECTORY)
+      ->type_name("DIR");
+}
+
+std::string deviceDirectory() {
+  const char* const variable = std::getenv("VESPRUN_DEVICE");
+  if (!givenDirectory.empty()) {
+    return givenDirectory;
+  }
+  return variable != nullptr && *variable != '\0' ? variable : VESPRUN_DEVICE_DIRECTORY;
+}
+
+DeviceDirectory openDirectory(Access access, OwnersRights rights) {
+  const std::string path = deviceDirectory();
+  struct stat status {};
+  if (stat(path.c_str(), &status) != 0) {
+    throw CommandFailure(systemError(path) + (errno == ENOENT ? makeOne(path) : ""));
+  }
+  takeRightsOfOwner(status, rights);
+  DeviceDirectory directory =
+      *orFail([&](std::string& error) { return DeviceDirectory::open(path, error); });
+  const std::string description = directory.hostPath("device.json");
+  const bool isOwner = geteuid() == status.st_uid;
+  if (faccessat(AT_FDCWD, description.c_str(), F_OK, AT_EACCESS) != 0) {
+    if (errno == ENOENT) {
+      throw CommandFailure(path + ": no device: it has no device.json" + makeOne(path));
+    }
+    throw CommandFailure(errno == EACCES && !isOwner ? belongsTo(path, status)
+                                                     : systemError(description));
+  }
+  const int needed = access == Access::Changing ? R_OK | W_OK | X_OK : R_OK | X_OK;
+  if (!isOwner && faccessat(AT_FDCWD, path.c_str(), needed, AT_EACCESS) != 0) {
+    throw CommandFailure(errno == EACCES ? belongsTo(path, status) : systemError(path));
+  }
+  return directory;
+}
+
+std::unique_ptr<HostPlatform> openDevice() {
+  const DeviceDirectory directory = openDirectory(Access::Changing);
+  return orFail([&](std::string& error) { return HostPlatform::open(directory.path(), error); });
+}
+
+std::unique_ptr<HostPlatform> openDeviceReadOnly(SystemLog& log, OwnersRights rights) {
+  const DeviceDirectory directory = openDirectory(Access::Reading, rights);
+  return orFail(
+      [&](std::string& error) { return HostPlatform::open(directory.path(), error, &log); });
 }
 
 FileDescriptor takeDailyWork(const DeviceDirectory& directory) {
@@ -32,12 +83,19 @@ FileDescriptor takeDailyWork(const DeviceDirectory& directory) {
   });
 }
 
+FileDescriptor openInput(const std::string& file) {
+  FileDescriptor input(file == "-" ? dup(STDIN_FILENO) : open(file.c_str(), O_RDONLY | O_CLOEXEC));
+  if (!input.isOpen()) {
+    throw CommandFailure(systemError(inputName(file)));
+  }
+  return input;
+}
+
 std::string readInput(const std::string& file) {
-  const FileDescriptor input(file == "-" ? dup(STDIN_FILENO)
-                                         : open(file.c_str(), O_RDONLY | O_CLOEXEC));
+  const FileDescriptor input = openInput(file);
   std::string content;
   char piece[65536];
-  ssize_t count = input.isOpen() ? 1 : -1;
+  ssize_t count = 1;
   while (count > 0) {
     count = read(input.get(), piece, sizeof piece);
     if (count < 0 && errno == EINTR) {
@@ -70,37 +128,5 @@ void forEachLine(const std::string& text, const std::function<void(PropertyDict*
 }
 
 std::string inputName(const std::string& file) { return file == "-" ? "standard input" : file; }
-
-void printJson(const PropertyValue& value) { std::cout << jsonText(value) << '\n'; }
-
-CLI::App* addDeviceCommand(CLI::App& above, const std::string& name, const std::string& description,
-                           std::string& directory) {
-  CLI::App* command = above.add_subcommand(name, description);
-  command->add_option("DIR", directory, "The device directory")->required();
-  return command;
-}
-
-void allowOneCommand(CLI::App& subject, bool needed) {
-  subject.require_subcommand(0, 1);
-  subject.allow_extras();
-  subject.parse_complete_callback([&subject, needed] {
-    const std::vector<std::string> extras = subject.remaining();
-    const bool hasCommand = !subject.get_subcommands().empty();
-    if (extras.empty() && (hasCommand || !needed)) {
-      return;
-    }
-    if (hasCommand) {
-      throw CLI::ExtrasError(subject.get_name(), extras);
-    }
-    std::string known;
-    for (const CLI::App* command : subject.get_subcommands({})) {
-      known.append(known.empty() ? "" : ", ").append(command->get_name());
-    }
-    throw CLI::ValidationError(subject.get_name(),
-                               (extras.empty() ? "a command is missing"
-                                               : "unknown command " + quotedText(extras.front())) +
-                                   "; one of " + known);
-  });
-}
 
 }  // namespace vesprun

@@ -1,48 +1,48 @@
 #pragma once
 
-#include <CLI/CLI.hpp>
 #include <functional>
 #include <memory>
-#include <stdexcept>
 #include <string>
 
+#include "OwnersRights.h"
+#include "commandline/Program.h"
+#include "commandline/Results.h"
 #include "common/PropertyValue.h"
 #include "platform/host/HostPlatform.h"
 #include "platform/host/files/Files.h"
 
 namespace vesprun {
 
-/// Ends the command with exit status 1 and its text on standard error.
-class CommandFailure : public std::runtime_error {
- public:
-  using std::runtime_error::runtime_error;
-};
+/// Adds -C, which names the device directory for all of the functions below.
+void addDeviceOption(CLI::App& vespctl);
 
-/// The result of `attempt(error)`. When it is empty, throws `CommandFailure` with the error.
-template <typename Attempt>
-auto orFail(const Attempt& attempt) {
-  std::string error;
-  auto result = attempt(error);
-  if (!result) {
-    throw CommandFailure(error);
-  }
-  return result;
-}
+/// The device directory that the command line names: -C, else VESPRUN_DEVICE, else that of this
+/// build.
+std::string deviceDirectory();
 
-/// Throws `CommandFailure` when the directory cannot be used; so do the next two.
-std::unique_ptr<HostPlatform> openDevice(const std::string& directory);
+// A start as root goes on with the rights of the directory's owner once one of these opened it: a
+// FILE of the command line is opened before. They throw `CommandFailure` where there is no device,
+// or another user's that may not be changed.
+
+std::unique_ptr<HostPlatform> openDevice();
 
 /// Without changing anything on the device; see `HostPlatform::open`.
-std::unique_ptr<HostPlatform> openDeviceReadOnly(const std::string& directory, SystemLog& log);
+std::unique_ptr<HostPlatform> openDeviceReadOnly(SystemLog& log,
+                                                 OwnersRights rights = OwnersRights::ForGood);
+
+enum class Access { Reading, Changing };
 
 /// The directory alone, without its description.
-DeviceDirectory openDirectory(const std::string& directory);
+DeviceDirectory openDirectory(Access access, OwnersRights rights = OwnersRights::ForGood);
 
 /// Waits until no run is at the daily work, and keeps others from it as long as the result lives.
 /// Throws `CommandFailure` when that takes more than minutes.
 FileDescriptor takeDailyWork(const DeviceDirectory& directory);
 
-/// The content of a file or pipe; "-" is standard input.
+/// A FILE of the command line; "-" is standard input.
+FileDescriptor openInput(const std::string& file);
+
+/// The content of a file or pipe.
 std::string readInput(const std::string& file);
 
 /// The content of a regular file; empty when there is none.
@@ -53,36 +53,5 @@ void forEachLine(const std::string& text, const std::function<void(PropertyDict*
 
 /// A file's name in messages: "-" is "standard input".
 std::string inputName(const std::string& file);
-
-/// Prints the JSON form and a line end.
-void printJson(const PropertyValue& value);
-
-/// Adds a command whose first argument is a device directory.
-CLI::App* addDeviceCommand(CLI::App& above, const std::string& name, const std::string& description,
-                           std::string& directory);
-
-/// Allows one of `subject`'s commands. Refuses any other word, and a missing command that is
-/// `needed`, with the names of all.
-void allowOneCommand(CLI::App& subject, bool needed = true);
-
-// Each in the file of its subject.
-void addDeviceCommands(CLI::App& vespctl);
-void addCounterCommands(CLI::App& vespctl);
-void addCollectCommand(CLI::App& vespctl);
-void addPreferenceCommands(CLI::App& vespctl);
-void addMessageCommands(CLI::App& vespctl);
-void addNandCommands(CLI::App& vespctl);
-void addOutboxCommands(CLI::App& vespctl);
-void addPtreeCommands(CLI::App& vespctl);
-void addFieldsCommand(CLI::App& vespctl);
-void addDecodeCommand(CLI::App& vespctl);
-void addExportCommand(CLI::App& vespctl);
-void addPageCommand(CLI::App& vespctl);
-void addDaysCommand(CLI::App& vespctl);
-void addCatchUpCommand(CLI::App& vespctl);
-void addCompletionCommand(CLI::App& vespctl);
-void addPruneCommand(CLI::App& vespctl);
-void addOutlookCommands(CLI::App& vespctl);
-void addWhitelistCommands(CLI::App& vespctl);
 
 }  // namespace vesprun

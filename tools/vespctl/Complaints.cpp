@@ -1,9 +1,6 @@
 #include "Complaints.h"
 
-#include <cstdio>
-
 #include "Command.h"
-#include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {
 
@@ -41,7 +38,7 @@ void Complaints::fail(const std::string& error) const {
 
 void Complaints::print() const {
   for (const std::string& message : _messages) {
-    std::fprintf(stderr, "vespctl: %s\n", printableText(message).c_str());
+    complain(message);
   }
 }
 

@@ -1,11 +1,25 @@
-#include <cstdio>
-#include <exception>
-#include <iostream>
 #include <new>
 
 #include "Command.h"
-#include "platform/host/documents/QuotedText.h"
+#include "collect/CollectCommand.h"
+#include "commandline/Completion.h"
+#include "days/CatchUpCommand.h"
+#include "days/DaysCommand.h"
+#include "days/PruneCommand.h"
+#include "device/CounterCommands.h"
+#include "device/DeviceCommands.h"
+#include "device/MessageCommands.h"
+#include "device/PreferenceCommands.h"
+#include "outbox/ExportCommand.h"
+#include "outbox/PtreeCommand.h"
+#include "outbox/ShowCommand.h"
+#include "outlook/OutlookCommands.h"
+#include "outlook/WhitelistCommands.h"
+#include "page/PageCommand.h"
 #include "platform/host/files/StandardStreams.h"
+#include "storage/DecodeCommand.h"
+#include "storage/FieldsCommand.h"
+#include "storage/NandCommands.h"
 
 namespace vesprun {
 namespace {
@@ -13,53 +27,40 @@ namespace {
 // Before the command-line library makes its own global objects.
 [[gnu::constructor(101)]] void prepare() { exitWithoutMemory("vespctl", 1); }
 
-int runCommandLine(int argc, char** argv) {
-  CLI::App vespctl("Sets up a device directory, runs the daily job on it and shows what came out.",
-                   "vespctl");
-  addDeviceCommands(vespctl);
-  addCounterCommands(vespctl);
-  addCollectCommand(vespctl);
-  addPreferenceCommands(vespctl);
-  addMessageCommands(vespctl);
-  addNandCommands(vespctl);
-  addOutboxCommands(vespctl);
-  addPtreeCommands(vespctl);
-  addFieldsCommand(vespctl);
-  addDecodeCommand(vespctl);
-  addExportCommand(vespctl);
-  addPageCommand(vespctl);
-  addDaysCommand(vespctl);
-  addCatchUpCommand(vespctl);
-  addCompletionCommand(vespctl);
-  addPruneCommand(vespctl);
-  addOutlookCommands(vespctl);
-  addWhitelistCommands(vespctl);
-  allowOneCommand(vespctl);
-  try {
-    vespctl.parse(argc, argv);
-  } catch (const CLI::Success& help) {
-    vespctl.exit(help);
-  } catch (const CLI::ParseError& error) {
-    vespctl.exit(error);
-    return 2;
-  }
-  if (!std::cout.flush() || std::fflush(stdout) != 0) {
-    throw CommandFailure("standard output cannot be written");
-  }
-  return 0;
-}
+/// Help, completion and the manual tell of them in this order.
+constexpr Command kCommands[] = {
+    {"init", "Makes a device directory", addInitCommand},
+    {"run", "Does what vesprun does, on that device", addRunCommand},
+    {"collect", "Counts what the running system's figures have grown since the last time",
+     addCollectCommand},
+    {"show", "Shows what the runs left in the outbox", addShowCommand},
+    {"days", "Tells what is kept of the last days, and the names of their daily logs",
+     addDaysCommand},
+    {"catch-up", "Submits the reports of days without a daily log, and tells which",
+     addCatchUpCommand},
+    {"prune", "Removes what is old, and tells what went", addPruneCommand},
+    {"preview", "Shows the daily log that a run would submit now", addPreviewCommand},
+    {"explain", "Says why a key leaves the device or stays", addExplainCommand},
+    {"whitelist", "Judges a whitelist before it is used", addWhitelistCommands},
+    {"counters", "Shows and changes counters", addCounterCommands},
+    {"prefs", "Shows and changes preferences", addPreferenceCommands},
+    {"send", "Sends messages to a running vesprun", addMessageCommands},
+    {"export", "Prints each submitted daily log as one line for vespfleet", addExportCommand,
+     Form::Own},
+    {"page", "Writes one HTML page of all that the device reported", addPageCommand, Form::Own},
+    {"nand", "Asks a device for its storage statistics", addNandCommands},
+    {"decode", "Decodes one saved buffer of the device", addDecodeCommand},
+    {"fields", "Prints the rows of a constant table", addFieldsCommand, Form::Own},
+    {"ptree", "Prints the JSON form of a ptree document", addPtreeCommand, Form::Own},
+    {"completion", "Prints the completion script for a shell", addCompletionCommand, Form::Own},
+};
 
 }  // namespace
 }  // namespace vesprun
 
 int main(int argc, char** argv) {
-  vesprun::holdStandardStreams();
-  try {
-    return vesprun::runCommandLine(argc, argv);
-  } catch (const std::bad_alloc&) {
-    std::fputs("vespctl: out of memory\n", stderr);
-  } catch (const std::exception& failure) {  // most are a `CommandFailure`
-    std::fprintf(stderr, "vespctl: %s\n", vesprun::printableText(failure.what()).c_str());
-  }
-  return 1;
+  return vesprun::runProgram(
+      {"vespctl", "Sets up a device directory, runs the daily job on it and shows what came out.",
+       vesprun::kCommands, vesprun::addDeviceOption},
+      argc, argv);
 }

@@ -6,10 +6,10 @@
 #include <map>
 #include <new>
 
-#include "DecimalNumber.h"
 #include "ExportedLine.h"
 #include "FleetStore.h"
 #include "Statistics.h"
+#include "commandline/Arguments.h"
 #include "common/PropertyDict.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/files/LineReader.h"

@@ -1,3 +1,5 @@
+#include "collect/CollectCommand.h"
+
 #include "Command.h"
 #include "Complaints.h"
 #include "platform/host/counters/HostTallybook.h"
@@ -6,11 +8,11 @@
 namespace vesprun {
 namespace {
 
-void collect(const std::string& path, const std::string& root) {
-  if (!root.empty()) {
-    openDirectory(root);  // a folder that is missing would be a system without figures
+void collect(const std::string& root) {
+  if (!root.empty()) {  // a folder that is missing would be a system without figures
+    orFail([&](std::string& error) { return DeviceDirectory::open(root, error); });
   }
-  const std::unique_ptr<HostPlatform> device = openDevice(path);
+  const std::unique_ptr<HostPlatform> device = openDevice();
   Complaints complaints(&device->systemLog());
   HostTallybook counters(device->directory(), device->clock(), device->preferences(), complaints);
   std::vector<std::string> leftOut;
@@ -30,18 +32,11 @@ void collect(const std::string& path, const std::string& root) {
 
 }  // namespace
 
-void addCollectCommand(CLI::App& vespctl) {
-  struct Arguments {
-    std::string directory;
-    std::string root;
-  };
-  const auto arguments = std::make_shared<Arguments>();
-  CLI::App* command = addDeviceCommand(
-      vespctl, "collect", "Counts what the running system's figures have grown since the last time",
-      arguments->directory);
-  command->add_option("--root", arguments->root,
-                      "The folder that holds proc and sys, instead of /");
-  command->callback([arguments] { collect(arguments->directory, arguments->root); });
+void addCollectCommand(CLI::App& command) {
+  const auto root = std::make_shared<std::string>();
+  command.add_option("--root", *root, "The folder that holds proc and sys, instead of /")
+      ->type_name("DIR");
+  command.callback([root] { collect(*root); });
 }
 
 }  // namespace vesprun

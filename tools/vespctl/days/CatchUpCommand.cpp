@@ -1,10 +1,12 @@
+#include "days/CatchUpCommand.h"
+
 #include <cstdint>
 #include <optional>
 #include <set>
 #include <string>
 
 #include "Command.h"
-#include "DecimalNumber.h"
+#include "commandline/Arguments.h"
 #include "outbox/SubmittedLogs.h"
 #include "platform/Platform.h"
 #include "platform/host/counters/HostTallybook.h"
@@ -66,8 +68,8 @@ Submission submitReport(std::int32_t day) {
   return submitDailyLog(*document) ? Submission::Done : Submission::Failed;
 }
 
-void catchUp(const std::string& directory, std::uint32_t last) {
-  const auto device = openDevice(directory);
+void catchUp(std::uint32_t last) {
+  const auto device = openDevice();
   const InstalledPlatform installed(*device);
   const FileDescriptor lock = takeDailyWork(device->directory());
   const std::int64_t today = device->tallybook().TBDaysSince1970();
@@ -84,7 +86,14 @@ void catchUp(const std::string& directory, std::uint32_t last) {
       }
     }
   }
-  printJson(submitted);
+  printResult(PropertyValue(submitted), [&submitted] {
+    if (submitted.empty()) {
+      printText("No report was missing.");
+    }
+    for (const PropertyValue& day : submitted) {
+      printText("Submitted the report of " + dateOfDay(day.number()->asInt32()) + ".");
+    }
+  });
   if (!failed.empty()) {
     throw CommandFailure("not submitted: " + failed + "; the system log says why");
   }
@@ -92,18 +101,12 @@ void catchUp(const std::string& directory, std::uint32_t last) {
 
 }  // namespace
 
-void addCatchUpCommand(CLI::App& vespctl) {
-  struct Arguments {
-    std::string directory;
-    std::uint32_t last = 7;
-  };
-  const auto arguments = std::make_shared<Arguments>();
-  CLI::App* command = addDeviceCommand(
-      vespctl, "catch-up", "Submits the reports of days without a daily log, and prints these days",
-      arguments->directory);
-  command->add_option("--last", arguments->last, "How many days, the day before yesterday the last")
+void addCatchUpCommand(CLI::App& command) {
+  const auto last = std::make_shared<std::uint32_t>(7);
+  command.add_option("--last", *last, "How many days, the day before yesterday the last")
+      ->type_name("N")
       ->transform(decimal<std::uint32_t>());
-  command->callback([arguments] { catchUp(arguments->directory, arguments->last); });
+  command.callback([last] { catchUp(*last); });
 }
 
 }  // namespace vesprun

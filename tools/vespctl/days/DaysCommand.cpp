@@ -1,13 +1,16 @@
+#include "days/DaysCommand.h"
+
 #include <algorithm>
 #include <cstdint>
 #include <cstdio>
 #include <limits>
 #include <map>
 #include <string>
+#include <vector>
 
 #include "Command.h"
 #include "Complaints.h"
-#include "DecimalNumber.h"
+#include "commandline/Arguments.h"
 #include "common/Calendar.h"
 #include "outbox/SubmittedLogs.h"
 #include "platform/host/counters/HostTallybook.h"
@@ -18,17 +21,20 @@ namespace {
 struct Day {
   std::int64_t scalars = 0;
   std::int64_t distributions = 0;
-  PropertyArray logs;
+  std::vector<std::string> logs;
 };
 
-std::string dateOf(std::int32_t day) {
-  const std::string date = dateText(startOfDay(day));
-  return date.substr(0, date.find('T'));
+std::string joined(const std::vector<std::string>& names) {
+  std::string text;
+  for (const std::string& name : names) {
+    text.append(text.empty() ? "" : ", ").append(name);
+  }
+  return text;
 }
 
-void showDays(const std::string& directory, std::uint32_t last) {
+void showDays(std::uint32_t last) {
   Complaints complaints;
-  const auto device = openDeviceReadOnly(directory, complaints);
+  const auto device = openDeviceReadOnly(complaints);
   const std::int32_t today = device->tallybook().TBDaysSince1970();
   const auto first = static_cast<std::int32_t>(std::max<std::int64_t>(
       std::numeric_limits<std::int32_t>::min(), std::int64_t{today} - last + 1));
@@ -50,39 +56,45 @@ void showDays(const std::string& directory, std::uint32_t last) {
   if (last != 0) {
     orFail([&](std::string& error) { return device->counters().read(countKeys, error); });
   }
+  Table table({{"Date"},
+               {"Day", Table::Align::Right},
+               {"Scalars", Table::Align::Right},
+               {"Distributions", Table::Align::Right},
+               {"Daily logs"}});
   for (std::int64_t day = first; day <= today; ++day) {
     Day& shown = days[static_cast<std::int32_t>(day)];
-    printJson(PropertyDict{{"day", day},
-                           {"date", dateOf(static_cast<std::int32_t>(day))},
-                           {"scalars", shown.scalars},
-                           {"distributions", shown.distributions},
-                           {"logs", std::move(shown.logs)}});
+    const std::string date = dateOfDay(static_cast<std::int32_t>(day));
+    if (invocation().json) {
+      printJson({{"day", day},
+                 {"date", date},
+                 {"scalars", shown.scalars},
+                 {"distributions", shown.distributions},
+                 {"logs", shown.logs}});
+    } else {
+      table.addRow({date, std::to_string(day), std::to_string(shown.scalars),
+                    std::to_string(shown.distributions), joined(shown.logs)});
+    }
+  }
+  if (!invocation().json) {
+    table.print();
   }
   const std::int64_t stored =
       device->preferences().LGSPreferencesGetIntegerValue(kStoredDayKey, kOwnDomain);
   if (stored >= today) {
-    std::fprintf(
-        stderr,
-        "vespctl: the day of the last run, %lld, is ahead of the clock: until it has passed "
-        "no run reports a day by itself, but catch-up does\n",
-        static_cast<long long>(stored));
+    complain("the day of the last run, " + std::to_string(stored) +
+             ", is ahead of the clock: until it has passed no run reports a day by itself, but "
+             "catch-up does");
   }
 }
 
 }  // namespace
 
-void addDaysCommand(CLI::App& vespctl) {
-  struct Arguments {
-    std::string directory;
-    std::uint32_t last = 14;
-  };
-  const auto arguments = std::make_shared<Arguments>();
-  CLI::App* command = addDeviceCommand(
-      vespctl, "days", "Prints what is kept of the last days, and the names of their daily logs",
-      arguments->directory);
-  command->add_option("--last", arguments->last, "How many days, today the last of them")
+void addDaysCommand(CLI::App& command) {
+  const auto last = std::make_shared<std::uint32_t>(14);
+  command.add_option("--last", *last, "How many days, today the last of them")
+      ->type_name("N")
       ->transform(decimal<std::uint32_t>());
-  command->callback([arguments] { showDays(arguments->directory, arguments->last); });
+  command.callback([last] { showDays(*last); });
 }
 
 }  // namespace vesprun

@@ -1,3 +1,5 @@
+#include "days/PruneCommand.h"
+
 #include <algorithm>
 #include <cstdint>
 #include <cstdio>
@@ -9,7 +11,7 @@
 
 #include "Command.h"
 #include "Complaints.h"
-#include "DecimalNumber.h"
+#include "commandline/Arguments.h"
 #include "common/Calendar.h"
 #include "days/LogPruning.h"
 #include "platform/host/counters/HostTallybook.h"
@@ -21,7 +23,6 @@ namespace vesprun {
 namespace {
 
 struct Pruning {
-  std::string directory;
   std::optional<std::uint32_t> counterDays;
   std::optional<std::uint32_t> outboxDays;
   std::optional<std::uint64_t> outboxMebibytes;
@@ -78,11 +79,29 @@ CounterStore::Removed removeCounters(HostPlatform& device, std::int64_t day,
   return removed;
 }
 
+void printRemoved(const CounterStore::Removed& counters, const std::vector<std::string>& logs,
+                  const PropertyDict& lines) {
+  if (!counters.days.empty()) {
+    printText("Counters of " + dateOfDay(counters.days.front()) + " to " +
+              dateOfDay(counters.days.back()) + ": " + std::to_string(counters.scalars) +
+              " scalars and " + std::to_string(counters.distributions) + " distributions.");
+  }
+  for (const std::string& log : logs) {
+    printText("Log " + log);
+  }
+  for (const auto& [file, count] : lines) {
+    printText(std::string(file) + ": " + std::to_string(count.number()->asUInt64()) + " lines");
+  }
+  if (counters.days.empty() && logs.empty() && lines.empty()) {
+    printText("Nothing was old enough to go.");
+  }
+}
+
 void prune(const Pruning& wanted) {
   // Today's and tomorrow's reports read these days.
   constexpr std::int64_t kDaysKept = 2;
   constexpr std::uint64_t kBytesPerMebibyte = 1048576;
-  const auto device = openDevice(wanted.directory);
+  const auto device = openDevice();
   const FileDescriptor lock = takeDailyWork(device->directory());
   const Date now = device->clock().now();
   std::vector<std::string> problems;
@@ -110,13 +129,14 @@ void prune(const Pruning& wanted) {
         *device, today - std::max<std::int64_t>(*wanted.counterDays, kDaysKept), problems);
   }
   problems.insert(problems.begin(), logs.problems().begin(), logs.problems().end());
-  printJson(PropertyDict{{"days", PropertyArray(counters.days.begin(), counters.days.end())},
-                         {"scalars", counters.scalars},
-                         {"distributions", counters.distributions},
-                         {"logs", PropertyArray(logs.removed().begin(), logs.removed().end())},
-                         {"lines", std::move(lines)}});
+  printResult({{"days", counters.days},
+               {"scalars", counters.scalars},
+               {"distributions", counters.distributions},
+               {"logs", logs.removed()},
+               {"lines", lines}},
+              [&] { printRemoved(counters, logs.removed(), lines); });
   for (std::size_t i = 0; i + 1 < problems.size(); ++i) {
-    std::fprintf(stderr, "vespctl: %s\n", printableText(problems[i]).c_str());
+    complain(problems[i]);
   }
   if (!problems.empty()) {
     throw CommandFailure(problems.back());
@@ -125,23 +145,24 @@ void prune(const Pruning& wanted) {
 
 }  // namespace
 
-void addPruneCommand(CLI::App& vespctl) {
+void addPruneCommand(CLI::App& command) {
   const auto wanted = std::make_shared<Pruning>();
-  CLI::App* command = addDeviceCommand(
-      vespctl, "prune", "Removes what is old, and prints what went", wanted->directory);
   command
-      ->add_option("--counters", wanted->counterDays,
-                   "Keeps the counters of the last N days, and those of three days in any case")
+      .add_option("--counters", wanted->counterDays,
+                  "Keeps the counters of the last N days, and those of three days in any case")
+      ->type_name("N")
       ->transform(decimal<std::uint32_t>());
   command
-      ->add_option("--outbox", wanted->outboxDays,
-                   "Keeps the logs and lines that were written in the last N days")
+      .add_option("--outbox", wanted->outboxDays,
+                  "Keeps the logs and lines that were written in the last N days")
+      ->type_name("N")
       ->transform(decimal<std::uint32_t>());
   command
-      ->add_option("--outbox-size", wanted->outboxMebibytes,
-                   "Removes the oldest logs until the outbox is smaller than that, in MiB")
+      .add_option("--outbox-size", wanted->outboxMebibytes,
+                  "Removes the oldest logs until the outbox is smaller than that, in MiB")
+      ->type_name("MIB")
       ->transform(decimal<std::uint64_t>());
-  command->callback([wanted] { prune(*wanted); });
+  command.callback([wanted] { prune(*wanted); });
 }
 
 }  // namespace vesprun

@@ -1,3 +1,5 @@
+#include "device/CounterCommands.h"
+
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
@@ -8,6 +10,7 @@
 
 #include "Command.h"
 #include "Complaints.h"
+#include "commandline/Arguments.h"
 #include "common/Calendar.h"
 #include "platform/host/counters/CounterLines.h"
 #include "platform/host/counters/HostTallybook.h"
@@ -18,12 +21,11 @@ namespace vesprun {
 namespace {
 
 struct CounterArguments {
-  std::string device;
   std::string key;
   std::vector<std::string> values;
-  std::string day;
-  std::string from;
-  std::string to;
+  std::optional<GivenDay> day;
+  std::optional<GivenDay> from;
+  std::optional<GivenDay> to;
   std::string file;
 };
 
@@ -37,15 +39,17 @@ T parseArgument(const char* argument, const std::string& text, const char* what)
   return value;
 }
 
-std::int32_t parseDay(const char* argument, const std::string& text, std::int32_t otherwise) {
-  return text.empty() ? otherwise : parseArgument<std::int32_t>(argument, text, "a day number");
+using Days = std::numeric_limits<std::int32_t>;
+
+std::int32_t dayOr(const std::optional<GivenDay>& day, std::int32_t today, std::int32_t otherwise) {
+  return day ? day->on(today) : otherwise;
 }
 
 /// Damage to the database goes to standard error and to the device's system log.
 class DeviceCounters {
  public:
-  explicit DeviceCounters(const std::string& directory)
-      : _device(openDevice(directory)),
+  DeviceCounters()
+      : _device(openDevice()),
         _complaints(&_device->systemLog()),
         _counters(_device->directory(), _device->clock(), _device->preferences(), _complaints) {}
 
@@ -75,10 +79,10 @@ class DeviceCounters {
 void changeCounter(
     const CounterArguments& arguments,
     const std::function<void(CounterStore&, std::int32_t day, const Date& now)>& change) {
-  const std::int32_t givenDay = parseDay("--day", arguments.day, 0);
-  DeviceCounters counters(arguments.device);
+  DeviceCounters counters;
   const Date now = counters.now();
-  const std::int32_t day = arguments.day.empty() ? daysSince1970(now) : givenDay;
+  const std::int32_t today = daysSince1970(now);
+  const std::int32_t day = dayOr(arguments.day, today, today);
   std::string error;
   if (!isCounterKey(arguments.key, error)) {
     throw CommandFailure(error);
@@ -121,7 +125,6 @@ void addSamples(const CounterArguments& arguments) {
 }
 
 void importLines(const CounterArguments& arguments) {
-  DeviceCounters counters(arguments.device);
   std::ifstream file;
   const bool isFile = arguments.file != "-";
   if (isFile) {
@@ -132,6 +135,7 @@ void importLines(const CounterArguments& arguments) {
   } else {
     std::ios::sync_with_stdio(false);
   }
+  DeviceCounters counters;
   std::istream& lines = isFile ? file : std::cin;
   bool isRepeated = false;
   std::string error;
@@ -140,7 +144,6 @@ void importLines(const CounterArguments& arguments) {
       lines.clear();
       if (!lines.seekg(0)) {
         // A pipe cannot be read again. Reading also finds out whether the database is damaged.
-        using Days = std::numeric_limits<std::int32_t>;
         const auto ignore = [](std::string_view) { return true; };
         exportCounterLines(store, Days::min(), Days::max(), ignore, error);
         error = "import again";
@@ -158,10 +161,10 @@ void importLines(const CounterArguments& arguments) {
 }
 
 void dumpLines(const CounterArguments& arguments) {
-  using Days = std::numeric_limits<std::int32_t>;
-  const std::int32_t from = parseDay("--from", arguments.from, Days::min());
-  const std::int32_t to = parseDay("--to", arguments.to, Days::max());
-  DeviceCounters counters(arguments.device);
+  DeviceCounters counters;
+  const std::int32_t today = daysSince1970(counters.now());
+  const std::int32_t from = dayOr(arguments.from, today, Days::min());
+  const std::int32_t to = dayOr(arguments.to, today, Days::max());
   std::string outputFailure;
   const auto print = [&](std::string_view text) {
     if (std::fwrite(text.data(), 1, text.size(), stdout) != text.size() ||
@@ -181,45 +184,55 @@ void dumpLines(const CounterArguments& arguments) {
   }
 }
 
-}  // namespace
+void addKeyAndDay(CLI::App& command, CounterArguments& arguments) {
+  command.add_option("KEY", arguments.key)->required();
+  addDay(command, "--day", arguments.day, "The day, instead of today");
+}
 
-void addCounterCommands(CLI::App& vespctl) {
+template <bool adds>
+void addScalarChange(CLI::App& command) {
   const auto arguments = std::make_shared<CounterArguments>();
-  CLI::App* counters =
-      addDeviceCommand(vespctl, "counters", "Shows and changes counters", arguments->device);
+  addKeyAndDay(command, *arguments);
+  command.add_option("VALUE", arguments->values, "A signed 64-bit integer")
+      ->required()
+      ->expected(1);
+  command.callback([arguments] { changeScalar(*arguments, adds); });
+}
 
-  const auto addChange = [&](const char* name, const char* description) {
-    CLI::App* command = counters->add_subcommand(name, description);
-    command->add_option("KEY", arguments->key)->required();
-    command->add_option("--day", arguments->day, "The day number, instead of today's");
-    return command;
-  };
-  CLI::App* set = addChange("set", "Sets a scalar");
-  set->add_option("VALUE", arguments->values, "A signed 64-bit integer")->required()->expected(1);
-  set->callback([arguments] { changeScalar(*arguments, false); });
-
-  CLI::App* add = addChange("add", "Adds to a scalar, wrapping in 64 bits");
-  add->add_option("VALUE", arguments->values, "A signed 64-bit integer")->required()->expected(1);
-  add->callback([arguments] { changeScalar(*arguments, true); });
-
-  CLI::App* sample = addChange("sample", "Adds values to a distribution");
-  sample
-      ->add_option("VALUE", arguments->values,
-                   "Doubles; -- before the first when there are -inf or such as -.5 among them")
+void addSample(CLI::App& command) {
+  const auto arguments = std::make_shared<CounterArguments>();
+  addKeyAndDay(command, *arguments);
+  command
+      .add_option("VALUE", arguments->values,
+                  "Doubles; -- before the first when there are -inf or such as -.5 among them")
       ->required()
       ->expected(-1);
-  sample->callback([arguments] { addSamples(*arguments); });
-
-  CLI::App* importing = counters->add_subcommand("import", "Takes all lines of a dump, or none");
-  importing->add_option("FILE", arguments->file, "\"-\": standard input")->required();
-  importing->callback([arguments] { importLines(*arguments); });
-
-  CLI::App* dump = counters->add_subcommand("dump", "Prints counters as lines parted by tabs");
-  dump->add_option("--from", arguments->from, "The first day number");
-  dump->add_option("--to", arguments->to, "The last day number");
-  dump->callback([arguments] { dumpLines(*arguments); });
-
-  allowOneCommand(*counters);
+  command.callback([arguments] { addSamples(*arguments); });
 }
+
+void addImport(CLI::App& command) {
+  const auto arguments = std::make_shared<CounterArguments>();
+  command.add_option("FILE", arguments->file, "\"-\": standard input")->required();
+  command.callback([arguments] { importLines(*arguments); });
+}
+
+void addDump(CLI::App& command) {
+  const auto arguments = std::make_shared<CounterArguments>();
+  addDay(command, "--from", arguments->from, "The first day");
+  addDay(command, "--to", arguments->to, "The last day");
+  command.callback([arguments] { dumpLines(*arguments); });
+}
+
+constexpr Command kCounterCommands[] = {
+    {"set", "Sets a scalar", addScalarChange<false>},
+    {"add", "Adds to a scalar, wrapping in 64 bits", addScalarChange<true>},
+    {"sample", "Adds values to a distribution", addSample},
+    {"import", "Takes all lines of a dump, or none", addImport},
+    {"dump", "Prints counters as lines parted by tabs", addDump, Form::Own},
+};
+
+}  // namespace
+
+void addCounterCommands(CLI::App& command) { addCommands(command, kCounterCommands); }
 
 }  // namespace vesprun

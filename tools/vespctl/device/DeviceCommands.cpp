@@ -1,4 +1,7 @@
+#include "device/DeviceCommands.h"
+
 #include <fcntl.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <cerrno>
@@ -104,7 +107,13 @@ void initDevice(const std::string& path, bool sample) {
   if (!std::filesystem::is_directory(path, failure)) {
     throw CommandFailure(path + ": is not empty");
   }
-  const DeviceDirectory directory = openDirectory(path);
+  struct stat status {};
+  if (stat(path.c_str(), &status) != 0) {
+    throw CommandFailure(systemError(path));
+  }
+  takeRightsOfOwner(status, OwnersRights::ForGood);
+  const DeviceDirectory directory =
+      *orFail([&](std::string& error) { return DeviceDirectory::open(path, error); });
   if (beginInit(directory)) {
     for (const char* folder : kFolders) {
       orFail([&](std::string& error) { return directory.makeFolder(folder, error); });
@@ -121,8 +130,8 @@ void initDevice(const std::string& path, bool sample) {
   removeFile(directory.hostPath(kInitMark));
 }
 
-void runJob(const std::string& path, const std::vector<std::string>& arguments) {
-  const std::unique_ptr<HostPlatform> device = openDevice(path);
+void runJob(const std::vector<std::string>& arguments) {
+  const std::unique_ptr<HostPlatform> device = openDevice();
   const InstalledPlatform installed(*device);
   std::vector<const char*> commandLine{"vesprun"};
   for (const std::string& argument : arguments) {
@@ -133,25 +142,23 @@ void runJob(const std::string& path, const std::vector<std::string>& arguments) 
 
 }  // namespace
 
-void addDeviceCommands(CLI::App& vespctl) {
+void addInitCommand(CLI::App& command) {
   struct Arguments {
     std::string directory;
     bool sample = false;
-    std::vector<std::string> job;
   };
   const auto arguments = std::make_shared<Arguments>();
+  command.add_option("DIR", arguments->directory, "A folder that is missing or empty")->required();
+  command.add_flag("--sample", arguments->sample,
+                   "Fills it with counters of this machine, a storage controller and a whitelist "
+                   "for them, instead of one for what collect writes");
+  command.callback([arguments] { initDevice(arguments->directory, arguments->sample); });
+}
 
-  CLI::App* init = vespctl.add_subcommand("init", "Makes a device directory");
-  init->add_option("DIR", arguments->directory, "A folder that is missing or empty")->required();
-  init->add_flag("--sample", arguments->sample,
-                 "Fills it with counters of this machine, a storage controller and a whitelist "
-                 "for them, instead of one for what collect writes");
-  init->callback([arguments] { initDevice(arguments->directory, arguments->sample); });
-
-  CLI::App* run = addDeviceCommand(vespctl, "run", "Does what vesprun does, on that device",
-                                   arguments->directory);
-  run->add_option("ARG", arguments->job, "What vesprun is given, behind --");
-  run->callback([arguments] { runJob(arguments->directory, arguments->job); });
+void addRunCommand(CLI::App& command) {
+  const auto job = std::make_shared<std::vector<std::string>>();
+  command.add_option("ARG", *job, "What vesprun is given, behind --");
+  command.callback([job] { runJob(*job); });
 }
 
 }  // namespace vesprun

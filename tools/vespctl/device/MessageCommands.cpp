@@ -1,3 +1,5 @@
+#include "device/MessageCommands.h"
+
 #include <sys/socket.h>
 #include <sys/time.h>
 
@@ -8,7 +10,9 @@
 #include <thread>
 
 #include "Command.h"
-#include "DecimalNumber.h"
+#include "Complaints.h"
+#include "commandline/Arguments.h"
+#include "common/Calendar.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeWriter.h"
 #include "platform/host/documents/QuotedText.h"
@@ -158,9 +162,8 @@ class Client {
   FileDescriptor _socket;
 };
 
-void sendDocument(const std::string& path, const std::string& document) {
-  const DeviceDirectory directory = openDirectory(path);
-  const Client client(directory);
+void sendDocument(const std::string& document) {
+  const Client client(openDirectory(Access::Changing));
   client.send(document);
   client.finish();
 }
@@ -200,9 +203,9 @@ class NewNotifications {
   std::size_t _seen;
 };
 
-void runSession(const std::string& path, const std::string& file) {
+void runSession(const std::string& file) {
   const std::string apps = appsDocument(file);
-  const DeviceDirectory directory = openDirectory(path);
+  const DeviceDirectory directory = openDirectory(Access::Changing);
   const NewNotifications notifications(directory);
   const Client client(directory);
   client.send(loggingDocument());
@@ -214,49 +217,61 @@ void runSession(const std::string& path, const std::string& file) {
   client.finish();
 }
 
+/// "today" is that of the device.
+void askForDailyTasks(std::string_view day) {
+  std::int64_t number = 0;
+  if (!parseWholeText(day, number)) {
+    Complaints complaints;
+    const auto device = openDeviceReadOnly(complaints);
+    number = GivenDay::parse(day)->on(device->tallybook().TBDaysSince1970());
+  }
+  sendDocument(document({{"operation", std::int64_t{1}}, {"value", number}}));
+}
+
+void addLogging(CLI::App& command) {
+  command.callback([] { sendDocument(loggingDocument()); });
+}
+
+/// A command with a FILE.
+template <auto send>
+void addFileCommand(CLI::App& command, const char* help) {
+  const auto file = std::make_shared<std::string>();
+  command.add_option("FILE", *file, help)->required();
+  command.callback([file] { send(*file); });
+}
+
+constexpr const char* kApps =
+    "JSON array of apps with \"bundle_id\", \"version\", \"adam_id\", \"arch\" and \"uuid\" "
+    "(text); - for standard input";
+
+void sendApps(const std::string& file) { sendDocument(appsDocument(file)); }
+void sendRaw(const std::string& file) { sendDocument(readInput(file)); }
+
+void addDaily(CLI::App& command) {
+  const auto day = std::make_shared<std::string>();
+  command.add_option("DAY", *day, "The day")->required()->check([](const std::string& text) {
+    std::int64_t number = 0;  // the message carries more than a day has
+    return parseWholeText(text, number) || GivenDay::parse(text) ? std::string()
+                                                                 : quotedText(text) + kNoDay;
+  });
+  command.callback([day] { askForDailyTasks(*day); });
+}
+
+constexpr Command kMessageCommands[] = {
+    {"logging", "Notifies the logging status", addLogging},
+    {"apps", "Delivers the active apps",
+     [](CLI::App& command) { addFileCommand<sendApps>(command, kApps); }},
+    {"session", "Notifies the logging status, waits for the answer, delivers the active apps",
+     [](CLI::App& command) { addFileCommand<runSession>(command, kApps); }},
+    {"daily", "Asks for the daily tasks of a day", addDaily},
+    {"raw", "Sends a ptree document as it is",
+     [](CLI::App& command) {
+       addFileCommand<sendRaw>(command, "The document; - for standard input");
+     }},
+};
+
 }  // namespace
 
-void addMessageCommands(CLI::App& vespctl) {
-  struct Arguments {
-    std::string device;
-    std::string file;
-    std::int64_t day = 0;
-  };
-  const auto arguments = std::make_shared<Arguments>();
-
-  CLI::App* send =
-      addDeviceCommand(vespctl, "send", "Sends messages to a running vesprun", arguments->device);
-
-  send->add_subcommand("logging", "Notifies the logging status")->callback([arguments] {
-    sendDocument(arguments->device, loggingDocument());
-  });
-
-  CLI::App* apps = send->add_subcommand("apps", "Delivers the active apps");
-  apps->callback([arguments] { sendDocument(arguments->device, appsDocument(arguments->file)); });
-  CLI::App* session = send->add_subcommand(
-      "session", "Notifies the logging status, waits for the answer, delivers the active apps");
-  session->callback([arguments] { runSession(arguments->device, arguments->file); });
-  for (CLI::App* command : {apps, session}) {
-    command
-        ->add_option("FILE", arguments->file,
-                     "JSON array of apps with \"bundle_id\", \"version\", \"adam_id\", \"arch\" "
-                     "and \"uuid\" (text); - for standard input")
-        ->required();
-  }
-
-  CLI::App* daily = send->add_subcommand("daily", "Asks for the daily tasks of a day");
-  daily->add_option("DAY", arguments->day, "The day number")
-      ->required()
-      ->transform(decimal<std::int64_t>());
-  daily->callback([arguments] {
-    sendDocument(arguments->device,
-                 document({{"operation", std::int64_t{1}}, {"value", arguments->day}}));
-  });
-
-  CLI::App* raw = send->add_subcommand("raw", "Sends a ptree document as it is");
-  raw->add_option("FILE", arguments->file, "The document; - for standard input")->required();
-  raw->callback([arguments] { sendDocument(arguments->device, readInput(arguments->file)); });
-  allowOneCommand(*send);
-}
+void addMessageCommands(CLI::App& command) { addCommands(command, kMessageCommands); }
 
 }  // namespace vesprun

@@ -1,3 +1,5 @@
+#include "device/PreferenceCommands.h"
+
 #include "Command.h"
 #include "Complaints.h"
 #include "platform/host/documents/JsonForm.h"
@@ -9,7 +11,6 @@ namespace vesprun {
 namespace {
 
 struct PreferenceArguments {
-  std::string device;
   std::string user = "mobile";
   std::string domain;
   std::string key;
@@ -17,14 +18,20 @@ struct PreferenceArguments {
 };
 
 void printPreferences(const PreferenceArguments& arguments, bool wholeDomain) {
-  const DeviceDirectory directory = openDirectory(arguments.device);
+  const DeviceDirectory directory = openDirectory(Access::Reading).readOnly();
   Complaints complaints;
   HostClock clock(std::nullopt);
   HostPreferences preferences(directory, clock, complaints, arguments.user);
   const PropertyDict values = preferences.valuesOfDomain(arguments.domain);
   complaints.failIfAny();
   if (wholeDomain) {
-    printJson(values);
+    printResult(values, [&values] {
+      Table table({{"Key"}, {"Value"}});
+      for (const auto& [key, value] : values) {
+        table.addRow({std::string(key), jsonText(value)});
+      }
+      table.print();
+    });
     return;
   }
   const PropertyValue* value = values.find(arguments.key);
@@ -32,11 +39,13 @@ void printPreferences(const PreferenceArguments& arguments, bool wholeDomain) {
     throw CommandFailure("no key " + quotedText(arguments.key) + " in domain " +
                          quotedText(arguments.domain));
   }
-  printJson(*value);
+  printResult(*value, [value] {
+    printText(value->string() != nullptr ? *value->string() : jsonText(*value));
+  });
 }
 
 void changePreference(const PreferenceArguments& arguments, std::optional<PropertyValue> value) {
-  const DeviceDirectory directory = openDirectory(arguments.device);
+  const DeviceDirectory directory = openDirectory(Access::Changing);
   Complaints complaints;
   HostClock clock(std::nullopt);
   HostPreferences preferences(directory, clock, complaints, arguments.user);
@@ -57,34 +66,50 @@ void setPreference(const PreferenceArguments& arguments) {
   changePreference(arguments, std::move(value));
 }
 
+/// Of all these commands: --user stands before or behind their names.
+PreferenceArguments& addUser(CLI::App& command) {
+  static PreferenceArguments arguments;
+  command.add_option("--user", arguments.user, "Whose preferences, instead of mobile's")
+      ->type_name("NAME");
+  return arguments;
+}
+
+PreferenceArguments& addDomain(CLI::App& command) {
+  PreferenceArguments& arguments = addUser(command);
+  command.add_option("DOMAIN", arguments.domain)->required();
+  return arguments;
+}
+
+void addGet(CLI::App& command) {
+  PreferenceArguments& arguments = addDomain(command);
+  const CLI::Option* key = command.add_option("KEY", arguments.key);
+  command.callback([&arguments, key] { printPreferences(arguments, key->count() == 0); });
+}
+
+void addSet(CLI::App& command) {
+  PreferenceArguments& arguments = addDomain(command);
+  command.add_option("KEY", arguments.key)->required();
+  command.add_option("JSON", arguments.json, "The value in its JSON form")->required();
+  command.callback([&arguments] { setPreference(arguments); });
+}
+
+void addRemove(CLI::App& command) {
+  PreferenceArguments& arguments = addDomain(command);
+  command.add_option("KEY", arguments.key)->required();
+  command.callback([&arguments] { changePreference(arguments, std::nullopt); });
+}
+
+constexpr Command kPreferenceCommands[] = {
+    {"get", "Shows a value, or all values of a domain", addGet},
+    {"set", "Sets a value", addSet},
+    {"remove", "Removes a key", addRemove},
+};
+
 }  // namespace
 
-void addPreferenceCommands(CLI::App& vespctl) {
-  const auto arguments = std::make_shared<PreferenceArguments>();
-  CLI::App* prefs =
-      addDeviceCommand(vespctl, "prefs", "Shows and changes preferences", arguments->device);
-  prefs->add_option("--user", arguments->user, "Whose preferences, instead of mobile's");
-
-  CLI::App* get = prefs->add_subcommand("get", "Prints a value, or all values of a domain");
-  get->add_option("DOMAIN", arguments->domain)->required();
-  const CLI::Option* key = get->add_option("KEY", arguments->key);
-  get->callback([arguments, key] { printPreferences(*arguments, key->count() == 0); });
-
-  CLI::App* set = prefs->add_subcommand("set", "Sets a value");
-  set->add_option("DOMAIN", arguments->domain)->required();
-  set->add_option("KEY", arguments->key)->required();
-  set->add_option("JSON", arguments->json, "The value in its JSON form")->required();
-  set->callback([arguments] { setPreference(*arguments); });
-
-  CLI::App* remove = prefs->add_subcommand("remove", "Removes a key");
-  remove->add_option("DOMAIN", arguments->domain)->required();
-  remove->add_option("KEY", arguments->key)->required();
-  remove->callback([arguments] { changePreference(*arguments, std::nullopt); });
-
-  for (CLI::App* command : {get, set, remove}) {
-    command->fallthrough();  // --user may follow the command
-  }
-  allowOneCommand(*prefs);
+void addPreferenceCommands(CLI::App& command) {
+  addUser(command);
+  addCommands(command, kPreferenceCommands);
 }
 
 }  // namespace vesprun

@@ -1,3 +1,5 @@
+#include "outbox/ExportCommand.h"
+
 #include <sha2.h>
 
 #include <array>
@@ -5,7 +7,9 @@
 #include <limits>
 
 #include "Command.h"
-#include "DecimalNumber.h"
+#include "Complaints.h"
+#include "commandline/Arguments.h"
+#include "common/Calendar.h"
 #include "common/TextForm.h"
 #include "outbox/SubmittedLogs.h"
 #include "platform/host/documents/XmlText.h"
@@ -48,32 +52,37 @@ std::string pseudonymOf(const std::string& systemIdentifier) {
 }
 
 struct Export {
-  std::string directory;
   std::string device;
-  std::int32_t from = std::numeric_limits<std::int32_t>::min();
-  std::int32_t to = std::numeric_limits<std::int32_t>::max();
+  std::optional<GivenDay> from;
+  std::optional<GivenDay> to;
 };
 
 void run(const Export& wanted) {
-  const auto platform = openDevice(wanted.directory);
+  Complaints complaints;
+  const auto platform = openDeviceReadOnly(complaints);
+  const std::int32_t today = platform->tallybook().TBDaysSince1970();
+  const std::int32_t from =
+      wanted.from ? wanted.from->on(today) : std::numeric_limits<std::int32_t>::min();
+  const std::int32_t to =
+      wanted.to ? wanted.to->on(today) : std::numeric_limits<std::int32_t>::max();
   const std::string device =
       !wanted.device.empty()
           ? wanted.device
           : pseudonymOf(platform->deviceInformation().GetSysIDWithDescription(false));
   const auto print = [&](SubmittedLog&& log) {
-    if (log.day < wanted.from || log.day > wanted.to) {
+    if (log.day < from || log.day > to) {
       return;
     }
     const auto entry = [&log](std::string_view key) { return *log.document.find(key); };
-    printJson(PropertyDict{{"version", 1},
-                           {"device", device},
-                           {"day", log.day},
-                           {"revision", log.revision},
-                           {"created", entry("TBLogCreationDate")},
-                           {"whitelist", entry("TBWhitelistDigest")},
-                           {"scalars", entry("TBScalars")},
-                           {"distributions", entry("TBDistributions")},
-                           {"histograms", entry("TBDistributionsHistogram")}});
+    printJson({{"version", 1},
+               {"device", device},
+               {"day", log.day},
+               {"revision", log.revision},
+               {"created", entry("TBLogCreationDate")},
+               {"whitelist", entry("TBWhitelistDigest")},
+               {"scalars", entry("TBScalars")},
+               {"distributions", entry("TBDistributions")},
+               {"histograms", entry("TBDistributionsHistogram")}});
   };
   const std::vector<UnreadableLog> unreadable = forEachSubmittedLog(platform->directory(), print);
   if (!unreadable.empty()) {
@@ -84,22 +93,19 @@ void run(const Export& wanted) {
 
 }  // namespace
 
-void addExportCommand(CLI::App& vespctl) {
+void addExportCommand(CLI::App& command) {
   const auto wanted = std::make_shared<Export>();
-  CLI::App* command = addDeviceCommand(vespctl, "export",
-                                       "Prints each submitted daily log as one line for vespfleet",
-                                       wanted->directory);
-  command->add_option("--device", wanted->device, "A name instead of the device's pseudonym")
+  command.add_option("--device", wanted->device, "A name instead of the device's pseudonym")
+      ->type_name("NAME")
       ->check([](const std::string& name) -> std::string {
         constexpr std::size_t kLongest = 255;
         return !name.empty() && name.size() <= kLongest && isXmlText(name)
                    ? ""
                    : "a device's name has 1 to 255 bytes of text";
       });
-  command->add_option("--from", wanted->from, "First day, in days since 1970")
-      ->transform(decimal<std::int32_t>());
-  command->add_option("--to", wanted->to, "Last day")->transform(decimal<std::int32_t>());
-  command->callback([wanted] { run(*wanted); });
+  addDay(command, "--from", wanted->from, "The first day");
+  addDay(command, "--to", wanted->to, "The last day");
+  command.callback([wanted] { run(*wanted); });
 }
 
 }  // namespace vesprun

@@ -163,8 +163,7 @@ std::vector<UnreadableLog> forEachSubmittedLog(
 
 void nameUnreadable(std::span<const UnreadableLog> logs) {
   for (const auto& [name, why, wasRead] : logs) {
-    std::fprintf(stderr, "vespctl: %s: %s\n", printableText(name).c_str(),
-                 printableText(why).c_str());
+    complain(name + ": " + why);
   }
 }
 

@@ -1,11 +1,13 @@
+#include "outlook/OutlookCommands.h"
+
 #include <algorithm>
 #include <iostream>
 #include <optional>
 
 #include "Command.h"
-#include "DecimalNumber.h"
-#include "JsonObject.h"
+#include "commandline/Arguments.h"
 #include "driver/DailyTasks.h"
+#include "outbox/DailyLogView.h"
 #include "outlook/KeptBack.h"
 #include "outlook/ReadOnlyDevice.h"
 #include "report/LogSubmission.h"
@@ -16,8 +18,7 @@ namespace vesprun {
 namespace {
 
 struct OutlookArguments {
-  std::string directory;
-  std::optional<std::int32_t> day;
+  std::optional<GivenDay> day;
   bool document = false;
   bool leftOut = false;
   std::string key;
@@ -26,9 +27,13 @@ struct OutlookArguments {
 
 std::int32_t yesterday() { return dayBefore(platform().tallybook().TBDaysSince1970()); }
 
+std::int32_t dayOf(const OutlookArguments& arguments) {
+  return arguments.day ? arguments.day->on(platform().tallybook().TBDaysSince1970()) : yesterday();
+}
+
 void previewLog(const OutlookArguments& arguments) {
-  const ReadOnlyDevice opened(arguments.directory, LogLevel::Default);
-  const std::int32_t day = arguments.day.value_or(yesterday());
+  const ReadOnlyDevice opened(LogLevel::Default);
+  const std::int32_t day = dayOf(arguments);
   std::optional<PropertyDict> document;
   if (platform().logsmith().DiagnosticLogSubmissionEnabled()) {
     TBReport report;
@@ -47,33 +52,38 @@ void previewLog(const OutlookArguments& arguments) {
   if (document && arguments.document) {
     platform().ptreeSerialization().serialize({*document},
                                               [](std::string_view piece) { std::cout << piece; });
-  } else if (document) {
-    printJson(*document);
   } else if (!arguments.document) {
-    std::cout << "null\n";
+    printResult(jsonOrNull(document), [&document] {
+      if (document) {
+        showDailyLog(std::cout, *document);
+      } else {
+        printText("Nothing would be submitted.");
+      }
+    });
   }
 }
 
 void printLeftOut(const OutlookArguments& arguments) {
-  const ReadOnlyDevice opened(arguments.directory, LogLevel::Default);
-  const std::int32_t day = arguments.day.value_or(yesterday());
+  const ReadOnlyDevice opened(LogLevel::Default);
+  const std::int32_t day = dayOf(arguments);
   const auto keys = keysKeptBack(firstDayOfReport(day), day);
   if (!keys) {
     opened.complaints.fail(kUnreadableCounters);
   }
-  JsonArray keptBack;
+  Json keptBack = Json::array();
+  Table table({{"Kind"}, {"Key"}});
   for (const auto& [isDistribution, key] : *keys) {
     const char* const kind = isDistribution ? "distribution" : "scalar";
-    keptBack.add(JsonObject().add("kind", kind).add("key", key).text());
+    keptBack.push_back({{"kind", kind}, {"key", key}});
+    table.addRow({kind, key});
   }
   opened.complaints.print();
-  std::cout << keptBack.text() << '\n';
+  printResult(keptBack, [&table] { table.print(); });
 }
 
 /// Adds the rows of a key that a report of `day` reads, as stored and as reported; without
 /// `options` they are not reported. False when the counters cannot be read.
-bool addValues(std::int32_t day, std::string_view key, const ScalarOptions* options,
-               JsonArray& values) {
+bool addValues(std::int32_t day, std::string_view key, const ScalarOptions* options, Json& values) {
   const auto history = platform().tallybook().initWithDefaultPath();
   return history->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
       key, firstDayOfReport(day), day,
@@ -85,13 +95,12 @@ bool addValues(std::int32_t day, std::string_view key, const ScalarOptions* opti
         if (options != nullptr) {
           reported = TBReport(nullptr).addScalarForKeyWithOptions(value, key, *options);
         }
-        values.add(
-            JsonObject().add("day", rowDay).add("stored", value).add("reported", reported).text());
+        values.push_back({{"day", rowDay}, {"stored", value}, {"reported", jsonOrNull(reported)}});
       });
 }
 
 bool addValues(std::int32_t day, std::string_view key, const DistributionOptions* options,
-               JsonArray& values) {
+               Json& values) {
   const auto history = platform().tallybook().initWithDefaultPath();
   return history->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
       key, firstDayOfReport(day), day,
@@ -106,17 +115,15 @@ bool addValues(std::int32_t day, std::string_view key, const DistributionOptions
         }
         const auto copied = [&](const PropertyDict& output) {
           const PropertyValue* value = output.find(key);
-          return value != nullptr ? std::optional(*value) : std::nullopt;
+          return value != nullptr ? Json(*value) : Json();
         };
-        values.add(JsonObject()
-                       .add("day", rowDay)
-                       .add("statistics", copied(row.distributionsOutput()))
-                       .add("histogram", copied(row.histogramsOutput()))
-                       .text());
+        values.push_back({{"day", rowDay},
+                          {"statistics", copied(row.distributionsOutput())},
+                          {"histogram", copied(row.histogramsOutput())}});
       });
 }
 
-std::optional<PropertyValue> nameOf(DecidedBy by) {
+Json nameOf(DecidedBy by) {
   switch (by) {
     case DecidedBy::Key:
       return "key";
@@ -127,31 +134,29 @@ std::optional<PropertyValue> nameOf(DecidedBy by) {
     case DecidedBy::Nothing:
       break;
   }
-  return std::nullopt;
+  return nullptr;
 }
 
 template <typename Options>
 void explainKey(const OutlookArguments& arguments) {
   constexpr bool kIsScalar = std::is_same_v<Options, ScalarOptions>;
-  const ReadOnlyDevice opened(arguments.directory);
+  const ReadOnlyDevice opened;
   const std::string_view key = arguments.key;
   const std::unique_ptr<TBConfig> config = TBConfig::init();
   WhitelistDecision<Options> decision;
-  JsonArray passedOver;
+  Json passedOver = Json::array();
   if (config) {
     decision = config->decide<Options>(key);
     for (const PassedOverGroup& group : config->groupsPassedOver<Options>(key)) {
       const bool isForInternalDevices =
           group.standing == WhitelistKeyGroup::Standing::InternalDevicesOnly;
-      passedOver.add(
-          JsonObject()
-              .add("group", group.name)
-              .add("why", isForInternalDevices ? "internal devices only" : "disabled by tasking")
-              .add("by", nameOf(group.by))
-              .text());
+      passedOver.push_back(
+          {{"group", group.name},
+           {"why", isForInternalDevices ? "internal devices only" : "disabled by tasking"},
+           {"by", nameOf(group.by)}});
     }
   }
-  JsonArray values;
+  Json values = Json::array();
   if (!addValues(yesterday(), key, decision.options(), values)) {
     opened.complaints.fail(kUnreadableCounters);
   }
@@ -159,54 +164,45 @@ void explainKey(const OutlookArguments& arguments) {
   const std::vector<std::string_view> sources = ownScalarKeys();
   const bool isSource =
       kIsScalar && std::find(sources.begin(), sources.end(), key) != sources.end();
-  std::optional<PropertyValue> prefix;
-  if (decision.by == DecidedBy::Prefix) {
-    prefix = decision.prefix;
-  }
-  std::cout << JsonObject()
-                   .add("key", key)
-                   .add("kind", kIsScalar ? "scalar" : "distribution")
-                   .add("leaves", decision.options() != nullptr)
-                   .add("by", nameOf(decision.by))
-                   .add("prefix", prefix)
-                   .add("group", decision.group())
-                   .add("options", decision.writtenOptions())
-                   .add("source", isSource)
-                   .addText("passedOver", passedOver.text())
-                   .addText("values", values.text())
-                   .text()
-            << '\n';
+  printJson({{"key", key},
+             {"kind", kIsScalar ? "scalar" : "distribution"},
+             {"leaves", decision.options() != nullptr},
+             {"by", nameOf(decision.by)},
+             {"prefix", decision.by == DecidedBy::Prefix ? Json(decision.prefix) : Json()},
+             {"group", jsonOrNull(decision.group())},
+             {"options", jsonOrNull(decision.writtenOptions())},
+             {"source", isSource},
+             {"passedOver", passedOver},
+             {"values", values}});
 }
 
 }  // namespace
 
-void addOutlookCommands(CLI::App& vespctl) {
+void addPreviewCommand(CLI::App& command) {
   const auto arguments = std::make_shared<OutlookArguments>();
-
-  CLI::App* preview = addDeviceCommand(
-      vespctl, "preview", "Prints the daily log that a run would submit now", arguments->directory);
-  preview->add_option("--day", arguments->day, "The day number, instead of yesterday's")
-      ->transform(decimal<std::int32_t>());
+  addDay(command, "--day", arguments->day, "The day, instead of yesterday");
   CLI::Option* document =
-      preview->add_flag("--document", arguments->document, "Writes the bytes of the log instead");
-  preview
-      ->add_flag("--left-out", arguments->leftOut,
-                 "Prints the keys of that day and the day before that the whitelist keeps back")
+      command.add_flag("--document", arguments->document, "Writes the bytes of the log instead");
+  document->excludes(command.get_option("--json"));
+  command
+      .add_flag("--left-out", arguments->leftOut,
+                "Tells the keys of that day and the day before that the whitelist keeps back")
       ->excludes(document);
-  preview->callback([arguments] {
+  command.callback([arguments] {
     if (arguments->leftOut) {
       printLeftOut(*arguments);
     } else {
       previewLog(*arguments);
     }
   });
+}
 
-  CLI::App* explain = addDeviceCommand(
-      vespctl, "explain", "Says why a key leaves the device or stays", arguments->directory);
-  explain->add_option("KEY", arguments->key, "The key of a counter")->required();
-  explain->add_flag("--distribution", arguments->isDistribution,
-                    "The key is one of a distribution, not of a scalar");
-  explain->callback([arguments] {
+void addExplainCommand(CLI::App& command) {
+  const auto arguments = std::make_shared<OutlookArguments>();
+  command.add_option("KEY", arguments->key, "The key of a counter")->required();
+  command.add_flag("--distribution", arguments->isDistribution,
+                   "The key is one of a distribution, not of a scalar");
+  command.callback([arguments] {
     if (arguments->isDistribution) {
       explainKey<DistributionOptions>(*arguments);
     } else {

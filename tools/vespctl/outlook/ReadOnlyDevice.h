@@ -11,9 +11,10 @@ namespace vesprun {
 /// The device of a command that changes nothing on it, installed as the platform. Lines for the
 /// system log become the command's complaints.
 struct ReadOnlyDevice {
-  explicit ReadOnlyDevice(const std::string& directory, LogLevel least = LogLevel::Error)
+  explicit ReadOnlyDevice(LogLevel least = LogLevel::Error,
+                          OwnersRights rights = OwnersRights::ForGood)
       : complaints(nullptr, least),
-        device(openDeviceReadOnly(directory, complaints)),
+        device(openDeviceReadOnly(complaints, rights)),
         installed(*device) {}
 
   Complaints complaints;

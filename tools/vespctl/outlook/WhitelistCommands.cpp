@@ -1,9 +1,9 @@
-#include <iostream>
+#include "outlook/WhitelistCommands.h"
+
 #include <limits>
 #include <set>
 
 #include "Command.h"
-#include "JsonObject.h"
 #include "config/TBConfig.h"
 #include "outlook/KeptBack.h"
 #include "outlook/ReadOnlyDevice.h"
@@ -19,34 +19,29 @@ void printFindings(const std::string& file) {
   if (!findings) {
     throw CommandFailure(inputName(file) + ": " + error);
   }
-  const auto orNull = [](const std::optional<std::string>& text) {
-    return text ? std::optional<PropertyValue>(*text) : std::nullopt;
-  };
-  JsonArray array;
+  Json array = Json::array();
+  Table table({{"Finding"}, {"Group"}, {"List"}, {"Key"}, {"What to do"}});
   for (const WhitelistFinding& finding : *findings) {
-    array.add(JsonObject()
-                  .add("group", finding.group)
-                  .add("list", orNull(finding.list))
-                  .add("key", orNull(finding.key))
-                  .add("finding", finding.finding)
-                  .add("detail", finding.detail)
-                  .text());
+    array.push_back({{"group", finding.group},
+                     {"list", jsonOrNull(finding.list)},
+                     {"key", jsonOrNull(finding.key)},
+                     {"finding", finding.finding},
+                     {"detail", finding.detail}});
+    table.addRow({finding.finding, finding.group, finding.list.value_or(""),
+                  finding.key.value_or(""), finding.detail});
   }
-  std::cout << array.text() << '\n';
-  if (!findings->empty()) {
-    std::cout.flush();
-    throw CommandFailure(inputName(file) + ": faults found: " + std::to_string(findings->size()));
-  }
+  printResult(array, [&table] { table.print(); });
+  invocation().status = findings->empty() ? 0 : 1;
 }
 
 using Keys = std::set<std::string, std::less<>>;
 
 /// What changes for the keys when `after` replaces `before`, which may be null.
 template <typename Options>
-std::string differences(const TBConfig* before, const TBConfig& after, const Keys& keys) {
-  JsonArray added;
-  JsonArray removed;
-  JsonArray changed;
+Json differences(const TBConfig* before, const TBConfig& after, const Keys& keys) {
+  Json added = Json::array();
+  Json removed = Json::array();
+  Json changed = Json::array();
   for (const std::string& key : keys) {
     const auto from =
         before != nullptr ? before->decide<Options>(key) : WhitelistDecision<Options>();
@@ -54,27 +49,24 @@ std::string differences(const TBConfig* before, const TBConfig& after, const Key
     const Options* fromOptions = from.options();
     const Options* toOptions = to.options();
     if (fromOptions == nullptr && toOptions != nullptr) {
-      added.add(jsonText(PropertyValue(key)));
+      added.push_back(key);
     } else if (fromOptions != nullptr && toOptions == nullptr) {
-      removed.add(jsonText(PropertyValue(key)));
+      removed.push_back(key);
     } else if (fromOptions != nullptr && *fromOptions != *toOptions) {
-      changed.add(JsonObject()
-                      .add("key", key)
-                      .add("before", from.writtenOptions())
-                      .add("after", to.writtenOptions())
-                      .text());
+      changed.push_back({{"key", key},
+                         {"before", jsonOrNull(from.writtenOptions())},
+                         {"after", jsonOrNull(to.writtenOptions())}});
     }
   }
-  return JsonObject()
-      .addText("added", added.text())
-      .addText("removed", removed.text())
-      .addText("changed", changed.text())
-      .text();
+  return {{"added", std::move(added)},
+          {"removed", std::move(removed)},
+          {"changed", std::move(changed)}};
 }
 
-void printDifferences(const std::string& directory, const std::string& file) {
-  const ReadOnlyDevice opened(directory);
-  const std::unique_ptr<TBConfig> after = TBConfig::fromBytes(readInput(file));
+void printDifferences(const std::string& file) {
+  const std::string bytes = readInput(file);
+  const ReadOnlyDevice opened;
+  const std::unique_ptr<TBConfig> after = TBConfig::fromBytes(bytes);
   if (!after) {
     opened.complaints.fail(inputName(file) + ": is not a whitelist");
   }
@@ -90,37 +82,32 @@ void printDifferences(const std::string& directory, const std::string& file) {
     opened.complaints.fail(kUnreadableCounters);
   }
   opened.complaints.print();
-  std::cout << JsonObject()
-                   .addText("scalars", differences<ScalarOptions>(before.get(), *after, scalars))
-                   .addText("distributions",
-                            differences<DistributionOptions>(before.get(), *after, distributions))
-                   .text()
-            << '\n';
+  printJson(
+      {{"scalars", differences<ScalarOptions>(before.get(), *after, scalars)},
+       {"distributions", differences<DistributionOptions>(before.get(), *after, distributions)}});
 }
+
+void addCheck(CLI::App& command) {
+  const auto file = std::make_shared<std::string>();
+  command.add_option("FILE", *file, "The whitelist; - for standard input")->required();
+  command.callback([file] { printFindings(*file); });
+}
+
+void addDiff(CLI::App& command) {
+  const auto file = std::make_shared<std::string>();
+  command.add_option("NEW", *file, "The whitelist; - for standard input")->required();
+  command.callback([file] { printDifferences(*file); });
+}
+
+constexpr Command kWhitelistCommands[] = {
+    {"check", "Tells what is wrong or useless in it; exit status 1 when there is anything",
+     addCheck},
+    {"diff", "Tells what would leave the device, stay or change if it became the whitelist",
+     addDiff},
+};
 
 }  // namespace
 
-void addWhitelistCommands(CLI::App& vespctl) {
-  CLI::App* whitelist = vespctl.add_subcommand("whitelist", "Judges a whitelist before it is used");
-  struct Arguments {
-    std::string directory;
-    std::string file;
-  };
-  const auto arguments = std::make_shared<Arguments>();
-
-  CLI::App* check = whitelist->add_subcommand(
-      "check", "Prints what is wrong or useless in it; exit status 1 when there is anything");
-  check->add_option("FILE", arguments->file, "The whitelist; - for standard input")->required();
-  check->callback([arguments] { printFindings(arguments->file); });
-
-  CLI::App* diff = addDeviceCommand(
-      *whitelist, "diff",
-      "Prints what would leave the device, stay or change if it became the whitelist",
-      arguments->directory);
-  diff->add_option("FILE", arguments->file, "The whitelist; - for standard input")->required();
-  diff->callback([arguments] { printDifferences(arguments->directory, arguments->file); });
-
-  allowOneCommand(*whitelist);
-}
+void addWhitelistCommands(CLI::App& command) { addCommands(command, kWhitelistCommands); }
 
 }  // namespace vesprun

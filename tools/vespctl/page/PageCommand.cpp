@@ -1,3 +1,5 @@
+#include "page/PageCommand.h"
+
 #include <filesystem>
 #include <iostream>
 #include <limits>
@@ -27,9 +29,9 @@ void writePage(const std::string& file, const std::string& page) {
   orFail([&](std::string& error) { return replaceFile(path.string(), page, error); });
 }
 
-void makePage(const std::string& directory, const std::string& file) {
+void makePage(const std::string& file) {
   using Days = std::numeric_limits<std::int32_t>;
-  const ReadOnlyDevice opened(directory);
+  const ReadOnlyDevice opened(LogLevel::Error, OwnersRights::UntilFileIsWritten);
   const PageData data(opened.device->directory());
   const auto keptBack = keysKeptBack(Days::min(), Days::max());
   if (!keptBack) {
@@ -44,19 +46,17 @@ void makePage(const std::string& directory, const std::string& file) {
   if (file.empty() || file == "-") {
     std::cout << page;
   } else {
+    const RightsOfCaller rights;
     writePage(file, page);
   }
 }
 
 }  // namespace
 
-void addPageCommand(CLI::App& vespctl) {
-  const auto directory = std::make_shared<std::string>();
+void addPageCommand(CLI::App& command) {
   const auto file = std::make_shared<std::string>();
-  CLI::App* command = addDeviceCommand(
-      vespctl, "page", "Writes one HTML page of all that the device reported", *directory);
-  command->add_option("FILE", *file, "Where to write it, instead of standard output");
-  command->callback([directory, file] { makePage(*directory, *file); });
+  command.add_option("FILE", *file, "Where to write it, instead of standard output");
+  command.callback([file] { makePage(*file); });
 }
 
 }  // namespace vesprun

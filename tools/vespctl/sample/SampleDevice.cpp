@@ -74,7 +74,8 @@ Date sampleTime(Clock& clock) {
 }  // namespace
 
 void fillSampleDevice(const std::string& directory) {
-  const std::unique_ptr<HostPlatform> device = openDevice(directory);
+  const auto device =
+      orFail([&](std::string& error) { return HostPlatform::open(directory, error); });
   writeSampleWhitelist(device->directory());
   recordCounters(*device);
   describeSampleDevice(device->directory(), sampleTime(device->clock()));

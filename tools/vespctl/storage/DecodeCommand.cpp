@@ -1,10 +1,11 @@
+#include "storage/DecodeCommand.h"
+
 #include <algorithm>
 #include <iostream>
 #include <iterator>
 #include <optional>
 
 #include "Command.h"
-#include "JsonObject.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/KernelSnapshot.h"
 #include "NANDInfo/parsers/ORUFTLParseBufferToCxt.h"
@@ -12,59 +13,57 @@
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
 #include "NANDInfo/parsers/VendorCounterParsers.h"
+#include "commandline/Completion.h"
 #include "common/LittleEndian.h"
+#include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {
 namespace {
 
 using Buffer = std::span<const std::uint8_t>;
 
-/// Field by field: there can be a million. Names need no JSON escapes.
-void printFields(const PropertyValue& result, const GenericParserCxt& fields) {
-  std::cout << "{\"result\":" << jsonText(result)
-            << ",\"error\":" << jsonText(PropertyValue(GetAPIErrorMessage())) << ",\"fields\":[";
-  const char* separator = "";
-  fields.forEach([&separator](const GenericParserCxt::Field& field) {
-    std::cout << separator << "[\"" << field.name << "\"," << field.value << ']';
-    separator = ",";
+Json fieldsOf(const GenericParserCxt& fields) {
+  Json array = Json::array();
+  fields.forEach([&array](const GenericParserCxt::Field& field) {
+    array.push_back(Json::array({field.name, field.value}));
   });
-  std::cout << ']';
+  return array;
 }
 
-void decodeBase(Buffer buffer) {
+Json decodeBase(Buffer buffer) {
   ORUStatsContext ctx;
   const bool result = ORUParseBufferToCxt(ctx, buffer);
-  PropertyDict summary;
+  Json summary;
   for (const ORUSummaryField& field : kORUSummaryFields) {
-    summary.set(findORUStatKey(field.id)->name, field.get(ctx));
+    summary[std::string(findORUStatKey(field.id)->name)] = field.get(ctx);
     if (field.narrow == &ORUStatsContext::exportVersion) {
-      summary.set("driverVersion", ctx.driverVersion);
+      summary["driverVersion"] = ctx.driverVersion;
     }
   }
-  summary.set("readCountHisto",
-              PropertyArray(ctx.readCountHisto.begin(), ctx.readCountHisto.end()));
-  printFields(result, ctx.fields);
-  std::cout << ",\"summary\":" << jsonText(summary) << "}\n";
+  summary["readCountHisto"] = ctx.readCountHisto;
+  return {{"result", result},
+          {"error", GetAPIErrorMessage()},
+          {"fields", fieldsOf(ctx.fields)},
+          {"summary", std::move(summary)}};
 }
 
 template <auto parse>
-void decodeGeneric(Buffer buffer) {
+Json decodeGeneric(Buffer buffer) {
   GenericParserCxt ctx;
   const std::uint32_t result = parse(ctx, buffer);
-  printFields(result, ctx);
-  std::cout << "}\n";
+  return {{"result", result}, {"error", GetAPIErrorMessage()}, {"fields", fieldsOf(ctx)}};
 }
 
 template <auto parse>
-void decodeCounters(Buffer buffer) {
+Json decodeCounters(Buffer buffer) {
   NandChannelCounters counters{};
   parse(buffer.first<kCounterRegionSize>(), counters);
-  printJson(PropertyDict{{"words", PropertyArray(counters.begin(), counters.end())}});
+  return {{"words", counters}};
 }
 
 struct Layout {
   const char* name;
-  void (*decode)(Buffer buffer);
+  Json (*decode)(Buffer buffer);
   std::size_t size = 0;  ///< bytes that the file must have; 0: any number
 };
 
@@ -82,20 +81,19 @@ constexpr Layout kLayouts[] = {
 
 constexpr const char* kSnapshot = "snapshot";
 
-/// Prints the whole 64-bit words of the thread's statistics.
-void printSnapshot(Buffer snapshot, const std::string& thread) {
+/// The whole 64-bit words of the thread's statistics.
+Json decodeSnapshot(Buffer snapshot, const std::string& thread) {
   std::optional<Buffer> statistics;
   const bool found = getIOStatsWithThreadnameFromSnapData(snapshot, thread.c_str(), statistics);
-  std::optional<PropertyValue> words;
+  Json words;
   if (statistics) {
-    PropertyArray array;
+    words = Json::array();
     for (Buffer rest = *statistics; rest.size() >= sizeof(std::uint64_t);
          rest = rest.subspan(sizeof(std::uint64_t))) {
-      array.emplace_back(loadLittleEndian<std::uint64_t>(rest.data()));
+      words.push_back(loadLittleEndian<std::uint64_t>(rest.data()));
     }
-    words = std::move(array);
   }
-  std::cout << JsonObject().add("found", found).add("ioStatistics", words).text() << '\n';
+  return {{"found", found}, {"ioStatistics", std::move(words)}};
 }
 
 struct Arguments {
@@ -104,11 +102,20 @@ struct Arguments {
   std::optional<std::string> thread;
 };
 
+std::string layouts() {
+  std::string names = kSnapshot;
+  for (const Layout& layout : kLayouts) {
+    names.append(", ").append(layout.name);
+  }
+  return names;
+}
+
 void decode(const Arguments& arguments) {
   const bool isSnapshot = arguments.layout == kSnapshot;
   const auto* layout = std::ranges::find(kLayouts, arguments.layout, &Layout::name);
   if (layout == std::end(kLayouts) && !isSnapshot) {
-    throw CLI::ValidationError("LAYOUT", "there is no layout " + arguments.layout);
+    throw CLI::ValidationError(
+        "LAYOUT", "there is no layout " + quotedText(arguments.layout) + "; one of " + layouts());
   }
   if (isSnapshot != arguments.thread.has_value()) {
     throw CLI::ValidationError("--thread", "goes with the layout snapshot, which needs it");
@@ -116,29 +123,34 @@ void decode(const Arguments& arguments) {
   const std::string content = readInput(arguments.file);
   const Buffer buffer(reinterpret_cast<const std::uint8_t*>(content.data()), content.size());
   if (isSnapshot) {
-    printSnapshot(buffer, *arguments.thread);
+    printJson(decodeSnapshot(buffer, *arguments.thread));
     return;
   }
   if (layout->size != 0 && buffer.size() != layout->size) {
     throw CommandFailure(inputName(arguments.file) + ": has " + std::to_string(buffer.size()) +
                          " bytes, not " + std::to_string(layout->size));
   }
-  layout->decode(buffer);
+  printJson(layout->decode(buffer));
 }
 
 }  // namespace
 
-void addDecodeCommand(CLI::App& vespctl) {
+void addDecodeCommand(CLI::App& command) {
   const auto arguments = std::make_shared<Arguments>();
-  std::string layouts = kSnapshot;
-  for (const Layout& layout : kLayouts) {
-    layouts.append(", ").append(layout.name);
-  }
-  CLI::App* command = vespctl.add_subcommand("decode", "Decodes one saved buffer of the device");
-  command->add_option("LAYOUT", arguments->layout, "What the buffer is: " + layouts)->required();
-  command->add_option("FILE", arguments->file, "The buffer; - for standard input")->required();
-  command->add_option("--thread", arguments->thread, "The thread to look for in a snapshot");
-  command->callback([arguments] { decode(*arguments); });
+  CLI::Option* const layout =
+      command.add_option("LAYOUT", arguments->layout, "What the buffer is: " + layouts())
+          ->required();
+  completeWith(layout, [] {
+    std::vector<std::string> names{kSnapshot};
+    for (const Layout& known : kLayouts) {
+      names.emplace_back(known.name);
+    }
+    return names;
+  });
+  command.add_option("FILE", arguments->file, "The buffer; - for standard input")->required();
+  command.add_option("--thread", arguments->thread, "The thread to look for in a snapshot")
+      ->type_name("NAME");
+  command.callback([arguments] { decode(*arguments); });
 }
 
 }  // namespace vesprun

@@ -1,3 +1,5 @@
+#include "storage/FieldsCommand.h"
+
 #include <algorithm>
 #include <functional>
 #include <iostream>
@@ -11,6 +13,8 @@
 #include "NANDInfo/tables/FieldSets.h"
 #include "NANDInfo/tables/LegacyKeyMap.h"
 #include "NANDInfo/tables/MagazineFields.h"
+#include "commandline/Completion.h"
+#include "platform/host/documents/QuotedText.h"
 #include "platform/host/figures/FigureTable.h"
 
 namespace vesprun {
@@ -98,33 +102,45 @@ std::vector<List> lists() {
 }
 
 void printLists() {
-  PropertyArray names;
   for (const List& list : lists()) {
-    names.emplace_back(list.name);
+    std::cout << list.name << '\n';
   }
-  printJson(names);
 }
 
 void printList(const std::string& name) {
   const std::vector<List> known = lists();
   const auto list = std::ranges::find(known, name, &List::name);
   if (list == known.end()) {
-    throw CLI::ValidationError("LIST", "there is no list \"" + name + '"');
+    throw CLI::ValidationError(
+        "LIST", "there is no list " + quotedText(name) + "; vespctl fields names them");
   }
   list->print();
 }
 
 }  // namespace
 
-void addFieldsCommand(CLI::App& vespctl) {
-  CLI::App* fields = vespctl.add_subcommand("fields", "Prints the rows of a constant table");
+void addFieldsCommand(CLI::App& command) {
   const auto words = std::make_shared<std::vector<std::string>>();
-  fields
-      ->add_option("LIST", *words,
-                   "The list, or \"event\" and the name of an event; "
-                   "nothing for the names of the lists")
-      ->expected(1, 2);
-  fields->callback([words] {
+  CLI::Option* const list = command
+                                .add_option("LIST", *words,
+                                            "The list, or \"event\" and the name of an event; "
+                                            "nothing for the names of the lists")
+                                ->expected(1, 2);
+  completeWith(list, [words] {
+    std::vector<std::string> names;
+    for (const List& known : lists()) {
+      const std::size_t space = std::min(known.name.find(' '), known.name.size());
+      const bool isEvent = space < known.name.size();
+      if (words->empty() ? !isEvent : isEvent) {
+        names.push_back(isEvent ? known.name.substr(space + 1) : known.name);
+      }
+    }
+    if (words->empty()) {
+      names.emplace_back("event");
+    }
+    return names;
+  });
+  command.callback([words] {
     if (words->empty()) {
       printLists();
     } else {

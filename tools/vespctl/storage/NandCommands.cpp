@@ -1,3 +1,5 @@
+#include "storage/NandCommands.h"
+
 #include <unistd.h>
 
 #include <algorithm>
@@ -7,7 +9,7 @@
 #include <vector>
 
 #include "Command.h"
-#include "DecimalNumber.h"
+#include "commandline/Arguments.h"
 #include "library/EntryPoints.h"
 #include "platform/host/files/Files.h"
 
@@ -34,7 +36,7 @@ class StandardOutputAside {
   FileDescriptor _kept;
 };
 
-std::string callAside(const EntryPointRow& row, std::span<const std::uint64_t> values) {
+Json callAside(const EntryPointRow& row, std::span<const std::uint64_t> values) {
   const StandardOutputAside aside;
   return callToJson(row, values);
 }
@@ -64,29 +66,36 @@ void addParameter(CLI::App& command, const EntryPointParameter& parameter, Given
                       : decimal<std::uint32_t>());
 }
 
+/// The entry point that the command's name stands for.
+const EntryPointRow& rowOf(const CLI::App& command) {
+  return *std::ranges::find(entryPoints(), command.get_name(), &EntryPointRow::command);
+}
+
+void addEntryPoint(CLI::App& command) {
+  const EntryPointRow& row = rowOf(command);
+  const auto given = std::make_shared<std::vector<GivenArgument>>(row.parameters.size());
+  for (std::size_t i = 0; i < given->size(); ++i) {
+    addParameter(command, row.parameters[i], (*given)[i]);
+  }
+  command.callback([given, &row] {
+    std::vector<std::uint64_t> values;
+    for (std::size_t i = 0; i < given->size(); ++i) {
+      values.push_back(row.parameters[i].isFlag() ? (*given)[i].flag : (*given)[i].number);
+    }
+    const std::unique_ptr<HostPlatform> device = openDevice();
+    const InstalledPlatform installed(*device);
+    printJson(callAside(row, values));
+  });
+}
+
 }  // namespace
 
-void addNandCommands(CLI::App& vespctl) {
-  const auto directory = std::make_shared<std::string>();
-  CLI::App* nand =
-      addDeviceCommand(vespctl, "nand", "Asks a device for its storage statistics", *directory);
+void addNandCommands(CLI::App& command) {
+  std::vector<Command> commands;
   for (const EntryPointRow& row : entryPoints()) {
-    CLI::App* command = nand->add_subcommand(row.command, row.help);
-    const auto given = std::make_shared<std::vector<GivenArgument>>(row.parameters.size());
-    for (std::size_t i = 0; i < given->size(); ++i) {
-      addParameter(*command, row.parameters[i], (*given)[i]);
-    }
-    command->callback([directory, given, &row] {
-      std::vector<std::uint64_t> values;
-      for (std::size_t i = 0; i < given->size(); ++i) {
-        values.push_back(row.parameters[i].isFlag() ? (*given)[i].flag : (*given)[i].number);
-      }
-      const std::unique_ptr<HostPlatform> device = openDevice(*directory);
-      const InstalledPlatform installed(*device);
-      std::cout << callAside(row, values) << '\n';
-    });
+    commands.push_back({row.command, row.help, addEntryPoint});
   }
-  allowOneCommand(*nand);
+  addCommands(command, commands);
 }
 
 }  // namespace vesprun

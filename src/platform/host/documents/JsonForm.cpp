@@ -5,7 +5,6 @@
 #include <cmath>
 #include <cstdint>
 #include <limits>
-#include <nlohmann/json.hpp>
 #include <string_view>
 #include <utility>
 #include <vector>
@@ -20,98 +19,64 @@
 
 namespace vesprun {
 
-using Json = nlohmann::ordered_json;
-
-// The library handles what is neither plain text nor a short escape.
-void appendJsonText(std::string_view string, std::string& text) {
-  static constexpr std::string_view kEscaped = "\b\f\n\r\t\"\\";
-  static constexpr std::string_view kEscapes = "bfnrt\"\\";
-  const std::size_t begin = text.size();
-  text += '"';
-  for (std::size_t at = 0; at < string.size();) {
-    if (const auto escape = kEscaped.find(string[at]); escape != std::string_view::npos) {
-      text.append(1, '\\').append(1, kEscapes[escape]);
-      ++at;
-      continue;
-    }
-    const std::size_t length = xmlCharacterLength(string.substr(at));
-    if (length == 0) {
-      text.resize(begin);
-      text += Json(string).dump(-1, ' ', false, Json::error_handler_t::replace);
-      return;
-    }
-    text.append(string, at, length);
-    at += length;
-  }
-  text += '"';
-}
-
-namespace {
-
-void append(const PropertyValue& value, std::string& text);
-
-void appendTagged(const char* name, std::string_view string, std::string& text) {
-  text.append("{\"").append(name).append("\":");
-  appendJsonText(string, text);
-  text += '}';
-}
-
-void append(const Number& number, std::string& text) {
+void to_json(Json& json, const Number& number) {
   if (!number.isFloatingPoint()) {
-    text += textForm(number);
+    json = number.isSigned() ? Json(number.asInt64()) : Json(number.asUInt64());
     return;
   }
   const double real = number.asDouble();
   if (!std::isfinite(real)) {
-    appendTagged("real", textForm(number), text);
+    json = {{"real", textForm(number)}};
     return;
   }
   if (number.kind() == NumberKind::Double) {
-    text += Json(real).dump();
+    json = real;
     return;
   }
   char digits[32];
   const char* end = std::to_chars(digits, digits + sizeof digits, static_cast<float>(real)).ptr;
   double fewestDigits = real;
   std::from_chars(digits, end, fewestDigits);
-  text.append("{\"float\":").append(Json(fewestDigits).dump()).append("}");
+  json = {{"float", fewestDigits}};
 }
 
-void append(const PropertyDict& dict, std::string& text) {
-  text += '{';
+void to_json(Json& json, const PropertyDict& dict) {
+  json = Json::object();
+  auto& entries = json.get_ref<Json::object_t&>();
+  entries.reserve(dict.size());
   for (const auto& [key, entry] : dict) {
-    text.append(text.back() == '{' ? "" : ",");
-    appendJsonText(key, text);
-    text += ':';
-    append(entry, text);
+    entries.emplace_back(std::string(key), entry);  // the library would look for the key first
   }
-  text += '}';
 }
 
-void append(const PropertyValue& value, std::string& text) {
+void to_json(Json& json, const PropertyValue& value) {
   if (const PropertyDict* dict = value.dict()) {
-    append(*dict, text);
+    to_json(json, *dict);
   } else if (const PropertyArray* array = value.array()) {
-    text += '[';
+    json = Json::array();
     for (const PropertyValue& element : *array) {
-      text.append(&element == array->data() ? "" : ",");
-      append(element, text);
+      json.emplace_back(element);
     }
-    text += ']';
   } else if (const std::string* string = value.string()) {
-    appendJsonText(*string, text);
+    json = *string;
   } else if (const Number* number = value.number()) {
-    append(*number, text);
+    to_json(json, *number);
   } else if (const bool* boolean = value.boolean()) {
-    text += *boolean ? "true" : "false";
+    json = *boolean;
   } else if (const Bytes* data = value.data()) {
-    text += "{\"data\":\"";
+    std::string text;
     appendBase64(*data, text);
-    text += "\"}";
+    json = {{"data", std::move(text)}};
   } else {
-    appendTagged("date", dateText(value.date() != nullptr ? *value.date() : Date{}), text);
+    json = {{"date", dateText(value.date() != nullptr ? *value.date() : Date{})}};
   }
 }
+
+std::string jsonText(const Json& json) {
+  return json.dump(-1, ' ', false, Json::error_handler_t::replace);
+}
+
+namespace {
 
 /// Decodes a tagged object (`{"date": ...}`). Nothing for any other dictionary and, with a text in
 /// `fault`, for an entry that means nothing.
@@ -290,18 +255,6 @@ class ValueBuilder final : public nlohmann::json_sax<Json> {
 };
 
 }  // namespace
-
-std::string jsonText(const PropertyValue& value) {
-  std::string text;
-  append(value, text);
-  return text;
-}
-
-std::string jsonText(const PropertyDict& dict) {
-  std::string text;
-  append(dict, text);
-  return text;
-}
 
 std::optional<PropertyValue> plainValueFromJsonText(std::string_view text, std::string& error) {
   ValueBuilder builder(error);

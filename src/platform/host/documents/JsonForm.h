@@ -1,5 +1,6 @@
 #pragma once
 
+#include <nlohmann/json.hpp>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -7,6 +8,8 @@
 #include "common/PropertyValue.h"
 
 namespace vesprun {
+
+using Json = nlohmann::ordered_json;
 
 /// The JSON form of a value on one line, dictionaries in order. A double always has a fraction or
 /// an exponent ("2.0"). Values that JSON lacks are objects with one entry:
@@ -17,11 +20,19 @@ namespace vesprun {
 /// - `{"date":"2024-03-05T09:15:02Z"}`: a date.
 ///
 /// Bytes of a string that are not UTF-8 become U+FFFD.
-std::string jsonText(const PropertyValue& value);
-std::string jsonText(const PropertyDict& dict);
+std::string jsonText(const Json& json);
 
-/// Appends the JSON form of a string.
-void appendJsonText(std::string_view string, std::string& text);
+/// What the library calls for a value that becomes JSON; so an initializer of `Json` may hold
+/// values.
+void to_json(Json& json, const PropertyValue& value);
+void to_json(Json& json, const PropertyDict& dict);
+void to_json(Json& json, const Number& number);
+
+/// The value, or null.
+template <typename T>
+Json jsonOrNull(const std::optional<T>& value) {
+  return value ? Json(*value) : Json();
+}
 
 /// Reads the JSON form. Nothing, with the line or entry in `error`, for malformed JSON, a duplicate
 /// name, an integer beyond 64 bits, a number beyond a double, more than 200 nested containers, a

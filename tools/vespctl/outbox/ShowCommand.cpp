@@ -1,3 +1,5 @@
+#include "outbox/ShowCommand.h"
+
 #include <algorithm>
 #include <filesystem>
 #include <iostream>
@@ -5,6 +7,7 @@
 #include <utility>
 
 #include "Command.h"
+#include "commandline/Completion.h"
 #include "common/TextForm.h"
 #include "outbox/DailyLogView.h"
 #include "outbox/SubmittedLogs.h"
@@ -102,7 +105,7 @@ void showText(const std::string& content, bool inFull) {
     std::cout << fields[i] << '\n';
   }
   if (shown < fields.size()) {
-    std::cout << "    … " << fields.size() - shown << " more; vespctl show DIR logs has all\n";
+    std::cout << "    … " << fields.size() - shown << " more; vespctl show logs has all\n";
   }
 }
 
@@ -152,31 +155,46 @@ void showAll(const DeviceDirectory& directory) {
   showLogs(directory, false);
 }
 
+struct Kind {
+  const char* name;
+  void (*show)(const DeviceDirectory& directory);
+};
+
+constexpr Kind kKinds[] = {
+    {"logs", [](const DeviceDirectory& device) { showLogs(device, true); }},
+    {"events", [](const DeviceDirectory& device) { showEvents(device, true); }},
+    {"records", [](const DeviceDirectory& device) { showRecords(device, true); }},
+    {"notifications", showNotifications},
+    {"log", showSystemLog},
+};
+
 }  // namespace
 
-void addOutboxCommands(CLI::App& vespctl) {
-  const auto path = std::make_shared<std::string>();
-  CLI::App* show =
-      addDeviceCommand(vespctl, "show", "Shows what the runs left in the outbox", *path);
-  show->callback([show, path] {
-    if (show->get_subcommands().empty()) {
-      showAll(openDirectory(*path));
+void addShowCommand(CLI::App& command) {
+  const auto kind = std::make_shared<std::string>();
+  CLI::Option* const option = command.add_option(
+      "KIND", *kind,
+      "One kind in full: logs, events, records, notifications, or log (the system's)");
+  completeWith(option, [] {
+    std::vector<std::string> names;
+    for (const Kind& known : kKinds) {
+      names.emplace_back(known.name);
+    }
+    return names;
+  });
+  command.callback([kind] {
+    const auto* const known = std::ranges::find(kKinds, *kind, &Kind::name);
+    if (!kind->empty() && known == std::end(kKinds)) {
+      throw CLI::ValidationError("unknown kind " + quotedText(*kind) +
+                                 "; one of logs, events, records, notifications, log");
+    }
+    const DeviceDirectory directory = openDirectory(Access::Reading);
+    if (kind->empty()) {
+      showAll(directory);
+    } else {
+      known->show(directory);
     }
   });
-  const auto addPart = [&](const char* name, const char* description, auto showPart) {
-    show->add_subcommand(name, description)->callback([path, showPart] {
-      showPart(openDirectory(*path));
-    });
-  };
-  addPart("logs", "The submitted logs alone, in full",
-          [](const DeviceDirectory& device) { showLogs(device, true); });
-  addPart("events", "The analytics events alone, with their payloads",
-          [](const DeviceDirectory& device) { showEvents(device, true); });
-  addPart("records", "The structured records alone, in full",
-          [](const DeviceDirectory& device) { showRecords(device, true); });
-  addPart("notifications", "The posted notifications alone", showNotifications);
-  addPart("log", "The system log alone", showSystemLog);
-  allowOneCommand(*show, false);
 }
 
 }  // namespace vesprun

@@ -1,3 +1,5 @@
+#include "outbox/PtreeCommand.h"
+
 #include "Command.h"
 #include "platform/host/documents/PtreeReader.h"
 
@@ -15,11 +17,10 @@ void printPtree(const std::string& file) {
 
 }  // namespace
 
-void addPtreeCommands(CLI::App& vespctl) {
-  CLI::App* ptree = vespctl.add_subcommand("ptree", "Prints the JSON form of a ptree document");
+void addPtreeCommand(CLI::App& command) {
   const auto file = std::make_shared<std::string>();
-  ptree->add_option("FILE", *file, "The document; - for standard input")->required();
-  ptree->callback([file] { printPtree(*file); });
+  command.add_option("FILE", *file, "The document; - for standard input")->required();
+  command.callback([file] { printPtree(*file); });
 }
 
 }  // namespace vesprun

@@ -1,0 +1,108 @@
+#include "commandline/Program.h"
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <exception>
+#include <iostream>
+#include <new>
+
+#include "commandline/Completion.h"
+#include "platform/host/documents/QuotedText.h"
+#include "platform/host/files/StandardStreams.h"
+
+namespace vesprun {
+namespace {
+
+/// Refuses any other word than a command, and a missing command, with the names of all.
+void needOneCommand(CLI::App& above) {
+  above.require_subcommand(0, 1);
+  above.allow_extras();
+  above.parse_complete_callback([&above] {
+    const std::vector<std::string> extras = above.remaining();
+    const bool hasCommand = !above.get_subcommands().empty();
+    if (extras.empty() && hasCommand) {
+      return;
+    }
+    if (hasCommand) {
+      throw CLI::ExtrasError(above.get_name(), extras);
+    }
+    std::string known;
+    for (const CLI::App* command : above.get_subcommands({})) {
+      if (!command->get_group().empty()) {
+        known.append(known.empty() ? "" : ", ").append(command->get_name());
+      }
+    }
+    throw CLI::ValidationError((extras.empty() ? "a command is missing"
+                                               : "unknown command " + quotedText(extras.front())) +
+                               "; one of " + known);
+  });
+}
+
+int parse(CLI::App& app, int argc, char** argv) {
+  try {
+    app.parse(argc, argv);
+  } catch (const CLI::Success& help) {
+    app.exit(help);
+  } catch (const CLI::ParseError& error) {
+    complain(error.what());
+    std::fprintf(stderr, "Try \"%s --help\".\n", invocation().command.c_str());
+    return 2;
+  }
+  if (!std::cout.flush() || std::fflush(stdout) != 0) {
+    throw CommandFailure(std::string("standard output cannot be written: ") + std::strerror(errno));
+  }
+  return invocation().status;
+}
+
+}  // namespace
+
+Invocation& invocation() {
+  static Invocation invocation;
+  return invocation;
+}
+
+void complain(std::string_view text) {
+  std::fprintf(stderr, "%s: %s\n", invocation().command.c_str(), printableText(text).c_str());
+}
+
+void addCommands(CLI::App& above, std::span<const Command> commands) {
+  for (const Command& row : commands) {
+    CLI::App* const command = above.add_subcommand(row.name, row.help);
+    command->preparse_callback([name = std::string(row.name)](std::size_t /*words*/) {
+      invocation().command += ' ' + name;
+    });
+    if (row.form == Form::TextOrJson) {
+      command->add_flag("--json", invocation().json, "Prints JSON, for programs");
+    }
+    row.add(*command);
+  }
+  needOneCommand(above);
+}
+
+int runProgram(const Program& program, int argc, char** argv) {
+  holdStandardStreams();
+  invocation().program = invocation().command = program.name;
+  try {
+    CLI::App app(program.help, program.name);
+    app.set_version_flag("--version", std::string(program.name) + ' ' + VESPRUN_VERSION,
+                         "Prints name and version");
+    if (program.addOptions != nullptr) {
+      program.addOptions(app);
+    }
+    addCommands(app, program.commands);
+    if (argc > 2 && std::string_view(argv[1]) == kCompleteCommand) {
+      printCompletions(app, std::span(argv + 3, argv + argc));
+      return 0;
+    }
+    return parse(app, argc, argv);
+  } catch (const std::bad_alloc&) {
+    std::fprintf(stderr, "%s: out of memory\n", invocation().command.c_str());
+  } catch (const std::exception& failure) {  // most are a `CommandFailure`
+    std::cout.flush();
+    complain(failure.what());
+  }
+  return 1;
+}
+
+}  // namespace vesprun

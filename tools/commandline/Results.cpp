@@ -1,0 +1,174 @@
+#include "commandline/Results.h"
+
+#include <sys/ioctl.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <iostream>
+#include <limits>
+#include <numeric>
+
+#include "commandline/Program.h"
+#include "platform/host/documents/QuotedText.h"
+
+namespace vesprun {
+namespace {
+
+constexpr std::size_t kNoEnd = std::numeric_limits<std::size_t>::max();
+constexpr std::size_t kGap = 2;  ///< spaces between columns
+
+/// Characters, as far as each takes one column.
+std::size_t widthOf(std::string_view text) {
+  return static_cast<std::size_t>(
+      std::ranges::count_if(text, [](char byte) { return (byte & 0xC0) != 0x80; }));
+}
+
+/// The first bytes of a text that take `width` columns at most.
+std::size_t bytesOf(std::string_view text, std::size_t width) {
+  std::size_t at = 0;
+  while (at < text.size() && width > 0) {
+    --width;
+    for (++at; at < text.size() && (text[at] & 0xC0) == 0x80; ++at) {
+    }
+  }
+  return at;
+}
+
+/// The text in lines of `width` columns at most, parted at spaces where there are any.
+std::vector<std::string> wrapped(std::string_view text, std::size_t width) {
+  width = std::max<std::size_t>(width, 1);
+  std::vector<std::string> lines;
+  while (widthOf(text) > width) {
+    std::size_t end = bytesOf(text, width);
+    const std::size_t space = text[end] == ' ' ? end : text.rfind(' ', end);
+    if (space != std::string_view::npos && text.find_first_not_of(' ') < space) {
+      end = space;
+    }
+    lines.emplace_back(text.substr(0, end));
+    text.remove_prefix(std::min(text.find_first_not_of(' ', end), text.size()));
+  }
+  lines.emplace_back(text);
+  return lines;
+}
+
+std::string spaces(std::size_t count) { return std::string(count, ' '); }
+
+}  // namespace
+
+void printJson(const Json& json) {
+  std::cout << json.dump(-1, ' ', false, Json::error_handler_t::replace) << '\n';
+}
+
+void printResult(const Json& json, const std::function<void()>& text) {
+  if (invocation().json) {
+    printJson(json);
+  } else {
+    text();
+  }
+}
+
+std::size_t terminalWidth() {
+  winsize size{};
+  if (isatty(STDOUT_FILENO) == 0 || ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) != 0 ||
+      size.ws_col == 0) {
+    return kNoEnd;
+  }
+  return size.ws_col;
+}
+
+std::string emphasized(std::string_view text) {
+  const char* const noColor = std::getenv("NO_COLOR");
+  const bool isPlain = isatty(STDOUT_FILENO) == 0 || (noColor != nullptr && *noColor != '\0');
+  return isPlain ? std::string(text) : "\x1b[1m" + std::string(text) + "\x1b[0m";
+}
+
+void printText(std::string_view text, std::size_t indentation) {
+  const std::string printable = printableText(text);
+  const std::size_t own = std::min(printable.find_first_not_of(' '), printable.size());
+  const std::size_t width = terminalWidth();
+  const std::size_t inner = width == kNoEnd ? kNoEnd : width - std::min(width, own + indentation);
+  std::size_t before = own;
+  for (const std::string& line : wrapped(std::string_view(printable).substr(own), inner)) {
+    std::cout << spaces(before) << line << '\n';
+    before = own + indentation;
+  }
+}
+
+void Table::addRow(std::vector<std::string> cells) {
+  for (std::string& cell : cells) {
+    cell = printableText(cell);
+  }
+  _rows.push_back(std::move(cells));
+}
+
+void Table::print(std::size_t indentation) const {
+  constexpr std::size_t kNarrowest = 8;
+  const bool hasTitles =
+      std::ranges::any_of(_columns, [](const Column& column) { return !column.title.empty(); });
+  std::vector<std::size_t> widths;
+  for (std::size_t i = 0; i < _columns.size(); ++i) {
+    widths.push_back(widthOf(_columns[i].title));
+    for (const auto& row : _rows) {
+      widths[i] = std::max(widths[i], widthOf(row[i]));
+    }
+  }
+  const std::size_t room = terminalWidth();
+  const auto total = [&] {
+    return std::accumulate(widths.begin(), widths.end(), indentation + kGap * (widths.size() - 1));
+  };
+  while (total() > room) {
+    const auto widest = std::ranges::max_element(widths);
+    if (*widest <= kNarrowest) {
+      break;
+    }
+    const std::size_t over = total() - room;
+    *widest -= std::min(over, *widest - kNarrowest);
+  }
+  if (total() > room) {  // one below the other
+    for (const auto& row : _rows) {
+      for (std::size_t i = 0; i < row.size(); ++i) {
+        if (!row[i].empty()) {
+          const std::string& title = _columns[i].title;
+          printText(spaces(i == 0 ? 0 : 2) + (title.empty() ? "" : title + ": ") + row[i], 2);
+        }
+      }
+    }
+    return;
+  }
+  const auto printRow = [&](const auto& cellOf, bool isTitle) {
+    std::vector<std::vector<std::string>> cells;
+    std::size_t height = 0;
+    for (std::size_t i = 0; i < _columns.size(); ++i) {
+      cells.push_back(wrapped(cellOf(i), widths[i]));
+      height = std::max(height, cells.back().size());
+    }
+    for (std::size_t line = 0; line < height; ++line) {
+      std::string text = spaces(indentation);
+      for (std::size_t i = 0; i < cells.size(); ++i) {
+        const std::string cell = line < cells[i].size() ? cells[i][line] : "";
+        const std::string padding = spaces(widths[i] - widthOf(cell));
+        text += _columns[i].align == Align::Right ? padding + cell : cell + padding;
+        text += spaces(kGap);
+      }
+      text.erase(text.find_last_not_of(' ') + 1);
+      std::cout << (isTitle ? emphasized(text) : text) << '\n';
+    }
+  };
+  if (hasTitles) {
+    printRow([this](std::size_t i) { return _columns[i].title; }, true);
+  }
+  for (const auto& row : _rows) {
+    printRow([&row](std::size_t i) { return row[i]; }, false);
+  }
+}
+
+std::string groupedDigits(std::uint64_t number) {
+  std::string digits = std::to_string(number);
+  for (std::size_t at = digits.size(); at > 3; at -= 3) {
+    digits.insert(at - 3, 1, ',');
+  }
+  return digits;
+}
+
+}  // namespace vesprun
