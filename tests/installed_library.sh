@@ -59,7 +59,7 @@ cc -std=c99 -Wall -Wextra -Wpedantic -Werror "$source/examples/count-lines/main.
   $(pkg-config --cflags --libs vesprun) -o count-lines
 
 "$prefix/bin/vespctl" init "$work/device" --sample
-"$prefix/bin/vespctl" nand "$work/device" lab >"$work/lab"
+"$prefix/bin/vespctl" -C "$work/device" nand lab >"$work/lab"
 grep -oP '"com\.quill[^"]*":-?\d+' "$work/lab" | tr -d '"' |
   sed 's/:\(-\?[0-9]*\)$/: \1/' >"$work/expected"
 [ "$(wc -l <"$work/expected")" -ge 5 ]
@@ -93,7 +93,7 @@ grep -q '^HLT_' "$work/ftl"
 if "$python" "$work/nowhere" "$work/folder" 2>"$work/message"; then exit 1; fi
 grep -q "^watch_folder.py: .*nowhere" "$work/message"
 
-"$prefix/bin/vespctl" counters "$work/device" dump | cut -f1,3,4 | grep -P '\t(example|folder)\.' |
+"$prefix/bin/vespctl" -C "$work/device" counters dump | cut -f1,3,4 | grep -P '\t(example|folder)\.' |
   sort | uniq -c | awk '{ print $1, $2, $3, $4 }' >"$work/counted"
 diff - "$work/counted" <<'END'
 72 sample example.length 1

@@ -5,7 +5,7 @@
  *   ./count-lines DIRECTORY KEY <FILE
  *
  * KEY.lines becomes a scalar, KEY.length a distribution. `vespctl init DIRECTORY` makes a device to
- * try, and `vespctl counters DIRECTORY dump` shows them.
+ * try, and `vespctl counters dump` shows them.
  */
 
 #include <stdio.h>

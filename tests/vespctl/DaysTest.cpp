@@ -58,7 +58,7 @@ class DaysTest : public VespctlTest {
 
 TEST_F(DaysTest, DaysTellsWhatIsKeptAndChangesNothing) {
   EXPECT_EQ(
-      print("days --last 1"),
+      print("days --json --last 1"),
       "{\"day\":19787,\"date\":\"2024-03-05\",\"scalars\":0,\"distributions\":0,\"logs\":[]}\n");
   count(19785, 19786);
   print("counters sample d 1 2 --day 19785");
@@ -70,15 +70,15 @@ TEST_F(DaysTest, DaysTellsWhatIsKeptAndChangesNothing) {
       "prefs set com.quill.aggregated.vesprun "
       "LastCrashLogSerializationDateInDaysSince1970 19787");
   const std::string before = snapshot();
-  EXPECT_EQ(print("days --last 3"),
+  EXPECT_EQ(print("days --json --last 3"),
             R"({"day":19785,"date":"2024-03-03","scalars":1,"distributions":1,"logs":[]}
 {"day":19786,"date":"2024-03-04","scalars":1,"distributions":0,"logs":["0001-193-log-aggregated.ptree","0002-193-log-aggregated.ptree"]}
 {"day":19787,"date":"2024-03-05","scalars":0,"distributions":0,"logs":[]}
 )");
-  EXPECT_THAT(error, AllOf(HasSubstr("vespctl: 0004-193-log-aggregated.ptree: line 1"),
+  EXPECT_THAT(error, AllOf(HasSubstr("vespctl days: 0004-193-log-aggregated.ptree: line 1"),
                            HasSubstr("the day of the last run, 19787, is ahead of the clock")));
-  EXPECT_EQ(print("days --last 0"), "");
-  EXPECT_THAT(print("days"), StartsWith("{\"day\":19774,"));
+  EXPECT_EQ(print("days --json --last 0"), "");
+  EXPECT_THAT(print("days --json"), StartsWith("{\"day\":19774,"));
   EXPECT_EQ(snapshot(), before);
 }
 
@@ -115,46 +115,46 @@ TEST_F(DaysTest, CatchUpSubmitsWhatTheRunOfEachDayWouldHave) {
   std::filesystem::rename(folder.path("kept"), folder.path("device"));
   setTime("2024-03-07T04:00:00Z");
   const std::string events = folder.read("device/outbox/events.jsonl");
-  EXPECT_EQ(print("days --last 0; (flock sh -c 'sleep 0.5; touch released' & sleep "
+  EXPECT_EQ(print("days --json --last 0; (flock sh -c 'sleep 0.5; touch released' & sleep "
                   "0.1; '" VESPCTL_PROGRAM "' catch-up --last 3; test -e released)"),
             "[19785,19786,19787]\n")
       << "after the run that is at work";
   EXPECT_EQ(documents(false), ofRuns);
   EXPECT_EQ(folder.read("device/outbox/events.jsonl"), events);
-  EXPECT_EQ(print("prefs get com.quill.aggregated DatabaseCorruptionCount"), "3\n");
-  EXPECT_EQ(print("prefs get com.quill.aggregated.vesprun "
+  EXPECT_EQ(print("prefs get --json com.quill.aggregated DatabaseCorruptionCount"), "3\n");
+  EXPECT_EQ(print("prefs get --json com.quill.aggregated.vesprun "
                   "LastCrashLogSerializationDateInDaysSince1970"),
             "19784\n");
-  EXPECT_EQ(print("catch-up"), "[]\n");
-  EXPECT_THAT(print("prune --outbox-size 0"), HasSubstr("0004-193-log-aggregated.ptree"));
-  EXPECT_EQ(print("catch-up --last 4294967295"), "[]\n") << "pruned is not missed";
+  EXPECT_EQ(print("catch-up --json"), "[]\n");
+  EXPECT_THAT(print("prune --json --outbox-size 0"), HasSubstr("0004-193-log-aggregated.ptree"));
+  EXPECT_EQ(print("catch-up --json --last 4294967295"), "[]\n") << "pruned is not missed";
 }
 
 TEST_F(DaysTest, CatchUpSaysWhichDaysCouldNotBeSubmitted) {
   count(19783, 19786);
   print("counters set other 1 --day 19781");
   setTime("2024-03-05T09:15:02Z", R"({"fails": true})");
-  EXPECT_EQ(run("catch-up"), 1);
+  EXPECT_EQ(run("catch-up --json"), 1);
   EXPECT_EQ(output, "[]\n");
   EXPECT_EQ(error, "vespctl: not submitted: 19783, 19784, 19785; the system log says why\n");
   setTime("2024-03-05T09:15:02Z", R"({"enabled": false})");
-  EXPECT_EQ(print("catch-up"), "[]\n");
+  EXPECT_EQ(print("catch-up --json"), "[]\n");
   setTime("2024-03-05T09:15:02Z");
-  EXPECT_EQ(print("catch-up --last 2"), "[19784,19785]\n");
-  EXPECT_EQ(print("catch-up"), "[19783]\n") << "nothing of day 19781 may leave";
+  EXPECT_EQ(print("catch-up --json --last 2"), "[19784,19785]\n");
+  EXPECT_EQ(print("catch-up --json"), "[19783]\n") << "nothing of day 19781 may leave";
 }
 
 TEST_F(DaysTest, PruneKeepsTheDaysThatAreAskedForOrStillRead) {
   count(19780, 19789);
   print("counters sample d 1 2 --day 19779");
   print("counters sample d 1 2 --day 19785");
-  EXPECT_EQ(print("prune"),
+  EXPECT_EQ(print("prune --json"),
             "{\"days\":[],\"scalars\":0,\"distributions\":0,\"logs\":[],\"lines\":{}}\n");
-  EXPECT_THAT(print("prune --counters 4294967295"), StartsWith("{\"days\":[],"));
-  EXPECT_EQ(print("prune --counters 4"),
+  EXPECT_THAT(print("prune --json --counters 4294967295"), StartsWith("{\"days\":[],"));
+  EXPECT_EQ(print("prune --json --counters 4"),
             R"({"days":[19779,19780,19781,19782],"scalars":3,"distributions":1,"logs":[],"lines":{}}
 )");
-  EXPECT_THAT(print("prune --counters 0"), StartsWith("{\"days\":[19783,19784],"));
+  EXPECT_THAT(print("prune --json --counters 0"), StartsWith("{\"days\":[19783,19784],"));
   EXPECT_EQ(print("counters dump"),
             "scalar\t19785\ts\t19785\nsample\t19785\td\t1\t33302\nsample\t19785\td\t2\t33302\n"
             "scalar\t19786\ts\t19786\nscalar\t19787\ts\t19787\nscalar\t19788\ts\t19788\n"
@@ -180,7 +180,7 @@ TEST_F(DaysTest, PruneRemovesOldLogsWithTheirHeadersAndOldLines) {
   std::filesystem::create_symlink("../events.jsonl", folder.path(logs + "/0002-link.log"));
   std::filesystem::create_directory(folder.path(logs + "/0003-folder.log"));
   ASSERT_EQ(mkfifo(folder.path("device/outbox/records.jsonl").c_str(), 0600), 0);
-  EXPECT_EQ(run("prune --outbox 3"), 1) << "the pipe is not a file of lines";
+  EXPECT_EQ(run("prune --json --outbox 3"), 1) << "the pipe is not a file of lines";
   EXPECT_EQ(
       output,
       R"({"days":[],"scalars":0,"distributions":0,"logs":["0001-193-log-aggregated.ptree","0002-193-log-aggregated.ptree"],"lines":{"events.jsonl":1,"log.jsonl":15}}
@@ -210,16 +210,16 @@ TEST_F(DaysTest, PruneRemovesTheOldestLogsUntilTheOutboxIsSmallEnough) {
   folder.write(logs + "/0010-165-S.header.json", "of a log that is gone");
   folder.write("device/outbox/log.jsonl", large);
   EXPECT_EQ(
-      print("prune --outbox-size 1"),
+      print("prune --json --outbox-size 1"),
       R"({"days":[],"scalars":0,"distributions":0,"logs":["0009-165-S.log","0010-165-S.header.json","10000-165-S.log"],"lines":{}}
 )");
   EXPECT_THAT(folder.names(logs), ElementsAre());
-  EXPECT_THAT(print("prune --outbox-size 18446744073709551615"), HasSubstr("\"logs\":[]"));
+  EXPECT_THAT(print("prune --json --outbox-size 18446744073709551615"), HasSubstr("\"logs\":[]"));
   count(19786, 19786);
   print("run -- -f");
   EXPECT_THAT(folder.names(logs), ElementsAre("10001-193-log-aggregated.header.json",
                                               "10001-193-log-aggregated.ptree"));
-  EXPECT_THAT(print("prune --outbox-size 0"),
+  EXPECT_THAT(print("prune --json --outbox-size 0"),
               HasSubstr("[\"10001-193-log-aggregated.ptree\"]"));
 }
 
@@ -229,7 +229,7 @@ TEST_F(DaysTest, RevisionsGoOnAfterPruningWhicheverLogsWent) {
   addLog(3, 5, "2024-03-01");
   addLog(4, 4, "2024-03-01");
   EXPECT_EQ(revisions(), "19787:1 19787:2 19787:3 19786:1\n");
-  print("prune --outbox 2");
+  print("prune --json --outbox 2");
   EXPECT_EQ(revisions(), "19787:2\n");
   addLog(5, 5, "2024-03-01");
   addLog(6, 4, "2024-03-04");
@@ -241,7 +241,7 @@ TEST_F(DaysTest, RevisionsGoOnAfterPruningWhicheverLogsWent) {
 )";
   folder.write("device/outbox/pruned.jsonl", notes + "{\"name\":7}\n\ntorn");
   EXPECT_EQ(revisions(), "19787:2 19787:4 19786:2\n");
-  EXPECT_THAT(print("prune --outbox 2"), HasSubstr("[\"0005-193-log-aggregated.ptree\"]"));
+  EXPECT_THAT(print("prune --json --outbox 2"), HasSubstr("[\"0005-193-log-aggregated.ptree\"]"));
   EXPECT_EQ(folder.read("device/outbox/pruned.jsonl"), notes + "{\"name\":7}\n\ntorn");
   addLog(7, 5, "2024-03-04");
   EXPECT_EQ(revisions(), "19787:2 19786:2 19787:5\n");
@@ -252,13 +252,13 @@ TEST_F(DaysTest, PruneKeepsADailyLogThatItCannotNote) {
   folder.write(logs + "/0002-165-S.log", "");
   folder.write(logs + "/0003-193-log-aggregated.ptree", "no daily log");
   std::filesystem::create_symlink("/dev/full", folder.path("device/outbox/pruned.jsonl"));
-  EXPECT_EQ(run("prune --outbox-size 0"), 1);
+  EXPECT_EQ(run("prune --json --outbox-size 0"), 1);
   EXPECT_THAT(error, HasSubstr("pruned.jsonl: "));
   EXPECT_THAT(output, HasSubstr("[\"0002-165-S.log\"]"));
   EXPECT_THAT(folder.names(logs),
               ElementsAre("0001-193-log-aggregated.ptree", "0003-193-log-aggregated.ptree"));
   std::filesystem::remove(folder.path("device/outbox/pruned.jsonl"));
-  EXPECT_THAT(print("prune --outbox-size 0"),
+  EXPECT_THAT(print("prune --json --outbox-size 0"),
               HasSubstr("\"0003-193-log-aggregated.ptree\"]"));
 }
 

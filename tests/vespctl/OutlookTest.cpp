@@ -78,8 +78,8 @@ TEST_F(OutlookTest, PreviewsWhatTheRunSubmitsRightAfter) {
     const std::string day = today ? " --day 19787" : "";
     const std::string before = snapshot();
     const std::string preview = print("preview --document" + day);
-    const std::string json = print("preview" + day);
-    const PropertyValue leftOut = valueOfJson(print("preview --left-out" + day));
+    const std::string json = print("preview --json" + day);
+    const PropertyValue leftOut = valueOfJson(print("preview --json --left-out" + day));
     EXPECT_EQ(snapshot(), before) << seed;
     print(std::string("run -- ") + (today ? "-t" : "-f"));
     const bool hasLog = run("ptree device/outbox/logs/*-193-*.ptree") == 0;
@@ -89,7 +89,7 @@ TEST_F(OutlookTest, PreviewsWhatTheRunSubmitsRightAfter) {
     if (!leftOut.array()->empty()) {
       const PropertyDict& row = *leftOut.array()->back().dict();
       const bool isScalar = *row.findString("kind") == "scalar";
-      print("explain " + *row.findString("key") + (isScalar ? "" : " --distribution"));
+      print("explain --json " + *row.findString("key") + (isScalar ? "" : " --distribution"));
       EXPECT_THAT(output, HasSubstr("\"leaves\":false")) << seed;
     }
     std::filesystem::remove_all(folder.path("device/outbox"));
@@ -118,11 +118,11 @@ TEST_F(OutlookTest, PreviewsNullWhereNothingWouldBeSubmitted) {
   for (const auto& [entries, whitelist, complaint] : cases) {
     describe(entries);
     writePtree(kWhitelist, whitelist);
-    EXPECT_EQ(print("preview"), "null\n") << whitelist;
+    EXPECT_EQ(print("preview --json"), "null\n") << whitelist;
     EXPECT_TRUE(error.starts_with(complaint) && error.empty() == (*complaint == '\0')) << error;
     EXPECT_EQ(print("preview --document"), "");
   }
-  EXPECT_EQ(print("preview --left-out"), "[{\"kind\":\"scalar\",\"key\":\"s\"}]\n");
+  EXPECT_EQ(print("preview --json --left-out"), "[{\"kind\":\"scalar\",\"key\":\"s\"}]\n");
   EXPECT_EQ(run("preview --left-out --document"), 2);
   EXPECT_EQ(run("preview --day x"), 2);
 }
@@ -203,7 +203,7 @@ TEST_F(OutlookTest, ExplainsByWhatAKeyLeavesOrStays) {
        R"("options":{"intervals":1},"source":false,"passedOver":[],"values":[{"day":19786,"statistics":null,"histogram":null}]})"},
   };
   for (const auto& [key, answer] : cases) {
-    EXPECT_THAT(print(std::string("explain ") + key), HasSubstr(answer));
+    EXPECT_THAT(print(std::string("explain --json ") + key), HasSubstr(answer));
   }
   describe(R"(, "properties": {"InternalBuild": true})");
   const std::pair<const char*, const char*> onInternalDevice[] = {
@@ -213,10 +213,10 @@ TEST_F(OutlookTest, ExplainsByWhatAKeyLeavesOrStays) {
       {"key.longer",
        R"("leaves":true,"by":"internal device","prefix":null,"group":null,"options":{},)"}};
   for (const auto& [key, answer] : onInternalDevice) {
-    EXPECT_THAT(print(std::string("explain ") + key), HasSubstr(answer));
+    EXPECT_THAT(print(std::string("explain --json ") + key), HasSubstr(answer));
   }
   std::filesystem::remove(folder.path(kWhitelist));
-  EXPECT_THAT(print("explain key"), HasSubstr(R"("leaves":false,"by":null,)" + nothing));
+  EXPECT_THAT(print("explain --json key"), HasSubstr(R"("leaves":false,"by":null,)" + nothing));
 }
 
 TEST_F(OutlookTest, FindsEachFaultOfAWhitelist) {
@@ -250,7 +250,7 @@ TEST_F(OutlookTest, FindsEachFaultOfAWhitelist) {
        "G/null/null/stands twice\nG/ScalarKeys/null/stands twice\n"
        "G/ScalarKeys/k/unreadable options\nG/ScalarKeys/k/stands twice\n"}};
   for (const auto& [file, expected] : cases) {
-    EXPECT_EQ(run("whitelist check " + std::string(file)), 1);
+    EXPECT_EQ(run("whitelist check --json " + std::string(file)), 1);
     const auto count = std::count(expected, expected + std::strlen(expected), '\n');
     EXPECT_EQ(error,
               "vespctl: " + std::string(file) + ": faults found: " + std::to_string(count) + "\n");
@@ -261,8 +261,8 @@ TEST_F(OutlookTest, FindsEachFaultOfAWhitelist) {
     EXPECT_EQ(found, std::string(expected) + "]\n");
   }
   writePtree("good", R"({"G": {"ScalarKeys": {"a": {}}}})");
-  EXPECT_EQ(print("whitelist check - <good"), "[]\n");
-  EXPECT_EQ(run("whitelist check <(echo '<ptree version=\"1.0\"><array/></ptree>')"), 1);
+  EXPECT_EQ(print("whitelist check --json - <good"), "[]\n");
+  EXPECT_EQ(run("whitelist check --json <(echo '<ptree version=\"1.0\"><array/></ptree>')"), 1);
   EXPECT_EQ(output, "");
   EXPECT_THAT(error, HasSubstr("the root is not a dictionary"));
 }
@@ -274,12 +274,12 @@ TEST_F(OutlookTest, TellsWhatAnotherWhitelistWouldChange) {
   writePtree("next", R"({"G": {"ScalarKeyPrefixes": {"a": {"sig_fig": 2.0}, "b": {}},
       "DistributionKeys": {"d": {"intervals": [1.0, 3]}, "e": {"sig_fig": 1}}}})");
   EXPECT_EQ(
-      print("whitelist diff next"),
+      print("whitelist diff --json next"),
       R"({"scalars":{"added":["b"],"removed":["com.quill.usage.cur_boot_session_cpu_uptime"],)"
       R"("changed":[]},"distributions":{"added":[],"removed":[],"changed":[{"key":"d",)"
       R"("before":{"intervals":[1,2]},"after":{"intervals":[1.0,3]}}]}})"
       "\n");
-  EXPECT_EQ(run("whitelist diff - <<<'<ptree>'"), 1);
+  EXPECT_EQ(run("whitelist diff --json - <<<'<ptree>'"), 1);
   EXPECT_THAT(error, HasSubstr("standard input"));
 }
 

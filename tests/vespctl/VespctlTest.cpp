@@ -112,7 +112,7 @@ TEST_F(VespctlTest, TakesNumbersAsDecimalOnes) {
   for (const char* const number : {"0", "08", "18446744073709551615"}) {
     print(std::string("nand magazine -- ") + number);
   }
-  EXPECT_EQ(print("days --last 010 | wc -l"), "10\n");
+  EXPECT_EQ(print("days --last 010 --json | wc -l"), "10\n");
   for (const char* const option :
        {"days --last ", "catch-up --last ", "prune --counters ",
         "prune --outbox ", "prune --outbox-size ", "export --from ",

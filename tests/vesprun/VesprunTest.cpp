@@ -55,7 +55,7 @@ class Process {
   /// Sends what the arguments of `vespctl send DIR` say, once the service is offered.
   void send(const std::string& arguments) {
     ASSERT_TRUE(comesTrue([&] { return device.exists(std::string("run/") + kService); }));
-    const std::string command = VESPCTL_PROGRAM " send " + device.path() + ' ' + arguments;
+    const std::string command = VESPCTL_PROGRAM " -C " + device.path() + " send " + arguments;
     EXPECT_EQ(std::system(command.c_str()), 0) << command;
   }
 
