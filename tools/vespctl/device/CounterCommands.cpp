@@ -12,6 +12,7 @@
 #include "Complaints.h"
 #include "commandline/Arguments.h"
 #include "common/Calendar.h"
+#include "device/CounterRows.h"
 #include "platform/host/counters/CounterLines.h"
 #include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/NumberText.h"
@@ -224,6 +225,7 @@ void addDump(CLI::App& command) {
 }
 
 constexpr Command kCounterCommands[] = {
+    {"get", "Shows the rows of a key", addGetCounters},
     {"set", "Sets a scalar", addScalarChange<false>},
     {"add", "Adds to a scalar, wrapping in 64 bits", addScalarChange<true>},
     {"sample", "Adds values to a distribution", addSample},

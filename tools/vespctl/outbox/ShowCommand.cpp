@@ -1,5 +1,7 @@
 #include "outbox/ShowCommand.h"
 
+#include <sys/stat.h>
+
 #include <algorithm>
 #include <filesystem>
 #include <iostream>
@@ -7,10 +9,14 @@
 #include <utility>
 
 #include "Command.h"
+#include "Complaints.h"
+#include "commandline/Arguments.h"
 #include "commandline/Completion.h"
+#include "common/Calendar.h"
 #include "common/TextForm.h"
 #include "outbox/DailyLogView.h"
 #include "outbox/SubmittedLogs.h"
+#include "platform/host/device/LogNumbers.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeReader.h"
 #include "platform/host/documents/QuotedText.h"
@@ -24,22 +30,71 @@ std::string entryText(const PropertyDict& line, const char* key) {
   return value != nullptr ? printableText(textForm(*value)) : "";
 }
 
-/// Shows each line of the file; says which ones cannot be read.
-template <typename Show>
-void showLines(const std::string& file, Show show) {
-  int number = 0;
-  forEachLine(contentIfThere(file), [&](const PropertyDict* line) {
-    ++number;
-    if (line != nullptr) {
-      show(*line);
-    } else {
-      std::cout << "(line " << number << " cannot be read)\n";
+/// What is wanted of the outbox.
+struct Wanted {
+  std::string kind;
+  std::optional<GivenDay> sinceDay;
+  std::optional<std::uint64_t> last;
+  std::optional<Date> since;  ///< the start of that day
+
+  /// Drops all but the newest, which stand at the end.
+  template <typename T>
+  void keepLast(std::vector<T>& all) const {
+    if (last && *last < all.size()) {
+      all.erase(all.begin(), all.end() - static_cast<std::ptrdiff_t>(*last));
     }
+  }
+};
+
+struct Line {
+  std::size_t number;
+  std::optional<PropertyDict> members;  ///< nothing for a line that cannot be read
+};
+
+std::vector<Line> linesOf(const std::string& file, const Wanted& wanted) {
+  std::vector<Line> lines;
+  std::size_t number = 0;
+  forEachLine(contentIfThere(file), [&](PropertyDict* line) {
+    ++number;
+    if (wanted.since) {
+      const std::string* const time = line != nullptr ? line->findString("time") : nullptr;
+      const std::optional<Date> date = parseDateText(time != nullptr ? *time : "");
+      if (!date || *date < *wanted.since) {
+        return;
+      }
+    }
+    lines.push_back({number, line != nullptr ? std::optional(std::move(*line)) : std::nullopt});
   });
+  wanted.keepLast(lines);
+  return lines;
 }
 
-void showEvents(const DeviceDirectory& directory, bool inFull) {
-  showLines(directory.hostPath("outbox/events.jsonl"), [inFull](const PropertyDict& event) {
+/// Shows each line of the file; says which ones cannot be read.
+template <typename Show>
+void showLines(const DeviceDirectory& directory, const char* kind, const char* name,
+               const Wanted& wanted, Show show) {
+  const std::string file = directory.hostPath(std::string("outbox/") + name);
+  for (const auto& [number, members] : linesOf(file, wanted)) {
+    if (!members) {
+      const std::string fault = "line " + std::to_string(number) + " cannot be read";
+      if (invocation().json) {
+        complain(file + ": " + fault);
+      } else {
+        std::cout << '(' << fault << ")\n";
+      }
+    } else if (invocation().json) {
+      Json json{{"kind", kind}};
+      json.update(Json(*members));
+      printJson(json);
+    } else {
+      show(*members);
+    }
+  }
+}
+
+void showEvents(const DeviceDirectory& directory, const Wanted& wanted) {
+  const bool inFull = !wanted.kind.empty();
+  showLines(directory, "event", "events.jsonl", wanted, [inFull](const PropertyDict& event) {
     const PropertyDict* fields = event.findDict("payload");
     std::cout << entryText(event, "time") << "  " << entryText(event, "event") << "  "
               << (fields != nullptr ? fields->size() : 0) << " fields\n";
@@ -64,22 +119,23 @@ std::string recordText(const PropertyDict& record, bool inFull) {
   return textForm(first) + " and " + std::to_string(record.size() - kShownEntries) + " more";
 }
 
-void showRecords(const DeviceDirectory& directory, bool inFull) {
-  showLines(directory.hostPath("outbox/records.jsonl"), [inFull](const PropertyDict& line) {
+void showRecords(const DeviceDirectory& directory, const Wanted& wanted) {
+  const bool inFull = !wanted.kind.empty();
+  showLines(directory, "record", "records.jsonl", wanted, [inFull](const PropertyDict& line) {
     const PropertyDict* record = line.findDict("record");
     std::cout << entryText(line, "time") << "  type " << entryText(line, "type") << "  "
               << (record != nullptr ? printableText(recordText(*record, inFull)) : "") << '\n';
   });
 }
 
-void showNotifications(const DeviceDirectory& directory) {
-  showLines(directory.hostPath("outbox/notifications.jsonl"), [](const PropertyDict& line) {
+void showNotifications(const DeviceDirectory& directory, const Wanted& wanted) {
+  showLines(directory, "notification", "notifications.jsonl", wanted, [](const PropertyDict& line) {
     std::cout << entryText(line, "time") << "  " << entryText(line, "name") << '\n';
   });
 }
 
-void showSystemLog(const DeviceDirectory& directory) {
-  showLines(directory.hostPath("outbox/log.jsonl"), [](const PropertyDict& line) {
+void showSystemLog(const DeviceDirectory& directory, const Wanted& wanted) {
+  showLines(directory, "message", "log.jsonl", wanted, [](const PropertyDict& line) {
     const PropertyValue* value = line.find("message");
     std::string message = value != nullptr ? textForm(*value) : "";
     message.erase(message.find_last_not_of('\n') + 1);  // some messages end their own line
@@ -131,70 +187,117 @@ void showLog(const std::filesystem::path& file, bool inFull) {
   }
 }
 
-void showLogs(const DeviceDirectory& directory, bool inFull) {
+void printLog(const std::filesystem::path& file) {
+  Json header;
+  Json document;
+  Json text;
+  std::string error;
+  if (const auto content =
+          readWholeFile(std::filesystem::path(file).replace_extension(".header.json"), error)) {
+    header = jsonOrNull(valueFromJsonText(*content, error));
+  }
+  const auto content = orFail([&](std::string& why) { return readWholeFile(file, why); });
+  if (file.extension() == ".ptree") {
+    const std::optional<PropertyValue> log = readPtree(*content, error);
+    document = jsonOrNull(log);
+    if (!log) {
+      complain(file.filename().string() + ": " + error);
+    }
+  } else {
+    text = *content;
+  }
+  printJson({{"kind", "log"},
+             {"name", file.filename().string()},
+             {"header", std::move(header)},
+             {"document", std::move(document)},
+             {"text", std::move(text)}});
+}
+
+/// By number.
+std::vector<std::filesystem::path> submittedFiles(const DeviceDirectory& directory,
+                                                  const Wanted& wanted) {
+  std::vector<std::pair<std::uint64_t, std::filesystem::path>> numbered;
   for (const std::string& name : namesOfLogs(directory)) {
     const std::filesystem::path file = directory.hostPath("outbox/logs/" + name);
-    if (name.front() != '.' && (file.extension() == ".ptree" || file.extension() == ".log")) {
-      showLog(file, inFull);
+    struct stat status {};
+    if (name.front() != '.' && (file.extension() == ".ptree" || file.extension() == ".log") &&
+        (!wanted.since ||
+         (lstat(file.c_str(), &status) == 0 && status.st_mtim.tv_sec >= wanted.since->seconds))) {
+      numbered.emplace_back(logNumber(name).value_or(0), file);
+    }
+  }
+  std::ranges::stable_sort(numbered, {}, [](const auto& log) { return log.first; });
+  wanted.keepLast(numbered);
+  std::vector<std::filesystem::path> files;
+  for (auto& [number, file] : numbered) {
+    files.push_back(std::move(file));
+  }
+  return files;
+}
+
+void showLogs(const DeviceDirectory& directory, const Wanted& wanted) {
+  for (const std::filesystem::path& file : submittedFiles(directory, wanted)) {
+    if (invocation().json) {
+      printLog(file);
+    } else {
+      showLog(file, !wanted.kind.empty());
     }
   }
 }
 
-void showTitle(const char* title) { std::cout << "\n== " << title << '\n'; }
-
-void showAll(const DeviceDirectory& directory) {
-  showTitle("system log");
-  showSystemLog(directory);
-  showTitle("notifications");
-  showNotifications(directory);
-  showTitle("events");
-  showEvents(directory, false);
-  showTitle("structured records");
-  showRecords(directory, false);
-  showTitle("submitted logs");
-  showLogs(directory, false);
-}
-
 struct Kind {
   const char* name;
-  void (*show)(const DeviceDirectory& directory);
+  const char* title;
+  void (*show)(const DeviceDirectory& directory, const Wanted& wanted);
 };
 
 constexpr Kind kKinds[] = {
-    {"logs", [](const DeviceDirectory& device) { showLogs(device, true); }},
-    {"events", [](const DeviceDirectory& device) { showEvents(device, true); }},
-    {"records", [](const DeviceDirectory& device) { showRecords(device, true); }},
-    {"notifications", showNotifications},
-    {"log", showSystemLog},
+    {"log", "system log", showSystemLog}, {"notifications", "notifications", showNotifications},
+    {"events", "events", showEvents},     {"records", "structured records", showRecords},
+    {"logs", "submitted logs", showLogs},
 };
+
+void show(Wanted wanted) {
+  const auto* const known = std::ranges::find(kKinds, wanted.kind, &Kind::name);
+  if (!wanted.kind.empty() && known == std::end(kKinds)) {
+    throw CLI::ValidationError("unknown kind " + quotedText(wanted.kind) +
+                               "; one of logs, events, records, notifications, log");
+  }
+  Complaints complaints;
+  const auto device = openDeviceReadOnly(complaints);
+  if (wanted.sinceDay) {
+    wanted.since = startOfDay(wanted.sinceDay->on(device->tallybook().TBDaysSince1970()));
+  }
+  for (const Kind& kind : kKinds) {
+    if (wanted.kind.empty() && !invocation().json) {
+      std::cout << emphasized(std::string("\n== ") + kind.title) << '\n';
+    }
+    if (wanted.kind.empty() || &kind == known) {
+      kind.show(device->directory(), wanted);
+    }
+  }
+}
 
 }  // namespace
 
 void addShowCommand(CLI::App& command) {
-  const auto kind = std::make_shared<std::string>();
-  CLI::Option* const option = command.add_option(
-      "KIND", *kind,
-      "One kind in full: logs, events, records, notifications, or log (the system's)");
-  completeWith(option, [] {
+  const auto wanted = std::make_shared<Wanted>();
+  CLI::Option* const kind =
+      command.add_option("KIND", wanted->kind,
+                         "One kind in full: logs, events, records, notifications, or log (the "
+                         "system's)");
+  completeWith(kind, [] {
     std::vector<std::string> names;
     for (const Kind& known : kKinds) {
       names.emplace_back(known.name);
     }
     return names;
   });
-  command.callback([kind] {
-    const auto* const known = std::ranges::find(kKinds, *kind, &Kind::name);
-    if (!kind->empty() && known == std::end(kKinds)) {
-      throw CLI::ValidationError("unknown kind " + quotedText(*kind) +
-                                 "; one of logs, events, records, notifications, log");
-    }
-    const DeviceDirectory directory = openDirectory(Access::Reading);
-    if (kind->empty()) {
-      showAll(directory);
-    } else {
-      known->show(directory);
-    }
-  });
+  command.add_option("--last", wanted->last, "The newest N of each kind")
+      ->type_name("N")
+      ->transform(decimal<std::uint64_t>());
+  addDay(command, "--since", wanted->sinceDay, "From the start of that day on");
+  command.callback([wanted] { show(*wanted); });
 }
 
 }  // namespace vesprun
