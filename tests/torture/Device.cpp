@@ -117,7 +117,8 @@ Device::Device(const Programs& programs, const fs::path& folder)
     : _programs(&programs), _path(folder.string()) {
   std::string output;
   setenv("SOURCE_DATE_EPOCH", "1709630102", 1);  // the same rows on every day
-  if (control({"init", _path, "--sample"}, output) != 0 || control({"counters", "dump"}, output) != 0) {
+  if (control({"init", _path, "--sample"}, output) != 0 ||
+      control({"counters", "dump"}, output) != 0) {
     throw std::runtime_error("no device can be made: " + output);
   }
   describe(kDescription);

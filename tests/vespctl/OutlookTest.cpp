@@ -106,14 +106,14 @@ TEST_F(OutlookTest, PreviewsNullWhereNothingWouldBeSubmitted) {
     const char* complaint;
   } cases[] = {
       {"", R"({"Off": {"ScalarKeys": {"s": {}}}})",
-       "vespctl: keyGroup Off is disabled by tasking\n"},
+       "vespctl preview: keyGroup Off is disabled by tasking\n"},
       {R"(, "submission": {"enabled": false})", R"({"G": {"ScalarKeys": {"s": {}}}})", ""},
       {R"(, "submission": {"fails": true})", R"({"G": {"ScalarKeys": {"s": {}}}})",
-       "vespctl: Failed to write aggregated log\n"},
+       "vespctl preview: Failed to write aggregated log\n"},
       {R"(, "languages": {"preferred": ["\u0001"]})", R"({"G": {"ScalarKeys": {"s": {}}}})",
-       "vespctl: Could not create aggregated ptree: "},
+       "vespctl preview: Could not create aggregated ptree: "},
       {R"(, "properties": {"InternalBuild": true})", "[]",
-       "vespctl: Couldn't parse the contents of the config file. "},
+       "vespctl preview: Couldn't parse the contents of the config file. "},
   };
   for (const auto& [entries, whitelist, complaint] : cases) {
     describe(entries);
@@ -155,9 +155,8 @@ TEST_F(OutlookTest, LooksAtADeviceWithoutTouchingIt) {
     folder.write(kDatabase + beside, "\xD9\xD5\x05\xF9\x20\xA1\x63\xD7");
     shell("chmod -R a-w device");
     const std::string before = snapshot();
-    for (const char* command :
-         {"preview", "preview --left-out", "explain s", "page",
-          "whitelist diff device/Library/*/*/Whitelist_Stagebox.ptree"}) {
+    for (const char* command : {"preview", "preview --left-out", "explain s", "page",
+                                "whitelist diff device/Library/*/*/Whitelist_Stagebox.ptree"}) {
       EXPECT_EQ(run(command), *complaint == '\0' ? 0 : 1) << command << complaint << output;
       EXPECT_THAT(error, HasSubstr(complaint)) << command;
       EXPECT_EQ(std::count(error.begin(), error.end(), '\n'), *complaint == '\0' ? 0 : 1) << error;
@@ -251,9 +250,7 @@ TEST_F(OutlookTest, FindsEachFaultOfAWhitelist) {
        "G/ScalarKeys/k/unreadable options\nG/ScalarKeys/k/stands twice\n"}};
   for (const auto& [file, expected] : cases) {
     EXPECT_EQ(run("whitelist check --json " + std::string(file)), 1);
-    const auto count = std::count(expected, expected + std::strlen(expected), '\n');
-    EXPECT_EQ(error,
-              "vespctl: " + std::string(file) + ": faults found: " + std::to_string(count) + "\n");
+    EXPECT_EQ(error, "");
     const std::regex finding(
         R"re([\[,]\{"group":"?([^",]*)"?,"list":"?([^",]*)"?,"key":"?([^",]*)"?,"finding":"([^"]*)",)re"
         R"re("detail":"(?:\\.|[^"]){20,}"\})re");

@@ -209,8 +209,8 @@ TEST_F(PageTest, NamesWhatItCannotRead) {
   EXPECT_THAT(page(), AllOf(HasSubstr("<li><bdi>0007-193-log-aggregated.ptree</bdi>: "),
                             HasSubstr("<li><bdi>events.jsonl</bdi>: 2 lines cannot be read"),
                             HasSubstr("<bdi>s.a</bdi>"), HasSubstr("<bdi>sound</bdi>")));
-  EXPECT_THAT(error, AllOf(HasSubstr("vespctl: 0007-193-log-aggregated.ptree: "),
-                           HasSubstr("vespctl: events.jsonl: 2 lines cannot be read\n")));
+  EXPECT_THAT(error, AllOf(HasSubstr("vespctl page: 0007-193-log-aggregated.ptree: "),
+                           HasSubstr("vespctl page: events.jsonl: 2 lines cannot be read\n")));
   EXPECT_EQ(run("page \"$D/outbox\""), 0) << error;
   EXPECT_THAT(output, AllOf(HasSubstr("There is no daily log"), HasSubstr("No scalar"),
                             HasSubstr("No distribution"), HasSubstr("No analytics event")));

@@ -28,16 +28,16 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
       {2, "frob", "unknown command \"frob\"; one of init, run,"},
       {2, "", "a command is missing; one of init, run,"},
       {2, "counters frob 1",
-       "unknown command \"frob\"; one of set, add, sample, import, dump"},
-      {2, "counters", "a command is missing; one of set"},
+       "unknown command \"frob\"; one of get, set, add, sample, import, dump"},
+      {2, "counters", "a command is missing; one of get"},
       {2, "counters set k 1 2", "VALUE: At Most 1"},
       {2, "ptree a b", "not expected"},
-      {2, "show frob", "unknown command \"frob\"; one of logs"},
+      {2, "show frob", "unknown kind \"frob\"; one of logs"},
       {2, "prefs get d k --frob", "not expected"},
       {2, "counters set k abc", "\"abc\" is not a signed 64-bit integer"},
-      {2, "counters set k 1 --day x", "\"x\" is not a day number"},
+      {2, "counters set k 1 --day x", "\"x\" is not a day: "},
       {2, "counters sample k 1 infinity", "\"infinity\" is not a double"},
-      {2, "counters dump --from a", "\"a\" is not a day number"},
+      {2, "counters dump --from a", "\"a\" is not a day: "},
       {2, "prefs set d k '{'", "JSON: \"{\""},
       {2, "fields frob", "there is no list \"frob\""},
       {2, "nand magazine -- -1", noNumber},
@@ -46,13 +46,15 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
       {2, "nand magazine 1 --mode 0x1", noNumber},
       {2, "nand magazine 1 --mode=-1", noNumber},
       {2, "nand magazine 1 --mode 4294967296", noNumber},
-      {1, "show nowhere", "nowhere: No such file"},
-      {1, "show file logs", "file/outbox/logs: Not a directory"},
+      {2, "counters dump --json", "not expected"},
+      {2, "show -C device", "not expected"},
+      {1, "-C nowhere show", "nowhere: No such file"},
+      {1, "-C file counters set k 1", "file: no device: it has no device.json; make one with"},
       {1, "init file", "file: is not empty"},
       {1, "collect --root nowhere", "nowhere: No such file"},
       {1, "ptree - </tmp", "standard input: Is a directory"},
       {1, "ptree nowhere", "nowhere: No such file"},
-      {1, "ptree $'\\e[2J'", "vespctl: \\x1b[2J: No such file or directory\n"},
+      {1, "ptree $'\\e[2J'", "vespctl ptree: \\x1b[2J: No such file or directory\n"},
       {1, "ptree <(echo '<dict>')", "line 1: "},
       {1, "decode base nowhere", "nowhere: No such file"},
       {1, "prefs get d k", "no key \"k\" in domain \"d\""},
@@ -65,7 +67,7 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
   for (const auto& [status, arguments, complaint] : cases) {
     EXPECT_EQ(run(arguments), status) << arguments;
     EXPECT_THAT(error, HasSubstr(complaint)) << arguments;
-    EXPECT_TRUE(status == 2 || error.starts_with("vespctl: ")) << error;
+    EXPECT_TRUE(error.starts_with(status == 2 ? "vespctl" : "vespctl ")) << error;
     const auto lines = std::count(error.begin(), error.end(), '\n');
     EXPECT_EQ(lines, status == 2 ? 2 : 1) << error << "where help is, too";
   }
@@ -104,7 +106,8 @@ TEST_F(VespctlTest, DumpsAllButKeysThatBreakALine) {
   EXPECT_EQ(run("counters dump"), 1);
   EXPECT_THAT(output, MatchesRegex("scalar\t7\tk\t2\nsample\t7\td\t3\t[0-9]+\n"));
   EXPECT_EQ(error,
-            "vespctl: 2 counters, the first of them \"a\\x0ab\", are left out: no line can carry a "
+            "vespctl counters dump: 2 counters, the first of them \"a\\x0ab\", are left out: no "
+            "line can carry a "
             "line feed in a key\n");
 }
 
@@ -113,13 +116,33 @@ TEST_F(VespctlTest, TakesNumbersAsDecimalOnes) {
     print(std::string("nand magazine -- ") + number);
   }
   EXPECT_EQ(print("days --last 010 --json | wc -l"), "10\n");
-  for (const char* const option :
-       {"days --last ", "catch-up --last ", "prune --counters ",
-        "prune --outbox ", "prune --outbox-size ", "export --from ",
-        "export --to ", "preview --day ", "send daily "}) {
+  for (const char* const option : {"days --last ", "catch-up --last ", "prune --counters ",
+                                   "prune --outbox ", "prune --outbox-size "}) {
     EXPECT_NE(run(std::string(option) + "08"), 2) << error;
     EXPECT_EQ(run(std::string(option) + "0x8"), 2) << option;
     EXPECT_THAT(error, HasSubstr("\"0x8\" is not a number from ")) << option;
+  }
+}
+
+TEST_F(VespctlTest, TakesDaysAsNumbersDatesAndWords) {
+  folder.write("device/device.json", R"({"clock": "2024-03-05T09:15:02Z"})");
+  for (const char* const day : {"19787", "2024-03-05", "today"}) {
+    print(std::string("counters add a.key 1 --day ") + day);
+  }
+  print("counters sample a.key 1 2 --day yesterday");
+  EXPECT_EQ(print("counters get 'a.*' --json"),
+            R"({"day":19786,"kind":"distribution","key":"a.key","statistics":[1.0,2.0,1.5,0.5,2]}
+{"day":19787,"kind":"scalar","key":"a.key","value":3}
+)");
+  EXPECT_EQ(print("counters get --exact 'a.*' --json --from 1970-01-01"), "");
+  EXPECT_EQ(
+      print("counters get --to yesterday a.key"),
+      "Date          Day  Kind          Key    Value\n"
+      "2024-03-04  19786  distribution  a.key  minimum 1, maximum 2, mean 1.5, deviations 0.5, "
+      "count 2\n");
+  for (const char* const day : {"2024-02-30", "tomorrow", "0x8", "99999999-01-01"}) {
+    EXPECT_EQ(run(std::string("preview --day ") + day), 2);
+    EXPECT_THAT(error, HasSubstr(std::string("\"") + day + "\" is not a day: "));
   }
 }
 
@@ -193,7 +216,7 @@ TEST_F(VespctlTest, ExportsNothingOfAnUnsoundDailyLog) {
         std::to_string(1000 + std::count(complaints.begin(), complaints.end(), '\n')) +
         "-193-log-aggregated.ptree";
     writePtree("device/outbox/logs/" + name, document);
-    complaints += "vespctl: " + name + ": " + fault + '\n';
+    complaints += "vespctl export: " + name + ": " + fault + '\n';
   }
   writePtree("device/outbox/logs/2000-193-log-aggregated.ptree", log(R"({"k": 1})", "{}", "{}"));
   EXPECT_EQ(run("export --device d"), 1);
