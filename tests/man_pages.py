@@ -14,7 +14,7 @@ import sys
 def tree(program, path=(), words=()):
     """The options and arguments of each command, by the words that lead to it; `words` has arguments, too."""
     text = subprocess.run([program, *words, "--help"], check=True, capture_output=True, text=True).stdout
-    found = {path: set(re.findall(r"^  (?:-\w,)?(--[\w-]+)", text, re.M)) - {"--help"}}
+    found = {path: set(re.findall(r"^  (?:-\w,)?(--[\w-]+)", text, re.M)) - {"--help", "--json", "--version"}}
     arguments = re.findall(r"^  (\S+)", text.partition("\nPositionals:\n")[2].partition("\n\n")[0], re.M)
     found[path] |= set(arguments)
     for name in re.findall(r"^  ([\w-]+)", text.partition("\nSubcommands:\n")[2], re.M):

@@ -47,7 +47,7 @@ done <<'END'
 vespctl comp|completion
 vespctl completion |bash,fish,zsh
 vespctl -C |a folder
-vespctl counters |add,dump,import,sample,set
+vespctl counters |add,dump,get,import,sample,set
 vespctl counters d|dump
 vespctl -C x counters set --|--day,--help,--json
 vespctl counters set --day |

@@ -18,9 +18,9 @@ _@PROGRAM@() {
     case $word in
       :files) compopt -o filenames; mapfile -t COMPREPLY < <(compgen -f -- "${COMP_WORDS[COMP_CWORD]}") ;;
       :folders) compopt -o filenames; mapfile -t COMPREPLY < <(compgen -d -- "${COMP_WORDS[COMP_CWORD]}") ;;
-      *) COMPREPLY+=("$(printf %q "$word")") ;
-;
-esac done < < (@PROGRAM @complete-- "${COMP_WORDS[@]:1:COMP_CWORD}" 2 > / dev / null)
+      *) COMPREPLY+=("$(printf %q "$word")") ;;
+    esac
+  done < <(@PROGRAM@ complete -- "${COMP_WORDS[@]:1:COMP_CWORD}" 2>/dev/null)
 }
 complete -F _@PROGRAM@ @PROGRAM@
 )SCRIPT";

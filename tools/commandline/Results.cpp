@@ -54,11 +54,26 @@ std::vector<std::string> wrapped(std::string_view text, std::size_t width) {
 
 std::string spaces(std::size_t count) { return std::string(count, ' '); }
 
+bool isPair(const Json& json) { return json.is_array() && json.size() == 2 && json[0].is_string(); }
+
+void addRows(Table& table, const std::string& name, const Json& json) {
+  const std::string before = name.empty() ? "" : name + " / ";
+  if (json.is_object() && !json.empty()) {
+    for (const auto& [key, value] : json.items()) {
+      addRows(table, before + key, value);
+    }
+  } else if (json.is_array() && !json.empty() && std::ranges::all_of(json, isPair)) {
+    for (const Json& pair : json) {
+      addRows(table, before + pair[0].get<std::string>(), pair[1]);
+    }
+  } else {
+    table.addRow({name, json.is_string() ? json.get<std::string>() : jsonText(json)});
+  }
+}
+
 }  // namespace
 
-void printJson(const Json& json) {
-  std::cout << json.dump(-1, ' ', false, Json::error_handler_t::replace) << '\n';
-}
+void printJson(const Json& json) { std::cout << jsonText(json) << '\n'; }
 
 void printResult(const Json& json, const std::function<void()>& text) {
   if (invocation().json) {
@@ -66,6 +81,14 @@ void printResult(const Json& json, const std::function<void()>& text) {
   } else {
     text();
   }
+}
+
+void printResult(const Json& json) {
+  printResult(json, [&json] {
+    Table table({{""}, {""}});
+    addRows(table, "", json);
+    table.print();
+  });
 }
 
 std::size_t terminalWidth() {

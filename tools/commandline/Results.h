@@ -12,6 +12,10 @@ namespace vesprun {
 /// Prints one value, or one line of several: `json` for programs, else what `text` prints.
 void printResult(const Json& json, const std::function<void()>& text);
 
+/// The same where the text is a row for each member of the value, those of inner objects named
+/// "outer / inner".
+void printResult(const Json& json);
+
 /// Prints a value as one line of JSON.
 void printJson(const Json& json);
 

@@ -164,16 +164,16 @@ void explainKey(const OutlookArguments& arguments) {
   const std::vector<std::string_view> sources = ownScalarKeys();
   const bool isSource =
       kIsScalar && std::find(sources.begin(), sources.end(), key) != sources.end();
-  printJson({{"key", key},
-             {"kind", kIsScalar ? "scalar" : "distribution"},
-             {"leaves", decision.options() != nullptr},
-             {"by", nameOf(decision.by)},
-             {"prefix", decision.by == DecidedBy::Prefix ? Json(decision.prefix) : Json()},
-             {"group", jsonOrNull(decision.group())},
-             {"options", jsonOrNull(decision.writtenOptions())},
-             {"source", isSource},
-             {"passedOver", passedOver},
-             {"values", values}});
+  printResult({{"key", key},
+               {"kind", kIsScalar ? "scalar" : "distribution"},
+               {"leaves", decision.options() != nullptr},
+               {"by", nameOf(decision.by)},
+               {"prefix", decision.by == DecidedBy::Prefix ? Json(decision.prefix) : Json()},
+               {"group", jsonOrNull(decision.group())},
+               {"options", jsonOrNull(decision.writtenOptions())},
+               {"source", isSource},
+               {"passedOver", passedOver},
+               {"values", values}});
 }
 
 }  // namespace

@@ -82,7 +82,7 @@ void printDifferences(const std::string& file) {
     opened.complaints.fail(kUnreadableCounters);
   }
   opened.complaints.print();
-  printJson(
+  printResult(
       {{"scalars", differences<ScalarOptions>(before.get(), *after, scalars)},
        {"distributions", differences<DistributionOptions>(before.get(), *after, distributions)}});
 }

@@ -110,6 +110,15 @@ std::string layouts() {
   return names;
 }
 
+/// The status tells whether there was a result.
+void print(const Json& decoded) {
+  printResult(decoded);
+  const auto result = decoded.contains("found") ? decoded.find("found") : decoded.find("result");
+  if (result != decoded.end() && (*result == false || *result == 0)) {
+    invocation().status = 1;
+  }
+}
+
 void decode(const Arguments& arguments) {
   const bool isSnapshot = arguments.layout == kSnapshot;
   const auto* layout = std::ranges::find(kLayouts, arguments.layout, &Layout::name);
@@ -123,14 +132,14 @@ void decode(const Arguments& arguments) {
   const std::string content = readInput(arguments.file);
   const Buffer buffer(reinterpret_cast<const std::uint8_t*>(content.data()), content.size());
   if (isSnapshot) {
-    printJson(decodeSnapshot(buffer, *arguments.thread));
+    print(decodeSnapshot(buffer, *arguments.thread));
     return;
   }
   if (layout->size != 0 && buffer.size() != layout->size) {
     throw CommandFailure(inputName(arguments.file) + ": has " + std::to_string(buffer.size()) +
                          " bytes, not " + std::to_string(layout->size));
   }
-  printJson(layout->decode(buffer));
+  print(layout->decode(buffer));
 }
 
 }  // namespace

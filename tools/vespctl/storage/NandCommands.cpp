@@ -84,7 +84,7 @@ void addEntryPoint(CLI::App& command) {
     }
     const std::unique_ptr<HostPlatform> device = openDevice();
     const InstalledPlatform installed(*device);
-    printJson(callAside(row, values));
+    printResult(callAside(row, values));
   });
 }
 
