@@ -27,14 +27,15 @@ nm -DC --defined-only "$library" | grep -v ' A VESPRUN' | cut -d' ' -f3- |
   sort -u >"$work/visible"
 diff "$work/marked" "$work/visible"
 
-# A C++ program sees the library's variables, and is not ended for want of a device.
+# A C++ program gets the values of the structured log, and is not ended for want of a device.
 cat >"$work/values.cpp" <<'END'
 #include <vesprun/vesprun.h>
 #include <vesprun/vesprun.hpp>
 #include <iostream>
 int main() {
-  vesprun::gForceCollectionSet = 1;
-  std::cout << vesprun::gCurrentUserWamp + vesprun::gCurrentSysWamp + vesprun::gNeedValidityList;
+  vesprun::SetForceCollection(true);
+  std::cout << vesprun::CurrentUserWriteAmplification() + vesprun::CurrentSystemWriteAmplification() +
+                   (vesprun::NeedsValidityList() ? 1 : 0);
   vesprun::NandInfoExtractToEH_runAllSteps(0, true, 1, 0);
   std::cout << ' ' << vesprun::GetAPIErrorMessage() << '\n';
 }

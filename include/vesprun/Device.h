@@ -14,7 +14,8 @@ namespace vesprun {
 class Device {
  public:
   /// Null, with the place in `error`, when the folder or its `device.json` cannot be used or
-  /// another device is open. Sets the process's TZ to the device's time zone.
+  /// another device is open. After a fork the new process must open its own: all operations of one
+  /// that was opened before fail.
   VESPRUN_EXPORT static std::unique_ptr<Device> open(const std::string& path,
                                                      std::string& error) noexcept;
 

@@ -42,7 +42,7 @@ void logNANDInfo() {
 }  // namespace
 
 void SetNANDInfoScalars(const PropertyDict& info) {
-  if (const PropertyValue* error = info.find("com.quill.NANDInfo.Error")) {
+  if (const PropertyValue* error = info.find(kNANDInfoErrorKey)) {
     const PropertyValue* message = info.find(kNANDInfoErrorMessageKey);
     logMessage(LogLevel::Default, "error reading nand info, error %s with message %s",
                textForm(*error).c_str(),

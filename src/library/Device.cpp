@@ -1,23 +1,23 @@
 #include "Device.h"
 
 #include <exception>
-#include <mutex>
 
-#include "platform/host/HostPlatform.h"
-#include "platform/host/counters/HostTallybook.h"
+#include "library/OpenDevice.h"
 
 namespace vesprun {
 namespace {
 
-/// Held while a device is opened or closed: of two threads that open one, the second is refused.
-std::mutex gInstallationMutex;
-
-/// What the body returns; false, with a text in `error`, when it throws.
+/// What the body returns; false, with a text in `error`, when that is false or it throws.
 template <typename Body>
 bool runForProgram(std::string& error, const Body& body) noexcept {
   try {
     try {
-      return body();
+      CallFailure failure;
+      const bool done = body(failure);
+      if (!done) {
+        error.swap(failure.text);
+      }
+      return done;
     } catch (const std::exception& failure) {
       error = failure.what();
     }
@@ -30,53 +30,50 @@ bool runForProgram(std::string& error, const Body& body) noexcept {
 }  // namespace
 
 struct Device::Installation {
-  explicit Installation(std::unique_ptr<HostPlatform> opened) : platform(std::move(opened)) {}
-
-  std::unique_ptr<HostPlatform> platform;
-  InstalledPlatform installed{*platform};
+  std::unique_ptr<OpenDevice> device;
 };
 
 Device::Device(std::unique_ptr<Installation> installation)
     : _installation(std::move(installation)) {}
 
-Device::~Device() {
-  const std::scoped_lock guard(gInstallationMutex);
-  _installation.reset();
-}
+Device::~Device() = default;
 
 std::unique_ptr<Device> Device::open(const std::string& path, std::string& error) noexcept {
   std::unique_ptr<Device> device;
-  runForProgram(error, [&] {
-    const std::scoped_lock guard(gInstallationMutex);
-    if (platformIsInstalled()) {
-      error = path + ": another device is open";
-    } else if (std::unique_ptr<HostPlatform> platform = HostPlatform::open(path, error)) {
-      // NOLINTNEXTLINE(bugprone-unhandled-exception-at-new): runForProgram catches it
-      device.reset(new Device(std::make_unique<Installation>(std::move(platform))));
+  runForProgram(error, [&](CallFailure& failure) {
+    auto installation = std::make_unique<Installation>();
+    installation->device = OpenDevice::open(path, failure);
+    if (!installation->device) {
+      return false;
     }
+    // NOLINTNEXTLINE(bugprone-unhandled-exception-at-new): runForProgram catches it
+    device.reset(new Device(std::move(installation)));
     return true;
   });
   return device;
 }
 
 bool Device::setScalar(std::string_view key, std::int64_t value, std::string& error) noexcept {
-  return runForProgram(
-      error, [&] { return _installation->platform->counters().setScalar(key, value, error); });
+  return runForProgram(error, [&](CallFailure& failure) {
+    return _installation->device->setScalar(key, value, failure);
+  });
 }
 
 bool Device::addToScalar(std::string_view key, std::int64_t value, std::string& error) noexcept {
-  return runForProgram(
-      error, [&] { return _installation->platform->counters().addToScalar(key, value, error); });
+  return runForProgram(error, [&](CallFailure& failure) {
+    return _installation->device->addToScalar(key, value, failure);
+  });
 }
 
 bool Device::addToDistribution(std::string_view key, double value, std::string& error) noexcept {
-  return runForProgram(
-      error, [&] { return _installation->platform->counters().addSample(key, value, error); });
+  return runForProgram(error, [&](CallFailure& failure) {
+    return _installation->device->addToDistribution(key, value, failure);
+  });
 }
 
 bool Device::checkpoint(std::string& error) noexcept {
-  return runForProgram(error,
-                       [&] { return _installation->platform->counters().checkpoint(error); });
+  return runForProgram(
+      error, [&](CallFailure& failure) { return _installation->device->checkpoint(failure); });
 }
 
 }  // namespace vesprun

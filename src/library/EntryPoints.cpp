@@ -106,7 +106,7 @@ constexpr EntryPointRow kEntryPoints[] = {
      "Logs the controller's lists: true when all could be handled",
      [](Values values) {
        if (values[1] != 0) {  // else it stays as a program has set it
-         gForceCollectionSet = 1;
+         SetForceCollection(true);
        }
        return answer(DumpStorageStructuredLog(values[0] != 0));
      },

@@ -2,23 +2,52 @@
 
 #include <pthread.h>
 
+#include <algorithm>
+#include <array>
 #include <cstdlib>
 #include <cstring>
 #include <exception>
 #include <mutex>
 #include <string>
+#include <string_view>
 
-#include "Device.h"
+#include "NANDInfo/StructuredLogState.h"
+#include "NANDInfo/parsers/APIErrorMessage.h"
 #include "library/EntryPoints.h"
+#include "library/OpenDevice.h"
+
+#define VESPRUN_TEXT_OF(number) #number
+#define VESPRUN_DOTTED(major, minor, patch) \
+  VESPRUN_TEXT_OF(major) "." VESPRUN_TEXT_OF(minor) "." VESPRUN_TEXT_OF(patch)
+static_assert(std::string_view(VESPRUN_DOTTED(VESPRUN_VERSION_MAJOR, VESPRUN_VERSION_MINOR,
+                                              VESPRUN_VERSION_PATCH)) == VESPRUN_VERSION,
+              "the header states another version than the project");
 
 struct vesprun_device {
-  std::unique_ptr<vesprun::Device> device;
+  std::unique_ptr<vesprun::OpenDevice> device;
 };
 
 namespace {
 
-thread_local std::string gLastError;
-thread_local bool gHasNoMemoryForError = false;
+using vesprun::CallFailure;
+
+/// Of this thread's last call that failed. In a buffer: telling of a failure needs no memory.
+struct LastError {
+  vesprun_error code = VESPRUN_ERROR_NONE;
+  std::array<char, 1024> text{};
+
+  void set(vesprun_error why, std::string_view what) {
+    code = why;
+    std::size_t length = std::min(what.size(), text.size() - 1);
+    // Not in the middle of a character.
+    while (length < what.size() && length > 0 && (what[length] & 0xC0) == 0x80) {
+      --length;
+    }
+    *std::copy_n(what.begin(), length, text.begin()) = '\0';
+  }
+};
+
+thread_local LastError gLastError;
 
 /// The entry points keep state of the process: one runs at a time.
 std::mutex gCallMutex;
@@ -36,38 +65,40 @@ class WithoutCancellation {
   int _before = PTHREAD_CANCEL_ENABLE;
 };
 
-/// What the body returns. When that is `failed`, or it throws, its error becomes the last error.
+/// What the body returns. When that is `failed`, or it throws, its failure becomes the last error.
 template <typename Result, typename Body>
 Result callFromC(Result failed, const Body& body) noexcept {
   const WithoutCancellation uncancelled;
   try {
-    std::string error;
-    try {
-      const Result result = body(error);
-      if (result != failed) {
-        return result;
-      }
-    } catch (const std::exception& failure) {
-      error = failure.what();
+    CallFailure failure;
+    const Result result = body(failure);
+    if (result == failed) {
+      gLastError.set(failure.code, failure.text);
     }
-    gLastError.swap(error);
-    gHasNoMemoryForError = false;
-  } catch (const std::exception&) {
-    gHasNoMemoryForError = true;
+    return result;
+  } catch (const std::bad_alloc&) {
+    gLastError.set(VESPRUN_ERROR_MEMORY, "out of memory");
+  } catch (const std::exception& thrown) {
+    gLastError.set(VESPRUN_ERROR_OTHER, thrown.what());
   }
   return failed;
+}
+
+/// True when nothing that is needed is a null pointer.
+bool isGiven(const void* pointer, const char* what, CallFailure& failure) {
+  return pointer != nullptr ||
+         failure.set(VESPRUN_ERROR_ARGUMENT, std::string("no ") + what + " is given");
 }
 
 /// 0, or -1 on failure, of a change of the counter `key`.
 template <typename Value>
 int changeCounter(vesprun_device* device, const char* key, Value value,
-                  bool (vesprun::Device::*change)(std::string_view, Value, std::string&)) noexcept {
-  return callFromC(-1, [&](std::string& error) {
-    if (device == nullptr || key == nullptr) {
-      error = device == nullptr ? "no device is given" : "no key is given";
-      return -1;
-    }
-    return (*device->device.*change)(key, value, error) ? 0 : -1;
+                  bool (vesprun::OpenDevice::*change)(std::string_view, Value,
+                                                      CallFailure&)) noexcept {
+  return callFromC(-1, [&](CallFailure& failure) {
+    const bool done = isGiven(device, "device", failure) && isGiven(key, "key", failure) &&
+                      (*device->device.*change)(key, value, failure);
+    return done ? 0 : -1;
   });
 }
 
@@ -75,18 +106,17 @@ int changeCounter(vesprun_device* device, const char* key, Value value,
 
 const char* vesprun_version(void) { return VESPRUN_VERSION; }
 
-const char* vesprun_last_error(void) {
-  return gHasNoMemoryForError ? "out of memory" : gLastError.c_str();
-}
+const char* vesprun_last_error(void) { return gLastError.text.data(); }
+
+vesprun_error vesprun_last_error_code(void) { return gLastError.code; }
 
 vesprun_device* vesprun_open(const char* directory) {
-  return callFromC<vesprun_device*>(nullptr, [&](std::string& error) -> vesprun_device* {
-    if (directory == nullptr) {
-      error = "no directory is given";
+  return callFromC<vesprun_device*>(nullptr, [&](CallFailure& failure) -> vesprun_device* {
+    if (!isGiven(directory, "directory", failure)) {
       return nullptr;
     }
     auto opened = std::make_unique<vesprun_device>();
-    opened->device = vesprun::Device::open(directory, error);
+    opened->device = vesprun::OpenDevice::open(directory, failure);
     return opened->device ? opened.release() : nullptr;
   });
 }
@@ -97,36 +127,34 @@ void vesprun_close(vesprun_device* device) {
 }
 
 int vesprun_set_scalar(vesprun_device* device, const char* key, int64_t value) {
-  return changeCounter(device, key, value, &vesprun::Device::setScalar);
+  return changeCounter(device, key, value, &vesprun::OpenDevice::setScalar);
 }
 
 int vesprun_add_to_scalar(vesprun_device* device, const char* key, int64_t value) {
-  return changeCounter(device, key, value, &vesprun::Device::addToScalar);
+  return changeCounter(device, key, value, &vesprun::OpenDevice::addToScalar);
 }
 
 int vesprun_add_to_distribution(vesprun_device* device, const char* key, double value) {
-  return changeCounter(device, key, value, &vesprun::Device::addToDistribution);
+  return changeCounter(device, key, value, &vesprun::OpenDevice::addToDistribution);
 }
 
 int vesprun_checkpoint(vesprun_device* device) {
-  return callFromC(-1, [device](std::string& error) {
-    if (device == nullptr) {
-      error = "no device is given";
-      return -1;
-    }
-    return device->device->checkpoint(error) ? 0 : -1;
+  return callFromC(-1, [device](CallFailure& failure) {
+    return isGiven(device, "device", failure) && device->device->checkpoint(failure) ? 0 : -1;
   });
 }
 
 char* vesprun_call(vesprun_device* device, const char* entry_point, const char* arguments) {
-  return callFromC<char*>(nullptr, [&](std::string& error) -> char* {
-    if (device == nullptr || entry_point == nullptr) {
-      error = device == nullptr ? "no device is given" : "no entry point is given";
+  return callFromC<char*>(nullptr, [&](CallFailure& failure) -> char* {
+    if (!isGiven(device, "device", failure) || !isGiven(entry_point, "entry point", failure) ||
+        !device->device->isOfThisProcess(failure)) {
       return nullptr;
     }
     const std::scoped_lock guard(gCallMutex);
+    vesprun::ForgetAPIErrorMessage();
+    failure.code = VESPRUN_ERROR_ARGUMENT;
     const std::optional<std::string> json =
-        vesprun::callByName(entry_point, arguments != nullptr ? arguments : "", error);
+        vesprun::callByName(entry_point, arguments != nullptr ? arguments : "", failure.text);
     if (!json) {
       return nullptr;
     }
@@ -136,6 +164,11 @@ char* vesprun_call(vesprun_device* device, const char* entry_point, const char* 
     }
     return text;
   });
+}
+
+void vesprun_force_validity_list(int force) {
+  const std::scoped_lock guard(gCallMutex);
+  vesprun::SetForceCollection(force != 0);
 }
 
 void vesprun_free(char* text) { std::free(text); }

@@ -6,6 +6,7 @@
 #include <span>
 #include <string>
 
+#include "common/LittleEndian.h"
 #include "platform/DictionaryHelpers.h"
 #include "platform/Platform.h"
 
@@ -29,8 +30,8 @@ PropertyDict describe(const ECCEventRecord& event) {
   PropertyDict record{{"id", event[0]}, {"count", count}};
   for (std::size_t i = 0; i < std::min<std::size_t>(count, kMostRegisters); ++i) {
     setNumberValueForType(record, "reg" + std::to_string(i),
-                          event.data() + kFirstRegister + i * sizeof(std::uint64_t),
-                          PVNumberType::Int64);
+                          static_cast<std::int64_t>(loadLittleEndian<std::uint64_t>(
+                              event.data() + kFirstRegister + i * sizeof(std::uint64_t))));
   }
   return record;
 }

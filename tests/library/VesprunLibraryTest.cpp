@@ -5,6 +5,7 @@
 #include <atomic>
 #include <thread>
 
+#include "NANDInfo/lists/StructuredLogState.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "common/ProcessState.h"
 #include "platform/host/HostPlatform.h"
@@ -15,7 +16,7 @@
 namespace vesprun {
 namespace {
 
-using ::testing::HasSubstr, ::testing::IsEmpty, ::testing::StartsWith;
+using ::testing::HasSubstr, ::testing::IsEmpty, ::testing::StartsWith, ::testing::StrEq;
 
 constexpr const char* kFile = "var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
 
@@ -128,9 +129,16 @@ TEST_F(VesprunLibraryTest, GivesTheResultOfAnEntryPointAsJson) {
   for (const char* name : {"vm-freezer", "CopyVMFreezerNANDInfo"}) {
     EXPECT_EQ(call(name), R"({"result":{},"error":"NA"})");
   }
+  // The error is that of the call, not the first of the process.
   EXPECT_EQ(call("connect", "{}"), R"({"result":false,"error":"NA"})");
   EXPECT_EQ(call("CopyNANDFTLInfo", R"({"stat-keys":true})"),
             R"({"result":null,"error":"gatherORUFTLData: Could not get nand_exporter_t"})");
+  EXPECT_EQ(call("vm-freezer"), R"({"result":{},"error":"NA"})");
+  vesprun_force_validity_list(1);
+  EXPECT_EQ(call("structured-log"), R"({"result":false,"error":"NA"})");
+  EXPECT_EQ(gForceCollectionSet, 1);
+  vesprun_force_validity_list(0);
+  EXPECT_EQ(gForceCollectionSet, 0);
   EXPECT_THAT(call("magazine", R"({"hours":24,"raw":false,"mode":4294967295})"),
               HasSubstr("com.quill.NANDInfo.IsStatMagSupported"));
   ProcessState::startAfresh();
@@ -161,23 +169,64 @@ TEST_F(VesprunLibraryTest, SaysWhatIsWrongWithACall) {
 }
 
 TEST_F(VesprunLibraryTest, SurvivesAProgramThatUsesItWrongly) {
-  const auto fails = [](bool failed, const char* error) {
+  const auto fails = [](bool failed, const char* error, vesprun_error code) {
     EXPECT_TRUE(failed) << error;
     EXPECT_THAT(vesprun_last_error(), HasSubstr(error));
+    EXPECT_EQ(vesprun_last_error_code(), code) << error;
   };
-  fails(vesprun_open(nullptr) == nullptr, "no directory is given");
-  fails(vesprun_open("/nowhere") == nullptr, "/nowhere");
-  fails(vesprun_set_scalar(nullptr, "k", 1) == -1, "no device is given");
-  fails(vesprun_checkpoint(nullptr) == -1, "no device is given");
-  fails(vesprun_call(nullptr, "lab", nullptr) == nullptr, "no device is given");
+  fails(vesprun_open(nullptr) == nullptr, "no directory is given", VESPRUN_ERROR_ARGUMENT);
+  fails(vesprun_open("/nowhere") == nullptr, "/nowhere", VESPRUN_ERROR_NOT_A_DEVICE);
+  fails(vesprun_set_scalar(nullptr, "k", 1) == -1, "no device is given", VESPRUN_ERROR_ARGUMENT);
+  fails(vesprun_checkpoint(nullptr) == -1, "no device is given", VESPRUN_ERROR_ARGUMENT);
+  fails(vesprun_call(nullptr, "lab", nullptr) == nullptr, "no device is given",
+        VESPRUN_ERROR_ARGUMENT);
   open();
-  fails(vesprun_open(folder.path().c_str()) == nullptr, "another device is open");
-  fails(vesprun_add_to_scalar(device, nullptr, 1) == -1, "no key is given");
-  fails(vesprun_add_to_distribution(device, "\xff", 1) == -1, "at byte 0");
+  fails(vesprun_open(folder.path().c_str()) == nullptr, "another device is open",
+        VESPRUN_ERROR_BUSY);
+  fails(vesprun_add_to_scalar(device, nullptr, 1) == -1, "no key is given", VESPRUN_ERROR_ARGUMENT);
+  fails(vesprun_add_to_distribution(device, "\xff", 1) == -1, "at byte 0", VESPRUN_ERROR_KEY);
+  fails(vesprun_call(device, "frob", nullptr) == nullptr, "there is no entry point",
+        VESPRUN_ERROR_ARGUMENT);
+  // A long text is cut between characters.
+  const std::string longPath = '/' + std::string(1021, 'x') + "\xC3\xA4";
+  close();
+  EXPECT_EQ(vesprun_open(longPath.c_str()), nullptr);
+  EXPECT_THAT(vesprun_last_error(), StrEq(longPath.substr(0, 1022)));
+  // A database of a newer version is neither written to nor moved aside.
+  open();
+  EXPECT_EQ(vesprun_set_scalar(device, "k", 1), 0);
+  EXPECT_EQ(vesprun_checkpoint(device), 0);
+  std::string database = folder.read(kFile);
+  database[63] = 2;  // the version in the header
+  folder.write(kFile, database);
+  EXPECT_EQ(vesprun_set_scalar(device, "k", 2), 0);
+  fails(vesprun_checkpoint(device) == -1, "newer version", VESPRUN_ERROR_TOO_OLD);
+  EXPECT_EQ(folder.read(kFile), database);
   close();
   open();  // the refused ones hold nothing
   EXPECT_STREQ(vesprun_version(), VESPRUN_VERSION);
   vesprun_free(nullptr);
+}
+
+TEST_F(VesprunLibraryTest, CountsOnceWhenTheProcessForksAndLeavesItsTimeZone) {
+  folder.write("device.json", R"({"clock": "2024-03-05T09:15:02Z", "timeZone": "Asia/Tokyo"})");
+  setenv("TZ", "UTC-1", 1);
+  open();
+  EXPECT_STREQ(getenv("TZ"), "UTC-1");
+  EXPECT_EQ(vesprun_add_to_scalar(device, "k", 1), 0);
+  EXPECT_TRUE(hasSucceeded(startProcess([this] {
+    EXPECT_EQ(vesprun_add_to_scalar(device, "k", 1), -1);
+    EXPECT_EQ(vesprun_checkpoint(device), -1);
+    EXPECT_EQ(vesprun_call(device, "lab", nullptr), nullptr);
+    EXPECT_EQ(vesprun_last_error_code(), VESPRUN_ERROR_FORKED);
+    close();
+    open();
+    EXPECT_EQ(vesprun_add_to_scalar(device, "k", 10), 0);
+    close();
+  })));
+  close();
+  EXPECT_EQ(dump(), "scalar\t19787\tk\t11\n");
+  unsetenv("TZ");
 }
 
 TEST_F(VesprunLibraryTest, FailsWithoutMemoryAndChangesNothing) {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <map>
 #include <memory>
 #include <optional>
 #include <string>
@@ -69,9 +70,9 @@ class SqliteStore : public FleetStore {
 
   std::string _path;
   std::unique_ptr<SqliteConnection> _database;
-  std::unique_ptr<Statements> _statements;                 ///< of a store that is loaded
-  bool _inBatch = false;                                   ///< and so in a transaction
-  std::unordered_map<std::string, std::int64_t> _numbers;  ///< of names met in this batch
+  std::unique_ptr<Statements> _statements;       ///< of a store that is loaded
+  bool _inBatch = false;                         ///< and so in a transaction
+  std::map<std::string, std::int64_t> _numbers;  ///< of names met in this batch
   std::unordered_map<std::int64_t, Tail> _tails;
   std::size_t _batchSize = 0;  ///< bytes of text
 };

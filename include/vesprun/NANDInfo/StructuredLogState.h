@@ -1,21 +1,19 @@
 #pragma once
 
-#include <cstdint>
-
 #include "../Export.h"
 
 namespace vesprun {
 
-// Inputs and results of the daily structured storage log, 0 in a new process. Others may set only
-// `gForceCollectionSet`.
+// Input and results of the daily structured storage log, false or 0 in a new process.
 
-/// Not 0: always collect the validity list.
-VESPRUN_EXPORT extern std::uint8_t gForceCollectionSet;
-/// Not 0: the validity list is wanted now.
-VESPRUN_EXPORT extern std::uint8_t gNeedValidityList;
-/// Write amplification of the user partition, in single precision.
-VESPRUN_EXPORT extern double gCurrentUserWamp;
+/// True: always collect the validity list.
+VESPRUN_EXPORT void SetForceCollection(bool force) noexcept;
+
+/// Whether the last structured log wanted the validity list.
+VESPRUN_EXPORT bool NeedsValidityList() noexcept;
+/// Write amplification of the user partition at the last structured log, in single precision.
+VESPRUN_EXPORT double CurrentUserWriteAmplification() noexcept;
 /// Of the intermediate partition.
-VESPRUN_EXPORT extern double gCurrentSysWamp;
+VESPRUN_EXPORT double CurrentSystemWriteAmplification() noexcept;
 
 }  // namespace vesprun

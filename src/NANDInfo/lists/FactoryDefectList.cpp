@@ -74,7 +74,7 @@ void logDefect(const DefectRecord& defect, bool modeAdjustsReason) {
       {"Reason", signedNumber(modeAdjustsReason ? defect.adjustedReason() : defect.reason)},
       {"Page", signedNumber(defect.page)},
   };
-  setNumberValueForType(record, "Temperature", &defect.temperature, PVNumberType::Int8);
+  setNumberValueForType(record, "Temperature", defect.temperature);
   platform().logsmith().FLLogStructuredData(kListRecordType, record);
 }
 

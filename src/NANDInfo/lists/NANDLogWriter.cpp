@@ -9,7 +9,7 @@
 #include <utility>
 
 #include "NANDInfo/CopyNANDInfo.h"
-#include "NANDInfo/StructuredLogState.h"
+#include "NANDInfo/lists/StructuredLogState.h"
 #include "common/Calendar.h"
 #include "common/LittleEndian.h"
 #include "common/TextForm.h"
@@ -56,8 +56,9 @@ class ValidityList {
     for (std::size_t at = 0; at < _entries.size(); at += kEntrySize) {
       const auto list = loadLittleEndian<std::uint32_t>(_entries.data() + at + kWordSize);
       if (list < kListCount) {
-        appendNumberValueForType(lists[list], _entries.data() + at + 2 * kWordSize,
-                                 PVNumberType::Int);
+        appendNumberValueForType(lists[list],
+                                 static_cast<std::int32_t>(loadLittleEndian<std::uint32_t>(
+                                     _entries.data() + at + 2 * kWordSize)));
       }
     }
     return lists;
@@ -183,8 +184,8 @@ bool WriteValidityListNANDLog(std::span<const std::uint8_t> buffer,
     return false;
   }
   PropertyDict fields;
-  setNumberValueForType(fields, "IntermediateWamp", &gCurrentSysWamp, PVNumberType::Double);
-  setNumberValueForType(fields, "UserWamp", &gCurrentUserWamp, PVNumberType::Double);
+  setNumberValueForType(fields, "IntermediateWamp", gCurrentSysWamp);
+  setNumberValueForType(fields, "UserWamp", gCurrentUserWamp);
   DumpNANDInfo(fields);
   int number = 0;
   for (PropertyArray& values : list->valuesByList()) {

@@ -9,11 +9,11 @@
 #include <span>
 #include <string_view>
 
-#include "NANDInfo/StructuredLogState.h"
 #include "NANDInfo/controller/Controller.h"
 #include "NANDInfo/controller/TunnelCommand.h"
 #include "NANDInfo/lists/FactoryDefectList.h"
 #include "NANDInfo/lists/NANDLogWriter.h"
+#include "NANDInfo/lists/StructuredLogState.h"
 #include "NANDInfo/lists/TelemetryList.h"
 #include "NANDInfo/lists/WriteAmplification.h"
 #include "NANDInfo/sets/StatisticsGathering.h"

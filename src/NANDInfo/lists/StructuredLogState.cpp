@@ -1,4 +1,4 @@
-#include "NANDInfo/StructuredLogState.h"
+#include "NANDInfo/lists/StructuredLogState.h"
 
 #include "common/ProcessState.h"
 
@@ -19,4 +19,10 @@ const ProcessState kStructuredLogState([] {
 });
 
 }  // namespace
+
+void SetForceCollection(bool force) noexcept { gForceCollectionSet = force ? 1 : 0; }
+bool NeedsValidityList() noexcept { return gNeedValidityList != 0; }
+double CurrentUserWriteAmplification() noexcept { return gCurrentUserWamp; }
+double CurrentSystemWriteAmplification() noexcept { return gCurrentSysWamp; }
+
 }  // namespace vesprun

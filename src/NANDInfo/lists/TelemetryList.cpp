@@ -146,13 +146,15 @@ PropertyDict busRecord(const std::uint8_t* busEntry, const NandChannelCounters& 
   PropertyDict record;
   record.reserve(kMaxEntries);
   for (std::size_t i = 0; i < kBusEntryKeys.size(); ++i) {
-    setNumberValueForType(record, kBusEntryKeys[i], busEntry + i * kWordSize, PVNumberType::Int);
+    setNumberValueForType(
+        record, kBusEntryKeys[i],
+        static_cast<std::int32_t>(loadLittleEndian<std::uint32_t>(busEntry + i * kWordSize)));
   }
   for (const CounterField& field : kCounterFields) {
     const auto id = static_cast<CounterFieldId>(&field - kCounterFields);
     for (std::size_t i = 0; i < layout.count(id); ++i) {
       setNumberValueForType(record, std::string(field.name) + '[' + std::to_string(i) + ']',
-                            &counters[field.first + i], PVNumberType::Int);
+                            static_cast<std::int32_t>(counters[field.first + i]));
     }
   }
   return record;

@@ -12,9 +12,11 @@ namespace vesprun {
 namespace {
 
 std::optional<std::array<char, 1024>> GlobalAPIErrorMessage;
-const ProcessState kErrorMessageState([] { GlobalAPIErrorMessage.reset(); });
+const ProcessState kErrorMessageState(ForgetAPIErrorMessage);
 
 }  // namespace
+
+void ForgetAPIErrorMessage() noexcept { GlobalAPIErrorMessage.reset(); }
 
 void SetAPIErrorMessage(const char* format, ...) noexcept {
   if (GlobalAPIErrorMessage) {

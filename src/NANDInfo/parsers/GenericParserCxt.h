@@ -25,8 +25,6 @@ class GenericParserCxt {
     std::uint64_t value;
     std::optional<std::uint32_t> knownHash;  ///< of a known name
 
-    /// In decimal.
-    std::string text() const { return std::to_string(value); }
     std::uint32_t hash() const { return knownHash ? *knownHash : hashOfFieldName(name); }
   };
 

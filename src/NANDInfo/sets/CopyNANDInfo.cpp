@@ -37,7 +37,7 @@ PropertyDict CopyNANDInfo() noexcept {
     nand_exporter_t* exporter = nullptr;
     ORUStatsContext context;
     if (!GatherNANDStats(exporter, context)) {
-      return {{"com.quill.NANDInfo.Error", "1"},
+      return {{std::string(kNANDInfoErrorKey), "1"},
               {std::string(kNANDInfoErrorMessageKey), "Unable to parse buffer"}};
     }
     PropertyDict info = CreateNANDInfoDict(context, false);

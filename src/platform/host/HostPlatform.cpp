@@ -32,8 +32,7 @@ struct HostPlatform::Services {
 
   DeviceDirectory directory;
   DeviceDescription description;
-  ProcessTimeZone timeZone;
-  HostClock clock{description.clock};
+  HostClock clock{description.clock, description.timeZone};
   HostSystemLog logFile{directory, clock, description.logLevel};
   SystemLog& systemLog;
   HostFileSystem fileSystem{directory, description,
@@ -90,7 +89,7 @@ std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, std::s
       readOnlyLog != nullptr ? directory->readOnly() : *std::move(directory),
       std::move(description), readOnlyLog);
   const std::optional<std::string>& zone = services->description.timeZone;
-  if (zone && !services->timeZone.set(*zone)) {
+  if (zone && !isTimeZone(*zone)) {
     error = file + ": timeZone: unknown time zone " + quotedText(*zone);
     return nullptr;
   }

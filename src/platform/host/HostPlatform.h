@@ -17,8 +17,7 @@ class HostTallybook;
 class HostPlatform : public Platform {
  public:
   /// Reads the device's description. Null, with the place in `error`, when the folder or its
-  /// `device.json` cannot be used. A described time zone is set for the whole process, in TZ, until
-  /// the platform is destroyed.
+  /// `device.json` cannot be used.
   ///
   /// With `readOnlyLog`, the system log, which outlives the platform, nothing on the device is
   /// changed, and it need not be writable: changes of preferences hold for this platform alone.

@@ -2,7 +2,7 @@
 
 #include <limits>
 
-#include "NANDInfo/StructuredLogState.h"
+#include "NANDInfo/lists/StructuredLogState.h"
 #include "buffers/DeviceBuffers.h"
 #include "support/ScarceMemory.h"
 #include "support/TestDevice.h"

@@ -1,6 +1,6 @@
 #include "NANDInfo/lists/StructuredLog.h"
 
-#include "NANDInfo/StructuredLogState.h"
+#include "NANDInfo/lists/StructuredLogState.h"
 #include "NANDInfo/controller/NandExporter.h"
 #include "buffers/DeviceBuffers.h"
 #include "common/TextForm.h"

@@ -1,8 +1,5 @@
 #include "outbox/ExportCommand.h"
 
-#include <sha2.h>
-
-#include <array>
 #include <cstdint>
 #include <limits>
 
@@ -12,44 +9,12 @@
 #include "common/Calendar.h"
 #include "common/TextForm.h"
 #include "outbox/SubmittedLogs.h"
+#include "platform/host/device/LiveSystem.h"
+#include "platform/host/device/Pseudonym.h"
 #include "platform/host/documents/XmlText.h"
 
 namespace vesprun {
 namespace {
-
-using Digest = std::array<std::uint8_t, SHA256_DIGEST_LENGTH>;
-
-Digest sha256(std::string_view bytes) {
-  SHA2_CTX context;
-  SHA256Init(&context);
-  SHA256Update(&context, reinterpret_cast<const std::uint8_t*>(bytes.data()), bytes.size());
-  Digest digest{};
-  SHA256Final(digest.data(), &context);
-  return digest;
-}
-
-std::string text(const Digest& digest) {
-  return {reinterpret_cast<const char*>(digest.data()), digest.size()};
-}
-
-/// HMAC-SHA-256 (RFC 2104).
-Digest authenticationCode(std::string_view key, std::string_view message) {
-  std::string block = key.size() > SHA256_BLOCK_LENGTH ? text(sha256(key)) : std::string(key);
-  block.resize(SHA256_BLOCK_LENGTH, '\0');
-  std::string inner = block;
-  for (std::size_t i = 0; i < block.size(); ++i) {
-    inner[i] = static_cast<char>(inner[i] ^ 0x36);
-    block[i] = static_cast<char>(block[i] ^ 0x5C);
-  }
-  return sha256(block + text(sha256(inner.append(message))));
-}
-
-/// A constant name for the device that does not reveal its identifier.
-std::string pseudonymOf(const std::string& systemIdentifier) {
-  constexpr std::size_t kBytes = 16;
-  const Digest code = authenticationCode(systemIdentifier, "vesprun exported device");
-  return hexadecimalText(std::span(code).first(kBytes));
-}
 
 struct Export {
   std::string device;
@@ -68,7 +33,8 @@ void run(const Export& wanted) {
   const std::string device =
       !wanted.device.empty()
           ? wanted.device
-          : pseudonymOf(platform->deviceInformation().GetSysIDWithDescription(false));
+          : pseudonymOf(platform->description().system.systemID.value_or(live::machineIdentifier()),
+                        "vesprun exported device");
   const auto print = [&](SubmittedLog&& log) {
     if (log.day < from || log.day > to) {
       return;

@@ -22,6 +22,13 @@ constexpr std::array kCompanions{"-journal", "-wal", "-shm"};
 
 constexpr int kMostAttempts = 3;
 
+CounterTrouble troubleOf(const SqliteFailure& failure) {
+  return failure.isBusy()                         ? CounterTrouble::Busy
+         : (failure.code & 0xFF) == SQLITE_FULL   ? CounterTrouble::Full
+         : failure.code == kWrittenByNewerProgram ? CounterTrouble::NewerFile
+                                                  : CounterTrouble::Other;
+}
+
 bool exists(const std::string& path) {
   struct stat status {};
   return lstat(path.c_str(), &status) == 0;
@@ -30,8 +37,10 @@ bool exists(const std::string& path) {
 }  // namespace
 
 bool CounterFile::write(const std::function<bool(CounterStore&)>& work, std::string& error,
-                        std::optional<Damage>& damage) {
-  return use(CounterStore::Access::Writing, work, error, damage);
+                        std::optional<Damage>& damage, CounterTrouble* trouble) {
+  CounterTrouble ignored = CounterTrouble::Other;
+  return use(CounterStore::Access::Writing, work, error, damage,
+             trouble != nullptr ? *trouble : ignored);
 }
 
 bool CounterFile::read(const std::function<void(CounterStore&)>& work, std::string& error,
@@ -42,11 +51,12 @@ bool CounterFile::read(const std::function<void(CounterStore&)>& work, std::stri
   };
   const auto access =
       _directory.isReadOnly() ? CounterStore::Access::Looking : CounterStore::Access::Reading;
-  return use(access, reading, error, damage);
+  CounterTrouble ignored = CounterTrouble::Other;
+  return use(access, reading, error, damage, ignored);
 }
 
 bool CounterFile::use(CounterStore::Access access, const std::function<bool(CounterStore&)>& work,
-                      std::string& error, std::optional<Damage>& damage) {
+                      std::string& error, std::optional<Damage>& damage, CounterTrouble& trouble) {
   const bool writes = access == CounterStore::Access::Writing;
   const std::string folder = _directory.hostPath(kFolder);
   if (writes && _directory.isReadOnly()) {
@@ -62,12 +72,14 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
       if (!writes) {
         return true;
       }
-      if (!make(error)) {
+      if (!make(error, trouble)) {
         return false;
       }
     }
-    shared = lockFolder(folder, error, LOCK_SH, _longestWait);
+    bool isBusy = false;
+    shared = lockFolder(folder, error, LOCK_SH, _longestWait, &isBusy);
     if (!shared) {
+      trouble = isBusy ? CounterTrouble::Busy : CounterTrouble::Other;
       return false;
     }
     if (stat(path.c_str(), &status) != 0) {
@@ -112,6 +124,7 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
     return attempt();
   } catch (const SqliteFailure& failure) {
     error = failure.text;
+    trouble = troubleOf(failure);
     if (failure.isCorruption() && !_directory.isReadOnly()) {
       damage = Damage{status.st_dev, status.st_ino, failure.text};
     }
@@ -119,13 +132,21 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
   }
 }
 
-bool CounterFile::make(std::string& error) {
+bool CounterFile::make(std::string& error, CounterTrouble& trouble) {
   const std::optional<std::string> folder = _directory.makeFolder(kFolder, error);
   if (!folder) {
     return false;
   }
-  const auto exclusive = lockFolder(*folder, error, LOCK_EX, _longestWait);
-  return exclusive && makeLocked(error);
+  bool isBusy = false;
+  const auto exclusive = lockFolder(*folder, error, LOCK_EX, _longestWait, &isBusy);
+  errno = 0;
+  if (exclusive && makeLocked(error)) {
+    return true;
+  }
+  trouble = isBusy                               ? CounterTrouble::Busy
+            : errno == ENOSPC || errno == EDQUOT ? CounterTrouble::Full
+                                                 : CounterTrouble::Other;
+  return false;
 }
 
 // The file gets its name complete, so an empty one is never ours.

@@ -13,6 +13,9 @@
 
 namespace vesprun {
 
+/// What keeps the counters from being written, as far as a program can do something about it.
+enum class CounterTrouble { Other, Busy, Full, NewerFile };
+
 /// The file of the counter database, and how processes share, create and replace it: a shared lock
 /// on its folder while it is open, the exclusive one to give its name to another file. Nothing is
 /// open between operations. Safe from any thread.
@@ -32,9 +35,10 @@ class CounterFile {
 
   /// Runs `work` on the tables in one transaction, and once more if it found damage; creates a
   /// missing file. True when the transaction was committed. False, with nothing changed, when
-  /// `work` failed, with its or our text in `error`, and in `damage` if the file was damaged twice.
+  /// `work` failed, with its or our text in `error`, and in `damage` if the file was damaged twice;
+  /// `trouble`, if given, tells what it was.
   bool write(const std::function<bool(CounterStore&)>& work, std::string& error,
-             std::optional<Damage>& damage);
+             std::optional<Damage>& damage, CounterTrouble* trouble = nullptr);
 
   /// Runs `work` on the tables as of one moment; not at all, and true, without a file. False as
   /// above. On a read-only device no file is touched: a commit that was cut off or lies in a
@@ -49,8 +53,8 @@ class CounterFile {
 
  private:
   bool use(CounterStore::Access access, const std::function<bool(CounterStore&)>& work,
-           std::string& error, std::optional<Damage>& damage);
-  bool make(std::string& error);
+           std::string& error, std::optional<Damage>& damage, CounterTrouble& trouble);
+  bool make(std::string& error, CounterTrouble& trouble);
   bool makeLocked(std::string& error);
   std::string unusedNameAside() const;
 

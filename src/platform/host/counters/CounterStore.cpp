@@ -50,7 +50,7 @@ constexpr const char* kMarkTable =
     "CREATE TABLE IF NOT EXISTS mark (place TEXT PRIMARY KEY, device INTEGER NOT "
     "NULL, value INTEGER NOT NULL, text TEXT NOT NULL) STRICT, WITHOUT ROWID";
 
-bool isOurs(const std::string& schema) {
+bool hasOurTables(const std::string& schema) {
   static const std::string withoutMarks = schemaOf(kSchema);
   static const std::string withMarks = schemaOf(std::string(kSchema) + kMarkTable);
   return schema == withoutMarks || schema == withMarks;
@@ -121,8 +121,12 @@ CounterStore::CounterStore(std::string path, std::chrono::milliseconds longestWa
 void CounterStore::open() {
   ++_opening;
   _connection = SqliteConnection(_path, _longestWait, _access == Access::Looking);
-  if (_connection.queryInteger("PRAGMA application_id") != kApplicationIdentifier ||
-      _connection.queryInteger("PRAGMA user_version") != kSchemaVersion) {
+  const std::int64_t version = _connection.queryInteger("PRAGMA user_version");
+  const bool isOurs = _connection.queryInteger("PRAGMA application_id") == kApplicationIdentifier;
+  if (isOurs && version > kSchemaVersion) {
+    throw SqliteFailure{kWrittenByNewerProgram, _path + ": written by a newer version of vesprun"};
+  }
+  if (!isOurs || version != kSchemaVersion) {
     _connection.failAsCorrupt("not a counter database of this version");
   }
   // SQLite takes an unknown format version for a database of the future and never writes to it.
@@ -131,7 +135,7 @@ void CounterStore::open() {
   }
   _connection.execute(_access == Access::Writing ? "BEGIN IMMEDIATE" : "BEGIN");
   // A view or trigger in place of our tables could do anything, or never end.
-  if (!isOurs(_connection.schema())) {
+  if (!hasOurTables(_connection.schema())) {
     _connection.failAsCorrupt("its tables are not those of a counter database");
   }
 }

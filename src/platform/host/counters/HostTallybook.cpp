@@ -134,7 +134,7 @@ bool HostTallybook::addSample(std::string_view key, double value, std::string& e
   return true;
 }
 
-bool HostTallybook::checkpoint(std::string& error) {
+bool HostTallybook::checkpoint(std::string& error, CounterTrouble* trouble) {
   const std::scoped_lock running(_checkpointMutex);
   Changes changes;
   {
@@ -160,7 +160,7 @@ bool HostTallybook::checkpoint(std::string& error) {
     return true;
   };
   try {
-    if (write(apply, error)) {
+    if (write(apply, error, trouble)) {
       return true;
     }
   } catch (...) {
@@ -196,15 +196,16 @@ std::unique_ptr<TBHistory> HostTallybook::initWithDefaultPath() {
   return std::make_unique<History>(*this);
 }
 
-bool HostTallybook::write(const std::function<bool(CounterStore&)>& work, std::string& error) {
+bool HostTallybook::write(const std::function<bool(CounterStore&)>& work, std::string& error,
+                          CounterTrouble* trouble) {
   std::optional<CounterFile::Damage> damage;
-  if (_file.write(work, error, damage)) {
+  if (_file.write(work, error, damage, trouble)) {
     return true;
   }
   if (!damage || !recover(*damage, error)) {
     return false;
   }
-  return _file.write(work, error, damage);
+  return _file.write(work, error, damage, trouble);
 }
 
 bool HostTallybook::read(const std::function<void(CounterStore&)>& work, std::string& error) {

@@ -55,13 +55,14 @@ class HostTallybook : public Tallybook {
   bool setScalar(std::string_view key, std::int64_t value, std::string& error);
   bool addToScalar(std::string_view key, std::int64_t value, std::string& error);
   bool addSample(std::string_view key, double value, std::string& error);
-  bool checkpoint(std::string& error);
+  bool checkpoint(std::string& error, CounterTrouble* trouble = nullptr);
 
   // For tools. Each works at once, all or nothing; false, with a text in `error`, on failure.
 
   /// Runs `work` in one transaction; after damage again on the same file, and at last on a new one.
   /// A false result undoes everything.
-  bool write(const std::function<bool(CounterStore&)>& work, std::string& error);
+  bool write(const std::function<bool(CounterStore&)>& work, std::string& error,
+             CounterTrouble* trouble = nullptr);
 
   /// Runs `work` on the tables as of one moment; not without a database. False also when the
   /// database cannot be read to its end: `work` has seen the rows before the point that `error`

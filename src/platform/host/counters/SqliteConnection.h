@@ -11,6 +11,9 @@
 
 namespace vesprun {
 
+/// Our own code of a failure: not damage, and nothing that this program can write to.
+inline constexpr int kWrittenByNewerProgram = SQLITE_SCHEMA;
+
 /// A failure of the database. Thrown and caught within this folder.
 struct SqliteFailure {
   int code;          ///< SQLite's extended result code

@@ -395,6 +395,11 @@ std::optional<DeviceDescription> readDeviceDescription(const std::string& text,
     error = "longer than 16 MiB";
     return std::nullopt;
   }
+  if (std::ranges::count_if(text, [](char c) { return c == ',' || c == '[' || c == '{'; }) >
+      kMaxDescribedValues) {
+    error = "more than 1,000,000 values";
+    return std::nullopt;
+  }
   const std::optional<PropertyValue> root = plainValueFromJsonText(text, error);
   if (!root) {
     return std::nullopt;

@@ -150,6 +150,9 @@ struct DeviceDescription {
 
 /// In bytes: 16 MiB.
 inline constexpr std::size_t kLongestDeviceDescription = std::size_t{16} << 20;
+/// Values, and marks within texts that look like more of them: each takes far more memory than its
+/// text.
+inline constexpr std::ptrdiff_t kMaxDescribedValues = 1'000'000;
 
 /// Nothing, with the entry or line in `error`, when the text is malformed.
 std::optional<DeviceDescription> readDeviceDescription(const std::string& text, std::string& error);

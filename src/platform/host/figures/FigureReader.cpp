@@ -167,6 +167,10 @@ class FigureReader {
     const std::optional<std::string_view> content = text(path);
     for (const LinuxFigure& figure : _figures) {
       std::optional<std::int64_t> value;
+      if (content && !figure.unlessZero.empty() &&
+          numberOf(fieldOf(*content, figure.unlessZero)) == 0) {
+        continue;
+      }
       if (content) {
         const std::string_view word = fieldOf(*content, figure.field);
         value = numberOf(word);

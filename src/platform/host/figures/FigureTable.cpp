@@ -20,8 +20,10 @@ constexpr std::int32_t kDegrees[] = {0, 20, 30, 40, 50, 60, 70, 80, 90, 100};
 constexpr std::int32_t kTenths[] = {1, 2, 3, 4, 5, 6, 7, 8, 9, 10};
 constexpr std::int32_t kSpareLevels[] = {1, 2};
 
-constexpr LinuxFigure memory(std::string_view field, std::string_view key, std::string_view why) {
-  return {"/proc/meminfo", field, key, "MiB", FigureKind::Gauge, 1024, 0, 1 << 30, why, kMebibytes};
+constexpr LinuxFigure memory(std::string_view field, std::string_view key, std::string_view why,
+                             std::string_view unlessZero = {}) {
+  return {"/proc/meminfo", field, key,        "MiB",     FigureKind::Gauge, 1024, 0,
+          1 << 30,         why,   kMebibytes, unlessZero};
 }
 
 constexpr LinuxFigure temperature(std::string_view file, std::string_view key,
@@ -78,7 +80,8 @@ constexpr LinuxFigure kFigures[] = {
     memory("AnonPages: 1", "linux.memory.anonymousMiB", "what programs hold"),
     memory("Cached: 1", "linux.memory.cachedMiB", "what is kept of files"),
     memory("Dirty: 1", "linux.memory.dirtyMiB", "what a loss of power would cost"),
-    memory("SwapFree: 1", "linux.memory.swapFreeMiB", "does the swap space suffice"),
+    memory("SwapFree: 1", "linux.memory.swapFreeMiB", "does the swap space suffice",
+           "SwapTotal: 1"),
     counter(kVmstat, "pgpgin 1", "linux.memory.pagedInKiB", "KiB", 1, "what is read from disks"),
     counter(kVmstat, "pgpgout 1", "linux.memory.pagedOutKiB", "KiB", 1, "what is written to disks"),
     counter(kVmstat, "pswpin 1", "linux.memory.swappedInPages", "pages", 1, "memory is short"),

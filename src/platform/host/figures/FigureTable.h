@@ -29,6 +29,8 @@ struct LinuxFigure {
   std::int64_t highest;
   std::string_view why;                    ///< what it is good for, in the whitelist's words
   std::span<const std::int32_t> bounds{};  ///< of the histogram of a gauge
+  /// A field of the same file, 0 where the figure means nothing; it is left out then.
+  std::string_view unlessZero{};
 };
 
 /// The devices that stand in a path for a name such as "<disk>".

@@ -4,10 +4,38 @@
 #include <time.h>
 
 #include <cstdlib>
+#include <mutex>
 
 #include "platform/host/files/Files.h"
 
 namespace vesprun {
+namespace {
+
+std::mutex gTimeZoneMutex;
+
+/// Another zone in TZ as long as the object lives.
+class TimeZoneForAWhile {
+ public:
+  explicit TimeZoneForAWhile(const std::string& name) : _guard(gTimeZoneMutex) {
+    if (const char* before = std::getenv("TZ")) {
+      _before = before;
+    }
+    setenv("TZ", name.c_str(), 1);
+    tzset();
+  }
+  ~TimeZoneForAWhile() {
+    _before ? setenv("TZ", _before->c_str(), 1) : unsetenv("TZ");
+    tzset();
+  }
+  TimeZoneForAWhile(const TimeZoneForAWhile&) = delete;
+  TimeZoneForAWhile& operator=(const TimeZoneForAWhile&) = delete;
+
+ private:
+  std::scoped_lock<std::mutex> _guard;
+  std::optional<std::string> _before;
+};
+
+}  // namespace
 
 Date HostClock::now() {
   if (_standingStillAt) {
@@ -19,6 +47,10 @@ Date HostClock::now() {
 }
 
 std::string HostClock::localDateText(const Date& date) {
+  std::optional<TimeZoneForAWhile> zone;
+  if (_timeZone) {
+    zone.emplace(*_timeZone);
+  }
   const time_t seconds = date.seconds;
   tm local{};
   localtime_r(&seconds, &local);
@@ -26,31 +58,14 @@ std::string HostClock::localDateText(const Date& date) {
   return {text, strftime(text, sizeof text, "%Y-%m-%d %H:%M:%S %z", &local)};
 }
 
-ProcessTimeZone::~ProcessTimeZone() {
-  if (_isSet) {
-    _before ? setenv("TZ", _before->c_str(), 1) : unsetenv("TZ");
-    tzset();
-  }
-}
-
-bool ProcessTimeZone::set(const std::string& name) {
+bool isTimeZone(const std::string& name) {
   // The C library silently takes an unknown zone for UTC.
   const bool isPath = name.empty() || name.front() == '/' || name.front() == '.' ||
                       name.find("..") != std::string::npos || name.find('\0') != std::string::npos;
   std::string error;
-  if (isPath ||
-      (name != "UTC" &&
-       !readWholeFile("/usr/share/zoneinfo/" + name, error).value_or("").starts_with("TZif"))) {
-    return false;
-  }
-  if (!_isSet) {
-    const char* before = std::getenv("TZ");
-    _before = before != nullptr ? std::optional<std::string>(before) : std::nullopt;
-    _isSet = true;
-  }
-  setenv("TZ", name.c_str(), 1);
-  tzset();
-  return true;
+  return !isPath &&
+         (name == "UTC" ||
+          readWholeFile("/usr/share/zoneinfo/" + name, error).value_or("").starts_with("TZif"));
 }
 
 }  // namespace vesprun

@@ -2,6 +2,7 @@
 
 #include <optional>
 #include <string>
+#include <utility>
 
 #include "platform/Clock.h"
 
@@ -10,33 +11,21 @@ namespace vesprun {
 /// The machine's clock, or a stopped one.
 class HostClock : public Clock {
  public:
-  explicit HostClock(std::optional<Date> standingStillAt) : _standingStillAt(standingStillAt) {}
+  /// `timeZone`: a name of the time-zone database (`isTimeZone`); nothing: the process's.
+  explicit HostClock(std::optional<Date> standingStillAt,
+                     std::optional<std::string> timeZone = std::nullopt)
+      : _standingStillAt(standingStillAt), _timeZone(std::move(timeZone)) {}
 
   Date now() override;
-  /// In the process's time zone (`ProcessTimeZone`).
+  /// A described zone stands in the process's TZ meanwhile: the C library knows no other way.
   std::string localDateText(const Date& date) override;
 
  private:
   std::optional<Date> _standingStillAt;
+  std::optional<std::string> _timeZone;
 };
 
-/// The process's time zone as long as the object lives: `set` changes TZ, which no other thread may
-/// read meanwhile.
-class ProcessTimeZone {
- public:
-  ProcessTimeZone() = default;
-  ProcessTimeZone(const ProcessTimeZone&) = delete;
-  ProcessTimeZone& operator=(const ProcessTimeZone&) = delete;
-  /// Restores the zone from before `set`.
-  ~ProcessTimeZone();
-
-  /// Sets a zone of the time-zone database; false, and nothing changed, when there is none of that
-  /// name.
-  bool set(const std::string& name);
-
- private:
-  bool _isSet = false;
-  std::optional<std::string> _before;
-};
+/// Whether the time-zone database has a zone of that name.
+bool isTimeZone(const std::string& name);
 
 }  // namespace vesprun

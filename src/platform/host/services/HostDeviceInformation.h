@@ -2,12 +2,14 @@
 
 #include <unistd.h>
 
-#include <algorithm>
+#include <map>
+#include <set>
 
 #include "platform/DeviceInformation.h"
 #include "platform/host/device/DeviceDescription.h"
 #include "platform/host/device/DeviceDirectory.h"
 #include "platform/host/device/LiveSystem.h"
+#include "platform/host/device/Pseudonym.h"
 
 namespace vesprun {
 
@@ -29,7 +31,7 @@ class HostDeviceInformation : public DeviceInformation {
   }
   std::string GetSysIDWithDescription(bool withDescription) override {
     return (withDescription ? "machine " : "") +
-           describedOr(_description.system.systemID, live::machineIdentifier);
+           describedOr(_description.system.systemID, liveSystemIdentifier);
   }
   std::string GetHardwareModel() override {
     return describedOr(_description.system.hardwareModel, live::hardwareModel);
@@ -63,11 +65,13 @@ class HostDeviceInformation : public DeviceInformation {
   /// without a match are skipped.
   LanguageTags bestLocalizations(const LanguageTags& available,
                                  const LanguageTags& preferred) override {
+    const AvailableLanguages known(available);
     LanguageTags best;
+    std::set<std::string_view> taken;
     for (const std::string& wanted : preferred) {
-      const auto found = bestFor(wanted, available);
-      if (found != available.end() && std::ranges::find(best, *found) == best.end()) {
-        best.push_back(*found);
+      const std::optional<std::string_view> found = known.bestFor(wanted);
+      if (found && taken.insert(*found).second) {
+        best.emplace_back(*found);
       }
     }
     return best;
@@ -88,6 +92,12 @@ class HostDeviceInformation : public DeviceInformation {
     return !_description.supportLibrary.missing.contains(symbol);
   }
 
+  /// Stands for the machine's identifier and does not hold it.
+  static std::string liveSystemIdentifier() {
+    const std::string machine = live::machineIdentifier();
+    return machine.empty() ? "" : pseudonymOf(machine, "vesprun system");
+  }
+
  private:
   std::optional<PropertyDict> liveDiskUsage() const {
     const std::optional<FileSystemStatistics> volume = live::volume(_directory.path());
@@ -103,19 +113,38 @@ class HostDeviceInformation : public DeviceInformation {
         {std::string(kDiskUsageAmountDataAvailable), bytes(volume->availableBlocks)}};
   }
 
-  static std::string_view languageOf(std::string_view tag) { return tag.substr(0, tag.find('-')); }
-
-  static LanguageTags::const_iterator bestFor(std::string_view wanted,
-                                              const LanguageTags& available) {
-    for (std::string_view tag = wanted; !tag.empty();) {
-      if (const auto found = std::ranges::find(available, tag); found != available.end()) {
-        return found;
+  /// Ordered: tens of thousands of languages may be described.
+  class AvailableLanguages {
+   public:
+    explicit AvailableLanguages(const LanguageTags& tags) {
+      for (const std::string_view tag : tags) {
+        _tags.insert(tag);
+        _ofLanguage.emplace(languageOf(tag), tag);  // the first one stays
       }
-      const auto end = tag.rfind('-');
-      tag = tag.substr(0, end == std::string_view::npos ? 0 : end);
     }
-    return std::ranges::find(available, languageOf(wanted), languageOf);
-  }
+
+    std::optional<std::string_view> bestFor(std::string_view wanted) const {
+      for (std::string_view tag = wanted.substr(0, kMaxTag); !tag.empty();) {
+        if (const auto found = _tags.find(tag); found != _tags.end()) {
+          return *found;
+        }
+        const auto end = tag.rfind('-');
+        tag = tag.substr(0, end == std::string_view::npos ? 0 : end);
+      }
+      const auto found = _ofLanguage.find(languageOf(wanted));
+      return found != _ofLanguage.end() ? std::optional(found->second) : std::nullopt;
+    }
+
+   private:
+    static constexpr std::size_t kMaxTag = 255;  ///< longer than any language's
+
+    static std::string_view languageOf(std::string_view tag) {
+      return tag.substr(0, tag.find('-'));
+    }
+
+    std::set<std::string_view> _tags;
+    std::map<std::string_view, std::string_view> _ofLanguage;
+  };
 
   const DeviceDescription& _description;
   const DeviceDirectory& _directory;

@@ -54,6 +54,7 @@ TEST(DeviceDescription, NamesTheEntryThatIsWrong) {
   EXPECT_THAT(errorOf("{\n\"clock\": }"),
               testing::StartsWith("parse error at line 2, column 10: "));
   EXPECT_NE(errorOf(std::string(100'000, '[')), "accepted");
+  EXPECT_EQ(errorOf(std::string(1'000'001, ',')), "more than 1,000,000 values");
 }
 
 }  // namespace

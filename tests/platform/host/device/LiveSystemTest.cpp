@@ -7,6 +7,8 @@
 #include <cstdlib>
 
 #include "common/LittleEndian.h"
+#include "platform/host/device/Pseudonym.h"
+#include "support/TestDevice.h"
 
 namespace vesprun {
 namespace {
@@ -27,6 +29,21 @@ TEST(LiveSystem, TheSwapRecordIsTotalFreeUsedAndPageSize) {
   EXPECT_NEAR(static_cast<double>(field(8)), static_cast<double>(system.freeswap) * system.mem_unit,
               64e6);                                                        // it may move
   EXPECT_EQ(field(24), static_cast<std::uint64_t>(sysconf(_SC_PAGESIZE)));  // and a flag of 0
+}
+
+TEST(LiveSystem, ADigestStandsForTheMachine) {
+  const auto identifierOf = [](const std::string& entries) {
+    return TestDevice('{' + entries + '}')
+        .platform()
+        .deviceInformation()
+        .GetSysIDWithDescription(false);
+  };
+  EXPECT_EQ(identifierOf(R"("system": {"systemID": "own"})"), "own");
+  // Known bytes: HMAC-SHA-256 of RFC 4231, second case, begins so.
+  EXPECT_EQ(pseudonymOf("Jefe", "what do ya want for nothing?"),
+            "5bdcc146bf60754e6a042426089575c7");
+  const std::string machine = live::machineIdentifier();
+  EXPECT_EQ(identifierOf(""), machine.empty() ? "" : pseudonymOf(machine, "vesprun system"));
 }
 
 TEST(LiveSystem, PrefersTheLanguagesOfTheProcess) {

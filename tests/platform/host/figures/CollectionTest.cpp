@@ -84,9 +84,12 @@ TEST_F(CollectionTest, MachinesOfAllKindsAreCounted) {
     const char* name;
     const char* files;  ///< path, content at first and content then, where a semicolon ends a line
     const char* counted;  ///< key without "linux." and value, in any order
-  } machines[] = {
-      {"a virtual machine without devices", "sys/block/loop0/stat | 1 0 2 0 | 5 0 9 0", ""},
-      {"a laptop with NVMe storage", R"(
+  } machines[] = {{"a virtual machine without devices and swap space", R"(
+sys/block/loop0/stat | 1 0 2 0 | 5 0 9 0
+proc/meminfo | SwapTotal: 0 kB;SwapFree: 0 kB; | SwapTotal: 0 kB;SwapFree: 0 kB;
+)",
+                   ""},
+                  {"a laptop with NVMe storage", R"(
 proc/stat                  | cpu  1099 50 300 9000 77 20 5 0 0 0; cpu0 9 9; intr 9 8; ctxt 5000; processes 100 | cpu  1250 50 399 12000 60 20 205 40 0 0; cpu0 1 1; intr 10 8; ctxt 5999; processes 107;
 proc/uptime                | 100.99 190.10; | 133.25 250.00;
 proc/meminfo               | MemTotal: 16 kB;MemAvailable: 9 kB | MemTotal: 16 kB;MemAvailable:    4194304 kB;AnonPages: 2047 kB;Cached: 1 kB;Dirty: 1024 kB;SwapFree: 3000 kB;
@@ -110,7 +113,7 @@ sys/devices/system/cpu/cpufreq/policy0/scaling_cur_freq  | 1 | 800000
 sys/devices/system/cpu/cpufreq/policy12/scaling_cur_freq | 1 | 2400999
 sys/class/nvme/nvme0/device/aer_dev_correctable | RxErr 0;TOTAL_ERR_COR 2; | RxErr 3;TOTAL_ERR_COR 5;
 )",
-       R"(
+                   R"(
 cpu.userSeconds 2  cpu.niceSeconds 0  cpu.systemSeconds 0  cpu.idleSeconds 30
 cpu.interruptSeconds 0  cpu.softInterruptSeconds 2  cpu.stolenSeconds 0  cpu.contextSwitches 999
 cpu.forks 7  cpu.frequencyMHz ~2400  time.upSeconds 33  time.suspends 1  memory.availableMiB ~4096
@@ -121,7 +124,7 @@ disk.writeMilliseconds.nvme0n1 0  disk.busyMilliseconds.nvme0n1 1  network.recei
 network.sentKiB.enx 3  temperature.sensorCelsius.nvme ~45
 temperature.zoneCelsius.INT3400_Thermal ~-5  temperature.zoneCelsius.thermal_zone1 ~20
 nvme.correctedErrors 3)"},
-      {"a phone with UFS and eMMC", R"(
+                  {"a phone with UFS and eMMC", R"(
 sys/bus/platform/devices/1d84000.ufshc/health_descriptor/eol_info               | 0x01 | 0x02;
 sys/bus/platform/devices/1d84000.ufshc/health_descriptor/life_time_estimation_a | 0x01 | 0x0B;
 sys/bus/platform/devices/1d84000.ufshc/health_descriptor/life_time_estimation_b | 0x01 | 0x00;
@@ -130,16 +133,16 @@ sys/block/mmcblk1/device/pre_eol_info   | 0x01      | 0x03;
 sys/class/net/wwan0/carrier_down_count  | 1         | 3
 proc/vmstat | pgmajfault 10;nr_free 1;oom_kill 1; | pgmajfault 1000;nr_free 1;oom_kill 3;
 )",
-       R"(
+                   R"(
 ufs.endOfLifeLevel ~2  ufs.usedLifeATenths ~11  emmc.usedLifeATenths ~2  emmc.usedLifeBTenths ~10
 emmc.endOfLifeLevel ~3  network.linkLosses.wwan0 2  memory.majorFaults 990  memory.oomKills 2)"},
-      {"a server with EDAC", R"(
+                  {"a server with EDAC", R"(
 sys/devices/system/edac/mc/mc0/ce_count     | 5  | 9
 sys/devices/system/edac/mc/mc1/ce_count     | 0  | 1
 sys/devices/system/edac/mc/mc0/ue_count     | 0  | 0
 sys/class/watchdog/watchdog0/bootstatus     | 32 | 32
 )",
-       R"(
+                   R"(
 memory.correctedErrors 5  memory.uncorrectedErrors 0  time.watchdogResets 0)"}};
   for (const auto& [name, files, expected] : machines) {
     SCOPED_TRACE(name);
