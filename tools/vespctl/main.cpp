@@ -13,13 +13,13 @@
 #include "outbox/ExportCommand.h"
 #include "outbox/PtreeCommand.h"
 #include "outbox/ShowCommand.h"
-#include "outlook/OutlookCommands.h"
-#include "outlook/WhitelistCommands.h"
 #include "page/PageCommand.h"
 #include "platform/host/files/StandardStreams.h"
+#include "preview/PreviewCommands.h"
 #include "storage/DecodeCommand.h"
 #include "storage/FieldsCommand.h"
 #include "storage/NandCommands.h"
+#include "whitelist/WhitelistCommands.h"
 
 namespace vesprun {
 namespace {

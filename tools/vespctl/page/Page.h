@@ -4,8 +4,8 @@
 #include <vector>
 
 #include "common/Date.h"
-#include "outlook/KeptBack.h"
 #include "page/PageData.h"
+#include "preview/KeptBack.h"
 
 namespace vesprun {
 

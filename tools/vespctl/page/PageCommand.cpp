@@ -6,7 +6,7 @@
 #include <system_error>
 
 #include "Command.h"
-#include "outlook/ReadOnlyDevice.h"
+#include "ReadOnlyDevice.h"
 #include "page/Page.h"
 #include "platform/host/files/AtomicFile.h"
 

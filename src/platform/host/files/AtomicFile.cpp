@@ -82,6 +82,18 @@ bool AtomicFile::openUnfinished(std::string& error) {
   return false;
 }
 
+void AtomicFile::takeAccessOf(const struct stat& folder) {
+  constexpr mode_t kReadAndWrite = 0666;
+  constexpr mode_t kWithoutGroup = 0606;
+  struct stat own {};
+  const bool isGiven = fchown(_file.get(), folder.st_uid, folder.st_gid) == 0 ||
+                       (fstat(_file.get(), &own) == 0 && own.st_gid == folder.st_gid);
+  if (fchmod(_file.get(), folder.st_mode & (isGiven ? kReadAndWrite : kWithoutGroup)) != 0 &&
+      _failure.empty()) {
+    _failure = std::strerror(errno);
+  }
+}
+
 bool AtomicFile::append(std::string_view bytes) {
   if (!_failure.empty()) {
     return false;

@@ -1,5 +1,7 @@
 #pragma once
 
+#include <sys/stat.h>
+
 #include <optional>
 #include <string>
 #include <string_view>
@@ -25,6 +27,10 @@ class AtomicFile {
 
   /// False when the bytes cannot be written; `replace` and `addNew` then fail with the same reason.
   bool append(std::string_view bytes);
+
+  /// Owner, group and mode become those of a folder, without the rights to execute. Where the group
+  /// cannot be given away, it has no rights.
+  void takeAccessOf(const struct stat& folder);
 
   /// Instead of the moment of the last byte, where the file system can keep it.
   void setModificationTime(const Date& time) { _modified = time; }

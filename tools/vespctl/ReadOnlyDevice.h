@@ -1,7 +1,9 @@
 #pragma once
 
+#include <cstdint>
+#include <functional>
 #include <memory>
-#include <string>
+#include <string_view>
 
 #include "Command.h"
 #include "Complaints.h"
@@ -23,5 +25,13 @@ struct ReadOnlyDevice {
 };
 
 inline constexpr const char* kUnreadableCounters = "counters cannot be read";
+
+using RowHandler = std::function<void(bool isDistribution, std::string_view key)>;
+
+/// Calls `take` with the key of each row of the days `first` to `last`, both included, that begins
+/// with `keyPrefix`: scalars before distributions, each by day and then key. False when the
+/// counters cannot be read to their end; the system log has the reason.
+bool forEachRow(std::int32_t first, std::int32_t last, const RowHandler& take,
+                std::string_view keyPrefix = {});
 
 }  // namespace vesprun

@@ -1,28 +1,13 @@
-#include "outlook/KeptBack.h"
+#include "preview/KeptBack.h"
 
 #include <memory>
 #include <set>
 #include <utility>
 
+#include "ReadOnlyDevice.h"
 #include "config/TBConfig.h"
-#include "platform/Platform.h"
 
 namespace vesprun {
-
-bool forEachRow(std::int32_t first, std::int32_t last,
-                const std::function<void(bool isDistribution, std::string_view key)>& take) {
-  const std::unique_ptr<TBHistory> history = platform().tallybook().initWithDefaultPath();
-  return history->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
-             "", first, last,
-             [&take](std::string_view key, std::int32_t, std::int64_t, bool&) {
-               take(false, key);
-             }) &&
-         history->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
-             "", first, last,
-             [&take](std::string_view key, std::int32_t, TBHistoryDistributionEnumerator&, bool&) {
-               take(true, key);
-             });
-}
 
 std::optional<std::vector<KeptBack>> keysKeptBack(std::int32_t first, std::int32_t last) {
   const std::unique_ptr<TBConfig> config = TBConfig::init();

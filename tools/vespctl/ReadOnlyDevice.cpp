@@ -1,0 +1,22 @@
+#include "ReadOnlyDevice.h"
+
+#include "platform/Platform.h"
+
+namespace vesprun {
+
+bool forEachRow(std::int32_t first, std::int32_t last, const RowHandler& take,
+                std::string_view keyPrefix) {
+  const std::unique_ptr<TBHistory> history = platform().tallybook().initWithDefaultPath();
+  return history->scalarsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+             keyPrefix, first, last,
+             [&take](std::string_view key, std::int32_t, std::int64_t, bool&) {
+               take(false, key);
+             }) &&
+         history->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
+             keyPrefix, first, last,
+             [&take](std::string_view key, std::int32_t, TBHistoryDistributionEnumerator&, bool&) {
+               take(true, key);
+             });
+}
+
+}  // namespace vesprun
