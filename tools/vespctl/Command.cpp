@@ -10,6 +10,7 @@
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/Files.h"
+#include "platform/host/files/JsonLines.h"
 
 namespace vesprun {
 
@@ -52,10 +53,10 @@ std::string readInput(const std::string& file) {
   return content;
 }
 
-std::string contentIfThere(const std::string& file) {
+std::string contentIfThere(const HostPath& file) {
   return *orFail([&](std::string& error) {
     bool missing = false;
-    std::optional<std::string> content = readWholeFile(file, error, &missing);
+    std::optional<std::string> content = readWholeFile(file, error, &missing, kMaxLinesFile);
     return missing ? std::optional<std::string>("") : std::move(content);
   });
 }

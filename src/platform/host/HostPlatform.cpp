@@ -1,5 +1,6 @@
 #include "platform/host/HostPlatform.h"
 
+#include <cstdint>
 #include <optional>
 #include <utility>
 
@@ -21,6 +22,12 @@
 #include "platform/host/services/HostTapline.h"
 
 namespace vesprun {
+namespace {
+
+// Its values take many times as much memory.
+constexpr std::uint64_t kMaxDescription = 4 * 1024 * 1024;
+
+}  // namespace
 
 // Destroyed from the last to the first: a service that writes at its end follows those that it
 // needs.
@@ -74,12 +81,13 @@ std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, std::s
     return nullptr;
   }
   DeviceDescription description;
-  const std::string file = directory->hostPath("device.json");
+  const HostPath file = directory->hostPath("device.json");
   bool missing = false;
-  if (const std::optional<std::string> text = readWholeFile(file, error, &missing)) {
+  if (const std::optional<std::string> text =
+          readWholeFile(file, error, &missing, kMaxDescription)) {
     std::optional<DeviceDescription> read = readDeviceDescription(*text, error);
     if (!read) {
-      error = file + ": " + error;
+      error = file.string() + ": " + error;
       return nullptr;
     }
     description = *std::move(read);
@@ -91,7 +99,7 @@ std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, std::s
       std::move(description), readOnlyLog);
   const std::optional<std::string>& zone = services->description.timeZone;
   if (zone && !services->timeZone.set(*zone)) {
-    error = file + ": timeZone: unknown time zone " + quotedText(*zone);
+    error = file.string() + ": timeZone: unknown time zone " + quotedText(*zone);
     return nullptr;
   }
   return std::unique_ptr<HostPlatform>(new HostPlatform(std::move(services)));

@@ -57,7 +57,7 @@ std::string starterWhitelist() {
 void writeWhitelist(const DeviceDirectory& directory, std::string_view document) {
   orFail([&](std::string& error) {
     const auto folder = directory.makeFolder(kWhitelistFolder, error);
-    return folder && replaceFile(*folder + '/' + kWhitelistFile, document, error);
+    return folder && replaceFile(folder->below(kWhitelistFile), document, error);
   });
 }
 

@@ -57,9 +57,9 @@ struct LogPruning::Log {
 
 /// By number.
 std::vector<LogPruning::Log> LogPruning::readFolder() {
-  const std::string folder = _directory.hostPath("outbox/logs");
+  const HostPath folder = _directory.hostPath("outbox/logs");
   std::string error;
-  if (std::filesystem::is_directory(folder) && !_lock) {
+  if (folder.status() && !_lock) {
     _lock = lockFolder(folder, error);
   }
   const std::optional<std::vector<std::string>> names =
@@ -72,11 +72,11 @@ std::vector<LogPruning::Log> LogPruning::readFolder() {
   for (const std::string& name : *names) {
     const std::optional<std::uint64_t> number = logNumber(name);
     const std::optional<std::string> base = baseOf(name);
-    struct stat status {};
-    if (!number || !base || lstat((folder + '/' + name).c_str(), &status) != 0 ||
-        !S_ISREG(status.st_mode)) {
+    const std::optional<struct stat> found = folder.below(name).status();
+    if (!number || !base || !found || !S_ISREG(found->st_mode)) {
       continue;
     }
+    const struct stat& status = *found;
     Log& log = logs[{*number, *base}];
     const bool isHeader = name.ends_with(kHeaderEnd);
     const Date written{status.st_mtim.tv_sec, static_cast<std::uint32_t>(status.st_mtim.tv_nsec)};
@@ -104,7 +104,7 @@ void LogPruning::removeUntilBelow(std::uint64_t bytes) {
   std::size_t before = 0;
   do {  // again, since the notes of what was removed take room too
     before = _removed.size();
-    std::uint64_t left = bytesOfFiles(_directory.hostPath("outbox"));
+    std::uint64_t left = bytesOfFiles(_directory.hostPath("outbox").string());
     std::vector<Log> logs = readFolder();
     auto end = logs.begin();
     for (; end != logs.end() && left >= bytes; ++end) {
@@ -189,8 +189,8 @@ std::vector<const LogPruning::Log*> LogPruning::noteDailyLogs(const std::vector<
 
 void LogPruning::unlinkFiles(const Log& log) {
   for (const std::string& name : log.files) {
-    const std::string path = _directory.hostPath("outbox/logs/" + name);
-    if (unlink(path.c_str()) == 0) {
+    const HostPath path = _directory.hostPath("outbox/logs/" + name);
+    if (removeFile(path)) {
       if (name == log.files.front() || !name.ends_with(kHeaderEnd)) {
         _removed.push_back(name);
       }

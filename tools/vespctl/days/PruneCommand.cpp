@@ -29,7 +29,7 @@ struct Pruning {
 
 /// Removes the lines of a file in the outbox that were written before `time`, and returns their
 /// number. A line without a time stays.
-std::uint64_t removeLines(const std::string& path, const Date& time,
+std::uint64_t removeLines(const HostPath& path, const Date& time,
                           std::vector<std::string>& problems) {
   static constexpr std::string_view kBegin = "{\"time\":\"";
   std::string error;
@@ -93,7 +93,7 @@ void prune(const Pruning& wanted) {
     logs.removeBefore(time);
     for (const char* const file :
          {"records.jsonl", "events.jsonl", "notifications.jsonl", "log.jsonl"}) {
-      const std::string path = device->directory().hostPath(std::string("outbox/") + file);
+      const HostPath path = device->directory().hostPath(std::string("outbox/") + file);
       if (const std::uint64_t removed = removeLines(path, time, problems); removed != 0) {
         lines.set(file, removed);
       }

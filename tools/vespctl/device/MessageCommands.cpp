@@ -196,7 +196,7 @@ class NewNotifications {
     return isThere;
   }
 
-  std::string _file;
+  HostPath _file;
   std::size_t _seen;
 };
 

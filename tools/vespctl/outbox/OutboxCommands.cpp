@@ -23,7 +23,7 @@ std::string entryText(const PropertyDict& line, const char* key) {
 
 /// Shows each line of the file; says which ones cannot be read.
 template <typename Show>
-void showLines(const std::string& file, Show show) {
+void showLines(const HostPath& file, Show show) {
   int number = 0;
   forEachLine(contentIfThere(file), [&](const PropertyDict* line) {
     ++number;
@@ -106,11 +106,12 @@ void showText(const std::string& content, bool inFull) {
   }
 }
 
-void showLog(const std::filesystem::path& file, bool inFull) {
-  std::cout << printableText(file.filename().string()) << '\n';
-  const auto content = orFail([&](std::string& error) { return readWholeFile(file, error); });
-  const std::filesystem::path header =
-      std::filesystem::path(file).replace_extension(".header.json");
+void showLog(const HostPath& path, bool inFull) {
+  const std::filesystem::path file = path.name();
+  std::cout << printableText(path.name()) << '\n';
+  const auto content = orFail([&](std::string& error) { return readWholeFile(path, error); });
+  const HostPath header =
+      path.folder().below(std::filesystem::path(file).replace_extension(".header.json").string());
   std::string error;
   if (const std::optional<std::string> text = readWholeFile(header, error)) {
     const std::optional<PropertyValue> value = valueFromJsonText(*text, error);
@@ -130,9 +131,8 @@ void showLog(const std::filesystem::path& file, bool inFull) {
 
 void showLogs(const DeviceDirectory& directory, bool inFull) {
   for (const std::string& name : namesOfLogs(directory)) {
-    const std::filesystem::path file = directory.hostPath("outbox/logs/" + name);
-    if (name.front() != '.' && (file.extension() == ".ptree" || file.extension() == ".log")) {
-      showLog(file, inFull);
+    if (name.front() != '.' && (name.ends_with(".ptree") || name.ends_with(".log"))) {
+      showLog(directory.hostPath("outbox/logs/" + name), inFull);
     }
   }
 }

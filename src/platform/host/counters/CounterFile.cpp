@@ -22,10 +22,7 @@ constexpr std::array kCompanions{"-journal", "-wal", "-shm"};
 
 constexpr int kMostAttempts = 3;
 
-bool exists(const std::string& path) {
-  struct stat status {};
-  return lstat(path.c_str(), &status) == 0;
-}
+bool exists(const HostPath& path) { return path.status() || errno != ENOENT; }
 
 }  // namespace
 
@@ -48,17 +45,17 @@ bool CounterFile::read(const std::function<void(CounterStore&)>& work, std::stri
 bool CounterFile::use(CounterStore::Access access, const std::function<bool(CounterStore&)>& work,
                       std::string& error, std::optional<Damage>& damage) {
   const bool writes = access == CounterStore::Access::Writing;
-  const std::string folder = _directory.hostPath(kFolder);
+  const HostPath folder = _directory.hostPath(kFolder);
   if (writes && _directory.isReadOnly()) {
     _directory.makeFolder(kFolder, error);  // which says why not
     return false;
   }
-  const std::string path = folder + '/' + kName;
-  struct stat status {};
+  const HostPath path = folder.below(kName);
+  std::optional<struct stat> status;
   std::optional<FileDescriptor> shared;
   // Between making and locking, another process may move the new file away.
   for (int attempt = 1; !shared; ++attempt) {
-    if (stat(path.c_str(), &status) != 0 && errno == ENOENT) {
+    if (!(status = path.status()) && errno == ENOENT) {
       if (!writes) {
         return true;
       }
@@ -70,7 +67,7 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
     if (!shared) {
       return false;
     }
-    if (stat(path.c_str(), &status) != 0) {
+    if (!(status = path.status())) {
       if (errno != ENOENT || attempt == kMostAttempts) {
         error = systemError(path);
         return false;
@@ -78,15 +75,16 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
       shared.reset();
     }
   }
-  if (!S_ISREG(status.st_mode)) {
-    error = path + ": not a regular file";
+  if (!S_ISREG(status->st_mode)) {
+    error = path.string() + ": not a regular file";
     return false;
   }
   // SQLite would wait at a pipe for ever.
   for (const char* companion : kCompanions) {
-    struct stat beside {};
-    if (stat((path + companion).c_str(), &beside) == 0 && !S_ISREG(beside.st_mode)) {
-      error = path + companion + ": not a regular file";
+    const HostPath besidePath = folder.below(std::string(kName) + companion);
+    const std::optional<struct stat> beside = besidePath.status();
+    if ((beside && !S_ISREG(beside->st_mode)) || (!beside && errno == ELOOP)) {
+      error = besidePath.string() + ": not a regular file";
       return false;
     }
   }
@@ -113,14 +111,14 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
   } catch (const SqliteFailure& failure) {
     error = failure.text;
     if (failure.isCorruption() && !_directory.isReadOnly()) {
-      damage = Damage{status.st_dev, status.st_ino, failure.text};
+      damage = Damage{status->st_dev, status->st_ino, failure.text};
     }
     return false;
   }
 }
 
 bool CounterFile::make(std::string& error) {
-  const std::optional<std::string> folder = _directory.makeFolder(kFolder, error);
+  const std::optional<HostPath> folder = _directory.makeFolder(kFolder, error);
   if (!folder) {
     return false;
   }
@@ -130,17 +128,18 @@ bool CounterFile::make(std::string& error) {
 
 // The file gets its name complete, so an empty one is never ours.
 bool CounterFile::makeLocked(std::string& error) {
-  const std::string folder = _directory.hostPath(kFolder);
-  const std::string path = folder + '/' + kName;
+  const HostPath folder = _directory.hostPath(kFolder);
+  const HostPath path = folder.below(kName);
   if (exists(path)) {
     return true;
   }
   // The journal of a lost file would be replayed into the new one.
+  removeLeftOvers(folder);
   const std::string aside = unusedNameAside();
   for (const char* companion : kCompanions) {
-    if (std::rename((path + companion).c_str(), (aside + companion).c_str()) != 0 &&
-        errno != ENOENT) {
-      error = systemError(path + companion);
+    const HostPath left = folder.below(std::string(kName) + companion);
+    if (!renameFile(left, aside + companion) && errno != ENOENT) {
+      error = systemError(left);
       return false;
     }
   }
@@ -160,25 +159,25 @@ bool CounterFile::makeLocked(std::string& error) {
 }
 
 std::optional<std::string> CounterFile::replace(const Damage& damage, std::string& error) {
-  const std::string folder = _directory.hostPath(kFolder);
-  const std::string path = folder + '/' + kName;
+  const HostPath folder = _directory.hostPath(kFolder);
+  const HostPath path = folder.below(kName);
   const auto exclusive = lockFolder(folder, error, LOCK_EX, _longestWait);
   if (!exclusive) {
     return std::nullopt;
   }
   std::string aside;
-  struct stat status {};
-  if (stat(path.c_str(), &status) == 0 && status.st_dev == damage.device &&
-      status.st_ino == damage.number) {
+  const std::optional<struct stat> status = path.status();
+  if (status && status->st_dev == damage.device && status->st_ino == damage.number) {
     aside = unusedNameAside();
     // The file first: if we are killed here, its journal is moved aside later.
-    if (std::rename(path.c_str(), aside.c_str()) != 0) {
+    if (!renameFile(path, aside)) {
       error = systemError(path);
       return std::nullopt;
     }
     for (const char* companion : kCompanions) {
-      std::rename((path + companion).c_str(), (aside + companion).c_str());
+      renameFile(folder.below(std::string(kName) + companion), aside + companion);
     }
+    aside = folder.below(aside);
   }
   if (!makeLocked(error)) {
     return std::nullopt;
@@ -187,12 +186,13 @@ std::optional<std::string> CounterFile::replace(const Damage& damage, std::strin
 }
 
 std::string CounterFile::unusedNameAside() const {
-  const std::string aside =
-      nameAside(_directory.hostPath(kFolder) + '/' + kName, "corrupt", _clock);
+  const HostPath folder = _directory.hostPath(kFolder);
+  const std::string aside = nameAside(kName, "corrupt", _clock);
   std::string name = aside;
-  const auto isTaken = [&name] {
-    return exists(name) || std::any_of(kCompanions.begin(), kCompanions.end(),
-                                       [&](const char* end) { return exists(name + end); });
+  const auto isTaken = [&] {
+    return exists(folder.below(name)) ||
+           std::any_of(kCompanions.begin(), kCompanions.end(),
+                       [&](const char* end) { return exists(folder.below(name + end)); });
   };
   for (int number = 2; isTaken(); ++number) {
     name = aside + '-' + std::to_string(number);

@@ -20,10 +20,9 @@ constexpr std::string_view kNumberFile = "outbox/.log-number";
 
 /// What changes with every log that is added, removed or noted as removed.
 std::string stateOf(const DeviceDirectory& directory) {
-  struct stat folder {};
-  struct stat pruned {};
-  stat(directory.hostPath(kLogFolder).c_str(), &folder);
-  stat(directory.hostPath(kPrunedLogsFile).c_str(), &pruned);
+  const struct stat nothing {};
+  const struct stat folder = directory.hostPath(kLogFolder).status().value_or(nothing);
+  const struct stat pruned = directory.hostPath(kPrunedLogsFile).status().value_or(nothing);
   return std::to_string(folder.st_mtim.tv_sec) + '.' + std::to_string(folder.st_mtim.tv_nsec) +
          ' ' + std::to_string(pruned.st_size);
 }
@@ -31,11 +30,11 @@ std::string stateOf(const DeviceDirectory& directory) {
 /// Gives the folder a modification time that no change leaves behind, since those are rounded to
 /// ticks of the system's clock. False when the file system cannot keep it.
 bool markFolder(const DeviceDirectory& directory) {
-  const std::string folder = directory.hostPath(kLogFolder);
+  const FileDescriptor folder = openFolder(directory.hostPath(kLogFolder));
   timespec times[2] = {{0, UTIME_OMIT}, {}};
   clock_gettime(CLOCK_REALTIME, &times[1]);
   struct stat status {};
-  return utimensat(AT_FDCWD, folder.c_str(), times, 0) == 0 && stat(folder.c_str(), &status) == 0 &&
+  return futimens(folder.get(), times) == 0 && fstat(folder.get(), &status) == 0 &&
          status.st_mtim.tv_sec == times[1].tv_sec && status.st_mtim.tv_nsec == times[1].tv_nsec;
 }
 
@@ -112,15 +111,16 @@ std::optional<std::uint64_t> LogNumbers::newest(std::string& error) const {
 }
 
 bool LogNumbers::remember(std::uint64_t number, bool durably, std::string& error) const {
-  const std::string path = _directory.hostPath(kNumberFile);
-  const FileDescriptor file(
-      open(path.c_str(), O_WRONLY | O_CREAT | O_CLOEXEC | O_NONBLOCK | O_NOFOLLOW, 0600));
+  const HostPath path = _directory.hostPath(kNumberFile);
+  const FileDescriptor file = openToChange(path, O_WRONLY | O_CREAT, error);
+  if (!file.isOpen()) {
+    return false;
+  }
   // Written in place and by one call: whenever the power goes, the old or the new number is there,
   // and both are right. Nothing is flushed for the sake of a log.
   const std::string content = std::to_string(number) + ' ' +
                               (markFolder(_directory) ? stateOf(_directory) : "unknown") + '\n';
-  if (!file.isOpen() ||
-      pwrite(file.get(), content.data(), content.size(), 0) !=
+  if (pwrite(file.get(), content.data(), content.size(), 0) !=
           static_cast<ssize_t>(content.size()) ||
       (durably && fsync(file.get()) != 0)) {
     error = systemError(path);

@@ -23,7 +23,7 @@ std::string baseName(std::uint64_t number, std::string_view type, std::string_vi
   return std::string(digits) + '-' + std::string(type) + '-' + std::string(name);
 }
 
-AtomicFile::Added addHeader(const std::string& folder, const std::string& name,
+AtomicFile::Added addHeader(const HostPath& folder, const std::string& name,
                             const PropertyDict& header, const Date& time, std::string& error) {
   std::optional<AtomicFile> file = AtomicFile::create(folder, error);
   if (!file) {
@@ -92,7 +92,7 @@ bool HostOutbox::LGSWriteLogForSubmission(std::string_view logType, std::string_
 
 bool HostOutbox::writeLog(std::string_view type, std::string_view name, const PropertyDict* header,
                           const LogWriter& writer, std::string& error) const {
-  const std::optional<std::string> folder = _directory.makeFolder(kLogFolder, error);
+  const std::optional<HostPath> folder = _directory.makeFolder(kLogFolder, error);
   if (!folder) {
     return false;
   }
@@ -125,7 +125,7 @@ bool HostOutbox::writeLog(std::string_view type, std::string_view name, const Pr
     }
     added = file->addNew(base + (type == kPtreeLogType ? ".ptree" : ".log"), error);
     if (added != AtomicFile::Added::Done && header != nullptr) {
-      unlink((*folder + '/' + headerName).c_str());
+      removeFile(folder->below(headerName));
     }
   }
   if (added == AtomicFile::Added::Done) {
