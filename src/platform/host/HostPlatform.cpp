@@ -9,6 +9,7 @@
 #include "platform/host/files/Files.h"
 #include "platform/host/messages/HostMainLoop.h"
 #include "platform/host/messages/HostMessageService.h"
+#include "platform/host/outbox/HostOutbox.h"
 #include "platform/host/preferences/HostPreferences.h"
 #include "platform/host/preferences/PreferenceServices.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
@@ -17,7 +18,6 @@
 #include "platform/host/services/HostDeviceInformation.h"
 #include "platform/host/services/HostKernel.h"
 #include "platform/host/services/HostMurmur.h"
-#include "platform/host/services/HostOutbox.h"
 #include "platform/host/services/HostSystemLog.h"
 #include "platform/host/services/HostTapline.h"
 

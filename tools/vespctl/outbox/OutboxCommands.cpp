@@ -12,6 +12,7 @@
 #include "platform/host/documents/PtreeReader.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/Files.h"
+#include "platform/host/outbox/OutboxFiles.h"
 
 namespace vesprun {
 namespace {
@@ -36,7 +37,7 @@ void showLines(const HostPath& file, Show show) {
 }
 
 void showEvents(const DeviceDirectory& directory, bool inFull) {
-  showLines(directory.hostPath("outbox/events.jsonl"), [inFull](const PropertyDict& event) {
+  showLines(directory.hostPath(kEventsFile), [inFull](const PropertyDict& event) {
     const PropertyDict* fields = event.findDict("payload");
     std::cout << entryText(event, "time") << "  " << entryText(event, "event") << "  "
               << (fields != nullptr ? fields->size() : 0) << " fields\n";
@@ -62,7 +63,7 @@ std::string recordText(const PropertyDict& record, bool inFull) {
 }
 
 void showRecords(const DeviceDirectory& directory, bool inFull) {
-  showLines(directory.hostPath("outbox/records.jsonl"), [inFull](const PropertyDict& line) {
+  showLines(directory.hostPath(kRecordsFile), [inFull](const PropertyDict& line) {
     const PropertyDict* record = line.findDict("record");
     std::cout << entryText(line, "time") << "  type " << entryText(line, "type") << "  "
               << (record != nullptr ? printableText(recordText(*record, inFull)) : "") << '\n';
@@ -70,13 +71,13 @@ void showRecords(const DeviceDirectory& directory, bool inFull) {
 }
 
 void showNotifications(const DeviceDirectory& directory) {
-  showLines(directory.hostPath("outbox/notifications.jsonl"), [](const PropertyDict& line) {
+  showLines(directory.hostPath(kNotificationsFile), [](const PropertyDict& line) {
     std::cout << entryText(line, "time") << "  " << entryText(line, "name") << '\n';
   });
 }
 
 void showSystemLog(const DeviceDirectory& directory) {
-  showLines(directory.hostPath("outbox/log.jsonl"), [](const PropertyDict& line) {
+  showLines(directory.hostPath(kSystemLogFile), [](const PropertyDict& line) {
     const PropertyValue* value = line.find("message");
     std::string message = value != nullptr ? textForm(*value) : "";
     message.erase(message.find_last_not_of('\n') + 1);  // some messages end their own line
@@ -132,7 +133,7 @@ void showLog(const HostPath& path, bool inFull) {
 void showLogs(const DeviceDirectory& directory, bool inFull) {
   for (const std::string& name : namesOfLogs(directory)) {
     if (name.front() != '.' && (name.ends_with(".ptree") || name.ends_with(".log"))) {
-      showLog(directory.hostPath("outbox/logs/" + name), inFull);
+      showLog(directory.hostPath(kLogFolder).below(name), inFull);
     }
   }
 }

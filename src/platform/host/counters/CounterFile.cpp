@@ -5,8 +5,10 @@
 #include <algorithm>
 #include <array>
 #include <cerrno>
-#include <cstdio>
+#include <charconv>
+#include <map>
 #include <string_view>
+#include <utility>
 
 #include "platform/host/files/AtomicFile.h"
 #include "platform/host/files/Files.h"
@@ -19,6 +21,8 @@ constexpr const char* kName = "TBDataStore.sqlitedb";
 
 // SQLite's companion files. We use only the first; other tools may enable the rest.
 constexpr std::array kCompanions{"-journal", "-wal", "-shm"};
+
+constexpr const char* kWhyAside = "corrupt";
 
 constexpr int kMostAttempts = 3;
 
@@ -187,7 +191,7 @@ std::optional<std::string> CounterFile::replace(const Damage& damage, std::strin
 
 std::string CounterFile::unusedNameAside() const {
   const HostPath folder = _directory.hostPath(kFolder);
-  const std::string aside = nameAside(kName, "corrupt", _clock);
+  const std::string aside = nameAside(kName, kWhyAside, _clock);
   std::string name = aside;
   const auto isTaken = [&] {
     return exists(folder.below(name)) ||
@@ -198,6 +202,46 @@ std::string CounterFile::unusedNameAside() const {
     name = aside + '-' + std::to_string(number);
   }
   return name;
+}
+
+bool removeOldDamaged(const DeviceDirectory& directory, const Date& time, std::string& error) {
+  const std::string begin = std::string(kName) + '.' + kWhyAside + '-';
+  const HostPath folder = directory.hostPath(kFolder);
+  const auto names = namesInFolder(folder, error);
+  if (!names) {
+    return false;
+  }
+  // A time and, in one second, a number.
+  using Place = std::pair<std::string, int>;
+  std::map<std::string, Place> places;
+  Place newest;
+  for (const std::string& name : *names) {
+    if (!name.starts_with(begin)) {
+      continue;
+    }
+    std::string_view rest = std::string_view(name).substr(begin.size());
+    const bool isCompanion = std::ranges::any_of(kCompanions, [&](std::string_view end) {
+      const bool ends = rest.ends_with(end);
+      rest.remove_suffix(ends ? end.size() : 0);
+      return ends;
+    });
+    const std::size_t dash = rest.find('-');
+    Place place{rest.substr(0, dash), 1};
+    if (dash != std::string_view::npos) {
+      std::from_chars(rest.data() + dash + 1, rest.data() + rest.size(), place.second);
+    }
+    newest = isCompanion ? newest : std::max(newest, place);
+    places.emplace(name, std::move(place));
+  }
+  const std::string oldest = timeInName(time);
+  for (const auto& [name, place] : places) {
+    const HostPath path = folder.below(name);
+    if ((place < newest || place.first < oldest) && !removeFile(path) && errno != ENOENT) {
+      error = systemError(path);
+      return false;
+    }
+  }
+  return true;
 }
 
 }  // namespace vesprun

@@ -29,8 +29,8 @@ std::string unfinishedName() {
              : "";
 }
 
-bool sync(const FileDescriptor& folder, const std::string& path, std::string& error) {
-  const bool synced = folder.isOpen() && fsync(folder.get()) == 0;
+bool sync(const FileDescriptor& file, const std::string& path, std::string& error) {
+  const bool synced = file.isOpen() && fsync(file.get()) == 0;
   if (!synced) {
     error = systemError(path);
   }
@@ -187,6 +187,10 @@ bool replaceFile(const HostPath& path, std::string_view content, std::string& er
   }
   file->append(content);
   return file->replace(path.name(), error);
+}
+
+bool flushFile(const HostPath& path, std::string& error) {
+  return sync(path.open(O_RDONLY | O_NONBLOCK), path, error) && flushFolder(path.folder(), error);
 }
 
 bool flushFolder(const HostPath& folder, std::string& error) {

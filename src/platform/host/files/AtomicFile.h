@@ -63,6 +63,9 @@ void removeLeftOvers(const HostPath& folder);
 /// Replaces the file at `path` with a whole document.
 bool replaceFile(const HostPath& path, std::string_view content, std::string& error);
 
+/// Makes the content of a file durable, and its name.
+bool flushFile(const HostPath& path, std::string& error);
+
 /// Makes durable which names a folder has.
 bool flushFolder(const HostPath& folder, std::string& error);
 

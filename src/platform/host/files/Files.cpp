@@ -161,10 +161,14 @@ bool renameFile(const HostPath& path, const std::string& newName) {
          renameat(folder.get(), path.name().c_str(), folder.get(), newName.c_str()) == 0;
 }
 
+std::string timeInName(const Date& time) {
+  std::string text = dateText({time.seconds, 0});
+  std::erase_if(text, [](char c) { return c == '-' || c == ':'; });
+  return text;
+}
+
 std::string nameAside(const std::string& path, std::string_view why, Clock& clock) {
-  std::string time = dateText({clock.now().seconds, 0});
-  std::erase_if(time, [](char c) { return c == '-' || c == ':'; });
-  return path + '.' + std::string(why) + '-' + time;
+  return path + '.' + std::string(why) + '-' + timeInName(clock.now());
 }
 
 }  // namespace vesprun

@@ -62,6 +62,9 @@ FileDescriptor openToChange(const HostPath& path, int flags, std::string& error)
 bool removeFile(const HostPath& path);
 bool renameFile(const HostPath& path, const std::string& newName);
 
+/// "20240305T091502Z".
+std::string timeInName(const Date& time);
+
 /// "PATH.WHY-20240305T091502Z": where a file that cannot be used is kept.
 std::string nameAside(const std::string& path, std::string_view why, Clock& clock);
 

@@ -52,15 +52,6 @@ std::optional<std::uint64_t> JsonLines::remove(
   return removed;
 }
 
-bool JsonLines::flush(std::string& error) {
-  const std::scoped_lock guard(_mutex);
-  if (!isNamed() || fsync(_file.get()) != 0) {
-    error = systemError(_path);
-    return false;
-  }
-  return flushFolder(_path.folder(), error);
-}
-
 bool JsonLines::lock(std::string& error, int creating) {
   // A file that was deleted or replaced meanwhile would take the line with it. While it is locked,
   // nobody replaces it.
@@ -115,9 +106,37 @@ std::optional<std::uint64_t> JsonLines::removeLocked(
     const std::function<bool(std::string_view line)>& goes, std::uint64_t maxBytes,
     std::string& error) {
   std::optional<AtomicFile> kept = AtomicFile::create(_path.folder(), error);
+  const auto keep = [&kept](std::string_view line) { kept->append(line); };
+  const std::optional<std::uint64_t> removed =
+      kept ? sort(_file.get(), goes, maxBytes, keep, error) : std::nullopt;
+  return removed.value_or(0) == 0 || kept->replace(_path.name(), error) ? removed : std::nullopt;
+}
+
+std::optional<std::uint64_t> JsonLines::countRemoved(
+    const std::function<bool(std::string_view line)>& goes, std::uint64_t& bytes,
+    std::string& error, std::uint64_t maxBytes) const {
+  const FileDescriptor file = _path.open(O_RDONLY | O_NONBLOCK);
   struct stat status {};
-  if (!kept || fstat(_file.get(), &status) != 0) {
-    error = kept ? systemError(_path) : error;
+  if (!file.isOpen() && errno == ENOENT) {
+    return 0;
+  }
+  if (!file.isOpen() || fstat(file.get(), &status) != 0 || !S_ISREG(status.st_mode)) {
+    error = file.isOpen() ? _path.string() + ": not a regular file" : systemError(_path);
+    return std::nullopt;
+  }
+  bytes = static_cast<std::uint64_t>(status.st_size);
+  const auto keep = [&bytes](std::string_view line) { bytes -= std::min(bytes, line.size()); };
+  return sort(file.get(), goes, maxBytes, keep, error);
+}
+
+std::optional<std::uint64_t> JsonLines::sort(int file,
+                                             const std::function<bool(std::string_view line)>& goes,
+                                             std::uint64_t maxBytes,
+                                             const std::function<void(std::string_view line)>& keep,
+                                             std::string& error) const {
+  struct stat status {};
+  if (fstat(file, &status) != 0) {
+    error = systemError(_path);
     return std::nullopt;
   }
   const auto size = static_cast<std::uint64_t>(status.st_size);
@@ -131,15 +150,14 @@ std::optional<std::uint64_t> JsonLines::removeLocked(
     if (isTooLong || isBefore || goes(line)) {
       ++removed;
     } else {
-      kept->append(line);
-      kept->append(end);
+      keep(line.append(end));
     }
     line.clear();
     isTooLong = false;
   };
   std::vector<char> piece(256 * 1024);
   while (true) {
-    const ssize_t count = pread(_file.get(), piece.data(), piece.size(), static_cast<off_t>(place));
+    const ssize_t count = pread(file, piece.data(), piece.size(), static_cast<off_t>(place));
     if (count < 0 && errno == EINTR) {
       continue;
     }
@@ -167,7 +185,7 @@ std::optional<std::uint64_t> JsonLines::removeLocked(
   if (!line.empty() || isTooLong) {
     take("", place);
   }
-  return removed == 0 || kept->replace(_path.name(), error) ? std::optional(removed) : std::nullopt;
+  return removed;
 }
 
 }  // namespace vesprun

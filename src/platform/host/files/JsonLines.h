@@ -30,9 +30,6 @@ class JsonLines {
   /// someone else is ended first. False, with the file in `error`, when the line is not there.
   bool append(std::string line, std::string& error);
 
-  /// Makes what was appended durable.
-  bool flush(std::string& error);
-
   /// Removes the lines that `goes` picks, and the first ones of a file that has more than
   /// `maxBytes`, all or none; those of other writers wait meanwhile. What is longer than `kMaxLine`
   /// is no line and goes too. The number of lines that are gone, without those before the last
@@ -40,12 +37,23 @@ class JsonLines {
   std::optional<std::uint64_t> remove(const std::function<bool(std::string_view line)>& goes,
                                       std::string& error, std::uint64_t maxBytes = kMaxLinesFile);
 
+  /// What `remove` would remove, and how many bytes. Changes nothing.
+  std::optional<std::uint64_t> countRemoved(const std::function<bool(std::string_view line)>& goes,
+                                            std::uint64_t& bytes, std::string& error,
+                                            std::uint64_t maxBytes) const;
+
  private:
   bool open(std::string& error, int creating);
   bool lock(std::string& error, int creating);
   bool isNamed() const;
   std::optional<std::uint64_t> removeLocked(const std::function<bool(std::string_view line)>& goes,
                                             std::uint64_t maxBytes, std::string& error);
+  /// Gives each line of the file that does not go to `keep`, with its end.
+  std::optional<std::uint64_t> sort(int file,
+                                    const std::function<bool(std::string_view line)>& goes,
+                                    std::uint64_t maxBytes,
+                                    const std::function<void(std::string_view line)>& keep,
+                                    std::string& error) const;
   bool appendLocked(std::string line, std::string& error);
 
   HostPath _path;
