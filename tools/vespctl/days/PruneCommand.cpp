@@ -57,8 +57,9 @@ CounterStore::Rows removeCounters(HostPlatform& device, std::int64_t day, bool i
       (!isDry && first && *first < day && !counters.write(remove, error))) {
     problems.push_back(error);
   }
-  if (!isDry &&
-      !removeOldDamaged(device.directory(), startOfDay(static_cast<std::int32_t>(day)), error)) {
+  if (!isDry && !removeOldDamaged(
+                    device.directory(),
+                    startOfDay(static_cast<std::int32_t>(std::max<std::int64_t>(day, 0))), error)) {
     problems.push_back(error);
   }
   complaints.print();
@@ -77,9 +78,9 @@ std::optional<std::size_t> neverUploaded(const DeviceDirectory& directory,
        readLogNotes(directory, kUploadedFile, ignored).value_or(std::vector<LogNote>())) {
     uploaded.insert(note.name);
   }
-  return std::ranges::count_if(removed, [&](const std::string& name) {
+  return static_cast<std::size_t>(std::ranges::count_if(removed, [&](const std::string& name) {
     return isDailyLogName(name) && !uploaded.contains(name);
-  });
+  }));
 }
 
 void prune(const Pruning& wanted) {
