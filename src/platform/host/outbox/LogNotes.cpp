@@ -55,7 +55,7 @@ std::optional<std::string> textIn(const Json& note, const char* key) {
 
 Json jsonOf(const std::optional<std::string>& text) { return text ? Json(*text) : Json(); }
 
-bool append(JsonLines& lines, const Json& note, std::string& error) {
+bool appendNote(JsonLines& lines, const Json& note, std::string& error) {
   return lines.append(note.dump(-1, ' ', false, Json::error_handler_t::replace), error);
 }
 
@@ -79,12 +79,12 @@ bool addLogNotes(const DeviceDirectory& directory, std::string_view file, const 
                  const std::vector<LogNote>& notes, std::string& error) {
   JsonLines lines(directory.hostPath(file));
   for (const LogNote& note : notes) {
-    if (!append(lines,
-                {{"time", dateText(time)},
-                 {"name", note.name},
-                 {"day", note.day},
-                 {"revision", note.revision}},
-                error)) {
+    if (!appendNote(lines,
+                    {{"time", dateText(time)},
+                     {"name", note.name},
+                     {"day", note.day},
+                     {"revision", note.revision}},
+                    error)) {
       return false;
     }
   }
@@ -104,12 +104,12 @@ std::optional<std::map<std::string, SubmittedNote>> readSubmittedNotes(
 bool addSubmittedNote(const DeviceDirectory& directory, const Date& time, const std::string& name,
                       const SubmittedNote& note, std::string& error) {
   JsonLines lines(directory.hostPath(kSubmittedFile));
-  return append(lines,
-                {{"time", dateText(time)},
-                 {"name", name},
-                 {"build", jsonOf(note.build)},
-                 {"model", jsonOf(note.model)}},
-                error);
+  return appendNote(lines,
+                    {{"time", dateText(time)},
+                     {"name", name},
+                     {"build", jsonOf(note.build)},
+                     {"model", jsonOf(note.model)}},
+                    error);
 }
 
 bool removeStaleNotes(const DeviceDirectory& directory, std::string& error) {
