@@ -8,6 +8,8 @@
 #include <sstream>
 
 #include "platform/host/documents/JsonForm.h"
+#include "platform/host/files/Files.h"
+#include "platform/host/files/JsonLines.h"
 
 namespace vesprun {
 namespace {
@@ -49,7 +51,7 @@ DeviceDirectory openDirectory(Access access, OwnersRights rights) {
   takeRightsOfOwner(status, rights);
   DeviceDirectory directory =
       *orFail([&](std::string& error) { return DeviceDirectory::open(path, error); });
-  const std::string description = directory.hostPath("device.json");
+  const std::string description = directory.hostPath("device.json").string();
   const bool isOwner = geteuid() == status.st_uid;
   if (faccessat(AT_FDCWD, description.c_str(), F_OK, AT_EACCESS) != 0) {
     if (errno == ENOENT) {
@@ -110,10 +112,10 @@ std::string readInput(const std::string& file) {
   return content;
 }
 
-std::string contentIfThere(const std::string& file) {
+std::string contentIfThere(const HostPath& file) {
   return *orFail([&](std::string& error) {
     bool missing = false;
-    std::optional<std::string> content = readWholeFile(file, error, &missing);
+    std::optional<std::string> content = readWholeFile(file, error, &missing, kMaxLinesFile);
     return missing ? std::optional<std::string>("") : std::move(content);
   });
 }

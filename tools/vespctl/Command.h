@@ -46,7 +46,7 @@ FileDescriptor openInput(const std::string& file);
 std::string readInput(const std::string& file);
 
 /// The content of a regular file; empty when there is none.
-std::string contentIfThere(const std::string& file);
+std::string contentIfThere(const HostPath& file);
 
 /// Calls `take` with each line of a text, null for one that is not a JSON object.
 void forEachLine(const std::string& text, const std::function<void(PropertyDict* line)>& take);

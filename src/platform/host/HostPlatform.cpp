@@ -1,5 +1,6 @@
 #include "platform/host/HostPlatform.h"
 
+#include <cstdint>
 #include <optional>
 #include <utility>
 
@@ -8,6 +9,7 @@
 #include "platform/host/files/Files.h"
 #include "platform/host/messages/HostMainLoop.h"
 #include "platform/host/messages/HostMessageService.h"
+#include "platform/host/outbox/HostOutbox.h"
 #include "platform/host/preferences/HostPreferences.h"
 #include "platform/host/preferences/PreferenceServices.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
@@ -16,11 +18,16 @@
 #include "platform/host/services/HostDeviceInformation.h"
 #include "platform/host/services/HostKernel.h"
 #include "platform/host/services/HostMurmur.h"
-#include "platform/host/services/HostOutbox.h"
 #include "platform/host/services/HostSystemLog.h"
 #include "platform/host/services/HostTapline.h"
 
 namespace vesprun {
+namespace {
+
+// Its values take many times as much memory.
+constexpr std::uint64_t kMaxDescription = 4 * 1024 * 1024;
+
+}  // namespace
 
 // Destroyed from the last to the first: a service that writes at its end follows those that it
 // needs.
@@ -73,12 +80,13 @@ std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, std::s
     return nullptr;
   }
   DeviceDescription description;
-  const std::string file = directory->hostPath("device.json");
+  const HostPath file = directory->hostPath("device.json");
   bool missing = false;
-  if (const std::optional<std::string> text = readWholeFile(file, error, &missing)) {
+  if (const std::optional<std::string> text =
+          readWholeFile(file, error, &missing, kMaxDescription)) {
     std::optional<DeviceDescription> read = readDeviceDescription(*text, error);
     if (!read) {
-      error = file + ": " + error;
+      error = file.string() + ": " + error;
       return nullptr;
     }
     description = *std::move(read);
@@ -90,7 +98,7 @@ std::unique_ptr<HostPlatform> HostPlatform::open(const std::string& path, std::s
       std::move(description), readOnlyLog);
   const std::optional<std::string>& zone = services->description.timeZone;
   if (zone && !isTimeZone(*zone)) {
-    error = file + ": timeZone: unknown time zone " + quotedText(*zone);
+    error = file.string() + ": timeZone: unknown time zone " + quotedText(*zone);
     return nullptr;
   }
   return std::unique_ptr<HostPlatform>(new HostPlatform(std::move(services)));

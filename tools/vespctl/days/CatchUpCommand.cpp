@@ -10,7 +10,8 @@
 #include "outbox/SubmittedLogs.h"
 #include "platform/Platform.h"
 #include "platform/host/counters/HostTallybook.h"
-#include "platform/host/device/LogNumbers.h"
+#include "platform/host/outbox/LogNotes.h"
+#include "platform/host/outbox/OutboxFiles.h"
 #include "report/LogSubmission.h"
 #include "report/ReportSources.h"
 #include "report/TBReport.h"
@@ -23,8 +24,9 @@ std::set<std::int32_t> reportedDays(const DeviceDirectory& directory) {
   std::set<std::int32_t> days;
   nameUnreadable(
       forEachSubmittedLog(directory, [&days](SubmittedLog&& log) { days.insert(log.day); }));
-  const auto pruned = orFail([&](std::string& error) { return readPrunedLogs(directory, error); });
-  for (const PrunedLog& log : *pruned) {
+  const auto pruned =
+      orFail([&](std::string& error) { return readLogNotes(directory, kPrunedFile, error); });
+  for (const LogNote& log : *pruned) {
     days.insert(log.day);
   }
   return days;

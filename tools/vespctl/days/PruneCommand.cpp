@@ -6,6 +6,7 @@
 #include <limits>
 #include <memory>
 #include <optional>
+#include <set>
 #include <string>
 #include <vector>
 
@@ -13,11 +14,13 @@
 #include "Complaints.h"
 #include "commandline/Arguments.h"
 #include "common/Calendar.h"
-#include "days/LogPruning.h"
 #include "platform/host/counters/HostTallybook.h"
-#include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/QuotedText.h"
-#include "platform/host/files/JsonLines.h"
+#include "platform/host/outbox/DailyLogs.h"
+#include "platform/host/outbox/LogNotes.h"
+#include "platform/host/outbox/LogPruning.h"
+#include "platform/host/outbox/OutboxFiles.h"
+#include "platform/host/outbox/PruneDays.h"
 
 namespace vesprun {
 namespace {
@@ -26,60 +29,62 @@ struct Pruning {
   std::optional<std::uint32_t> counterDays;
   std::optional<std::uint32_t> outboxDays;
   std::optional<std::uint64_t> outboxMebibytes;
+  bool isNow = false;
+  bool isDry = false;
 };
 
-/// Removes the lines of a file in the outbox that were written before `time`, and returns their
-/// number. A line without a time stays.
-std::uint64_t removeLines(const std::string& path, const Date& time,
-                          std::vector<std::string>& problems) {
-  static constexpr std::string_view kBegin = "{\"time\":\"";
-  std::string error;
-  const auto isOlder = [&time](std::string_view text) {
-    if (text.starts_with(kBegin)) {  // as our lines do; most are not old and need no parsing
-      const std::string_view rest = text.substr(kBegin.size());
-      const std::optional<Date> date = parseDateText(rest.substr(0, rest.find('"')));
-      if (date && *date >= time) {
-        return false;
-      }
-    }
-    std::string malformed;
-    const std::optional<PropertyValue> line = valueFromJsonText(text, malformed);
-    const PropertyDict* fields = line ? line->dict() : nullptr;
-    const std::string* written = fields != nullptr ? fields->findString("time") : nullptr;
-    const std::optional<Date> date = written != nullptr ? parseDateText(*written) : std::nullopt;
-    return date && *date < time;
-  };
-  const std::optional<std::uint64_t> removed = JsonLines(path).remove(isOlder, error);
-  if (!removed) {
-    problems.push_back(error);
-  }
-  return removed.value_or(0);
-}
-
 /// Removes the counters of days before `day`. What cannot be done goes into `problems`.
-CounterStore::Removed removeCounters(HostPlatform& device, std::int64_t day,
-                                     std::vector<std::string>& problems) {
+CounterStore::Rows removeCounters(HostPlatform& device, std::int64_t day, bool isDry,
+                                  std::vector<std::string>& problems) {
   constexpr std::int64_t kBeforeAllDays = std::numeric_limits<std::int64_t>::min();
   Complaints complaints(&device.systemLog());
   HostTallybook counters(device.directory(), device.clock(), device.preferences(), complaints);
-  CounterStore::Removed removed;
+  CounterStore::Rows rows;
   std::optional<std::int32_t> first;
   std::string error;
+  const auto look = [&](CounterStore& store) {
+    first = store.nextDay(kBeforeAllDays);
+    if (isDry) {
+      rows = store.rowsBefore(day);
+    }
+  };
   const auto remove = [&](CounterStore& store) {
-    removed = store.removeBefore(day);
+    rows = store.removeBefore(day);
     store.giveRoomBack();
     return true;
   };
   // A write without anything to remove would still lock the database, or even make it.
-  if (!counters.read([&](CounterStore& store) { first = store.nextDay(kBeforeAllDays); }, error) ||
-      (first && *first < day && !counters.write(remove, error))) {
+  if (!counters.read(look, error) ||
+      (!isDry && first && *first < day && !counters.write(remove, error))) {
+    problems.push_back(error);
+  }
+  if (!isDry && !removeOldDamaged(
+                    device.directory(),
+                    startOfDay(static_cast<std::int32_t>(std::max<std::int64_t>(day, 0))), error)) {
     problems.push_back(error);
   }
   complaints.print();
-  return removed;
+  return rows;
 }
 
-void printRemoved(const CounterStore::Removed& counters, const std::vector<std::string>& logs,
+/// How many of the removed daily logs no upload has acknowledged; nothing where none ever did.
+std::optional<std::size_t> neverUploaded(const DeviceDirectory& directory,
+                                         const std::vector<std::string>& removed) {
+  std::string ignored;
+  if (!directory.hostPath(kUploadedFile).status()) {
+    return std::nullopt;
+  }
+  std::set<std::string> uploaded;
+  for (const LogNote& note :
+       readLogNotes(directory, kUploadedFile, ignored).value_or(std::vector<LogNote>())) {
+    uploaded.insert(note.name);
+  }
+  return static_cast<std::size_t>(std::ranges::count_if(removed, [&](const std::string& name) {
+    return isDailyLogName(name) && !uploaded.contains(name);
+  }));
+}
+
+void printRemoved(const CounterStore::Rows& counters, const std::vector<std::string>& logs,
                   const PropertyDict& lines) {
   if (!counters.days.empty()) {
     printText("Counters of " + dateOfDay(counters.days.front()) + " to " +
@@ -101,32 +106,50 @@ void prune(const Pruning& wanted) {
   // Today's and tomorrow's reports read these days.
   constexpr std::int64_t kDaysKept = 2;
   constexpr std::uint64_t kBytesPerMebibyte = 1048576;
-  const auto device = openDevice();
-  const FileDescriptor lock = takeDailyWork(device->directory());
+  Complaints seen;
+  const auto device = wanted.isDry ? openDeviceReadOnly(seen) : openDevice();
+  const DeviceDirectory& directory = device->directory();
+  const FileDescriptor lock = takeDailyWork(directory);
   const Date now = device->clock().now();
+  const std::int64_t today = daysSince1970(now);
   std::vector<std::string> problems;
-  LogPruning logs(device->directory(), now);
-  PropertyDict lines;
-  if (wanted.outboxDays) {
-    const Date time{now.seconds - *wanted.outboxDays * kSecondsPerDay, now.nanoseconds};
-    logs.removeBefore(time);
-    for (const char* const file :
-         {"records.jsonl", "events.jsonl", "notifications.jsonl", "log.jsonl"}) {
-      const std::string path = device->directory().hostPath(std::string("outbox/") + file);
-      if (const std::uint64_t removed = removeLines(path, time, problems); removed != 0) {
-        lines.set(file, removed);
-      }
+  LogPruning logs(directory, now);
+  CounterStore::Rows counters;
+  const bool isWanted = wanted.counterDays || wanted.outboxDays || wanted.outboxMebibytes;
+  PruneDays days = PruneDays::read(directory);
+  const bool isBelieved = wanted.isNow || days.believe(today);
+  if (isWanted && isBelieved) {
+    if (wanted.outboxDays) {
+      logs.removeBefore({now.seconds - *wanted.outboxDays * kSecondsPerDay, now.nanoseconds});
     }
+    if (wanted.outboxMebibytes) {
+      constexpr std::uint64_t kMost = std::numeric_limits<std::uint64_t>::max() / kBytesPerMebibyte;
+      logs.removeUntilBelow(std::min(*wanted.outboxMebibytes, kMost) * kBytesPerMebibyte);
+    }
+    if (wanted.counterDays) {
+      counters =
+          removeCounters(*device, today - std::max<std::int64_t>(*wanted.counterDays, kDaysKept),
+                         wanted.isDry, problems);
+    }
+    if (const auto count = neverUploaded(directory, logs.removed()); count.value_or(0) != 0) {
+      complain(std::to_string(*count) + " of the removed daily logs " +
+               (*count == 1 ? "was" : "were") + " never uploaded");
+    }
+    logs.tidy();
+    days = {today, std::nullopt};
+  } else if (isWanted) {
+    complain("the clock is " + std::to_string(today - *days.removed) +
+             " days ahead of the last prune, so nothing is removed; a later day than today is "
+             "believed, and today with --now");
+    days.doubted = today;
   }
-  if (wanted.outboxMebibytes) {
-    constexpr std::uint64_t kMost = std::numeric_limits<std::uint64_t>::max() / kBytesPerMebibyte;
-    logs.removeUntilBelow(std::min(*wanted.outboxMebibytes, kMost) * kBytesPerMebibyte);
+  std::string error;
+  if (isWanted && !wanted.isDry && !days.write(directory, error)) {
+    problems.push_back(error);
   }
-  CounterStore::Removed counters;
-  if (wanted.counterDays) {
-    const std::int64_t today = daysSince1970(now);
-    counters = removeCounters(
-        *device, today - std::max<std::int64_t>(*wanted.counterDays, kDaysKept), problems);
+  PropertyDict lines;
+  for (const auto& [file, removed] : logs.removedLines()) {
+    lines.set(file, removed);
   }
   problems.insert(problems.begin(), logs.problems().begin(), logs.problems().end());
   printResult({{"days", counters.days},
@@ -162,6 +185,8 @@ void addPruneCommand(CLI::App& command) {
                   "Removes the oldest logs until the outbox is smaller than that, in MiB")
       ->type_name("MIB")
       ->transform(decimal<std::uint64_t>());
+  command.add_flag("--now", wanted->isNow, "Believes a clock that has jumped ahead");
+  command.add_flag("--dry-run", wanted->isDry, "Prints what would go, and removes nothing");
   command.callback([wanted] { prune(*wanted); });
 }
 

@@ -37,7 +37,7 @@ constexpr std::string_view kEmptyDescription = "{\n}\n";
 bool isCutShortWithoutMark(const DeviceDirectory& directory) {
   std::error_code failure;
   for (const char* folder : kFolders) {
-    if (!std::filesystem::is_directory(directory.hostPath(folder), failure)) {
+    if (!std::filesystem::is_directory(directory.hostPath(folder).string(), failure)) {
       return false;
     }
   }
@@ -45,7 +45,7 @@ bool isCutShortWithoutMark(const DeviceDirectory& directory) {
   for (; !failure && entry != std::filesystem::recursive_directory_iterator();
        entry.increment(failure)) {
     const bool isFolder = std::filesystem::is_directory(entry->symlink_status(failure));
-    if (!failure && !isFolder && entry->path() != directory.hostPath("device.json") &&
+    if (!failure && !isFolder && entry->path() != directory.hostPath("device.json").string() &&
         !entry->path().filename().string().starts_with(".unfinished-")) {
       return false;
     }
@@ -91,7 +91,7 @@ bool beginInit(const DeviceDirectory& directory) {
   removeFile(description);
   // The sample's counters are added to those that are there.
   const std::string database =
-      directory.hostPath("var/mobile/Library/Tallybook/TBDataStore.sqlitedb");
+      directory.hostPath("var/mobile/Library/Tallybook/TBDataStore.sqlitedb").string();
   removeFile(database);
   removeFile(database + "-journal");
   return true;

@@ -18,6 +18,7 @@
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/messages/MessageFraming.h"
 #include "platform/host/messages/ServiceSocket.h"
+#include "platform/host/outbox/OutboxFiles.h"
 
 namespace vesprun {
 namespace {
@@ -172,8 +173,7 @@ void sendDocument(const std::string& document) {
 class NewNotifications {
  public:
   explicit NewNotifications(const DeviceDirectory& directory)
-      : _file(directory.hostPath("outbox/notifications.jsonl")),
-        _seen(contentIfThere(_file).size()) {}
+      : _file(directory.hostPath(kNotificationsFile)), _seen(contentIfThere(_file).size()) {}
 
   /// Waits for one of that name, but not for ever.
   bool await(std::string_view name) const {
@@ -199,7 +199,7 @@ class NewNotifications {
     return isThere;
   }
 
-  std::string _file;
+  HostPath _file;
   std::size_t _seen;
 };
 

@@ -73,12 +73,12 @@ std::vector<Line> linesOf(const std::string& file, const Wanted& wanted) {
 template <typename Show>
 void showLines(const DeviceDirectory& directory, const char* kind, const char* name,
                const Wanted& wanted, Show show) {
-  const std::string file = directory.hostPath(std::string("outbox/") + name);
+  const HostPath file = directory.hostPath(std::string("outbox/") + name);
   for (const auto& [number, members] : linesOf(file, wanted)) {
     if (!members) {
       const std::string fault = "line " + std::to_string(number) + " cannot be read";
       if (invocation().json) {
-        complain(file + ": " + fault);
+        complain(file.string() + ": " + fault);
       } else {
         std::cout << '(' << fault << ")\n";
       }
@@ -165,13 +165,17 @@ void showText(const std::string& content, bool inFull) {
   }
 }
 
-void showLog(const std::filesystem::path& file, bool inFull) {
-  std::cout << printableText(file.filename().string()) << '\n';
-  const auto content = orFail([&](std::string& error) { return readWholeFile(file, error); });
-  const std::filesystem::path header =
-      std::filesystem::path(file).replace_extension(".header.json");
+HostPath headerOf(const HostPath& log) {
+  return log.folder().below(
+      std::filesystem::path(log.name()).replace_extension(".header.json").string());
+}
+
+void showLog(const HostPath& path, bool inFull) {
+  const std::filesystem::path file = path.name();
+  std::cout << printableText(path.name()) << '\n';
+  const auto content = orFail([&](std::string& error) { return readWholeFile(path, error); });
   std::string error;
-  if (const std::optional<std::string> text = readWholeFile(header, error)) {
+  if (const std::optional<std::string> text = readWholeFile(headerOf(path), error)) {
     const std::optional<PropertyValue> value = valueFromJsonText(*text, error);
     std::cout << "  header     " << printableText(value ? textForm(*value) : error) << '\n';
   }
@@ -187,48 +191,49 @@ void showLog(const std::filesystem::path& file, bool inFull) {
   }
 }
 
-void printLog(const std::filesystem::path& file) {
+void printLog(const HostPath& path) {
+  const std::filesystem::path file = path.name();
   Json header;
   Json document;
   Json text;
   std::string error;
-  if (const auto content =
-          readWholeFile(std::filesystem::path(file).replace_extension(".header.json"), error)) {
+  if (const auto content = readWholeFile(headerOf(path), error)) {
     header = jsonOrNull(valueFromJsonText(*content, error));
   }
-  const auto content = orFail([&](std::string& why) { return readWholeFile(file, why); });
+  const auto content = orFail([&](std::string& why) { return readWholeFile(path, why); });
   if (file.extension() == ".ptree") {
     const std::optional<PropertyValue> log = readPtree(*content, error);
     document = jsonOrNull(log);
     if (!log) {
-      complain(file.filename().string() + ": " + error);
+      complain(path.name() + ": " + error);
     }
   } else {
     text = *content;
   }
   printJson({{"kind", "log"},
-             {"name", file.filename().string()},
+             {"name", path.name()},
              {"header", std::move(header)},
              {"document", std::move(document)},
              {"text", std::move(text)}});
 }
 
+constexpr struct stat kNoFile {};
+
 /// By number.
-std::vector<std::filesystem::path> submittedFiles(const DeviceDirectory& directory,
-                                                  const Wanted& wanted) {
-  std::vector<std::pair<std::uint64_t, std::filesystem::path>> numbered;
+std::vector<HostPath> submittedFiles(const DeviceDirectory& directory, const Wanted& wanted) {
+  std::vector<std::pair<std::uint64_t, HostPath>> numbered;
   for (const std::string& name : namesOfLogs(directory)) {
-    const std::filesystem::path file = directory.hostPath("outbox/logs/" + name);
-    struct stat status {};
+    const std::filesystem::path file = name;
+    const HostPath path = directory.hostPath("outbox/logs/" + name);
     if (name.front() != '.' && (file.extension() == ".ptree" || file.extension() == ".log") &&
         (!wanted.since ||
-         (lstat(file.c_str(), &status) == 0 && status.st_mtim.tv_sec >= wanted.since->seconds))) {
-      numbered.emplace_back(logNumber(name).value_or(0), file);
+         path.status().value_or(kNoFile).st_mtim.tv_sec >= wanted.since->seconds)) {
+      numbered.emplace_back(logNumber(name).value_or(0), path);
     }
   }
   std::ranges::stable_sort(numbered, {}, [](const auto& log) { return log.first; });
   wanted.keepLast(numbered);
-  std::vector<std::filesystem::path> files;
+  std::vector<HostPath> files;
   for (auto& [number, file] : numbered) {
     files.push_back(std::move(file));
   }

@@ -1,42 +1,20 @@
 #pragma once
 
-#include <cstdint>
 #include <functional>
 #include <span>
 #include <string>
-#include <string_view>
 #include <vector>
 
-#include "common/PropertyDict.h"
-#include "platform/host/device/DeviceDirectory.h"
+#include "platform/host/outbox/DailyLogs.h"
 
 namespace vesprun {
 
-/// A submitted daily log in the outbox.
-struct SubmittedLog {
-  std::string name;           ///< of its file
-  std::int32_t day = 0;       ///< that it reports
-  std::int64_t revision = 0;  ///< of that day, from 1
-  bool isNoted = false;       ///< as removed, by a command that was killed before the removal
-  PropertyDict document;
-};
-
-/// A file with the name of a daily log that is not one.
-struct UnreadableLog {
-  std::string name;
-  std::string why;
-  bool wasRead;  ///< and so will never be one; else it may be read another time
-};
+using SubmittedLog = DailyLog;
 
 /// The names in the folder of submitted logs. Throws `CommandFailure` when it cannot be read.
 std::vector<std::string> namesOfLogs(const DeviceDirectory& directory);
 
-/// True for the names that daily logs have.
-bool isDailyLogName(std::string_view name);
-
-/// Calls `take` with the daily logs in the outbox, by number. A log's revision is one more than the
-/// highest of its day so far, pruned logs included. Returns the files that are no daily logs.
-/// Throws `CommandFailure` when the outbox cannot be read.
+/// As `forEachDailyLog`; throws `CommandFailure` when the outbox cannot be read.
 std::vector<UnreadableLog> forEachSubmittedLog(const DeviceDirectory& directory,
                                                const std::function<void(SubmittedLog&& log)>& take);
 

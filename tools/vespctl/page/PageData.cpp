@@ -8,8 +8,9 @@
 #include "common/Calendar.h"
 #include "common/TextForm.h"
 #include "page/Html.h"
-#include "platform/host/device/LogNumbers.h"
 #include "platform/host/files/Files.h"
+#include "platform/host/outbox/LogName.h"
+#include "platform/host/outbox/OutboxFiles.h"
 
 namespace vesprun {
 namespace {
@@ -66,24 +67,21 @@ void PageData::takeDays() {
 }
 
 void PageData::takeLogs(const DeviceDirectory& directory) {
-  constexpr std::string_view kEnd = ".log";
   std::uint64_t newest = 0;
   for (const std::string& name : namesOfLogs(directory)) {
-    const std::optional<std::uint64_t> number = logNumber(name);
-    if (!number || !name.ends_with(kEnd)) {
+    const std::optional<LogName> log = LogName::parse(name);
+    if (!log || log->end != LogName::End::Text) {
       continue;
     }
-    std::string_view kind = name;
-    kind.remove_prefix(name.find('-') + 1);
-    kind.remove_suffix(kEnd.size());
+    const std::string_view kind = log->kind();
     ++others["log " + std::string(kind)];
-    if (!kind.starts_with("165-") || *number < newest) {
+    if (!kind.starts_with("165-") || log->number < newest) {
       continue;
     }
     std::string error;
-    if (const auto content = readWholeFile(directory.hostPath("outbox/logs/" + name), error)) {
+    if (const auto content = readWholeFile(directory.hostPath(kLogFolder).below(name), error)) {
       storageLog = parseStorageLog(name, *content);
-      newest = *number;
+      newest = log->number;
     } else {
       unreadable.push_back({name, error, false});
     }
@@ -91,9 +89,9 @@ void PageData::takeLogs(const DeviceDirectory& directory) {
 }
 
 template <typename Take>
-void PageData::takeLines(const DeviceDirectory& directory, const std::string& name, Take take) {
+void PageData::takeLines(const DeviceDirectory& directory, std::string_view file, Take take) {
   std::size_t malformed = 0;
-  forEachLine(contentIfThere(directory.hostPath("outbox/" + name)), [&](const PropertyDict* line) {
+  forEachLine(contentIfThere(directory.hostPath(file)), [&](const PropertyDict* line) {
     if (line != nullptr) {
       take(*line);
     } else {
@@ -101,7 +99,8 @@ void PageData::takeLines(const DeviceDirectory& directory, const std::string& na
     }
   });
   if (malformed > 0) {
-    unreadable.push_back({name, countedNoun(malformed, "line") + " cannot be read", true});
+    unreadable.push_back({HostPath(std::string(file)).name(),
+                          countedNoun(malformed, "line") + " cannot be read", true});
   }
 }
 
@@ -134,8 +133,8 @@ PageData::PageData(const DeviceDirectory& directory) {
       directory, [this](SubmittedLog&& log) { submitted.push_back(std::move(log)); });
   takeDays();
   takeLogs(directory);
-  takeLines(directory, "events.jsonl", [this](const PropertyDict& line) { takeEvent(line); });
-  takeLines(directory, "records.jsonl", [this](const PropertyDict& line) { takeRecord(line); });
+  takeLines(directory, kEventsFile, [this](const PropertyDict& line) { takeEvent(line); });
+  takeLines(directory, kRecordsFile, [this](const PropertyDict& line) { takeRecord(line); });
 }
 
 }  // namespace vesprun

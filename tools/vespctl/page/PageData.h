@@ -62,7 +62,7 @@ struct PageData {
   void takeDays();
   void takeLogs(const DeviceDirectory& directory);
   template <typename Take>
-  void takeLines(const DeviceDirectory& directory, const std::string& name, Take take);
+  void takeLines(const DeviceDirectory& directory, std::string_view file, Take take);
   void takeEvent(const PropertyDict& line);
   void takeRecord(const PropertyDict& line);
 };

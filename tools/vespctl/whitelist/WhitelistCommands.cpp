@@ -43,7 +43,7 @@ Input readWhitelist(const std::string& file) {
 
 Input readOwnWhitelist() {
   const ReadOnlyDevice opened;
-  const std::string path = opened.device->directory().hostPath(TBConfig::path());
+  const HostPath path = opened.device->directory().hostPath(TBConfig::path());
   std::string bytes = *orFail([&](std::string& error) { return readWholeFile(path, error); });
   WhitelistDocument document = parse(path, bytes);
   return {path, std::move(bytes), std::move(document), platform().tallybook().TBDaysSince1970()};

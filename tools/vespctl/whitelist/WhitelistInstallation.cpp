@@ -44,7 +44,7 @@ bool installWhitelist(const DeviceDirectory& directory, std::string_view documen
     if (!replaceWithAccessOf(access, *folder, previousName, *before, error)) {
       return false;
     }
-    previous = directory.hostPath(TBConfig::path()) + ".previous";
+    previous = directory.hostPath(TBConfig::path()).string() + ".previous";
   }
   return replaceWithAccessOf(access, *folder, name, document, error);
 }

@@ -5,8 +5,10 @@
 #include <algorithm>
 #include <array>
 #include <cerrno>
-#include <cstdio>
+#include <charconv>
+#include <map>
 #include <string_view>
+#include <utility>
 
 #include "platform/host/files/AtomicFile.h"
 #include "platform/host/files/Files.h"
@@ -20,6 +22,8 @@ constexpr const char* kName = "TBDataStore.sqlitedb";
 // SQLite's companion files. We use only the first; other tools may enable the rest.
 constexpr std::array kCompanions{"-journal", "-wal", "-shm"};
 
+constexpr const char* kWhyAside = "corrupt";
+
 constexpr int kMostAttempts = 3;
 
 CounterTrouble troubleOf(const SqliteFailure& failure) {
@@ -29,10 +33,7 @@ CounterTrouble troubleOf(const SqliteFailure& failure) {
                                                   : CounterTrouble::Other;
 }
 
-bool exists(const std::string& path) {
-  struct stat status {};
-  return lstat(path.c_str(), &status) == 0;
-}
+bool exists(const HostPath& path) { return path.status() || errno != ENOENT; }
 
 }  // namespace
 
@@ -58,17 +59,17 @@ bool CounterFile::read(const std::function<void(CounterStore&)>& work, std::stri
 bool CounterFile::use(CounterStore::Access access, const std::function<bool(CounterStore&)>& work,
                       std::string& error, std::optional<Damage>& damage, CounterTrouble& trouble) {
   const bool writes = access == CounterStore::Access::Writing;
-  const std::string folder = _directory.hostPath(kFolder);
+  const HostPath folder = _directory.hostPath(kFolder);
   if (writes && _directory.isReadOnly()) {
     _directory.makeFolder(kFolder, error);  // which says why not
     return false;
   }
-  const std::string path = folder + '/' + kName;
-  struct stat status {};
+  const HostPath path = folder.below(kName);
+  std::optional<struct stat> status;
   std::optional<FileDescriptor> shared;
   // Between making and locking, another process may move the new file away.
   for (int attempt = 1; !shared; ++attempt) {
-    if (stat(path.c_str(), &status) != 0 && errno == ENOENT) {
+    if (!(status = path.status()) && errno == ENOENT) {
       if (!writes) {
         return true;
       }
@@ -82,7 +83,7 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
       trouble = isBusy ? CounterTrouble::Busy : CounterTrouble::Other;
       return false;
     }
-    if (stat(path.c_str(), &status) != 0) {
+    if (!(status = path.status())) {
       if (errno != ENOENT || attempt == kMostAttempts) {
         error = systemError(path);
         return false;
@@ -90,15 +91,16 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
       shared.reset();
     }
   }
-  if (!S_ISREG(status.st_mode)) {
-    error = path + ": not a regular file";
+  if (!S_ISREG(status->st_mode)) {
+    error = path.string() + ": not a regular file";
     return false;
   }
   // SQLite would wait at a pipe for ever.
   for (const char* companion : kCompanions) {
-    struct stat beside {};
-    if (stat((path + companion).c_str(), &beside) == 0 && !S_ISREG(beside.st_mode)) {
-      error = path + companion + ": not a regular file";
+    const HostPath besidePath = folder.below(std::string(kName) + companion);
+    const std::optional<struct stat> beside = besidePath.status();
+    if ((beside && !S_ISREG(beside->st_mode)) || (!beside && errno == ELOOP)) {
+      error = besidePath.string() + ": not a regular file";
       return false;
     }
   }
@@ -126,14 +128,14 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
     error = failure.text;
     trouble = troubleOf(failure);
     if (failure.isCorruption() && !_directory.isReadOnly()) {
-      damage = Damage{status.st_dev, status.st_ino, failure.text};
+      damage = Damage{status->st_dev, status->st_ino, failure.text};
     }
     return false;
   }
 }
 
 bool CounterFile::make(std::string& error, CounterTrouble& trouble) {
-  const std::optional<std::string> folder = _directory.makeFolder(kFolder, error);
+  const std::optional<HostPath> folder = _directory.makeFolder(kFolder, error);
   if (!folder) {
     return false;
   }
@@ -151,17 +153,18 @@ bool CounterFile::make(std::string& error, CounterTrouble& trouble) {
 
 // The file gets its name complete, so an empty one is never ours.
 bool CounterFile::makeLocked(std::string& error) {
-  const std::string folder = _directory.hostPath(kFolder);
-  const std::string path = folder + '/' + kName;
+  const HostPath folder = _directory.hostPath(kFolder);
+  const HostPath path = folder.below(kName);
   if (exists(path)) {
     return true;
   }
   // The journal of a lost file would be replayed into the new one.
+  removeLeftOvers(folder);
   const std::string aside = unusedNameAside();
   for (const char* companion : kCompanions) {
-    if (std::rename((path + companion).c_str(), (aside + companion).c_str()) != 0 &&
-        errno != ENOENT) {
-      error = systemError(path + companion);
+    const HostPath left = folder.below(std::string(kName) + companion);
+    if (!renameFile(left, aside + companion) && errno != ENOENT) {
+      error = systemError(left);
       return false;
     }
   }
@@ -181,25 +184,25 @@ bool CounterFile::makeLocked(std::string& error) {
 }
 
 std::optional<std::string> CounterFile::replace(const Damage& damage, std::string& error) {
-  const std::string folder = _directory.hostPath(kFolder);
-  const std::string path = folder + '/' + kName;
+  const HostPath folder = _directory.hostPath(kFolder);
+  const HostPath path = folder.below(kName);
   const auto exclusive = lockFolder(folder, error, LOCK_EX, _longestWait);
   if (!exclusive) {
     return std::nullopt;
   }
   std::string aside;
-  struct stat status {};
-  if (stat(path.c_str(), &status) == 0 && status.st_dev == damage.device &&
-      status.st_ino == damage.number) {
+  const std::optional<struct stat> status = path.status();
+  if (status && status->st_dev == damage.device && status->st_ino == damage.number) {
     aside = unusedNameAside();
     // The file first: if we are killed here, its journal is moved aside later.
-    if (std::rename(path.c_str(), aside.c_str()) != 0) {
+    if (!renameFile(path, aside)) {
       error = systemError(path);
       return std::nullopt;
     }
     for (const char* companion : kCompanions) {
-      std::rename((path + companion).c_str(), (aside + companion).c_str());
+      renameFile(folder.below(std::string(kName) + companion), aside + companion);
     }
+    aside = folder.below(aside);
   }
   if (!makeLocked(error)) {
     return std::nullopt;
@@ -208,17 +211,58 @@ std::optional<std::string> CounterFile::replace(const Damage& damage, std::strin
 }
 
 std::string CounterFile::unusedNameAside() const {
-  const std::string aside =
-      nameAside(_directory.hostPath(kFolder) + '/' + kName, "corrupt", _clock);
+  const HostPath folder = _directory.hostPath(kFolder);
+  const std::string aside = nameAside(kName, kWhyAside, _clock);
   std::string name = aside;
-  const auto isTaken = [&name] {
-    return exists(name) || std::any_of(kCompanions.begin(), kCompanions.end(),
-                                       [&](const char* end) { return exists(name + end); });
+  const auto isTaken = [&] {
+    return exists(folder.below(name)) ||
+           std::any_of(kCompanions.begin(), kCompanions.end(),
+                       [&](const char* end) { return exists(folder.below(name + end)); });
   };
   for (int number = 2; isTaken(); ++number) {
     name = aside + '-' + std::to_string(number);
   }
   return name;
+}
+
+bool removeOldDamaged(const DeviceDirectory& directory, const Date& time, std::string& error) {
+  const std::string begin = std::string(kName) + '.' + kWhyAside + '-';
+  const HostPath folder = directory.hostPath(kFolder);
+  const auto names = namesInFolder(folder, error);
+  if (!names) {
+    return false;
+  }
+  // A time and, in one second, a number.
+  using Place = std::pair<std::string, int>;
+  std::map<std::string, Place> places;
+  Place newest;
+  for (const std::string& name : *names) {
+    if (!name.starts_with(begin)) {
+      continue;
+    }
+    std::string_view rest = std::string_view(name).substr(begin.size());
+    const bool isCompanion = std::ranges::any_of(kCompanions, [&](std::string_view end) {
+      const bool ends = rest.ends_with(end);
+      rest.remove_suffix(ends ? end.size() : 0);
+      return ends;
+    });
+    const std::size_t dash = rest.find('-');
+    Place place{rest.substr(0, dash), 1};
+    if (dash != std::string_view::npos) {
+      std::from_chars(rest.data() + dash + 1, rest.data() + rest.size(), place.second);
+    }
+    newest = isCompanion ? newest : std::max(newest, place);
+    places.emplace(name, std::move(place));
+  }
+  const std::string oldest = timeInName(time);
+  for (const auto& [name, place] : places) {
+    const HostPath path = folder.below(name);
+    if ((place < newest || place.first < oldest) && !removeFile(path) && errno != ENOENT) {
+      error = systemError(path);
+      return false;
+    }
+  }
+  return true;
 }
 
 }  // namespace vesprun

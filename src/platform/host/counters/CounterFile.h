@@ -63,4 +63,8 @@ class CounterFile {
   std::chrono::milliseconds _longestWait;
 };
 
+/// Removes the damaged databases that were moved aside, with their journals, but the newest; and
+/// that one, too, when it was moved before `time`. False, with a text in `error`, on failure.
+bool removeOldDamaged(const DeviceDirectory& directory, const Date& time, std::string& error);
+
 }  // namespace vesprun

@@ -303,23 +303,31 @@ void CounterStore::readDistributions(std::string_view keyPrefix, std::int32_t mi
              });
 }
 
-CounterStore::Removed CounterStore::removeBefore(std::int64_t day) {
-  Removed removed;
+CounterStore::Rows CounterStore::rowsBefore(std::int64_t day) {
+  Rows rows;
   SqliteStatement days(_connection,
                        "SELECT day FROM scalar WHERE day < ?1 UNION "
                        "SELECT day FROM distribution WHERE day < ?1 ORDER BY day");
   for (days.bind(1, day); days.step();) {
-    removed.days.push_back(static_cast<std::int32_t>(days.integer(0)));
+    rows.days.push_back(static_cast<std::int32_t>(days.integer(0)));
   }
-  days.reset();
-  const auto remove = [&](const char* sql) {
-    SqliteStatement(_connection, sql).bind(1, day).run();
-    return std::int64_t{sqlite3_changes(_connection.handle())};
+  const auto count = [&](const char* sql) {
+    SqliteStatement counting(_connection, sql);
+    return counting.bind(1, day).step() ? counting.integer(0) : 0;
   };
-  remove("DELETE FROM chunk WHERE distribution IN (SELECT id FROM distribution WHERE day < ?)");
-  removed.distributions = remove("DELETE FROM distribution WHERE day < ?");
-  removed.scalars = remove("DELETE FROM scalar WHERE day < ?");
-  return removed;
+  rows.distributions = count("SELECT count(*) FROM distribution WHERE day < ?");
+  rows.scalars = count("SELECT count(*) FROM scalar WHERE day < ?");
+  return rows;
+}
+
+CounterStore::Rows CounterStore::removeBefore(std::int64_t day) {
+  Rows rows = rowsBefore(day);
+  for (const char* const sql :
+       {"DELETE FROM chunk WHERE distribution IN (SELECT id FROM distribution WHERE day < ?)",
+        "DELETE FROM distribution WHERE day < ?", "DELETE FROM scalar WHERE day < ?"}) {
+    SqliteStatement(_connection, sql).bind(1, day).run();
+  }
+  return rows;
 }
 
 void CounterStore::giveRoomBack() {

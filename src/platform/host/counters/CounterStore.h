@@ -72,15 +72,17 @@ class CounterStore {
   void readDistributions(std::string_view keyPrefix, std::int32_t minDay, std::int32_t maxDay,
                          const TBHistory::DistributionRowHandler& handler);
 
-  /// What `removeBefore` removed.
-  struct Removed {
+  struct Rows {
     std::vector<std::int32_t> days;  ///< ascending
     std::int64_t scalars = 0;
     std::int64_t distributions = 0;
   };
 
-  /// Removes the rows of all days before `day`.
-  Removed removeBefore(std::int64_t day);
+  /// How many rows there are of days before `day`.
+  Rows rowsBefore(std::int64_t day);
+
+  /// Removes these rows.
+  Rows removeBefore(std::int64_t day);
 
   /// Gives the room that removed rows left back to the file system. A file that was made without
   /// room for the means to do so is written anew, for which all that was done before is committed.

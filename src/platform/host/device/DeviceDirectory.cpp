@@ -1,6 +1,7 @@
 #include "platform/host/device/DeviceDirectory.h"
 
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <cerrno>
 
@@ -9,9 +10,13 @@
 namespace vesprun {
 namespace {
 
-bool isFolder(const std::string& path) {
-  struct stat status {};
-  return stat(path.c_str(), &status) == 0 && S_ISDIR(status.st_mode);
+/// Otherwise `errno` says why not.
+bool isFolder(const HostPath& path) {
+  const std::optional<struct stat> status = path.status();
+  if (status && !S_ISDIR(status->st_mode)) {
+    errno = EEXIST;
+  }
+  return status && S_ISDIR(status->st_mode);
 }
 
 }  // namespace
@@ -36,27 +41,29 @@ DeviceDirectory DeviceDirectory::readOnly() const {
   return directory;
 }
 
-std::string DeviceDirectory::hostPath(std::string_view devicePath) const {
+HostPath DeviceDirectory::hostPath(std::string_view devicePath) const {
   while (!devicePath.empty() && devicePath.front() == '/') {
     devicePath.remove_prefix(1);
   }
-  return _path + '/' + std::string(devicePath);
+  return HostPath(_path).below(devicePath);
 }
 
-std::optional<std::string> DeviceDirectory::makeFolder(std::string_view devicePath,
-                                                       std::string& error) const {
-  const std::string folder = hostPath(devicePath);
+std::optional<HostPath> DeviceDirectory::makeFolder(std::string_view devicePath,
+                                                    std::string& error) const {
+  const HostPath folder = hostPath(devicePath);
   if (_isReadOnly) {
-    error = folder + ": the device is only looked at";
+    error = folder.string() + ": the device is only looked at";
     return std::nullopt;
   }
   if (isFolder(folder)) {
     return folder;
   }
   for (std::size_t end = _path.size(); end != std::string::npos;) {
-    end = folder.find('/', end + 1);
-    const std::string part = folder.substr(0, end);
-    if (mkdir(part.c_str(), 0700) != 0 && (errno != EEXIST || !isFolder(part))) {
+    end = folder.string().find('/', end + 1);
+    const HostPath part = hostPath(folder.string().substr(0, end).substr(_path.size()));
+    const FileDescriptor above = openFolder(part.folder());
+    const bool isMade = above.isOpen() && mkdirat(above.get(), part.name().c_str(), 0700) == 0;
+    if ((isMade && fsync(above.get()) != 0) || (!isMade && (errno != EEXIST || !isFolder(part)))) {
       error = systemError(part);
       return std::nullopt;
     }

@@ -4,6 +4,8 @@
 #include <string>
 #include <string_view>
 
+#include "platform/host/files/HostPath.h"
+
 namespace vesprun {
 
 /// The folder of one device. Everything in it is its owner's alone.
@@ -19,13 +21,14 @@ class DeviceDirectory {
   /// Without a final slash.
   const std::string& path() const { return _path; }
 
-  /// The host path of a device path ("/var/mobile/...", or relative to its root).
-  std::string hostPath(std::string_view devicePath) const;
+  /// The host path of a device path ("/var/mobile/...", or relative to its root). No link in it is
+  /// followed.
+  HostPath hostPath(std::string_view devicePath) const;
 
-  /// The host path of a device folder, which is created with those above it if missing. Nothing,
-  /// with a text in `error`, on failure. All writing into a folder begins here, so that a read-only
-  /// device need only refuse it here.
-  std::optional<std::string> makeFolder(std::string_view devicePath, std::string& error) const;
+  /// The host path of a device folder, which is created, durably, with those above it if missing.
+  /// Nothing, with a text in `error`, on failure. All writing into a folder begins here, so that a
+  /// read-only device need only refuse it here.
+  std::optional<HostPath> makeFolder(std::string_view devicePath, std::string& error) const;
 
  private:
   explicit DeviceDirectory(std::string path) : _path(std::move(path)) {}

@@ -13,14 +13,14 @@
 
 namespace vesprun {
 
-ECCEventQueue::Outcome ECCEventQueue::take(const std::string& path, std::span<std::uint8_t> buffer,
+ECCEventQueue::Outcome ECCEventQueue::take(const HostPath& path, std::span<std::uint8_t> buffer,
                                            std::string& error) {
   const auto failed = [&](Outcome outcome) {
     error = systemError(path);
     return outcome;
   };
   // A pipe must not block the reader.
-  FileDescriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
+  FileDescriptor file = path.open(O_RDONLY | O_NONBLOCK);
   if (!file.isOpen()) {
     const bool lasts = errno == EACCES || errno == EPERM || errno == ELOOP || errno == ENXIO;
     return errno == ENOENT ? Outcome::Skipped : failed(lasts ? Outcome::Unusable : Outcome::Failed);
@@ -36,10 +36,10 @@ ECCEventQueue::Outcome ECCEventQueue::take(const std::string& path, std::span<st
     return Outcome::Skipped;  // removed by the earlier holder of the lock
   }
   if (!S_ISREG(status.st_mode) || status.st_size != kEventLength) {
-    error = path + (S_ISREG(status.st_mode)
-                        ? ": " + std::to_string(status.st_size) +
-                              " bytes are not an ECC event of " + std::to_string(kEventLength)
-                        : ": not a regular file");
+    error = path.string() + (S_ISREG(status.st_mode) ? ": " + std::to_string(status.st_size) +
+                                                           " bytes are not an ECC event of " +
+                                                           std::to_string(kEventLength)
+                                                     : ": not a regular file");
     return Outcome::Unusable;
   }
   const ssize_t count = pread(file.get(), buffer.data(), kEventLength, 0);
@@ -56,7 +56,7 @@ int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length)
   if (_directory.isReadOnly()) {
     return EROFS;
   }
-  const std::string folder = _directory.hostPath("kernel/ecc");
+  const HostPath folder = _directory.hostPath("kernel/ecc");
   std::string error;
   const std::optional<std::vector<std::string>> names = namesInFolder(folder, error);
   if (!names) {
@@ -70,7 +70,7 @@ int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length)
     if (buffer.size() != kEventLength) {
       return EINVAL;
     }
-    const std::string path = folder + '/' + name;
+    const HostPath path = folder.below(name);
     const Outcome outcome = take(path, buffer, error);
     if (outcome == Outcome::Taken) {
       length = kEventLength;
@@ -80,8 +80,7 @@ int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length)
       continue;
     }
     _log.write(LogLevel::Error, error);
-    if (outcome == Outcome::Failed ||
-        !isGone(path, std::rename(path.c_str(), (path + ".unusable").c_str()))) {
+    if (outcome == Outcome::Failed || !isGone(path, renameFile(path, name + ".unusable"))) {
       return EIO;
     }
   }
@@ -90,11 +89,11 @@ int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length)
 
 bool ECCEventQueue::removeTaken() {
   const FileDescriptor taken = std::exchange(_taken, FileDescriptor());
-  return !taken.isOpen() || isGone(_takenPath, unlink(_takenPath.c_str()));
+  return !taken.isOpen() || isGone(_takenPath, removeFile(_takenPath));
 }
 
-bool ECCEventQueue::isGone(const std::string& path, int result) {
-  if (result == 0 || errno == ENOENT) {
+bool ECCEventQueue::isGone(const HostPath& path, bool isDone) {
+  if (isDone || errno == ENOENT) {
     return true;
   }
   _log.write(LogLevel::Error, systemError(path));

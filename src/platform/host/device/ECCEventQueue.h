@@ -36,13 +36,13 @@ class ECCEventQueue {
  private:
   enum class Outcome { Taken, Skipped, Unusable, Failed };
 
-  Outcome take(const std::string& path, std::span<std::uint8_t> buffer, std::string& error);
+  Outcome take(const HostPath& path, std::span<std::uint8_t> buffer, std::string& error);
   /// After a call that takes the path away, by its result and `errno`; else logs why not.
-  bool isGone(const std::string& path, int result);
+  bool isGone(const HostPath& path, bool isDone);
 
   const DeviceDirectory& _directory;
   SystemLog& _log;
-  std::string _takenPath;
+  HostPath _takenPath{""};
   FileDescriptor _taken;  ///< holds the lock of its file
 };
 

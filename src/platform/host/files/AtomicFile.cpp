@@ -2,22 +2,35 @@
 
 #include <fcntl.h>
 #include <sys/file.h>
+#include <sys/random.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <array>
 #include <cerrno>
+#include <cstdint>
 #include <cstring>
 #include <utility>
+
+#include "common/TextForm.h"
 
 namespace vesprun {
 namespace {
 
 constexpr mode_t kOwnerOnly = 0600;
 constexpr std::size_t kWrittenPiece = 64 * 1024;
-constexpr int kMostUnfinished = 100;
+constexpr std::string_view kUnfinished = ".unfinished-";
 
-bool sync(const FileDescriptor& folder, const std::string& path, std::string& error) {
-  const bool synced = folder.isOpen() && fsync(folder.get()) == 0;
+/// A name that nobody can have taken before.
+std::string unfinishedName() {
+  std::array<std::uint8_t, 8> random{};
+  return getrandom(random.data(), random.size(), 0) == static_cast<ssize_t>(random.size())
+             ? std::string(kUnfinished) + hexadecimalText(random)
+             : "";
+}
+
+bool sync(const FileDescriptor& file, const std::string& path, std::string& error) {
+  const bool synced = file.isOpen() && fsync(file.get()) == 0;
   if (!synced) {
     error = systemError(path);
   }
@@ -32,7 +45,7 @@ AtomicFile::~AtomicFile() {
   }
 }
 
-std::optional<AtomicFile> AtomicFile::create(const std::string& folder, std::string& error) {
+std::optional<AtomicFile> AtomicFile::create(const HostPath& folder, std::string& error) {
   AtomicFile file(folder, openFolder(folder));
   if (!file._folderDescriptor.isOpen()) {
     error = systemError(folder);
@@ -49,36 +62,27 @@ std::optional<AtomicFile> AtomicFile::create(const std::string& folder, std::str
 }
 
 bool AtomicFile::openUnfinished(std::string& error) {
-  for (int number = 1; number <= kMostUnfinished; ++number) {
-    const std::string name = ".unfinished-" + std::to_string(number);
+  constexpr int kMaxAttempts = 10;
+  for (int attempt = 0; attempt < kMaxAttempts; ++attempt) {
+    const std::string name = unfinishedName();
     FileDescriptor file(openat(_folderDescriptor.get(), name.c_str(),
-                               O_CREAT | O_WRONLY | O_CLOEXEC | O_NOFOLLOW, kOwnerOnly));
+                               O_CREAT | O_EXCL | O_WRONLY | O_CLOEXEC | O_NOFOLLOW, kOwnerOnly));
     if (!file.isOpen()) {
-      error = systemError(pathOf(name));
+      error = systemError(_folder);
       return false;
     }
-    // Its writer holds the lock while it lives; a file without one is left from a kill and
-    // overwritten. Between open and lock the name may have gone to another file.
+    // Its writer holds the lock while it lives. Before it has the lock, someone may take the file
+    // for a left-over.
     struct stat opened {};
-    struct stat named {};
-    if (flock(file.get(), LOCK_EX | LOCK_NB) != 0 || fstat(file.get(), &opened) != 0 ||
-        fstatat(_folderDescriptor.get(), name.c_str(), &named, AT_SYMLINK_NOFOLLOW) != 0 ||
-        opened.st_ino != named.st_ino) {
-      continue;
+    if (flock(file.get(), LOCK_EX | LOCK_NB) == 0 && fstat(file.get(), &opened) == 0 &&
+        opened.st_nlink != 0) {
+      _file = std::move(file);
+      _unfinishedName = name;
+      return true;
     }
-    if (opened.st_nlink != 1) {  // killed after the document got its name
-      unlinkat(_folderDescriptor.get(), name.c_str(), 0);
-      continue;
-    }
-    if (ftruncate(file.get(), 0) != 0) {
-      error = systemError(pathOf(name));
-      return false;
-    }
-    _file = std::move(file);
-    _unfinishedName = name;
-    return true;
+    unlinkat(_folderDescriptor.get(), name.c_str(), 0);
   }
-  error = _folder + ": too many documents are being written";
+  error = systemError(_folder);
   return false;
 }
 
@@ -146,6 +150,7 @@ bool AtomicFile::replace(const std::string& name, std::string& error) {
     return false;
   }
   _unfinishedName.clear();
+  removeLeftOvers(_folder);
   return sync(_folderDescriptor, _folder, error);
 }
 
@@ -170,19 +175,37 @@ AtomicFile::Added AtomicFile::addNew(const std::string& name, std::string& error
   return Added::Done;
 }
 
-bool replaceFile(const std::string& path, std::string_view content, std::string& error) {
-  const auto slash = path.rfind('/');
-  const std::string folder =
-      slash == std::string::npos ? "." : path.substr(0, slash == 0 ? 1 : slash);
-  std::optional<AtomicFile> file = AtomicFile::create(folder, error);
+void removeLeftOvers(const HostPath& folder) {
+  std::string ignored;
+  for (const std::string& name :
+       namesInFolder(folder, ignored).value_or(std::vector<std::string>())) {
+    if (!name.starts_with(kUnfinished)) {
+      continue;
+    }
+    const HostPath path = folder.below(name);
+    const FileDescriptor file = path.open(O_RDONLY | O_NONBLOCK);
+    struct stat status {};
+    if (file.isOpen() && fstat(file.get(), &status) == 0 && S_ISREG(status.st_mode) &&
+        status.st_uid == geteuid() && flock(file.get(), LOCK_EX | LOCK_NB) == 0) {
+      removeFile(path);
+    }
+  }
+}
+
+bool replaceFile(const HostPath& path, std::string_view content, std::string& error) {
+  std::optional<AtomicFile> file = AtomicFile::create(path.folder(), error);
   if (!file) {
     return false;
   }
   file->append(content);
-  return file->replace(path.substr(slash + 1), error);
+  return file->replace(path.name(), error);
 }
 
-bool flushFolder(const std::string& folder, std::string& error) {
+bool flushFile(const HostPath& path, std::string& error) {
+  return sync(path.open(O_RDONLY | O_NONBLOCK), path, error) && flushFolder(path.folder(), error);
+}
+
+bool flushFolder(const HostPath& folder, std::string& error) {
   return sync(openFolder(folder), folder, error);
 }
 

@@ -11,15 +11,14 @@
 
 namespace vesprun {
 
-/// A document on its way into a folder as ".unfinished-N". It appears under its own name complete
-/// and durable, or not at all; destroying the object first drops it. A later document overwrites
-/// what a killed process left.
+/// A document on its way into a folder as ".unfinished-RANDOM". It appears under its own name
+/// complete and durable, or not at all; destroying the object first drops it.
 ///
 /// Files are readable and writable for their owner alone. Errors name the path and the cause.
 class AtomicFile {
  public:
   /// The folder must exist.
-  static std::optional<AtomicFile> create(const std::string& folder, std::string& error);
+  static std::optional<AtomicFile> create(const HostPath& folder, std::string& error);
 
   AtomicFile(AtomicFile&&) = default;
   AtomicFile& operator=(AtomicFile&&) = delete;
@@ -35,8 +34,8 @@ class AtomicFile {
   /// Instead of the moment of the last byte, where the file system can keep it.
   void setModificationTime(const Date& time) { _modified = time; }
 
-  /// Gives the document its name, replacing the file that has it. On failure the earlier file is
-  /// still there, unless only making the new name durable failed.
+  /// Gives the document its name, replacing the file that has it, and removes left-overs. On
+  /// failure the earlier file is still there, unless only making the new name durable failed.
   bool replace(const std::string& name, std::string& error);
 
   enum class Added { Done, NameTaken, Failed };
@@ -46,15 +45,15 @@ class AtomicFile {
   Added addNew(const std::string& name, std::string& error);
 
  private:
-  AtomicFile(std::string folder, FileDescriptor descriptor)
+  AtomicFile(HostPath folder, FileDescriptor descriptor)
       : _folder(std::move(folder)), _folderDescriptor(std::move(descriptor)) {}
 
   bool openUnfinished(std::string& error);
   bool writeOut(std::string_view bytes);
   bool makeDurable(const std::string& name, std::string& error);
-  std::string pathOf(const std::string& name) const { return _folder + '/' + name; }
+  std::string pathOf(const std::string& name) const { return _folder.string() + '/' + name; }
 
-  std::string _folder;
+  HostPath _folder;
   FileDescriptor _folderDescriptor;
   FileDescriptor _file;
   std::string _unfinishedName;  ///< empty after the document got its own name
@@ -63,10 +62,17 @@ class AtomicFile {
   std::optional<Date> _modified;
 };
 
+/// Removes what killed processes left of their documents in a folder. To be called now and then
+/// where documents only get new names.
+void removeLeftOvers(const HostPath& folder);
+
 /// Replaces the file at `path` with a whole document.
-bool replaceFile(const std::string& path, std::string_view content, std::string& error);
+bool replaceFile(const HostPath& path, std::string_view content, std::string& error);
+
+/// Makes the content of a file durable, and its name.
+bool flushFile(const HostPath& path, std::string& error);
 
 /// Makes durable which names a folder has.
-bool flushFolder(const std::string& folder, std::string& error);
+bool flushFolder(const HostPath& folder, std::string& error);
 
 }  // namespace vesprun

@@ -5,29 +5,20 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
-#include <filesystem>
-#include <fstream>
 #include <utility>
+#include <vector>
 
 #include "platform/host/files/AtomicFile.h"
 
 namespace vesprun {
 
 bool JsonLines::open(std::string& error, int creating) {
-  // Opened for reading as well, to see how the last line ends, and without blocking, in case of a
-  // pipe. A link could lead out of the device.
-  FileDescriptor file(::open(
-      _path.c_str(), O_RDWR | O_APPEND | O_CLOEXEC | O_NONBLOCK | O_NOFOLLOW | creating, 0600));
-  struct stat status {};
-  if (!file.isOpen() || fstat(file.get(), &status) != 0 ||
-      ((status.st_mode & 0777) != 0600 && fchmod(file.get(), 0600) != 0)) {
-    error = errno == ELOOP ? _path + ": a symbolic link" : systemError(_path);
-    return false;
-  }
-  if (!S_ISREG(status.st_mode)) {
-    error = _path + ": not a regular file";
+  // Opened for reading as well, to see how the last line ends.
+  FileDescriptor file = openToChange(_path, O_RDWR | O_APPEND | creating, error);
+  if (!file.isOpen()) {
     return false;
   }
   _file = std::move(file);
@@ -36,7 +27,7 @@ bool JsonLines::open(std::string& error, int creating) {
 
 bool JsonLines::append(std::string line, std::string& error) {
   if (line.find('\n') != std::string::npos) {
-    error = _path + ": a line cannot hold a line feed";
+    error = _path.string() + ": a line cannot hold a line feed";
     return false;
   }
   const std::scoped_lock guard(_mutex);
@@ -49,24 +40,16 @@ bool JsonLines::append(std::string line, std::string& error) {
 }
 
 std::optional<std::uint64_t> JsonLines::remove(
-    const std::function<bool(std::string_view line)>& goes, std::string& error) {
+    const std::function<bool(std::string_view line)>& goes, std::string& error,
+    std::uint64_t maxBytes) {
   const std::scoped_lock guard(_mutex);
   errno = 0;
   if (!lock(error, 0)) {
     return errno == ENOENT ? std::optional<std::uint64_t>(0) : std::nullopt;
   }
-  const std::optional<std::uint64_t> removed = removeLocked(goes, error);
+  const std::optional<std::uint64_t> removed = removeLocked(goes, maxBytes, error);
   flock(_file.get(), LOCK_UN);
   return removed;
-}
-
-bool JsonLines::flush(std::string& error) {
-  const std::scoped_lock guard(_mutex);
-  if (!isNamed() || fsync(_file.get()) != 0) {
-    error = systemError(_path);
-    return false;
-  }
-  return flushFolder(std::filesystem::path(_path).parent_path(), error);
 }
 
 bool JsonLines::lock(std::string& error, int creating) {
@@ -111,7 +94,7 @@ bool JsonLines::appendLocked(std::string line, std::string& error) {
   if (written == static_cast<ssize_t>(line.size())) {
     return true;
   }
-  error = written < 0 ? systemError(_path) : _path + ": no room for a line";
+  error = written < 0 ? systemError(_path) : _path.string() + ": no room for a line";
   if (written > 0 && ftruncate(_file.get(), before.st_size) != 0) {
     error += ", and a part of it stays: ";
     error += std::strerror(errno);
@@ -120,27 +103,89 @@ bool JsonLines::appendLocked(std::string line, std::string& error) {
 }
 
 std::optional<std::uint64_t> JsonLines::removeLocked(
-    const std::function<bool(std::string_view line)>& goes, std::string& error) {
-  const std::filesystem::path path(_path);
-  std::optional<AtomicFile> kept = AtomicFile::create(path.parent_path(), error);
-  if (!kept) {
+    const std::function<bool(std::string_view line)>& goes, std::uint64_t maxBytes,
+    std::string& error) {
+  std::optional<AtomicFile> kept = AtomicFile::create(_path.folder(), error);
+  const auto keep = [&kept](std::string_view line) { kept->append(line); };
+  const std::optional<std::uint64_t> removed =
+      kept ? sort(_file.get(), goes, maxBytes, keep, error) : std::nullopt;
+  return removed.value_or(0) == 0 || kept->replace(_path.name(), error) ? removed : std::nullopt;
+}
+
+std::optional<std::uint64_t> JsonLines::countRemoved(
+    const std::function<bool(std::string_view line)>& goes, std::uint64_t& bytes,
+    std::string& error, std::uint64_t maxBytes) const {
+  const FileDescriptor file = _path.open(O_RDONLY | O_NONBLOCK);
+  struct stat status {};
+  if (!file.isOpen() && errno == ENOENT) {
+    return 0;
+  }
+  if (!file.isOpen() || fstat(file.get(), &status) != 0 || !S_ISREG(status.st_mode)) {
+    error = file.isOpen() ? _path.string() + ": not a regular file" : systemError(_path);
     return std::nullopt;
   }
-  std::ifstream stream(path);
-  std::uint64_t removed = 0;
-  for (std::string line; std::getline(stream, line);) {
-    if (goes(line)) {
-      ++removed;
-    } else {
-      kept->append(stream.eof() ? line : line + '\n');
-    }
-  }
-  if (!stream.is_open() || stream.bad()) {
+  bytes = static_cast<std::uint64_t>(status.st_size);
+  const auto keep = [&bytes](std::string_view line) { bytes -= std::min(bytes, line.size()); };
+  return sort(file.get(), goes, maxBytes, keep, error);
+}
+
+std::optional<std::uint64_t> JsonLines::sort(int file,
+                                             const std::function<bool(std::string_view line)>& goes,
+                                             std::uint64_t maxBytes,
+                                             const std::function<void(std::string_view line)>& keep,
+                                             std::string& error) const {
+  struct stat status {};
+  if (fstat(file, &status) != 0) {
     error = systemError(_path);
     return std::nullopt;
   }
-  return removed == 0 || kept->replace(path.filename(), error) ? std::optional(removed)
-                                                               : std::nullopt;
+  const auto size = static_cast<std::uint64_t>(status.st_size);
+  maxBytes = std::min(maxBytes, kMaxLinesFile);
+  std::uint64_t place = size > kMaxLinesFile ? size - kMaxLinesFile - 1 : 0;
+  std::uint64_t removed = 0;
+  std::string line;
+  bool isTooLong = false;
+  const auto take = [&](std::string_view end, std::uint64_t next) {
+    const bool isBefore = next - line.size() - end.size() + maxBytes < size;
+    if (isTooLong || isBefore || goes(line)) {
+      ++removed;
+    } else {
+      keep(line.append(end));
+    }
+    line.clear();
+    isTooLong = false;
+  };
+  std::vector<char> piece(256 * 1024);
+  while (true) {
+    const ssize_t count = pread(file, piece.data(), piece.size(), static_cast<off_t>(place));
+    if (count < 0 && errno == EINTR) {
+      continue;
+    }
+    if (count < 0) {
+      error = systemError(_path);
+      return std::nullopt;
+    }
+    if (count == 0) {
+      break;
+    }
+    std::string_view text(piece.data(), static_cast<std::size_t>(count));
+    for (std::size_t feed = 0; (feed = text.find('\n')) != std::string_view::npos;) {
+      line.append(text.substr(0, feed));
+      text.remove_prefix(feed + 1);
+      place += feed + 1;
+      take("\n", place);
+    }
+    place += text.size();
+    line.append(text);
+    if (line.size() > kMaxLine) {
+      isTooLong = true;
+      line.clear();
+    }
+  }
+  if (!line.empty() || isTooLong) {
+    take("", place);
+  }
+  return removed;
 }
 
 }  // namespace vesprun

@@ -1,6 +1,7 @@
 #include "platform/host/files/StandardStreams.h"
 
 #include <fcntl.h>
+#include <signal.h>
 #include <unistd.h>
 
 #include <cstdio>
@@ -30,6 +31,7 @@ void terminate() {
 }  // namespace
 
 void holdStandardStreams() {
+  signal(SIGXFSZ, SIG_IGN);
   for (int stream = STDIN_FILENO; stream <= STDERR_FILENO; ++stream) {
     if (fcntl(stream, F_GETFD) == -1) {
       // open() takes the lowest free number, which is this stream's.

@@ -3,7 +3,8 @@
 namespace vesprun {
 
 /// Occupies each standard stream that is closed, so that no file of the device gets its number and
-/// all that is printed. Using the stream still fails. Call before anything is opened.
+/// all that is printed. A limit on the size of files is an error of writing from then on, and ends
+/// no process. Using the stream still fails. Call before anything is opened.
 void holdStandardStreams();
 
 /// When memory runs out where no exception may leave, such as in a destructor, the process ends

@@ -55,11 +55,11 @@ ServiceSocket::ServiceSocket(FileDescriptor folder, FileDescriptor socket, std::
 
 std::optional<ServiceSocket> ServiceSocket::listen(const DeviceDirectory& directory,
                                                    std::string_view name, std::string& error) {
-  const std::optional<std::string> folderPath = directory.makeFolder(kFolder, error);
+  const std::optional<HostPath> folderPath = directory.makeFolder(kFolder, error);
   if (!folderPath) {
     return std::nullopt;
   }
-  const std::string path = *folderPath + '/' + std::string(name);
+  const std::string path = folderPath->below(name);
   ServiceSocket service(
       openFolder(*folderPath),
       FileDescriptor(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0)),
@@ -67,7 +67,7 @@ std::optional<ServiceSocket> ServiceSocket::listen(const DeviceDirectory& direct
   const int folder = service._folder.get();
   const int socket = service._socket.get();
   if (folder < 0 || socket < 0) {
-    error = systemError(folder < 0 ? *folderPath : path);
+    error = systemError(folder < 0 ? folderPath->string() : path);
     return std::nullopt;
   }
   if (flock(folder, LOCK_EX | LOCK_NB) != 0) {
@@ -103,8 +103,8 @@ FileDescriptor ServiceSocket::accept(std::string& error) const {
 
 FileDescriptor connectToService(const DeviceDirectory& directory, std::string_view name,
                                 int patienceInSeconds, std::string& error) {
-  const std::string folderPath = directory.hostPath(kFolder);
-  const std::string path = folderPath + '/' + std::string(name);
+  const HostPath folderPath = directory.hostPath(kFolder);
+  const std::string path = folderPath.below(name);
   const FileDescriptor folder = openFolder(folderPath);
   FileDescriptor socket(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0));
   const timeval patience{patienceInSeconds, 0};

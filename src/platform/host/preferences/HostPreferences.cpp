@@ -55,7 +55,7 @@ HostPreferences::Domain* HostPreferences::find(std::string_view domain) {
     return nullptr;
   }
   const std::string name(domain);
-  return &_domains.emplace(name, Domain{_device.hostPath(_folder) + '/' + name + ".ptree"})
+  return &_domains.emplace(name, Domain{_device.hostPath(_folder + '/' + name + ".ptree")})
               .first->second;
 }
 
@@ -87,7 +87,7 @@ void HostPreferences::LGSPreferencesSetValue(std::optional<std::string_view> key
   }
   std::string error;
   if (value && !isPtree({PropertyDict{{std::string(*key), *value}}}, error)) {
-    _log.write(LogLevel::Error, found->path + ": " + error);
+    _log.write(LogLevel::Error, found->path.string() + ": " + error);
     return;
   }
   found->changes.insert_or_assign(std::string(*key), std::move(value));
@@ -126,7 +126,7 @@ HostPreferences::Content HostPreferences::Domain::read() const {
     content.values = std::move(*root->dict());
   } else {
     content.isMalformed = true;
-    content.error = path + ": " + (root ? "line 1: the root is not a dictionary" : error);
+    content.error = path.string() + ": " + (root ? "line 1: the root is not a dictionary" : error);
   }
   return content;
 }
@@ -165,7 +165,7 @@ bool HostPreferences::synchronize(Domain& domain) {
 }
 
 bool HostPreferences::writeChanges(const Domain& domain, std::string& error) {
-  const std::optional<std::string> folder = _device.makeFolder(_folder, error);
+  const std::optional<HostPath> folder = _device.makeFolder(_folder, error);
   if (!folder) {
     return false;
   }
@@ -191,20 +191,20 @@ bool HostPreferences::writeChanges(const Domain& domain, std::string& error) {
   if (document == before) {
     return true;
   }
-  if (content.isMalformed && !keepAside(domain.path, error)) {
+  if (content.isMalformed && !keepAside(domain.path, lock->get(), error)) {
     return false;
   }
   return replaceFile(domain.path, document, error);
 }
 
-bool HostPreferences::keepAside(const std::string& path, std::string& error) {
+bool HostPreferences::keepAside(const HostPath& path, int folder, std::string& error) {
   const std::string aside = nameAside(path, "unreadable", _clock);
   constexpr int kMaxInOneSecond = 1000;
   for (int number = 1; number <= kMaxInOneSecond; ++number) {
     const std::string name = number == 1 ? aside : aside + '-' + std::to_string(number);
     // A second name never replaces a file, and the domain's file is never missing.
-    if (link(path.c_str(), name.c_str()) == 0) {
-      _log.write(LogLevel::Error, path + ": kept as " + name);
+    if (linkat(folder, path.name().c_str(), folder, HostPath(name).name().c_str(), 0) == 0) {
+      _log.write(LogLevel::Error, path.string() + ": kept as " + name);
       return true;
     }
     if (errno != EEXIST) {

@@ -64,7 +64,7 @@ class HostPreferences : public Preferences {
     bool isMalformed = false;
   };
   struct Domain {
-    std::string path;  ///< of the document, on the host
+    HostPath path;  ///< of the document, on the host
     std::optional<PropertyDict> stored{};
     std::map<std::string, std::optional<PropertyValue>> changes{};
     std::string reported{};  ///< the last complaint, made once
@@ -78,7 +78,7 @@ class HostPreferences : public Preferences {
   const PropertyDict& stored(Domain& domain);
   bool synchronize(Domain& domain);
   bool writeChanges(const Domain& domain, std::string& error);
-  bool keepAside(const std::string& path, std::string& error);
+  bool keepAside(const HostPath& path, int folder, std::string& error);
 
   const DeviceDirectory& _device;
   Clock& _clock;

@@ -36,10 +36,8 @@ class HostFileSystem final : public FileSystem {
     return content;
   }
   std::optional<std::uint64_t> fileSize(const std::string& path) override {
-    struct stat status {};
-    return stat(_directory.hostPath(path).c_str(), &status) == 0
-               ? std::optional(static_cast<std::uint64_t>(status.st_size))
-               : std::nullopt;
+    const std::optional<struct stat> status = _directory.hostPath(path).status();
+    return status ? std::optional(static_cast<std::uint64_t>(status->st_size)) : std::nullopt;
   }
   std::optional<FileSystemStatistics> statfs(const std::string& path) override {
     return path == "/private/var" ? describedOr(_description.userVolume,

@@ -11,7 +11,9 @@
 #include "platform/host/device/DeviceDirectory.h"
 #include "platform/host/device/ECCEventQueue.h"
 #include "platform/host/device/LiveSystem.h"
+#include "platform/host/files/AtomicFile.h"
 #include "platform/host/files/Files.h"
+#include "platform/host/outbox/OutboxFiles.h"
 
 namespace vesprun {
 
@@ -39,7 +41,16 @@ class HostKernel : public Kernel {
     length = bytes.size();
     return 0;
   }
-  bool acknowledgeECCEvent() override { return _eccEvents.removeTaken(); }
+  /// First makes its record durable: else both could be lost when the power fails.
+  bool acknowledgeECCEvent() override {
+    std::string error;
+    const HostPath records = _directory.hostPath(kRecordsFile);
+    if (!flushFile(records, error) && (records.status() || errno != ENOENT)) {
+      _log.write(LogLevel::Error, error);
+      return false;
+    }
+    return _eccEvents.removeTaken();
+  }
   std::uint64_t pageSize() override {
     return describedOr(_description.kernel.pageSize,
                        [] { return static_cast<std::uint64_t>(sysconf(_SC_PAGESIZE)); });

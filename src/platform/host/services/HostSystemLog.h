@@ -12,6 +12,7 @@
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/JsonLines.h"
+#include "platform/host/outbox/OutboxFiles.h"
 
 namespace vesprun {
 
@@ -31,7 +32,7 @@ class HostSystemLog final : public SystemLog {
       std::string line = jsonText({{"time", dateText(_clock.now())},
                                    {"level", kLogLevelNames[static_cast<std::size_t>(level)]},
                                    {"message", message}});
-      if (_directory.makeFolder("outbox", error) && _lines.append(std::move(line), error)) {
+      if (_directory.makeFolder(kOutbox, error) && _lines.append(std::move(line), error)) {
         return;
       }
     } catch (const std::exception&) {
@@ -52,7 +53,7 @@ class HostSystemLog final : public SystemLog {
   const DeviceDirectory& _directory;
   Clock& _clock;
   LogLevel _lowestKept;
-  JsonLines _lines{_directory.hostPath("outbox/log.jsonl")};
+  JsonLines _lines{_directory.hostPath(kSystemLogFile)};
 };
 
 }  // namespace vesprun

@@ -69,6 +69,74 @@ TEST_F(AtomicFileTest, KeepsTheEarlierDocumentUntilTheNewOneIsComplete) {
   EXPECT_THAT(folder.names(), ElementsAre("document"));
 }
 
+TEST_F(AtomicFileTest, RemovesItsOwnLeftOversAloneAndWaitsForNone) {
+  ASSERT_EQ(mkfifo(folder.path(".unfinished-pipe").c_str(), 0600), 0);
+  ASSERT_EQ(symlink("document", folder.path(".unfinished-link").c_str()), 0);
+  folder.write(".unfinished-left", "by a process that was killed");
+  folder.write(".unfinished-others", "");
+  ASSERT_EQ(chown(folder.path(".unfinished-others").c_str(), 12345, 12345),
+            geteuid() == 0 ? 0 : -1);
+  {
+    std::optional<AtomicFile> written = AtomicFile::create(folder.path(), error);
+    ASSERT_TRUE(written) << error;
+    EXPECT_TRUE(replaceFile(folder.path("document"), "new", error)) << error;
+    EXPECT_EQ(written->addNew("written", error), AtomicFile::Added::Done) << error;
+  }
+  std::vector<std::string> names{".unfinished-link", ".unfinished-pipe", "document", "written"};
+  if (geteuid() == 0) {
+    names.insert(names.begin() + 1, ".unfinished-others");
+  }
+  EXPECT_EQ(folder.names(), names);
+}
+
+TEST_F(AtomicFileTest, FollowsLinksOnlyInWhatTheUserNamed) {
+  folder.write("inside/file", "inside");
+  ASSERT_EQ(symlink("inside", folder.path("link").c_str()), 0);
+  ASSERT_EQ(symlink("file", folder.path("inside/link").c_str()), 0);
+  EXPECT_EQ(readWholeFile(folder.path("link/link"), error), "inside");
+  EXPECT_EQ(readWholeFile(HostPath(folder.path("link")).below("file"), error), "inside");
+  for (const char* const path : {"link/file", "inside/link", "link"}) {
+    const HostPath below = device.hostPath(path);
+    EXPECT_FALSE(readWholeFile(below, error)) << path;
+    EXPECT_EQ(error, below.string() + ": a symbolic link");
+    EXPECT_FALSE(below.status());
+    EXPECT_FALSE(openStepByStep(openFolder(folder.path()).get(), path, O_PATH, 0).isOpen());
+    EXPECT_FALSE(openStepByStep(openFolder(folder.path()).get(), path, O_RDONLY, 0).isOpen());
+  }
+  EXPECT_TRUE(
+      openStepByStep(openFolder(folder.path()).get(), "inside//file", O_RDONLY, 0).isOpen());
+  EXPECT_FALSE(device.makeFolder("link/new", error));
+  EXPECT_EQ(error, folder.path("link") + ": a symbolic link");
+  EXPECT_FALSE(replaceFile(device.hostPath("link/new"), "", error));
+  EXPECT_FALSE(removeFile(device.hostPath("link/file")));
+  EXPECT_TRUE(replaceFile(device.hostPath("inside/link"), "replaced", error)) << error;
+  EXPECT_EQ(folder.read("inside/file"), "inside");
+}
+
+TEST_F(AtomicFileTest, ReadsNoMoreThanADocumentHas) {
+  folder.write("document", "");
+  ASSERT_EQ(truncate(folder.path("document").c_str(), off_t{1} << 40), 0);
+  EXPECT_FALSE(readWholeFile(folder.path("document"), error));
+  EXPECT_EQ(error, folder.path("document") + ": larger than 67108864 bytes");
+}
+
+TEST_F(JsonLinesTest, KeepTheNewestOfTooMany) {
+  const std::string path = folder.path("log.jsonl");
+  const auto isOld = [](std::string_view line) { return line == "old"; };
+  JsonLines lines(path);
+  folder.write("log.jsonl", "first\nsecond\nold\nlast\n");
+  std::uint64_t bytes = 0;
+  EXPECT_EQ(lines.countRemoved(isOld, bytes, error, 16), 2U);
+  EXPECT_EQ(bytes, 10U);
+  EXPECT_EQ(lines.remove(isOld, error, 16), 2U);
+  EXPECT_EQ(folder.read("log.jsonl"), "second\nlast\n");
+  // All hole but its end.
+  ASSERT_EQ(truncate(path.c_str(), off_t{1} << 40), 0);
+  EXPECT_TRUE(lines.append("{}", error)) << error;
+  EXPECT_TRUE(lines.remove(isOld, error)) << error;
+  EXPECT_EQ(folder.read("log.jsonl"), "{}\n");
+}
+
 TEST_F(JsonLinesTest, AppendsWholeLinesFromManyWriters) {
   JsonLines first(folder.path("events.jsonl"));
   JsonLines second(folder.path("events.jsonl"));
@@ -155,6 +223,14 @@ TEST_F(JsonLinesTest, OpensRegularFilesAloneAndKeepsThemToTheirOwner) {
   EXPECT_FALSE(JsonLines(folder.path("link.jsonl")).append("{}", error));
   EXPECT_EQ(error, folder.path("link.jsonl") + ": a symbolic link");
   EXPECT_EQ(folder.read("shared.jsonl"), "{}\n");
+  ASSERT_EQ(link(folder.path("shared.jsonl").c_str(), folder.path("second.jsonl").c_str()), 0);
+  EXPECT_FALSE(JsonLines(folder.path("second.jsonl")).append("{}", error));
+  EXPECT_EQ(error, folder.path("second.jsonl") + ": has a second name");
+  folder.write("other.jsonl", "");
+  if (chown(folder.path("other.jsonl").c_str(), 12345, 12345) == 0) {  // as root
+    EXPECT_FALSE(JsonLines(folder.path("other.jsonl")).append("{}", error));
+    EXPECT_EQ(error, folder.path("other.jsonl") + ": belongs to another user");
+  }
   ASSERT_EQ(mkfifo(folder.path("pipe.jsonl").c_str(), 0600), 0);
   EXPECT_FALSE(JsonLines(folder.path("pipe.jsonl")).append("{}", error));
   EXPECT_EQ(error, folder.path("pipe.jsonl") + ": not a regular file");

@@ -1,29 +1,23 @@
-#include "platform/host/services/HostOutbox.h"
-
-#include <unistd.h>
+#include "platform/host/outbox/HostOutbox.h"
 
 #include <cstdint>
-#include <cstdio>
 #include <optional>
 
 #include "common/Calendar.h"
 #include "platform/host/device/LiveSystem.h"
-#include "platform/host/device/LogNumbers.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/files/AtomicFile.h"
+#include "platform/host/outbox/LogName.h"
+#include "platform/host/outbox/LogNotes.h"
+#include "platform/host/outbox/LogNumbers.h"
+#include "platform/host/outbox/OutboxFiles.h"
 
 namespace vesprun {
 namespace {
 
 constexpr std::string_view kPtreeLogType = "193";  // the other logs are text
 
-std::string baseName(std::uint64_t number, std::string_view type, std::string_view name) {
-  char digits[24];
-  std::snprintf(digits, sizeof digits, "%04llu", static_cast<unsigned long long>(number));
-  return std::string(digits) + '-' + std::string(type) + '-' + std::string(name);
-}
-
-AtomicFile::Added addHeader(const std::string& folder, const std::string& name,
+AtomicFile::Added addHeader(const HostPath& folder, const std::string& name,
                             const PropertyDict& header, const Date& time, std::string& error) {
   std::optional<AtomicFile> file = AtomicFile::create(folder, error);
   if (!file) {
@@ -45,15 +39,15 @@ bool HostOutbox::EventHubSendEventLazy(std::string_view event, const PayloadBuil
     return false;
   }
   return !EventHubIsEventUsed(event) ||
-         append("events.jsonl", {{"event", event}, {"payload", build()}});
+         append(kEventsFile, {{"event", event}, {"payload", build()}});
 }
 
 void HostOutbox::PostNotification(std::string_view name) {
-  append("notifications.jsonl", {{"name", name}});
+  append(kNotificationsFile, {{"name", name}});
 }
 
 bool HostOutbox::FLLogStructuredData(std::int32_t type, const PropertyDict& record) {
-  return append("records.jsonl", {{"type", type}, {"record", record}});
+  return append(kRecordsFile, {{"type", type}, {"record", record}});
 }
 
 std::string HostOutbox::LGSOSVersion() {
@@ -64,13 +58,13 @@ PropertyDict HostOutbox::CopySystemVersionDictionary() {
   return {{"ProductBuildVersion", describedOr(_description.system.buildVersion, live::osBuild)}};
 }
 
-bool HostOutbox::append(const std::string& file, const PropertyDict& entries) {
+bool HostOutbox::append(std::string_view file, const PropertyDict& entries) {
   PropertyDict line{{"time", dateText(_clock.now())}};
   line.merge(entries);
   const std::lock_guard lock(_mutex);
   std::string error;
-  const auto lines = _files.try_emplace(file, _directory.hostPath("outbox/" + file)).first;
-  if (_directory.makeFolder("outbox", error) && lines->second.append(jsonText(line), error)) {
+  const auto lines = _files.try_emplace(file, _directory.hostPath(file)).first;
+  if (_directory.makeFolder(kOutbox, error) && lines->second.append(jsonText(line), error)) {
     return true;
   }
   _log.write(LogLevel::Error, error);
@@ -90,9 +84,23 @@ bool HostOutbox::LGSWriteLogForSubmission(std::string_view logType, std::string_
   return false;
 }
 
+/// Before the log is there: no log that is there lacks its note.
+void HostOutbox::noteSubmitted(const std::string& name, const Date& time) const {
+  const auto textOrNull = [](std::string text) {
+    return text.empty() ? std::nullopt : std::optional(std::move(text));
+  };
+  const SubmittedNote note{
+      textOrNull(describedOr(_description.system.buildVersion, live::osBuild)),
+      textOrNull(describedOr(_description.system.hardwareModel, live::hardwareModel))};
+  std::string error;
+  if (!addSubmittedNote(_directory, time, name, note, error)) {
+    _log.write(LogLevel::Error, error);
+  }
+}
+
 bool HostOutbox::writeLog(std::string_view type, std::string_view name, const PropertyDict* header,
                           const LogWriter& writer, std::string& error) const {
-  const std::optional<std::string> folder = _directory.makeFolder(kLogFolder, error);
+  const std::optional<HostPath> folder = _directory.makeFolder(kLogFolder, error);
   if (!folder) {
     return false;
   }
@@ -114,8 +122,9 @@ bool HostOutbox::writeLog(std::string_view type, std::string_view name, const Pr
   auto added = newest ? AtomicFile::Added::NameTaken : AtomicFile::Added::Failed;
   std::uint64_t number = newest.value_or(0);
   while (added == AtomicFile::Added::NameTaken) {
-    const std::string base = baseName(++number, type, name);
-    const std::string headerName = base + ".header.json";
+    LogName log{logBase(++number, type, name), number,
+                type == kPtreeLogType ? LogName::End::Ptree : LogName::End::Text};
+    const std::string headerName = LogName{log.base, number, LogName::End::Header}.text();
     // The header first: a log that is there has its header.
     if (header != nullptr) {
       added = addHeader(*folder, headerName, *header, time, error);
@@ -123,9 +132,12 @@ bool HostOutbox::writeLog(std::string_view type, std::string_view name, const Pr
         continue;
       }
     }
-    added = file->addNew(base + (type == kPtreeLogType ? ".ptree" : ".log"), error);
+    if (log.isDailyLog()) {
+      noteSubmitted(log.text(), time);
+    }
+    added = file->addNew(log.text(), error);
     if (added != AtomicFile::Added::Done && header != nullptr) {
-      unlink((*folder + '/' + headerName).c_str());
+      removeFile(folder->below(headerName));
     }
   }
   if (added == AtomicFile::Added::Done) {

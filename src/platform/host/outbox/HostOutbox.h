@@ -42,7 +42,8 @@ class HostOutbox : public EventHub, public Logsmith {
   void rollTendmarkLogs() override {}
 
  private:
-  bool append(const std::string& file, const PropertyDict& entries);
+  bool append(std::string_view file, const PropertyDict& entries);
+  void noteSubmitted(const std::string& name, const Date& time) const;
   bool writeLog(std::string_view type, std::string_view name, const PropertyDict* header,
                 const LogWriter& writer, std::string& error) const;
 
@@ -51,7 +52,7 @@ class HostOutbox : public EventHub, public Logsmith {
   Clock& _clock;
   SystemLog& _log;
   std::mutex _mutex;
-  std::map<std::string, JsonLines> _files;
+  std::map<std::string_view, JsonLines> _files;  ///< by constants
 };
 
 }  // namespace vesprun

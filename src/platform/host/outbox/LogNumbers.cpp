@@ -1,4 +1,4 @@
-#include "platform/host/device/LogNumbers.h"
+#include "platform/host/outbox/LogNumbers.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -7,11 +7,12 @@
 
 #include <algorithm>
 #include <charconv>
-#include <sstream>
 
-#include "platform/host/documents/JsonForm.h"
 #include "platform/host/files/AtomicFile.h"
 #include "platform/host/files/Files.h"
+#include "platform/host/outbox/LogName.h"
+#include "platform/host/outbox/LogNotes.h"
+#include "platform/host/outbox/OutboxFiles.h"
 
 namespace vesprun {
 namespace {
@@ -20,10 +21,9 @@ constexpr std::string_view kNumberFile = "outbox/.log-number";
 
 /// What changes with every log that is added, removed or noted as removed.
 std::string stateOf(const DeviceDirectory& directory) {
-  struct stat folder {};
-  struct stat pruned {};
-  stat(directory.hostPath(kLogFolder).c_str(), &folder);
-  stat(directory.hostPath(kPrunedLogsFile).c_str(), &pruned);
+  const struct stat nothing {};
+  const struct stat folder = directory.hostPath(kLogFolder).status().value_or(nothing);
+  const struct stat pruned = directory.hostPath(kPrunedFile).status().value_or(nothing);
   return std::to_string(folder.st_mtim.tv_sec) + '.' + std::to_string(folder.st_mtim.tv_nsec) +
          ' ' + std::to_string(pruned.st_size);
 }
@@ -31,11 +31,11 @@ std::string stateOf(const DeviceDirectory& directory) {
 /// Gives the folder a modification time that no change leaves behind, since those are rounded to
 /// ticks of the system's clock. False when the file system cannot keep it.
 bool markFolder(const DeviceDirectory& directory) {
-  const std::string folder = directory.hostPath(kLogFolder);
+  const FileDescriptor folder = openFolder(directory.hostPath(kLogFolder));
   timespec times[2] = {{0, UTIME_OMIT}, {}};
   clock_gettime(CLOCK_REALTIME, &times[1]);
   struct stat status {};
-  return utimensat(AT_FDCWD, folder.c_str(), times, 0) == 0 && stat(folder.c_str(), &status) == 0 &&
+  return futimens(folder.get(), times) == 0 && fstat(folder.get(), &status) == 0 &&
          status.st_mtim.tv_sec == times[1].tv_sec && status.st_mtim.tv_nsec == times[1].tv_nsec;
 }
 
@@ -47,42 +47,7 @@ std::optional<std::uint64_t> takeNumber(std::string_view& text) {
   return problem == std::errc() ? std::optional(number) : std::nullopt;
 }
 
-const Number* integer(const PropertyDict& line, std::string_view key) {
-  const Number* number = line.findNumber(key);
-  return number != nullptr && !number->isFloatingPoint() ? number : nullptr;
-}
-
 }  // namespace
-
-std::optional<std::uint64_t> logNumber(std::string_view name) {
-  const std::optional<std::uint64_t> number = takeNumber(name);
-  return name.starts_with('-') ? number : std::nullopt;
-}
-
-std::optional<PrunedLogs> readPrunedLogs(const DeviceDirectory& directory, std::string& error) {
-  bool missing = false;
-  const auto content = readWholeFile(directory.hostPath(kPrunedLogsFile), error, &missing);
-  if (!content && !missing) {
-    return std::nullopt;
-  }
-  PrunedLogs logs;
-  std::istringstream lines(content.value_or(""));
-  std::string malformed;
-  for (std::string line; std::getline(lines, line);) {
-    const std::optional<PropertyValue> value = valueFromJsonText(line, malformed);
-    const PropertyDict* note = value ? value->dict() : nullptr;
-    if (note == nullptr) {
-      continue;
-    }
-    const std::string* name = note->findString("name");
-    const Number* day = integer(*note, "day");
-    const Number* revision = integer(*note, "revision");
-    if (name != nullptr && day != nullptr && revision != nullptr) {
-      logs.push_back({*name, logNumber(*name).value_or(0), day->asInt32(), revision->asInt64()});
-    }
-  }
-  return logs;
-}
 
 LogNumbers::LogNumbers(const DeviceDirectory& directory)
     : _directory(directory), _stateBefore(stateOf(directory)) {}
@@ -105,28 +70,30 @@ std::optional<std::uint64_t> LogNumbers::newest(std::string& error) const {
     newest = std::max(newest, logNumber(name).value_or(0));
   }
   // Notes that cannot be read must not keep a log from being submitted.
-  for (const PrunedLog& log : readPrunedLogs(_directory, ignored).value_or(PrunedLogs())) {
-    newest = std::max(newest, log.number);
+  for (const LogNote& note :
+       readLogNotes(_directory, kPrunedFile, ignored).value_or(std::vector<LogNote>())) {
+    newest = std::max(newest, note.number);
   }
   return newest;
 }
 
 bool LogNumbers::remember(std::uint64_t number, bool durably, std::string& error) const {
-  const std::string path = _directory.hostPath(kNumberFile);
-  const FileDescriptor file(
-      open(path.c_str(), O_WRONLY | O_CREAT | O_CLOEXEC | O_NONBLOCK | O_NOFOLLOW, 0600));
+  const HostPath path = _directory.hostPath(kNumberFile);
+  const FileDescriptor file = openToChange(path, O_WRONLY | O_CREAT, error);
+  if (!file.isOpen()) {
+    return false;
+  }
   // Written in place and by one call: whenever the power goes, the old or the new number is there,
   // and both are right. Nothing is flushed for the sake of a log.
   const std::string content = std::to_string(number) + ' ' +
                               (markFolder(_directory) ? stateOf(_directory) : "unknown") + '\n';
-  if (!file.isOpen() ||
-      pwrite(file.get(), content.data(), content.size(), 0) !=
+  if (pwrite(file.get(), content.data(), content.size(), 0) !=
           static_cast<ssize_t>(content.size()) ||
       (durably && fsync(file.get()) != 0)) {
     error = systemError(path);
     return false;
   }
-  return !durably || flushFolder(_directory.hostPath("outbox"), error);
+  return !durably || flushFolder(_directory.hostPath(kOutbox), error);
 }
 
 }  // namespace vesprun
