@@ -13,7 +13,7 @@
 #include "platform/host/preferences/PreferenceServices.h"
 #include "platform/host/services/HostDeviceInformation.h"
 #include "platform/host/services/HostKernel.h"
-#include "platform/host/services/HostOutbox.h"
+#include "platform/host/outbox/HostOutbox.h"
 #include "report/KernelMemoryStatistics.h"
 #include "support/TestDevice.h"
 

@@ -16,7 +16,7 @@
 #include "common/TextForm.h"
 #include "outbox/DailyLogView.h"
 #include "outbox/SubmittedLogs.h"
-#include "platform/host/device/LogNumbers.h"
+#include "platform/host/outbox/LogName.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeReader.h"
 #include "platform/host/documents/QuotedText.h"
@@ -241,7 +241,7 @@ std::vector<HostPath> submittedFiles(const DeviceDirectory& directory, const Wan
 }
 
 void showLogs(const DeviceDirectory& directory, const Wanted& wanted) {
-  for (const std::filesystem::path& file : submittedFiles(directory, wanted)) {
+  for (const HostPath& file : submittedFiles(directory, wanted)) {
     if (invocation().json) {
       printLog(file);
     } else {

@@ -177,7 +177,7 @@ TEST_F(TallybookTest, GivesTheRoomOfRemovedDaysBack) {
     HostTallybook tallybook(device, clock, preferences, log);
     const auto remove = [](CounterStore& store) {
       store.appendSamples(0, "added and removed at once", {});
-      const CounterStore::Removed removed = store.removeBefore(20);
+      const CounterStore::Rows removed = store.removeBefore(20);
       EXPECT_THAT(removed.days, SizeIs(20));
       EXPECT_EQ(removed.distributions, 21);
       store.giveRoomBack();
