@@ -49,7 +49,7 @@ class DaysTest : public VespctlTest {
 
   /// Day and revision of each exported log.
   std::string revisions() {
-    return print(R"(export "$D" --device n | sed -E 's/^\{"version":1,"device":"n","day":([0-9]+),)"
+    return print(R"(export --device n | sed -E 's/^\{"version":1,"device":"n","day":([0-9]+),)"
                  R"("revision":([0-9]+),.*/\1:\2/' | paste -sd ' ')");
   }
 
@@ -116,7 +116,7 @@ TEST_F(DaysTest, CatchUpSubmitsWhatTheRunOfEachDayWouldHave) {
   setTime("2024-03-07T04:00:00Z");
   const std::string events = folder.read("device/outbox/events.jsonl");
   EXPECT_EQ(print("days --json --last 0; (flock sh -c 'sleep 0.5; touch released' & sleep "
-                  "0.1; '" VESPCTL_PROGRAM "' catch-up --last 3; test -e released)"),
+                  "0.1; '" VESPCTL_PROGRAM "' catch-up --json --last 3; test -e released)"),
             "[19785,19786,19787]\n")
       << "after the run that is at work";
   EXPECT_EQ(documents(false), ofRuns);

@@ -211,7 +211,8 @@ TEST_F(PageTest, NamesWhatItCannotRead) {
                             HasSubstr("<bdi>s.a</bdi>"), HasSubstr("<bdi>sound</bdi>")));
   EXPECT_THAT(error, AllOf(HasSubstr("vespctl page: 0007-193-log-aggregated.ptree: "),
                            HasSubstr("vespctl page: events.jsonl: 2 lines cannot be read\n")));
-  EXPECT_EQ(run("page \"$D/outbox\""), 0) << error;
+  print("init empty");
+  print("-C empty page");
   EXPECT_THAT(output, AllOf(HasSubstr("There is no daily log"), HasSubstr("No scalar"),
                             HasSubstr("No distribution"), HasSubstr("No analytics event")));
   EXPECT_THAT(output, HasSubstr("Every key of the counter database may leave"));

@@ -85,10 +85,11 @@ TEST_F(VespctlTest, InitIsWholeAndCanBeRepeated) {
     shell("rm -f half/.unfinished-1; diff -r device half && rm -r half");
   }
   print("init half --sample");
+  const std::string rows = print("-C half counters dump");
   shell("mv half/device.json . && touch half/.init-unfinished");
-  const std::string rows = print("counters half dump");
   print("init half --sample");
-  EXPECT_EQ(std::ranges::count(print("counters half dump"), '\n'), std::ranges::count(rows, '\n'));
+  EXPECT_EQ(std::ranges::count(print("-C half counters dump"), '\n'),
+            std::ranges::count(rows, '\n'));
   // A device, and what is none, are not touched.
   for (const char* const foreign : {"rm half/Library/*/*/*", "rm half/device.json", "true"}) {
     shell(foreign);
