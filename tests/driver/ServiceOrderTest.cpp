@@ -9,11 +9,11 @@
 #include "driver/DailyTasks.h"
 #include "driver/TaskingSync.h"
 #include "platform/host/counters/HostTallybook.h"
+#include "platform/host/outbox/HostOutbox.h"
 #include "platform/host/preferences/HostPreferences.h"
 #include "platform/host/preferences/PreferenceServices.h"
 #include "platform/host/services/HostDeviceInformation.h"
 #include "platform/host/services/HostKernel.h"
-#include "platform/host/outbox/HostOutbox.h"
 #include "report/KernelMemoryStatistics.h"
 #include "support/TestDevice.h"
 

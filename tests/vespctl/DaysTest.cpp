@@ -115,7 +115,7 @@ TEST_F(DaysTest, CatchUpSubmitsWhatTheRunOfEachDayWouldHave) {
   std::filesystem::rename(folder.path("kept"), folder.path("device"));
   setTime("2024-03-07T04:00:00Z");
   const std::string events = folder.read("device/outbox/events.jsonl");
-  EXPECT_EQ(print("days --json --last 0; (flock sh -c 'sleep 0.5; touch released' & sleep "
+  EXPECT_EQ(print("days --json --last 0; (flock \"$D\" sh -c 'sleep 0.5; touch released' & sleep "
                   "0.1; '" VESPCTL_PROGRAM "' catch-up --json --last 3; test -e released)"),
             "[19785,19786,19787]\n")
       << "after the run that is at work";
@@ -228,14 +228,14 @@ TEST_F(DaysTest, PruneBelievesAJumpOfTheClockOnTheSecondDay) {
   count(19700, 19795);
   const auto removed = [this](const char* date, const std::string& options = "") {
     setTime(std::string(date) + "T09:00:00Z");
-    const std::string days = print("prune \"$D\" --counters 3" + options);
+    const std::string days = print("prune --json --counters 3" + options);
     return days.substr(0, days.find(']') + 1);
   };
   const std::string nothing = "{\"days\":[]";
   EXPECT_NE(removed("2024-02-20"), nothing) << "the first";
   EXPECT_NE(removed("2024-02-27"), nothing);
   EXPECT_EQ(removed("2024-03-06", " --dry-run"), nothing);
-  EXPECT_THAT(error, HasSubstr("vespctl: prune: the clock is 8 days ahead of the last prune"));
+  EXPECT_THAT(error, HasSubstr("vespctl prune: the clock is 8 days ahead of the last prune"));
   EXPECT_EQ(removed("2024-03-06"), nothing);
   EXPECT_EQ(removed("2024-03-06"), nothing) << "the same day again";
   EXPECT_NE(removed("2024-02-28"), nothing) << "the clock is back";
@@ -243,7 +243,7 @@ TEST_F(DaysTest, PruneBelievesAJumpOfTheClockOnTheSecondDay) {
   EXPECT_NE(removed("2024-03-08"), nothing) << "a later day";
   EXPECT_EQ(removed("2024-05-08"), nothing);
   const std::string before = snapshot();
-  EXPECT_THAT(print("prune \"$D\" --counters 3 --dry-run --now"), HasSubstr("19795"));
+  EXPECT_THAT(print("prune --json --counters 3 --dry-run --now"), HasSubstr("19795"));
   EXPECT_EQ(snapshot(), before);
   EXPECT_THAT(removed("2024-05-08", " --now"), HasSubstr("19795"));
 }
@@ -256,14 +256,14 @@ TEST_F(DaysTest, PruneDryTellsWhatPruneRemovesAndNotesGoWithTheirLogs) {
                                 "20240102T000000Z-2-journal"}) {
     folder.write(database + ".corrupt-" + end, "");
   }
-  print("run \"$D\" -- -d");
-  print("run \"$D\" -- -f");
+  print("run -- -d");
+  print("run -- -f");
   const std::string submitted = folder.read("device/outbox/submitted.jsonl");
   EXPECT_THAT(submitted, HasSubstr(R"({"time":"2024-03-05T09:15:02Z","name":")"));
   EXPECT_EQ(std::ranges::count(submitted, '\n'), 2);
   folder.write("device/outbox/uploaded.jsonl", "{\"name\":\"0000-193-log-aggregated.ptree\"}\n");
   folder.write("device/outbox/log.jsonl", std::string(1'200'000, 'x') + "\n{\"kept\":1}\n");
-  const std::string command = "prune \"$D\" --outbox 90 --outbox-size 1 --counters 9";
+  const std::string command = "prune --json --outbox 90 --outbox-size 1 --counters 9";
   const std::string before = snapshot();
   const std::string told = print(command + " --dry-run");
   EXPECT_EQ(snapshot(), before);
@@ -274,9 +274,9 @@ TEST_F(DaysTest, PruneDryTellsWhatPruneRemovesAndNotesGoWithTheirLogs) {
   EXPECT_EQ(folder.read("device/outbox/uploaded.jsonl"), "");
   EXPECT_THAT(folder.names("device/var/mobile/Library/Tallybook"),
               ElementsAre("TBDataStore.sqlitedb"));
-  const std::string all = print("prune \"$D\" --outbox-size 0 --dry-run");
+  const std::string all = print("prune --json --outbox-size 0 --dry-run");
   EXPECT_THAT(all, HasSubstr("-193-log-aggregated.ptree"));
-  EXPECT_EQ(print("prune \"$D\" --outbox-size 0"), all);
+  EXPECT_EQ(print("prune --json --outbox-size 0"), all);
   EXPECT_THAT(error, HasSubstr("2 of the removed daily logs were never uploaded"));
   EXPECT_EQ(folder.read("device/outbox/submitted.jsonl"), "");
 }

@@ -1,7 +1,7 @@
 #include "NANDInfo/lists/StructuredLog.h"
 
-#include "NANDInfo/lists/StructuredLogState.h"
 #include "NANDInfo/controller/NandExporter.h"
+#include "NANDInfo/lists/StructuredLogState.h"
 #include "buffers/DeviceBuffers.h"
 #include "common/TextForm.h"
 #include "support/ControllerTest.h"

@@ -33,19 +33,13 @@ TEST(HostPlatform, SaysWhyADeviceCannotBeOpened) {
   EXPECT_THAT(error, testing::EndsWith("device.json: usage: not a dictionary"));
 }
 
-TEST(HostPlatform, GivesTheProcessItsTimeZoneBack) {
+TEST(HostPlatform, LeavesTheTimeZoneOfTheProcess) {
   EXPECT_TRUE(hasSucceeded(startProcess([] {
     setenv("TZ", "Asia/Tokyo", 1);
-    const auto openAndClose = [] {
-      const TestDevice device(R"({"timeZone": "America/Lima"})");
-      EXPECT_STREQ(std::getenv("TZ"), "America/Lima");
-    };
-    openAndClose();
+    tzset();
+    const TestDevice device(R"({"timeZone": "America/Lima"})");
     EXPECT_STREQ(std::getenv("TZ"), "Asia/Tokyo");
-    EXPECT_EQ(timezone, -9 * 3600) << "the C library goes by it again";
-    unsetenv("TZ");
-    openAndClose();
-    EXPECT_EQ(std::getenv("TZ"), nullptr);
+    EXPECT_EQ(timezone, -9 * 3600);
   })));
 }
 
@@ -219,7 +213,8 @@ TEST(Outbox, AFailedSubmissionLeavesWhatWasThereAndNothingElse) {
     EXPECT_FALSE(submit()) << allowed;
     setrlimit(RLIMIT_NOFILE, &before);
   }
-  EXPECT_THAT(device.log(), testing::SizeIs(5));
+  // Where not even the log finds a descriptor, standard error has the line.
+  EXPECT_THAT(device.log(), testing::SizeIs(2));
   EXPECT_THAT(device.log(), testing::Each(testing::StartsWith("error: ")));
   EXPECT_EQ(device.names("outbox/logs"), std::vector<std::string>{"0001-165-S.log"});
   EXPECT_EQ(device.read("outbox/logs/0001-165-S.log"), "earlier");

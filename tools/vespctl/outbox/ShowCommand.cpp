@@ -16,11 +16,11 @@
 #include "common/TextForm.h"
 #include "outbox/DailyLogView.h"
 #include "outbox/SubmittedLogs.h"
-#include "platform/host/outbox/LogName.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeReader.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/Files.h"
+#include "platform/host/outbox/LogName.h"
 
 namespace vesprun {
 namespace {

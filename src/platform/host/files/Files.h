@@ -42,7 +42,7 @@ std::optional<FileDescriptor> lockFolder(const HostPath& folder, std::string& er
                                          bool* busy = nullptr);
 
 /// No document is larger; one that seems so may be all hole.
-inline constexpr std::uint64_t kMaxDocument = 64 * 1024 * 1024;
+inline constexpr std::uint64_t kMaxDocument = std::uint64_t{256} << 20;
 
 /// The content of a regular file. Nothing, with the cause in `error`, when it cannot be read or is
 /// larger than `maxSize`; `missing`, if given, tells whether it does not exist.

@@ -29,7 +29,7 @@ TEST(JsonForm, WritesEveryKindOfValue) {
             R"("float":[{"float":0.25},{"float":0.1},{"float":3.4028235e+38}],)"
             R"("bytes":{"data":"AQIDBA=="},"date":{"date":"2024-03-05T09:15:02.5Z"},)"
             "\"text\":\"\\\"\\\\\\n\xE2\x82\xAC\",\"\":[true,false,{},[]]}");
-  EXPECT_EQ(jsonText(std::nan("")), R"({"real":"nan"})");
+  EXPECT_EQ(jsonText(PropertyValue(std::nan(""))), R"({"real":"nan"})");
   EXPECT_EQ(jsonText("a\xFFz\n"), "\"a\xEF\xBF\xBDz\\n\"");
   EXPECT_EQ(jsonText("\b\f\r\t\x7F\x01"), "\"\\b\\f\\r\\t\x7F\\u0001\"");
 }
