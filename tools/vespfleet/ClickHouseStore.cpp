@@ -407,12 +407,14 @@ void ClickHouseStore::visitMeans(const ComparedGroups& groups, const VisitMeans&
         isScalar ? "toInt64(sum(bitShiftRight(value, 32))), "
                    "toInt64(sum(toInt64(bitAnd(value, 4294967295)))), toInt64(count())"
                  : "sum(value * number), toFloat64(0), toInt64(sum(number))";
+    const std::string unfolded = isScalar ? "value" : "value, number";
     const std::string columns = isScalar ? "scalars, integers" : "distributions, means, counts";
     const std::string joined = isScalar ? "scalars AS key, integers AS value"
                                         : "distributions AS key, means AS value, counts AS number";
     KeyMeans means;
     means.kind = kind;
-    readRows("SELECT key, side, device, " + sums + " FROM (SELECT * FROM (" +
+    readRows("SELECT key, side, device, " + sums + " FROM (SELECT key, side, device, " + unfolded +
+                 " FROM (" +
                  currentLines(side + " AS side, " + columns, groups.days, "(" + isWanted + ")") +
                  ") ARRAY JOIN " + joined + ") WHERE " + prefix +
                  " GROUP BY key, side, device ORDER BY key, side, device",

@@ -4,6 +4,7 @@
 
 #include <array>
 #include <cstdint>
+#include <iostream>
 #include <limits>
 
 #include "Command.h"
@@ -12,7 +13,9 @@
 #include "common/Calendar.h"
 #include "common/TextForm.h"
 #include "outbox/SubmittedLogs.h"
+#include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/XmlText.h"
+#include "vespfleet/ExportedLine.h"
 
 namespace vesprun {
 namespace {
@@ -69,22 +72,33 @@ void run(const Export& wanted) {
       !wanted.device.empty()
           ? wanted.device
           : pseudonymOf(platform->deviceInformation().GetSysIDWithDescription(false));
+  std::vector<UnreadableLog> refused;
   const auto print = [&](SubmittedLog&& log) {
     if (log.day < from || log.day > to) {
       return;
     }
     const auto entry = [&log](std::string_view key) { return *log.document.find(key); };
-    printJson({{"version", 1},
-               {"device", device},
-               {"day", log.day},
-               {"revision", log.revision},
-               {"created", entry("TBLogCreationDate")},
-               {"whitelist", entry("TBWhitelistDigest")},
-               {"scalars", entry("TBScalars")},
-               {"distributions", entry("TBDistributions")},
-               {"histograms", entry("TBDistributionsHistogram")}});
+    // Until the outbox notes what a log was submitted on, nothing says build and model.
+    const std::string line = jsonText({{"version", 2},
+                                       {"device", device},
+                                       {"day", log.day},
+                                       {"revision", log.revision},
+                                       {"created", entry("TBLogCreationDate")},
+                                       {"build", nullptr},
+                                       {"model", nullptr},
+                                       {"whitelist", entry("TBWhitelistDigest")},
+                                       {"scalars", entry("TBScalars")},
+                                       {"distributions", entry("TBDistributions")},
+                                       {"histograms", entry("TBDistributionsHistogram")}});
+    std::string why;
+    if (parseExportedLine(line, why)) {
+      std::cout << line << '\n';
+    } else {
+      refused.push_back({log.name, "no store would take it: " + why, true});
+    }
   };
-  const std::vector<UnreadableLog> unreadable = forEachSubmittedLog(platform->directory(), print);
+  std::vector<UnreadableLog> unreadable = forEachSubmittedLog(platform->directory(), print);
+  unreadable.insert(unreadable.end(), refused.begin(), refused.end());
   if (!unreadable.empty()) {
     nameUnreadable(std::span(unreadable).first(unreadable.size() - 1));
     throw CommandFailure(unreadable.back().name + ": " + unreadable.back().why);
