@@ -48,8 +48,8 @@ std::uint64_t valueOf(std::mt19937_64& random) { return random() % 1'000'000; }
   text += piece;
 }
 
-void printLine(int day, const std::string& device, const std::vector<std::string>& keys,
-               std::mt19937_64& random) {
+void printLine(int day, const std::string& device, const char* build,
+               const std::vector<std::string>& keys, std::mt19937_64& random) {
   std::string scalars;
   std::string distributions;
   std::string histograms;
@@ -68,15 +68,16 @@ void printLine(int day, const std::string& device, const std::vector<std::string
            comma, name, value % 100 + 1, value % 77 + 1, value % 33 + 1);
   }
   std::printf(
-      "{\"version\":1,\"device\":\"%s\",\"day\":%d,\"revision\":1,\"created\":{\"date\":"
-      "\"2026-01-01T00:00:00Z\"},\"whitelist\":\"da8c42ede873a2ba43623ae0ba4d61c9\",\"scalars\":{%"
+      "{\"version\":2,\"device\":\"%s\",\"day\":%d,\"revision\":1,\"created\":{\"date\":"
+      "\"2026-01-01T00:00:00Z\"},\"build\":\"%s\",\"model\":\"M1\",\"whitelist\":"
+      "\"da8c42ede873a2ba43623ae0ba4d61c9\",\"scalars\":{%"
       "s}"
       ",\"distributions\":{%s},\"histograms\":{%s}}\n",
-      device.c_str(), day, scalars.c_str(), distributions.c_str(), histograms.c_str());
+      device.c_str(), day, build, scalars.c_str(), distributions.c_str(), histograms.c_str());
 }
 
-void printRows(int day, const std::string& device, const std::vector<std::string>& keys,
-               std::mt19937_64& random) {
+void printRows(int day, const std::string& device, const char* /*build*/,
+               const std::vector<std::string>& keys, std::mt19937_64& random) {
   for (std::size_t key = 0; key < keys.size(); ++key) {
     const unsigned long long value = valueOf(random);
     if (!isDistribution(static_cast<int>(key))) {
@@ -104,7 +105,7 @@ int main(int argc, char** argv) {
     for (int device = 0; device < fleet.devices; ++device) {
       std::mt19937_64 random(fleet.seed * 31 + static_cast<std::uint64_t>(day) * 1'000'003 +
                              static_cast<std::uint64_t>(device));
-      print(day, deviceName(fleet, device), keys, random);
+      print(day, deviceName(fleet, device), device % 2 == 0 ? "24A1" : "24B2", keys, random);
     }
   }
   return 0;

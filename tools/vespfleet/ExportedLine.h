@@ -1,5 +1,6 @@
 #pragma once
 
+#include <array>
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -23,19 +24,32 @@ struct ReportedDistribution {
   Distribution values;
 };
 
+using LineDigest = std::array<std::uint8_t, 32>;
+
+/// SHA-256.
+LineDigest digestOf(std::string_view text);
+
+inline constexpr std::size_t kMaxLine = std::size_t{16} * 1024 * 1024;
+
 /// What one device reported for one day in one revision, as `vespctl export` writes it.
 struct ExportedLine {
-  std::string text;  ///< the line itself, without its end
+  LineDigest digest{};   ///< of the line's text, without its end
+  std::size_t size = 0;  ///< of that text
   std::string device;
   std::int32_t day = 0;  ///< days since 1970
   std::int64_t revision = 0;
   Date created;
+  std::optional<std::string> build;
+  std::optional<std::string> model;
+  std::string whitelist;
   std::vector<ReportedScalar> scalars;
   std::vector<ReportedDistribution> distributions;
 };
 
 /// Reads a line. Nothing, with a reason in `why` that quotes nothing of the line, when it is
 /// malformed. Distributions without values or with a number that is not finite are left out.
-std::optional<ExportedLine> parseExportedLine(std::string_view text, std::string& why);
+/// Version 1, of earlier stores, has neither build nor model.
+std::optional<ExportedLine> parseExportedLine(std::string_view text, std::string& why,
+                                              int version = 2);
 
 }  // namespace vesprun

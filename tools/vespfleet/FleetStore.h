@@ -1,12 +1,16 @@
 #pragma once
 
+#include <array>
 #include <cstdint>
 #include <functional>
 #include <limits>
 #include <memory>
+#include <optional>
+#include <span>
 #include <stdexcept>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "ExportedLine.h"
 
@@ -26,6 +30,18 @@ struct DayRange {
 
 enum class KeyKind { Scalar, Distribution };
 
+/// The member of a line by which a question parts the devices.
+enum class Member { None, Build, Model, Whitelist };
+
+using MemberText = std::optional<std::string>;  ///< null sorts first
+
+/// Where a value comes from. Devices and texts are numbers of this store; 0 is no text.
+struct Origin {
+  std::int32_t day = 0;
+  std::int64_t device = 0;
+  std::int64_t member = 0;
+};
+
 /// A key, and on how many devices and days it was reported.
 struct ReportedKey {
   std::string key;
@@ -34,35 +50,93 @@ struct ReportedKey {
   std::uint64_t days = 0;
 };
 
-/// What many devices reported. For each device and day one line holds: that of the highest
-/// revision; of equal revisions the one created later; then the one whose text is greater byte by
-/// byte. The others are never seen. Order and repetition of lines make no difference.
+/// For each of two groups of devices, the mean of each device's values over the days.
+struct KeyMeans {
+  std::string key;
+  KeyKind kind = KeyKind::Scalar;
+  std::array<std::vector<double>, 2> means;
+};
+
+struct ComparedGroups {
+  Member by = Member::Build;
+  std::array<std::string, 2> values;
+  DayRange days;
+  std::string prefix;  ///< of keys
+};
+
+/// A line as it was stored, without digest.
+using VisitLine = std::function<void(const ExportedLine& line)>;
+
+/// What became of a line that a store was given.
+enum class Outcome { New, Replaced, Repeated, Older, Refused };
+
+/// What was removed.
+struct Removal {
+  std::uint64_t lines = 0;
+  std::optional<std::int32_t> firstDay;  ///< the earliest that is still taken
+};
+
+inline constexpr int kMinLeast = 3;
+inline constexpr int kUsualLeast = 5;
+
+/// What many devices reported. For each device and day one line is current: that of the highest
+/// revision; of equal revisions the one created later; then the one with the greater digest. The
+/// others are never seen. Order and repetition of lines make no difference.
 ///
 /// Every operation throws `StoreFailure`.
 class FleetStore {
  public:
   virtual ~FleetStore() = default;
 
+  /// Answers over fewer devices are only counted.
+  virtual std::uint64_t least() = 0;
+
   /// Takes a line. It is stored whole or not at all, and durable once `finish` has returned.
-  virtual void add(const ExportedLine& line) = 0;
+  virtual Outcome add(const ExportedLine& line) = 0;
   virtual void finish() = 0;
 
   using VisitKey = std::function<void(const ReportedKey& key)>;
-  using VisitScalar = std::function<void(std::int32_t day, std::int64_t value)>;
-  using VisitDistribution = std::function<void(std::int32_t day, const Distribution& values)>;
+  using VisitDevices =
+      std::function<void(std::int32_t day, const MemberText& member, std::uint64_t devices)>;
+  using VisitScalar = std::function<void(const Origin& origin, std::int64_t value)>;
+  using VisitDistribution = std::function<void(const Origin& origin, Distribution&& values)>;
+  using VisitMeans = std::function<void(KeyMeans&& means)>;
 
-  /// The keys of the lines that hold, by their bytes, a scalar before a distribution.
+  /// The keys of the current lines, by their bytes, a scalar before a distribution.
   virtual void visitKeys(const VisitKey& visit) = 0;
-  /// What the devices reported under `key`, in any order.
-  virtual void visitScalars(std::string_view key, const DayRange& days,
+  virtual bool hasKey(std::string_view key, KeyKind kind) = 0;
+  virtual bool hasMember(Member by, const std::string& value) = 0;
+  /// How many devices have a day as their last, by day and then by the last line's member.
+  virtual void visitLastDays(Member by, const VisitDevices& visit) = 0;
+  /// What the devices reported under `key`, by day.
+  virtual void visitScalars(std::string_view key, const DayRange& days, Member by,
                             const VisitScalar& visit) = 0;
-  virtual void visitDistributions(std::string_view key, const DayRange& days,
+  virtual void visitDistributions(std::string_view key, const DayRange& days, Member by,
                                   const VisitDistribution& visit) = 0;
+  /// The text of a member's number, of the values visited so far.
+  virtual MemberText textOf(std::int64_t member) = 0;
+  virtual void visitMeans(const ComparedGroups& groups, const VisitMeans& visit) = 0;
+  /// The current lines of those days with the keys that begin with `prefix`, by day.
+  virtual void visitLines(const DayRange& days, const std::string& prefix,
+                          const VisitLine& visit) = 0;
+
+  /// Removes all that devices sent, and refuses their lines from then on.
+  virtual Removal forget(std::span<const std::string> devices) = 0;
+  /// Removes the lines of more than `days` days before the newest day that enough devices have and
+  /// that is not after `latest`, and refuses such lines from then on.
+  virtual Removal prune(std::int32_t days, std::int32_t latest) = 0;
 };
 
-/// Opens the store at an address: a ClickHouse database when it begins with "http://", else an
-/// SQLite file. To be loaded, what is missing is made: the file, readable for its owner alone, or
-/// the tables. Throws `StoreFailure`.
-std::unique_ptr<FleetStore> openFleetStore(const std::string& address, bool toBeLoaded);
+/// What is wrong with an address; empty when nothing is.
+std::string storeFault(const std::string& address);
+
+enum class StoreUse { Ask, Change, Load };
+
+/// Opens the store at an address: a ClickHouse database when it begins with "http://" or
+/// "https://", else an SQLite file. To be loaded, what is missing is made: the file, readable for
+/// its owner alone, or the tables, and a store of an earlier version is brought up to date. `least`
+/// is the least number of devices of a store that is made. Throws `StoreFailure`.
+std::unique_ptr<FleetStore> openFleetStore(const std::string& address, StoreUse use,
+                                           std::optional<int> least = {});
 
 }  // namespace vesprun

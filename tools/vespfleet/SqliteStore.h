@@ -3,78 +3,113 @@
 #include <map>
 #include <memory>
 #include <optional>
+#include <set>
 #include <string>
 #include <string_view>
 #include <unordered_map>
 #include <vector>
 
 #include "FleetStore.h"
+#include "Turn.h"
+#include "Varint.h"
 #include "platform/host/counters/SqliteConnection.h"
 
 namespace vesprun {
 
 /// A fleet in one SQLite file.
 ///
-/// A row for each value would scatter one line over the whole file. So the values of one key lie
-/// together in chunks, each a row of some kilobytes that grows at its end while lines come in, in
-/// the order of the lines' numbers; a question about a key reads its chunks from end to end. A
-/// line that is replaced loses its row in `line`, and what the chunks have of it is passed over
-/// from then on. Once that is more than what holds, the chunks are written anew.
+/// A row for each value would scatter one line over the whole file. So the values of one key and
+/// day lie together in packed chunks, rows of some kilobytes, in the order of the lines' numbers; a
+/// question about a key reads its chunks of the days it asks for. A line that is replaced loses its
+/// row in `line`, and what the chunks have of it is passed over from then on. Once that is more
+/// than what a day still has, its chunks are rewritten. Which keys a line has is its shape; devices
+/// mostly share a few.
 ///
 /// An entry of a chunk, all integers in groups of seven bits, low ones first: the line's number
 /// less that of the entry before; then for a scalar its value, the sign in the lowest bit; for a
 /// distribution four doubles, the count, the number of labels plus 1 (0: no histogram) and for each
-/// the number of its text in `label` and its count.
+/// the number of its text in `text` and its count.
 class SqliteStore : public FleetStore {
  public:
-  SqliteStore(const std::string& path, bool toBeLoaded);
+  SqliteStore(const std::string& path, StoreUse use, std::optional<int> least);
   ~SqliteStore() override;
 
-  void add(const ExportedLine& line) override;
+  std::uint64_t least() override { return _least; }
+  Outcome add(const ExportedLine& line) override;
   void finish() override;
   void visitKeys(const VisitKey& visit) override;
-  void visitScalars(std::string_view key, const DayRange& days, const VisitScalar& visit) override;
-  void visitDistributions(std::string_view key, const DayRange& days,
+  bool hasKey(std::string_view key, KeyKind kind) override;
+  bool hasMember(Member by, const std::string& value) override;
+  void visitLastDays(Member by, const VisitDevices& visit) override;
+  void visitScalars(std::string_view key, const DayRange& days, Member by,
+                    const VisitScalar& visit) override;
+  void visitDistributions(std::string_view key, const DayRange& days, Member by,
                           const VisitDistribution& visit) override;
+  MemberText textOf(std::int64_t member) override;
+  void visitMeans(const ComparedGroups& groups, const VisitMeans& visit) override;
+  void visitLines(const DayRange& days, const std::string& prefix, const VisitLine& visit) override;
+  Removal forget(std::span<const std::string> devices) override;
+  Removal prune(std::int32_t days, std::int32_t latest) override;
 
  private:
-  /// A line that holds.
+  static constexpr std::size_t kMaxPending = 50'000;
+
+  /// What questions need of a current line.
   struct Line {
     std::int64_t number = 0;
-    std::int32_t day = 0;
     std::int64_t device = 0;
+    std::int64_t member = 0;
   };
-  /// The chunk at the end of a key, while lines are added.
-  struct Tail {
-    std::int64_t chunk = 0;  ///< row identifier in `chunk`
-    std::int64_t last = 0;   ///< line number of its last entry, 0 when empty
+  using LinesOfDays = std::map<std::int32_t, std::vector<Line>>;  ///< lines by their numbers
+
+  /// Entries that were not written yet, the first without its line's number.
+  struct Pending {
+    std::int64_t first = 0;
+    std::int64_t last = 0;
     std::string entries;
   };
   struct Statements;
+  class Cursor;
 
-  bool replacesEarlier(const ExportedLine& line, std::int64_t device);
-  void append(std::int64_t key, std::int64_t line, std::string_view value);
-  void write(Tail& tail);
-  Tail& tailOf(std::int64_t key);
-  std::optional<std::int64_t> findNumber(const std::string& table, KeyKind kind,
-                                         std::string_view text);
-  std::int64_t numberOf(const std::string& table, KeyKind kind, std::string_view text);
+  void open(StoreUse use, std::optional<int> least);
+  void prepareChanges();
+  void bringUpToDate();
+  Outcome place(const ExportedLine& line);
+  void append(std::int32_t day, std::int64_t key, std::int64_t line, std::string_view value);
+  std::int64_t shapeOf(std::vector<std::int64_t> keys);
+  std::int64_t insertedNumber() const;
+  std::optional<std::int64_t> findNumber(const char* table, std::string_view text,
+                                         std::optional<KeyKind> kind = {});
+  std::int64_t numberOf(const char* table, std::string_view text, std::optional<KeyKind> kind = {});
   void beginBatch();
+  void writePending();
   void commitBatch();
-  void writeAnew();
-  std::vector<Line> linesThatHold(const DayRange& days);
+  void rewriteDay(std::int32_t day, std::set<std::int64_t>* labels = nullptr);
+  void removeUnused();
+  void giveBackRoom();
+
+  std::vector<Line> linesOf(std::int32_t day, Member by);
+  LinesOfDays linesOf(const DayRange& days, Member by);
+  std::set<std::int64_t> keysOfShape(std::int64_t shape);
+  std::set<std::int64_t> keysInUse();
   template <typename Read>
-  void visitEntries(std::int64_t key, const std::vector<Line>& lines, const Read& read);
+  void visitEntries(std::int32_t day, std::int64_t key, const std::vector<Line>& lines,
+                    const Read& read);
   template <typename Task>
   auto guarded(const Task& task);
 
   std::string _path;
+  Turn _turn;
   std::unique_ptr<SqliteConnection> _database;
-  std::unique_ptr<Statements> _statements;       ///< of a store that is loaded
-  bool _inBatch = false;                         ///< and so in a transaction
-  std::map<std::string, std::int64_t> _numbers;  ///< of names met in this batch
-  std::unordered_map<std::int64_t, Tail> _tails;
-  std::size_t _batchSize = 0;  ///< bytes of text
+  std::uint64_t _least = kUsualLeast;
+  std::int32_t _firstDay = 0;                                 ///< earlier lines are refused
+  std::set<std::string> _forgotten;                           ///< digests of devices' names
+  std::unique_ptr<Statements> _statements;                    ///< of a store that is changed
+  bool _inBatch = false;                                      ///< and so in a transaction
+  std::map<std::string, std::int64_t, std::less<>> _numbers;  ///< of names met in this batch
+  std::unordered_map<std::int64_t, Pending> _pending;
+  std::map<std::int32_t, std::int64_t> _replaced;  ///< lines replaced in this batch, by day
+  std::size_t _batchSize = 0;                      ///< bytes of text
 };
 
 }  // namespace vesprun

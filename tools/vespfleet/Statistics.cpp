@@ -4,25 +4,11 @@
 #include <cmath>
 #include <compare>
 #include <cstdlib>
+#include <functional>
 #include <limits>
 
 namespace vesprun {
 namespace {
-
-/// A sum that keeps what each addition loses (Neumaier), and more bits than a double.
-class Sum {
- public:
-  void add(long double value) {
-    const long double sum = _sum + value;
-    _lost += std::abs(_sum) >= std::abs(value) ? (_sum - sum) + value : (value - sum) + _sum;
-    _sum = sum;
-  }
-  long double value() const { return _sum + _lost; }
-
- private:
-  long double _sum = 0;
-  long double _lost = 0;
-};
 
 bool isBefore(const Statistics& left, const Statistics& right) {
   if (left.count != right.count) {
@@ -96,25 +82,41 @@ Statistics mergedStatistics(std::vector<Statistics> parts) {
   return merged;
 }
 
-Summary summaryOf(std::vector<std::int64_t> values) {
-  std::sort(values.begin(), values.end());
-  Summary summary{values.front(), values.back(), 0, {}};
-  // Quotients and remainders apart: neither of their sums can overflow.
-  const auto count = static_cast<std::int64_t>(values.size());
-  std::int64_t quotients = 0;
-  std::int64_t remainders = 0;
-  for (const std::int64_t value : values) {
-    quotients += value / count;
-    remainders += value % count;
-    quotients += remainders / count;
-    remainders %= count;
+double meanOf(Int128 sum, std::int64_t count) {
+  return static_cast<double>(static_cast<long double>(sum / count) +
+                             static_cast<long double>(sum % count) /
+                                 static_cast<long double>(count));
+}
+
+Summary summaryOf(std::vector<DeviceValue> values, std::uint64_t least) {
+  // The lowest value of each device and the greatest: a device counts once, however many days.
+  std::sort(values.begin(), values.end(), [](const DeviceValue& left, const DeviceValue& right) {
+    return std::pair(left.device, left.value) < std::pair(right.device, right.value);
+  });
+  std::vector<std::int64_t> lowest;
+  std::vector<std::int64_t> greatest;
+  std::vector<std::int64_t> all;
+  all.reserve(values.size());
+  Int128 sum = 0;
+  for (std::size_t i = 0; i < values.size(); ++i) {
+    if (i == 0 || values[i].device != values[i - 1].device) {
+      lowest.push_back(values[i].value);
+    }
+    if (i + 1 == values.size() || values[i].device != values[i + 1].device) {
+      greatest.push_back(values[i].value);
+    }
+    all.push_back(values[i].value);
+    sum += values[i].value;
   }
-  summary.mean =
-      static_cast<double>(static_cast<long double>(quotients) +
-                          static_cast<long double>(remainders) / static_cast<long double>(count));
+  Summary summary{meanOf(sum, static_cast<std::int64_t>(all.size())), {}};
+  std::sort(all.begin(), all.end());
+  std::sort(lowest.begin(), lowest.end());
+  std::sort(greatest.begin(), greatest.end(), std::greater<>());
   for (const int percent : kPercents) {
-    const std::size_t rank = (static_cast<std::size_t>(percent) * values.size() + 99) / 100;
-    summary.quantiles.push_back(values[rank - 1]);
+    const std::size_t rank = (static_cast<std::size_t>(percent) * all.size() + 99) / 100;
+    const std::int64_t value = all[rank - 1];
+    const bool isTold = value >= lowest.at(least - 1) && value <= greatest.at(least - 1);
+    summary.quantiles.push_back(isTold ? std::optional(value) : std::nullopt);
   }
   return summary;
 }

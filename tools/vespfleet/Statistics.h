@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cmath>
 #include <cstdint>
 #include <map>
 #include <optional>
@@ -29,18 +30,45 @@ struct Distribution {
 /// changes no bit of the result.
 Statistics mergedStatistics(std::vector<Statistics> parts);
 
-/// The smallest, the greatest, the mean and quantiles of integers.
+/// A sum that keeps what each addition loses (Neumaier), and more bits than a double.
+class Sum {
+ public:
+  void add(long double value) {
+    const long double sum = _sum + value;
+    _lost += std::abs(_sum) >= std::abs(value) ? (_sum - sum) + value : (value - sum) + _sum;
+    _sum = sum;
+  }
+  long double value() const { return _sum + _lost; }
+
+ private:
+  long double _sum = 0;
+  long double _lost = 0;
+};
+
+__extension__ using Int128 = __int128;
+
+/// The quotient as a double; the sum cannot overflow.
+double meanOf(Int128 sum, std::int64_t count);
+
+/// One device's integer.
+struct DeviceValue {
+  std::int64_t device = 0;
+  std::int64_t value = 0;
+};
+
+/// The mean and quantiles of integers of many devices.
 struct Summary {
-  std::int64_t minimum = 0;
-  std::int64_t maximum = 0;
   double mean = 0;
-  std::vector<std::int64_t> quantiles;  ///< one for each of `kPercents`
+  /// One for each of `kPercents`; nothing where too few devices have a value at or below it, or at
+  /// or above it.
+  std::vector<std::optional<std::int64_t>> quantiles;
 };
 
 inline constexpr int kPercents[] = {5, 25, 50, 75, 95};
 
-/// Summarizes one or more values. The quantile q of n values is the ⌈q·n⌉-th smallest.
-Summary summaryOf(std::vector<std::int64_t> values);
+/// Summarizes the values of at least `least` devices. The quantile q of n values is the ⌈q·n⌉-th
+/// smallest.
+Summary summaryOf(std::vector<DeviceValue> values, std::uint64_t least);
 
 /// The labels of a histogram by their boundaries, from low to high; labels of another form last.
 /// `overlap` becomes true when two buckets overlap: devices counted between different boundaries.

@@ -1,235 +1,351 @@
-#include <CLI/CLI.hpp>
 #include <cstdio>
-#include <cstring>
-#include <fstream>
 #include <iostream>
-#include <map>
-#include <new>
+#include <memory>
 
-#include "ExportedLine.h"
+#include "Answers.h"
+#include "Comparison.h"
+#include "FigureRow.h"
 #include "FleetStore.h"
-#include "Statistics.h"
+#include "Load.h"
+#include "Printing.h"
 #include "commandline/Arguments.h"
-#include "common/PropertyDict.h"
-#include "platform/host/documents/JsonForm.h"
-#include "platform/host/files/LineReader.h"
+#include "commandline/Completion.h"
+#include "commandline/Program.h"
+#include "common/Calendar.h"
+#include "common/TextForm.h"
+#include "platform/Clock.h"
 #include "platform/host/files/StandardStreams.h"
 
 namespace vesprun {
 namespace {
 
-constexpr std::uint64_t kLeastDevices = 5;
-constexpr std::size_t kLongestLine = std::size_t{64} * 1024 * 1024;
+// Before the command-line library makes its own global objects.
+[[gnu::constructor(101)]] void prepare() { exitWithoutMemory("vespfleet", 1); }
 
-/// A question about one key.
-struct Question {
+bool isJson() { return invocation().json; }
+
+std::int32_t today() { return static_cast<std::int32_t>(std::time(nullptr) / kSecondsPerDay); }
+
+/// What the command line says of a question.
+struct Asked {
   std::string store;
-  std::string key;
-  DayRange days;
-  std::uint64_t least = kLeastDevices;  ///< fewer devices than this are only counted
+  Question question;
+  std::optional<GivenDay> from;
+  std::optional<GivenDay> to;
+  ComparedGroups groups;
+  std::vector<std::string> devices;
+  std::int32_t days = 0;
+
+  DayRange range() const {
+    DayRange range;
+    if (from) {
+      range.from = from->on(today());
+    }
+    if (to) {
+      range.to = to->on(today());
+    }
+    return range;
+  }
 };
 
-void print(const PropertyDict& line) { std::cout << jsonText(line) << '\n'; }
-
-/// False when a line or a file was not taken.
-bool load(const std::string& address, const std::vector<std::string>& files) {
-  const auto store = openFleetStore(address, true);
-  std::uint64_t taken = 0;
-  std::uint64_t malformed = 0;
-  std::uint64_t unreadable = 0;
-  std::string_view text;
-  for (const std::string& file : files) {
-    const std::string name = file == "-" ? "standard input" : file;
-    std::ifstream opened;
-    if (file != "-") {
-      opened.open(file, std::ios::binary);
-    }
-    LineReader lines(file == "-" ? std::cin : opened, kLongestLine);
-    auto result = lines.next(text);
-    for (; result == LineReader::Result::Line || result == LineReader::Result::TooLong;
-         result = lines.next(text)) {
-      std::string why = "longer than 64 MiB";
-      std::optional<ExportedLine> line;
-      if (result == LineReader::Result::Line) {
-        line = parseExportedLine(text, why);
-      }
-      if (line) {
-        store->add(*line);
-        ++taken;
-      } else {
-        ++malformed;
-        std::fprintf(stderr, "%s:%llu: %s\n", name.c_str(),
-                     static_cast<unsigned long long>(lines.number()), why.c_str());
-      }
-    }
-    if (result == LineReader::Result::Failed) {
-      ++unreadable;
-      std::fprintf(stderr, "%s: %s\n", name.c_str(), std::strerror(errno));
-    }
-  }
-  store->finish();
-  print({{"files", static_cast<std::uint64_t>(files.size()) - unreadable},
-         {"unreadableFiles", unreadable},
-         {"lines", taken},
-         {"malformedLines", malformed}});
-  return malformed == 0 && unreadable == 0;
+std::unique_ptr<FleetStore> openStore(const std::string& address, StoreUse use = StoreUse::Ask) {
+  return openFleetStore(address, use);
 }
 
-void printKeys(const std::string& address) {
-  openFleetStore(address, false)->visitKeys([](const ReportedKey& key) {
-    print({{"key", key.key},
-           {"kind", key.kind == KeyKind::Scalar ? "scalar" : "distribution"},
-           {"devices", key.devices},
-           {"days", key.days}});
+void addStore(CLI::App& command, std::string& store) {
+  command.add_option("STORE", store, "An SQLite file, or http(s)://HOST:PORT/DATABASE")
+      ->required()
+      ->check(CLI::Validator(storeFault, ""))
+      ->type_name("");
+}
+
+std::shared_ptr<Asked> addAsked(CLI::App& command) {
+  const auto asked = std::make_shared<Asked>();
+  addStore(command, asked->store);
+  return asked;
+}
+
+void addRange(CLI::App& command, Asked& asked) {
+  addDay(command, "--from", asked.from, "The first day");
+  addDay(command, "--to", asked.to, "The last day");
+}
+
+void addLeast(CLI::App& command, std::uint64_t& least) {
+  command.add_option("--least", least, "Answers over fewer devices than this only count them")
+      ->type_name("N")
+      ->transform(decimal<std::uint64_t>());
+}
+
+CLI::Option* addBy(CLI::App& command, Member& by, bool withWhitelist) {
+  std::map<std::string, Member> names{{"build", Member::Build}, {"model", Member::Model}};
+  if (withWhitelist) {
+    names.emplace("whitelist", Member::Whitelist);
+  }
+  const std::string choice = withWhitelist ? "build, model or whitelist" : "build or model";
+  return command
+      .add_option_function<std::string>(
+          "--by",
+          [&by, names, choice](const std::string& name) {
+            const auto found = names.find(name);
+            if (found == names.end()) {
+              throw CLI::ValidationError("--by", "is one of " + choice);
+            }
+            by = found->second;
+          },
+          "Parts the devices by " + choice)
+      ->type_name("MEMBER");
+}
+
+const char* kindName(KeyKind kind) { return kind == KeyKind::Scalar ? "scalar" : "distribution"; }
+
+// Commands.
+
+void addLoad(CLI::App& command) {
+  struct Given {
+    std::string store;
+    std::vector<std::string> paths;
+    std::optional<int> least;
+    bool spools = false;
+  };
+  const auto given = std::make_shared<Given>();
+  addStore(command, given->store);
+  command.add_option("PATH", given->paths, "Files and folders of lines, - for standard input")
+      ->required()
+      ->type_name("");
+  command
+      .add_option("--least", given->least,
+                  "The least number of devices of a store that is made, 5 unless given")
+      ->type_name("N")
+      ->transform(decimal<int>())
+      ->check(CLI::Range(kMinLeast, std::numeric_limits<int>::max()));
+  command.add_flag(
+      "--spool", given->spools,
+      "Removes files once they are stored; what has malformed lines goes to rejected/");
+  command.callback([given] {
+    const LoadCounts counts = loadFiles(given->store, given->least, given->paths, given->spools);
+    if (isJson()) {
+      Results({}, true).print({{"lines", counts.lines},
+                               {"new", counts.added},
+                               {"replaced", counts.replaced},
+                               {"repeated", counts.repeated},
+                               {"older", counts.older},
+                               {"malformed", counts.malformed},
+                               {"refused", counts.refused}});
+    } else {
+      std::cout << counts.lines << " lines: " << counts.added << " new, " << counts.replaced
+                << " in place of earlier ones, " << counts.repeated << " repeated, " << counts.older
+                << " older, " << counts.malformed << " malformed, " << counts.refused
+                << " refused\n";
+    }
+    invocation().status = counts.malformed != 0 || counts.failed ? 1 : 0;
   });
 }
 
-void printScalar(const Question& question) {
-  std::map<std::int32_t, std::vector<std::int64_t>> days;
-  openFleetStore(question.store, false)
-      ->visitScalars(question.key, question.days,
-                     [&days](std::int32_t day, std::int64_t value) { days[day].push_back(value); });
-  for (auto& [day, values] : days) {
-    PropertyDict line{{"day", day}, {"devices", static_cast<std::uint64_t>(values.size())}};
-    if (values.size() >= question.least) {
-      const Summary summary = summaryOf(std::move(values));
-      PropertyDict quantiles;
-      for (std::size_t i = 0; i < std::size(kPercents); ++i) {
-        quantiles.set(jsonText(PropertyValue(kPercents[i] / 100.0)), summary.quantiles[i]);
+void addKeys(CLI::App& command) {
+  const auto asked = addAsked(command);
+  command.callback([asked] {
+    const auto store = openStore(asked->store);
+    Results results({"key", "kind", "devices", "days"}, isJson());
+    store->visitKeys([&](const ReportedKey& key) {
+      if (key.devices < store->least()) {
+        return;
       }
-      line.set("minimum", summary.minimum);
-      line.set("maximum", summary.maximum);
-      line.set("mean", summary.mean);
-      line.set("quantiles", std::move(quantiles));
-    }
-    print(line);
-  }
-}
-
-/// What the devices of one day reported.
-struct DayOfDistribution {
-  std::vector<Statistics> statistics;
-  Histogram histogram;
-  std::uint64_t histograms = 0;
-};
-
-void printDistribution(const Question& question) {
-  std::map<std::int32_t, DayOfDistribution> days;
-  openFleetStore(question.store, false)
-      ->visitDistributions(question.key, question.days,
-                           [&days](std::int32_t day, const Distribution& reported) {
-                             DayOfDistribution& all = days[day];
-                             all.statistics.push_back(reported.statistics);
-                             if (reported.histogram) {
-                               ++all.histograms;
-                               for (const auto& [label, count] : *reported.histogram) {
-                                 all.histogram[label] += count;
-                               }
-                             }
-                           });
-  for (auto& [day, all] : days) {
-    const auto devices = static_cast<std::uint64_t>(all.statistics.size());
-    std::string line =
-        "{\"day\":" + std::to_string(day) + ",\"devices\":" + std::to_string(devices);
-    if (devices >= question.least) {
-      const Statistics merged = mergedStatistics(std::move(all.statistics));
-      line += ",\"statistics\":" +
-              jsonText(PropertyValue(PropertyArray{merged.minimum, merged.maximum, merged.mean,
-                                                   merged.deviations, merged.count})) +
-              ",\"histogram\":";
-      if (all.histograms > 0 && all.histograms >= question.least) {
-        bool overlap = false;
-        PropertyDict histogram;
-        for (const std::string& label : labelsInOrder(all.histogram, overlap)) {
-          histogram.set(label, all.histogram.at(label));
-        }
-        line += jsonText(histogram);
-        if (overlap) {
-          std::fprintf(stderr,
-                       "vespfleet: day %d: devices counted between different boundaries; their "
-                       "buckets stand side by side\n",
-                       day);
-        }
+      if (results.isJson()) {
+        results.print({{"key", key.key},
+                       {"kind", kindName(key.kind)},
+                       {"devices", key.devices},
+                       {"days", key.days}});
       } else {
-        line += "null";
+        results.addRow(
+            {key.key, kindName(key.kind), std::to_string(key.devices), std::to_string(key.days)});
+      }
+    });
+  });
+}
+
+void addDevices(CLI::App& command) {
+  const auto asked = addAsked(command);
+  addBy(command, asked->question.by, false);
+  command.callback([asked] {
+    const Member by = asked->question.by;
+    std::vector<std::string> titles{"last day", "devices"};
+    if (by != Member::None) {
+      titles.insert(titles.begin() + 1, nameOf(by));
+    }
+    Results results(std::move(titles), isJson());
+    openStore(asked->store)
+        ->visitLastDays(by, [&](std::int32_t day, const MemberText& member, std::uint64_t devices) {
+          if (results.isJson()) {
+            JsonLine line{{"day", day}};
+            if (by != Member::None) {
+              line[nameOf(by)] = member ? JsonLine(*member) : JsonLine();
+            }
+            line["devices"] = devices;
+            results.print(line);
+            return;
+          }
+          std::vector<std::string> row{dateOfDay(day), std::to_string(devices)};
+          if (by != Member::None) {
+            row.insert(row.begin() + 1, member.value_or("none"));
+          }
+          results.addRow(std::move(row));
+        });
+  });
+}
+
+std::shared_ptr<Asked> addQuestion(CLI::App& command) {
+  const auto asked = addAsked(command);
+  command.add_option("KEY", asked->question.key, "The key")->required()->type_name("");
+  addRange(command, *asked);
+  addBy(command, asked->question.by, true);
+  command.add_flag("--total", asked->question.total, "All days together");
+  addLeast(command, asked->question.least);
+  return asked;
+}
+
+template <void (*print)(FleetStore&, const Question&, bool)>
+void addQuestionCommand(CLI::App& command) {
+  const auto asked = addQuestion(command);
+  command.callback([asked] {
+    const auto store = openStore(asked->store);
+    asked->question.days = asked->range();
+    asked->question.least = std::max(asked->question.least, store->least());
+    print(*store, asked->question, isJson());
+  });
+}
+
+void addCompare(CLI::App& command) {
+  const auto asked = addAsked(command);
+  command.add_option("A", asked->groups.values[0], "The devices to compare with")
+      ->required()
+      ->type_name("");
+  command.add_option("B", asked->groups.values[1], "The devices that are compared")
+      ->required()
+      ->type_name("");
+  addBy(command, asked->groups.by, true)->required();
+  addRange(command, *asked);
+  command.add_option("--key", asked->groups.prefix, "Only keys that begin so")->type_name("PREFIX");
+  addLeast(command, asked->question.least);
+  command.callback([asked] {
+    ComparedGroups& groups = asked->groups;
+    if (groups.values[0] == groups.values[1]) {
+      throw CLI::ValidationError("A and B are the same");
+    }
+    const auto store = openStore(asked->store);
+    groups.days = asked->range();
+    for (const std::string& value : groups.values) {
+      if (!store->hasMember(groups.by, value)) {
+        throw StoreFailure(asked->store + ": no line has the " + nameOf(groups.by) + ' ' + value);
       }
     }
-    std::cout << line << "}\n";
-  }
+    printComparison(compareKeys(*store, groups, std::max(asked->question.least, store->least())),
+                    isJson());
+  });
 }
 
-CLI::App* addQuestion(CLI::App& vespfleet, const char* name, const char* help, Question& question) {
-  CLI::App* command = vespfleet.add_subcommand(name, help);
-  command->add_option("STORE", question.store, "The store")->required();
-  command->add_option("KEY", question.key, "The key")->required();
-  command->add_option("--from", question.days.from, "First day, in days since 1970")
-      ->transform(decimal<std::int32_t>());
-  command->add_option("--to", question.days.to, "Last day")->transform(decimal<std::int32_t>());
-  command
-      ->add_option("--least", question.least,
-                   "A day with fewer devices than this shows only their number")
-      ->transform(decimal<std::uint64_t>())
-      ->capture_default_str();
-  return command;
+void addDump(CLI::App& command) {
+  const auto asked = addAsked(command);
+  command.add_option("--key", asked->groups.prefix, "Only keys that begin so")->type_name("PREFIX");
+  addRange(command, *asked);
+  command.callback([asked] {
+    const auto store = openStore(asked->store);
+    std::cout << kFigureColumns << '\n';
+    store->visitLines(asked->range(), asked->groups.prefix, [](const ExportedLine& line) {
+      std::string about;
+      appendCsvField(about, line.device);
+      about += std::to_string(line.day) + ',' + dateOfDay(line.day) + ',' +
+               std::to_string(line.revision) + ',';
+      appendCsvField(about, line.build.value_or(""));
+      appendCsvField(about, line.model.value_or(""));
+      const auto print = [&about](const char* kind, std::string_view key, std::string_view field,
+                                  const std::string& value) {
+        std::string row = about + kind + ',';
+        appendCsvField(row, key);
+        appendCsvField(row, field);
+        std::cout << row << value << '\n';
+      };
+      for (const ReportedScalar& scalar : line.scalars) {
+        print("scalar", scalar.key, "value", std::to_string(scalar.value));
+      }
+      for (const ReportedDistribution& distribution : line.distributions) {
+        const Statistics& values = distribution.values.statistics;
+        const std::pair<const char*, double> fields[] = {{"minimum", values.minimum},
+                                                         {"maximum", values.maximum},
+                                                         {"mean", values.mean},
+                                                         {"deviations", values.deviations}};
+        for (const auto& [field, value] : fields) {
+          print("distribution", distribution.key, field, textForm(Number(value)));
+        }
+        print("distribution", distribution.key, "count", std::to_string(values.count));
+      }
+      for (const ReportedDistribution& distribution : line.distributions) {
+        if (distribution.values.histogram) {
+          for (const auto& [label, count] : *distribution.values.histogram) {
+            print("histogram", distribution.key, label, std::to_string(count));
+          }
+        }
+      }
+    });
+  });
 }
 
-int run(int argc, char** argv) {
-  std::ios::sync_with_stdio(false);  // standard input is read in large pieces
-  CLI::App vespfleet(
-      "Keeps the daily logs of many devices and answers questions about them.\n"
-      "STORE is the path of an SQLite file, or http://HOST:PORT/DATABASE of a ClickHouse server.",
-      "vespfleet");
-  vespfleet.require_subcommand(1);
-  bool complete = true;
-
-  std::string store;
-  std::vector<std::string> files;
-  CLI::App* loading = vespfleet.add_subcommand("load", "Takes lines that vespctl export wrote");
-  loading->add_option("STORE", store, "The store; an SQLite file is made")->required();
-  loading->add_option("FILE", files, "Files of lines, - for standard input")->required();
-  loading->callback([&] { complete = load(store, files); });
-
-  CLI::App* keys = vespfleet.add_subcommand("keys", "Lists the keys, with their devices and days");
-  keys->add_option("STORE", store, "The store")->required();
-  keys->callback([&] { printKeys(store); });
-
-  Question question;
-  addQuestion(vespfleet, "scalar", "Summarizes a scalar over the devices, a line for each day",
-              question)
-      ->callback([&] { printScalar(question); });
-  addQuestion(vespfleet, "distribution",
-              "Merges a distribution of the devices, a line for each day", question)
-      ->callback([&] { printDistribution(question); });
-
-  try {
-    vespfleet.parse(argc, argv);
-  } catch (const CLI::Success& help) {
-    vespfleet.exit(help);
-  } catch (const CLI::ParseError& error) {
-    vespfleet.exit(error);
-    return 2;
-  } catch (const std::invalid_argument& usage) {
-    std::fprintf(stderr, "vespfleet: %s\n", usage.what());
-    return 2;
-  }
-  if (!std::cout.flush()) {
-    std::fputs("vespfleet: standard output cannot be written\n", stderr);
-    return 1;
-  }
-  return complete ? 0 : 1;
+void addForget(CLI::App& command) {
+  const auto asked = addAsked(command);
+  command.add_option("DEVICE", asked->devices, "Devices, by their names")
+      ->required()
+      ->type_name("");
+  command.callback([asked] {
+    const Removal removal = openStore(asked->store, StoreUse::Change)->forget(asked->devices);
+    if (isJson()) {
+      Results({}, true).print({{"devices", asked->devices.size()}, {"lines", removal.lines}});
+    } else {
+      std::cout << removal.lines << " lines removed; further ones will be refused\n";
+    }
+  });
 }
+
+void addPrune(CLI::App& command) {
+  const auto asked = addAsked(command);
+  command.add_option("--days", asked->days, "Days to keep before the newest")
+      ->required()
+      ->type_name("N")
+      ->transform(decimal<std::int32_t>())
+      ->check(CLI::Range(0, 100'000));
+  command.callback([asked] {
+    const Removal removal =
+        openStore(asked->store, StoreUse::Change)->prune(asked->days, today() + 1);
+    if (isJson()) {
+      Results({}, true).print(
+          {{"lines", removal.lines}, {"firstDay", removal.firstDay.value_or(0)}});
+    } else {
+      std::cout << removal.lines << " lines removed; those before "
+                << dateOfDay(removal.firstDay.value_or(0)) << " will be refused\n";
+    }
+  });
+}
+
+constexpr Command kCommands[] = {
+    {"load", "Takes lines that vespctl export wrote", addLoad},
+    {"keys", "Lists the keys, with their devices and days", addKeys},
+    {"devices", "Tells how many devices have which day as their last", addDevices},
+    {"scalar", "Summarizes a scalar over the devices, a line for each day",
+     addQuestionCommand<printScalars>},
+    {"distribution", "Merges a distribution of the devices, a line for each day",
+     addQuestionCommand<printDistributions>},
+    {"compare", "Tells which keys differ between two groups of devices", addCompare},
+    {"dump", "Prints what is stored as CSV, for other programs", addDump, Form::Own},
+    {"forget", "Removes all that devices sent, and refuses more", addForget},
+    {"prune", "Removes old days, and refuses them from then on", addPrune},
+    {"completion", "Prints the completion script for a shell", addCompletionCommand, Form::Own},
+};
 
 }  // namespace
 }  // namespace vesprun
 
 int main(int argc, char** argv) {
-  try {
-    vesprun::holdStandardStreams();
-    return vesprun::run(argc, argv);
-  } catch (const std::bad_alloc&) {
-    std::fputs("vespfleet: out of memory\n", stderr);
-  } catch (const std::exception& failure) {  // most are a `StoreFailure`
-    std::fprintf(stderr, "vespfleet: %s\n", failure.what());
-  }
-  return 1;
+  std::ios::sync_with_stdio(false);
+  return vesprun::runProgram(
+      {"vespfleet", "Keeps the daily logs of many devices and answers questions about them.",
+       vesprun::kCommands},
+      argc, argv);
 }

@@ -1,6 +1,7 @@
 #include "outbox/ExportCommand.h"
 
 #include <cstdint>
+#include <iostream>
 #include <limits>
 
 #include "Command.h"
@@ -11,7 +12,10 @@
 #include "outbox/SubmittedLogs.h"
 #include "platform/host/device/LiveSystem.h"
 #include "platform/host/device/Pseudonym.h"
+#include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/XmlText.h"
+#include "platform/host/outbox/LogNotes.h"
+#include "vespfleet/ExportedLine.h"
 
 namespace vesprun {
 namespace {
@@ -35,22 +39,39 @@ void run(const Export& wanted) {
           ? wanted.device
           : pseudonymOf(platform->description().system.systemID.value_or(live::machineIdentifier()),
                         "vesprun exported device");
+  const auto notes =
+      orFail([&](std::string& error) { return readSubmittedNotes(platform->directory(), error); });
+  std::vector<UnreadableLog> refused;
   const auto print = [&](SubmittedLog&& log) {
     if (log.day < from || log.day > to) {
       return;
     }
     const auto entry = [&log](std::string_view key) { return *log.document.find(key); };
-    printJson({{"version", 1},
-               {"device", device},
-               {"day", log.day},
-               {"revision", log.revision},
-               {"created", entry("TBLogCreationDate")},
-               {"whitelist", entry("TBWhitelistDigest")},
-               {"scalars", entry("TBScalars")},
-               {"distributions", entry("TBDistributions")},
-               {"histograms", entry("TBDistributionsHistogram")}});
+    const auto noted = notes->find(log.name);
+    const SubmittedNote note = noted != notes->end() ? noted->second : SubmittedNote{};
+    const auto orNull = [](const std::optional<std::string>& text) {
+      return text ? Json(*text) : Json(nullptr);
+    };
+    const std::string line = jsonText({{"version", 2},
+                                       {"device", device},
+                                       {"day", log.day},
+                                       {"revision", log.revision},
+                                       {"created", entry("TBLogCreationDate")},
+                                       {"build", orNull(note.build)},
+                                       {"model", orNull(note.model)},
+                                       {"whitelist", entry("TBWhitelistDigest")},
+                                       {"scalars", entry("TBScalars")},
+                                       {"distributions", entry("TBDistributions")},
+                                       {"histograms", entry("TBDistributionsHistogram")}});
+    std::string why;
+    if (parseExportedLine(line, why)) {
+      std::cout << line << '\n';
+    } else {
+      refused.push_back({log.name, "no store would take it: " + why, true});
+    }
   };
-  const std::vector<UnreadableLog> unreadable = forEachSubmittedLog(platform->directory(), print);
+  std::vector<UnreadableLog> unreadable = forEachSubmittedLog(platform->directory(), print);
+  unreadable.insert(unreadable.end(), refused.begin(), refused.end());
   if (!unreadable.empty()) {
     nameUnreadable(std::span(unreadable).first(unreadable.size() - 1));
     throw CommandFailure(unreadable.back().name + ": " + unreadable.back().why);

@@ -1,0 +1,353 @@
+#!/usr/bin/env python3
+"""Compares vespfleet with a small model of what it promises: fleet_test.py PROGRAM
+
+Each case runs on an SQLite file and, when VESPFLEET_TEST_SERVER has its address, in a ClickHouse database.
+"""
+
+import gzip
+import hashlib
+import json
+import math
+import os
+import random
+import signal
+import subprocess
+import sys
+import tempfile
+import time
+import urllib.request
+from collections import defaultdict
+from fractions import Fraction
+from pathlib import Path
+
+PROGRAM = sys.argv[1]
+SERVER = os.environ.get("VESPFLEET_TEST_SERVER")
+DAY = 20000
+
+
+def run(*words, status=0, data=None):
+    done = subprocess.run([PROGRAM, *map(str, words)], input=data, capture_output=True)
+    assert done.returncode == status, (words, done.returncode, done.stderr)
+    assert (status == 0) == (not done.stderr), done.stderr
+    run.errors = done.stderr.decode()
+    return done.stdout.decode()
+
+
+def ask(*words):
+    return [json.loads(line) for line in run(*words, "--json").splitlines()]
+
+
+def line(device, day=DAY, revision=1, created=0, build="A", scalars=None, distributions=None, histograms=None):
+    return json.dumps({
+        "version": 2, "device": device, "day": day, "revision": revision,
+        "created": {"date": f"2026-01-01T00:00:{created:02}Z"}, "build": build, "model": None,
+        "whitelist": "w", "scalars": scalars or {}, "distributions": distributions or {},
+        "histograms": histograms or {}})
+
+
+class Model:
+    """What a store holds of these lines, and what it answers."""
+
+    def __init__(self, lines, least=5):
+        self.least = least
+        self.current = {}
+        for text in lines:
+            entry = json.loads(text)
+            rank = (entry["revision"], entry["created"]["date"], hashlib.sha256(text.encode()).digest())
+            at = (entry["day"], entry["device"])
+            if at not in self.current or self.current[at][0] < rank:
+                self.current[at] = (rank, entry)
+
+    def values(self, key, kind, by, total):
+        groups = defaultdict(list)
+        for (day, device), (_, entry) in self.current.items():
+            if key in entry[kind]:
+                groups[(0 if total else day, entry[by] if by else None)].append((device, day, entry))
+        return sorted(groups.items(), key=lambda group: (group[0][0], group[0][1] or ""))
+
+    def begin(self, group, members, by, total):
+        days = [day for _, day, _ in members]
+        found = {"from": min(days), "to": max(days), "deviceDays": len(days)} if total else {"day": days[0]}
+        if by:
+            found[by] = group[1]
+        found["devices"] = len({device for device, _, _ in members})
+        return found
+
+    def scalar(self, key, by=None, total=False):
+        for group, members in self.values(key, "scalars", by, total):
+            found = self.begin(group, members, by, total)
+            if found["devices"] >= self.least:
+                values = sorted((entry["scalars"][key], device) for device, _, entry in members)
+                found["mean"] = float(Fraction(sum(v for v, _ in values), len(values)))
+                found["quantiles"] = {}
+                for percent in (5, 25, 50, 75, 95):
+                    value = values[-(-percent * len(values) // 100) - 1][0]
+                    sides = ({d for v, d in values if v <= value}, {d for v, d in values if v >= value})
+                    enough = min(map(len, sides)) >= self.least
+                    found["quantiles"][str(percent / 100)] = value if enough else None
+            yield found
+
+    def distribution(self, key, by=None, total=False):
+        for group, members in self.values(key, "distributions", by, total):
+            found = self.begin(group, members, by, total)
+            if found["devices"] >= self.least:
+                parts = [entry["distributions"][key] for _, _, entry in members]
+                count = sum(part[4] for part in parts)
+                mean = sum(Fraction(part[2]) * part[4] for part in parts) / count
+                deviations = sum(Fraction(part[3]) + part[4] * (Fraction(part[2]) - mean) ** 2 for part in parts)
+                found["statistics"] = {"count": count, "mean": float(mean), "deviations": float(deviations)}
+                having = defaultdict(set)
+                counts = defaultdict(int)
+                all_with = set()
+                for device, _, entry in members:
+                    for label, number in entry["histograms"].get(key, {}).items():
+                        having[label].add(device)
+                        counts[label] += number
+                    if key in entry["histograms"]:
+                        all_with.add(device)
+                found["histogram"] = None if len(all_with) < self.least else {
+                    label: counts[label] for label in counts if len(having[label]) >= self.least}
+                if found["histogram"] and "(0, 2]" in found["histogram"] and len(found["histogram"]) > 1:
+                    found["overlaps"] = True
+            yield found
+
+    def keys(self):
+        found = defaultdict(lambda: (set(), set()))
+        for (day, device), (_, entry) in self.current.items():
+            for kind in ("scalars", "distributions"):
+                for key in entry[kind]:
+                    found[(key.encode(), kind)][0].add(device)
+                    found[(key.encode(), kind)][1].add(day)
+        for (key, kind), (devices, days) in sorted(found.items(), key=lambda i: (i[0][0], i[0][1] != "scalars")):
+            if len(devices) >= self.least:
+                yield {"key": key.decode(), "kind": kind[:-1], "devices": len(devices), "days": len(days)}
+
+    def compare(self, a, b):
+        means = defaultdict(lambda: ({}, {}))
+        for (_, device), (_, entry) in self.current.items():
+            if entry["build"] in (a, b):
+                side = 0 if entry["build"] == a else 1
+                for key, value in entry["scalars"].items():
+                    means[(key, "scalar")][side].setdefault(device, []).append((value, 1))
+                for key, value in entry["distributions"].items():
+                    means[(key, "distribution")][side].setdefault(device, []).append((value[2], value[4]))
+        rows = []
+        for (key, kind), sides in means.items():
+            if min(map(len, sides)) < self.least:
+                continue
+            groups = [[float(sum(Fraction(v) * n for v, n in of) / sum(n for _, n in of)) for of in side.values()]
+                      for side in sides]
+            n, m = map(len, groups)
+            mean = [math.fsum(group) / len(group) for group in groups]
+            x, y = (math.fsum((v - mean[i]) ** 2 for v in groups[i]) / (len(groups[i]) - 1) / len(groups[i])
+                    for i in (0, 1))
+            if x + y == 0:
+                p = float(mean[0] == mean[1])
+            else:
+                p = student(abs(mean[1] - mean[0]) / math.sqrt(x + y),
+                            (x + y) ** 2 / (x * x / (n - 1) + y * y / (m - 1)))
+            rows.append({"key": key, "kind": kind, "devicesA": n, "devicesB": m, "meanA": mean[0], "meanB": mean[1],
+                         "difference": mean[1] - mean[0],
+                         "relative": (mean[1] - mean[0]) / abs(mean[0]) if mean[0] else None, "p": p})
+        rows.sort(key=lambda row: (row["p"], row["key"], row["kind"] != "scalar"))
+        for rank, row in enumerate(rows):
+            row["q"] = min(later["p"] * len(rows) / (at + 1) for at, later in enumerate(rows) if at >= rank)
+        return rows
+
+
+def student(t, freedom):
+    """Two-sided probability of Student's distribution: its density summed up by Simpson's rule."""
+    scale = math.exp(math.lgamma((freedom + 1) / 2) - math.lgamma(freedom / 2)) / math.sqrt(freedom * math.pi)
+    steps = 20000
+    height = [scale * (1 + (t * i / steps) ** 2 / freedom) ** (-(freedom + 1) / 2) for i in range(steps + 1)]
+    inside = (height[0] + height[-1] + 4 * sum(height[1:-1:2]) + 2 * sum(height[2:-1:2])) * t / steps / 3
+    return max(0.0, 1 - 2 * inside)
+
+
+def assert_same(found, expected, at=""):
+    """Equal, numbers with a fraction but for rounding."""
+    if isinstance(expected, float):
+        assert math.isclose(found, expected, rel_tol=1e-9, abs_tol=1e-9), (at, found, expected)
+    elif isinstance(expected, dict):
+        assert isinstance(found, dict) and list(found) == list(expected) or sorted(found) == sorted(expected), \
+            (at, found, expected)
+        for name in expected:
+            assert_same(found[name], expected[name], f"{at}.{name}")
+    elif isinstance(expected, list):
+        assert len(found) == len(expected), (at, found, expected)
+        for i, element in enumerate(expected):
+            assert_same(found[i], element, f"{at}[{i}]")
+    else:
+        assert found == expected, (at, found, expected)
+
+
+def assert_answers(store, model):
+    assert_same(ask("keys", store), list(model.keys()), "keys")
+    for by in (None, "build"):
+        for total in (False, True):
+            options = (["--by", by] if by else []) + (["--total"] if total else [])
+            for kind, key in (("scalar", "a"), ("scalar", "b"), ("distribution", "d")):
+                assert_same(ask(kind, store, key, *options), list(getattr(model, kind)(key, by, total)),
+                            f"{kind} {key} {options}")
+    assert_same(ask("compare", store, "A", "B", "--by", "build"), model.compare("A", "B"), "compare")
+
+
+def some_lines(chance, devices=40, days=3):
+    lines = []
+    for day in range(DAY, DAY + days):
+        for device in range(devices):
+            for revision in range(1, chance.choice((2, 2, 3))):
+                for _ in range(chance.choice((1, 1, 2))):  # of one revision and moment: the digest decides
+                    scalars = {"a": chance.choice((-2**63, 2**63 - 1, chance.randrange(9))), "b": device // 4}
+                    if chance.random() < 0.1:
+                        scalars = {"only." + str(device): 1}
+                    lines.append(line(f"D{device}", day, revision, chance.randrange(2), chance.choice("AAAABBBBBC") if
+                                      device else None, scalars,
+                                      {"d": [0, 9, chance.randrange(90) / 7, chance.random(), chance.randrange(1, 99)],
+                                       "e": [0, 0, 1.5, 0, 7]},
+                                      {"d": {chance.choice(("(-inf, 1]", "(0, 2]", "(1, inf)")): chance.randrange(2**40)}}
+                                      if chance.random() < 0.6 else {}))
+    return lines
+
+
+def test_answers(store, folder, chance):
+    lines = some_lines(chance)
+    model = Model(lines)
+    for attempt in range(2):
+        chance.shuffle(lines)
+        half = len(lines) // 2 + attempt
+        (folder / "in").mkdir(exist_ok=True)
+        (folder / "in/1.jsonl").write_text("\n".join(lines[:half]) + "\n")
+        packed = gzip.compress((lines[half] + "\n").encode()) + gzip.compress("\n".join(lines[half + 1:]).encode())
+        (folder / "in/2.jsonl.gz").write_bytes(packed)
+        assert ask("load", store, folder / "in")[0]["lines"] == len(lines)
+        assert_answers(store, model)
+    rows = run("dump", store, "--key", "a", "--to", DAY).splitlines()
+    expected = {f"{device},{day},2024-10-04,{entry['revision']},{entry['build'] or ''},,scalar,a,value,"
+                f"{entry['scalars']['a']}" for (day, device), (_, entry) in model.current.items()
+                if day == DAY and "a" in entry["scalars"]}
+    assert rows[0] == "device,day,date,revision,build,model,kind,key,field,value" and set(rows[1:]) == expected
+    last = defaultdict(int)
+    for device in {device for _, device in model.current}:
+        last[max(day for day, of in model.current if of == device)] += 1
+    assert ask("devices", store) == [{"day": day, "devices": last[day]} for day in sorted(last)]
+
+    for words in (("scalar", store, "d"), ("distribution", store, "no"), ("compare", store, "A", "Z", "--by", "build"),
+                  ("load", store, "--least", "4", "/dev/null")):
+        run(*words, status=1)
+        assert run.errors.count("\n") == 1, run.errors
+    for words in (("compare", store, "A", "A", "--by", "build"), ("load", store, "--least", "2", "/dev/null"),
+                  ("keys", "ftp://x/y"), ("keys", "http://u:p@127.0.0.1:1/x")):
+        run(*words, status=2)
+
+    run("forget", store, "D3", "D39")
+    lines = [text for text in lines if json.loads(text)["device"] not in ("D3", "D39")]
+    assert_answers(store, Model(lines))
+    lines.append(line("D7", 84005))  # the newest day has a single device
+    run("load", store, "-", data="\n".join(lines + [line("D3")]).encode())
+    run("prune", store, "--days", 1)
+    assert ask("load", store, "-")[0]["lines"] == 0
+    run("load", store, "-", data=lines[0].encode())
+    assert_answers(store, Model([text for text in lines if json.loads(text)["day"] > DAY]))
+    if "://" not in store:
+        held = Path(store).read_bytes()
+        assert b"D39" not in held and b"only.39" not in held, "what a device sent is still in the file"
+
+
+def test_malformed(store, folder, _):
+    good = json.loads(line("D", scalars={"a": 1}, distributions={"d": [0, 1, 1, 0, 0]}))
+    bad = [b"", b"[]", b"{", json.dumps(dict(good, more=1)).encode(), json.dumps(good)[:-1].encode() + b',"day":1}',
+           b" " * (16 << 20) + json.dumps(good).encode()]
+    for name, value in (("version", 1), ("device", ""), ("device", "x" * 256), ("device", "\x01"), ("day", -1),
+                        ("day", 84006), ("revision", 0), ("revision", 2**31), ("build", 5), ("created", "x"),
+                        ("scalars", {"": 1}), ("scalars", {"k" * 1025: 1}), ("scalars", {"a": 2**63}),
+                        ("scalars", {"a": 1.0}), ("scalars", {"a": None}),
+                        ("scalars", {str(i): 1 for i in range(20000)}), ("distributions", {"d": [0, 0, 0, 0, -1]}),
+                        ("distributions", {"d": [0, 0, 0, 0, 2**31]}), ("distributions", {"d": [0, 0, 0, None, 1]}),
+                        ("histograms", {"d": {"x": 2**63}}), ("histograms", {"d": {"x": -1}})):
+        bad.append(json.dumps(dict(good, **{name: value})).encode())
+    spool = folder / "spool"
+    (spool / "D").mkdir(parents=True)
+    (spool / "D/good.jsonl").write_text(json.dumps(good))
+    (spool / "D/other.jsonl").write_text(line("E", scalars={"a": 2}))
+    (spool / "cut.jsonl.gz").write_bytes(gzip.compress(("\n".join([line("F", scalars={"a": 3})] * 99)).encode())[:-9])
+    (spool / "bad.jsonl").write_bytes(b"\n".join(bad) + b"\n" + line("G", scalars={"a": 4}).encode())
+    os.mkfifo(spool / "fifo.jsonl")
+    run("load", store, "--spool", spool, status=1)
+    errors = run.errors.splitlines()
+    assert len(errors) == len(bad) + 2 and "D" * 9 not in run.errors, run.errors
+    assert [f"{spool}/bad.jsonl:{i + 1}" for i in range(len(bad))] == [
+        error.split(": ")[0] for error in errors if "bad.jsonl" in error]
+    left = sorted(str(path.relative_to(spool)) for path in spool.rglob("*") if not path.is_dir())
+    assert left == ["D/rejected/other.jsonl", "fifo.jsonl", "rejected/bad.jsonl", "rejected/cut.jsonl.gz"], left
+    assert ask("scalar", store, "a")[0]["devices"] in (2, 3)
+    run("distribution", store, "d", status=1)
+
+
+def test_kills(store, folder, chance):
+    lines = []
+    for revision in range(1, 30):
+        for device in range(20):
+            value = revision * 1000 + device
+            lines.append(line(f"D{device}", DAY, revision, 0, "AB"[device % 2], {"a": value, f"b{value}": 1},
+                              {"d": [1, 2, 1.5, 0.5, value]}, {"d": {"x": value}}))
+    (folder / "all.jsonl").write_text("\n".join(lines))
+    run("load", store, "-", data=lines[0].encode())
+    for delay in (0, 0.01, 0.03, 0.1):
+        child = subprocess.Popen([PROGRAM, "load", store, folder / "all.jsonl"], stdout=subprocess.DEVNULL)
+        time.sleep(delay)
+        child.send_signal(signal.SIGKILL)
+        child.wait()
+        for answer in ask("scalar", store, "a", "--total") if delay else []:
+            assert answer["deviceDays"] == answer["devices"]
+    loads = [subprocess.Popen([PROGRAM, "load", store, folder / "all.jsonl"], stdout=subprocess.DEVNULL) for _ in "12"]
+    assert [load.wait() for load in loads] == [0, 0]
+    model = Model(lines)
+    assert_same(ask("keys", store), list(model.keys()))
+    assert_same(ask("scalar", store, "a"), list(model.scalar("a")))
+    assert_same(ask("distribution", store, "d", "--by", "build"), list(model.distribution("d", "build")))
+    assert "://" in store or os.path.getsize(store) < 300_000
+
+
+def test_refused_stores(store, folder, _):
+    if "://" in store:
+        return
+    (folder / "lines").write_text(line("D", scalars={"a": 1}))
+    run("load", folder / "fleet.db", folder / "lines")
+    assert (folder / "fleet.db").stat().st_mode & 0o777 == 0o600
+    for name, change in (("other", "CREATE TABLE line(x)"), ("more", None), ("notes", b"nothing"), ("empty", b"")):
+        path = folder / name
+        if isinstance(change, bytes):
+            path.write_bytes(change)
+        else:
+            if change is None:
+                path.write_bytes((folder / "fleet.db").read_bytes())
+                change = ("ALTER TABLE rule RENAME TO old; CREATE VIEW rule AS WITH RECURSIVE n(least, first_day) AS"
+                          " (SELECT 5, 0 UNION ALL SELECT least + 1, 0 FROM n) SELECT * FROM n WHERE least < 0")
+            subprocess.run(["sqlite3", path, change], check=True)
+        held = path.read_bytes()
+        for words in (("load", path, folder / "lines"), ("keys", path)):
+            run(*words, status=1)
+            assert run.errors == f"vespfleet {words[0]}: {path}: no fleet store\n", run.errors
+        assert path.read_bytes() == held
+    run("keys", folder / "none", status=1)
+
+
+def main():
+    chance = random.Random(7)
+    for name, test in sorted(globals().items()):
+        if not name.startswith("test_"):
+            continue
+        with tempfile.TemporaryDirectory() as folder:
+            test(f"{folder}/store", Path(folder), chance)
+        if SERVER:
+            def post(statement):
+                urllib.request.urlopen(SERVER, statement.encode()).read()
+            post(f"DROP DATABASE IF EXISTS {name}")
+            post(f"CREATE DATABASE {name}")
+            with tempfile.TemporaryDirectory() as folder:
+                test(f"{SERVER}/{name}", Path(folder), chance)
+        print(name, "passed")
+
+
+main()

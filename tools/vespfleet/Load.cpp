@@ -1,0 +1,216 @@
+#include "Load.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <chrono>
+#include <cstdio>
+#include <cstring>
+#include <filesystem>
+
+#include "FleetStore.h"
+#include "LineSource.h"
+#include "platform/host/documents/QuotedText.h"
+#include "platform/host/files/LineReader.h"
+
+namespace vesprun {
+namespace {
+
+constexpr const char* kRejected = "rejected";
+constexpr std::size_t kFilesOfBatch = 1000;
+
+struct InputFile {
+  std::string path;
+  std::optional<std::string> device;  ///< the only one whose lines the file may have
+  bool found = false;                 ///< in a folder: a regular file, no link
+};
+
+/// A file of a spool whose lines are on their way into the store.
+struct ReadFile {
+  std::string path;
+  struct stat status {};
+  bool isRejected = false;
+};
+
+void complainOf(const std::string& path, const std::string& why) {
+  std::fprintf(stderr, "%s: %s\n", printableText(path).c_str(), why.c_str());
+}
+
+class Loading {
+ public:
+  Loading(FleetStore& store, bool spools) : _store(store), _spools(spools) {}
+
+  void load(const std::string& path) {
+    std::error_code error;
+    if (path != "-" && std::filesystem::is_directory(path, error)) {
+      for (const InputFile& file : filesIn(path)) {
+        read(file);
+      }
+    } else {
+      read({path, std::nullopt, false});
+    }
+  }
+
+  void finish() {
+    _store.finish();
+    for (const ReadFile& file : _read) {
+      leave(file);
+    }
+    _read.clear();
+  }
+
+  const LoadCounts& counts() const { return _counts; }
+
+ private:
+  std::vector<InputFile> filesIn(const std::string& folder) {
+    namespace fs = std::filesystem;
+    std::vector<InputFile> files;
+    std::error_code error;
+    fs::recursive_directory_iterator entry(folder, error);
+    for (; !error && entry != fs::recursive_directory_iterator(); entry.increment(error)) {
+      const std::string name = entry->path().filename().string();
+      std::error_code ignored;
+      if (name == kRejected && entry->is_directory(ignored)) {
+        entry.disable_recursion_pending();
+      } else if ((name.ends_with(".jsonl") || name.ends_with(".jsonl.gz")) &&
+                 entry->symlink_status(ignored).type() == fs::file_type::regular) {
+        InputFile file{entry->path().string(), std::nullopt, true};
+        if (_spools && entry.depth() > 0) {
+          file.device = entry->path().lexically_relative(folder).begin()->string();
+        }
+        files.push_back(std::move(file));
+      }
+    }
+    if (error) {
+      complainOf(folder, error.message());
+      _counts.failed = true;
+    }
+    std::sort(files.begin(), files.end(),
+              [](const InputFile& left, const InputFile& right) { return left.path < right.path; });
+    return files;
+  }
+
+  void read(const InputFile& file) {
+    const bool isStandardInput = file.path == "-";
+    const std::string name = isStandardInput ? "standard input" : file.path;
+    const int descriptor =
+        isStandardInput ? fcntl(STDIN_FILENO, F_DUPFD_CLOEXEC, 3)
+                        : open(file.path.c_str(),
+                               O_RDONLY | O_CLOEXEC | (file.found ? O_NOFOLLOW | O_NONBLOCK : 0));
+    ReadFile done{file.path, {}, false};
+    if (descriptor >= 0) {
+      fstat(descriptor, &done.status);
+    }
+    LineSource source(descriptor);
+    LineReader lines(source, kMaxLine);
+    const std::uint64_t malformed = _counts.malformed;
+    std::string_view text;
+    auto result = lines.next(text);
+    for (; result == LineReader::Result::Line || result == LineReader::Result::TooLong;
+         result = lines.next(text)) {
+      std::string why = "longer than 16 MiB";
+      std::optional<ExportedLine> line;
+      if (result == LineReader::Result::Line) {
+        line = parseExportedLine(text, why);
+      }
+      if (line && file.device && line->device != *file.device) {
+        line.reset();
+        why = "the device is not that of the folder";
+      }
+      ++_counts.lines;
+      if (line) {
+        count(_store.add(*line));
+      } else {
+        ++_counts.malformed;
+        complainOf(name + ':' + std::to_string(lines.number()), why);
+      }
+      showProgress();
+    }
+    const bool failed = result == LineReader::Result::Failed;
+    if (failed) {
+      _counts.failed = true;
+      complainOf(name, source.failure());
+    }
+    const bool wasRead = descriptor >= 0 && (!failed || source.isPacked());
+    if (_spools && !isStandardInput && wasRead && S_ISREG(done.status.st_mode)) {
+      done.isRejected = failed || _counts.malformed != malformed;
+      _read.push_back(std::move(done));
+      if (_read.size() >= kFilesOfBatch) {
+        finish();
+      }
+    }
+  }
+
+  void count(Outcome outcome) {
+    std::uint64_t* const counts[] = {&_counts.added, &_counts.replaced, &_counts.repeated,
+                                     &_counts.older, &_counts.refused};
+    ++*counts[static_cast<std::size_t>(outcome)];
+  }
+
+  /// Removes a file, or moves it aside, unless another has taken its place since.
+  void leave(const ReadFile& file) {
+    struct stat now {};
+    if (lstat(file.path.c_str(), &now) != 0 || now.st_ino != file.status.st_ino ||
+        now.st_dev != file.status.st_dev || now.st_size != file.status.st_size ||
+        now.st_mtim.tv_sec != file.status.st_mtim.tv_sec ||
+        now.st_mtim.tv_nsec != file.status.st_mtim.tv_nsec) {
+      return;
+    }
+    if (!(file.isRejected ? moveAside(file.path) : unlink(file.path.c_str()) == 0)) {
+      complainOf(file.path, std::strerror(errno));
+      _counts.failed = true;
+    }
+  }
+
+  static bool moveAside(const std::string& path) {
+    const std::filesystem::path folder = std::filesystem::path(path).parent_path() / kRejected;
+    if (mkdir(folder.c_str(), 0700) != 0 && errno != EEXIST) {
+      return false;
+    }
+    const std::string target = (folder / std::filesystem::path(path).filename()).string();
+    constexpr int kTries = 100'000;
+    for (int number = 0; number < kTries; ++number) {
+      const std::string name = number == 0 ? target : target + '.' + std::to_string(number);
+      if (renameat2(AT_FDCWD, path.c_str(), AT_FDCWD, name.c_str(), RENAME_NOREPLACE) == 0) {
+        return true;
+      }
+      if (errno != EEXIST) {
+        return false;
+      }
+    }
+    return false;
+  }
+
+  void showProgress() {
+    using Clock = std::chrono::steady_clock;
+    if (!_isTerminal || Clock::now() - _shown < std::chrono::seconds(1)) {
+      return;
+    }
+    _shown = Clock::now();
+    std::fprintf(stderr, "\r%llu lines\r", static_cast<unsigned long long>(_counts.lines));
+  }
+
+  FleetStore& _store;
+  bool _spools;
+  LoadCounts _counts;
+  std::vector<ReadFile> _read;
+  bool _isTerminal = isatty(STDERR_FILENO) == 1;
+  std::chrono::steady_clock::time_point _shown = std::chrono::steady_clock::now();
+};
+
+}  // namespace
+
+LoadCounts loadFiles(const std::string& address, std::optional<int> least,
+                     const std::vector<std::string>& paths, bool spools) {
+  const auto store = openFleetStore(address, StoreUse::Load, least);
+  Loading loading(*store, spools);
+  for (const std::string& path : paths) {
+    loading.load(path);
+  }
+  loading.finish();
+  return loading.counts();
+}
+
+}  // namespace vesprun
