@@ -60,7 +60,7 @@ cc -std=c99 -Wall -Wextra -Wpedantic -Werror "$source/examples/count-lines/main.
   $(pkg-config --cflags --libs vesprun) -o count-lines
 
 "$prefix/bin/vespctl" init "$work/device" --sample
-"$prefix/bin/vespctl" -C "$work/device" nand lab >"$work/lab"
+"$prefix/bin/vespctl" -C "$work/device" nand lab --json >"$work/lab"
 grep -oP '"com\.quill[^"]*":-?\d+' "$work/lab" | tr -d '"' |
   sed 's/:\(-\?[0-9]*\)$/: \1/' >"$work/expected"
 [ "$(wc -l <"$work/expected")" -ge 5 ]

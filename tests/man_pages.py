@@ -55,7 +55,7 @@ def main(page_file, program):
         # Commands below one that is told of here may be words of its text.
         words = set(re.findall(r"[\w-]+", text))
         here |= {path for path in commands if path[:-1] in here - {above} and path[-1] in words}
-        shown = set(re.findall(r"--[a-z][\w-]*", text))
+        shown = set(re.findall(r"--[a-z][\w-]*", text)) - {"--json"}
         known = {name for path in here for name in commands[path] if name.startswith("--")}
         complaints += [f"{title}: no command has {option}" for option in sorted(shown - known)]
         complaints += [f"{title}: {option} is missing" for option in sorted(known - shown)]

@@ -49,7 +49,7 @@ class DaysTest : public VespctlTest {
 
   /// Day and revision of each exported log.
   std::string revisions() {
-    return print(R"(export --device n | sed -E 's/^\{"version":1,"device":"n","day":([0-9]+),)"
+    return print(R"(export --device n | sed -E 's/^\{"version":2,"device":"n","day":([0-9]+),)"
                  R"("revision":([0-9]+),.*/\1:\2/' | paste -sd ' ')");
   }
 

@@ -19,6 +19,111 @@
 
 namespace vesprun {
 
+// The library handles what is neither plain text nor a short escape.
+void appendJsonText(std::string_view string, std::string& text) {
+  static constexpr std::string_view kEscaped = "\b\f\n\r\t\"\\";
+  static constexpr std::string_view kEscapes = "bfnrt\"\\";
+  const std::size_t begin = text.size();
+  text += '"';
+  for (std::size_t at = 0; at < string.size();) {
+    if (const auto escape = kEscaped.find(string[at]); escape != std::string_view::npos) {
+      text.append(1, '\\').append(1, kEscapes[escape]);
+      ++at;
+      continue;
+    }
+    const std::size_t length = xmlCharacterLength(string.substr(at));
+    if (length == 0) {
+      text.resize(begin);
+      text += Json(string).dump(-1, ' ', false, Json::error_handler_t::replace);
+      return;
+    }
+    text.append(string, at, length);
+    at += length;
+  }
+  text += '"';
+}
+
+namespace {
+
+void append(const PropertyValue& value, std::string& text);
+
+void appendTagged(const char* name, std::string_view string, std::string& text) {
+  text.append("{\"").append(name).append("\":");
+  appendJsonText(string, text);
+  text += '}';
+}
+
+void append(const Number& number, std::string& text) {
+  if (!number.isFloatingPoint()) {
+    text += textForm(number);
+    return;
+  }
+  const double real = number.asDouble();
+  if (!std::isfinite(real)) {
+    appendTagged("real", textForm(number), text);
+    return;
+  }
+  if (number.kind() == NumberKind::Double) {
+    text += Json(real).dump();
+    return;
+  }
+  char digits[32];
+  const char* end = std::to_chars(digits, digits + sizeof digits, static_cast<float>(real)).ptr;
+  double fewestDigits = real;
+  std::from_chars(digits, end, fewestDigits);
+  text.append("{\"float\":").append(Json(fewestDigits).dump()).append("}");
+}
+
+void append(const PropertyDict& dict, std::string& text) {
+  text += '{';
+  for (const auto& [key, entry] : dict) {
+    text.append(text.back() == '{' ? "" : ",");
+    appendJsonText(key, text);
+    text += ':';
+    append(entry, text);
+  }
+  text += '}';
+}
+
+void append(const PropertyValue& value, std::string& text) {
+  if (const PropertyDict* dict = value.dict()) {
+    append(*dict, text);
+  } else if (const PropertyArray* array = value.array()) {
+    text += '[';
+    for (const PropertyValue& element : *array) {
+      text.append(&element == array->data() ? "" : ",");
+      append(element, text);
+    }
+    text += ']';
+  } else if (const std::string* string = value.string()) {
+    appendJsonText(*string, text);
+  } else if (const Number* number = value.number()) {
+    append(*number, text);
+  } else if (const bool* boolean = value.boolean()) {
+    text += *boolean ? "true" : "false";
+  } else if (const Bytes* data = value.data()) {
+    text += "{\"data\":\"";
+    appendBase64(*data, text);
+    text += "\"}";
+  } else {
+    appendTagged("date", dateText(value.date() != nullptr ? *value.date() : Date{}), text);
+  }
+}
+
+}  // namespace
+
+std::string jsonText(const PropertyValue& value) {
+  std::string text;
+  append(value, text);
+  return text;
+}
+
+std::string jsonText(const PropertyDict& dict) {
+  std::string text;
+  append(dict, text);
+  return text;
+}
+
 void to_json(Json& json, const Number& number) {
   if (!number.isFloatingPoint()) {
     json = number.isSigned() ? Json(number.asInt64()) : Json(number.asUInt64());

@@ -22,6 +22,13 @@ using Json = nlohmann::ordered_json;
 /// Bytes of a string that are not UTF-8 become U+FFFD.
 std::string jsonText(const Json& json);
 
+// The same, written without the library, whose objects allocate even when they are destroyed: the
+// job must outlive memory that runs out.
+std::string jsonText(const PropertyValue& value);
+std::string jsonText(const PropertyDict& dict);
+/// Appends the JSON form of a string.
+void appendJsonText(std::string_view string, std::string& text);
+
 /// What the library calls for a value that becomes JSON; so an initializer of `Json` may hold
 /// values.
 void to_json(Json& json, const PropertyValue& value);

@@ -6,6 +6,7 @@
 #include <sstream>
 
 #include "common/Calendar.h"
+#include "platform/host/documents/JsonForm.h"
 #include "platform/host/files/AtomicFile.h"
 #include "platform/host/files/JsonLines.h"
 #include "platform/host/outbox/LogName.h"
@@ -13,8 +14,6 @@
 
 namespace vesprun {
 namespace {
-
-using Json = nlohmann::ordered_json;
 
 /// The name in a note; null when the line is none.
 const std::string* nameIn(const Json& note) {
@@ -52,8 +51,6 @@ std::optional<std::string> textIn(const Json& note, const char* key) {
   return value != note.end() && value->is_string() ? std::optional(value->get<std::string>())
                                                    : std::nullopt;
 }
-
-Json jsonOf(const std::optional<std::string>& text) { return text ? Json(*text) : Json(); }
 
 bool appendNote(JsonLines& lines, const Json& note, std::string& error) {
   return lines.append(note.dump(-1, ' ', false, Json::error_handler_t::replace), error);
@@ -104,12 +101,14 @@ std::optional<std::map<std::string, SubmittedNote>> readSubmittedNotes(
 bool addSubmittedNote(const DeviceDirectory& directory, const Date& time, const std::string& name,
                       const SubmittedNote& note, std::string& error) {
   JsonLines lines(directory.hostPath(kSubmittedFile));
-  return appendNote(lines,
-                    {{"time", dateText(time)},
-                     {"name", name},
-                     {"build", jsonOf(note.build)},
-                     {"model", jsonOf(note.model)}},
-                    error);
+  // Without the library's objects: a daily run must outlive memory that runs out.
+  std::string line = jsonText(PropertyDict{{"time", dateText(time)}, {"name", name}});
+  line.pop_back();
+  for (const auto& [entry, text] : {std::pair("build", &note.build), {"model", &note.model}}) {
+    line.append(",\"").append(entry).append("\":");
+    *text ? appendJsonText(**text, line) : static_cast<void>(line.append("null"));
+  }
+  return lines.append(line + '}', error);
 }
 
 bool removeStaleNotes(const DeviceDirectory& directory, std::string& error) {

@@ -29,9 +29,15 @@ class HostSystemLog final : public SystemLog {
     }
     std::string error;
     try {
-      std::string line = jsonText({{"time", dateText(_clock.now())},
-                                   {"level", kLogLevelNames[static_cast<std::size_t>(level)]},
-                                   {"message", message}});
+      // Assembled here: a message may hold a long list, which no value should copy.
+      std::string line =
+          jsonText(PropertyDict{{"time", dateText(_clock.now())},
+                                {"level", kLogLevelNames[static_cast<std::size_t>(level)]}});
+      line.back() = ',';
+      line.reserve(line.size() + message.size() + message.size() / 8 + 32);
+      line += "\"message\":";
+      appendJsonText(message, line);
+      line += '}';
       if (_directory.makeFolder(kOutbox, error) && _lines.append(std::move(line), error)) {
         return;
       }

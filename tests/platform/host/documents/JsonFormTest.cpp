@@ -30,8 +30,8 @@ TEST(JsonForm, WritesEveryKindOfValue) {
             R"("bytes":{"data":"AQIDBA=="},"date":{"date":"2024-03-05T09:15:02.5Z"},)"
             "\"text\":\"\\\"\\\\\\n\xE2\x82\xAC\",\"\":[true,false,{},[]]}");
   EXPECT_EQ(jsonText(PropertyValue(std::nan(""))), R"({"real":"nan"})");
-  EXPECT_EQ(jsonText("a\xFFz\n"), "\"a\xEF\xBF\xBDz\\n\"");
-  EXPECT_EQ(jsonText("\b\f\r\t\x7F\x01"), "\"\\b\\f\\r\\t\x7F\\u0001\"");
+  EXPECT_EQ(jsonText(PropertyValue("a\xFFz\n")), "\"a\xEF\xBF\xBDz\\n\"");
+  EXPECT_EQ(jsonText(PropertyValue("\b\f\r\t\x7F\x01")), "\"\\b\\f\\r\\t\x7F\\u0001\"");
 }
 
 TEST(JsonForm, ReadsBackWhatItWrites) {

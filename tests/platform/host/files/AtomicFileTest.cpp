@@ -117,7 +117,7 @@ TEST_F(AtomicFileTest, ReadsNoMoreThanADocumentHas) {
   folder.write("document", "");
   ASSERT_EQ(truncate(folder.path("document").c_str(), off_t{1} << 40), 0);
   EXPECT_FALSE(readWholeFile(folder.path("document"), error));
-  EXPECT_EQ(error, folder.path("document") + ": larger than 67108864 bytes");
+  EXPECT_EQ(error, folder.path("document") + ": larger than 268435456 bytes");
 }
 
 TEST_F(JsonLinesTest, KeepTheNewestOfTooMany) {
