@@ -150,8 +150,10 @@ Faults silence(const Device& device, const Outcome& outcome, int error) {
   const std::string& place = outcome.place;
   const auto holds = [&place](const std::string& part) { return place.find(part) != place.npos; };
   const auto begins = [&place](const char* call) { return place.starts_with(call); };
+  // Looking for left-overs beside a preference file is no reading of it.
+  const bool isTidying = begins("getdents") && holds("/Library/Logsmith");
   const bool isInput =
-      holds(device.path()) &&
+      holds(device.path()) && !isTidying &&
       std::ranges::any_of(std::to_array({"/device.json", "/kernel/", "/controller/",
                                          "/Library/Logsmith", "/Whitelist"}),
                           holds) &&

@@ -64,7 +64,7 @@ std::optional<AtomicFile> AtomicFile::create(const HostPath& folder, std::string
 bool AtomicFile::openUnfinished(std::string& error) {
   constexpr int kMaxAttempts = 10;
   for (int attempt = 0; attempt < kMaxAttempts; ++attempt) {
-    const std::string name = unfinishedName();
+    std::string name = unfinishedName();
     FileDescriptor file(openat(_folderDescriptor.get(), name.c_str(),
                                O_CREAT | O_EXCL | O_WRONLY | O_CLOEXEC | O_NOFOLLOW, kOwnerOnly));
     if (!file.isOpen()) {
@@ -77,7 +77,7 @@ bool AtomicFile::openUnfinished(std::string& error) {
     if (flock(file.get(), LOCK_EX | LOCK_NB) == 0 && fstat(file.get(), &opened) == 0 &&
         opened.st_nlink != 0) {
       _file = std::move(file);
-      _unfinishedName = name;
+      _unfinishedName = std::move(name);  // a copy could fail, and leave the file
       return true;
     }
     unlinkat(_folderDescriptor.get(), name.c_str(), 0);
