@@ -261,11 +261,11 @@ void addDiff(CLI::App& command) {
 }
 
 void addInstall(CLI::App& command) {
-  struct Arguments {
+  struct InstallArguments {
     std::string file;
     bool force = false;
   };
-  const auto arguments = std::make_shared<Arguments>();
+  const auto arguments = std::make_shared<InstallArguments>();
   command.add_option("FILE", arguments->file, "The whitelist; - for standard input")->required();
   command.add_flag("--force", arguments->force, "Installs it in spite of what check finds");
   command.callback([arguments] { install(arguments->file, arguments->force); });
