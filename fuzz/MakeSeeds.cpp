@@ -139,10 +139,11 @@ std::vector<Seed> counterLineSeeds() {
 }
 
 std::vector<Seed> exportedLineSeeds() {
-  return {{"line", bytesOf(R"({"version":1,"device":"d","day":19787,"revision":1,)"
-                           R"("created":{"date":"2024-03-05T09:15:02.25Z"},"whitelist":"w",)"
-                           R"("scalars":{"a":-5},"distributions":{"b":[1.0,2.5,1.5,0.5,2]},)"
-                           R"("histograms":{"b":{"(-inf, 10]":2}}})")}};
+  return {{"line",
+           bytesOf(R"({"version":2,"device":"d","day":19787,"revision":1,"build":null,"model":"m",)"
+                   R"("created":{"date":"2024-03-05T09:15:02.25Z"},"whitelist":"w",)"
+                   R"("scalars":{"a":-5},"distributions":{"b":[1.0,2.5,1.5,0.5,2]},)"
+                   R"("histograms":{"b":{"(-inf, 10]":2}}})")}};
 }
 
 std::vector<Seed> figureSeeds() {
