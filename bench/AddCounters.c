@@ -4,7 +4,7 @@
 #include <stdio.h>
 #include <stdlib.h>
 
-#include "vesprun.h"
+#include "vesprun/vesprun.h"
 
 int main(int argc, char** argv) {
   vesprun_device* device = argc == 5 ? vesprun_open(argv[1]) : NULL;

@@ -1,16 +1,16 @@
 #pragma once
 
+#include "APIErrorMessage.h"
+#include "ContentDeletion.h"
+#include "CopyNANDInfo.h"
 #include "Device.h"
-#include "NANDInfo/APIErrorMessage.h"
-#include "NANDInfo/ContentDeletion.h"
-#include "NANDInfo/CopyNANDInfo.h"
-#include "NANDInfo/EventExtraction.h"
-#include "NANDInfo/HealthSets.h"
-#include "NANDInfo/Magazine.h"
-#include "NANDInfo/ORUConnection.h"
-#include "NANDInfo/StructuredLogState.h"
-#include "NANDInfo/VMFreezer.h"
-#include "NANDInfo/WhitelistedFieldSets.h"
+#include "EventExtraction.h"
+#include "HealthSets.h"
+#include "Magazine.h"
+#include "ORUConnection.h"
+#include "StructuredLogState.h"
+#include "VMFreezer.h"
+#include "WhitelistedFieldSets.h"
 
 // Entry points for other programs: the storage controller's statistics as dictionaries, and the
 // analytics events made of them.

@@ -2,7 +2,7 @@
 
 #include <functional>
 
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

@@ -5,7 +5,7 @@
 #include <string>
 #include <string_view>
 
-#include "common/Date.h"
+#include "vesprun/Date.h"
 
 namespace vesprun {
 

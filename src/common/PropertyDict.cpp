@@ -1,4 +1,4 @@
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 #include <tsl/ordered_map.h>
 

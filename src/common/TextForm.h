@@ -5,7 +5,7 @@
 #include <span>
 #include <string>
 
-#include "common/PropertyValue.h"
+#include "vesprun/PropertyValue.h"
 
 namespace vesprun {
 

@@ -5,7 +5,7 @@
 #include <string>
 #include <string_view>
 
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

@@ -5,10 +5,10 @@
 #include <string_view>
 #include <vector>
 
-#include "common/PropertyDict.h"
 #include "config/KeyOptions.h"
 #include "config/WhitelistKeyGroup.h"
 #include "config/WhitelistTable.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

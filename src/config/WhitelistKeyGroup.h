@@ -2,7 +2,7 @@
 
 #include <string_view>
 
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

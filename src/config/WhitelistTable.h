@@ -9,10 +9,10 @@
 #include <vector>
 
 #include "common/KeyHash.h"
-#include "common/PropertyDict.h"
 #include "config/KeyOptions.h"
 #include "config/PrefixTable.h"
 #include "config/WhitelistKeyGroup.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "common/PropertyValue.h"
+#include "vesprun/PropertyValue.h"
 
 namespace vesprun {
 

@@ -2,10 +2,8 @@
 
 #include <optional>
 
-#include "NANDInfo/CopyNANDInfo.h"
-#include "NANDInfo/VMFreezer.h"
-#include "NANDInfo/lists/StructuredLog.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/structuredlog/StructuredLog.h"
 #include "common/TextForm.h"
 #include "platform/Guarded.h"
 #include "platform/Platform.h"
@@ -13,6 +11,8 @@
 #include "telemetry/DiskInfo.h"
 #include "telemetry/KernelECCEvents.h"
 #include "telemetry/ReportingChannels.h"
+#include "vesprun/CopyNANDInfo.h"
+#include "vesprun/VMFreezer.h"
 
 namespace vesprun {
 namespace {

@@ -10,9 +10,9 @@
 #include <utility>
 
 #include "common/KeyHash.h"
-#include "common/PropertyDict.h"
 #include "common/TextForm.h"
 #include "platform/Platform.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 namespace {

@@ -7,7 +7,7 @@
 #include <string_view>
 #include <vector>
 
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

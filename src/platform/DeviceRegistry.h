@@ -5,8 +5,8 @@
 #include <span>
 #include <string>
 
-#include "common/PropertyValue.h"
-#include "common/RegistryHandle.h"
+#include "vesprun/PropertyValue.h"
+#include "vesprun/RegistryHandle.h"
 
 namespace vesprun {
 

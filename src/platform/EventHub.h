@@ -3,7 +3,7 @@
 #include <functional>
 #include <string_view>
 
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

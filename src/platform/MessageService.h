@@ -4,7 +4,7 @@
 #include <memory>
 #include <string_view>
 
-#include "common/PropertyValue.h"
+#include "vesprun/PropertyValue.h"
 
 namespace vesprun {
 

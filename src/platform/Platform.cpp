@@ -1,8 +1,10 @@
 #include "platform/Platform.h"
 
 #include <cassert>
+#include <cstdarg>
 #include <cstdio>
 #include <cstdlib>
+#include <string>
 
 namespace vesprun {
 namespace {
@@ -19,6 +21,23 @@ Platform& platform() {
     std::abort();
   }
   return *gInstalledPlatform;
+}
+
+void logMessage(LogLevel level, const char* format, ...) {
+  SystemLog& log = platform().systemLog();
+  if (!log.keeps(level)) {
+    return;
+  }
+  va_list arguments;
+  va_start(arguments, format);
+  va_list again;
+  va_copy(again, arguments);
+  std::string message(static_cast<std::size_t>(std::vsnprintf(nullptr, 0, format, arguments)),
+                      '\0');
+  std::vsnprintf(message.data(), message.size() + 1, format, again);
+  va_end(again);
+  va_end(arguments);
+  log.write(level, message);
 }
 
 InstalledPlatform::InstalledPlatform(Platform& installed) {

@@ -54,6 +54,10 @@ bool platformIsInstalled();
 /// Without an installed platform the process ends with a line on standard error.
 Platform& platform();
 
+/// Writes a printf-style message to the installed platform's log; formed only if its level is kept.
+/// Pass a value's text form ("%@") as %s.
+[[gnu::format(printf, 2, 3)]] void logMessage(LogLevel level, const char* format, ...);
+
 /// Installs a platform as long as it lives. A process has one at a time.
 class InstalledPlatform {
  public:

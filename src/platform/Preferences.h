@@ -4,7 +4,7 @@
 #include <optional>
 #include <string_view>
 
-#include "common/PropertyValue.h"
+#include "vesprun/PropertyValue.h"
 
 // Stored values. A process sees its own change at once; it is written when it is synchronized, or
 // when the process ends. Setting nothing removes the key.

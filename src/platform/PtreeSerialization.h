@@ -7,7 +7,7 @@
 #include <string>
 #include <string_view>
 
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

@@ -22,8 +22,4 @@ class SystemLog {
   virtual void write(LogLevel level, std::string_view message) = 0;
 };
 
-/// Writes a printf-style message to the installed platform's log; formed only if its level is kept.
-/// Pass a value's text form ("%@") as %s.
-[[gnu::format(printf, 2, 3)]] void logMessage(LogLevel level, const char* format, ...);
-
 }  // namespace vesprun

@@ -7,11 +7,11 @@
 #include <string_view>
 #include <vector>
 
-#include "common/PropertyDict.h"
 #include "config/KeyOptions.h"
 #include "platform/Tallybook.h"
 #include "report/DistributionStats.h"
 #include "report/Histogram.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

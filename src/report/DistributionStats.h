@@ -3,7 +3,7 @@
 #include <cstdint>
 #include <limits>
 
-#include "common/PropertyValue.h"
+#include "vesprun/PropertyValue.h"
 
 namespace vesprun {
 

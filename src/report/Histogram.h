@@ -6,7 +6,7 @@
 #include <span>
 #include <vector>
 
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

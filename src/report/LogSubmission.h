@@ -1,7 +1,7 @@
 #pragma once
 
 #include "common/AppInfoList.h"
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

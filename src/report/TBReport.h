@@ -7,9 +7,9 @@
 #include <string_view>
 
 #include "common/AppInfoList.h"
-#include "common/PropertyDict.h"
 #include "config/TBConfig.h"
 #include "platform/Tallybook.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

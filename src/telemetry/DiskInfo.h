@@ -4,7 +4,7 @@
 #include <optional>
 #include <string_view>
 
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

@@ -1,4 +1,4 @@
-#include "common/PropertyValue.h"
+#include "vesprun/PropertyValue.h"
 
 #include <gtest/gtest.h>
 #include <array>

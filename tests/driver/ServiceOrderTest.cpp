@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <set>
 
-#include "NANDInfo/lists/NANDLogWriter.h"
+#include "NANDInfo/structuredlog/NANDLogWriter.h"
 #include "driver/ActiveAppInfoListener.h"
 #include "driver/DailyDriver.h"
 #include "driver/DailyTasks.h"

@@ -7,9 +7,9 @@
 #include <string_view>
 #include <vector>
 
-#include "common/PropertyDict.h"
 #include "platform/host/HostPlatform.h"
 #include "support/TemporaryFolder.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

@@ -11,7 +11,7 @@
 
 #include "NANDInfo/parsers/ORUMSPKeyTable.h"
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
-#include "common/PropertyValue.h"
+#include "vesprun/PropertyValue.h"
 
 namespace vesprun {
 

@@ -7,9 +7,9 @@
 #include "OwnersRights.h"
 #include "commandline/Program.h"
 #include "commandline/Results.h"
-#include "common/PropertyValue.h"
 #include "platform/host/HostPlatform.h"
 #include "platform/host/files/Files.h"
+#include "vesprun/PropertyValue.h"
 
 namespace vesprun {
 

@@ -6,9 +6,9 @@
 #include <limits>
 #include <map>
 
-#include "common/PropertyDict.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/XmlText.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 namespace {

@@ -8,7 +8,7 @@
 #include <vector>
 
 #include "Statistics.h"
-#include "common/PropertyValue.h"
+#include "vesprun/PropertyValue.h"
 
 namespace vesprun {
 

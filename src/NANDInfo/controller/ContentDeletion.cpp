@@ -1,4 +1,4 @@
-#include "NANDInfo/ContentDeletion.h"
+#include "vesprun/ContentDeletion.h"
 
 #include <array>
 #include <cstdint>

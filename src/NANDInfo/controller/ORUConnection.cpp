@@ -1,4 +1,4 @@
-#include "NANDInfo/ORUConnection.h"
+#include "vesprun/ORUConnection.h"
 
 #include <cstdio>
 

@@ -1,4 +1,4 @@
-#include "NANDInfo/EventExtraction.h"
+#include "vesprun/EventExtraction.h"
 
 #include <array>
 #include <string>

@@ -3,13 +3,13 @@
 #include <iterator>
 #include <string>
 
-#include "NANDInfo/Magazine.h"
-#include "NANDInfo/WhitelistedFieldSets.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/sets/FilteredDict.h"
 #include "NANDInfo/sets/StatisticsGathering.h"
 #include "NANDInfo/tables/EventFields.h"
 #include "platform/Platform.h"
+#include "vesprun/Magazine.h"
+#include "vesprun/WhitelistedFieldSets.h"
 
 namespace vesprun {
 namespace {

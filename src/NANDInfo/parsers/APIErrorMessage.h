@@ -2,7 +2,7 @@
 
 #include <string_view>
 
-#include "NANDInfo/APIErrorMessage.h"
+#include "vesprun/APIErrorMessage.h"
 
 namespace vesprun {
 

@@ -9,7 +9,7 @@
 
 #include "NANDInfo/parsers/KnownNames.h"
 #include "NANDInfo/tables/FieldTable.h"
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "NANDInfo/CopyNANDInfo.h"
+#include "vesprun/CopyNANDInfo.h"
 
 namespace vesprun {
 

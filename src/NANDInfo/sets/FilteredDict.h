@@ -4,7 +4,7 @@
 
 #include "NANDInfo/parsers/GenericParserCxt.h"
 #include "NANDInfo/tables/FieldTable.h"
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

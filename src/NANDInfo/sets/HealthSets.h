@@ -1,6 +1,6 @@
 #pragma once
 
-#include "NANDInfo/HealthSets.h"
+#include "vesprun/HealthSets.h"
 
 namespace vesprun {
 

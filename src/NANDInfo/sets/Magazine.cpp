@@ -1,4 +1,4 @@
-#include "NANDInfo/Magazine.h"
+#include "vesprun/Magazine.h"
 
 #include <array>
 #include <optional>

@@ -1,7 +1,7 @@
 #pragma once
 
 #include "NANDInfo/parsers/ORUStatsContext.h"
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

@@ -8,7 +8,7 @@
 #include "NANDInfo/controller/NandExporter.h"
 #include "NANDInfo/parsers/GenericParserCxt.h"
 #include "NANDInfo/tables/FieldTable.h"
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

@@ -4,12 +4,12 @@
 #include <optional>
 #include <string>
 
-#include "NANDInfo/VMFreezer.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/sets/StatisticsGathering.h"
 #include "NANDInfo/tables/FieldSets.h"
 #include "platform/Platform.h"
 #include "telemetry/DiskInfo.h"
+#include "vesprun/VMFreezer.h"
 
 namespace vesprun {
 namespace {

@@ -4,7 +4,7 @@
 #include <string_view>
 
 #include "NANDInfo/tables/FieldTable.h"
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

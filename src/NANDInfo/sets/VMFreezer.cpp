@@ -1,4 +1,4 @@
-#include "NANDInfo/VMFreezer.h"
+#include "vesprun/VMFreezer.h"
 
 #include <cstddef>
 #include <optional>

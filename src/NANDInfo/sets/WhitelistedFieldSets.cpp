@@ -1,4 +1,4 @@
-#include "NANDInfo/WhitelistedFieldSets.h"
+#include "vesprun/WhitelistedFieldSets.h"
 
 #include <cstdint>
 #include <string>

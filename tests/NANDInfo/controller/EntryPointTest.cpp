@@ -2,11 +2,11 @@
 #include "common/ProcessState.h"
 
 #include "buffers/DeviceBuffers.h"
-#include "library/EntryPoints.h"
+#include "interface/EntryPoints.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
 #include "support/ControllerTest.h"
 #include "support/ScarceMemory.h"
-#include "vesprun.hpp"
+#include "vesprun/vesprun.hpp"
 
 namespace vesprun {
 namespace {

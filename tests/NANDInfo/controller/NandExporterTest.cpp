@@ -1,9 +1,9 @@
 #include "NANDInfo/controller/NandExporter.h"
 
-#include "NANDInfo/ORUConnection.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
 #include "support/ControllerTest.h"
 #include "support/WatchedRegistry.h"
+#include "vesprun/ORUConnection.h"
 
 namespace vesprun {
 namespace {

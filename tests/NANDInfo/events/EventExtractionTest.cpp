@@ -1,9 +1,9 @@
-#include "NANDInfo/EventExtraction.h"
+#include "vesprun/EventExtraction.h"
 
 #include "NANDInfo/events/StorageEvents.h"
 #include "buffers/DeviceBuffers.h"
 #include "support/ControllerTest.h"
-#include "vesprun.hpp"
+#include "vesprun/vesprun.hpp"
 
 namespace vesprun {
 namespace {

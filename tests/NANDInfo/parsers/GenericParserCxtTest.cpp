@@ -3,8 +3,8 @@
 #include <gmock/gmock.h>
 
 #include "FieldsOf.h"
-#include "NANDInfo/lists/TelemetryList.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/structuredlog/TelemetryList.h"
 #include "common/ProcessState.h"
 #include "platform/DictionaryHelpers.h"
 

@@ -2,12 +2,12 @@
 #include <cstdint>
 
 #include "FieldsOf.h"
-#include "NANDInfo/lists/TelemetryList.h"
 #include "NANDInfo/parsers/APIErrorMessage.h"
 #include "NANDInfo/parsers/KernelSnapshot.h"
 #include "NANDInfo/parsers/ORUFTLParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
+#include "NANDInfo/structuredlog/TelemetryList.h"
 #include "buffers/DeviceBuffers.h"
 #include "common/ProcessState.h"
 #include "support/ScarceMemory.h"

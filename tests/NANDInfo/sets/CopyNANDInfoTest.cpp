@@ -4,7 +4,7 @@
 #include "NANDInfo/controller/NandExporter.h"
 #include "NANDInfo/sets/StorageHealthFields.h"
 #include "support/ControllerTest.h"
-#include "vesprun.hpp"
+#include "vesprun/vesprun.hpp"
 
 namespace vesprun {
 namespace {

@@ -3,7 +3,7 @@
 #include "buffers/DeviceBuffers.h"
 #include "common/TextForm.h"
 #include "support/ControllerTest.h"
-#include "vesprun.hpp"
+#include "vesprun/vesprun.hpp"
 
 namespace vesprun {
 namespace {

@@ -4,7 +4,7 @@
 #include "buffers/DeviceBuffers.h"
 #include "platform/host/documents/JsonForm.h"
 #include "support/ControllerTest.h"
-#include "vesprun.hpp"
+#include "vesprun/vesprun.hpp"
 
 namespace vesprun {
 namespace {

@@ -2,7 +2,7 @@
 
 #include <ostream>
 
-#include "common/PropertyDict.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

@@ -3,9 +3,9 @@
 #include <string>
 #include <vector>
 
-#include "common/Date.h"
 #include "page/PageData.h"
 #include "preview/KeptBack.h"
+#include "vesprun/Date.h"
 
 namespace vesprun {
 

@@ -10,7 +10,7 @@
 
 #include "Command.h"
 #include "commandline/Arguments.h"
-#include "library/EntryPoints.h"
+#include "interface/EntryPoints.h"
 #include "platform/host/files/Files.h"
 
 namespace vesprun {

@@ -6,8 +6,8 @@
 #include <string_view>
 #include <vector>
 
-#include "common/PropertyDict.h"
 #include "config/WhitelistTable.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

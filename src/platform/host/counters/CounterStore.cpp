@@ -5,10 +5,10 @@
 #include <limits>
 #include <utility>
 
-#include "common/PropertyValue.h"
 #include "platform/host/counters/ChunkEnumerator.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/documents/XmlText.h"
+#include "vesprun/PropertyValue.h"
 
 namespace vesprun {
 namespace {

@@ -8,10 +8,10 @@
 #include <string>
 #include <vector>
 
-#include "common/PropertyDict.h"
 #include "platform/FileSystem.h"
 #include "platform/Kernel.h"
 #include "platform/SystemLog.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

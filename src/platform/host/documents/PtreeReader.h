@@ -7,7 +7,7 @@
 #include <string>
 #include <string_view>
 
-#include "common/PropertyValue.h"
+#include "vesprun/PropertyValue.h"
 
 namespace vesprun {
 

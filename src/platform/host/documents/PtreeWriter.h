@@ -2,8 +2,8 @@
 
 #include <string>
 
-#include "common/PropertyValue.h"
 #include "platform/PtreeSerialization.h"
+#include "vesprun/PropertyValue.h"
 
 namespace vesprun {
 

@@ -6,8 +6,8 @@
 #include <string>
 #include <string_view>
 
-#include "common/Date.h"
 #include "platform/host/files/Files.h"
+#include "vesprun/Date.h"
 
 namespace vesprun {
 

@@ -7,8 +7,8 @@
 #include <string_view>
 #include <vector>
 
-#include "common/PropertyDict.h"
 #include "platform/host/device/DeviceDirectory.h"
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
 

@@ -7,8 +7,8 @@
 #include <string_view>
 #include <vector>
 
-#include "common/Date.h"
 #include "platform/host/device/DeviceDirectory.h"
+#include "vesprun/Date.h"
 
 namespace vesprun {
 

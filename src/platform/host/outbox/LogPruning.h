@@ -8,9 +8,9 @@
 #include <string_view>
 #include <vector>
 
-#include "common/Date.h"
 #include "platform/host/device/DeviceDirectory.h"
 #include "platform/host/files/Files.h"
+#include "vesprun/Date.h"
 
 namespace vesprun {
 

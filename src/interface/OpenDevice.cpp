@@ -1,0 +1,93 @@
+#include "interface/OpenDevice.h"
+
+#include <unistd.h>
+
+#include <mutex>
+#include <utility>
+
+#include "platform/host/counters/HostTallybook.h"
+
+namespace vesprun {
+namespace {
+
+/// Held while a device is opened or closed: of two threads that open one, the second is refused.
+std::mutex gInstallationMutex;
+
+vesprun_error codeOf(CounterTrouble trouble) {
+  switch (trouble) {
+    case CounterTrouble::Busy:
+      return VESPRUN_ERROR_BUSY;
+    case CounterTrouble::Full:
+      return VESPRUN_ERROR_FULL;
+    case CounterTrouble::NewerFile:
+      return VESPRUN_ERROR_TOO_OLD;
+    case CounterTrouble::Other:
+      break;
+  }
+  return VESPRUN_ERROR_OTHER;
+}
+
+}  // namespace
+
+OpenDevice::OpenDevice(std::unique_ptr<HostPlatform> platform)
+    : _process(getpid()),
+      _platform(std::move(platform)),
+      _installed(std::make_unique<InstalledPlatform>(*_platform)) {}
+
+OpenDevice::~OpenDevice() {
+  if (_process != getpid()) {
+    _installed.reset();
+    static_cast<void>(_platform.release());  // its services would write at their end
+    return;
+  }
+  const std::scoped_lock guard(gInstallationMutex);
+  _installed.reset();
+  _platform.reset();
+}
+
+std::unique_ptr<OpenDevice> OpenDevice::open(const std::string& path, CallFailure& failure) {
+  const std::scoped_lock guard(gInstallationMutex);
+  if (platformIsInstalled()) {
+    failure.set(VESPRUN_ERROR_BUSY, path + ": another device is open");
+    return nullptr;
+  }
+  failure.code = VESPRUN_ERROR_NOT_A_DEVICE;
+  std::unique_ptr<HostPlatform> platform = HostPlatform::open(path, failure.text);
+  return std::unique_ptr<OpenDevice>(platform ? new OpenDevice(std::move(platform)) : nullptr);
+}
+
+bool OpenDevice::isOfThisProcess(CallFailure& failure) const {
+  return _process == getpid() ||
+         failure.set(VESPRUN_ERROR_FORKED,
+                     "the device was opened before this process was forked: close it here, and "
+                     "open it again");
+}
+
+// Only the key can be refused.
+
+bool OpenDevice::setScalar(std::string_view key, std::int64_t value, CallFailure& failure) {
+  failure.code = VESPRUN_ERROR_KEY;
+  return isOfThisProcess(failure) && _platform->counters().setScalar(key, value, failure.text);
+}
+
+bool OpenDevice::addToScalar(std::string_view key, std::int64_t value, CallFailure& failure) {
+  failure.code = VESPRUN_ERROR_KEY;
+  return isOfThisProcess(failure) && _platform->counters().addToScalar(key, value, failure.text);
+}
+
+bool OpenDevice::addToDistribution(std::string_view key, double value, CallFailure& failure) {
+  failure.code = VESPRUN_ERROR_KEY;
+  return isOfThisProcess(failure) && _platform->counters().addSample(key, value, failure.text);
+}
+
+bool OpenDevice::checkpoint(CallFailure& failure) {
+  if (!isOfThisProcess(failure)) {
+    return false;
+  }
+  CounterTrouble trouble = CounterTrouble::Other;
+  const bool done = _platform->counters().checkpoint(failure.text, &trouble);
+  failure.code = codeOf(trouble);
+  return done;
+}
+
+}  // namespace vesprun
