@@ -14,12 +14,13 @@ export LD_LIBRARY_PATH=${library%/*} PKG_CONFIG_PATH=${library%/*}/pkgconfig
 
 # The shared library shows what the public headers mark, under the version of its language, and
 # nothing else. PropertyDict is marked as a whole.
+shopt -s extglob
 marked() {
   cat "$@" | grep -v '#define' | tr '\n' ' ' | grep -oP 'VESPRUN_EXPORT [^(;]*?\K[\w~]+(?=\(|;)'
 }
 {
   marked "$prefix"/include/vesprun/vesprun.h | sed 's/$/ VESPRUN_0.1/'
-  marked "$prefix"/include/vesprun/{Device.h,NANDInfo/*.h} | sed 's/$/ VESPRUN_CXX_0.1/'
+  marked "$prefix"/include/vesprun/!(vesprun|PropertyDict).h | sed 's/$/ VESPRUN_CXX_0.1/'
 } | sort -u >"$work/marked"
 nm -DC --defined-only "$library" | grep -v ' A VESPRUN' | cut -d' ' -f3- |
   grep -v '^vesprun::\(PropertyDict::\|operator==(\)' |
