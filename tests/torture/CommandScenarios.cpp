@@ -55,7 +55,7 @@ std::vector<Case> importsInto(const std::shared_ptr<Device>& original, const std
                               const fs::path& folder, std::uint32_t seed, bool full) {
   std::string rows;
   for (int row = 0; row < 300; ++row) {
-    rows += "scalar\t" + std::to_string(kFirstDay) + "\thost.imported." + std::to_string(row) +
+    rows += "scalar\t" + std::to_string(kFirstDay) + "\tlinux.imported." + std::to_string(row) +
             "\t" + std::to_string(row) + '\n';
   }
   writeFile(original->path() + "/rows", rows);
@@ -170,8 +170,8 @@ std::vector<Case> prunes(const Programs& programs, const fs::path& folder, std::
   original->setDay(kLater);
   std::string output;
   for (const int day : {kLater - 35, kLater - 1}) {
-    original->control({"counters", "set", "host.memory.MemFree", "7", "--day", std::to_string(day)},
-                      output);
+    original->control(
+        {"counters", "set", "linux.memory.pagedInKiB", "7", "--day", std::to_string(day)}, output);
   }
   original->control({"run", "--", "-f"}, output);
   const std::vector<std::string> words{"prune", "--counters", "30", "--outbox", "30"};

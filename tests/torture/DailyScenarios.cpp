@@ -302,9 +302,9 @@ std::vector<Case> neighbours(const Programs& programs, const fs::path& folder, s
        {"prefs", "get", "com.quill.aggregated.vesprun", "torture"},
        "7"},
       {"counters",
-       {"counters", "add", "host.torture", "7"},
+       {"counters", "add", "linux.torture", "7"},
        {"counters", "dump"},
-       "scalar\t" + day + "\thost.torture\t7\n"},
+       "scalar\t" + day + "\tlinux.torture\t7\n"},
   };
   std::vector<Case> cases;
   const std::size_t step = full ? 3 : 23;
@@ -392,10 +392,10 @@ Faults liveThrough(const Device& original, const fs::path& folder, std::uint32_t
                        : static_cast<int>(random() % 400);
     device.setDay(day);
     std::string output;
-    if (device.control({"counters", "set", "host.memory.MemFree", "65536"}, output) != 0 ||
-        device.control(
-            {"counters", "set", "host.memory.MemFree", "65536", "--day", std::to_string(day - 1)},
-            output) != 0) {
+    if (device.control({"counters", "set", "linux.memory.pagedInKiB", "65536"}, output) != 0 ||
+        device.control({"counters", "set", "linux.memory.pagedInKiB", "65536", "--day",
+                        std::to_string(day - 1)},
+                       output) != 0) {
       faults.push_back("a counter cannot be set: " + output);
     }
     if (device.runDaily() != 0) {

@@ -1,24 +1,12 @@
 #pragma once
 
 #include <cstdint>
+#include <map>
 #include <optional>
 #include <string>
-#include <string_view>
 #include <vector>
 
 namespace vesprun {
-
-/// One reading of a scalar counter.
-struct ScalarReading {
-  std::string key;
-  std::int64_t value;
-};
-
-/// Repeated readings of one quantity.
-struct DistributionReadings {
-  std::string key;
-  std::vector<double> values;
-};
 
 /// What a network interface has carried since it came up.
 struct InterfaceReading {
@@ -29,16 +17,14 @@ struct InterfaceReading {
 
 std::vector<InterfaceReading> readInterfaces();
 
-/// A figure of the kernel's scheduler: "ctxt" (context switches), "processes" (forks), "btime"
-/// (when the machine started, in seconds since 1970).
-std::optional<std::int64_t> readSchedulerFigure(std::string_view name);
+/// When the machine started, in seconds since 1970.
+std::optional<std::int64_t> startOfSystem();
 
-/// Counters of the running kernel, as they stand now: memory, disks, network interfaces and the
-/// scheduler. What the kernel does not offer is left out.
-std::vector<ScalarReading> readKernelCounters();
+/// What `vespctl collect` counts, as it stands now: from the start of the machine on.
+std::map<std::string, std::int64_t> readKernelCounters();
 
-/// A burst of readings: how late the kernel wakes a sleeping process, how much memory is free, and
-/// how many context switches happen between two readings. Takes about a quarter of a second.
-std::vector<DistributionReadings> takeReadingBurst();
+/// A burst of readings: how late the kernel wakes a sleeping process, and what `vespctl collect`
+/// reads of the memory. Takes about a quarter of a second.
+std::map<std::string, std::vector<double>> takeReadingBurst();
 
 }  // namespace vesprun

@@ -201,7 +201,7 @@ Json usage(const Date& now) {
   for (const auto& [name, counters] : sampleData().at("apps").items()) {
     records.push_back(usageRecord("bundleName", name, now.seconds - 3600, counters));
   }
-  if (const std::optional<std::int64_t> start = readSchedulerFigure("btime")) {
+  if (const std::optional<std::int64_t> start = startOfSystem()) {
     for (const auto& [name, in, out] : readInterfaces()) {
       const bool isWideArea = name.starts_with("ww");
       records.push_back(

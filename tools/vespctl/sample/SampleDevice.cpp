@@ -1,6 +1,7 @@
 #include "sample/SampleDevice.h"
 
 #include <cstdlib>
+#include <map>
 #include <vector>
 
 #include "Command.h"
@@ -30,22 +31,21 @@ void writeSampleWhitelist(const DeviceDirectory& directory) {
 /// A day of the sample: its scalars are readings of one moment, its distributions a burst of
 /// readings that is spread over the day.
 struct DayReadings {
-  std::vector<ScalarReading> scalars;
-  std::vector<DistributionReadings> distributions;
+  std::map<std::string, std::int64_t> scalars;
+  std::map<std::string, std::vector<double>> distributions;
 };
 
 void recordDay(CounterStore& store, std::int32_t day, const DayReadings& readings) {
-  for (const ScalarReading& reading : readings.scalars) {
-    store.setScalar(day, reading.key, reading.value);
+  for (const auto& [key, value] : readings.scalars) {
+    store.setScalar(day, key, value);
   }
-  for (const DistributionReadings& readingsOfKey : readings.distributions) {
-    const std::size_t count = readingsOfKey.values.size();
+  for (const auto& [key, values] : readings.distributions) {
     std::vector<Sample> samples;
-    for (const double value : readingsOfKey.values) {
-      const std::size_t offset = samples.size() * kSecondsPerDay / count;
+    for (const double value : values) {
+      const std::size_t offset = samples.size() * kSecondsPerDay / values.size();
       samples.push_back({value, static_cast<std::int32_t>(offset)});
     }
-    store.appendSamples(day, readingsOfKey.key, samples);
+    store.appendSamples(day, key, samples);
   }
 }
 
