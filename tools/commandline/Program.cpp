@@ -8,6 +8,7 @@
 #include <new>
 
 #include "commandline/Completion.h"
+#include "commandline/Manual.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/StandardStreams.h"
 
@@ -93,6 +94,10 @@ int runProgram(const Program& program, int argc, char** argv) {
     addCommands(app, program.commands);
     if (argc > 2 && std::string_view(argv[1]) == kCompleteCommand) {
       printCompletions(app, std::span(argv + 3, argv + argc));
+      return 0;
+    }
+    if (argc == 3 && argv[1] == kManualCommand) {
+      printManual(app, argv[2]);
       return 0;
     }
     return parse(app, argc, argv);
