@@ -9,6 +9,7 @@
 
 #include "commandline/Completion.h"
 #include "commandline/Manual.h"
+#include "commandline/Progress.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/StandardStreams.h"
 
@@ -64,6 +65,7 @@ Invocation& invocation() {
 }
 
 void complain(std::string_view text) {
+  Progress::hide();
   std::fprintf(stderr, "%s: %s\n", invocation().command.c_str(), printableText(text).c_str());
 }
 
