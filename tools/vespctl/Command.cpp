@@ -5,7 +5,6 @@
 
 #include <chrono>
 #include <cstdlib>
-#include <sstream>
 
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/files/Files.h"
@@ -112,21 +111,14 @@ std::string readInput(const std::string& file) {
   return content;
 }
 
-std::string contentIfThere(const HostPath& file) {
-  return *orFail([&](std::string& error) {
-    bool missing = false;
-    std::optional<std::string> content = readWholeFile(file, error, &missing, kMaxLinesFile);
-    return missing ? std::optional<std::string>("") : std::move(content);
-  });
-}
-
-void forEachLine(const std::string& text, const std::function<void(PropertyDict* line)>& take) {
-  std::istringstream lines(text);
-  for (std::string line; std::getline(lines, line);) {
+void forEachLine(const HostPath& file, const std::function<void(PropertyDict* line)>& take,
+                 std::uint64_t begin) {
+  const auto takeText = [&take](std::string_view line) {
     std::string ignored;
     std::optional<PropertyValue> value = valueFromJsonText(line, ignored);
     take(value ? value->dict() : nullptr);
-  }
+  };
+  orFail([&](std::string& error) { return forEachLineOf(file, takeText, error, begin); });
 }
 
 std::string inputName(const std::string& file) { return file == "-" ? "standard input" : file; }

@@ -45,11 +45,10 @@ FileDescriptor openInput(const std::string& file);
 /// The content of a file or pipe.
 std::string readInput(const std::string& file);
 
-/// The content of a regular file; empty when there is none.
-std::string contentIfThere(const HostPath& file);
-
-/// Calls `take` with each line of a text, null for one that is not a JSON object.
-void forEachLine(const std::string& text, const std::function<void(PropertyDict* line)>& take);
+/// Calls `take` with each line of a file from the byte `begin` on, null for one that is not a JSON
+/// object. A missing file has none.
+void forEachLine(const HostPath& file, const std::function<void(PropertyDict* line)>& take,
+                 std::uint64_t begin = 0);
 
 /// A file's name in messages: "-" is "standard input".
 std::string inputName(const std::string& file);

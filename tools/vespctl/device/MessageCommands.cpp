@@ -1,6 +1,7 @@
 #include "device/MessageCommands.h"
 
 #include <sys/socket.h>
+#include <sys/stat.h>
 #include <sys/time.h>
 
 #include <cerrno>
@@ -173,7 +174,7 @@ void sendDocument(const std::string& document) {
 class NewNotifications {
  public:
   explicit NewNotifications(const DeviceDirectory& directory)
-      : _file(directory.hostPath(kNotificationsFile)), _seen(contentIfThere(_file).size()) {}
+      : _file(directory.hostPath(kNotificationsFile)), _seen(size()) {}
 
   /// Waits for one of that name, but not for ever.
   bool await(std::string_view name) const {
@@ -189,18 +190,23 @@ class NewNotifications {
 
  private:
   bool isPosted(std::string_view name) const {
-    const std::string text = contentIfThere(_file);
     bool isThere = false;
-    // A shorter file is a new one.
-    forEachLine(text.substr(text.size() < _seen ? 0 : _seen), [&](const PropertyDict* line) {
+    const auto look = [&](const PropertyDict* line) {
       const std::string* posted = line != nullptr ? line->findString("name") : nullptr;
       isThere = isThere || (posted != nullptr && *posted == name);
-    });
+    };
+    // A shorter file is a new one.
+    forEachLine(_file, look, size() < _seen ? 0 : _seen);
     return isThere;
   }
 
+  std::uint64_t size() const {
+    const std::optional<struct stat> status = _file.status();
+    return status ? static_cast<std::uint64_t>(status->st_size) : 0;
+  }
+
   HostPath _file;
-  std::size_t _seen;
+  std::uint64_t _seen;
 };
 
 void runSession(const std::string& file) {

@@ -3,6 +3,7 @@
 #include <sys/stat.h>
 
 #include <algorithm>
+#include <deque>
 #include <filesystem>
 #include <iostream>
 #include <sstream>
@@ -36,14 +37,6 @@ struct Wanted {
   std::optional<GivenDay> sinceDay;
   std::optional<std::uint64_t> last;
   std::optional<Date> since;  ///< the start of that day
-
-  /// Drops all but the newest, which stand at the end.
-  template <typename T>
-  void keepLast(std::vector<T>& all) const {
-    if (last && *last < all.size()) {
-      all.erase(all.begin(), all.end() - static_cast<std::ptrdiff_t>(*last));
-    }
-  }
 };
 
 struct Line {
@@ -51,22 +44,10 @@ struct Line {
   std::optional<PropertyDict> members;  ///< nothing for a line that cannot be read
 };
 
-std::vector<Line> linesOf(const std::string& file, const Wanted& wanted) {
-  std::vector<Line> lines;
-  std::size_t number = 0;
-  forEachLine(contentIfThere(file), [&](PropertyDict* line) {
-    ++number;
-    if (wanted.since) {
-      const std::string* const time = line != nullptr ? line->findString("time") : nullptr;
-      const std::optional<Date> date = parseDateText(time != nullptr ? *time : "");
-      if (!date || *date < *wanted.since) {
-        return;
-      }
-    }
-    lines.push_back({number, line != nullptr ? std::optional(std::move(*line)) : std::nullopt});
-  });
-  wanted.keepLast(lines);
-  return lines;
+bool isWanted(const PropertyDict* line, const Wanted& wanted) {
+  const std::string* const time = line != nullptr ? line->findString("time") : nullptr;
+  const std::optional<Date> date = parseDateText(time != nullptr ? *time : "");
+  return !wanted.since || (date && *date >= *wanted.since);
 }
 
 /// Shows each line of the file; says which ones cannot be read.
@@ -74,9 +55,9 @@ template <typename Show>
 void showLines(const DeviceDirectory& directory, const char* kind, const char* name,
                const Wanted& wanted, Show show) {
   const HostPath file = directory.hostPath(std::string("outbox/") + name);
-  for (const auto& [number, members] : linesOf(file, wanted)) {
-    if (!members) {
-      const std::string fault = "line " + std::to_string(number) + " cannot be read";
+  const auto showLine = [&](const Line& line) {
+    if (!line.members) {
+      const std::string fault = "line " + std::to_string(line.number) + " cannot be read";
       if (invocation().json) {
         complain(file.string() + ": " + fault);
       } else {
@@ -84,12 +65,29 @@ void showLines(const DeviceDirectory& directory, const char* kind, const char* n
       }
     } else if (invocation().json) {
       Json json{{"kind", kind}};
-      json.update(Json(*members));
+      json.update(Json(*line.members));
       printJson(json);
     } else {
-      show(*members);
+      show(*line.members);
     }
-  }
+  };
+  std::deque<Line> last;
+  std::size_t number = 0;
+  forEachLine(file, [&](PropertyDict* members) {
+    ++number;
+    if (!isWanted(members, wanted)) {
+      return;
+    }
+    last.push_back(
+        {number, members != nullptr ? std::optional(std::move(*members)) : std::nullopt});
+    if (!wanted.last) {
+      showLine(last.front());
+    }
+    if (last.size() > wanted.last.value_or(0)) {
+      last.pop_front();
+    }
+  });
+  std::ranges::for_each(last, showLine);
 }
 
 void showEvents(const DeviceDirectory& directory, const Wanted& wanted) {
@@ -232,7 +230,9 @@ std::vector<HostPath> submittedFiles(const DeviceDirectory& directory, const Wan
     }
   }
   std::ranges::stable_sort(numbered, {}, [](const auto& log) { return log.first; });
-  wanted.keepLast(numbered);
+  if (wanted.last && *wanted.last < numbered.size()) {
+    numbered.erase(numbered.begin(), numbered.end() - static_cast<std::ptrdiff_t>(*wanted.last));
+  }
   std::vector<HostPath> files;
   for (auto& [number, file] : numbered) {
     files.push_back(std::move(file));

@@ -91,7 +91,7 @@ void PageData::takeLogs(const DeviceDirectory& directory) {
 template <typename Take>
 void PageData::takeLines(const DeviceDirectory& directory, std::string_view file, Take take) {
   std::size_t malformed = 0;
-  forEachLine(contentIfThere(directory.hostPath(file)), [&](const PropertyDict* line) {
+  forEachLine(directory.hostPath(file), [&](const PropertyDict* line) {
     if (line != nullptr) {
       take(*line);
     } else {

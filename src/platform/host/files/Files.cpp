@@ -44,20 +44,33 @@ std::optional<FileDescriptor> lockFolder(const HostPath& folder, std::string& er
   return std::nullopt;
 }
 
-std::optional<std::string> readWholeFile(const HostPath& path, std::string& error, bool* missing,
-                                         std::uint64_t maxSize) {
+FileDescriptor openToRead(const HostPath& path, std::string& error, bool* missing) {
   // A pipe or device must not block the reader.
-  const FileDescriptor file = path.open(O_RDONLY | O_NONBLOCK);
+  FileDescriptor file = path.open(O_RDONLY | O_NONBLOCK);
   struct stat status {};
   if (missing != nullptr) {
     *missing = !file.isOpen() && errno == ENOENT;
   }
   if (!file.isOpen() || fstat(file.get(), &status) != 0) {
     error = systemError(path);
-    return std::nullopt;
+    return {};
   }
   if (!S_ISREG(status.st_mode)) {
     error = path.string() + (S_ISDIR(status.st_mode) ? ": Is a directory" : ": not a regular file");
+    return {};
+  }
+  return file;
+}
+
+std::optional<std::string> readWholeFile(const HostPath& path, std::string& error, bool* missing,
+                                         std::uint64_t maxSize) {
+  const FileDescriptor file = openToRead(path, error, missing);
+  struct stat status {};
+  if (!file.isOpen()) {
+    return std::nullopt;
+  }
+  if (fstat(file.get(), &status) != 0) {
+    error = systemError(path);
     return std::nullopt;
   }
   const auto isTooLarge = [&](std::uint64_t size) {

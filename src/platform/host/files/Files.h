@@ -44,6 +44,10 @@ std::optional<FileDescriptor> lockFolder(const HostPath& folder, std::string& er
 /// No document is larger; one that seems so may be all hole.
 inline constexpr std::uint64_t kMaxDocument = std::uint64_t{256} << 20;
 
+/// Opens a regular file to be read. Not open, with the cause in `error`, for anything else;
+/// `missing`, if given, tells whether nothing is there.
+FileDescriptor openToRead(const HostPath& path, std::string& error, bool* missing = nullptr);
+
 /// The content of a regular file. Nothing, with the cause in `error`, when it cannot be read or is
 /// larger than `maxSize`; `missing`, if given, tells whether it does not exist.
 std::optional<std::string> readWholeFile(const HostPath& path, std::string& error,

@@ -12,8 +12,39 @@
 #include <vector>
 
 #include "platform/host/files/AtomicFile.h"
+#include "platform/host/files/LineReader.h"
 
 namespace vesprun {
+
+bool forEachLineOf(const HostPath& path, const std::function<void(std::string_view line)>& take,
+                   std::string& error, std::uint64_t begin) {
+  bool missing = false;
+  FileDescriptor file = openToRead(path, error, &missing);
+  if (!file.isOpen()) {
+    return missing;
+  }
+  struct stat status {};
+  if (fstat(file.get(), &status) != 0 ||
+      lseek(file.get(), static_cast<off_t>(begin), SEEK_SET) < 0) {
+    error = systemError(path);
+    return false;
+  }
+  if (static_cast<std::uint64_t>(status.st_size) > kMaxLinesFile) {
+    error = path.string() + ": larger than " + std::to_string(kMaxLinesFile) + " bytes";
+    return false;
+  }
+  LineReader lines(std::move(file), kMaxLine);
+  std::string_view line;
+  auto result = lines.next(line);
+  for (; result != LineReader::Result::End && result != LineReader::Result::Failed;
+       result = lines.next(line)) {
+    take(result == LineReader::Result::Line ? line : std::string_view());
+  }
+  if (result == LineReader::Result::Failed) {
+    error = systemError(path);
+  }
+  return result == LineReader::Result::End;
+}
 
 bool JsonLines::open(std::string& error, int creating) {
   // Opened for reading as well, to see how the last line ends.
@@ -115,13 +146,14 @@ std::optional<std::uint64_t> JsonLines::removeLocked(
 std::optional<std::uint64_t> JsonLines::countRemoved(
     const std::function<bool(std::string_view line)>& goes, std::uint64_t& bytes,
     std::string& error, std::uint64_t maxBytes) const {
-  const FileDescriptor file = _path.open(O_RDONLY | O_NONBLOCK);
+  bool missing = false;
+  const FileDescriptor file = openToRead(_path, error, &missing);
   struct stat status {};
-  if (!file.isOpen() && errno == ENOENT) {
-    return 0;
+  if (!file.isOpen()) {
+    return missing ? std::optional<std::uint64_t>(0) : std::nullopt;
   }
-  if (!file.isOpen() || fstat(file.get(), &status) != 0 || !S_ISREG(status.st_mode)) {
-    error = file.isOpen() ? _path.string() + ": not a regular file" : systemError(_path);
+  if (fstat(file.get(), &status) != 0) {
+    error = systemError(_path);
     return std::nullopt;
   }
   bytes = static_cast<std::uint64_t>(status.st_size);

@@ -2,11 +2,15 @@
 
 #include <cerrno>
 #include <cstring>
+#include <utility>
 
 namespace vesprun {
 
 LineReader::LineReader(std::istream& stream, std::size_t longestLine)
-    : _stream(stream), _longestLine(longestLine), _error(stream ? 0 : errno) {}
+    : _stream(&stream), _longestLine(longestLine), _error(stream ? 0 : errno) {}
+
+LineReader::LineReader(FileDescriptor file, std::size_t longestLine)
+    : _file(std::move(file)), _longestLine(longestLine), _error(_file.isOpen() ? 0 : errno) {}
 
 LineReader::Result LineReader::next(std::string_view& line) {
   bool isTooLong = false;
@@ -46,12 +50,25 @@ bool LineReader::readMore() {
     _buffer.resize(_end + kReadSize);
   }
   errno = 0;
-  _stream.read(_buffer.data() + _end, static_cast<std::streamsize>(_buffer.size() - _end));
-  _end += static_cast<std::size_t>(_stream.gcount());
-  if (_stream.bad()) {
+  const std::ptrdiff_t count = read(_buffer.data() + _end, _buffer.size() - _end);
+  if (count < 0) {
     _error = errno != 0 ? errno : EIO;
+    return false;
   }
-  return _error == 0 && _stream.gcount() > 0;
+  _end += static_cast<std::size_t>(count);
+  return count > 0;
+}
+
+std::ptrdiff_t LineReader::read(char* bytes, std::size_t size) {
+  if (_stream != nullptr) {
+    _stream->read(bytes, static_cast<std::streamsize>(size));
+    return _stream->bad() ? -1 : _stream->gcount();
+  }
+  ssize_t count = 0;
+  do {
+    count = ::read(_file.get(), bytes, size);
+  } while (count < 0 && errno == EINTR);
+  return count;
 }
 
 }  // namespace vesprun

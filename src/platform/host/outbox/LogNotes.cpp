@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <functional>
 #include <nlohmann/json.hpp>
-#include <sstream>
 
 #include "common/Calendar.h"
 #include "platform/host/documents/JsonForm.h"
@@ -27,16 +26,13 @@ Json parsed(std::string_view line) { return Json::parse(line, nullptr, false); }
 bool forEachNote(const DeviceDirectory& directory, std::string_view file,
                  const std::function<void(const std::string& name, const Json& note)>& take,
                  std::string& error) {
-  bool missing = false;
-  const auto content = readWholeFile(directory.hostPath(file), error, &missing);
-  std::istringstream lines(content.value_or(""));
-  for (std::string line; std::getline(lines, line);) {
+  const auto takeLine = [&take](std::string_view line) {
     const Json note = parsed(line);
     if (const std::string* const name = nameIn(note)) {
       take(*name, note);
     }
-  }
-  return content || missing;
+  };
+  return forEachLineOf(directory.hostPath(file), takeLine, error);
 }
 
 std::optional<std::int64_t> integerIn(const Json& note, const char* key) {
