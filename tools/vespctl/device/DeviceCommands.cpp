@@ -97,13 +97,26 @@ bool beginInit(const DeviceDirectory& directory) {
   return true;
 }
 
+/// Makes the folder and those above it that are missing, each flushed into the one above.
+void makeFolders(const std::filesystem::path& path) {
+  std::error_code failure;
+  if (!std::filesystem::exists(path, failure) && !failure) {
+    const std::filesystem::path above = path.has_parent_path() ? path.parent_path() : ".";
+    makeFolders(above);
+    std::filesystem::create_directory(path, failure);
+    if (!failure) {
+      orFail([&](std::string& error) { return flushFolder(above.string(), error); });
+    }
+  }
+  if (failure) {
+    throw CommandFailure(path.string() + ": " + failure.message());
+  }
+}
+
 /// `device.json` is written last: without it the folder is no device.
 void initDevice(const std::string& path, bool sample) {
+  makeFolders(path);
   std::error_code failure;
-  std::filesystem::create_directories(path, failure);
-  if (failure) {
-    throw CommandFailure(path + ": " + failure.message());
-  }
   if (!std::filesystem::is_directory(path, failure)) {
     throw CommandFailure(path + ": is not empty");
   }

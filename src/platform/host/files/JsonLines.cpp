@@ -23,14 +23,11 @@ bool forEachLineOf(const HostPath& path, const std::function<void(std::string_vi
   if (!file.isOpen()) {
     return missing;
   }
-  struct stat status {};
-  if (fstat(file.get(), &status) != 0 ||
-      lseek(file.get(), static_cast<off_t>(begin), SEEK_SET) < 0) {
+  const off_t size = lseek(file.get(), 0, SEEK_END);
+  constexpr auto kMax = static_cast<off_t>(kMaxLinesFile);
+  if (size < 0 ||
+      lseek(file.get(), std::max(static_cast<off_t>(begin), size - kMax), SEEK_SET) < 0) {
     error = systemError(path);
-    return false;
-  }
-  if (static_cast<std::uint64_t>(status.st_size) > kMaxLinesFile) {
-    error = path.string() + ": larger than " + std::to_string(kMaxLinesFile) + " bytes";
     return false;
   }
   LineReader lines(std::move(file), kMaxLine);

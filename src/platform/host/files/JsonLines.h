@@ -16,9 +16,9 @@ namespace vesprun {
 inline constexpr std::uint64_t kMaxLine = 16 * 1024 * 1024;
 inline constexpr std::uint64_t kMaxLinesFile = 1024 * 1024 * 1024;
 
-/// Calls `take` with each line of the file, from the byte `begin` on; with an empty one for what is
-/// longer than `kMaxLine`. A missing file has no lines. False, with the cause in `error`, when it
-/// cannot be read to its end.
+/// Calls `take` with each line of the file, from the byte `begin` on and of the last
+/// `kMaxLinesFile` bytes; with an empty one for what is longer than `kMaxLine`. A missing file has
+/// no lines. False, with the cause in `error`, when it cannot be read to its end.
 bool forEachLineOf(const HostPath& path, const std::function<void(std::string_view line)>& take,
                    std::string& error, std::uint64_t begin = 0);
 
