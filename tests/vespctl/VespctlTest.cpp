@@ -71,6 +71,8 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
     const auto lines = std::count(error.begin(), error.end(), '\n');
     EXPECT_EQ(lines, status == 2 ? 2 : 1) << error << "where help is, too";
   }
+  EXPECT_EQ(run("fields >/dev/null; ulimit -f 1; '" VESPCTL_PROGRAM "' page full"), 1);
+  EXPECT_THAT(error, HasSubstr("full: File too large")) << "no signal";
   EXPECT_EQ(print("counters dump"), "") << "nothing was changed";
 }
 
@@ -86,6 +88,7 @@ TEST_F(VespctlTest, InitIsWholeAndCanBeRepeated) {
   }
   print("init half --sample");
   const std::string rows = print("-C half counters dump");
+  EXPECT_EQ(print("-C half counters dump | cut -f3 | grep -v '^linux[.]' || true"), "");
   shell("mv half/device.json . && touch half/.init-unfinished");
   print("init half --sample");
   EXPECT_EQ(std::ranges::count(print("-C half counters dump"), '\n'),
@@ -187,6 +190,11 @@ TEST_F(VespctlTest, ShowsSubmittedLogs) {
                             HasSubstr("count 2, min 1, mean 2, max 3, standard deviation 1\n"),
                             HasSubstr("  (-inf, 2]  " + std::string(40, '#') + " 1\n"),
                             HasSubstr("   (2, inf)   -4\n")));
+  folder.write("device/outbox/events.jsonl", R"({"event": "a"}
+{"event": "b"}
+x
+)");
+  EXPECT_EQ(print("show events --last 2"), "  b  0 fields\n(line 3 cannot be read)\n");
 }
 
 TEST_F(VespctlTest, ExportsNothingOfAnUnsoundDailyLog) {
