@@ -98,6 +98,17 @@ TEST(Vesprun, ExitsWithZeroWhereNoDeviceIs) {
               ::testing::StartsWith("vesprun: ./device.json: "));
 }
 
+TEST(Vesprun, HasTheRightsOfTheDevicesOwner) {
+  if (geteuid() != 0) {
+    GTEST_SKIP() << "only root has other rights";
+  }
+  TestDevice device("{}");
+  device.endProcess();
+  const std::string run = "cd " + device.path() + " && chown -R 12345:12345 . && " VESPRUN_PROGRAM;
+  const char* const others = R"([ "$(find . ! -user 12345; stat -c %u outbox/log.jsonl)" = 12345 ])";
+  EXPECT_EQ(std::system((run + " -d && " + others).c_str()), 0);
+}
+
 TEST(Vesprun, ListensUntilTenSecondsWereQuiet) {
   const auto start = std::chrono::steady_clock::now();
   Process unasked;

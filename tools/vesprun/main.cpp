@@ -1,3 +1,7 @@
+#include <grp.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
 #include <cstdio>
 #include <exception>
 
@@ -9,7 +13,25 @@
 namespace vesprun {
 namespace {
 
+/// Root goes on as the owner of the device, who could otherwise not change what root wrote. False
+/// when that fails.
+bool takeRightsOfOwner() {
+  constexpr gid_t kNoGroup = 65534;
+  struct stat directory {};
+  if (geteuid() != 0 || stat(VESPRUN_DEVICE_DIRECTORY, &directory) != 0 || directory.st_uid == 0) {
+    return true;
+  }
+  const uid_t user = directory.st_uid;
+  const gid_t group = directory.st_gid != 0 ? directory.st_gid : kNoGroup;
+  return setgroups(0, nullptr) == 0 && setresgid(group, group, group) == 0 &&
+         setresuid(user, user, user) == 0;
+}
+
 void runOnDevice(std::span<const char* const> commandLine) {
+  if (!takeRightsOfOwner()) {
+    std::fprintf(stderr, "vesprun: the rights of the device's owner cannot be taken\n");
+    return;
+  }
   std::string error;
   const std::unique_ptr<HostPlatform> device = HostPlatform::open(VESPRUN_DEVICE_DIRECTORY, error);
   if (!device) {

@@ -95,15 +95,6 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
     error = path.string() + ": not a regular file";
     return false;
   }
-  // SQLite would wait at a pipe for ever.
-  for (const char* companion : kCompanions) {
-    const HostPath besidePath = folder.below(std::string(kName) + companion);
-    const std::optional<struct stat> beside = besidePath.status();
-    if ((beside && !S_ISREG(beside->st_mode)) || (!beside && errno == ELOOP)) {
-      error = besidePath.string() + ": not a regular file";
-      return false;
-    }
-  }
   const auto attempt = [&] {
     CounterStore store(path, _longestWait, access);
     if (!work(store)) {

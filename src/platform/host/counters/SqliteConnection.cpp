@@ -1,5 +1,8 @@
 #include "platform/host/counters/SqliteConnection.h"
 
+#include <sys/stat.h>
+#include <unistd.h>
+
 #include <new>
 
 namespace vesprun {
@@ -93,6 +96,23 @@ class ErrorKeepingFileSystem {
   sqlite3_vfs _methods;
 };
 
+/// SQLite would wait at a pipe for ever, and take whatever lies beside a file for its journal.
+void requireOwnCompanions(const std::string& path) {
+  struct stat database {};
+  for (const char* const end : {"-journal", "-wal", "-shm"}) {
+    const std::string name = path + end;
+    struct stat beside {};
+    if (lstat(name.c_str(), &beside) != 0 || stat(path.c_str(), &database) != 0) {
+      continue;
+    }
+    const bool isOwn = beside.st_uid == database.st_uid || beside.st_uid == geteuid();
+    if (!S_ISREG(beside.st_mode) || !isOwn) {
+      throw SqliteFailure{SQLITE_CANTOPEN,
+                          name + (isOwn ? ": not a regular file" : ": belongs to another user")};
+    }
+  }
+}
+
 }  // namespace
 
 bool SqliteFailure::isCorruption() const {
@@ -113,6 +133,7 @@ bool SqliteFailure::isCorruption() const {
 SqliteConnection::SqliteConnection(const std::string& path, std::chrono::milliseconds longestWait,
                                    bool looks)
     : _path(path) {
+  requireOwnCompanions(path);
   sqlite3* database = nullptr;
   const int result = sqlite3_open_v2(path.c_str(), &database,
                                      (looks ? SQLITE_OPEN_READONLY : SQLITE_OPEN_READWRITE) |

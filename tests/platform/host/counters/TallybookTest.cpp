@@ -469,8 +469,15 @@ TEST_F(TallybookTest, NoticesAChunkThatIsCutShort) {
   }
 }
 
-TEST_F(TallybookTest, RefusesPipesInPlaceOfItsFiles) {
+TEST_F(TallybookTest, RefusesForeignFilesBesideItsOwn) {
   add("k", 1);
+  const std::string journal = folder.path(kFile) + "-journal";
+  folder.write(std::string(kFile) + "-journal", "");
+  if (chown(journal.c_str(), 12345, 12345) == 0) {  // as root
+    add("k", 1);
+    EXPECT_THAT(log.messages, ElementsAre(HasSubstr(journal + ": belongs to another user")));
+  }
+  unlink(journal.c_str());
   for (const char* end : {"-journal", "-wal", "-shm"}) {
     const std::string path = folder.path(kFile) + end;
     ASSERT_EQ(mkfifo(path.c_str(), 0600), 0);
