@@ -105,7 +105,8 @@ TEST(Vesprun, HasTheRightsOfTheDevicesOwner) {
   TestDevice device("{}");
   device.endProcess();
   const std::string run = "cd " + device.path() + " && chown -R 12345:12345 . && " VESPRUN_PROGRAM;
-  const char* const others = R"([ "$(find . ! -user 12345; stat -c %u outbox/log.jsonl)" = 12345 ])";
+  const char* const others =
+      "test \"$(find . ! -user 12345; stat -c %u outbox/log.jsonl)\" = 12345";
   EXPECT_EQ(std::system((run + " -d && " + others).c_str()), 0);
 }
 
