@@ -333,6 +333,34 @@ def test_refused_stores(store, folder, _):
     run("keys", folder / "none", status=1)
 
 
+def test_page(store, folder, chance):
+    run("load", store, "/dev/null")
+    assert "No key is reported" in run("page", store)
+    lines = []
+    for back in range(20):
+        for number in range(24):
+            values = {"jump": (900 if back == 0 else 100) + chance.randint(-5, 5), "calm": chance.randint(90, 110),
+                      "<script>": 1, "linux.memory.pagedInKiB": 4096}
+            build = "2<b>" if number % 2 and back < 9 else "1"
+            values["slower"] = chance.randint(90, 110) * (3 if build == "2<b>" else 1)
+            if number < 4:
+                values["rare"] = 7
+            if number > 20 and back < 10:
+                continue  # stopped
+            lines.append(line(f"D{number}", DAY - back, build=build, scalars=values,
+                              distributions={"d": [1, 9, chance.uniform(4, 5), 2, 30]}))
+    run("load", store, "-", data="\n".join(lines).encode())
+    page = run("page", store, "--title", "Our <phones>")
+    changed, builds, keys, devices = page.split("</section>")[:4]
+    assert "<bdi>Our &lt;phones&gt;</bdi>" in changed and "3 devices stopped" in changed
+    assert changed.count("<li ") == 2 and "<bdi>jump</bdi>" in changed, changed
+    assert builds.index("<bdi>slower</bdi>") < builds.index("<bdi>calm</bdi>") and "2&lt;b&gt;" in builds
+    assert "4\u202fMiB" in keys and "<bdi>&lt;script&gt;</bdi>" in keys and "<bdi>d</bdi>" in keys
+    assert "rare" not in page and page.count("<script>") == 1
+    run("page", store, folder / "page")
+    assert (folder / "page").stat().st_mode & 0o777 == 0o600 and run("page", store) == (folder / "page").read_text()
+
+
 def main():
     chance = random.Random(7)
     for name, test in sorted(globals().items()):

@@ -13,6 +13,8 @@
 #include "commandline/Program.h"
 #include "common/Calendar.h"
 #include "common/TextForm.h"
+#include "page/FleetPage.h"
+#include "page/PageFile.h"
 #include "platform/Clock.h"
 #include "platform/host/files/StandardStreams.h"
 
@@ -324,6 +326,24 @@ void addPrune(CLI::App& command) {
   });
 }
 
+void addPage(CLI::App& command) {
+  struct Wanted {
+    std::string store;
+    std::string file;
+    std::string title;
+  };
+  const auto wanted = std::make_shared<Wanted>();
+  addStore(command, wanted->store);
+  command.add_option("FILE", wanted->file, "Where to write it, instead of standard output")
+      ->type_name("");
+  command.add_option("--title", wanted->title, "At the top, instead of the number of devices")
+      ->type_name("TEXT");
+  command.callback([wanted] {
+    const auto store = openStore(wanted->store);
+    writePage(wanted->file, fleetPage(*store, wanted->title));
+  });
+}
+
 constexpr Command kCommands[] = {
     {"load", "Takes lines that vespctl export wrote", addLoad},
     {"keys", "Lists the keys, with their devices and days", addKeys},
@@ -334,6 +354,7 @@ constexpr Command kCommands[] = {
      addQuestionCommand<printDistributions>},
     {"compare", "Tells which keys differ between two groups of devices", addCompare},
     {"dump", "Prints what is stored as CSV, for other programs", addDump, Form::Own},
+    {"page", "Writes one HTML page of what the devices reported", addPage, Form::Own},
     {"forget", "Removes all that devices sent, and refuses more", addForget},
     {"prune", "Removes old days, and refuses them from then on", addPrune},
     {"completion", "Prints the completion script for a shell", addCompletionCommand, Form::Own},

@@ -9,13 +9,23 @@
 
 namespace vesprun {
 
-/// The whole HTML document. It needs nothing but itself: no file, no network, no script.
-///
-/// `device` is a name for people, `now` the device's time.
-std::string pageText(const std::string& device, const Date& now, const PageData& data,
-                     const std::vector<KeptBack>& keptBack);
+/// Something that is wrong on the device.
+struct PageFinding {
+  std::string finding;
+  std::string detail;
+};
 
-/// The style sheet, from page.css.
-std::string_view pageStyle();
+/// What a page says of a device besides what it reported.
+struct PageAbout {
+  std::string title;                   ///< the host's name unless another was given
+  std::vector<std::string> names;      ///< system, build, model and pseudonym
+  Date now;                            ///< the device's time
+  std::vector<PageFinding> findings;
+  std::vector<KeptBack> keptBack;      ///< not shown when the page is shared
+  bool isShared = false;               ///< without what is for the device's owner alone
+};
+
+/// The whole HTML document.
+std::string pageText(const PageAbout& about, const PageData& data);
 
 }  // namespace vesprun

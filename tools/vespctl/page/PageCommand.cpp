@@ -1,62 +1,71 @@
 #include "page/PageCommand.h"
 
-#include <filesystem>
-#include <iostream>
+#include <unistd.h>
+
 #include <limits>
-#include <system_error>
 
 #include "Command.h"
 #include "ReadOnlyDevice.h"
 #include "page/Page.h"
-#include "platform/host/files/AtomicFile.h"
+#include "page/PageFile.h"
+#include "platform/host/device/LiveSystem.h"
+#include "platform/host/device/Pseudonym.h"
 
 namespace vesprun {
 namespace {
 
-/// Writes the file whole or not at all. What a link leads to is replaced, not the link.
-void writePage(const std::string& file, const std::string& page) {
-  std::error_code failure;
-  std::filesystem::path path(file);
-  if (std::filesystem::exists(path, failure)) {
-    if (!std::filesystem::is_regular_file(path, failure)) {
-      throw CommandFailure(file + ": not a regular file");
-    }
-    path = std::filesystem::canonical(path, failure);
+struct Wanted {
+  std::string file;
+  std::string title;
+  bool isShared = false;
+};
+
+PageAbout aboutOf(HostPlatform& device, const Wanted& wanted) {
+  const auto& system = device.description().system;
+  PageAbout about;
+  about.now = device.clock().now();
+  about.isShared = wanted.isShared;
+  about.title = wanted.title;
+  if (about.title.empty()) {
+    char host[256] = "";
+    about.title = gethostname(host, sizeof host - 1) == 0 && host[0] != 0 ? host : "this device";
   }
-  if (failure) {
-    throw CommandFailure(file + ": " + failure.message());
-  }
-  orFail([&](std::string& error) { return replaceFile(path.string(), page, error); });
+  about.names = {describedOr(system.osVersion, live::osVersion),
+                 "build " + describedOr(system.buildVersion, live::osBuild),
+                 "model " + describedOr(system.hardwareModel, live::hardwareModel),
+                 "device " + pseudonymOf(system.systemID.value_or(live::machineIdentifier()),
+                                          "vesprun exported device")};
+  return about;
 }
 
-void makePage(const std::string& file) {
+void makePage(const Wanted& wanted) {
   using Days = std::numeric_limits<std::int32_t>;
   const ReadOnlyDevice opened(LogLevel::Error, OwnersRights::UntilFileIsWritten);
   const PageData data(opened.device->directory());
-  const auto keptBack = keysKeptBack(Days::min(), Days::max());
-  if (!keptBack) {
+  PageAbout about = aboutOf(*opened.device, wanted);
+  if (auto keptBack = keysKeptBack(Days::min(), Days::max())) {
+    about.keptBack = std::move(*keptBack);
+  } else {
     opened.complaints.fail(kUnreadableCounters);
   }
   opened.complaints.print();
   nameUnreadable(data.unreadable);
-  std::error_code ignored;
-  const auto absolute = std::filesystem::canonical(opened.device->directory().path(), ignored);
-  const std::string page =
-      pageText(absolute.filename().string(), platform().clock().now(), data, *keptBack);
-  if (file.empty() || file == "-") {
-    std::cout << page;
-  } else {
-    const RightsOfCaller rights;
-    writePage(file, page);
-  }
+  const std::string page = pageText(about, data);
+  const RightsOfCaller rights;
+  writePage(wanted.file, page);
 }
 
 }  // namespace
 
 void addPageCommand(CLI::App& command) {
-  const auto file = std::make_shared<std::string>();
-  command.add_option("FILE", *file, "Where to write it, instead of standard output");
-  command.callback([file] { makePage(*file); });
+  const auto wanted = std::make_shared<Wanted>();
+  command.add_option("FILE", wanted->file, "Where to write it, instead of standard output");
+  command.add_option("--title", wanted->title, "At the top, instead of the host's name")
+      ->type_name("TEXT");
+  command.add_flag("--share", wanted->isShared,
+                   "Leaves out what is for the owner alone: the names of keys that are kept back, "
+                   "and lines of the system log");
+  command.callback([wanted] { makePage(*wanted); });
 }
 
 }  // namespace vesprun

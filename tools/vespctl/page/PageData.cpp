@@ -7,9 +7,10 @@
 #include "Command.h"
 #include "common/Calendar.h"
 #include "common/TextForm.h"
-#include "page/Html.h"
+#include "page/Quantity.h"
 #include "platform/host/files/Files.h"
 #include "platform/host/outbox/LogName.h"
+#include "platform/host/outbox/LogNotes.h"
 #include "platform/host/outbox/OutboxFiles.h"
 
 namespace vesprun {
@@ -63,6 +64,44 @@ void PageData::takeDays() {
       distributions[key].push_back({day, number(0), number(1), number(2), number(3),
                                     *numbers[4].number(), histograms.findDict(key)});
     }
+  }
+}
+
+void PageData::takeSystems(const DeviceDirectory& directory) {
+  if (const auto boot = scalars.find("linux.time.boots"); boot != scalars.end()) {
+    for (const Value& value : boot->second) {
+      if (value.value.asInt64() > 0) {
+        boots.push_back(static_cast<std::int32_t>(value.day));
+      }
+    }
+  }
+  const auto notes = orFail([&](std::string& error) { return readSubmittedNotes(directory, error); });
+  for (const auto& [day, log] : days) {
+    const auto noted = notes->find(log->name);
+    if (noted == notes->end() || !noted->second.build) {
+      continue;
+    }
+    const std::string model = noted->second.model.value_or("");
+    if (systems.empty() || systems.back().build != *noted->second.build ||
+        systems.back().model != model) {
+      systems.push_back({day, day, *noted->second.build, model});
+    }
+    systems.back().lastDay = day;
+  }
+}
+
+void PageData::takeError(const PropertyDict& line) {
+  constexpr std::size_t kMostKept = 20;
+  const std::string* const level = line.findString("level");
+  const std::string* const message = line.findString("message");
+  const std::string* const time = line.findString("time");
+  if (level == nullptr || *level != "error" || message == nullptr) {
+    return;
+  }
+  ++errors.count;
+  errors.newest.push_back((time != nullptr ? *time + " " : "") + *message);
+  if (errors.newest.size() > kMostKept) {
+    errors.newest.erase(errors.newest.begin());
   }
 }
 
@@ -132,7 +171,9 @@ PageData::PageData(const DeviceDirectory& directory) {
   unreadable = forEachSubmittedLog(
       directory, [this](SubmittedLog&& log) { submitted.push_back(std::move(log)); });
   takeDays();
+  takeSystems(directory);
   takeLogs(directory);
+  takeLines(directory, kSystemLogFile, [this](const PropertyDict& line) { takeError(line); });
   takeLines(directory, kEventsFile, [this](const PropertyDict& line) { takeEvent(line); });
   takeLines(directory, kRecordsFile, [this](const PropertyDict& line) { takeRecord(line); });
 }

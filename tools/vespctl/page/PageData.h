@@ -45,6 +45,20 @@ struct PageData {
     std::map<std::string, double, std::less<>> fields;
   };
 
+  /// Days on which one build of the system reported.
+  struct SystemDay {
+    std::int32_t day;  ///< the first
+    std::int32_t lastDay;
+    std::string build;
+    std::string model;
+  };
+
+  /// Lines of level error in the system log.
+  struct Errors {
+    std::size_t count = 0;
+    std::vector<std::string> newest;  ///< a few, in their order
+  };
+
   explicit PageData(const DeviceDirectory& directory);
   PageData(const PageData&) = delete;
   PageData& operator=(const PageData&) = delete;
@@ -57,9 +71,14 @@ struct PageData {
   std::optional<StorageLog> storageLog;       ///< the newest
   std::map<std::string, std::size_t> others;  ///< what else was submitted, and how often
   std::vector<UnreadableLog> unreadable;      ///< files, and lines of files
+  std::vector<std::int32_t> boots;            ///< days on which the system was started
+  std::vector<SystemDay> systems;             ///< by day; those of logs that say it
+  Errors errors;
 
  private:
   void takeDays();
+  void takeSystems(const DeviceDirectory& directory);
+  void takeError(const PropertyDict& line);
   void takeLogs(const DeviceDirectory& directory);
   template <typename Take>
   void takeLines(const DeviceDirectory& directory, std::string_view file, Take take);

@@ -5,7 +5,7 @@
 #include <initializer_list>
 
 #include "common/Calendar.h"
-#include "page/Html.h"
+#include "page/Quantity.h"
 
 namespace vesprun {
 namespace {
