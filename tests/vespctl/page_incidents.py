@@ -238,7 +238,7 @@ def check_hostile(program):
                       HOSTILE[-1].replace("<i>", "&lt;i&gt;"), "0009-193-log-aggregated.ptree", "1 line cannot be read"]:
             assert shown in page, shown
         shared = device.page("--share")
-        for kept in ["kept.alone", "left-out", "Errors in the system log"]:
+        for kept in ["kept.alone", "id=left-out", "Errors in the system log"]:
             assert kept in page and kept not in shared, kept
         policy = re.search(r'Content-Security-Policy content="([^"]*)"', page).group(1)
         assert "unsafe" not in policy and policy.count("'sha256-") == 2 and "default-src 'none'" in policy
