@@ -30,8 +30,10 @@ Element changeList(std::vector<ChangeItem> items) {
   }
   Element part(std::vector<Element>{std::move(list)});
   if (items.size() > shown) {
-    part.add({"p", {}, "And " + countedNoun(items.size() - shown, "smaller change") +
-                           "; the keys below are marked."});
+    part.add({"p",
+              {},
+              "And " + countedNoun(items.size() - shown, "smaller change") +
+                  "; the keys below are marked."});
   }
   return part;
 }

@@ -26,8 +26,9 @@ Middle middleOf(const std::vector<double>& values) {
   }
   // More than half of the values are equal: the others still say how far it goes.
   const double spread = kDeviationOfMedianDeviation * medianOf(deviations);
-  return {median, spread > 0 ? spread
-                             : kDeviationOfMeanDeviation * sum / static_cast<double>(values.size())};
+  return {median, spread > 0
+                      ? spread
+                      : kDeviationOfMeanDeviation * sum / static_cast<double>(values.size())};
 }
 
 /// How far from the middle a value is, as a multiple of the spread.
@@ -36,12 +37,14 @@ double distance(double value, const std::vector<double>& values, double minSprea
   return std::abs(value - middle.median) / std::max(middle.spread, minSpread);
 }
 
-/// What a step of rounding makes of the spread: whitelists let many figures through with two digits.
+/// What a step of rounding makes of the spread: whitelists let many figures through with two
+/// digits.
 double spreadOfRounding(double last, const std::vector<double>& values, double median) {
   constexpr double kStepsToSee = 4;
   double step = 1;
   const auto isMultiple = [&step](double value) { return std::fmod(value, step * 10) == 0; };
-  while (step < std::abs(median) / 10 && isMultiple(last) && std::ranges::all_of(values, isMultiple)) {
+  while (step < std::abs(median) / 10 && isMultiple(last) &&
+         std::ranges::all_of(values, isMultiple)) {
     step *= 10;
   }
   return step > 1 && step <= std::abs(median) / 10 ? step / kStepsToSee : 0;
@@ -105,7 +108,7 @@ std::optional<Unusual> unusualLast(std::span<const DayValue> all) {
     }
   }
   const auto [lowest, highest] = std::ranges::minmax(values);
-  Unusual result{0,       last.day, last.value, all[all.size() - 2].value, medianOf(values),
+  Unusual result{0,      last.day, last.value, all[all.size() - 2].value, medianOf(values),
                  lowest, highest};
   const double minSpread = spreadOfRounding(last.value, values, result.usual);
   if (lowest == highest) {
@@ -184,8 +187,7 @@ std::optional<Drift> driftOf(std::span<const DayValue> all) {
   }
   const double kept = squares > 0 ? std::clamp(products / squares, 0.0, 0.9) : 0;
   const auto n = static_cast<double>(count);
-  const double deviation =
-      std::sqrt(n * (n - 1) * (2 * n + 5) / 18 * (1 + kept) / (1 - kept));
+  const double deviation = std::sqrt(n * (n - 1) * (2 * n + 5) / 18 * (1 + kept) / (1 - kept));
   // It must also stand out of what days differ by.
   const double scatter = std::sqrt(squares / n);
   drift.score = std::abs(ordered) / deviation;

@@ -94,8 +94,8 @@ class Steps {
   bool _isDot = false;
 };
 
-/// Many points of one column of the grid make a line up and down in it: a path is no longer than the
-/// picture is wide.
+/// Many points of one column of the grid make a line up and down in it: a path is no longer than
+/// the picture is wide.
 std::string lineThrough(const std::vector<Point>& points, double longestStep, const Scale& across,
                         const Scale& up) {
   Steps steps;
@@ -163,7 +163,8 @@ Element sharedShapes(const MarkedDays& marked, Period period) {
   Element group("g", {{"id", "days"}});
   group.add(path("o", ticks(marked.boots, "v-12")));
   group.add(path("v", ticks(marked.builds, "v-99")));
-  return {"svg", {{"class", "none"}, {"aria-hidden", "true"}}, Element("defs", {}, std::move(group))};
+  return {
+      "svg", {{"class", "none"}, {"aria-hidden", "true"}}, Element("defs", {}, std::move(group))};
 }
 
 Element sparkline(const std::vector<Point>& all, Period period, double longestStep,
@@ -205,9 +206,10 @@ bool isLogarithmic(const std::vector<BandPoint>& points) {
 
 Element bandChart(const std::vector<BandPoint>& all, Period period, const std::string& label) {
   std::vector<BandPoint> points;
-  std::copy_if(all.begin(), all.end(), std::back_inserter(points), [period](const BandPoint& point) {
-    return point.day >= period.first && point.day <= period.last;
-  });
+  std::copy_if(all.begin(), all.end(), std::back_inserter(points),
+               [period](const BandPoint& point) {
+                 return point.day >= period.first && point.day <= period.last;
+               });
   if (points.empty()) {
     return {};
   }

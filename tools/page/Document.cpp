@@ -31,8 +31,9 @@ Element meta(ConstantText name, std::string content) {
 
 Document::Document(const std::string& title) {
   // Own quotes, which would be escaped in an attribute: the policy is all of constants.
-  _html = "<!DOCTYPE html>\n<html lang=en>\n<meta charset=utf-8>\n"
-          "<meta http-equiv=Content-Security-Policy content=\"default-src 'none'; style-src ";
+  _html =
+      "<!DOCTYPE html>\n<html lang=en>\n<meta charset=utf-8>\n"
+      "<meta http-equiv=Content-Security-Policy content=\"default-src 'none'; style-src ";
   _html += sourceOf(kPageStyle) + "; script-src " + sourceOf(kPageScript) +
            "; base-uri 'none'; form-action 'none'\">\n";
   add(meta("viewport", "width=device-width, initial-scale=1"));

@@ -20,11 +20,11 @@ constexpr std::size_t kShownTail = 30;
 bool isUnseen(char32_t character) {
   static constexpr struct {
     char32_t first, last;
-  } kRanges[] = {{0, 0x1F},          {0x7F, 0x9F},       {0xAD, 0xAD},
-                 {0x34F, 0x34F},     {0x61C, 0x61C},     {0x115F, 0x1160},  {0x17B4, 0x17B5},
-                 {0x180B, 0x180F},   {0x200B, 0x200F},   {0x2028, 0x202E},  {0x2060, 0x206F},
-                 {0x3164, 0x3164},   {0xFE00, 0xFE0F},   {0xFEFF, 0xFEFF},  {0xFFA0, 0xFFA0},
-                 {0xFFF0, 0xFFFB},   {0x1BCA0, 0x1BCA3}, {0x1D173, 0x1D17A}, {0xE0000, 0xE0FFF}};
+  } kRanges[] = {{0, 0x1F},          {0x7F, 0x9F},       {0xAD, 0xAD},      {0x34F, 0x34F},
+                 {0x61C, 0x61C},     {0x115F, 0x1160},   {0x17B4, 0x17B5},  {0x180B, 0x180F},
+                 {0x200B, 0x200F},   {0x2028, 0x202E},   {0x2060, 0x206F},  {0x3164, 0x3164},
+                 {0xFE00, 0xFE0F},   {0xFEFF, 0xFEFF},   {0xFFA0, 0xFFA0},  {0xFFF0, 0xFFFB},
+                 {0x1BCA0, 0x1BCA3}, {0x1D173, 0x1D17A}, {0xE0000, 0xE0FFF}};
   return std::any_of(std::begin(kRanges), std::end(kRanges), [character](const auto& range) {
     return character >= range.first && character <= range.last;
   });
@@ -173,10 +173,9 @@ Element nameElement(std::string_view name) {
   }
   const std::string_view head = name.substr(0, characterStart(name, kShownHead));
   const std::string_view tail = name.substr(characterStart(name, name.size() - kShownTail));
-  return std::vector<Element>{
-      Element("bdi", {}, head),
-      Element("small", {}, " … " + numeral(name.size()) + " bytes … "),
-      Element("bdi", {}, tail)};
+  return std::vector<Element>{Element("bdi", {}, head),
+                              Element("small", {}, " … " + numeral(name.size()) + " bytes … "),
+                              Element("bdi", {}, tail)};
 }
 
 std::string cutInTheMiddle(std::string_view text, std::size_t longest) {

@@ -58,7 +58,9 @@ class Element {
     return *this;
   }
 
-  bool isEmpty() const { return _tag == nullptr && _embedded == nullptr && _text.empty() && _children.empty(); }
+  bool isEmpty() const {
+    return _tag == nullptr && _embedded == nullptr && _text.empty() && _children.empty();
+  }
 
   void writeTo(std::string& html) const;
 

@@ -24,7 +24,6 @@ Element groupTitle(const KeyGroup& group) {
   return title;
 }
 
-
 }  // namespace
 
 KeyTable::KeyTable(Period period, std::size_t keys, std::size_t textBytes)
@@ -93,11 +92,12 @@ Element KeyTable::textRow(const KeyCourse& course, std::size_t prefix) const {
 void KeyTable::add(Document& document, const std::vector<std::string_view>& keys,
                    const std::function<KeyCourse(std::size_t place)>& courseOf) const {
   for (const KeyGroup& group : groupKeys(keys)) {
-    Element content = isDetailed() ? Element("table", {{"class", "keys"}},
-                                             headRow({"Key", "Over the days", "Newest", "Usual",
-                                                      "Lowest", "Highest"}))
-                                   : Element("pre", {{"class", "rows"}},
-                                             Element::constant("key\tnewest\tlowest\thighest\n"));
+    Element content =
+        isDetailed()
+            ? Element("table", {{"class", "keys"}},
+                      headRow({"Key", "Over the days", "Newest", "Usual", "Lowest", "Highest"}))
+            : Element("pre", {{"class", "rows"}},
+                      Element::constant("key\tnewest\tlowest\thighest\n"));
     const std::size_t prefix = group.title.size();
     for (const std::size_t place : group.keys) {
       content.add(isDetailed() ? row(courseOf(place)) : textRow(courseOf(place), prefix));
@@ -108,8 +108,8 @@ void KeyTable::add(Document& document, const std::vector<std::string_view>& keys
 
 void KeyTable::addNames(Document& document, const std::vector<std::string_view>& keys) const {
   for (const KeyGroup& group : groupKeys(keys)) {
-    Element content = isDetailed() ? Element("ul", {{"class", "names"}})
-                                   : Element("pre", {{"class", "texts"}});
+    Element content =
+        isDetailed() ? Element("ul", {{"class", "names"}}) : Element("pre", {{"class", "texts"}});
     for (const std::size_t place : group.keys) {
       if (isDetailed()) {
         content.add({"li", {}, foldedName(keys[place])});

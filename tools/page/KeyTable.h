@@ -25,9 +25,9 @@ struct KeyCourse {
   Element details{};  ///< what unfolds below the key
 };
 
-/// How a page shows its keys, by how many there are: each with a line and what unfolds below it, or,
-/// when there are thousands, as a line of text each, which the page's script makes a row with a line
-/// when its group is unfolded.
+/// How a page shows its keys, by how many there are: each with a line and what unfolds below it,
+/// or, when there are thousands, as a line of text each, which the page's script makes a row with a
+/// line when its group is unfolded.
 class KeyTable {
  public:
   /// `textBytes` is the length of all keys of the page together.
@@ -35,8 +35,8 @@ class KeyTable {
 
   bool isDetailed() const { return _columns == 0; }
 
-  /// Adds the keys in groups of those that begin alike. `courseOf` is asked for each of them, by its
-  /// place in `keys`, which are sorted.
+  /// Adds the keys in groups of those that begin alike. `courseOf` is asked for each of them, by
+  /// its place in `keys`, which are sorted.
   void add(Document& document, const std::vector<std::string_view>& keys,
            const std::function<KeyCourse(std::size_t place)>& courseOf) const;
 

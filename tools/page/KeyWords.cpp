@@ -50,8 +50,8 @@ KeyWords wordsOf(std::string_view key) {
   KeyWords words{"", unitOfKey(key), false};
   if (key.starts_with(kStorage)) {
     const std::string_view field = key.substr(kStorage.size());
-    const auto found = std::ranges::find_if(
-        kStorageFields, [=](const auto& row) { return row.field == field; });
+    const auto found =
+        std::ranges::find_if(kStorageFields, [=](const auto& row) { return row.field == field; });
     words.words = found != std::end(kStorageFields) ? found->words : "a figure of the storage";
     words.isRunningTotal = words.unit != Unit::Percent;
   }

@@ -45,8 +45,8 @@ struct Step {
   double factor;  ///< of the smallest
   const char* name;
 };
-constexpr Step kSizes[] = {{1, "B"}, {0x1p10, "KiB"}, {0x1p20, "MiB"}, {0x1p30, "GiB"},
-                           {0x1p40, "TiB"}, {0x1p50, "PiB"}};
+constexpr Step kSizes[] = {{1, "B"},        {0x1p10, "KiB"}, {0x1p20, "MiB"},
+                           {0x1p30, "GiB"}, {0x1p40, "TiB"}, {0x1p50, "PiB"}};
 constexpr Step kTimes[] = {{1, "ms"}, {1e3, "s"}, {6e4, "min"}, {36e5, "h"}, {864e5, "d"}};
 
 /// In the largest step that leaves a number of at least two.
@@ -88,7 +88,8 @@ constexpr struct {
 }  // namespace
 
 Unit unitNamed(std::string_view name) {
-  const auto found = std::ranges::find_if(kNames, [=](const auto& row) { return row.name == name; });
+  const auto found =
+      std::ranges::find_if(kNames, [=](const auto& row) { return row.name == name; });
   return found != std::end(kNames) ? found->unit : Unit::None;
 }
 

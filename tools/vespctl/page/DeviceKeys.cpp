@@ -56,12 +56,12 @@ bool isUnknown(const Number& value) {
 }
 
 std::vector<DayValue> knownValues(const PageData::Series& series, const PageDays& days) {
-  const bool hasNegatives = std::ranges::any_of(
-      series, [](const auto& value) { return value.value.asDouble() < -1; });
+  const bool hasNegatives =
+      std::ranges::any_of(series, [](const auto& value) { return value.value.asDouble() < -1; });
   std::vector<DayValue> known;
   for (const auto& [day, value] : series) {
-    if (day >= days.period.first && day <= days.period.last &&
-        std::isfinite(value.asDouble()) && (!isUnknown(value) || hasNegatives)) {
+    if (day >= days.period.first && day <= days.period.last && std::isfinite(value.asDouble()) &&
+        (!isUnknown(value) || hasNegatives)) {
       known.push_back({static_cast<std::int32_t>(day), value.asDouble()});
     }
   }
@@ -127,9 +127,8 @@ ChangeItem KeyChanges::itemOf(std::string_view key, const KeySeries& series,
   } else if (!series.aspect.empty()) {
     what += ", " + std::string(series.aspect);
   }
-  ChangeItem item{unusual.score,           ChangeItem::Level::Look,
-                  std::move(what),         std::string(key),
-                  quantity(unusual.value, unit), rangeText(unusual, unit)};
+  ChangeItem item{unusual.score,    ChangeItem::Level::Look,       std::move(what),
+                  std::string(key), quantity(unusual.value, unit), rangeText(unusual, unit)};
   item.line = changeLine(series.values, _days.period);
   return item;
 }
@@ -168,12 +167,13 @@ void KeyChanges::judge(std::string_view key, const std::vector<KeySeries>& all) 
       !all.front().values.empty() && all.front().values.back().day == _days.newest();
   if (!best && drift && isCurrent) {
     constexpr double kDriftsRank = 2;
-    best = ChangeItem{kDriftsRank * drift->score, ChangeItem::Level::Look,
-                      wordsOrKey(words, key) + ", slowly " +
-                          (drift->to > drift->from ? "rising" : "falling"),
-                      std::string(key), quantity(drift->to, words.unit),
-                      quantity(drift->from, words.unit) + " in the week from " +
-                          dayText(drift->since)};
+    best = ChangeItem{
+        kDriftsRank * drift->score,
+        ChangeItem::Level::Look,
+        wordsOrKey(words, key) + ", slowly " + (drift->to > drift->from ? "rising" : "falling"),
+        std::string(key),
+        quantity(drift->to, words.unit),
+        quantity(drift->from, words.unit) + " in the week from " + dayText(drift->since)};
     best->line = changeLine(all.front().values, _days.period);
   }
   if (best) {
@@ -191,8 +191,8 @@ void KeyChanges::judgePresence(std::string_view key, const std::vector<DayValue>
   }
   const KeyWords words = wordsOf(key);
   const auto item = [&](std::string then, const char* now) {
-    ChangeItem made{0, ChangeItem::Level::Look, wordsOrKey(words, key), std::string(key), now,
-                    std::move(then)};
+    ChangeItem made{0,   ChangeItem::Level::Look, wordsOrKey(words, key), std::string(key),
+                    now, std::move(then)};
     made.line = changeLine(values, _days.period);
     return made;
   };
@@ -207,16 +207,15 @@ void KeyChanges::judgePresence(std::string_view key, const std::vector<DayValue>
     return;
   }
   std::size_t run = 0;
-  while (run < values.size() &&
-         run <= static_cast<std::size_t>(last - _days.reported.begin()) &&
+  while (run < values.size() && run <= static_cast<std::size_t>(last - _days.reported.begin()) &&
          values[values.size() - 1 - run].day == *(last - static_cast<std::ptrdiff_t>(run))) {
     ++run;
   }
   const bool isRegular = run >= std::min(kRecentDays, values.size()) && run >= kDaysToBeRegular;
   if (isRegular) {
-    _gone.push_back(item("last " + dayText(values.back().day) + ": " +
-                             quantity(values.back().value, words.unit),
-                         "gone"));
+    _gone.push_back(item(
+        "last " + dayText(values.back().day) + ": " + quantity(values.back().value, words.unit),
+        "gone"));
   }
 }
 
@@ -229,9 +228,8 @@ void KeyChanges::addPresences(std::vector<ChangeItem>& presences, const char* on
     for (std::size_t i = 0; i < kMostAlone; ++i) {
       names += (i > 0 ? ", " : "") + cutInTheMiddle(presences[i].key, 80);
     }
-    today.push_back({kRankOfPresence, ChangeItem::Level::Look,
-                     numeral(presences.size()) + many, "", one,
-                     names + " and " + numeral(presences.size() - kMostAlone) + " more"});
+    today.push_back({kRankOfPresence, ChangeItem::Level::Look, numeral(presences.size()) + many, "",
+                     one, names + " and " + numeral(presences.size() - kMostAlone) + " more"});
     return;
   }
   for (ChangeItem& item : presences) {

@@ -95,7 +95,8 @@ Element bandFigure(const std::vector<BandPoint>& points, const PageDays& days, U
     return Element("p", {{"class", "ends"}}, Element("span", {}, std::move(left)),
                    Element("span", {}, std::move(right)));
   };
-  return {"figure", {},
+  return {"figure",
+          {},
           Element("figcaption", {},
                   std::string("Lowest, mean and highest of each day") +
                       (isLogarithmic(points) ? ", logarithmic" : "")),
@@ -144,9 +145,8 @@ std::vector<Bucket> bucketsOf(const std::vector<PageData::DistributionDay>& days
     newestDay = isNewest ? day->day : newestDay;
     isNewest = false;
   }
-  std::ranges::stable_sort(buckets, {}, [](const Bucket& bucket) {
-    return lowerBoundary(bucket.label);
-  });
+  std::ranges::stable_sort(buckets, {},
+                           [](const Bucket& bucket) { return lowerBoundary(bucket.label); });
   return buckets;
 }
 
@@ -179,7 +179,9 @@ Element histogramFigure(const std::vector<PageData::DistributionDay>& days, Unit
   }
   Element table("table", {{"class", "histogram"}});
   for (const Bucket& bucket : buckets) {
-    table.add({"tr", {}, rowHead(foldedName(bucket.label)),
+    table.add({"tr",
+               {},
+               rowHead(foldedName(bucket.label)),
                Element("td", {},
                        bar(share(share(bucket.newest, newest), longest),
                            days.size() > 1 ? share(share(bucket.all, all), longest) : 0)),
@@ -248,12 +250,15 @@ void addKeys(Document& document, const PageData& data, const PageDays& days,
     document.add({"p", {}, "No key has been reported."});
     return document.endSection();
   }
-  document.add({"p", {{"class", "key"}},
+  document.add({"p",
+                {{"class", "key"}},
                 "All lines are over " +
                     daysText(static_cast<std::int32_t>(days.period.first), days.newest()) +
                     " and their scale begins at 0; “usual” is the median of the 28 days before "
                     "the newest. ",
-                Element("i", {}), "start of the system ", Element("i", {{"class", "build"}}),
+                Element("i", {}),
+                "start of the system ",
+                Element("i", {{"class", "build"}}),
                 "another build"});
   // Scalars and distributions together, by key; a key may be both.
   std::vector<std::string_view> keys;

@@ -76,13 +76,12 @@ void addBuilds(std::vector<ChangeItem>& items, const PageData& data, const PageD
   const PageData::SystemDay* before = nullptr;
   for (const PageData::SystemDay& system : data.systems) {
     if (before != nullptr && system.day > days.newest() - kWeek && system.day <= days.newest()) {
-      items.push_back({kRankOfBuild + system.day, Level::Look,
-                       before->model == system.model ? "Another build of the system"
-                                                     : "Another model or build",
-                       "", before->model == system.model ? system.build
-                                                         : system.model + ' ' + system.build,
-                       before->build + " until " + dayText(before->lastDay) + "; since " +
-                           dayText(system.day)});
+      items.push_back(
+          {kRankOfBuild + system.day, Level::Look,
+           before->model == system.model ? "Another build of the system" : "Another model or build",
+           "", before->model == system.model ? system.build : system.model + ' ' + system.build,
+           before->build + " until " + dayText(before->lastDay) + "; since " +
+               dayText(system.day)});
     }
     before = &system;
   }
@@ -101,11 +100,10 @@ std::string periodText(const PageData& data, const PageDays& days) {
   const auto first = static_cast<std::int32_t>(days.period.first);
   std::string text = daysText(first, days.newest());
   const auto count = static_cast<std::size_t>(days.newest() - first) + 1;
-  const auto reported = static_cast<std::size_t>(
-      days.reported.end() - std::ranges::lower_bound(days.reported, first));
+  const auto reported = static_cast<std::size_t>(days.reported.end() -
+                                                 std::ranges::lower_bound(days.reported, first));
   text += ": " + countedNoun(count, "day");
-  text += count == reported ? ", each with a report"
-                            : ", " + numeral(reported) + " with a report";
+  text += count == reported ? ", each with a report" : ", " + numeral(reported) + " with a report";
   const std::size_t left = data.days.size() - days.toCome.size() - reported;
   return text + (left > 0 ? "; " + countedNoun(left, "earlier report") + " not shown" : "") + ".";
 }
@@ -113,16 +111,18 @@ std::string periodText(const PageData& data, const PageDays& days) {
 /// What there is to read when it is too early to compare.
 Element firstDays(const PageDays& days) {
   const std::size_t missing = kMinDaysBefore + 1 - days.reported.size();
-  return {"p", {{"class", "first"}},
+  return {"p",
+          {{"class", "first"}},
           "It is too early to say what is unusual: a day is compared with at least " +
               numeral(kMinDaysBefore) + " before it, and " +
-              countedNoun(days.reported.size(), "day") + " is reported so far. With a report every " +
-              "day this page begins to compare on " +
+              countedNoun(days.reported.size(), "day") +
+              " is reported so far. With a report every " + "day this page begins to compare on " +
               dayText(days.newest() + static_cast<std::int32_t>(missing) + 1) + "."};
 }
 
 Element noDays() {
-  return {"p", {{"class", "first"}},
+  return {"p",
+          {{"class", "first"}},
           "Nothing has been reported yet. The first report is made by the first daily run after a "
           "day with counters that the whitelist lets through; vespctl status says when that is, "
           "and vespctl preview what it will hold. What is unusual stands here from the " +
@@ -138,8 +138,9 @@ void addOverview(Document& document, const PageAbout& about, const PageData& dat
     names += (names.empty() ? "" : " · ") + name;
   }
   const std::string made = "Page made " + minuteText(about.now) + " UTC.";
-  document.add(pageHeader(about.title, {Element("bdi", {}, names),
-                                        days.isEmpty() ? made : periodText(data, days) + ' ' + made}));
+  document.add(pageHeader(
+      about.title,
+      {Element("bdi", {}, names), days.isEmpty() ? made : periodText(data, days) + ' ' + made}));
   document.add(Element::constant("\n<main>"));
   document.beginSection("changed", "What changed");
   std::vector<ChangeItem> items;
@@ -159,19 +160,22 @@ void addOverview(Document& document, const PageAbout& about, const PageData& dat
   } else {
     const std::int32_t yesterday = daysSince1970(about.now) - 1;
     if (days.newest() < yesterday) {
-      document.add({"p", {}, "The newest report is of " + dayText(days.newest()) +
-                                 "; there is none of " + daysText(days.newest() + 1, yesterday) +
-                                 " yet."});
+      document.add({"p",
+                    {},
+                    "The newest report is of " + dayText(days.newest()) + "; there is none of " +
+                        daysText(days.newest() + 1, yesterday) + " yet."});
     }
     if (!days.areEnough()) {
       document.add(firstDays(days));
     } else if (isQuiet) {
-      document.add({"p", {{"class", "quiet"}},
+      document.add({"p",
+                    {{"class", "quiet"}},
                     "A quiet day: on " + dayText(days.newest()) + " nothing of " +
                         countedNoun(data.scalars.size() + data.distributions.size(), "key") +
                         " was unusual."});
     } else {
-      document.add({"p", {{"class", "key"}},
+      document.add({"p",
+                    {{"class", "key"}},
                     dayText(days.newest()) + " beside the day before and the 28 reported days " +
                         "before it; the most unusual first."});
     }

@@ -17,12 +17,12 @@ struct PageFinding {
 
 /// What a page says of a device besides what it reported.
 struct PageAbout {
-  std::string title;                   ///< the host's name unless another was given
-  std::vector<std::string> names;      ///< system, build, model and pseudonym
-  Date now;                            ///< the device's time
+  std::string title;               ///< the host's name unless another was given
+  std::vector<std::string> names;  ///< system, build, model and pseudonym
+  Date now;                        ///< the device's time
   std::vector<PageFinding> findings;
-  std::vector<KeptBack> keptBack;      ///< not shown when the page is shared
-  bool isShared = false;               ///< without what is for the device's owner alone
+  std::vector<KeptBack> keptBack;  ///< not shown when the page is shared
+  bool isShared = false;           ///< without what is for the device's owner alone
 };
 
 /// The whole HTML document.

@@ -34,7 +34,7 @@ PageAbout aboutOf(HostPlatform& device, const Wanted& wanted) {
                  "build " + describedOr(system.buildVersion, live::osBuild),
                  "model " + describedOr(system.hardwareModel, live::hardwareModel),
                  "device " + pseudonymOf(system.systemID.value_or(live::machineIdentifier()),
-                                          "vesprun exported device")};
+                                         "vesprun exported device")};
   return about;
 }
 

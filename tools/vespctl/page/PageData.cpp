@@ -75,7 +75,8 @@ void PageData::takeSystems(const DeviceDirectory& directory) {
       }
     }
   }
-  const auto notes = orFail([&](std::string& error) { return readSubmittedNotes(directory, error); });
+  const auto notes =
+      orFail([&](std::string& error) { return readSubmittedNotes(directory, error); });
   for (const auto& [day, log] : days) {
     const auto noted = notes->find(log->name);
     if (noted == notes->end() || !noted->second.build) {

@@ -28,7 +28,8 @@ Element unreadableFiles(const PageData& data) {
 Element reportRow(const SubmittedLog& log) {
   constexpr std::size_t kShownDigest = 8;
   const PropertyDict& document = log.document;
-  return {"tr", {},
+  return {"tr",
+          {},
           rowHead(dayText(log.day)),
           cell(std::to_string(log.revision)),
           cell(minuteText(*document.findDate("TBLogCreationDate"))),
@@ -40,9 +41,10 @@ Element reportRow(const SubmittedLog& log) {
 }
 
 Element reportTable() {
-  return {"table", {{"class", "reports"}},
-          headRow({"Day", "Rev.", "Submitted, UTC", "Scalars", "Distributions", "Whitelist",
-                   "Log"})};
+  return {
+      "table",
+      {{"class", "reports"}},
+      headRow({"Day", "Rev.", "Submitted, UTC", "Scalars", "Distributions", "Whitelist", "Log"})};
 }
 
 /// A row with the course of an event's field over the earlier events of its name.
@@ -64,7 +66,8 @@ Element fieldRow(std::string_view field, const PageData::Series& series, Period 
   }
   const Number& last = series.back().value;
   const std::string newest = isUnknown(last) ? "unknown" : text(last.asDouble());
-  return {"tr", {},
+  return {"tr",
+          {},
           rowHead(foldedName(field)),
           Element("td", {},
                   sparkline(points, period, HUGE_VAL,
@@ -96,8 +99,8 @@ Element eventFields(const std::vector<PageData::Event>& events) {
       }
     }
     if (value.number() == nullptr) {
-      texts.add({"tr", {}, rowHead(foldedName(field)),
-                 Element("td", {}, foldedName(textForm(value)))});
+      texts.add(
+          {"tr", {}, rowHead(foldedName(field)), Element("td", {}, foldedName(textForm(value)))});
       ++textCount;
     } else if (isZero) {
       zeros.add(zeroCount++ > 0 ? ", " : "").add(nameElement(field));
@@ -109,9 +112,9 @@ Element eventFields(const std::vector<PageData::Event>& events) {
   Element all;
   all.add(rowCount > 0 ? std::move(rows) : Element());
   all.add(textCount > 0 ? std::move(texts) : Element());
-  return all.add(zeroCount > 0 ? folded(countedNoun(zeroCount, "field") + " always 0",
-                                        std::move(zeros))
-                               : Element());
+  return all.add(zeroCount > 0
+                     ? folded(countedNoun(zeroCount, "field") + " always 0", std::move(zeros))
+                     : Element());
 }
 
 }  // namespace
@@ -126,8 +129,7 @@ void addReports(Document& document, const PageData& data, const PageDays& days) 
   const std::vector<double> reported(days.reported.begin(), days.reported.end());
   const std::string first = momentText(days.period.first);
   const std::string last = momentText(days.period.last);
-  document.add(
-      dayStrip(reported, days.period, "days with a report from " + first + " to " + last));
+  document.add(dayStrip(reported, days.period, "days with a report from " + first + " to " + last));
   document.add({"p", {{"class", "ends"}}, Element("span", {}, first), Element("span", {}, last)});
   Element newest = reportTable();
   Element older = reportTable();
@@ -145,8 +147,8 @@ void addReports(Document& document, const PageData& data, const PageDays& days) 
   document.add({"p", {}, "Digests of the whitelist:"});
   Element list("ul", {});
   for (const auto& [digest, times] : digests) {
-    list.add({"li", {}, foldedName(digest), " ",
-              Element("small", {}, countedNoun(times, "report"))});
+    list.add(
+        {"li", {}, foldedName(digest), " ", Element("small", {}, countedNoun(times, "report"))});
   }
   document.add(list);
   document.endSection();
@@ -170,7 +172,10 @@ void addStorage(Document& document, const PageData& data) {
     newest = std::max(newest, std::floor(statement.day));
   }
   const auto level = static_cast<std::size_t>(worst);
-  document.add({"p", {{"class", std::string("verdict ") + kClasses[level]}}, kVerdicts[level], " ",
+  document.add({"p",
+                {{"class", std::string("verdict ") + kClasses[level]}},
+                kVerdicts[level],
+                " ",
                 Element("small", {}, "Figures of " + momentText(newest))});
   Element list("ul", {{"class", "health"}});
   for (const HealthStatement& statement : health) {
@@ -191,8 +196,9 @@ void addEvents(Document& document, const PageData& data) {
     const double last = events.newest.back().day;
     const std::vector<Element> title{
         nameElement(name), " ",
-        Element("small", {}, numeral(events.count) + " sent" +
-                                 (last > 0 ? ", the last " + momentText(last) : ""))};
+        Element(
+            "small", {},
+            numeral(events.count) + " sent" + (last > 0 ? ", the last " + momentText(last) : ""))};
     Element content;
     if (isLongName(name)) {
       content.add({"p", {{"class", "full"}}, name});
@@ -223,8 +229,10 @@ void addErrors(Document& document, const PageData& data) {
     return;
   }
   document.beginSection("errors", "Errors in the system log");
-  document.add({"p", {}, "The newest " + numeral(data.errors.newest.size()) + " of " +
-                             numeral(data.errors.count) + "."});
+  document.add({"p",
+                {},
+                "The newest " + numeral(data.errors.newest.size()) + " of " +
+                    numeral(data.errors.count) + "."});
   Element list("ul", {});
   for (auto line = data.errors.newest.rbegin(); line != data.errors.newest.rend(); ++line) {
     list.add({"li", {}, foldedName(*line)});
@@ -233,10 +241,10 @@ void addErrors(Document& document, const PageData& data) {
   document.endSection();
 }
 
-void addKeptBack(Document& document, const std::vector<KeptBack>& keptBack,
-                 const KeyTable& table) {
+void addKeptBack(Document& document, const std::vector<KeptBack>& keptBack, const KeyTable& table) {
   document.beginSection("left-out", "Kept back");
-  document.add({"p", {},
+  document.add({"p",
+                {},
                 keptBack.empty()
                     ? "Every key of the counter database may leave the device."
                     : "These keys are in the counter database and do not leave the device. Their "

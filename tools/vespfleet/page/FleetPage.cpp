@@ -47,11 +47,11 @@ struct FleetKey {
 class FleetPage {
  public:
   FleetPage(FleetStore& store, const std::string& title) : _store(store), _title(title) {
-    store.visitLastDays(Member::Build, [this](std::int32_t day, const MemberText& build,
-                                              std::uint64_t devices) {
-      _last.push_back({day, build.value_or(kNoText), devices});
-      _devices += devices;
-    });
+    store.visitLastDays(Member::Build,
+                        [this](std::int32_t day, const MemberText& build, std::uint64_t devices) {
+                          _last.push_back({day, build.value_or(kNoText), devices});
+                          _devices += devices;
+                        });
     _newest = newestDay();
     store.visitKeys([this](const ReportedKey& key) {
       if (key.devices >= _store.least()) {
@@ -88,8 +88,7 @@ class FleetPage {
   std::string headerText() const {
     std::string text = countedNoun(_devices, "device") + ", answers are over at least " +
                        numeral(static_cast<std::size_t>(_store.least())) + " of them.";
-    return _keys.empty() || _first > _newest ? text
-                                             : daysText(_first, _newest) + " · " + text;
+    return _keys.empty() || _first > _newest ? text : daysText(_first, _newest) + " · " + text;
   }
 
   Question questionOf(const ReportedKey& key) const {
@@ -148,8 +147,7 @@ class FleetPage {
     // The widest quantiles that every day has.
     std::size_t low = 0;
     for (const auto& [day, summary] : days) {
-      while (low < kMedian &&
-             !(summary.quantiles[low] && summary.quantiles[2 * kMedian - low])) {
+      while (low < kMedian && !(summary.quantiles[low] && summary.quantiles[2 * kMedian - low])) {
         ++low;
       }
       key.areMedians = key.areMedians && summary.quantiles[kMedian];
@@ -159,10 +157,9 @@ class FleetPage {
         return place == kMedian ? std::nullopt
                                 : std::optional(static_cast<double>(*summary.quantiles[place]));
       };
-      key.days.push_back({day,
-                          key.areMedians ? static_cast<double>(*summary.quantiles[kMedian])
-                                         : summary.mean,
-                          quantile(low), quantile(2 * kMedian - low)});
+      key.days.push_back(
+          {day, key.areMedians ? static_cast<double>(*summary.quantiles[kMedian]) : summary.mean,
+           quantile(low), quantile(2 * kMedian - low)});
     }
   }
 
@@ -188,13 +185,12 @@ class FleetPage {
     for (const auto& [build, day] : _buildsBegin) {
       _newestBuilds.push_back(build);
     }
-    std::ranges::stable_sort(_newestBuilds, {}, [this](const std::string& build) {
-      return _buildsBegin.at(build);
-    });
+    std::ranges::stable_sort(_newestBuilds, {},
+                             [this](const std::string& build) { return _buildsBegin.at(build); });
     constexpr std::size_t kBeside = 4;
-    _newestBuilds.erase(_newestBuilds.begin(),
-                        _newestBuilds.end() - static_cast<std::ptrdiff_t>(
-                                                  std::min(kBeside, _newestBuilds.size())));
+    _newestBuilds.erase(
+        _newestBuilds.begin(),
+        _newestBuilds.end() - static_cast<std::ptrdiff_t>(std::min(kBeside, _newestBuilds.size())));
   }
 
   static std::vector<DayValue> middles(const FleetKey& key) {
@@ -221,9 +217,10 @@ class FleetPage {
       stopped += last.day > _newest - 2 * kWeek && last.day <= _newest - kWeek ? last.devices : 0;
     }
     if (stopped > 0) {
-      items.push_back({1e9, ChangeItem::Level::Look,
-                       countedNoun(stopped, "device") + " stopped reporting one to two weeks ago",
-                       "", "", "of " + numeral(static_cast<std::size_t>(_devices)) + " that ever reported"});
+      items.push_back(
+          {1e9, ChangeItem::Level::Look,
+           countedNoun(stopped, "device") + " stopped reporting one to two weeks ago", "", "",
+           "of " + numeral(static_cast<std::size_t>(_devices)) + " that ever reported"});
     }
     std::size_t judged = 0;
     for (const FleetKey& key : _keys) {
@@ -248,14 +245,16 @@ class FleetPage {
       items.push_back(std::move(item));
     }
     if (_keys.empty()) {
-      document.add({"p", {{"class", "first"}},
-                    "No key is reported by as many devices as an answer needs."});
+      document.add(
+          {"p", {{"class", "first"}}, "No key is reported by as many devices as an answer needs."});
     } else if (items.empty() && judged == 0) {
-      document.add({"p", {{"class", "first"}},
+      document.add({"p",
+                    {{"class", "first"}},
                     "It is too early to say what is unusual: a day is compared with at least " +
                         numeral(kMinDaysBefore) + " before it."});
     } else if (items.empty()) {
-      document.add({"p", {{"class", "quiet"}},
+      document.add({"p",
+                    {{"class", "quiet"}},
                     "A quiet day: on " + dayText(_newest) + " nothing of " +
                         countedNoun(_keys.size(), "key") + " was unusual over the devices."});
     }
@@ -277,9 +276,13 @@ class FleetPage {
     const std::vector<ComparedKey> keys = compareKeys(_store, groups, _store.least());
     const auto sure = static_cast<std::size_t>(
         std::ranges::count_if(keys, [](const ComparedKey& key) { return key.q <= 0.05; }));
-    document.add({"p", {}, nameElement(groups.values[0]), " and ", nameElement(groups.values[1]),
-                  ": " + countedNoun(keys.size(), "key") + " compared, of which " +
-                      numeral(sure) + " differ by more than chance (q at most 0.05)."});
+    document.add({"p",
+                  {},
+                  nameElement(groups.values[0]),
+                  " and ",
+                  nameElement(groups.values[1]),
+                  ": " + countedNoun(keys.size(), "key") + " compared, of which " + numeral(sure) +
+                      " differ by more than chance (q at most 0.05)."});
     Element table("table", {{"class", "compared"}},
                   headRow({"Key", "Before", "Now", "Difference", "q"}));
     for (std::size_t i = 0; i < std::min(keys.size(), kMostRows); ++i) {
@@ -290,8 +293,12 @@ class FleetPage {
           key.meanA != 0
               ? quantity(std::round(1000 * difference / std::abs(key.meanA)) / 10, Unit::Percent)
               : quantity(difference, unit);
-      table.add({"tr", {}, rowHead(foldedName(key.key)), cell(quantity(key.meanA, unit)),
-                 cell(quantity(key.meanB, unit)), cell((difference > 0 ? "+" : "") + change),
+      table.add({"tr",
+                 {},
+                 rowHead(foldedName(key.key)),
+                 cell(quantity(key.meanA, unit)),
+                 cell(quantity(key.meanB, unit)),
+                 cell((difference > 0 ? "+" : "") + change),
                  cell(quantity(key.q, Unit::None))});
     }
     document.add({"div", {{"class", "scroll"}}, std::move(table)});
@@ -308,7 +315,9 @@ class FleetPage {
       const std::string build = group.member.value_or(kNoText);
       if (group.devices >= _store.least() &&
           std::ranges::find(_newestBuilds, build) != _newestBuilds.end()) {
-        table.add({"tr", {}, rowHead(nameElement(build)),
+        table.add({"tr",
+                   {},
+                   rowHead(nameElement(build)),
                    cell(numeral(static_cast<std::size_t>(group.devices))),
                    cell(middle ? quantity(*middle, unit) : "too few devices")});
       }
@@ -370,9 +379,11 @@ class FleetPage {
 
   void addKeys(Document& document) {
     document.beginSection("keys", "Keys");
-    document.add({"p", {{"class", "key"}},
+    document.add({"p",
+                  {{"class", "key"}},
                   "The middle of the devices on each day, all over the same days and from 0. ",
-                  Element("i", {{"class", "build"}}), "a build begins"});
+                  Element("i", {{"class", "build"}}),
+                  "a build begins"});
     std::vector<std::string_view> names;
     std::size_t bytes = 0;
     for (const FleetKey& key : _keys) {
@@ -394,7 +405,9 @@ class FleetPage {
     constexpr std::size_t kMostRows = 60;
     std::size_t rows = 0;
     for (auto last = _last.rbegin(); last != _last.rend() && rows < kMostRows; ++last, ++rows) {
-      table.add({"tr", {}, rowHead(dayText(last->day)),
+      table.add({"tr",
+                 {},
+                 rowHead(dayText(last->day)),
                  Element("td", {}, nameElement(last->build)),
                  cell(numeral(static_cast<std::size_t>(last->devices)))});
     }
