@@ -91,13 +91,18 @@ Element KeyTable::textRow(const KeyCourse& course, std::size_t prefix) const {
 
 void KeyTable::add(Document& document, const std::vector<std::string_view>& keys,
                    const std::function<KeyCourse(std::size_t place)>& courseOf) const {
+  const Element head(
+      "thead", {},
+      Element("tr", {}, headCell("Key"),
+              headCell(momentText(_period.first) + " … " + momentText(_period.last)),
+              headCell("Newest"), headCell("Usual"), headCell("Lowest"), headCell("Highest")));
   for (const KeyGroup& group : groupKeys(keys)) {
-    Element content =
-        isDetailed()
-            ? Element("table", {{"class", "keys"}},
-                      headRow({"Key", "Over the days", "Newest", "Usual", "Lowest", "Highest"}))
-            : Element("pre", {{"class", "rows"}},
-                      Element::constant("key\tnewest\tlowest\thighest\n"));
+    Element content("pre", {{"class", "rows"}});
+    if (isDetailed()) {
+      content = Element("table", {{"class", "keys"}}, head);
+    } else {
+      content.add(Element::constant("key\tnewest\tlowest\thighest\n"));
+    }
     const std::size_t prefix = group.title.size();
     for (const std::size_t place : group.keys) {
       content.add(isDetailed() ? row(courseOf(place)) : textRow(courseOf(place), prefix));
