@@ -10,6 +10,7 @@
 #include "device/DeviceCommands.h"
 #include "device/MessageCommands.h"
 #include "device/PreferenceCommands.h"
+#include "listen/ListenCommand.h"
 #include "outbox/ExportCommand.h"
 #include "outbox/PtreeCommand.h"
 #include "outbox/ShowCommand.h"
@@ -43,6 +44,7 @@ constexpr Command kCommands[] = {
     {"explain", "Says why a key leaves the device or stays", addExplainCommand},
     {"whitelist", "Judges a whitelist before it is used", addWhitelistCommands},
     {"counters", "Shows and changes counters", addCounterCommands},
+    {"listen", "Takes counters from other programs, as StatsD lines", addListenCommand},
     {"prefs", "Shows and changes preferences", addPreferenceCommands},
     {"send", "Sends messages to a running vesprun", addMessageCommands},
     {"export", "Prints each submitted daily log as one line for vespfleet", addExportCommand,

@@ -332,6 +332,13 @@ void readDiskUsage(const Entry& entry, DescribedAnswer<PropertyDict>& answer) {
   });
 }
 
+void readSenders(const Entry& entry, decltype(DeviceDescription::senders)& senders) {
+  senders.clear();
+  entry.forEachNamed([&senders](const std::string& user, const Entry& prefixes) {
+    read(prefixes, senders[user]);
+  });
+}
+
 void read(const Entry& entry, DeviceDescription& device) {
   entry.fields(
       {{"clock", device.clock},
@@ -384,6 +391,7 @@ void read(const Entry& entry, DeviceDescription& device) {
             read(channels, device.channels);
           }
         }},
+       {"senders", [&](const Entry& senders) { readSenders(senders, device.senders); }},
        {"usage", device.usage}});
 }
 

@@ -144,7 +144,9 @@ struct DeviceDescription {
   } kernel;
   std::vector<RegistryEntryDescription> registry;
   std::vector<ChannelDescription> channels;
-  bool liveChannels = false;                ///< the running system's instead
+  bool liveChannels = false;  ///< the running system's instead
+  /// Who may count which keys through a socket: a user, or "*", and the beginnings of keys.
+  std::map<std::string, std::vector<std::string>, std::less<>> senders = {{"*", {"app."}}};
   DescribedAnswer<UsageDescription> usage;  ///< absent: an empty reply at once
 };
 
