@@ -10,12 +10,13 @@
 namespace vesprun {
 
 /// The device that the program works on: a device directory and the running Linux system. A process
-/// has one at a time.
+/// has one at a time. Or the socket of `vespctl listen`, which takes counters from any user, as
+/// `vesprun.h` says; entry points find no device there.
 class Device {
  public:
-  /// Null, with the place in `error`, when the folder or its `device.json` cannot be used or
-  /// another device is open. After a fork the new process must open its own: all operations of one
-  /// that was opened before fail.
+  /// `path` is a device directory, or a socket. Null, with the place in `error`, when the folder or
+  /// its `device.json` cannot be used, another device is open, or nobody listens. After a fork the
+  /// new process must open its own: all operations of one that was opened before fail.
   VESPRUN_EXPORT static std::unique_ptr<Device> open(const std::string& path,
                                                      std::string& error) noexcept;
 

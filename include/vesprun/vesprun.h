@@ -42,7 +42,8 @@ typedef enum vesprun_error {
   VESPRUN_ERROR_FULL = 6,         /**< the disk is full */
   VESPRUN_ERROR_TOO_OLD = 7,      /**< a newer version has made the device's counters */
   VESPRUN_ERROR_FORKED = 8,       /**< the device was opened before the process was forked */
-  VESPRUN_ERROR_MEMORY = 9        /**< memory ran out */
+  VESPRUN_ERROR_MEMORY = 9,       /**< memory ran out */
+  VESPRUN_ERROR_SOCKET = 10       /**< not over a socket: entry points need a device directory */
 } vesprun_error;
 
 /** An open device directory. */
@@ -63,6 +64,10 @@ VESPRUN_EXPORT vesprun_error vesprun_last_error_code(void);
 /**
  * Opens a device directory. Null when the folder or its `device.json` cannot be used, or when
  * another device is open: a process has one at a time.
+ *
+ * With the path of the socket of `vespctl listen` in place of a folder, such as
+ * "/run/vesprun/counters", counters go there, as any user; null when nobody listens. Any number of
+ * sockets may be open.
  */
 VESPRUN_EXPORT vesprun_device* vesprun_open(const char* directory);
 
@@ -76,6 +81,11 @@ VESPRUN_EXPORT void vesprun_close(vesprun_device* device);
  * Counters of today, by the device's clock; days begin at 00:00 UTC. A key is text that an XML 1.0
  * document can carry, 1 MiB at most. Changes stay in memory until the next checkpoint. Each
  * function returns 0, or -1 on failure, with nothing changed.
+ *
+ * Over a socket, changes are collected until they fill a datagram, which then is sent, and counted
+ * when it arrives. Keys have about 8,000 bytes at most, without ":" and "|", values are finite, and
+ * what the listener drops, since the user may not count the key, say, does not fail here. A full
+ * socket is waited for, 5 seconds at most.
  */
 
 /** Sets a scalar. */
@@ -91,7 +101,8 @@ VESPRUN_EXPORT int vesprun_add_to_distribution(vesprun_device* device, const cha
 /**
  * Writes all changes in one transaction, which survives a loss of power once 0 is returned. On
  * failure nothing was written, and the changes wait for the next checkpoint. Waits for the locks of
- * other processes, 20 seconds at most.
+ * other processes, 20 seconds at most. Over a socket it sends what is collected, which the listener
+ * writes within 10 seconds.
  */
 VESPRUN_EXPORT int vesprun_checkpoint(vesprun_device* device);
 

@@ -5,27 +5,16 @@
 #include <string>
 #include <string_view>
 
+#include "interface/CallFailure.h"
+#include "interface/CounterSocket.h"
 #include "platform/host/HostPlatform.h"
-#include "vesprun/vesprun.h"
 
 namespace vesprun {
 
-/// Why an operation failed: for programs, and for people.
-struct CallFailure {
-  vesprun_error code = VESPRUN_ERROR_OTHER;
-  std::string text;
-
-  /// False, after taking both.
-  bool set(vesprun_error why, std::string what) {
-    code = why;
-    text = std::move(what);
-    return false;
-  }
-};
-
-/// The device that this process has open, below the C and the C++ interface. Operations throw when
-/// memory runs out; false, with the reason in `failure`, on any other failure. A process that was
-/// forked after the device was opened is refused: both would write what was collected before.
+/// The device that this process has open, or the socket of `vespctl listen`, below the C and the
+/// C++ interface. Operations throw when memory runs out; false, with the reason in `failure`, on
+/// any other failure. A process that was forked after the device was opened is refused: both would
+/// write what was collected before.
 class OpenDevice {
  public:
   /// Null with the reason in `failure`.
@@ -41,13 +30,17 @@ class OpenDevice {
   bool addToDistribution(std::string_view key, double value, CallFailure& failure);
   bool checkpoint(CallFailure& failure);
 
-  /// False in a process that was forked after the device was opened.
-  bool isOfThisProcess(CallFailure& failure) const;
+  /// False over a socket, and in a process that was forked after the device was opened.
+  bool hasEntryPoints(CallFailure& failure) const;
 
  private:
   explicit OpenDevice(std::unique_ptr<HostPlatform> platform);
+  explicit OpenDevice(std::unique_ptr<CounterSocket> socket);
+
+  bool isOfThisProcess(CallFailure& failure) const;
 
   std::int32_t _process;
+  std::unique_ptr<CounterSocket> _socket;  ///< then without what follows
   std::unique_ptr<HostPlatform> _platform;
   std::unique_ptr<InstalledPlatform> _installed;
 };

@@ -147,7 +147,7 @@ int vesprun_checkpoint(vesprun_device* device) {
 char* vesprun_call(vesprun_device* device, const char* entry_point, const char* arguments) {
   return callFromC<char*>(nullptr, [&](CallFailure& failure) -> char* {
     if (!isGiven(device, "device", failure) || !isGiven(entry_point, "entry point", failure) ||
-        !device->device->isOfThisProcess(failure)) {
+        !device->device->hasEntryPoints(failure)) {
       return nullptr;
     }
     const std::scoped_lock guard(gCallMutex);

@@ -1,8 +1,11 @@
 #include <gmock/gmock.h>
 #include <pthread.h>
+#include <sys/socket.h>
+#include <sys/un.h>
 #include <unistd.h>
 
 #include <atomic>
+#include <cmath>
 #include <thread>
 
 #include "NANDInfo/parsers/APIErrorMessage.h"
@@ -227,6 +230,64 @@ TEST_F(VesprunLibraryTest, CountsOnceWhenTheProcessForksAndLeavesItsTimeZone) {
   close();
   EXPECT_EQ(dump(), "scalar\t19787\tk\t11\n");
   unsetenv("TZ");
+}
+
+TEST_F(VesprunLibraryTest, SendsCountersToASocket) {
+  const std::string path = folder.path("socket");
+  const auto listen = [&path] {
+    const int listener = socket(AF_UNIX, SOCK_DGRAM | SOCK_NONBLOCK, 0);
+    sockaddr_un address{AF_UNIX, {}};
+    path.copy(address.sun_path, sizeof address.sun_path - 1);
+    unlink(path.c_str());
+    EXPECT_EQ(bind(listener, reinterpret_cast<const sockaddr*>(&address), sizeof address), 0);
+    return listener;
+  };
+  const auto received = [](int listener) {
+    std::string text(70'000, '\0');
+    const ssize_t size = recv(listener, text.data(), text.size(), 0);
+    text.resize(size > 0 ? static_cast<std::size_t>(size) : 0);
+    return text;
+  };
+  const int first = listen();
+  device = vesprun_open(path.c_str());
+  ASSERT_NE(device, nullptr) << vesprun_last_error();
+  EXPECT_EQ(vesprun_add_to_scalar(device, "a", 2), 0);
+  EXPECT_EQ(vesprun_set_scalar(device, "b", INT64_MIN), 0);
+  EXPECT_EQ(vesprun_add_to_distribution(device, "c", 0.1), 0);
+  for (const std::string& key :
+       {std::string(), std::string("a:b"), std::string("a|b"), std::string("a\nb"),
+        std::string("\x01"), std::string(8'192, 'x')}) {
+    EXPECT_EQ(vesprun_add_to_scalar(device, key.c_str(), 1), -1) << key;
+    EXPECT_EQ(vesprun_last_error_code(), VESPRUN_ERROR_KEY) << key;
+  }
+  EXPECT_EQ(vesprun_add_to_distribution(device, "c", std::nan("")), -1);
+  EXPECT_EQ(vesprun_last_error_code(), VESPRUN_ERROR_ARGUMENT);
+  EXPECT_EQ(vesprun_call(device, "lab", nullptr), nullptr);
+  EXPECT_EQ(vesprun_last_error_code(), VESPRUN_ERROR_SOCKET);
+  EXPECT_TRUE(hasSucceeded(startProcess([this] {
+    EXPECT_EQ(vesprun_checkpoint(device), -1);
+    close();  // sends nothing
+  })));
+  EXPECT_EQ(received(first), "");
+  EXPECT_EQ(vesprun_checkpoint(device), 0);
+  EXPECT_EQ(received(first), "a:2|c\nb:-9223372036854775808|g\nc:0.1|d\n");
+
+  // What fills a datagram goes by itself, in whole lines.
+  const std::string key(4'000, 'k');
+  for (int i = 0; i < 3; ++i) {
+    EXPECT_EQ(vesprun_add_to_scalar(device, key.c_str(), i), 0);
+  }
+  EXPECT_EQ(received(first), key + ":0|c\n" + key + ":1|c\n");
+
+  // Nobody listens any more: what is collected waits for another listener.
+  ::close(first);
+  EXPECT_EQ(vesprun_checkpoint(device), -1);
+  EXPECT_EQ(vesprun_last_error_code(), VESPRUN_ERROR_NOT_A_DEVICE);
+  EXPECT_EQ(vesprun_open(path.c_str()), nullptr);
+  const int second = listen();
+  close();
+  EXPECT_EQ(received(second), key + ":2|c\n");
+  ::close(second);
 }
 
 TEST_F(VesprunLibraryTest, FailsWithoutMemoryAndChangesNothing) {
