@@ -65,6 +65,9 @@ class TBConfig {
   template <typename Options>
   std::vector<PassedOverGroup> groupsPassedOver(std::string_view key) const;
 
+  /// The keys and prefixes of the groups that count on this device.
+  const WhitelistTables& tables() const { return _tables; }
+
   /// MD5 of the file: 32 lowercase hexadecimal digits.
   const std::string& configFileDigest() const { return _configFileDigest; }
 

@@ -137,7 +137,7 @@ TEST_F(DaysTest, CatchUpSaysWhichDaysCouldNotBeSubmitted) {
   EXPECT_EQ(run("catch-up --json"), 1);
   EXPECT_EQ(output, "[]\n");
   EXPECT_EQ(error,
-            "vespctl catch-up: not submitted: 19783, 19784, 19785; the system log says why\n");
+            "vespctl catch-up: not submitted: 19783, 19784, 19785; \"vespctl show log --last 20\" says why\n");
   setTime("2024-03-05T09:15:02Z", R"({"enabled": false})");
   EXPECT_EQ(print("catch-up --json"), "[]\n");
   setTime("2024-03-05T09:15:02Z");
@@ -318,6 +318,89 @@ TEST_F(DaysTest, PruneKeepsADailyLogThatItCannotNote) {
   std::filesystem::remove(folder.path("device/outbox/pruned.jsonl"));
   EXPECT_THAT(print("prune --json --outbox-size 0"),
               HasSubstr("\"0003-193-log-aggregated.ptree\"]"));
+}
+
+TEST_F(DaysTest, StatusTellsEachFindingOnceAndChangesNothing) {
+  const auto findings = [this] {
+    const int status = run("status --json");
+    EXPECT_EQ(status == 0 || status == 1 ? error : "failed", "");
+    std::string names;
+    const std::regex name("\"finding\":\"([^\"]*)\",\"detail\":\"[^\"]");
+    for (std::sregex_iterator found(output.begin(), output.end(), name), end; found != end;
+         ++found) {
+      names += (*found)[1].str() + ';';
+    }
+    EXPECT_EQ(status, names.empty() ? 0 : 1);
+    return names;
+  };
+  EXPECT_EQ(findings(), "");
+  EXPECT_THAT(output, AllOf(HasSubstr(R"("today":19787,"lastReport":null,"nextReport":19786,)"
+                                      R"("keysToday":0,"outboxBytes":)"),
+                            HasSubstr("\"findings\":[]")));
+  EXPECT_THAT(print("status"), HasSubstr("a report of today comes tomorrow"));
+  count(19780, 19787);
+  EXPECT_EQ(findings(), "missed days;");
+  EXPECT_EQ(print("catch-up --dry-run --json"), "[19780,19781,19782,19783,19784,19785]\n");
+  EXPECT_THAT(folder.names(logs), ElementsAre());
+  EXPECT_EQ(print("catch-up --json"), output);
+  EXPECT_EQ(findings(), "");
+  EXPECT_THAT(output,
+              HasSubstr(R"("lastReport":{"day":19785,"log":"0006-193-log-aggregated.ptree"},)"
+                        R"("nextReport":19786,"keysToday":1,)"));
+  // Errors count from the start of the last run that did the tasks of a day.
+  const auto logged = [](const std::string& level, const std::string& message) {
+    return R"({"time":"2024-03-05T09:15:02Z","level":")" + level + R"(","message":")" + message +
+           "\"}\n";
+  };
+  const std::string fault = logged("error", "e");
+  folder.write("device/outbox/log.jsonl", fault + logged("default", "vesprun started") +
+                                              logged("default", "daily tasks for day 3") +
+                                              logged("default", "vesprun started") + "torn\n");
+  EXPECT_EQ(findings(), "");
+  shell("printf '%s' '" + fault + "' >> device/outbox/log.jsonl");
+  EXPECT_EQ(findings(), "errors;");
+  // All at once.
+  print(
+      "prefs set com.quill.aggregated.vesprun LastCrashLogSerializationDateInDaysSince1970 19787");
+  writePtree(kWhitelist, R"({"G": {"ScalarKeys": {"linux.cpu.userSeconds": {}}, "Bad": {},
+      "ScalarKeyPrefixes": {"s": {"expires": {"date": "2024-03-04T23:00:00Z"}}}}})");
+  shell(
+      "rm device/outbox/logs/0001*; touch device/var/mobile/Library/Tallybook/"
+      "TBDataStore.sqlitedb.corrupt-20240305T091502Z; chmod a-w device/run");
+  const std::string before = snapshot();
+  EXPECT_EQ(
+      findings(),
+      "not writable;damaged database;faulty whitelist;expired keys;stored day ahead;missed days;"
+      "no collection;errors;");
+  EXPECT_EQ(snapshot(), before);
+  print("collect");
+  print("collect");
+  writePtree(kWhitelist, R"({"G": {"ScalarKeyPrefixes": {"s": {"expires": {"date":
+      "2024-03-05T00:00:00Z"}}}, "ScalarKeys": {"linux.cpu.userSeconds": {}}}})");
+  EXPECT_EQ(findings(), "not writable;damaged database;stored day ahead;missed days;errors;");
+  setTime("2024-03-06T09:15:03Z");
+  EXPECT_THAT(findings(), HasSubstr("no collection;"));
+  // Without counters and a whitelist that can be read, what rests on them is not told.
+  folder.write(kWhitelist, "torn");
+  folder.write("device/var/mobile/Library/Tallybook/TBDataStore.sqlitedb", std::string(5000, 'x'));
+  EXPECT_EQ(findings(), "not writable;damaged database;no whitelist;errors;");
+  EXPECT_THAT(output, AllOf(HasSubstr("\"keysToday\":0,"), HasSubstr("\"whitelist\":null")));
+}
+
+TEST_F(DaysTest, ImportReplacesTheDaysItNames) {
+  import("scalar\t1\ta\t1\nsample\t1\td\t1\t0\nscalar\t2\tb\t2\nsample\t3\td\t3\t0\n");
+  const std::string dump = print("counters dump");
+  print("counters add b 1 --day 1; '" VESPCTL_PROGRAM "' counters sample d 5 --day 3");
+  folder.write("lines", dump);
+  print("counters import --replace lines");
+  EXPECT_EQ(print("counters dump"), dump);
+  EXPECT_EQ(run("counters import --replace - <<'END'\nscalar\t1\tc\t1\nscalar\t2\tc\n\nEND"), 1);
+  EXPECT_THAT(error, StartsWith("vespctl counters import: standard input: line 2: "));
+  EXPECT_EQ(print("counters import --replace /dev/null; '" VESPCTL_PROGRAM "' counters dump"),
+            dump);
+  // A pipe, which can be read once.
+  print("counters import --replace - <<'END'\nscalar\t1\tc\t1\nEND");
+  EXPECT_EQ(print("counters dump"), "scalar\t1\tc\t1\n" + dump.substr(dump.find("scalar\t2")));
 }
 
 }  // namespace

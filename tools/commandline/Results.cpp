@@ -194,4 +194,19 @@ std::string groupedDigits(std::uint64_t number) {
   return digits;
 }
 
+std::string sizeText(std::uint64_t bytes) {
+  constexpr std::uint64_t kStep = 1024;
+  if (bytes < 10 * kStep) {
+    return groupedDigits(bytes) + " bytes";
+  }
+  constexpr const char* kUnits[] = {" KiB", " MiB", " GiB", " TiB"};
+  std::size_t unit = 0;
+  std::uint64_t tenths = bytes / (kStep / 2) * 5;
+  for (; tenths >= 10 * kStep && unit + 1 < std::size(kUnits); ++unit) {
+    tenths /= kStep;
+  }
+  return groupedDigits(tenths / 10) + (tenths < 1000 ? '.' + std::to_string(tenths % 10) : "") +
+         kUnits[unit];
+}
+
 }  // namespace vesprun

@@ -56,4 +56,7 @@ class Table {
 /// "1,234,567"
 std::string groupedDigits(std::uint64_t number);
 
+/// "1,234 bytes", "12 KiB", "3.4 MiB"
+std::string sizeText(std::uint64_t bytes);
+
 }  // namespace vesprun

@@ -17,6 +17,7 @@
 #include "page/PageCommand.h"
 #include "platform/host/files/StandardStreams.h"
 #include "preview/PreviewCommands.h"
+#include "status/StatusCommand.h"
 #include "storage/DecodeCommand.h"
 #include "storage/FieldsCommand.h"
 #include "storage/NandCommands.h"
@@ -32,6 +33,7 @@ namespace {
 constexpr Command kCommands[] = {
     {"init", "Makes a device directory", addInitCommand},
     {"run", "Does what vesprun does, on that device", addRunCommand},
+    {"status", "Says whether all is well; exit status 1 when something is not", addStatusCommand},
     {"collect", "Counts what the running system's figures have grown since the last time",
      addCollectCommand},
     {"show", "Shows what the runs left in the outbox", addShowCommand},

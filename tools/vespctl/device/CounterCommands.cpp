@@ -1,16 +1,22 @@
 #include "device/CounterCommands.h"
 
+#include <sys/stat.h>
+#include <unistd.h>
+
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
+#include <filesystem>
 #include <fstream>
 #include <iostream>
 #include <limits>
+#include <set>
 #include <vector>
 
 #include "Command.h"
 #include "Complaints.h"
 #include "commandline/Arguments.h"
+#include "commandline/Progress.h"
 #include "common/Calendar.h"
 #include "device/CounterRows.h"
 #include "platform/host/counters/CounterLines.h"
@@ -28,6 +34,7 @@ struct CounterArguments {
   std::optional<GivenDay> from;
   std::optional<GivenDay> to;
   std::string file;
+  bool replaces = false;
 };
 
 /// A bad number is an error of usage.
@@ -125,40 +132,102 @@ void addSamples(const CounterArguments& arguments) {
   });
 }
 
-void importLines(const CounterArguments& arguments) {
-  std::ifstream file;
-  const bool isFile = arguments.file != "-";
-  if (isFile) {
-    file.open(arguments.file, std::ios::binary);
-    if (!file) {
-      throw CommandFailure(arguments.file + ": " + std::strerror(errno));
+/// The lines of a file or pipe, so that they can be read again and again.
+class RepeatableLines {
+ public:
+  /// With the rights of the caller.
+  explicit RepeatableLines(const std::string& file) : _isFile(file != "-") {
+    struct stat status {};
+    if (_isFile && stat(file.c_str(), &status) == 0 && S_ISREG(status.st_mode)) {
+      _lines.open(file, std::ios::binary | std::ios::in);
+    } else {
+      openCopy();
+      if (_isFile) {
+        _pipe.open(file, std::ios::binary);
+      } else {
+        std::ios::sync_with_stdio(false);
+      }
+      _first = _isFile ? &_pipe : &std::cin;
     }
-  } else {
-    std::ios::sync_with_stdio(false);
+    if (_isFile && !(_first != nullptr ? _pipe.is_open() : _lines.is_open())) {
+      throw CommandFailure(systemError(file));
+    }
   }
+
+  /// Reads a pipe for the first and only time: `keep` each line then.
+  std::istream& first() { return _first != nullptr ? *_first : _lines; }
+
+  void keep(std::string_view line) {
+    if (_first != nullptr && !(_lines << line << '\n')) {
+      throw CommandFailure(systemError("a temporary copy of the lines"));
+    }
+  }
+
+  std::istream& again() {
+    _lines.clear();
+    _lines.seekg(0);
+    return _lines;
+  }
+
+ private:
+  /// A file without a name, which goes with the process.
+  void openCopy() {
+    std::string name = std::filesystem::temp_directory_path() / "vespctl-XXXXXX";
+    const FileDescriptor file(mkstemp(name.data()));
+    if (file.isOpen()) {
+      _lines.open(name, std::ios::binary | std::ios::in | std::ios::out);
+      unlink(name.c_str());
+    }
+    if (!_lines.is_open()) {
+      throw CommandFailure(systemError(name));
+    }
+  }
+
+  bool _isFile;
+  std::ifstream _pipe;
+  std::fstream _lines;
+  std::istream* _first = nullptr;  ///< what can be read once
+};
+
+/// Other writers wait only for the second reading, which finds no bad line any more.
+void importLines(const CounterArguments& arguments) {
+  RepeatableLines lines(arguments.file);
   DeviceCounters counters;
-  std::istream& lines = isFile ? file : std::cin;
-  bool isRepeated = false;
+  std::uint64_t count = 0;
+  const auto checked = [&] {
+    Progress progress("Checking", "lines");
+    const auto keep = [&](std::string_view line) {
+      lines.keep(line);
+      ++count;
+      progress.advance();
+    };
+    std::string cause;
+    auto days = checkCounterLines(lines.first(), cause, keep);
+    if (!days) {
+      throw CommandFailure(inputName(arguments.file) + ": " + cause);
+    }
+    return *std::move(days);
+  };
+  const std::set<std::int32_t> days = checked();
+  Progress progress("Importing", "lines", count);
   std::string error;
   const auto work = [&](CounterStore& store) {
-    if (std::exchange(isRepeated, true)) {
-      lines.clear();
-      if (!lines.seekg(0)) {
-        // A pipe cannot be read again. Reading also finds out whether the database is damaged.
-        const auto ignore = [](std::string_view) { return true; };
-        exportCounterLines(store, Days::min(), Days::max(), ignore, error);
-        error = "import again";
-        return false;
+    for (const std::int32_t day : days) {
+      if (arguments.replaces) {
+        store.removeDay(day);
       }
     }
     std::string cause;
-    const bool good = importCounterLines(lines, store, cause);
-    if (!good) {
+    const bool good = importCounterLines(lines.again(), store, cause,
+                                         [&progress](std::string_view) { progress.advance(); });
+    if (!good) {  // someone changed the file
       error = inputName(arguments.file) + ": " + cause;
     }
     return good;
   };
-  counters.write(work, error);
+  if (!days.empty()) {
+    counters.write(work, error);
+  }
 }
 
 void dumpLines(const CounterArguments& arguments) {
@@ -214,6 +283,8 @@ void addSample(CLI::App& command) {
 void addImport(CLI::App& command) {
   const auto arguments = std::make_shared<CounterArguments>();
   command.add_option("FILE", arguments->file, "\"-\": standard input")->required();
+  command.add_flag("--replace", arguments->replaces,
+                   "The days that FILE names hold exactly what FILE has of them");
   command.callback([arguments] { importLines(*arguments); });
 }
 

@@ -10,8 +10,6 @@
 #include "common/Calendar.h"
 #include "common/TextForm.h"
 #include "outbox/SubmittedLogs.h"
-#include "platform/host/device/LiveSystem.h"
-#include "platform/host/device/Pseudonym.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/XmlText.h"
 #include "platform/host/outbox/LogNotes.h"
@@ -34,11 +32,7 @@ void run(const Export& wanted) {
       wanted.from ? wanted.from->on(today) : std::numeric_limits<std::int32_t>::min();
   const std::int32_t to =
       wanted.to ? wanted.to->on(today) : std::numeric_limits<std::int32_t>::max();
-  const std::string device =
-      !wanted.device.empty()
-          ? wanted.device
-          : pseudonymOf(platform->description().system.systemID.value_or(live::machineIdentifier()),
-                        "vesprun exported device");
+  const std::string device = !wanted.device.empty() ? wanted.device : exportedName(*platform);
   const auto notes =
       orFail([&](std::string& error) { return readSubmittedNotes(platform->directory(), error); });
   std::vector<UnreadableLog> refused;

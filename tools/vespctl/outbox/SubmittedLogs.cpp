@@ -3,6 +3,8 @@
 #include <cstdio>
 
 #include "Command.h"
+#include "platform/host/device/LiveSystem.h"
+#include "platform/host/device/Pseudonym.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/Files.h"
 #include "platform/host/outbox/OutboxFiles.h"
@@ -17,6 +19,11 @@ std::vector<std::string> namesOfLogs(const DeviceDirectory& directory) {
 std::vector<UnreadableLog> forEachSubmittedLog(
     const DeviceDirectory& directory, const std::function<void(SubmittedLog&& log)>& take) {
   return *orFail([&](std::string& error) { return forEachDailyLog(directory, take, error); });
+}
+
+std::string exportedName(const HostPlatform& device) {
+  return pseudonymOf(device.description().system.systemID.value_or(live::machineIdentifier()),
+                     "vesprun exported device");
 }
 
 void nameUnreadable(std::span<const UnreadableLog> logs) {

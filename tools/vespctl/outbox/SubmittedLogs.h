@@ -5,6 +5,7 @@
 #include <string>
 #include <vector>
 
+#include "platform/host/HostPlatform.h"
 #include "platform/host/outbox/DailyLogs.h"
 
 namespace vesprun {
@@ -17,6 +18,10 @@ std::vector<std::string> namesOfLogs(const DeviceDirectory& directory);
 /// As `forEachDailyLog`; throws `CommandFailure` when the outbox cannot be read.
 std::vector<UnreadableLog> forEachSubmittedLog(const DeviceDirectory& directory,
                                                const std::function<void(SubmittedLog&& log)>& take);
+
+/// The name under which a device's logs are exported unless the command line gives one: a
+/// pseudonym that stays the same.
+std::string exportedName(const HostPlatform& device);
 
 /// Names unreadable logs on standard error.
 void nameUnreadable(std::span<const UnreadableLog> logs);

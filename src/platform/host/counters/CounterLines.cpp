@@ -91,39 +91,62 @@ bool parseField(std::string_view field, const char* what, T& value, std::string&
   return false;
 }
 
-bool importLine(std::string_view line, CounterStore& counters, SampleBuffer& samples,
-                std::string& error) {
+/// A line as it is read; the key refers to it.
+struct CounterLine {
+  bool isSample = false;
+  std::int32_t day = 0;
+  std::string_view key;
+  std::int64_t value = 0;  ///< of a scalar
+  Sample sample{};
+};
+
+bool parseLine(std::string_view text, CounterLine& line, std::string& error) {
   std::string_view kind;
   std::string_view dayText;
   std::string_view valueText;
   std::string_view offsetText;
-  std::string_view key = line;
-  const bool hasKind = takeFirst(key, kind) && (kind == "scalar" || kind == "sample");
-  const bool isSample = kind == "sample";
-  if (!hasKind || !takeFirst(key, dayText) || (isSample && !takeLast(key, offsetText)) ||
-      !takeLast(key, valueText)) {
-    error = quotedText(line) +
+  line.key = text;
+  const bool hasKind = takeFirst(line.key, kind) && (kind == "scalar" || kind == "sample");
+  line.isSample = kind == "sample";
+  if (!hasKind || !takeFirst(line.key, dayText) ||
+      (line.isSample && !takeLast(line.key, offsetText)) || !takeLast(line.key, valueText)) {
+    error = quotedText(text) +
             " is neither scalar, DAY, KEY, VALUE nor sample, DAY, KEY, VALUE, "
             "OFFSET with tabs between";
     return false;
   }
-  std::int32_t day = 0;
-  if (!parseField(dayText, "a day number", day, error)) {
+  return parseField(dayText, "a day number", line.day, error) &&
+         (line.isSample
+              ? parseField(valueText, "a double", line.sample.value, error) &&
+                    parseField(offsetText, "an offset in seconds", line.sample.secondsInDay, error)
+              : parseField(valueText, "a signed 64-bit integer", line.value, error));
+}
+
+/// Gives each line to `take`, which may refuse it with a text in `error`.
+template <typename Take>
+bool forEachLine(std::istream& lines, std::string& error, const LineStep& step, const Take& take) {
+  using Result = LineReader::Result;
+  LineReader reader(lines, kLongestLine);
+  const auto fail = [&](const std::string& cause) {
+    error = "line " + std::to_string(reader.number()) + ": " + cause;
     return false;
-  }
-  if (!isSample) {
-    std::int64_t value = 0;
-    if (!parseField(valueText, "a signed 64-bit integer", value, error) ||
-        !isCounterKey(key, error)) {
-      return false;
+  };
+  std::string_view text;
+  std::string cause;
+  CounterLine line;
+  Result result{};
+  while ((result = reader.next(text)) == Result::Line) {
+    if (!parseLine(text, line, cause) || !take(line, cause)) {
+      return fail(cause);
     }
-    counters.setScalar(day, key, value);
-    return true;
+    if (step) {
+      step(text);
+    }
   }
-  Sample sample{};
-  return parseField(valueText, "a double", sample.value, error) &&
-         parseField(offsetText, "an offset in seconds", sample.secondsInDay, error) &&
-         samples.add(day, key, sample, error);
+  if (result != Result::End) {
+    return fail(result == Result::TooLong ? "longer than 2 MiB" : std::strerror(errno));
+  }
+  return true;
 }
 
 /// Writes lines in pieces.
@@ -187,24 +210,34 @@ class LineWriter {
 
 }  // namespace
 
-bool importCounterLines(std::istream& lines, CounterStore& counters, std::string& error) {
-  using Result = LineReader::Result;
-  LineReader reader(lines, kLongestLine);
-  SampleBuffer samples(counters);
-  const auto fail = [&](const std::string& cause) {
-    error = "line " + std::to_string(reader.number()) + ": " + cause;
-    return false;
-  };
-  std::string_view line;
-  std::string cause;
-  Result result{};
-  while ((result = reader.next(line)) == Result::Line) {
-    if (!importLine(line, counters, samples, cause)) {
-      return fail(cause);
+std::optional<std::set<std::int32_t>> checkCounterLines(std::istream& lines, std::string& error,
+                                                        const LineStep& step) {
+  std::set<std::int32_t> days;
+  std::optional<std::int32_t> last;
+  const auto check = [&](const CounterLine& line, std::string& cause) {
+    if (last != line.day) {
+      days.insert(*(last = line.day));
     }
-  }
-  if (result != Result::End) {
-    return fail(result == Result::TooLong ? "longer than 2 MiB" : std::strerror(errno));
+    return isCounterKey(line.key, cause);
+  };
+  return forEachLine(lines, error, step, check) ? std::optional(std::move(days)) : std::nullopt;
+}
+
+bool importCounterLines(std::istream& lines, CounterStore& counters, std::string& error,
+                        const LineStep& step) {
+  SampleBuffer samples(counters);
+  const auto take = [&](const CounterLine& line, std::string& cause) {
+    if (line.isSample) {
+      return samples.add(line.day, line.key, line.sample, cause);
+    }
+    const bool isKey = isCounterKey(line.key, cause);
+    if (isKey) {
+      counters.setScalar(line.day, line.key, line.value);
+    }
+    return isKey;
+  };
+  if (!forEachLine(lines, error, step, take)) {
+    return false;
   }
   samples.flush();
   return true;

@@ -322,12 +322,21 @@ CounterStore::Rows CounterStore::rowsBefore(std::int64_t day) {
 
 CounterStore::Rows CounterStore::removeBefore(std::int64_t day) {
   Rows rows = rowsBefore(day);
-  for (const char* const sql :
-       {"DELETE FROM chunk WHERE distribution IN (SELECT id FROM distribution WHERE day < ?)",
-        "DELETE FROM distribution WHERE day < ?", "DELETE FROM scalar WHERE day < ?"}) {
-    SqliteStatement(_connection, sql).bind(1, day).run();
-  }
+  removeRows("day < ?", day);
   return rows;
+}
+
+void CounterStore::removeDay(std::int32_t day) { removeRows("day = ?", day); }
+
+void CounterStore::removeRows(const std::string& condition, std::int64_t day) {
+  for (const char* const sql :
+       {"DELETE FROM chunk WHERE distribution IN (SELECT id FROM distribution WHERE ",
+        "DELETE FROM distribution WHERE ", "DELETE FROM scalar WHERE "}) {
+    const bool isNested = std::string_view(sql).find('(') != std::string_view::npos;
+    SqliteStatement(_connection, (sql + condition + (isNested ? ")" : "")).c_str())
+        .bind(1, day)
+        .run();
+  }
 }
 
 void CounterStore::giveRoomBack() {

@@ -84,6 +84,9 @@ class CounterStore {
   /// Removes these rows.
   Rows removeBefore(std::int64_t day);
 
+  /// Removes all rows of a day.
+  void removeDay(std::int32_t day);
+
   /// Gives the room that removed rows left back to the file system. A file that was made without
   /// room for the means to do so is written anew, for which all that was done before is committed.
   void giveRoomBack();
@@ -114,6 +117,7 @@ class CounterStore {
   struct Writer;
 
   void open();
+  void removeRows(const std::string& condition, std::int64_t day);
   template <typename Deliver>
   void forEachRow(const char* what, const char* select, std::string_view keyPrefix,
                   std::int32_t minDay, std::int32_t maxDay, const Deliver& deliver);

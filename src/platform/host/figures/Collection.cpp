@@ -16,8 +16,8 @@ constexpr std::size_t kMaxMarks = 8192;
 /// What is remembered of a figure, of a file that was left out, or of the boot.
 struct Mark {
   std::int64_t device = 0;
-  std::int64_t value = 0;
-  std::string text{};  ///< why a file was left out; the boot's identifier
+  std::int64_t value = 0;  ///< of the boot: when the collection was, in seconds since 1970
+  std::string text{};      ///< why a file was left out; the boot's identifier
 };
 
 constexpr const char* kBootPlace = "boot";
@@ -175,8 +175,23 @@ std::vector<std::string> collectFigures(CounterStore& store, const std::string& 
   Collection collection(last, readFigures(root, [](const LinuxFigure&) { return true; }));
   collection.addTo(store, now);
   std::vector<std::string> complaints = collection.complaints();
-  writeMarks(store.connection(), collection.next());
+  Marks next = collection.next();
+  next[kBootPlace].value = now.seconds;
+  writeMarks(store.connection(), next);
   return complaints;
+}
+
+std::optional<Date> lastCollection(CounterStore& store) {
+  return store.readTwice([&store]() -> std::optional<Date> {
+    SqliteStatement table(store.connection(), "SELECT 1 FROM sqlite_master WHERE name = 'mark'");
+    if (!table.step()) {
+      return std::nullopt;
+    }
+    SqliteStatement mark(store.connection(), "SELECT value FROM mark WHERE place = ?");
+    mark.bind(1, std::string_view(kBootPlace));
+    return mark.step() && mark.integer(0) != 0 ? std::optional(Date{mark.integer(0)})
+                                               : std::nullopt;
+  });
 }
 
 }  // namespace vesprun

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -17,5 +18,8 @@ namespace vesprun {
 /// Gives a line for each file that is left out, once in a boot and again when the reason changes.
 std::vector<std::string> collectFigures(CounterStore& store, const std::string& root,
                                         const Date& now);
+
+/// When figures were last collected, as far as the database knows. Throws `SqliteFailure`.
+std::optional<Date> lastCollection(CounterStore& store);
 
 }  // namespace vesprun

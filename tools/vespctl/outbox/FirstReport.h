@@ -1,0 +1,12 @@
+#pragma once
+
+#include <string>
+
+#include "platform/host/HostPlatform.h"
+
+namespace vesprun {
+
+/// For people: why a device without daily logs has none, and when the first one comes.
+std::string whenFirstReport(HostPlatform& device);
+
+}  // namespace vesprun
