@@ -43,6 +43,13 @@ PrefixTable::PrefixTable(const std::vector<std::string_view>& prefixes) {
     if (longest != nullptr) {
       entry.longest = longest;
       entry.first = std::min(entry.first, longest->first);
+      entry.depth = longest->depth + 1;
+      // Two jumps of one width become one of both, as in a skew-binary number.
+      const Entry* const jump = longest->far;
+      entry.far = jump != nullptr && jump->far != nullptr &&
+                          longest->depth - jump->depth == jump->depth - jump->far->depth
+                      ? jump->far
+                      : longest;
     }
     longest = &entry;
     _heads.push_back(head(entry.text.substr(_common.size())));
@@ -78,7 +85,8 @@ std::optional<std::size_t> PrefixTable::find(std::string_view key) const {
     entry = entry->longest;
     const std::size_t length = entry != nullptr ? commonLength(entry->text, key) : 0;
     while (entry != nullptr && entry->text.size() > length) {
-      entry = entry->longest;
+      const bool isFar = entry->far != nullptr && entry->far->text.size() > length;
+      entry = isFar ? entry->far : entry->longest;
     }
   }
   return entry != nullptr ? std::optional<std::size_t>(entry->first) : std::nullopt;

@@ -27,7 +27,9 @@ class PrefixTable {
   struct Entry {
     std::string_view text;
     std::uint32_t first;             ///< lowest place of this prefix and of those it begins with
+    std::uint32_t depth = 0;         ///< how many others it begins with
     const Entry* longest = nullptr;  ///< the longest other prefix that it begins with
+    const Entry* far = nullptr;      ///< a shorter one, so that few steps lead to any of them
   };
 
   /// The last prefix that is not above the key, or another one that begins with all prefixes of

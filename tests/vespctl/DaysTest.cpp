@@ -137,7 +137,8 @@ TEST_F(DaysTest, CatchUpSaysWhichDaysCouldNotBeSubmitted) {
   EXPECT_EQ(run("catch-up --json"), 1);
   EXPECT_EQ(output, "[]\n");
   EXPECT_EQ(error,
-            "vespctl catch-up: not submitted: 19783, 19784, 19785; \"vespctl show log --last 20\" says why\n");
+            "vespctl catch-up: not submitted: 19783, 19784, 19785; \"vespctl show log --last 20\" "
+            "says why\n");
   setTime("2024-03-05T09:15:02Z", R"({"enabled": false})");
   EXPECT_EQ(print("catch-up --json"), "[]\n");
   setTime("2024-03-05T09:15:02Z");

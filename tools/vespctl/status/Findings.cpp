@@ -20,6 +20,7 @@
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/figures/Collection.h"
 #include "platform/host/figures/FigureTable.h"
+#include "platform/host/files/JsonLines.h"
 #include "platform/host/outbox/OutboxFiles.h"
 #include "whitelist/WhitelistCheck.h"
 
@@ -346,24 +347,20 @@ class Findings {
     std::size_t errors = 0;
     std::string lastError;
     std::size_t errorsBeforeStart = 0;  // the start that was seen last
-    const std::string text = contentIfThere(_directory.hostPath(kSystemLogFile));
-    for (std::size_t begin = 0; begin < text.size();) {
-      const std::size_t end = std::min(text.find('\n', begin), text.size());
-      const std::string_view line = std::string_view(text).substr(begin, end - begin);
-      begin = end + 1;
+    const auto take = [&](std::string_view line) {
       // Most lines are neither.
       if (line.find("\"error\"") == line.npos && line.find("vesprun started") == line.npos &&
           line.find("daily tasks for day ") == line.npos) {
-        continue;
+        return;
       }
       std::string ignored;
-      const std::optional<PropertyValue> value = valueFromJsonText(std::string(line), ignored);
+      const std::optional<PropertyValue> value = valueFromJsonText(line, ignored);
       const PropertyDict* const members = value ? value->dict() : nullptr;
       const std::string* const level = members != nullptr ? members->findString("level") : nullptr;
       const std::string* const message =
           members != nullptr ? members->findString("message") : nullptr;
       if (level == nullptr || message == nullptr) {
-        continue;
+        return;
       }
       if (*level == "error") {
         ++errors;
@@ -373,7 +370,10 @@ class Findings {
       } else if (message->starts_with("daily tasks for day ")) {
         errors -= std::exchange(errorsBeforeStart, 0);
       }
-    }
+    };
+    orFail([&](std::string& error) {
+      return forEachLineOf(_directory.hostPath(kSystemLogFile), take, error);
+    });
     if (errors != 0) {
       tell("errors", pathOf(kSystemLogFile) + ": " + std::to_string(errors) +
                          (errors == 1 ? " error" : " errors") +
