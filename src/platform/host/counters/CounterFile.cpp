@@ -95,7 +95,7 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
     error = path.string() + ": not a regular file";
     return false;
   }
-  const auto attempt = [&] {
+  try {
     CounterStore store(path, _longestWait, access);
     if (!work(store)) {
       return false;
@@ -104,17 +104,6 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
       store.commit();
     }
     return true;
-  };
-  try {
-    try {
-      return attempt();
-    } catch (const SqliteFailure& failure) {
-      // Reading has been tried twice already.
-      if (!writes || !failure.isCorruption()) {
-        throw;
-      }
-    }
-    return attempt();
   } catch (const SqliteFailure& failure) {
     error = failure.text;
     trouble = troubleOf(failure);

@@ -33,10 +33,10 @@ class CounterFile {
     std::string text;  ///< names the file and the trouble
   };
 
-  /// Runs `work` on the tables in one transaction, and once more if it found damage; creates a
-  /// missing file. True when the transaction was committed. False, with nothing changed, when
-  /// `work` failed, with its or our text in `error`, and in `damage` if the file was damaged twice;
-  /// `trouble`, if given, tells what it was.
+  /// Runs `work` on the tables in one transaction; creates a missing file. True when the
+  /// transaction was committed. False, with nothing changed, when `work` failed, with its or our
+  /// text in `error`, and in `damage` if the file is damaged; `trouble`, if given, tells what it
+  /// was.
   bool write(const std::function<bool(CounterStore&)>& work, std::string& error,
              std::optional<Damage>& damage, CounterTrouble* trouble = nullptr);
 

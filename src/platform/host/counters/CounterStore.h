@@ -94,8 +94,10 @@ class CounterStore {
   /// The next day after `day` with a row. `day` has 64 bits so that the first day can be asked for.
   std::optional<std::int32_t> nextDay(std::int64_t day);
 
-  /// Runs `step`, which reads, and again if it failed: earlier statements then belong to an earlier
-  /// `opening` and are useless. Not after waiting for a lock, nor in a writing transaction.
+  /// Runs `step`, which reads, and again if it failed: what was delivered cannot be taken back, so
+  /// reading goes on from there. Earlier statements then belong to an earlier `opening` and are
+  /// useless. Not after waiting for a lock, nor in a transaction that writes: it is run again
+  /// whole.
   template <typename Step>
   auto readTwice(const Step& step) {
     try {

@@ -198,14 +198,21 @@ std::unique_ptr<TBHistory> HostTallybook::initWithDefaultPath() {
 
 bool HostTallybook::write(const std::function<bool(CounterStore&)>& work, std::string& error,
                           CounterTrouble* trouble) {
+  enum Attempt { First, Again, OnNewFile };
   std::optional<CounterFile::Damage> damage;
-  if (_file.write(work, error, damage, trouble)) {
-    return true;
+  for (const Attempt attempt : {First, Again, OnNewFile}) {
+    if (attempt == OnNewFile && !recover(*damage, error)) {
+      return false;
+    }
+    damage.reset();
+    if (_file.write(work, error, damage, trouble)) {
+      return true;
+    }
+    if (!damage) {
+      return false;
+    }
   }
-  if (!damage || !recover(*damage, error)) {
-    return false;
-  }
-  return _file.write(work, error, damage, trouble);
+  return false;
 }
 
 bool HostTallybook::read(const std::function<void(CounterStore&)>& work, std::string& error) {
