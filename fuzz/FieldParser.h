@@ -4,7 +4,7 @@
 #include <cstdint>
 
 #include "ExactCopy.h"
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
 #include "NANDInfo/parsers/GenericParserCxt.h"
 #include "NANDInfo/sets/FilteredDict.h"
 #include "NANDInfo/tables/FieldSets.h"

@@ -2,7 +2,9 @@
 
 #include <optional>
 
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
+#include "NANDInfo/sets/LegacyNANDInfo.h"
+#include "NANDInfo/sets/VMFreezerInfo.h"
 #include "NANDInfo/structuredlog/StructuredLog.h"
 #include "common/TextForm.h"
 #include "platform/Guarded.h"
@@ -11,8 +13,6 @@
 #include "telemetry/DiskInfo.h"
 #include "telemetry/KernelECCEvents.h"
 #include "telemetry/ReportingChannels.h"
-#include "vesprun/CopyNANDInfo.h"
-#include "vesprun/VMFreezer.h"
 
 namespace vesprun {
 namespace {
@@ -30,12 +30,12 @@ void logDiskUsage() {
 }
 
 void logNANDInfo() {
-  std::optional<PropertyDict> info = CopyNANDInfoWithOptions({});
+  std::optional<PropertyDict> info = gatherNANDInfoForDailyLog();
   if (!info) {
     logMessage(LogLevel::Default, "failed to get NAND info dict");
     return;
   }
-  info->merge(CopyVMFreezerNANDInfo());
+  info->merge(gatherVMFreezerInfo());
   SetNANDInfoScalars(*info);
 }
 

@@ -11,7 +11,7 @@
 #include <string>
 #include <string_view>
 
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
 #include "interface/EntryPoints.h"
 #include "interface/OpenDevice.h"
 #include "vesprun/StructuredLogState.h"
@@ -31,7 +31,7 @@ namespace {
 
 using vesprun::CallFailure;
 
-/// Of this thread's last call that failed. In a buffer: telling of a failure needs no memory.
+/// This thread's last failure. In a fixed buffer: reporting a failure needs no memory.
 struct LastError {
   vesprun_error code = VESPRUN_ERROR_NONE;
   std::array<char, 1024> text{};
@@ -84,13 +84,13 @@ Result callFromC(Result failed, const Body& body) noexcept {
   return failed;
 }
 
-/// True when nothing that is needed is a null pointer.
+/// False, with the failure, for a null pointer.
 bool isGiven(const void* pointer, const char* what, CallFailure& failure) {
   return pointer != nullptr ||
          failure.set(VESPRUN_ERROR_ARGUMENT, std::string("no ") + what + " is given");
 }
 
-/// 0, or -1 on failure, of a change of the counter `key`.
+/// Changes the counter `key`. 0, or -1 on failure.
 template <typename Value>
 int changeCounter(vesprun_device* device, const char* key, Value value,
                   bool (vesprun::OpenDevice::*change)(std::string_view, Value,

@@ -8,8 +8,8 @@
 #include <cmath>
 #include <thread>
 
-#include "NANDInfo/parsers/APIErrorMessage.h"
-#include "NANDInfo/structuredlog/StructuredLogState.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
+#include "NANDInfo/structuredlog/StructuredLogGlobals.h"
 #include "common/ProcessState.h"
 #include "platform/host/HostPlatform.h"
 #include "support/HostServiceTest.h"

@@ -2,6 +2,7 @@
 
 #include "NANDInfo/controller/NandExporter.h"
 #include "platform/RegistryObject.h"
+#include "vesprun/ORUConnection.h"
 
 namespace vesprun {
 
@@ -17,6 +18,9 @@ class Controller {
   /// False when closing fails; true also without a connection.
   bool close();
 
+  /// Its answer to the content-deletion method; false when it cannot be asked.
+  bool recommendsContentDeletion();
+
   /// Its entry in `nand_exporters_tunnel`; the ending one without a controller.
   nand_exporter_t& exporter() const { return *_exporter; }
   RegistryHandle service() const { return _service.get(); }
@@ -27,5 +31,8 @@ class Controller {
   RegistryObject _service;
   RegistryHandle _connection = 0;
 };
+
+/// What `openORUConnection` does, but that a failure leaves `connection` as far as it came.
+bool openConnection(ORUConnection& connection);
 
 }  // namespace vesprun

@@ -37,7 +37,7 @@ bool getEANConnection(EANConnection& ean) {
   return true;
 }
 
-/// `name` and `callName`: of the query in the log lines of the two failures.
+/// `name` and `callName` are for the log lines of the two failures.
 std::uint64_t ask(std::uint32_t method, const char* name, const char* callName,
                   std::uint32_t code) {
   const char key[] = {static_cast<char>(code >> 24), static_cast<char>(code >> 16),

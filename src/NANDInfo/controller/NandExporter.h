@@ -72,7 +72,7 @@ RegistryHandle FindServiceUsingIterator(const std::string& className);
 
 /// The service of the first known controller, matched by class or else found by walking the
 /// registry; the caller releases it. `exporter` becomes its table entry. 0 and the ending entry
-/// when there is none. Opens nothing.
+/// without a controller. Opens nothing.
 RegistryHandle findNandExporter(nand_exporter_t*& exporter);
 
 /// Opens the first known controller that can be matched and opened. True: `exporter` holds the

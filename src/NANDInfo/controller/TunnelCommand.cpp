@@ -2,7 +2,7 @@
 
 #include <algorithm>
 
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
 #include "common/LittleEndian.h"
 #include "platform/Platform.h"
 

@@ -30,7 +30,7 @@ static_assert(std::endian::native == std::endian::little);
 class TunnelBuffer {
  public:
   TunnelBuffer() = default;
-  /// Empty (see `operator bool`) when there is no memory.
+  /// Empty (see `operator bool`) when memory runs out.
   explicit TunnelBuffer(std::size_t size);
 
   explicit operator bool() const { return _bytes != nullptr; }

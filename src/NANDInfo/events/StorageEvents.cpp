@@ -3,13 +3,13 @@
 #include <iterator>
 #include <string>
 
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
 #include "NANDInfo/sets/FilteredDict.h"
+#include "NANDInfo/sets/MagazineInfo.h"
 #include "NANDInfo/sets/StatisticsGathering.h"
+#include "NANDInfo/sets/WhitelistedFields.h"
 #include "NANDInfo/tables/EventFields.h"
 #include "platform/Platform.h"
-#include "vesprun/Magazine.h"
-#include "vesprun/WhitelistedFieldSets.h"
 
 namespace vesprun {
 namespace {
@@ -46,7 +46,7 @@ bool sendAndLog(const char* operation, const StorageEvent& event, const Property
 }  // namespace
 
 PropertyDict createAndLogFTLStatFieldsToEventHubForEvent() {
-  const PropertyDict set = CopyWhitelistedNANDFTLInfo(false);
+  const PropertyDict set = gatherWhitelistedFTLInfo(false);
   if (set.empty()) {
     return failure("Unable gather FTL fields to log to EH");
   }
@@ -66,7 +66,7 @@ PropertyDict createAndLogFTLStatFieldsToEventHubForEvent() {
 
 PropertyDict createAndLogMSPFieldsToEventHubForEvent() {
   constexpr const StorageEvent& kEvent = eventOfStep(1);
-  PropertyDict sets = CopyWhitelistedNANDMSPInfo(false);
+  PropertyDict sets = gatherWhitelistedMSPInfo(false);
   if (sets.empty()) {
     return failure("Unable gather MSP fields to log to EH");
   }
@@ -90,7 +90,7 @@ PropertyDict createAndLogMSPFieldsToEventHubForEvent() {
 
 PropertyDict createAndLogStorageStatsToEventHubForEvent() {
   constexpr const StorageEvent& kEvent = eventOfStep(2);
-  const PropertyDict set = CopyWhitelistedStorageStats(false);
+  const PropertyDict set = gatherWhitelistedStorageStats(false);
   if (set.empty()) {
     return failure("Unable gather Storage fields to log to EH");
   }
@@ -105,7 +105,7 @@ PropertyDict createAndLogSMagFTLFieldsToEventHubForEvent(std::uint32_t view) {
     return failure("Wrong SM delta type");
   }
   const auto& [event, hours, withHistory] = kMagazineViews[view];
-  const PropertyDict fields = CopySMagNANDFTLInfo(hours, 1, 2);
+  const PropertyDict fields = gatherMagazineInfo(hours, true, 2);
   if (fields.empty()) {
     return failure("Unable gather FTL fields to log to EH");
   }
@@ -116,7 +116,7 @@ PropertyDict createAndLogSMagFTLFieldsToEventHubForEvent(std::uint32_t view) {
   logWhetherUsed(__func__, event);
   PropertyDict payload = CreateFilteredDict(fields, event.fields);
   if (withHistory) {
-    payload.merge(CopySMagNANDFTLCustomHistoryInfo(0));
+    payload.merge(gatherMagazineHistory(false));
   }
   return sendAndLog(__func__, event, payload) ? std::move(payload) : PropertyDict();
 }

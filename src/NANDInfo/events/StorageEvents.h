@@ -20,7 +20,7 @@ PropertyDict createAndLogMSPFieldsToEventHubForEvent();
 
 PropertyDict createAndLogStorageStatsToEventHubForEvent();
 
-/// The stats magazine's view of a day (0, also with `CopySMagNANDFTLCustomHistoryInfo`), a week (1)
+/// The stats magazine's view of a day (0, also with its history), a week (1)
 /// or a month (2).
 PropertyDict createAndLogSMagFTLFieldsToEventHubForEvent(std::uint32_t view);
 

@@ -14,7 +14,7 @@ void GenericParserCxt::reserve(std::size_t count) noexcept {
   try {
     _values.reserve(_values.size() + count);
   } catch (const std::bad_alloc&) {
-    // Appending goes as far as it can.
+    // Appending then fails when memory runs out.
   }
 }
 
@@ -46,8 +46,10 @@ bool GenericParserCxt::appendKnown(KnownNames names, const std::uint8_t* source,
     Run& run = _runs.emplace_back(Run{names, 0, 0});
     for (; run.size < count; ++run.size) {
       const std::uint8_t* const element = source + run.size * width;
-      _values.push_back(width == sizeof(std::uint64_t) ? loadLittleEndian<std::uint64_t>(element)
-                                                       : loadLittleEndian(element, width));
+      // The usual widths as constants: each is one load.
+      _values.push_back(width == sizeof(std::uint64_t)   ? loadLittleEndian<std::uint64_t>(element)
+                        : width == sizeof(std::uint32_t) ? loadLittleEndian<std::uint32_t>(element)
+                                                         : loadLittleEndian(element, width));
     }
     return true;
   } catch (const std::bad_alloc&) {

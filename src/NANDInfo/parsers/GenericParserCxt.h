@@ -82,8 +82,8 @@ inline constexpr std::uint32_t kMaxFieldsOfOneCall = 65'535;
 /// single element is named `name`, several `name` + index from 0.
 ///
 /// True, and nothing appended, when `width` or `count` is 0. False, and nothing appended, when
-/// `width` is above 8, or `count` above `kMaxFieldsOfOneCall`: a part of the array would pass for
-/// all of it. False also when memory runs out; elements are then missing.
+/// `width` is above 8, or `count` above `kMaxFieldsOfOneCall`: a truncated array would look
+/// like a complete one. False also when memory runs out; elements are then missing.
 bool AddMultipleFieldsToGenericContext(GenericParserCxt& ctx, std::string_view name,
                                        const std::uint8_t* source, std::uint32_t width,
                                        std::uint32_t count);

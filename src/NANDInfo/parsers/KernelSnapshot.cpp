@@ -32,7 +32,7 @@ struct Item {
   std::size_t size() const { return kItemHeaderSize + data.size(); }
 };
 
-/// The item at the front, unless it ends the snapshot or does not lie wholly within it.
+/// The item at the front, unless it ends the snapshot or exceeds it.
 std::optional<Item> frontItem(Items items) {
   if (items.size() < kItemHeaderSize) {
     return std::nullopt;

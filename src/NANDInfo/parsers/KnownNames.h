@@ -39,8 +39,8 @@ class KnownNames {
 };
 
 /// The names of all elements of all statistics in `kTable`, laid out at compile time: the
-/// statistic's own for a single value; for an array's element with `kSeparator` and the index
-/// behind it.
+/// statistic's own for a single value; for an array's element followed by `kSeparator` and the
+/// index.
 template <const auto& kTable, const char* kSeparator>
 class KnownNamesOf {
  public:

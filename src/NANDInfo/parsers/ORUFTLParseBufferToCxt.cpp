@@ -5,7 +5,7 @@
 #include <cstdio>
 #include <optional>
 
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
 #include "NANDInfo/parsers/StatisticsRecord.h"
 
@@ -14,7 +14,7 @@ namespace {
 
 constexpr std::uint32_t kNoId = 0xFFFF;
 
-/// The number of fields taken; nothing ends the walk.
+/// The number of fields taken; empty ends the walk.
 using Taken = std::optional<std::uint32_t>;
 
 Taken takeUnknown(GenericParserCxt& ctx, const StatisticsRecordHeader& header,

@@ -18,8 +18,8 @@ namespace vesprun {
 ///
 /// Records without payload are skipped. The first invalid header (id 0xFFFF or above 0x30000000, or
 /// more words than follow) silently ends the walk. With an error, so do an array for which memory
-/// runs out and an unknown id with more than 65,535 words. Earlier fields stay and count. Errors
-/// are recorded with `SetAPIErrorMessage`.
+/// runs out and an unknown id with more than 65,535 words. Earlier fields are kept and counted.
+/// Errors are recorded with `SetAPIErrorMessage`.
 std::uint32_t ORUFTLParseBufferToCxt(GenericParserCxt& ctx, std::span<const std::uint8_t> buffer);
 
 /// The same, as if all ids were unknown.

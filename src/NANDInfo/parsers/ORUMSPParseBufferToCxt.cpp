@@ -2,14 +2,14 @@
 
 #include <algorithm>
 
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
 #include "NANDInfo/parsers/MSPRecord.h"
 #include "NANDInfo/parsers/ORUMSPKeyTable.h"
 
 namespace vesprun {
 namespace {
 
-/// Adds the elements that both payload and statistic have. False when the context takes none.
+/// Adds the elements that both payload and statistic have. False when memory runs out.
 bool take(GenericParserCxt& ctx, const ORUMSPKey& key, std::span<const std::uint8_t> payload,
           std::uint32_t& total) {
   const auto size = static_cast<std::uint32_t>(payload.size());
@@ -45,7 +45,7 @@ std::uint32_t ORUMSPParseBufferToCxt(GenericParserCxt& ctx, std::span<const std:
   MSPRecordReader reader(buffer);
   while (reader.holdsHeader()) {
     const MSPRecordHeader header = reader.readHeader();
-    // Even an end marker does not count without payload.
+    // Even an end marker needs a payload.
     if (header.length == 0) {
       continue;
     }

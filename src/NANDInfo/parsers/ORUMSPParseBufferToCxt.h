@@ -13,7 +13,7 @@ namespace vesprun {
 /// A payload of a wrong size is recorded as an error (`SetAPIErrorMessage`), and its whole
 /// elements, up to the statistic's number, are added. The walk ends at an end marker, a record
 /// longer than the rest, less than a header or, with an error, when memory runs out; earlier
-/// elements stay and count. An empty buffer is an error.
+/// elements are kept and counted. An empty buffer is an error.
 std::uint32_t ORUMSPParseBufferToCxt(GenericParserCxt& ctx, std::span<const std::uint8_t> buffer);
 
 }  // namespace vesprun

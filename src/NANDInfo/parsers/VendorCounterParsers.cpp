@@ -174,7 +174,7 @@ constexpr CounterCopy k1xHynix[] = {
 // clang-format on
 
 /// The number of words that a layout writes; 0 when it writes one twice or out of order, leaves a
-/// field, or reads behind the region.
+/// field, or reads past the region.
 constexpr std::size_t wordsOf(std::span<const CounterCopy> layout) {
   std::size_t words = 0;
   std::size_t end = 0;
@@ -198,13 +198,13 @@ static_assert(wordsOf(k1xHynix) == 56);
 
 void copyCounters(std::span<const CounterCopy> layout, CounterRegion region,
                   NandChannelCounters& out) {
-  constexpr std::size_t kWordSize = sizeof(std::uint32_t);
   for (const CounterCopy& copy : layout) {
     const auto words = std::span(out).subspan(copy.firstWord(), copy.count());
     if (copy.source == kSetToZero) {
       std::ranges::fill(words, 0);
     } else {
-      std::memcpy(words.data(), region.data() + static_cast<std::size_t>(copy.source) * kWordSize,
+      std::memcpy(words.data(),
+                  region.data() + static_cast<std::size_t>(copy.source) * sizeof(std::uint32_t),
                   words.size_bytes());
     }
   }

@@ -9,8 +9,8 @@
 namespace vesprun {
 
 /// `x` rounded half up to `sig` significant digits. Digits are counted by log10 in double
-/// precision, so a number just below a large power of ten counts one more. A number that would lose
-/// 19 digits becomes 0; results of 2^64 or more wrap.
+/// precision, so a number just below a large power of ten has one digit more. A number that would
+/// lose 19 digits becomes 0; results of 2^64 or more wrap.
 std::uint64_t roundSig(std::uint64_t x, std::uint64_t sig);
 
 /// The entries of `source` that `keys` lists, in the order of `source`. Null lists all.

@@ -7,7 +7,7 @@
 
 #include "NANDInfo/controller/Controller.h"
 #include "NANDInfo/controller/TunnelCommand.h"
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
 #include "NANDInfo/parsers/GenericParserCxt.h"
 #include "NANDInfo/sets/FilteredDict.h"
 
@@ -18,7 +18,7 @@ struct ReleaseInterfaces {
   void operator()(nand_exporter_t* exporter) const { ReleaseIOInterfaces(*exporter); }
 };
 
-/// The controller that `findNandExporterNew` opens, until the pointer goes; null when none opens.
+/// The controller that `findNandExporterNew` opens, closed with the pointer; null if none opens.
 std::unique_ptr<nand_exporter_t, ReleaseInterfaces> openExporter() {
   nand_exporter_t* exporter = nullptr;
   const bool isOpen = findNandExporterNew(exporter);

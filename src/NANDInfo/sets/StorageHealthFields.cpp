@@ -4,12 +4,12 @@
 #include <optional>
 #include <string>
 
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
 #include "NANDInfo/sets/StatisticsGathering.h"
+#include "NANDInfo/sets/VMFreezerInfo.h"
 #include "NANDInfo/tables/FieldSets.h"
 #include "platform/Platform.h"
 #include "telemetry/DiskInfo.h"
-#include "vesprun/VMFreezer.h"
 
 namespace vesprun {
 namespace {
@@ -144,7 +144,7 @@ PropertyDict getReclaimerInfo() {
 
 PropertyDict gatherORUFTLOtherData(const PropertyDict* ftl) {
   PropertyDict fields = getReclaimerInfo();
-  fields.merge(CopyVMFreezerNANDInfo());
+  fields.merge(gatherVMFreezerInfo());
   fields.merge(GetDiskInfo());
   fields.set("HLT_storeDemoMode", std::int32_t{isInStoreDemoMode()});
   if (ftl == nullptr) {

@@ -8,13 +8,13 @@
 #include <optional>
 #include <utility>
 
-#include "NANDInfo/structuredlog/StructuredLogState.h"
+#include "NANDInfo/sets/LegacyNANDInfo.h"
+#include "NANDInfo/structuredlog/StructuredLogGlobals.h"
 #include "common/Calendar.h"
 #include "common/LittleEndian.h"
 #include "common/TextForm.h"
 #include "platform/DictionaryHelpers.h"
 #include "platform/Platform.h"
-#include "vesprun/CopyNANDInfo.h"
 
 namespace vesprun {
 namespace {
@@ -186,7 +186,7 @@ bool WriteValidityListNANDLog(std::span<const std::uint8_t> buffer,
   PropertyDict fields;
   setNumberValueForType(fields, "IntermediateWamp", gCurrentSysWamp);
   setNumberValueForType(fields, "UserWamp", gCurrentUserWamp);
-  DumpNANDInfo(fields);
+  addNANDInfo(fields);
   int number = 0;
   for (PropertyArray& values : list->valuesByList()) {
     if (!values.empty()) {

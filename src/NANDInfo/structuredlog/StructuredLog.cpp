@@ -14,7 +14,7 @@
 #include "NANDInfo/sets/StatisticsGathering.h"
 #include "NANDInfo/structuredlog/FactoryDefectList.h"
 #include "NANDInfo/structuredlog/NANDLogWriter.h"
-#include "NANDInfo/structuredlog/StructuredLogState.h"
+#include "NANDInfo/structuredlog/StructuredLogGlobals.h"
 #include "NANDInfo/structuredlog/TelemetryList.h"
 #include "NANDInfo/structuredlog/WriteAmplification.h"
 #include "common/LittleEndian.h"

@@ -59,7 +59,7 @@ struct Characteristics {
   std::int32_t busCount;
 };
 
-/// Four hexadecimal digits, then eight, of which the last two do not count.
+/// Four hexadecimal digits, then eight, the last two of which are ignored.
 std::uint64_t manufacturerKey(std::string_view text) {
   constexpr std::uint32_t kVendorDigits = 4;
   constexpr std::uint32_t kPartDigits = 8;

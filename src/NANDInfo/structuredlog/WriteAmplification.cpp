@@ -13,7 +13,7 @@ static_assert(std::numeric_limits<double>::is_iec559, "a division by 0 is infini
 
 constexpr unsigned kBlockShift = 12;  // host writes are counted in blocks of 4 KiB
 constexpr double kDefaultThreshold = 2.0;
-constexpr double kThresholdLimit = 10.0;
+constexpr double kMaxThreshold = 10.0;
 
 double threshold() {
   const std::optional<PropertyValue> preference =
@@ -23,7 +23,7 @@ double threshold() {
     return kDefaultThreshold;
   }
   const double value = number->asDouble();
-  return value > 0.0 && value < kThresholdLimit ? value : kDefaultThreshold;
+  return value > 0.0 && value < kMaxThreshold ? value : kDefaultThreshold;
 }
 
 /// Blocks written by so many band erases, for each block that the host wrote.
@@ -36,7 +36,7 @@ float writesPerHostWrite(std::uint64_t erases, std::uint64_t blocksPerBand,
 }  // namespace
 
 WriteAmplification writeAmplification(const ORUStatsContext& statistics) {
-  // The geometry multiplies, and wraps, in its own 32 bits.
+  // The product wraps in 32 bits.
   const std::uint32_t bytesPerBand = statistics.pagesPerVirtualBlock * statistics.bytesPerPage;
   std::uint64_t slcBlocksPerBand = 0;
   std::uint64_t intermediateErases = 0;

@@ -60,7 +60,7 @@ constexpr std::uint32_t hashOfFieldName(std::string_view name) {
   return static_cast<std::uint32_t>(hash * kFactor >> 32);
 }
 
-/// A name in the making, also at compile time.
+/// A name that is being built, also at compile time.
 class NameText {
  public:
   constexpr NameText& append(std::string_view text) {

@@ -1,7 +1,5 @@
-#include "NANDInfo/controller/EntryPoint.h"
-#include "common/ProcessState.h"
-
 #include "buffers/DeviceBuffers.h"
+#include "common/ProcessState.h"
 #include "interface/EntryPoints.h"
 #include "platform/host/registry/HostDeviceRegistry.h"
 #include "support/ControllerTest.h"

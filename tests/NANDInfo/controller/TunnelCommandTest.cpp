@@ -1,6 +1,6 @@
 #include "NANDInfo/controller/TunnelCommand.h"
 
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
 #include "common/ProcessState.h"
 #include "support/ControllerTest.h"
 #include "support/WatchedRegistry.h"

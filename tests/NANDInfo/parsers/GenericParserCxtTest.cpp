@@ -3,7 +3,7 @@
 #include <gmock/gmock.h>
 
 #include "FieldsOf.h"
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
 #include "NANDInfo/structuredlog/TelemetryList.h"
 #include "common/ProcessState.h"
 #include "platform/DictionaryHelpers.h"

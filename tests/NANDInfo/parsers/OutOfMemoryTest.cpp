@@ -2,7 +2,7 @@
 #include <cstdint>
 
 #include "FieldsOf.h"
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
 #include "NANDInfo/parsers/KernelSnapshot.h"
 #include "NANDInfo/parsers/ORUFTLParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"

@@ -1,4 +1,4 @@
-#include "NANDInfo/sets/CopyNANDInfo.h"
+#include "NANDInfo/sets/LegacyNANDInfo.h"
 
 #include "NANDInfo/controller/EANQueries.h"
 #include "NANDInfo/controller/NandExporter.h"

@@ -1,4 +1,4 @@
-#include "NANDInfo/sets/HealthSets.h"
+#include "NANDInfo/sets/HealthFigures.h"
 
 #include "buffers/DeviceBuffers.h"
 #include "common/TextForm.h"

@@ -1,6 +1,6 @@
 #include <algorithm>
 
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
 #include "NANDInfo/parsers/ORUStatsContext.h"
 #include "NANDInfo/sets/StatisticsGathering.h"
 #include "buffers/DeviceBuffers.h"

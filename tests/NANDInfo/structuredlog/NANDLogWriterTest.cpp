@@ -2,7 +2,7 @@
 
 #include <limits>
 
-#include "NANDInfo/structuredlog/StructuredLogState.h"
+#include "NANDInfo/structuredlog/StructuredLogGlobals.h"
 #include "buffers/DeviceBuffers.h"
 #include "support/ScarceMemory.h"
 #include "support/TestDevice.h"

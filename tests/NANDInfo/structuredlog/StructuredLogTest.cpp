@@ -1,7 +1,7 @@
 #include "NANDInfo/structuredlog/StructuredLog.h"
 
 #include "NANDInfo/controller/NandExporter.h"
-#include "NANDInfo/structuredlog/StructuredLogState.h"
+#include "NANDInfo/structuredlog/StructuredLogGlobals.h"
 #include "buffers/DeviceBuffers.h"
 #include "common/TextForm.h"
 #include "support/ControllerTest.h"

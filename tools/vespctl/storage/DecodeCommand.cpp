@@ -6,7 +6,7 @@
 #include <optional>
 
 #include "Command.h"
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
 #include "NANDInfo/parsers/KernelSnapshot.h"
 #include "NANDInfo/parsers/ORUFTLParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"
@@ -96,7 +96,7 @@ Json decodeSnapshot(Buffer snapshot, const std::string& thread) {
   return {{"found", found}, {"ioStatistics", std::move(words)}};
 }
 
-struct Arguments {
+struct DecodeArguments {
   std::string layout;
   std::string file;
   std::optional<std::string> thread;
@@ -119,7 +119,7 @@ void print(const Json& decoded) {
   }
 }
 
-void decode(const Arguments& arguments) {
+void decode(const DecodeArguments& arguments) {
   const bool isSnapshot = arguments.layout == kSnapshot;
   const auto* layout = std::ranges::find(kLayouts, arguments.layout, &Layout::name);
   if (layout == std::end(kLayouts) && !isSnapshot) {
@@ -145,7 +145,7 @@ void decode(const Arguments& arguments) {
 }  // namespace
 
 void addDecodeCommand(CLI::App& command) {
-  const auto arguments = std::make_shared<Arguments>();
+  const auto arguments = std::make_shared<DecodeArguments>();
   CLI::Option* const layout =
       command.add_option("LAYOUT", arguments->layout, "What the buffer is: " + layouts())
           ->required();

@@ -1,4 +1,4 @@
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
 
 #include <array>
 #include <cstdarg>

@@ -2,11 +2,9 @@
 
 #include <cstdint>
 
-#include "vesprun/StructuredLogState.h"
-
 namespace vesprun {
 
-// The values behind the installed functions.
+// Input and results of the structured log, which "vesprun/StructuredLogState.h" gives to programs.
 
 extern std::uint8_t gForceCollectionSet;
 extern std::uint8_t gNeedValidityList;

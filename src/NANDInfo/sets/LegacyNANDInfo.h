@@ -1,8 +1,16 @@
 #pragma once
 
-#include "vesprun/CopyNANDInfo.h"
+#include <optional>
+
+#include "vesprun/PropertyDict.h"
 
 namespace vesprun {
+
+// What the entry points of "vesprun/CopyNANDInfo.h" do.
+
+PropertyDict gatherNANDInfo();
+std::optional<PropertyDict> gatherNANDInfoForDailyLog();
+void addNANDInfo(PropertyDict& info);
 
 /// Do today's statistics go to analytics events alone? Alternates by day (UTC), in a phase that
 /// depends on the boot session; false when that is unknown.

@@ -1,4 +1,4 @@
-#include "NANDInfo/sets/HealthSets.h"
+#include "NANDInfo/sets/HealthFigures.h"
 
 #include <algorithm>
 #include <array>
@@ -7,8 +7,7 @@
 #include <string>
 #include <string_view>
 
-#include "NANDInfo/controller/EntryPoint.h"
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
 #include "NANDInfo/sets/FilteredDict.h"
 #include "NANDInfo/sets/StatisticsGathering.h"
 
@@ -89,26 +88,19 @@ PropertyDict gatherNANDHealthInfo() {
           {kNumDieFailures, ftl->integerOr("numDieFailures", -1)}};
 }
 
-PropertyDict CopyTendmarkNANDInfo() noexcept {
-  return runEntryPoint(__func__, [&] {
-    PropertyDict set = CreateFilteredDict(gatherNANDHealthInfo(), &kTendmarkFields);
-    set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
-    return set;
-  });
+PropertyDict gatherTendmarkInfo() {
+  PropertyDict set = CreateFilteredDict(gatherNANDHealthInfo(), &kTendmarkFields);
+  set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
+  return set;
 }
 
-PropertyDict CopyOTANANDInfo() noexcept {
-  return runEntryPoint(__func__,
-                       [&] { return CreateFilteredDict(gatherNANDHealthInfo(), &kOTAFields); });
-}
+PropertyDict gatherOTAInfo() { return CreateFilteredDict(gatherNANDHealthInfo(), &kOTAFields); }
 
-PropertyDict CopyInternalLabNANDInfo() noexcept {
-  return runEntryPoint(__func__, [&] {
-    PropertyDict set = CreateFilteredDict(gatherNANDHealthInfo(), &kInternalLabFields);
-    set.set(kIsNANDRetirable, std::int32_t{isRetirable(set)});
-    set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
-    return set;
-  });
+PropertyDict gatherInternalLabInfo() {
+  PropertyDict set = CreateFilteredDict(gatherNANDHealthInfo(), &kInternalLabFields);
+  set.set(kIsNANDRetirable, std::int32_t{isRetirable(set)});
+  set.set(kAPIErrorMessageKey, GetAPIErrorMessage());
+  return set;
 }
 
 }  // namespace vesprun

@@ -1,4 +1,4 @@
-#include "NANDInfo/structuredlog/StructuredLogState.h"
+#include "NANDInfo/structuredlog/StructuredLogGlobals.h"
 
 #include "common/ProcessState.h"
 
@@ -19,10 +19,5 @@ const ProcessState kStructuredLogState([] {
 });
 
 }  // namespace
-
-void SetForceCollection(bool force) noexcept { gForceCollectionSet = force ? 1 : 0; }
-bool NeedsValidityList() noexcept { return gNeedValidityList != 0; }
-double CurrentUserWriteAmplification() noexcept { return gCurrentUserWamp; }
-double CurrentSystemWriteAmplification() noexcept { return gCurrentSysWamp; }
 
 }  // namespace vesprun

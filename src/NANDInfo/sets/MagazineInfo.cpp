@@ -1,12 +1,11 @@
-#include "vesprun/Magazine.h"
+#include "NANDInfo/sets/MagazineInfo.h"
 
 #include <array>
 #include <optional>
 #include <string>
 #include <string_view>
 
-#include "NANDInfo/controller/EntryPoint.h"
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
 #include "NANDInfo/sets/StatisticsGathering.h"
 #include "NANDInfo/sets/StorageHealthFields.h"
 #include "NANDInfo/tables/MagazineFields.h"
@@ -133,54 +132,49 @@ double writeAmplification(const PropertyDict& snapshot) {
 
 }  // namespace
 
-PropertyDict CopySMagNANDFTLInfo(std::uint64_t hours, std::uint32_t deltaWanted,
-                                 std::uint32_t mode) noexcept {
-  return runEntryPoint(__func__, [&] {
-    PropertyDict result{{std::string(kIsStatMagSupportedKey), std::int32_t{0}}};
-    const std::optional<PropertyDict> newest = copyMagazineSnapshot(0);
-    std::optional<PropertyDict> old = copyMagazineSnapshot(hours);
-    if (newest) {
-      if (newest->contains(kMetaKey)) {
-        result.set(kIsStatMagSupportedKey,
-                   GetNumberFromDictionarySafe(*newest, kIsStatMagSupportedKey));
-      }
-      if (old) {
-        addDeltas(*newest, *old, deltaWanted != 0, mode, result);
-      }
-    } else if (old) {
-      result.merge(*std::move(old));
+PropertyDict gatherMagazineInfo(std::uint64_t hours, bool deltaWanted, std::uint32_t mode) {
+  PropertyDict result{{std::string(kIsStatMagSupportedKey), std::int32_t{0}}};
+  const std::optional<PropertyDict> newest = copyMagazineSnapshot(0);
+  std::optional<PropertyDict> old = copyMagazineSnapshot(hours);
+  if (newest) {
+    if (newest->contains(kMetaKey)) {
+      result.set(kIsStatMagSupportedKey,
+                 GetNumberFromDictionarySafe(*newest, kIsStatMagSupportedKey));
     }
-    result.merge(gatherORUFTLOtherData(newest ? &*newest : nullptr));
-    addAverageCycles(result);
-    result.set(kAPIErrorMessageKey, GetAPIErrorMessage());
-    return result;
-  });
+    if (old) {
+      addDeltas(*newest, *old, deltaWanted, mode, result);
+    }
+  } else if (old) {
+    result.merge(*std::move(old));
+  }
+  result.merge(gatherORUFTLOtherData(newest ? &*newest : nullptr));
+  addAverageCycles(result);
+  result.set(kAPIErrorMessageKey, GetAPIErrorMessage());
+  return result;
 }
 
-PropertyDict CopySMagNANDFTLCustomHistoryInfo(std::uint32_t skipHistory) noexcept {
-  return runEntryPoint(__func__, [&]() -> PropertyDict {
-    std::optional<PropertyDict> newer = copyMagazineSnapshot(0);
-    const Number* isSupported = newer ? newer->findNumber(kIsStatMagSupportedKey) : nullptr;
-    if (isSupported != nullptr && isSupported->asInt32() == 0) {
-      return {{std::string(kNANDInfoErrorMessageKey), GetAPIErrorMessage()}};
-    }
-    PropertyDict history;
-    if (skipHistory != 0) {
-      return history;
-    }
-    std::uint64_t hours = 0;
-    for (const std::string_view name : kHLT_instantaneous_gc_wamp_array) {
-      hours += kHoursPerPeriod;
-      std::optional<PropertyDict> older = copyMagazineSnapshot(hours);
-      if (newer && older && collectedGarbage(*newer, *older)) {
-        history.set(name, writeAmplification(*older));
-      } else {
-        history.set(name, std::int32_t{0});
-      }
-      newer = std::move(older);
-    }
+PropertyDict gatherMagazineHistory(bool skipHistory) {
+  std::optional<PropertyDict> newer = copyMagazineSnapshot(0);
+  const Number* isSupported = newer ? newer->findNumber(kIsStatMagSupportedKey) : nullptr;
+  if (isSupported != nullptr && isSupported->asInt32() == 0) {
+    return {{std::string(kNANDInfoErrorMessageKey), GetAPIErrorMessage()}};
+  }
+  PropertyDict history;
+  if (skipHistory) {
     return history;
-  });
+  }
+  std::uint64_t hours = 0;
+  for (const std::string_view name : kHLT_instantaneous_gc_wamp_array) {
+    hours += kHoursPerPeriod;
+    std::optional<PropertyDict> older = copyMagazineSnapshot(hours);
+    if (newer && older && collectedGarbage(*newer, *older)) {
+      history.set(name, writeAmplification(*older));
+    } else {
+      history.set(name, std::int32_t{0});
+    }
+    newer = std::move(older);
+  }
+  return history;
 }
 
 }  // namespace vesprun

@@ -1,12 +1,12 @@
-#include "vesprun/EventExtraction.h"
+#include "NANDInfo/events/ExtractionSteps.h"
 
 #include <array>
 #include <string>
 #include <utility>
 
-#include "NANDInfo/controller/EntryPoint.h"
 #include "NANDInfo/events/StorageEvents.h"
-#include "NANDInfo/parsers/APIErrorMessage.h"
+#include "NANDInfo/parsers/ErrorMessages.h"
+#include "platform/Platform.h"
 #include "telemetry/NVRAMStatistics.h"
 
 namespace vesprun {
@@ -58,30 +58,26 @@ std::optional<PropertyDict> runStep(std::uint32_t step) {
 
 }  // namespace
 
-std::optional<PropertyDict> NandInfoExtractToEH_runAllSteps(std::uint64_t /*context*/,
-                                                            bool allowMonthly,
-                                                            std::uint32_t collectResults,
-                                                            std::uint32_t firstStep) noexcept {
-  return runEntryPoint(__func__, [&]() -> std::optional<PropertyDict> {
-    PropertyDict results;
-    for (std::uint32_t step = firstStep; step < kEH_Extraction_Step_Names.size(); ++step) {
-      if (step == kMonthlyStep && !allowMonthly) {
-        logMessage(LogLevel::Default, "Skipping Stats Mag Monthly Delta");
-        break;
-      }
-      if (std::optional<PropertyDict> result = runStep(step)) {
-        results.merge(*std::move(result));
-      }
-      if (step == kMonthlyStep) {
-        break;
-      }
+std::optional<PropertyDict> runExtractionSteps(bool allowMonthly, bool collectResults,
+                                               std::uint32_t firstStep) {
+  PropertyDict results;
+  for (std::uint32_t step = firstStep; step < kEH_Extraction_Step_Names.size(); ++step) {
+    if (step == kMonthlyStep && !allowMonthly) {
+      logMessage(LogLevel::Default, "Skipping Stats Mag Monthly Delta");
+      break;
     }
-    if (collectResults == 0) {
-      return std::nullopt;
+    if (std::optional<PropertyDict> result = runStep(step)) {
+      results.merge(*std::move(result));
     }
-    results.set(kNANDInfoErrorMessageKey, GetAPIErrorMessage());
-    return results;
-  });
+    if (step == kMonthlyStep) {
+      break;
+    }
+  }
+  if (!collectResults) {
+    return std::nullopt;
+  }
+  results.set(kNANDInfoErrorMessageKey, GetAPIErrorMessage());
+  return results;
 }
 
 }  // namespace vesprun
