@@ -1,6 +1,9 @@
 #include "outbox/PtreeCommand.h"
 
+#include <iostream>
+
 #include "Command.h"
+#include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeReader.h"
 
 namespace vesprun {
@@ -12,7 +15,7 @@ void printPtree(const std::string& file) {
   if (!value) {
     throw CommandFailure(inputName(file) + ": " + error);
   }
-  printJson(*value);
+  std::cout << jsonText(*value) << '\n';
 }
 
 }  // namespace

@@ -124,58 +124,9 @@ std::string jsonText(const PropertyDict& dict) {
   return text;
 }
 
-void to_json(Json& json, const Number& number) {
-  if (!number.isFloatingPoint()) {
-    json = number.isSigned() ? Json(number.asInt64()) : Json(number.asUInt64());
-    return;
-  }
-  const double real = number.asDouble();
-  if (!std::isfinite(real)) {
-    json = {{"real", textForm(number)}};
-    return;
-  }
-  if (number.kind() == NumberKind::Double) {
-    json = real;
-    return;
-  }
-  char digits[32];
-  const char* end = std::to_chars(digits, digits + sizeof digits, static_cast<float>(real)).ptr;
-  double fewestDigits = real;
-  std::from_chars(digits, end, fewestDigits);
-  json = {{"float", fewestDigits}};
-}
-
-void to_json(Json& json, const PropertyDict& dict) {
-  json = Json::object();
-  auto& entries = json.get_ref<Json::object_t&>();
-  entries.reserve(dict.size());
-  for (const auto& [key, entry] : dict) {
-    entries.emplace_back(std::string(key), entry);  // the library would look for the key first
-  }
-}
-
-void to_json(Json& json, const PropertyValue& value) {
-  if (const PropertyDict* dict = value.dict()) {
-    to_json(json, *dict);
-  } else if (const PropertyArray* array = value.array()) {
-    json = Json::array();
-    for (const PropertyValue& element : *array) {
-      json.emplace_back(element);
-    }
-  } else if (const std::string* string = value.string()) {
-    json = *string;
-  } else if (const Number* number = value.number()) {
-    to_json(json, *number);
-  } else if (const bool* boolean = value.boolean()) {
-    json = *boolean;
-  } else if (const Bytes* data = value.data()) {
-    std::string text;
-    appendBase64(*data, text);
-    json = {{"data", std::move(text)}};
-  } else {
-    json = {{"date", dateText(value.date() != nullptr ? *value.date() : Date{})}};
-  }
-}
+void to_json(Json& json, const PropertyValue& value) { json = Json::parse(jsonText(value)); }
+void to_json(Json& json, const PropertyDict& dict) { json = Json::parse(jsonText(dict)); }
+void to_json(Json& json, const Number& number) { to_json(json, PropertyValue(number)); }
 
 std::string jsonText(const Json& json) {
   return json.dump(-1, ' ', false, Json::error_handler_t::replace);

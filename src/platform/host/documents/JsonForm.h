@@ -22,7 +22,7 @@ using Json = nlohmann::ordered_json;
 /// Bytes of a string that are not UTF-8 become U+FFFD.
 std::string jsonText(const Json& json);
 
-// The same, written without the library, whose objects allocate even when they are destroyed: the
+// Values are written without the library, whose objects allocate even when they are destroyed: the
 // job must outlive memory that runs out.
 std::string jsonText(const PropertyValue& value);
 std::string jsonText(const PropertyDict& dict);
@@ -30,7 +30,7 @@ std::string jsonText(const PropertyDict& dict);
 void appendJsonText(std::string_view string, std::string& text);
 
 /// What the library calls for a value that becomes JSON; so an initializer of `Json` may hold
-/// values.
+/// values. They are read from the text above, the only form that is written.
 void to_json(Json& json, const PropertyValue& value);
 void to_json(Json& json, const PropertyDict& dict);
 void to_json(Json& json, const Number& number);
