@@ -70,7 +70,7 @@ struct EntryMetadata {
   static EntryMetadata read(const PropertyDict* options, const PropertyDict* about);
 };
 
-/// The first option that nothing reads in a list of that kind; null when there is none.
+/// The first option that nothing reads in a list of that kind, or null.
 template <typename Options>
 const std::string* unreadOption(const PropertyDict& options) {
   for (const auto& [name, value] : options) {

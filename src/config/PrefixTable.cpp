@@ -11,7 +11,8 @@ std::size_t commonLength(std::string_view left, std::string_view right) {
   return static_cast<std::size_t>(end - left.begin());
 }
 
-/// The first eight bytes as a number that orders as the text does; a shorter text may tie.
+/// The first eight bytes as a number that orders as the text does; a shorter text may compare
+/// equal.
 std::uint64_t head(std::string_view text) {
   std::uint64_t bytes = 0;
   if (text.size() >= sizeof bytes) {
@@ -61,7 +62,7 @@ const PrefixTable::Entry* PrefixTable::nearest(std::string_view key) const {
     return nullptr;
   }
   const std::uint64_t sought = head(key.substr(_common.size()));
-  // Without branches, which a processor could not foresee.
+  // Branch-free: a processor could not predict the branches.
   const std::uint64_t* last = _heads.data();
   for (std::size_t rest = _heads.size(); rest > 1; rest -= rest / 2) {
     const std::uint64_t* const middle = last + rest / 2;

@@ -33,7 +33,7 @@ class PrefixTable {
   };
 
   /// The last prefix that is not above the key, or another one that begins with all prefixes of
-  /// the key; null when there is none.
+  /// the key; or null.
   const Entry* nearest(std::string_view key) const;
 
   std::vector<Entry> _sorted;

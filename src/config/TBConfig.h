@@ -60,7 +60,7 @@ class TBConfig {
     return decision;
   }
 
-  /// The groups, in document order, that do not count on this device although their lists of that
+  /// The groups, in document order, that are disabled on this device although their lists of that
   /// kind name the key, or else a prefix of it.
   template <typename Options>
   std::vector<PassedOverGroup> groupsPassedOver(std::string_view key) const;

@@ -10,11 +10,11 @@ namespace vesprun {
 struct WhitelistKeyGroup {
   enum class Standing { Taken, InternalDevicesOnly, DisabledByTasking };
 
-  /// On an internal device every group counts. On others "InternalTesting" does not, nor a group
+  /// On an internal device every group applies. On others "InternalTesting" does not, nor a group
   /// with a false preference in "com.quill.da".
   Standing standing(bool isInternalDevice) const;
 
-  /// True for the name of the group that counts on internal devices alone.
+  /// True for the name of the group that applies to internal devices only.
   static bool isForInternalDevices(std::string_view name) { return name == "InternalTesting"; }
 
   std::string_view name;       ///< a key of the document, with its zero byte behind it

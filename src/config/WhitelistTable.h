@@ -34,7 +34,7 @@ struct WhitelistDecision {
   std::string_view prefix;                         ///< DecidedBy::Prefix
   const WhitelistEntry<Options>* entry = nullptr;  ///< DecidedBy::Key and Prefix
 
-  /// The options with which the key leaves, or null when it stays.
+  /// The options that apply when the key leaves the device; null if it must not.
   const Options* options() const {
     static constexpr Options kNoOptions;
     if (by == DecidedBy::InternalDevice) {
@@ -43,12 +43,12 @@ struct WhitelistDecision {
     return entry != nullptr && entry->options ? &*entry->options : nullptr;
   }
 
-  /// The last group that counts and names the key or its prefix.
+  /// The last enabled group that names the key or its prefix.
   std::optional<PropertyValue> group() const {
     return entry != nullptr ? std::optional<PropertyValue>(entry->group) : std::nullopt;
   }
 
-  /// The options as they stand in the whitelist; nothing also when they are not a dictionary.
+  /// The options as written in the whitelist; empty if they are not a dictionary.
   std::optional<PropertyValue> writtenOptions() const {
     if (by == DecidedBy::InternalDevice) {
       return PropertyDict();
@@ -58,7 +58,7 @@ struct WhitelistDecision {
   }
 };
 
-/// The keys and prefixes of one kind, scalars or distributions, from the groups that count.
+/// The keys and prefixes of one kind, scalars or distributions, from the enabled groups.
 template <typename Options>
 class WhitelistTable {
  public:

@@ -12,7 +12,7 @@
 namespace vesprun {
 namespace {
 
-constexpr int kMostFailures = 100;  // of the main loop, in a row
+constexpr int kMaxFailures = 100;  // of the main loop, in a row
 constexpr std::string_view kServiceName = "com.quill.aggregated.vesprun";
 
 void runOption(const char* argument) {
@@ -46,7 +46,7 @@ void runListenerMode(double quietSeconds) {
   });
   auto result = MainLoop::SliceResult::HandledEvent;
   // A failed slice has probably used up its event, such as a message too large to read.
-  for (int failures = 0; result == MainLoop::SliceResult::HandledEvent && failures < kMostFailures;
+  for (int failures = 0; result == MainLoop::SliceResult::HandledEvent && failures < kMaxFailures;
        ++failures) {
     runGuarded([&] {
       result = platform().mainLoop().runMainLoopSlice(quietSeconds);

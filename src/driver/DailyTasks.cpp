@@ -10,9 +10,9 @@ namespace vesprun {
 namespace {
 
 /// Seconds: more than a day's work takes, but a stopped process must not block the others for ever.
-constexpr double kLongestWaitForOthers = 300;
+constexpr double kMaxWaitForOthers = 300;
 
-bool lockDailyWork() { return platform().fileSystem().lockDailyWork(kLongestWaitForOthers); }
+bool lockDailyWork() { return platform().fileSystem().lockDailyWork(kMaxWaitForOthers); }
 
 std::int32_t yesterday() { return dayBefore(platform().tallybook().TBDaysSince1970()); }
 

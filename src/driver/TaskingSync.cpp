@@ -119,7 +119,7 @@ void applyTasking(const OptionalValue& tasking, const OptionalValue& build, Doma
   changed.emplace(kOwnDomain);
 }
 
-/// The own domain last: it says what was applied.
+/// Our own domain last: it records what was applied.
 void synchronize(DomainSet changed) {
   platform().systemConfiguration().synchronize();
   platform().servicesClient().synchronizeAllUsers();

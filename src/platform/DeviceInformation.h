@@ -73,7 +73,7 @@ class DeviceInformation {
   /// Loads the crash-report support library; false when it cannot be loaded.
   virtual bool loadSupportLibrary() = 0;
 
-  /// True when the loaded library has the function. Calls of it go to `Preferences`.
+  /// True when the loaded library has the function. It is called through `Preferences`.
   virtual bool supportLibraryOffers(std::string_view symbol) = 0;
 };
 

@@ -48,7 +48,7 @@ class DeviceRegistry {
   /// Opens a user client of type 0 for this process. On failure `connection` is 0.
   virtual RegistryResult DevRegServiceOpen(RegistryHandle service, RegistryHandle& connection) = 0;
 
-  /// Closes a connection, which is gone whatever the result. For 0 an error.
+  /// Closes a connection, even if the result is an error. 0 is an error.
   virtual RegistryResult DevRegServiceClose(RegistryHandle connection) = 0;
 
   /// Calls a method with a structure in and one out; either may be empty. On success `outputLength`

@@ -13,7 +13,7 @@ namespace vesprun {
 /// The endpoint that offers the usage feed.
 inline constexpr std::string_view kUsageServiceEndpoint = "com.quill.murmur.usage";
 
-/// The entry of a usage record with the date since which its counters count.
+/// The entry of a usage record with the date on which its counters started.
 inline constexpr std::string_view kUsageSinceKey = "since";
 
 /// The kind of name in a usage query.

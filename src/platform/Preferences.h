@@ -9,7 +9,7 @@
 // Stored values. A process sees its own change at once; it is written when it is synchronized, or
 // when the process ends. Setting nothing removes the key.
 //
-// Keys, domains and users may come from foreign data. A missing key, an empty (or missing) domain
+// Keys, domains and users may come from untrusted data. A missing key, an empty (or missing) domain
 // or user and an impossible name are refused with an error in the system log.
 
 namespace vesprun {
@@ -42,7 +42,7 @@ class Preferences {
                                       std::string_view domain) = 0;
 
   /// Writes the domain's changes durably and keeps those of other processes. False on failure: the
-  /// system log has the reason, and the changes stay for the next attempt.
+  /// system log says why, and the changes stay for the next attempt.
   virtual bool LGSPreferencesSynchronize(std::string_view domain) = 0;
 
   /// A number as a signed 64-bit integer, a boolean as 1 or 0, anything else as 0.

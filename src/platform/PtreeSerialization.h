@@ -11,7 +11,7 @@
 
 namespace vesprun {
 
-/// A dictionary, and behind its entries one more: an array of dictionaries that are made one at a
+/// A dictionary with one more entry at the end: an array of dictionaries that are made one at a
 /// time, since all of them together may need much memory.
 struct PtreeDocument {
   const PropertyDict& entries;

@@ -67,7 +67,7 @@ class Tallybook {
   virtual Date dateForDaysSince1970(std::int32_t day) = 0;
 
   /// Makes all collected writes durable. On failure they stay collected for the next checkpoint,
-  /// and the system log has the reason.
+  /// and the system log says why.
   virtual void TBClientCheckpoint() = 0;
 
   /// Sets a scalar of today.

@@ -23,8 +23,8 @@ class HistogramBoundaries {
   std::vector<double> _highest;  ///< running maximum of the boundaries; NaN before the first number
 };
 
-/// The index of the first boundary, in array order, that is not below `value`; n if there is none,
-/// as for NaN.
+/// The index of the first boundary, in array order, that is not below `value`; n without such a
+/// one, as for NaN.
 inline std::uint32_t determineHistBucketForValueWithIntervals(
     double value, const HistogramBoundaries& intervals) {
   // The running maximum is sorted, and first reaches a value where a boundary first does.

@@ -10,7 +10,7 @@ namespace vesprun {
 /// 28 memory statistics of the kernel; see docs/daily-log.md.
 void reportVMStats(TBReport& report);
 
-/// Their keys, whether or not this device has them.
+/// All their keys, including those that this device lacks.
 std::vector<std::string_view> vmStatisticKeys();
 
 }  // namespace vesprun

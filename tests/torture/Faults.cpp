@@ -36,7 +36,7 @@ Faults missingFrom(const std::vector<std::string>& wanted, const std::vector<std
 Faults judgeRun(const Outcome& outcome, bool killed, bool started, int worst) {
   Faults faults;
   if (outcome.late) {
-    faults.push_back("took longer than " + std::to_string(kLongestRun) + " seconds");
+    faults.push_back("took longer than " + std::to_string(kMaxRunSeconds) + " seconds");
   } else if (!killed && started && outcome.signal != 0) {
     faults.push_back(std::string("ended by a signal: ") + strsignal(outcome.signal) + "; " +
                      outcome.standardError);

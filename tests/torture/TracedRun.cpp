@@ -192,7 +192,7 @@ class TimeLimit {
     struct sigaction action {};
     action.sa_handler = [](int) { _expired = 1; };
     sigaction(SIGALRM, &action, nullptr);
-    alarm(kLongestRun);
+    alarm(kMaxRunSeconds);
   }
   TimeLimit(const TimeLimit&) = delete;
   TimeLimit& operator=(const TimeLimit&) = delete;

@@ -26,7 +26,7 @@ class TextFile {
 /// Replaces this process by a program; comes back when that fails.
 void runInstead(const std::vector<std::string>& command);
 
-/// What goes wrong during one run of a program.
+/// The fault injected into one run.
 struct Fault {
   enum class Kind {
     None,
@@ -77,6 +77,6 @@ bool transfersBytes(int number);
 std::string nameOfCall(int number);
 
 /// The longest time a run may take, in seconds.
-inline constexpr unsigned kLongestRun = 60;
+inline constexpr unsigned kMaxRunSeconds = 60;
 
 }  // namespace vesprun::torture

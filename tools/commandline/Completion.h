@@ -13,7 +13,7 @@ namespace vesprun {
 using Completer = std::function<std::vector<std::string>()>;
 
 /// Without a completer, a value called FILE, PATH or STORE is that of a file, and DIR of a folder.
-/// An exception of a completer means that there is none.
+/// A completer that throws completes nothing.
 void completeWith(CLI::Option* option, Completer completer);
 
 /// The command `completion SHELL`, which prints a script for that shell.

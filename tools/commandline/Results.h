@@ -25,8 +25,8 @@ std::size_t terminalWidth();
 /// Emphasized on a terminal, unless NO_COLOR is set.
 std::string emphasized(std::string_view text);
 
-/// Prints text for people, foreign bytes made printable, wrapped at words to the terminal's width.
-/// Lines but the first begin with `indentation` more spaces than the text itself.
+/// Prints text for people, untrusted bytes made printable, wrapped at words to the terminal's
+/// width. Lines but the first begin with `indentation` more spaces than the text itself.
 void printText(std::string_view text, std::size_t indentation = 0);
 
 /// Rows of text in columns that fit the terminal. Where it is too narrow, cells are wrapped, and at
@@ -41,7 +41,7 @@ class Table {
 
   explicit Table(std::vector<Column> columns) : _columns(std::move(columns)) {}
 
-  /// As many cells as columns; foreign bytes are made printable.
+  /// As many cells as columns; untrusted bytes are made printable.
   void addRow(std::vector<std::string> cells);
   bool empty() const { return _rows.empty(); }
 

@@ -78,10 +78,9 @@ std::unique_ptr<HostPlatform> openDeviceReadOnly(SystemLog& log, OwnersRights ri
 }
 
 FileDescriptor takeDailyWork(const DeviceDirectory& directory) {
-  constexpr std::chrono::minutes kLongestWait(5);
-  return *orFail([&](std::string& error) {
-    return lockFolder(directory.path(), error, LOCK_EX, kLongestWait);
-  });
+  constexpr std::chrono::minutes kMaxWait(5);
+  return *orFail(
+      [&](std::string& error) { return lockFolder(directory.path(), error, LOCK_EX, kMaxWait); });
 }
 
 FileDescriptor openInput(const std::string& file) {

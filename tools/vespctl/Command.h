@@ -21,7 +21,7 @@ void addDeviceOption(CLI::App& vespctl);
 std::string deviceDirectory();
 
 // A start as root goes on with the rights of the directory's owner once one of these opened it: a
-// FILE of the command line is opened before. They throw `CommandFailure` where there is no device,
+// FILE of the command line is opened before. They throw `CommandFailure` without a device,
 // or another user's that may not be changed.
 
 std::unique_ptr<HostPlatform> openDevice();

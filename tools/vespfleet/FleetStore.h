@@ -35,7 +35,7 @@ enum class Member { None, Build, Model, Whitelist };
 
 using MemberText = std::optional<std::string>;  ///< null sorts first
 
-/// Where a value comes from. Devices and texts are numbers of this store; 0 is no text.
+/// Where a value comes from. Devices and texts are numbers of this store; 0 means none.
 struct Origin {
   std::int32_t day = 0;
   std::int64_t device = 0;

@@ -50,7 +50,7 @@ constexpr std::int64_t kApplication = 0x76666C74;
 constexpr std::int64_t kPageSize = 4096;
 
 // One load waits for another, which commits batch by batch.
-constexpr std::chrono::minutes kLongestWait{5};
+constexpr std::chrono::minutes kMaxWait{5};
 
 constexpr int kMaxCell = 256 * 1024 * 1024;  // a chunk of lines that are as long as they may be
 
@@ -89,7 +89,7 @@ void SqliteStore::open(StoreUse use, std::optional<int> least) {
   }
   bool isEarlier = false;
   try {
-    _database = std::make_unique<SqliteConnection>(_path, kLongestWait);
+    _database = std::make_unique<SqliteConnection>(_path, kMaxWait);
     sqlite3_limit(_database->handle(), SQLITE_LIMIT_LENGTH, kMaxCell);
     const std::string schema = _database->schema();
     const std::int64_t version = _database->queryInteger("PRAGMA user_version");

@@ -324,8 +324,8 @@ void SqliteStore::giveBackRoom() {
   }
 }
 
-/// Leaves out of a day's chunks what lines said that are no longer current. Labels of the others
-/// are added to `labels`.
+/// Removes the values of lines that are not current any more from a day's chunks. Labels of the
+/// others are added to `labels`.
 void SqliteStore::rewriteDay(std::int32_t day, std::set<std::int64_t>* labels) {
   const std::vector<Line> lines = linesOf(day, Member::None);
   std::set<std::int64_t> keys;

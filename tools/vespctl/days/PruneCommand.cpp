@@ -50,7 +50,7 @@ CounterStore::Rows removeCounters(HostPlatform& device, std::int64_t day, bool i
   };
   const auto remove = [&](CounterStore& store) {
     rows = store.removeBefore(day);
-    store.giveRoomBack();
+    store.returnFreeSpace();
     return true;
   };
   // A write without anything to remove would still lock the database, or even make it.
@@ -123,8 +123,8 @@ void prune(const Pruning& wanted) {
       logs.removeBefore({now.seconds - *wanted.outboxDays * kSecondsPerDay, now.nanoseconds});
     }
     if (wanted.outboxMebibytes) {
-      constexpr std::uint64_t kMost = std::numeric_limits<std::uint64_t>::max() / kBytesPerMebibyte;
-      logs.removeUntilBelow(std::min(*wanted.outboxMebibytes, kMost) * kBytesPerMebibyte);
+      constexpr std::uint64_t kMax = std::numeric_limits<std::uint64_t>::max() / kBytesPerMebibyte;
+      logs.removeUntilBelow(std::min(*wanted.outboxMebibytes, kMax) * kBytesPerMebibyte);
     }
     if (wanted.counterDays) {
       counters =

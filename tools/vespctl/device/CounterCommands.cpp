@@ -301,7 +301,7 @@ constexpr Command kCounterCommands[] = {
     {"add", "Adds to a scalar, wrapping in 64 bits", addScalarChange<true>},
     {"sample", "Adds values to a distribution", addSample},
     {"import", "Takes all lines of a dump, or none", addImport},
-    {"dump", "Prints counters as lines parted by tabs", addDump, Form::Own},
+    {"dump", "Prints counters as lines separated by tabs", addDump, Form::Own},
 };
 
 }  // namespace

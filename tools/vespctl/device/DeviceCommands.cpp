@@ -86,7 +86,7 @@ bool beginInit(const DeviceDirectory& directory) {
            .isOpen()) {
     throw CommandFailure(systemError(mark));
   }
-  // Before anything else is there: without the mark the folder would be a foreign one.
+  // Before anything else is there: without the mark the folder would be someone else's.
   orFail([&](std::string& error) { return flushFolder(directory.path(), error); });
   removeFile(description);
   // The sample's counters are added to those that are there.

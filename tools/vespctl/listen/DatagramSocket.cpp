@@ -79,7 +79,7 @@ std::unique_ptr<DatagramSocket> DatagramSocket::bind(const HostPath& path, std::
     return nullptr;
   }
   // Two that start at once must not both find the old socket abandoned.
-  if (!takeLock(folder.get(), LOCK_EX, kLongestLockWait, path.folder(), error)) {
+  if (!takeLock(folder.get(), LOCK_EX, kMaxLockWait, path.folder(), error)) {
     return nullptr;
   }
   bool fits = false;

@@ -57,7 +57,7 @@ double figure(const PropertyArray& statistics, std::size_t index) {
 }
 
 void showHistogram(std::ostream& out, const PropertyDict& histogram) {
-  constexpr double kLongestBar = 40;
+  constexpr double kMaxBarWidth = 40;
   double largest = 0;
   for (const auto& [label, count] : histogram) {
     largest = std::max(largest, count.number() != nullptr ? count.number()->asDouble() : 0.0);
@@ -65,9 +65,9 @@ void showHistogram(std::ostream& out, const PropertyDict& histogram) {
   const auto width = static_cast<int>(longestKey(histogram));
   for (const auto& [label, count] : histogram) {
     const double value = count.number() != nullptr ? count.number()->asDouble() : 0.0;
-    // The counts of a foreign log may be anything.
+    // The counts of an untrusted log may be anything.
     const double share = value > 0 ? value / largest : 0.0;
-    const auto length = share <= 1 ? static_cast<std::size_t>(std::ceil(share * kLongestBar)) : 0;
+    const auto length = share <= 1 ? static_cast<std::size_t>(std::ceil(share * kMaxBarWidth)) : 0;
     out << "      " << std::right << std::setw(width) << printableText(label) << "  "
         << std::string(length, '#') << ' ' << printableText(textForm(count)) << '\n';
   }

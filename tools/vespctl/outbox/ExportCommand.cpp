@@ -79,8 +79,8 @@ void addExportCommand(CLI::App& command) {
   command.add_option("--device", wanted->device, "A name instead of the device's pseudonym")
       ->type_name("NAME")
       ->check([](const std::string& name) -> std::string {
-        constexpr std::size_t kLongest = 255;
-        return !name.empty() && name.size() <= kLongest && isXmlText(name)
+        constexpr std::size_t kMax = 255;
+        return !name.empty() && name.size() <= kMax && isXmlText(name)
                    ? ""
                    : "a device's name has 1 to 255 bytes of text";
       });

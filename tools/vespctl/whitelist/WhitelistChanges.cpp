@@ -182,12 +182,11 @@ std::set<std::string_view> groupNames(const WhitelistDocument& document) {
 }  // namespace
 
 Effect effectOf(const ScalarOptions& before, const ScalarOptions& after) {
-  // Both sizes grow with what is told: 0 is the largest interval, and none the smallest.
-  constexpr std::uint64_t kMost = std::numeric_limits<std::uint64_t>::max();
+  // Both sizes grow with how much a value tells: 0 is the largest interval, and none the smallest.
+  constexpr std::uint64_t kMax = std::numeric_limits<std::uint64_t>::max();
   const auto ofInterval = [](const ScalarOptions& options) {
     return options.bucketInterval
-               ? std::pair(0,
-                           *options.bucketInterval == 0 ? 0 : kMost - *options.bucketInterval + 1)
+               ? std::pair(0, *options.bucketInterval == 0 ? 0 : kMax - *options.bucketInterval + 1)
                : std::pair(1, std::uint64_t{0});
   };
   const auto ofDigits = [](const ScalarOptions& options) {

@@ -29,7 +29,7 @@ std::string placeOf(const WhitelistFinding& finding, const std::string& file);
 /// What is wrong or useless in a whitelist document, in its order. It is judged as if no group were
 /// switched off; "InternalTesting", which most devices skip, neither covers nor replaces entries of
 /// other groups. `required` names the metadata that each entry needs; what expired before the day
-/// `today` is told.
+/// `today` is a finding.
 std::vector<WhitelistFinding> checkWhitelist(const WhitelistDocument& document, std::int32_t today,
                                              const std::vector<std::string>& required = {});
 

@@ -72,7 +72,7 @@ bool withKindOfList(std::string_view list, const Take& take) {
 /// The options for people: "bucket_interval 10, sig_fig 2".
 std::string optionsText(const PropertyDict& read, bool areOfDistribution);
 
-/// A text cut in the middle when it is long, since foreign texts may be of any length.
+/// A text cut in the middle when it is long, since untrusted texts may be of any length.
 std::string shortened(std::string_view text);
 
 inline std::string inQuotes(std::string_view text) { return '"' + shortened(text) + '"'; }

@@ -24,7 +24,7 @@ constexpr std::array kCompanions{"-journal", "-wal", "-shm"};
 
 constexpr const char* kWhyAside = "corrupt";
 
-constexpr int kMostAttempts = 3;
+constexpr int kMaxFileAttempts = 3;
 
 CounterTrouble troubleOf(const SqliteFailure& failure) {
   return failure.isBusy()                         ? CounterTrouble::Busy
@@ -84,7 +84,7 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
       return false;
     }
     if (!(status = path.status())) {
-      if (errno != ENOENT || attempt == kMostAttempts) {
+      if (errno != ENOENT || attempt == kMaxFileAttempts) {
         error = systemError(path);
         return false;
       }
@@ -131,7 +131,7 @@ bool CounterFile::make(std::string& error, CounterTrouble& trouble) {
   return false;
 }
 
-// The file gets its name complete, so an empty one is never ours.
+// The file is named only when it is complete, so an empty one is never ours.
 bool CounterFile::makeLocked(std::string& error) {
   const HostPath folder = _directory.hostPath(kFolder);
   const HostPath path = folder.below(kName);
@@ -212,7 +212,7 @@ bool removeOldDamaged(const DeviceDirectory& directory, const Date& time, std::s
   if (!names) {
     return false;
   }
-  // A time and, in one second, a number.
+  // The time, and a number among those of one second.
   using Place = std::pair<std::string, int>;
   std::map<std::string, Place> places;
   Place newest;

@@ -16,8 +16,8 @@ namespace vesprun {
 namespace {
 
 constexpr std::size_t kWrittenPiece = 256 * 1024;
-constexpr std::size_t kLongestLine = 2 * 1024 * 1024;  // the longest key fits
-constexpr std::size_t kMostBufferedBytes = 32 * 1024 * 1024;
+constexpr std::size_t kMaxLineSize = 2 * 1024 * 1024;  // the longest key fits
+constexpr std::size_t kMaxBufferedBytes = 32 * 1024 * 1024;
 
 /// Collects samples by key, so that alternating keys reach the tables as runs.
 class SampleBuffer {
@@ -37,7 +37,7 @@ class SampleBuffer {
     }
     _current->second.push_back(sample);
     _size += sizeof sample;
-    if (_size > kMostBufferedBytes) {
+    if (_size > kMaxBufferedBytes) {
       flush();
     }
     return true;
@@ -126,7 +126,7 @@ bool parseLine(std::string_view text, CounterLine& line, std::string& error) {
 template <typename Take>
 bool forEachLine(std::istream& lines, std::string& error, const LineStep& step, const Take& take) {
   using Result = LineReader::Result;
-  LineReader reader(lines, kLongestLine);
+  LineReader reader(lines, kMaxLineSize);
   const auto fail = [&](const std::string& cause) {
     error = "line " + std::to_string(reader.number()) + ": " + cause;
     return false;

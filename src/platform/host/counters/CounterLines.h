@@ -12,7 +12,7 @@
 
 namespace vesprun {
 
-// Counters as lines of text with fields parted by tabs:
+// Counters as lines of text with fields separated by tabs:
 //
 //   scalar DAY KEY VALUE
 //   sample DAY KEY VALUE OFFSET

@@ -15,8 +15,8 @@ namespace {
 
 constexpr std::int64_t kApplicationIdentifier = 0x56455350;  // "VESP"
 constexpr std::int64_t kSchemaVersion = 1;
-constexpr int kNewestFormat = 2;  // of SQLite's files
-constexpr std::size_t kLongestKey = 1024 * 1024;
+constexpr int kMaxFormatVersion = 2;  // of SQLite's files
+constexpr std::size_t kMaxKeySize = 1024 * 1024;
 
 // Pages of 16 KiB: a chunk of samples is read by few calls. Files are compared with this text,
 // spaces included.
@@ -81,7 +81,7 @@ bool isCounterKey(std::string_view key, std::string& error) {
             ", what no ptree document can carry";
     return false;
   }
-  if (key.size() > kLongestKey) {
+  if (key.size() > kMaxKeySize) {
     error = "the key " + quotedText(key) + " is longer than 1 MiB";
     return false;
   }
@@ -130,7 +130,7 @@ void CounterStore::open() {
     _connection.failAsCorrupt("not a counter database of this version");
   }
   // SQLite takes an unknown format version for a database of the future and never writes to it.
-  if (_connection.formatVersion() > kNewestFormat) {
+  if (_connection.formatVersion() > kMaxFormatVersion) {
     _connection.failAsCorrupt("the header is damaged");
   }
   _connection.execute(_access == Access::Writing ? "BEGIN IMMEDIATE" : "BEGIN");
@@ -339,7 +339,7 @@ void CounterStore::removeRows(const std::string& condition, std::int64_t day) {
   }
 }
 
-void CounterStore::giveRoomBack() {
+void CounterStore::returnFreeSpace() {
   constexpr std::int64_t kIncremental = 2;
   if (_connection.queryInteger("PRAGMA auto_vacuum") == kIncremental) {
     _connection.execute("PRAGMA incremental_vacuum");

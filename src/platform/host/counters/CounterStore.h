@@ -40,7 +40,7 @@ class CounterStore {
  public:
   static constexpr std::size_t kSamplesPerChunk = 4096;
 
-  /// Reading takes back a commit that was cut off; looking touches no file.
+  /// Reading rolls back an interrupted commit; looking never modifies a file.
   enum class Access { Looking, Reading, Writing };
 
   /// Opens an existing file, waiting `longestWait` at most for another process's lock.
@@ -87,9 +87,9 @@ class CounterStore {
   /// Removes all rows of a day.
   void removeDay(std::int32_t day);
 
-  /// Gives the room that removed rows left back to the file system. A file that was made without
-  /// room for the means to do so is written anew, for which all that was done before is committed.
-  void giveRoomBack();
+  /// Returns the space of removed rows to the file system. A file that was made without incremental
+  /// vacuum is rewritten with it, for which all that was done before is committed.
+  void returnFreeSpace();
 
   /// The next day after `day` with a row. `day` has 64 bits so that the first day can be asked for.
   std::optional<std::int32_t> nextDay(std::int64_t day);

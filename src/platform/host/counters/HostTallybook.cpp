@@ -171,7 +171,7 @@ bool HostTallybook::checkpoint(std::string& error, CounterTrouble* trouble) {
   return false;
 }
 
-/// Puts changes that were not written before those collected since. Without allocating: memory may
+/// Merges unwritten changes in front of those collected since. Without allocating: memory may
 /// just have run out.
 void HostTallybook::keepChanges(Changes& changes) {
   const std::scoped_lock guard(_pendingMutex);

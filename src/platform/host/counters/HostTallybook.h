@@ -37,7 +37,7 @@ class HostTallybook : public Tallybook {
   /// The references must outlive the object. An operation waits `longestWait` at most for other
   /// processes.
   HostTallybook(const DeviceDirectory& directory, Clock& clock, Preferences& preferences,
-                SystemLog& log, std::chrono::milliseconds longestWait = kLongestLockWait);
+                SystemLog& log, std::chrono::milliseconds longestWait = kMaxLockWait);
   /// Writes what is collected; an error line reports a loss.
   ~HostTallybook() override;
   HostTallybook(const HostTallybook&) = delete;
@@ -57,7 +57,8 @@ class HostTallybook : public Tallybook {
   bool addSample(std::string_view key, double value, std::string& error);
   bool checkpoint(std::string& error, CounterTrouble* trouble = nullptr);
 
-  // For tools. Each works at once, all or nothing; false, with a text in `error`, on failure.
+  // For tools. Each takes effect at once, all or nothing; false, with a text in `error`, on
+  // failure.
 
   /// Runs `work` in one transaction; after damage again on the same file, and at last on a new one.
   /// A false result undoes everything.

@@ -11,7 +11,7 @@
 
 namespace vesprun {
 
-/// Our own code of a failure: not damage, and nothing that this program can write to.
+/// Our own failure code: the file is sound, but this program must not write to it.
 inline constexpr int kWrittenByNewerProgram = SQLITE_SCHEMA;
 
 /// A failure of the database. Thrown and caught within this folder.
@@ -35,8 +35,8 @@ class SqliteConnection {
   /// Opens an existing file, for reading only if it cannot be written, or ":memory:". Waits
   /// `longestWait` at most for a lock. Throws `SqliteFailure`.
   ///
-  /// One that `looks` writes, creates and removes no file, not even beside the database. What would
-  /// need that fails: rolling back a commit that was cut off, reading a write-ahead log.
+  /// Opened with `looks`, it never writes, creates or removes a file, not even beside the database.
+  /// What would need that fails: rolling back a commit that was cut off, reading a write-ahead log.
   SqliteConnection(const std::string& path, std::chrono::milliseconds longestWait,
                    bool looks = false);
 
@@ -59,7 +59,7 @@ class SqliteConnection {
 
   sqlite3* handle() const { return _database.get(); }
 
-  /// A statement begins.
+  /// Call when a statement begins: it may do as much work again.
   void allowWork() const;
 
   [[noreturn]] void fail(int code) const;
@@ -79,7 +79,7 @@ class SqliteConnection {
   std::unique_ptr<sqlite3, Close> _database;
 };
 
-/// The file of a database that the statements make. Throws `SqliteFailure`.
+/// The bytes of a new database file that the statements create. Throws `SqliteFailure`.
 std::string newSqliteFile(const std::string& statements);
 
 /// What `SqliteConnection::schema` gives for such a file. Throws `SqliteFailure`.

@@ -399,10 +399,6 @@ void read(const Entry& entry, DeviceDescription& device) {
 
 std::optional<DeviceDescription> readDeviceDescription(const std::string& text,
                                                        std::string& error) {
-  if (text.size() > kLongestDeviceDescription) {
-    error = "longer than 16 MiB";
-    return std::nullopt;
-  }
   if (std::ranges::count_if(text, [](char c) { return c == ',' || c == '[' || c == '{'; }) >
       kMaxDescribedValues) {
     error = "more than 1,000,000 values";

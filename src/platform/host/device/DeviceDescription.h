@@ -150,8 +150,6 @@ struct DeviceDescription {
   DescribedAnswer<UsageDescription> usage;  ///< absent: an empty reply at once
 };
 
-/// In bytes: 16 MiB.
-inline constexpr std::size_t kLongestDeviceDescription = std::size_t{16} << 20;
 /// Values, and marks within texts that look like more of them: each takes far more memory than its
 /// text.
 inline constexpr std::ptrdiff_t kMaxDescribedValues = 1'000'000;

@@ -50,7 +50,8 @@ std::optional<Bytes> parseBase64(std::string_view text) {
   }
   const std::size_t padding = digits.ends_with("==") ? 2 : digits.ends_with('=') ? 1 : 0;
   data.resize(data.size() - std::min(padding, data.size()));
-  // Any fault in the text, such as a foreign character, is one that these bytes do not have.
+  // Any fault in the text, such as a character that is not base64, is one that these bytes do not
+  // have.
   std::string sound;
   appendBase64(data, sound);
   return sound == digits ? std::optional(std::move(data)) : std::nullopt;

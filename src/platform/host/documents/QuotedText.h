@@ -5,7 +5,7 @@
 
 namespace vesprun {
 
-/// Foreign text for a terminal, on one line: bytes of control characters and bytes that are not
+/// Untrusted text for a terminal, on one line: bytes of control characters and bytes that are not
 /// UTF-8 become "\xNN".
 std::string printableText(std::string_view text);
 

@@ -48,7 +48,7 @@ std::string placeOf(const LinuxFigure& figure) {
   return std::string(figure.file) + ' ' + std::string(figure.field);
 }
 
-/// The marks of the last time against the readings of this one.
+/// Compares the last collection's marks with this one's readings.
 class Collection {
  public:
   Collection(const Marks& last, FigureReadings readings)
@@ -158,7 +158,7 @@ class Collection {
   Marks _next;
   std::map<std::string, std::int64_t> _growths;
   std::map<std::string, std::int64_t> _gauges;
-  bool _isFirst = false;      ///< there are no marks yet
+  bool _isFirst = false;      ///< nothing is marked yet
   bool _isUnsure = false;     ///< the boot was known and is not now
   bool _goesOn = false;       ///< the marks are of this boot
   bool _isNewBoot = false;    ///< the last time was in an earlier boot

@@ -40,7 +40,7 @@ std::string_view nextLine(std::string_view& text) {
   return line;
 }
 
-/// The word of a text that a field names; empty when there is none.
+/// The word of a text that a field names; empty if the text lacks it.
 std::string_view fieldOf(std::string_view text, std::string_view field) {
   const std::size_t space = field.rfind(' ');
   const std::string_view label = space == std::string_view::npos ? "" : field.substr(0, space);
@@ -63,7 +63,7 @@ std::string_view fieldOf(std::string_view text, std::string_view field) {
   return {};
 }
 
-/// Reads a decimal number, without what stands behind its point, or a hexadecimal one after "0x".
+/// Reads a decimal number, without its fraction, or a hexadecimal one after "0x".
 std::optional<std::int64_t> numberOf(std::string_view word) {
   const bool isHexadecimal = word.starts_with("0x");
   const std::string_view digits = word.substr(isHexadecimal ? 2 : 0);

@@ -12,7 +12,7 @@ enum class FigureKind {
   Boots     ///< the identifier of the boot
 };
 
-/// One figure that Linux tells of itself.
+/// One figure that Linux reports.
 struct LinuxFigure {
   /// The file, with names of device classes such as "<disk>" as parts of its path.
   std::string_view file;
@@ -50,7 +50,7 @@ struct DeviceClass {
 extern const std::span<const LinuxFigure> linuxFigures;
 extern const std::span<const DeviceClass> linuxDeviceClasses;
 
-/// Tells whether a name is as one of the patterns says.
+/// True if a name matches one of the patterns.
 bool matchesPatterns(std::string_view name, std::string_view patterns);
 
 }  // namespace vesprun

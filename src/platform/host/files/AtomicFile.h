@@ -11,7 +11,7 @@
 
 namespace vesprun {
 
-/// A document on its way into a folder as ".unfinished-RANDOM". It appears under its own name
+/// A file being written, as ".unfinished-RANDOM" until it is done. It appears under its final name
 /// complete and durable, or not at all; destroying the object first drops it.
 ///
 /// Files are readable and writable for their owner alone. Errors name the path and the cause.
@@ -31,7 +31,7 @@ class AtomicFile {
   /// cannot be given away, it has no rights.
   void takeAccessOf(const struct stat& folder);
 
-  /// Instead of the moment of the last byte, where the file system can keep it.
+  /// Instead of the time of the last write, if the file system can store it.
   void setModificationTime(const Date& time) { _modified = time; }
 
   /// Gives the document its name, replacing the file that has it, and removes left-overs. On
@@ -72,7 +72,7 @@ bool replaceFile(const HostPath& path, std::string_view content, std::string& er
 /// Makes the content of a file durable, and its name.
 bool flushFile(const HostPath& path, std::string& error);
 
-/// Makes durable which names a folder has.
+/// Flushes a directory (fsync), so that its names are durable.
 bool flushFolder(const HostPath& folder, std::string& error);
 
 }  // namespace vesprun

@@ -26,7 +26,7 @@ inline std::string systemError(const std::string& path) {
 
 /// How long to wait for another process's lock: longer than any of ours works, but not for one that
 /// is stopped.
-inline constexpr std::chrono::milliseconds kLongestLockWait(20'000);
+inline constexpr std::chrono::milliseconds kMaxLockWait(20'000);
 
 /// Takes the lock (LOCK_SH or LOCK_EX) of the open file or folder at `path`, waiting `longestWait`
 /// at most. On failure `error` names the path; `busy`, if given, becomes true when another holder
@@ -38,7 +38,7 @@ bool takeLock(int descriptor, int operation, std::chrono::milliseconds longestWa
 /// it until the descriptor is closed. Nothing on failure, as `takeLock` reports it.
 std::optional<FileDescriptor> lockFolder(const HostPath& folder, std::string& error,
                                          int operation = LOCK_EX,
-                                         std::chrono::milliseconds longestWait = kLongestLockWait,
+                                         std::chrono::milliseconds longestWait = kMaxLockWait,
                                          bool* busy = nullptr);
 
 /// No document is larger; one that seems so may be all hole.

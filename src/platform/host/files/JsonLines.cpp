@@ -88,7 +88,7 @@ bool JsonLines::lock(std::string& error, int creating) {
       return false;
     }
     const bool locked = takeLock(_file.get(), LOCK_EX, _wait, _path, error);
-    // Only one line waits for whoever keeps the file; the others would together wait for ever.
+    // Only one line waits for whoever keeps the file; the rest would add up to an endless wait.
     _wait = locked ? _longestWait : std::chrono::milliseconds::zero();
     if (!locked) {
       return false;

@@ -29,16 +29,16 @@ class JsonLines {
  public:
   /// Waits `longestWait` at most for another process's lock; after one wait in vain, no longer at
   /// all until a line could be appended.
-  explicit JsonLines(HostPath path, std::chrono::milliseconds longestWait = kLongestLockWait)
+  explicit JsonLines(HostPath path, std::chrono::milliseconds longestWait = kMaxLockWait)
       : _path(std::move(path)), _longestWait(longestWait), _wait(longestWait) {}
 
-  /// Appends `line`, which holds no line feed. A partly written line is taken back; a torn line of
-  /// someone else is ended first. False, with the file in `error`, when the line is not there.
+  /// Appends `line`, which holds no line feed. A partly written line is removed again; a torn line
+  /// of someone else is ended first. False, with the file in `error`, when the line is not there.
   bool append(std::string line, std::string& error);
 
   /// Removes the lines that `goes` picks, and the first ones of a file that has more than
   /// `maxBytes`, all or none; those of other writers wait meanwhile. What is longer than `kMaxLine`
-  /// is no line and goes too. The number of lines that are gone, without those before the last
+  /// is not a line and goes too. The number of lines that are gone, without those before the last
   /// `kMaxLinesFile` bytes; nothing, with a text in `error`, when that failed.
   std::optional<std::uint64_t> remove(const std::function<bool(std::string_view line)>& goes,
                                       std::string& error, std::uint64_t maxBytes = kMaxLinesFile);
@@ -54,7 +54,7 @@ class JsonLines {
   bool isNamed() const;
   std::optional<std::uint64_t> removeLocked(const std::function<bool(std::string_view line)>& goes,
                                             std::uint64_t maxBytes, std::string& error);
-  /// Gives each line of the file that does not go to `keep`, with its end.
+  /// Passes each line that stays to `keep`, with its end.
   std::optional<std::uint64_t> sort(int file,
                                     const std::function<bool(std::string_view line)>& goes,
                                     std::uint64_t maxBytes,

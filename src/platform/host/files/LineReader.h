@@ -23,7 +23,7 @@ class LineReader {
   /// line over; `Failed` leaves the reason in `errno`.
   Result next(std::string_view& line);
 
-  /// The number of the line that `next` came to last, from 1.
+  /// The number of the last line read, from 1.
   std::uint64_t number() const { return _number; }
 
  private:

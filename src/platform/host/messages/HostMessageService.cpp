@@ -21,7 +21,7 @@ constexpr std::size_t kMaxPeers = 16;
 constexpr std::size_t kReceivedPiece = 64 * 1024;
 
 struct UnixPeer {
-  /// Grows with what a peer is worth: that it has sent a whole message, then when.
+  /// The least is displaced first: a peer without a whole message, then the one silent longest.
   auto worth() const { return std::pair(hasSentMessage, lastHeard); }
 
   FileDescriptor socket;

@@ -68,7 +68,7 @@ class Revisions {
  public:
   explicit Revisions(const DeviceDirectory& directory) : _directory(directory) {}
 
-  /// Once more when a log has gone since its folder was read: its note was written before.
+  /// Call again when a log has gone since its folder was read: its note was written before that.
   bool readNotes(std::string& error) {
     std::optional<std::vector<LogNote>> notes = readLogNotes(_directory, kPrunedFile, error);
     _notes = std::move(notes).value_or(std::vector<LogNote>());

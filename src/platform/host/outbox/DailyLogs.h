@@ -32,7 +32,7 @@ struct UnreadableLog {
 bool isDailyLogName(std::string_view name);
 
 /// Calls `take` with the daily logs in the outbox, by number. A log's revision is one more than the
-/// highest of its day so far, pruned logs included. Gives the files that are no daily logs;
+/// highest of its day so far, pruned logs included. Gives the files that are not daily logs;
 /// nothing, with a text in `error`, when the outbox cannot be read.
 std::optional<std::vector<UnreadableLog>> forEachDailyLog(
     const DeviceDirectory& directory, const std::function<void(DailyLog&& log)>& take,

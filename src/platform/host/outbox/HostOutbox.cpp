@@ -84,7 +84,7 @@ bool HostOutbox::LGSWriteLogForSubmission(std::string_view logType, std::string_
   return false;
 }
 
-/// Before the log is there: no log that is there lacks its note.
+/// Call before the log is there, so that every log has its note.
 void HostOutbox::noteSubmitted(const std::string& name, const Date& time) const {
   const auto textOrNull = [](std::string text) {
     return text.empty() ? std::nullopt : std::optional(std::move(text));

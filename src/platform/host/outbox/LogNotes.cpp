@@ -14,7 +14,7 @@
 namespace vesprun {
 namespace {
 
-/// The name in a note; null when the line is none.
+/// The name in a note; null when the line is something else.
 const std::string* nameIn(const Json& note) {
   const auto name = note.is_object() ? note.find("name") : note.end();
   return name != note.end() ? name->get_ptr<const std::string*>() : nullptr;

@@ -28,8 +28,8 @@ std::string stateOf(const DeviceDirectory& directory) {
          ' ' + std::to_string(pruned.st_size);
 }
 
-/// Gives the folder a modification time that no change leaves behind, since those are rounded to
-/// ticks of the system's clock. False when the file system cannot keep it.
+/// Sets a modification time of the folder that no change produces: changes are rounded to ticks of
+/// the system's clock. False when the file system cannot keep it.
 bool markFolder(const DeviceDirectory& directory) {
   const FileDescriptor folder = openFolder(directory.hostPath(kLogFolder));
   timespec times[2] = {{0, UTIME_OMIT}, {}};
@@ -84,7 +84,7 @@ bool LogNumbers::remember(std::uint64_t number, bool durably, std::string& error
     return false;
   }
   // Written in place and by one call: whenever the power goes, the old or the new number is there,
-  // and both are right. Nothing is flushed for the sake of a log.
+  // and both are right. Nothing is flushed just for a log.
   const std::string content = std::to_string(number) + ' ' +
                               (markFolder(_directory) ? stateOf(_directory) : "unknown") + '\n';
   if (pwrite(file.get(), content.data(), content.size(), 0) !=

@@ -21,7 +21,7 @@ namespace {
 
 constexpr std::array kLineFiles{kRecordsFile, kEventsFile, kNotificationsFile, kSystemLogFile};
 
-// A note on a removed log takes about as much.
+// About the size of a note on a removed log.
 constexpr std::uint64_t kNoteBytes = 120;
 
 /// True for a line that was written before `time`. One without a time stays.
@@ -64,7 +64,7 @@ std::uint64_t bytesOfFiles(const HostPath& folder, bool isTop = true) {
 struct LogPruning::Log {
   std::vector<std::string> files;  ///< the header last
   std::uint64_t bytes = 0;
-  Date written;  ///< of the header only when there is no log
+  Date written;  ///< of the header only when the log is missing
 };
 
 /// By number.

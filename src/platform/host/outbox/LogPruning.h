@@ -42,7 +42,7 @@ class LogPruning {
   /// How many lines of which file, by its name.
   const std::map<std::string, std::uint64_t>& removedLines() const { return _removedLines; }
 
-  /// What could not be done.
+  /// The failures.
   const std::vector<std::string>& problems() const { return _problems; }
 
  private:

@@ -14,7 +14,7 @@ struct PruneDays {
   std::optional<std::int64_t> removed;  ///< on which it last removed what was old
   std::optional<std::int64_t> doubted;  ///< that it has seen since and not believed
 
-  /// Nothing remembered when there is no file, or none of ours.
+  /// Nothing remembered without a file of ours.
   static PruneDays read(const DeviceDirectory& directory);
   bool write(const DeviceDirectory& directory, std::string& error) const;
 

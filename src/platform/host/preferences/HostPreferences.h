@@ -37,7 +37,7 @@ class HostPreferences : public Preferences {
   /// `longestWait` at most for another process's change in the folder.
   HostPreferences(const DeviceDirectory& device, Clock& clock, SystemLog& log,
                   std::string_view user = "mobile",
-                  std::chrono::milliseconds longestWait = kLongestLockWait);
+                  std::chrono::milliseconds longestWait = kMaxLockWait);
 
   /// Those in another folder, such as Library/Logsmith.
   HostPreferences(const DeviceDirectory& device, Clock& clock, SystemLog& log,
@@ -84,7 +84,7 @@ class HostPreferences : public Preferences {
   Clock& _clock;
   SystemLog& _log;
   std::string _folder;  ///< empty for a refused user
-  std::chrono::milliseconds _longestWait = kLongestLockWait;
+  std::chrono::milliseconds _longestWait = kMaxLockWait;
   std::mutex _mutex;
   std::map<std::string, Domain, std::less<>> _domains;
   std::set<std::string, std::less<>> _refused;  ///< domains

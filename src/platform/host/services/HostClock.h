@@ -17,7 +17,7 @@ class HostClock : public Clock {
       : _standingStillAt(standingStillAt), _timeZone(std::move(timeZone)) {}
 
   Date now() override;
-  /// A described zone stands in the process's TZ meanwhile: the C library knows no other way.
+  /// The described zone is in the process's TZ meanwhile: the C library knows no other way.
   std::string localDateText(const Date& date) override;
 
  private:

@@ -68,8 +68,8 @@ class HostMurmur final : public Murmur {
 
    private:
     void reply(const ReplyHandler& handler) {
-      constexpr double kLongestDelay = 1e8;  // three years; far more would overflow the clock
-      const std::chrono::duration<double> delay(std::min(_usage->delaySeconds, kLongestDelay));
+      constexpr double kMaxDelay = 1e8;  // three years; far more would overflow the clock
+      const std::chrono::duration<double> delay(std::min(_usage->delaySeconds, kMaxDelay));
       {
         std::unique_lock lock(_mutex);
         if (_endedChanged.wait_for(lock, delay, [this] { return _ended; })) {

@@ -18,7 +18,7 @@ using ::testing::AnyOf, ::testing::Contains, ::testing::ElementsAre, ::testing::
 constexpr const char* kFolder = "var/mobile/Library/Tallybook";
 constexpr const char* kFile = "var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
 constexpr std::int32_t kToday = 19787;
-constexpr std::int64_t kLargest = std::numeric_limits<std::int64_t>::max();
+constexpr std::int64_t kMax = std::numeric_limits<std::int64_t>::max();
 constexpr std::chrono::milliseconds kShortWait{50};
 
 class TallybookTest : public HostServiceTest {
@@ -82,14 +82,14 @@ TEST_F(TallybookTest, CollectsUntilTheCheckpointAndMakesNothingWithoutNeed) {
     EXPECT_EQ(dump(), "");
     tallybook.TBClientSetValueForScalarKey("second", 5);
     tallybook.TBClientAddValueForScalarKey("second", 2);
-    tallybook.TBClientAddValueForScalarKey("first", kLargest);
+    tallybook.TBClientAddValueForScalarKey("first", kMax);
     EXPECT_THAT(folder.names(), IsEmpty());
     tallybook.TBClientCheckpoint();
-    EXPECT_EQ(dump(), scalars(kLargest, 7));
+    EXPECT_EQ(dump(), scalars(kMax, 7));
     tallybook.TBClientAddValueForScalarKey("first", 1);
     tallybook.TBClientSetValueForScalarKey("second", -1);
   }
-  EXPECT_EQ(dump(), scalars(-kLargest - 1, -1));
+  EXPECT_EQ(dump(), scalars(-kMax - 1, -1));
   EXPECT_THAT(folder.names(kFolder), ElementsAre("TBDataStore.sqlitedb"));
   EXPECT_EQ(modeOf(kFile), mode_t{S_IFREG | 0600});
   EXPECT_THAT(log.messages, IsEmpty());
@@ -180,7 +180,7 @@ TEST_F(TallybookTest, GivesTheRoomOfRemovedDaysBack) {
       const CounterStore::Rows removed = store.removeBefore(20);
       EXPECT_THAT(removed.days, SizeIs(20));
       EXPECT_EQ(removed.distributions, 21);
-      store.giveRoomBack();
+      store.returnFreeSpace();
       store.setScalar(19, "later", 2);
       EXPECT_EQ(store.removeBefore(20).scalars, 1);
       return true;
