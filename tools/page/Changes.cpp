@@ -188,7 +188,7 @@ std::optional<Drift> driftOf(std::span<const DayValue> all) {
   const double kept = squares > 0 ? std::clamp(products / squares, 0.0, 0.9) : 0;
   const auto n = static_cast<double>(count);
   const double deviation = std::sqrt(n * (n - 1) * (2 * n + 5) / 18 * (1 + kept) / (1 - kept));
-  // It must also stand out of what days differ by.
+  // It must also be more than days differ by.
   const double scatter = std::sqrt(squares / n);
   drift.score = std::abs(ordered) / deviation;
   const bool isSeen = drift.score >= kMinDeviations && step >= kMinScatters * scatter &&

@@ -48,7 +48,7 @@ struct Drift {
 };
 
 /// Judges the course of the values as a whole: by how many pairs of days are in order (Kendall), as
-/// far as days are independent of those before them. Nothing when there is no drift.
+/// far as days are independent of those before them. Nothing without a drift.
 std::optional<Drift> driftOf(std::span<const DayValue> values);
 
 /// What a figure that only grows grew by on each day.

@@ -94,8 +94,8 @@ class Steps {
   bool _isDot = false;
 };
 
-/// Many points of one column of the grid make a line up and down in it: a path is no longer than
-/// the picture is wide.
+/// Many points of one column of the grid make a line up and down in it: a path is at most as long
+/// as the picture is wide.
 std::string lineThrough(const std::vector<Point>& points, double longestStep, const Scale& across,
                         const Scale& up) {
   Steps steps;

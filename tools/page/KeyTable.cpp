@@ -31,7 +31,7 @@ KeyTable::KeyTable(Period period, std::size_t keys, std::size_t textBytes)
   if (keys <= kTooManyKeys) {
     return;
   }
-  // What a page may have for all keys, without what else stands in it.
+  // What all keys together may take.
   constexpr std::size_t kMostBytes = 7'000'000;
   constexpr std::size_t kFigures = 16;
   constexpr std::size_t kMostColumns = 60;
@@ -80,7 +80,8 @@ Element KeyTable::row(const KeyCourse& course) const {
 Element KeyTable::textRow(const KeyCourse& course, std::size_t prefix) const {
   const bool isConstant = course.lowest == course.highest && course.ended.empty();
   const auto tab = [] { return Element::constant("\t"); };
-  Element row(std::vector<Element>{shownKey(course.key, prefix), tab(), course.newest, tab()});
+  Element row(std::vector<Element>{shownKey(course.key, prefix), tab(),
+                                   course.newest + (course.isUnusual ? " !" : ""), tab()});
   row.add(isConstant ? "" : course.lowest);
   row.add(tab());
   row.add(isConstant ? "" : course.highest);

@@ -12,7 +12,7 @@ namespace {
 
 using Level = ChangeItem::Level;
 
-// What is not a figure stands in this order, above figures and drifts.
+// The order above figures and drifts.
 constexpr double kRankOfFinding = 1e9;
 constexpr double kRankOfClock = 9e8;
 constexpr double kRankOfStorage = 8.5e8;
@@ -73,15 +73,17 @@ void addClock(std::vector<ChangeItem>& items, const PageData& data, const PageDa
 }
 
 void addBuilds(std::vector<ChangeItem>& items, const PageData& data, const PageDays& days) {
+  constexpr std::size_t kMostBytes = 60;
   const PageData::SystemDay* before = nullptr;
   for (const PageData::SystemDay& system : data.systems) {
     if (before != nullptr && system.day > days.newest() - kWeek && system.day <= days.newest()) {
-      items.push_back(
-          {kRankOfBuild + system.day, Level::Look,
-           before->model == system.model ? "Another build of the system" : "Another model or build",
-           "", before->model == system.model ? system.build : system.model + ' ' + system.build,
-           before->build + " until " + dayText(before->lastDay) + "; since " +
-               dayText(system.day)});
+      const std::string model =
+          before->model == system.model ? "" : cutInTheMiddle(system.model, kMostBytes) + ' ';
+      items.push_back({kRankOfBuild + system.day, Level::Look,
+                       model.empty() ? "Another build of the system" : "Another model or build", "",
+                       model + cutInTheMiddle(system.build, kMostBytes),
+                       cutInTheMiddle(before->build, kMostBytes) + " until " +
+                           dayText(before->lastDay) + "; since " + dayText(system.day)});
     }
     before = &system;
   }
@@ -114,9 +116,9 @@ Element firstDays(const PageDays& days) {
   return {"p",
           {{"class", "first"}},
           "It is too early to say what is unusual: a day is compared with at least " +
-              numeral(kMinDaysBefore) + " before it, and " +
-              countedNoun(days.reported.size(), "day") +
-              " is reported so far. With a report every " + "day this page begins to compare on " +
+              numeral(kMinDaysBefore) +
+              " before it. Reported so far: " + countedNoun(days.reported.size(), "day") +
+              ". With a report every " + "day this page begins to compare on " +
               dayText(days.newest() + static_cast<std::int32_t>(missing) + 1) + "."};
 }
 
@@ -162,7 +164,7 @@ void addOverview(Document& document, const PageAbout& about, const PageData& dat
     if (days.newest() < yesterday) {
       document.add({"p",
                     {},
-                    "The newest report is of " + dayText(days.newest()) + "; there is none of " +
+                    "The newest report is of " + dayText(days.newest()) + "; nothing is there of " +
                         daysText(days.newest() + 1, yesterday) + " yet."});
     }
     if (!days.areEnough()) {

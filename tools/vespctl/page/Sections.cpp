@@ -123,7 +123,7 @@ void addReports(Document& document, const PageData& data, const PageDays& days) 
   document.beginSection("reports", "Reports");
   document.add(unreadableFiles(data));
   if (days.isEmpty()) {
-    document.add({"p", {}, "There is no daily log in the outbox."});
+    document.add({"p", {}, "The outbox has no daily log."});
     return document.endSection();
   }
   const std::vector<double> reported(days.reported.begin(), days.reported.end());

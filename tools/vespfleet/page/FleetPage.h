@@ -6,8 +6,8 @@
 
 namespace vesprun {
 
-/// The whole HTML document of what the devices reported. Nothing on it is of fewer devices than the
-/// store's least number.
+/// The whole HTML document of what the devices reported. It only tells of at least as many devices
+/// as the store's least number says.
 std::string fleetPage(FleetStore& store, const std::string& title);
 
 }  // namespace vesprun
