@@ -63,7 +63,12 @@ void Senders::beginDay(std::int32_t day) {
 /// What is malformed is passed over: a sender then begins from 0.
 void Senders::readNote() {
   std::string error;
-  const auto note = valueFromJsonText(contentIfThere(notePath()), error);
+  bool isMissing = false;
+  const auto content = readWholeFile(notePath(), error, &isMissing);
+  if (!content && !isMissing) {
+    throw CommandFailure(error);
+  }
+  const auto note = valueFromJsonText(content.value_or(""), error);
   const PropertyDict* const root = note ? note->dict() : nullptr;
   const PropertyValue* const day = root != nullptr ? root->find("day") : nullptr;
   const PropertyDict* const users = root != nullptr ? root->findDict("keys") : nullptr;
