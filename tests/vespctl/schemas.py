@@ -1,0 +1,84 @@
+#!/usr/bin/env python3
+"""Holds what every command of the vespctl in argv[1] prints with --json against its schema."""
+import json, os, pathlib, re, subprocess, sys, tempfile
+import jsonschema
+
+vespctl = os.path.abspath(sys.argv[1])
+root = pathlib.Path(__file__).parents[2]
+schemas = {path.stem: json.loads(path.read_text()) for path in (root / "docs/schemas").iterdir()}
+store = {schema["$id"]: schema for schema in schemas.values()}
+folder = tempfile.TemporaryDirectory()
+os.chdir(folder.name)
+os.environ["VESPRUN_DEVICE"] = "device"
+
+
+def run(words, statuses=(0, 1)):
+    done = subprocess.run([vespctl, *words.split()], capture_output=True, text=True, check=False)
+    assert done.returncode in statuses, (words, done)
+    return done.stdout
+
+
+WHITELIST = """<ptree version="1.0"><dict><key>G</key><dict>
+<key>About</key><dict><key>owner</key><string>o</string><key>expires</key><date>2024-03-04T00:00:00Z</date></dict>
+<key>ScalarKeys</key><dict><key>a</key><dict><key>sig_fig</key><integer>%d</integer></dict><key>bad</key><true/></dict>
+<key>DistributionKeyPrefixes</key><dict><key>d.</key><dict><key>intervals</key><array><real>%d.5</real><real>inf</real></array></dict>
+</dict></dict></dict></ptree>"""
+for name, number in ("old", 1), ("new", 2):
+    pathlib.Path(name).write_text(WHITELIST % (number, number))
+pathlib.Path("empty").write_text('<ptree version="1.0"><dict/></ptree>')
+pathlib.Path("words").write_bytes(bytes(4096))
+run("init device --sample", (0,))
+for day in ("--day=yesterday", "--day=today"):
+    run(f"counters add a 17 {day}")
+    run(f"counters sample d.x {day} -- 1 -inf nan")
+run("run -- -d")
+run("collect")
+run("prefs set some.domain k {\"a\":[1,2.5,true,{\"real\":\"nan\"}]}")
+
+base = "device/controller/telemetry-0.bin"
+lines = {"show", "days", "whitelist-list", "counters-get"}
+checks = {
+    "status": ["status"],
+    "show": ["show"],
+    "days": ["days"],
+    "catch-up": ["counters add a 1 --day 3", "catch-up --last 99999 --dry-run"],
+    "prune": ["prune --counters 3 --outbox 0 --outbox-size 0 --dry-run"],
+    "preview": ["preview", "preview --day 0"],
+    "preview-left-out": ["preview --left-out"],
+    "explain": ["explain a", "explain d.x --kind distribution", "explain a --kind scalar"],
+    "whitelist-check": ["whitelist check", "whitelist check old --require reason"],
+    "whitelist-list": ["whitelist list", "whitelist list old"],
+    "whitelist-diff": ["whitelist diff old", "whitelist install old --force", "whitelist diff new"],
+    "whitelist-diff-documents": ["whitelist diff old new", "whitelist diff empty new"],
+    "counters-get": ["counters get *"],
+    "prefs-get": ["prefs get some.domain", "prefs get some.domain k", "prefs get none"],
+    "nand": [],
+    "decode-fields": [f"decode {layout} {base}" for layout in ("base", "ftl", "ftl-keys", "msp")],
+    "decode-words": ["decode counters-generic words"],
+    "decode-snapshot": ["decode snapshot --thread worker device/kernel/snapshot.bin"],
+    "property-value": [],
+}
+silent = {"init", "run", "collect", "listen", "counters set", "counters add", "counters sample",
+          "counters import", "prefs set", "prefs remove", "send logging",
+          "send apps", "send session", "send daily", "send raw"}
+
+manual = run(f"manual {root}/tools/vespctl/manual.md", (0,))
+with_json = {re.split(r" \[?[-A-Z]", usage)[0]
+             for usage in re.findall(r"^`vespctl (.*) \[--json\]`$", manual, re.M)}
+nand = sorted(words for words in with_json if words.startswith("nand "))
+checks["nand"] = [words + (" 24" if words == "nand magazine" else "") for words in nand]
+assert len(nand) > 15, nand
+assert set(checks) == set(schemas), set(checks) ^ set(schemas)
+seen = set()
+for name, commands in checks.items():
+    validator = jsonschema.Draft202012Validator(
+        schemas[name], resolver=jsonschema.RefResolver("", schemas[name], store))
+    validator.check_schema(schemas[name])
+    for words in commands:
+        printed = run(words + " --json").splitlines()
+        assert name in lines or len(printed) == 1 or words.startswith("counters add"), (words, printed)
+        for line in printed:
+            validator.validate(json.loads(line))
+        seen.add(words)
+for words in with_json - silent:
+    assert any((known + " ").startswith(words + " ") for known in seen), words + " has no schema"
