@@ -41,17 +41,39 @@ void needOneCommand(CLI::App& above) {
   });
 }
 
+/// Those of the command that the command line has come to.
+std::string knownOptions(const CLI::App& app) {
+  const CLI::App* command = &app;
+  while (!command->get_subcommands().empty()) {
+    command = command->get_subcommands().front();
+  }
+  std::string names;
+  for (const CLI::Option* option : command->get_options()) {
+    if (!option->get_positional()) {
+      names.append(names.empty() ? "; its options are " : ", ").append(option->get_name());
+    }
+  }
+  return names;
+}
+
 int parse(CLI::App& app, int argc, char** argv) {
   try {
     app.parse(argc, argv);
   } catch (const CLI::Success& help) {
     app.exit(help);
   } catch (const CLI::ParseError& error) {
-    complain(error.what());
+    const bool isUnknown = dynamic_cast<const CLI::ExtrasError*>(&error) != nullptr;
+    complain(error.what() + (isUnknown ? knownOptions(app) : std::string()));
     std::fprintf(stderr, "Try \"%s --help\".\n", invocation().command.c_str());
     return 2;
   }
-  if (!std::cout.flush() || std::fflush(stdout) != 0) {
+  if (!std::cout.flush()) {  // once more, for the reason
+    std::cout.clear();
+    errno = 0;
+    std::cout.put('\n').flush();
+    std::cout.setstate(std::ios::failbit);
+  }
+  if (!std::cout || std::fflush(stdout) != 0) {
     throw CommandFailure(std::string("standard output cannot be written: ") + std::strerror(errno));
   }
   return invocation().status;

@@ -8,6 +8,8 @@
 #include <iostream>
 #include <limits>
 #include <numeric>
+#include <streambuf>
+#include <utility>
 
 #include "commandline/Program.h"
 #include "platform/host/documents/QuotedText.h"
@@ -53,6 +55,19 @@ std::vector<std::string> wrapped(std::string_view text, std::size_t width) {
 }
 
 std::string spaces(std::size_t count) { return std::string(count, ' '); }
+
+/// The lines that a line becomes. Those but the first begin with `indentation` more spaces.
+std::string wrappedLine(std::string_view text, std::size_t indentation, std::size_t width) {
+  const std::size_t own = std::min(text.find_first_not_of(' '), text.size());
+  const std::size_t inner = width == kNoEnd ? kNoEnd : width - std::min(width, own + indentation);
+  std::string lines;
+  std::size_t before = own;
+  for (const std::string& line : wrapped(text.substr(own), inner)) {
+    lines.append(before, ' ').append(line) += '\n';
+    before = own + indentation;
+  }
+  return lines;
+}
 
 bool isPair(const Json& json) { return json.is_array() && json.size() == 2 && json[0].is_string(); }
 
@@ -107,16 +122,45 @@ std::string emphasized(std::string_view text) {
 }
 
 void printText(std::string_view text, std::size_t indentation) {
-  const std::string printable = printableText(text);
-  const std::size_t own = std::min(printable.find_first_not_of(' '), printable.size());
-  const std::size_t width = terminalWidth();
-  const std::size_t inner = width == kNoEnd ? kNoEnd : width - std::min(width, own + indentation);
-  std::size_t before = own;
-  for (const std::string& line : wrapped(std::string_view(printable).substr(own), inner)) {
-    std::cout << spaces(before) << line << '\n';
-    before = own + indentation;
-  }
+  std::cout << wrappedLine(printableText(text), indentation, terminalWidth());
 }
+
+class WrappedOutput::Lines final : public std::streambuf {
+ public:
+  Lines() : _below(std::cout.rdbuf(this)) {}
+  ~Lines() override {
+    if (!_line.empty()) {
+      _below->sputn(_line.data(), static_cast<std::streamsize>(_line.size()));
+    }
+    std::cout.rdbuf(_below);
+  }
+  Lines(const Lines&) = delete;
+  Lines& operator=(const Lines&) = delete;
+
+ protected:
+  int_type overflow(int_type byte) override {
+    if (byte == traits_type::eof()) {
+      return traits_type::not_eof(byte);
+    }
+    if (byte != '\n') {
+      _line += traits_type::to_char_type(byte);
+      return byte;
+    }
+    const std::string text = wrappedLine(std::exchange(_line, {}), 4, terminalWidth());
+    const auto size = static_cast<std::streamsize>(text.size());
+    return _below->sputn(text.data(), size) == size ? byte : traits_type::eof();
+  }
+  int sync() override { return _below->pubsync(); }
+
+ private:
+  std::streambuf* _below;
+  std::string _line;
+};
+
+WrappedOutput::WrappedOutput()
+    : _lines(terminalWidth() != kNoEnd ? std::make_unique<Lines>() : nullptr) {}
+
+WrappedOutput::~WrappedOutput() = default;
 
 void Table::addRow(std::vector<std::string> cells) {
   for (std::string& cell : cells) {

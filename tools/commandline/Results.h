@@ -1,6 +1,7 @@
 #pragma once
 
 #include <functional>
+#include <memory>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -28,6 +29,19 @@ std::string emphasized(std::string_view text);
 /// Prints text for people, untrusted bytes made printable, wrapped at words to the terminal's
 /// width. Lines but the first begin with `indentation` more spaces than the text itself.
 void printText(std::string_view text, std::size_t indentation = 0);
+
+/// As long as it lives, lines that go to standard output are wrapped as `printText` does.
+class WrappedOutput {
+ public:
+  WrappedOutput();
+  ~WrappedOutput();
+  WrappedOutput(const WrappedOutput&) = delete;
+  WrappedOutput& operator=(const WrappedOutput&) = delete;
+
+ private:
+  class Lines;
+  std::unique_ptr<Lines> _lines;  ///< null without a terminal
+};
 
 /// Rows of text in columns that fit the terminal. Where it is too narrow, cells are wrapped, and at
 /// last each row is shown as one "title: cell" below the other.

@@ -1,5 +1,8 @@
 #include "ReadOnlyDevice.h"
 
+#include <limits>
+#include <set>
+
 #include "platform/Platform.h"
 
 namespace vesprun {
@@ -17,6 +20,14 @@ bool forEachRow(std::int32_t first, std::int32_t last, const RowHandler& take,
              [&take](std::string_view key, std::int32_t, TBHistoryDistributionEnumerator&, bool&) {
                take(true, key);
              });
+}
+
+std::vector<std::string> countedKeys() {
+  const ReadOnlyDevice opened;
+  std::set<std::string, std::less<>> keys;
+  using Days = std::numeric_limits<std::int32_t>;
+  forEachRow(Days::min(), Days::max(), [&keys](bool, std::string_view key) { keys.emplace(key); });
+  return {keys.begin(), keys.end()};
 }
 
 }  // namespace vesprun

@@ -15,7 +15,9 @@
 
 #include "Command.h"
 #include "Complaints.h"
+#include "ReadOnlyDevice.h"
 #include "commandline/Arguments.h"
+#include "commandline/Completion.h"
 #include "commandline/Progress.h"
 #include "common/Calendar.h"
 #include "device/CounterRows.h"
@@ -165,7 +167,9 @@ class RepeatableLines {
 
   std::istream& again() {
     _lines.clear();
-    _lines.seekg(0);
+    if (!_lines.seekg(0)) {
+      throw CommandFailure(systemError("the lines cannot be read again"));
+    }
     return _lines;
   }
 
@@ -217,10 +221,14 @@ void importLines(const CounterArguments& arguments) {
         store.removeDay(day);
       }
     }
-    std::string cause;
-    const bool good = importCounterLines(lines.again(), store, cause,
-                                         [&progress](std::string_view) { progress.advance(); });
-    if (!good) {  // someone changed the file
+    std::string cause = "changed while it was read";
+    std::uint64_t taken = 0;
+    const auto step = [&](std::string_view) {
+      ++taken;
+      progress.advance();
+    };
+    const bool good = importCounterLines(lines.again(), store, cause, step) && taken == count;
+    if (!good) {
       error = inputName(arguments.file) + ": " + cause;
     }
     return good;
@@ -255,7 +263,7 @@ void dumpLines(const CounterArguments& arguments) {
 }
 
 void addKeyAndDay(CLI::App& command, CounterArguments& arguments) {
-  command.add_option("KEY", arguments.key)->required();
+  completeWith(command.add_option("KEY", arguments.key)->required(), countedKeys);
   addDay(command, "--day", arguments.day, "The day, instead of today");
 }
 

@@ -1,17 +1,19 @@
 #include "device/CounterRows.h"
 
+#include <algorithm>
 #include <cstdint>
 #include <limits>
 #include <optional>
-#include <set>
 #include <string_view>
 
 #include "Command.h"
 #include "Complaints.h"
+#include "ReadOnlyDevice.h"
 #include "commandline/Arguments.h"
 #include "commandline/Completion.h"
 #include "common/TextForm.h"
 #include "platform/host/counters/HostTallybook.h"
+#include "platform/host/figures/FigureTable.h"
 #include "report/TBReport.h"
 
 namespace vesprun {
@@ -33,6 +35,15 @@ std::string figuresText(const PropertyArray& statistics) {
   return "minimum " + textForm(statistics[0]) + ", maximum " + textForm(statistics[1]) + ", mean " +
          textForm(statistics[2]) + ", deviations " + textForm(statistics[3]) + ", count " +
          textForm(statistics[4]);
+}
+
+/// The unit that the table of figures has for a key; empty for any other.
+std::string_view unitOf(std::string_view key) {
+  const auto isOf = [key](const LinuxFigure& figure) {
+    return figure.key == key || (figure.key.ends_with('.') && key.starts_with(figure.key));
+  };
+  const auto figure = std::ranges::find_if(linuxFigures, isOf);
+  return figure == linuxFigures.end() || figure->unit == "count" ? "" : figure->unit;
 }
 
 /// The rows of one day, scalars before distributions, each by key.
@@ -74,8 +85,11 @@ void printRows(const WantedRows& wanted) {
       return;
     }
     const auto day = row["day"].get<std::int32_t>();
-    table.addRow({dateOfDay(day), std::to_string(day), row["kind"].get<std::string>(),
-                  row["key"].get<std::string>(), figures});
+    const auto key = row["key"].get<std::string>();
+    const std::string_view unit = unitOf(key);
+    const char* const before = row["kind"] == "scalar" ? " " : ", in ";
+    table.addRow({dateOfDay(day), std::to_string(day), row["kind"].get<std::string>(), key,
+                  unit.empty() ? figures : (figures + before).append(unit)});
   };
   const auto read = [&](CounterStore& store) {
     std::optional<std::int32_t> day = store.nextDay(std::int64_t{from} - 1);
@@ -99,30 +113,11 @@ void addGetCounters(CLI::App& command) {
       command
           .add_option("KEY", wanted->key, "The key, or with a * at its end the beginning of keys")
           ->required(),
-      counterKeys);
+      countedKeys);
   command.add_flag("--exact", wanted->isExact, "A * at the end belongs to the key");
   addDay(command, "--from", wanted->from, "The first day");
   addDay(command, "--to", wanted->to, "The last day");
   command.callback([wanted] { printRows(*wanted); });
-}
-
-std::vector<std::string> counterKeys() {
-  Complaints complaints;
-  const auto device = openDeviceReadOnly(complaints);
-  std::set<std::string, std::less<>> keys;
-  const auto read = [&keys](CounterStore& store) {
-    store.readScalars(
-        "", DayLimits::min(), DayLimits::max(),
-        [&keys](std::string_view key, std::int32_t, std::int64_t, bool&) { keys.emplace(key); });
-    store.readDistributions(
-        "", DayLimits::min(), DayLimits::max(),
-        [&keys](std::string_view key, std::int32_t, TBHistoryDistributionEnumerator&, bool&) {
-          keys.emplace(key);
-        });
-  };
-  std::string error;
-  device->counters().read(read, error);
-  return {keys.begin(), keys.end()};
 }
 
 }  // namespace vesprun

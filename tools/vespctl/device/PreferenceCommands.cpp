@@ -2,6 +2,7 @@
 
 #include "Command.h"
 #include "Complaints.h"
+#include "commandline/Completion.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/preferences/HostPreferences.h"
@@ -76,7 +77,20 @@ PreferenceArguments& addUser(CLI::App& command) {
 
 PreferenceArguments& addDomain(CLI::App& command) {
   PreferenceArguments& arguments = addUser(command);
-  command.add_option("DOMAIN", arguments.domain)->required();
+  completeWith(command.add_option("DOMAIN", arguments.domain)->required(), [&arguments] {
+    const DeviceDirectory directory = openDirectory(Access::Reading);
+    const HostPath folder = directory.hostPath("var/" + arguments.user + "/Library/Preferences");
+    std::vector<std::string> domains;
+    std::string error;
+    for (const std::string& name :
+         namesInFolder(folder, error).value_or(std::vector<std::string>())) {
+      constexpr std::string_view kEnd = ".ptree";
+      if (name.ends_with(kEnd) && !name.starts_with('.')) {
+        domains.push_back(name.substr(0, name.size() - kEnd.size()));
+      }
+    }
+    return domains;
+  });
   return arguments;
 }
 
