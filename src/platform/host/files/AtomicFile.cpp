@@ -66,7 +66,7 @@ bool AtomicFile::openUnfinished(std::string& error) {
   for (int attempt = 0; attempt < kMaxAttempts; ++attempt) {
     std::string name = unfinishedName();
     FileDescriptor file(openat(_folderDescriptor.get(), name.c_str(),
-                               O_CREAT | O_EXCL | O_WRONLY | O_CLOEXEC | O_NOFOLLOW, kOwnerOnly));
+                               O_CREAT | O_EXCL | O_WRONLY | O_CLOEXEC, kOwnerOnly));
     if (!file.isOpen()) {
       error = systemError(_folder);
       return false;
