@@ -3,7 +3,7 @@
 #include <sys/types.h>
 
 #include <filesystem>
-#include <map>
+#include <set>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -12,21 +12,18 @@
 
 namespace vesprun::torture {
 
-/// The programs under torture.
-struct Programs {
-  std::string vespctl;
-  std::string vesprun;  ///< works on the folder it is started in
-};
+/// What broke, a sentence each.
+using Faults = std::vector<std::string>;
 
 /// Days since 1970 of the first run; its report is that of the day before.
 inline constexpr int kFirstDay = 19787;
 
 /// What can be seen of a device from outside.
 struct Sight {
-  std::map<std::string, std::string> logs;  ///< name in the outbox to content
-  std::vector<std::string> counters;        ///< rows as `vespctl counters dump` writes them
-  std::vector<std::string> files;           ///< all other names
-  std::vector<std::string> faults;          ///< what must never be seen
+  /// A sentence for each counter, log, header, line and file. Lines of the system log are left out.
+  std::set<std::string> facts;
+  std::size_t dailyLogs = 0;
+  Faults faults;  ///< what must never be seen
 };
 
 /// A device directory with something to do for every step of the day, whose clock stands still, and
@@ -34,45 +31,42 @@ struct Sight {
 class Device {
  public:
   /// Sets the device up in a new folder.
-  Device(const Programs& programs, const std::filesystem::path& folder);
-  /// A copy of it in another folder, in place of what is there.
+  explicit Device(const std::filesystem::path& folder);
+  /// A copy of it below another folder, in place of what is there.
   Device(const Device& original, const std::filesystem::path& folder);
 
   const std::string& path() const { return _path; }
-  void setDay(int day);
-  /// Lays a JSON object over the device's description; null removes an entry.
-  void describe(const std::string& change);
 
-  /// The command line of `vespctl` for a command and its arguments, without the device.
-  std::vector<std::string> controlCommand(std::vector<std::string> words) const;
-  /// Runs it; its exit status, and what it printed in `output`.
-  int control(const std::vector<std::string>& words, std::string& output,
-              const std::string& input = {}) const;
-  /// The daily run, without a fault; its exit status.
-  int runDaily() const;
-  std::vector<std::string> dailyCommand() const { return {_programs->vesprun, "-d"}; }
+  /// The command line of words with a space between. "vesprun" is the job in the device's folder,
+  /// "library" a program that counts, everything else `vespctl` on the device. "@" is its folder.
+  std::vector<std::string> commandLine(const std::string& words) const;
+  /// Runs it; the exit status. What it printed goes to `output`. Changes from outside are steps,
+  /// too: "day N", "garbage FILE", "remove FILE", "stray-journal", "machines", "rows",
+  /// "without-controller".
+  int run(const std::string& words, std::string& output) const;
+  /// Runs each; a fault for each one that fails and does not begin with "?".
+  Faults run(const std::vector<std::string>& steps) const;
 
   /// Reads everything, and finds the faults that need no knowledge of what happened: half documents
-  /// and lines, keys that no list names, counters that cannot be read.
-  Sight look() const;
+  /// and lines, keys that no list names, counters that cannot be read. `numbered`: logs are told
+  /// apart by their numbers, and exported with their revisions.
+  Sight look(bool numbered) const;
 
  private:
-  const Programs* _programs;
+  void describe(const std::string& change) const;
   std::string _path;
 };
 
-/// A program that runs beside this one in `folder`, with `input` on its standard input, for a
-/// minute at most.
+/// A program that runs beside this one in `folder`, for a minute at most.
 class Companion {
  public:
-  Companion(const std::vector<std::string>& command, const std::string& folder,
-            const std::string& input = {});
+  Companion(const std::vector<std::string>& command, const std::string& folder);
   Companion(const Companion&) = delete;
   Companion& operator=(const Companion&) = delete;
   ~Companion() { status(); }
 
-  /// True when it ended within the time.
-  bool endsWithin(int milliseconds);
+  /// Comes back when it has ended or all its threads sleep, which is how a lock is waited for.
+  void endsOrWaits();
   /// Waits for its end; the exit status, -1 for a signal.
   int status();
   /// What it printed on both streams.
@@ -87,6 +81,9 @@ class Companion {
 
 /// True when an error's text ends where its reason should stand.
 bool lacksCause(std::string_view message);
+
+/// The program that "library" runs: counts with the C interface.
+int countWithLibrary(const char* directory);
 
 std::string readFile(const std::filesystem::path& path);
 void writeFile(const std::filesystem::path& path, const std::string& content);

@@ -16,6 +16,7 @@
 #include <cstring>
 #include <map>
 #include <set>
+#include <span>
 #include <stdexcept>
 
 #if !defined(__x86_64__)
@@ -39,6 +40,7 @@ const std::vector<CallRow>& callRows() {
   static const std::vector<CallRow> rows = {
       {SYS_access, "access", Paths::First, {EIO}},
       {SYS_openat, "openat", Paths::AtFirst, {EMFILE, EIO, ENOMEM}},
+      {SYS_openat2, "openat2", Paths::AtFirst, {EMFILE, EIO, ENOMEM}},
       {SYS_read, "read", Paths::Descriptor, {EIO}},
       {SYS_pread64, "pread64", Paths::Descriptor, {EIO}},
       {SYS_write, "write", Paths::Descriptor, {ENOSPC, EIO}},
@@ -101,27 +103,39 @@ std::string descriptorPath(pid_t process, std::uint64_t descriptor) {
              : linkTarget(folder + "/fd/" + std::to_string(descriptor));
 }
 
+/// What lies at the address in the traced process, as far as it can be read.
+std::string_view bytesAt(pid_t process, std::uint64_t address, std::span<char> buffer) {
+  const iovec local{buffer.data(), buffer.size()};
+  const iovec remote{reinterpret_cast<void*>(address), buffer.size()};  // NOLINT
+  const ssize_t got = process_vm_readv(process, &local, 1, &remote, 1, 0);
+  return {buffer.data(), static_cast<std::size_t>(std::max<ssize_t>(got, 0))};
+}
+
 std::string textAt(pid_t process, std::uint64_t address) {
   std::string text;
-  char piece[64];
+  char buffer[64];
   while (text.size() < PATH_MAX) {
     // Up to the end of the page: the next one may not be there.
-    const std::uint64_t wanted = std::min<std::uint64_t>(sizeof piece, 4096 - address % 4096);
-    const iovec local{piece, wanted};
-    const iovec remote{reinterpret_cast<void*>(address), wanted};  // NOLINT: the traced process's
-    const ssize_t got = process_vm_readv(process, &local, 1, &remote, 1, 0);
-    if (got <= 0) {
+    const std::size_t wanted = std::min<std::uint64_t>(sizeof buffer, 4096 - address % 4096);
+    const std::string_view piece = bytesAt(process, address, std::span(buffer).first(wanted));
+    text.append(piece.substr(0, piece.find('\0')));
+    if (piece.empty() || piece.find('\0') != piece.npos) {
       break;
     }
-    const auto length = static_cast<std::size_t>(got);
-    const auto* end = static_cast<const char*>(std::memchr(piece, 0, length));
-    text.append(piece, end == nullptr ? length : static_cast<std::size_t>(end - piece));
-    if (end != nullptr) {
-      break;
-    }
-    address += length;
+    address += piece.size();
   }
   return text;
+}
+
+/// Of a call that opens a file.
+std::uint64_t openingFlags(pid_t process, const user_regs_struct& registers) {
+  std::uint64_t flags = registers.orig_rax == SYS_openat ? registers.rdx : 0;
+  if (registers.orig_rax == SYS_openat2) {
+    char first[sizeof flags] = {};
+    bytesAt(process, registers.rdx, first);
+    std::memcpy(&flags, first, sizeof flags);
+  }
+  return flags;
 }
 
 std::string pathAt(pid_t process, std::uint64_t folder, std::uint64_t address) {
@@ -132,56 +146,76 @@ std::string pathAt(pid_t process, std::uint64_t folder, std::uint64_t address) {
   return path.front() == '/' ? path : descriptorPath(process, folder) + '/' + path;
 }
 
-/// Which bytes and names would be lost if the power went now. Lines of `.jsonl` files are appended
-/// without waiting for the disk, and the newest log number is only remembered to save a search.
+/// Which bytes and names would be lost if the power went now.
 class Durability {
  public:
   explicit Durability(std::string folder) : _folder(std::move(folder)) {}
 
-  void written(const std::string& path) {
-    if (counts(path)) {
-      _dirtyFiles.insert(path);
-    }
-  }
+  void written(const std::string& path) { addTo(_bytes, path); }
+  void made(const std::string& path) { addTo(_names, path); }
   void flushed(const std::string& path) {
-    _dirtyFiles.erase(path);
-    _dirtyFolders.erase(path);
+    _bytes.erase(path);
+    std::erase_if(_names, [&path](const std::string& name) { return folderOf(name) == path; });
   }
   void named(const std::string& from, const std::string& to) {
-    if (!counts(to)) {
-      return;
-    }
-    if (_dirtyFiles.erase(from) > 0) {
+    if (_bytes.erase(from) > 0) {
       _faults.push_back(to + " got its name before its bytes were flushed");
     }
-    _dirtyFolders.insert(to.substr(0, to.rfind('/')));
+    _names.erase(from);
+    made(to);
   }
   void removed(const std::string& path) {
-    _dirtyFiles.erase(path);
-    if (counts(path) && path.ends_with("-journal")) {  // its end is the end of the transaction
-      _dirtyFolders.insert(path.substr(0, path.rfind('/')));
+    _bytes.erase(path);
+    _names.erase(path);
+    if (path.ends_with("-journal")) {  // its end is the end of the transaction
+      made(path);
+    }
+    // What goes, and what is remembered of it.
+    static const std::pair<const char*, const char*> order[] = {
+        {"/outbox/logs/0", "/outbox/pruned.jsonl"},
+        {"/outbox/logs/0", kNumberFile},
+        {"/kernel/ecc/", "/outbox/records.jsonl"},
+    };
+    for (const auto& [goes, stays] : order) {
+      const std::string note = _folder + stays;
+      if (path.starts_with(_folder + goes) &&
+          (_bytes.contains(note) || _names.contains(note) || _names.contains(folderOf(note)))) {
+        _faults.push_back(path + " went before " + stays + " was flushed");
+      }
     }
   }
 
   std::vector<std::string> atTheEnd() {
-    for (const std::string& path : _dirtyFiles) {
-      _faults.push_back(path + " was written and never flushed");
-    }
-    for (const std::string& path : _dirtyFolders) {
-      _faults.push_back(path + " lost or gained a name and was never flushed");
+    // Lines are appended without waiting for the disk, and the number is found again by the logs.
+    const auto canGo = [this](const std::string& path) {
+      return path == _folder + kNumberFile ||
+             (path.ends_with(".jsonl") && !path.ends_with("/pruned.jsonl"));
+    };
+    for (const auto& [paths, what] :
+         {std::pair(&_bytes, " was written and never flushed"),
+          {&_names, " is a name made or removed whose folder was never flushed"}}) {
+      for (const std::string& path : *paths) {
+        if (!canGo(path)) {
+          _faults.push_back(path + what);
+        }
+      }
     }
     return _faults;
   }
 
  private:
-  bool counts(const std::string& path) const {
-    return path.starts_with(_folder + '/') && !path.ends_with(".jsonl") &&
-           !path.ends_with("/.log-number");
+  static constexpr const char* kNumberFile = "/outbox/.log-number";
+  static std::string folderOf(const std::string& path) { return path.substr(0, path.rfind('/')); }
+
+  void addTo(std::set<std::string>& paths, const std::string& path) {
+    if (path.starts_with(_folder + '/')) {
+      paths.insert(path);
+    }
   }
 
   std::string _folder;
-  std::set<std::string> _dirtyFiles;
-  std::set<std::string> _dirtyFolders;
+  std::set<std::string> _bytes;
+  std::set<std::string> _names;
   std::vector<std::string> _faults;
 };
 
@@ -214,14 +248,13 @@ void setRegisters(pid_t thread, user_regs_struct& registers) {
 }
 
 Call callOf(pid_t thread, const user_regs_struct& registers) {
-  Call call{static_cast<int>(registers.orig_rax), {}, 0};
+  Call call{static_cast<int>(registers.orig_rax), {}, false, 0};
   const CallRow* row = rowOf(call.number);
   switch (row == nullptr ? Paths::None : row->paths) {
     case Paths::None:
       break;
     case Paths::Descriptor:
       call.path = descriptorPath(thread, registers.rdi);
-      call.size = registers.rdx;
       break;
     case Paths::First:
       call.path = pathAt(thread, static_cast<std::uint64_t>(AT_FDCWD), registers.rdi);
@@ -289,12 +322,13 @@ class Tracer {
     int error;         ///< the answer, when the call is not made
     std::string from;  ///< of a call that gives a name: paths as they were before it
     std::string to;
+    bool makes;  ///< a name that was not there
   };
 
   void atEntry(pid_t thread) {
     user_regs_struct registers = registersOf(thread);
     Pending& pending = _pending[thread];
-    pending = {static_cast<int>(registers.orig_rax), 0, {}, {}};
+    pending = {static_cast<int>(registers.orig_rax), 0, {}, {}, false};
     ++_count;
     if (_fault.kind == Fault::Kind::None) {
       record(thread, registers, pending);
@@ -304,12 +338,15 @@ class Tracer {
       limitGrowth(thread, registers, pending);
       return;
     }
-    if (_count < _fault.call || _outcome.happened ||
+    if (_count < _fault.call || (_outcome.happened && !_fault.lasts) ||
         (_fault.number >= 0 && _fault.number != pending.number)) {
       return;
     }
-    const Call call = callOf(thread, registers);
-    _outcome.place = nameOfCall(call.number) + ' ' + call.path;
+    if (_outcome.place.empty()) {
+      const Call call = callOf(thread, registers);
+      const bool looks = (openingFlags(thread, registers) & O_PATH) != 0;
+      _outcome.place = (looks ? "look at " : nameOfCall(call.number) + ' ') + call.path;
+    }
     if (_fault.kind == Fault::Kind::Error) {
       replaceCall(thread, registers, pending, _fault.error);
     } else if (_fault.kind == Fault::Kind::Short) {
@@ -345,8 +382,17 @@ class Tracer {
           break;
         case SYS_rename:
         case SYS_renameat:
+        case SYS_renameat2:
         case SYS_linkat:
           _durability.named(pending.from, pending.to);
+          break;
+        case SYS_mkdir:
+        case SYS_mkdirat:
+        case SYS_openat:
+        case SYS_openat2:
+          if (pending.makes) {
+            _durability.made(pending.from);
+          }
           break;
         case SYS_unlink:
         case SYS_unlinkat:
@@ -361,7 +407,17 @@ class Tracer {
   void record(pid_t thread, const user_regs_struct& registers, Pending& pending) {
     Call call = callOf(thread, registers);
     pending.from = call.path;
-    if (pending.number == SYS_renameat || pending.number == SYS_linkat) {
+    static const std::set<int> changing = {SYS_write,     SYS_pwrite64,  SYS_fsync,   SYS_fdatasync,
+                                           SYS_ftruncate, SYS_mkdir,     SYS_mkdirat, SYS_rename,
+                                           SYS_renameat,  SYS_renameat2, SYS_linkat,  SYS_unlink,
+                                           SYS_unlinkat};
+    call.changes =
+        call.path.starts_with(_folder + '/') &&
+        (changing.contains(call.number) || (openingFlags(thread, registers) & O_CREAT) != 0);
+    call.size = call.changes && transfersBytes(call.number) ? registers.rdx : 0;
+    pending.makes = call.changes && access(call.path.c_str(), F_OK) != 0;
+    if (pending.number == SYS_renameat || pending.number == SYS_renameat2 ||
+        pending.number == SYS_linkat) {
       pending.to = pathAt(thread, registers.rdx, registers.r10);
     } else if (pending.number == SYS_rename) {
       pending.to = pathAt(thread, static_cast<std::uint64_t>(AT_FDCWD), registers.rsi);

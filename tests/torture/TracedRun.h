@@ -42,6 +42,7 @@ struct Fault {
   /// alike.
   int number = -1;
   int error = 0;
+  bool lasts = false;  ///< the error, for all calls of its kind that follow
   std::uint64_t room = 0;
   std::function<void()> whilePaused = {};
 };
@@ -50,7 +51,8 @@ struct Fault {
 struct Call {
   int number = 0;
   std::string path;        ///< of its descriptor or first path, when it is a file
-  std::uint64_t size = 0;  ///< bytes that a write asks for
+  bool changes = false;    ///< something below the watched folder, or what the disk has of it
+  std::uint64_t size = 0;  ///< bytes that such a write asks for
 };
 
 struct Outcome {

@@ -10,7 +10,6 @@
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
-#include <iterator>
 #include <map>
 #include <stdexcept>
 #include <thread>
@@ -22,9 +21,7 @@ namespace {
 
 namespace fs = std::filesystem;
 
-struct Options {
-  std::uint32_t seed = 1;
-  bool full = false;
+struct Options : Choice {
   std::size_t share = 1;
   unsigned workers = std::max(1U, std::thread::hardware_concurrency());
   std::string only;
@@ -40,7 +37,7 @@ void runCases(const std::vector<Case>& cases, const Options& options, unsigned w
               const fs::path& folder, Counts& counts) {
   for (std::size_t index = worker; index < cases.size(); index += options.workers) {
     const Case& one = cases[index];
-    std::vector<std::string> faults;
+    Faults faults;
     try {
       faults = one.run(folder / ("device-" + std::to_string(worker)));
     } catch (const std::exception& failure) {
@@ -97,7 +94,6 @@ std::vector<Case> chosen(std::vector<Case> cases, const Options& options) {
 }
 
 int torture(const Options& options) {
-  const Programs programs{VESPCTL_PROGRAM, VESPRUN_PROGRAM};
   std::string name = (fs::temp_directory_path() / "vesprun-torture-XXXXXX").string();
   if (mkdtemp(name.data()) == nullptr) {
     throw std::runtime_error(name + ": " + std::strerror(errno));
@@ -109,17 +105,14 @@ int torture(const Options& options) {
     throw std::runtime_error(std::string("mmap: ") + std::strerror(errno));
   }
   Counts& total = *new (shared) Counts{};
-  std::vector<Scenario> scenarios = dailyScenarios();
-  std::ranges::move(commandScenarios(), std::back_inserter(scenarios));
-  for (const Scenario& scenario : scenarios) {
+  for (const CaseList& list : caseLists()) {
     if (!options.only.empty() && total.tried != 0) {
       break;
     }
-    if (scenario.name.find(options.scenario) == std::string::npos) {
+    if (list.title.find(options.scenario) == std::string::npos) {
       continue;
     }
-    const std::vector<Case> cases =
-        chosen(scenario.cases(programs, folder, options.seed, options.full), options);
+    const std::vector<Case> cases = chosen(list.cases(folder, options), options);
     const std::size_t failedBefore = total.failed;
     std::vector<pid_t> children;
     for (unsigned worker = 0; worker < options.workers; ++worker) {
@@ -136,10 +129,10 @@ int torture(const Options& options) {
       ended = waitpid(child, &status, 0) == child && WIFEXITED(status) && ended;
     }
     if (!ended) {
-      throw std::runtime_error("a worker of \"" + scenario.name + "\" did not come to its end");
+      throw std::runtime_error("a worker of \"" + list.title + "\" did not come to its end");
     }
     if (options.only.empty() || !cases.empty()) {
-      std::printf("%-44s %6zu cases, %zu failed\n", scenario.name.c_str(), cases.size(),
+      std::printf("%-44s %6zu cases, %zu failed\n", list.title.c_str(), cases.size(),
                   total.failed - failedBefore);
       std::fflush(stdout);
     }
@@ -167,7 +160,12 @@ int run(int argc, char** argv) {
       ->check(CLI::PositiveNumber);
   app.add_option("--scenario", options.scenario, "Only scenarios whose title holds this text");
   app.add_option("--only", options.only, "One case, by the name that a failure prints");
+  std::string counted;
+  app.add_option("--count-in", counted)->group("");
   CLI11_PARSE(app, argc, argv);
+  if (!counted.empty()) {
+    return countWithLibrary(counted.c_str());
+  }
   return torture(options);
 }
 
