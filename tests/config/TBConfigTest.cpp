@@ -17,24 +17,22 @@ constexpr const char* kInternal = R"({"logLevel": "debug", "properties": {"Inter
 constexpr const char* kPath = "Library/Application Support/Tallybook/Whitelist_Stagebox.ptree";
 const std::string kParseFailure = "error: Couldn't parse the contents of the config file. Error: ";
 
-std::string textOf(const ScalarOptions* options) {
-  if (options == nullptr) {
-    return "none";
-  }
-  const auto text = [](const std::optional<std::uint64_t>& number) {
-    return number ? std::to_string(*number) : "-";
-  };
-  return text(options->bucketInterval) + '/' + text(options->significantDigits);
-}
-
-/// For each key its bucket interval and digits, "-" where there is none, or "none" for a key left
-/// out.
-std::string scalarOptions(const TBConfig& config, std::initializer_list<const char*> keys) {
-  std::string text;
+/// What becomes of the value of each key, in words.
+std::vector<std::string> scalarOptions(const TBConfig& config,
+                                       std::initializer_list<const char*> keys) {
+  std::vector<std::string> texts;
   for (const char* key : keys) {
-    text += (text.empty() ? "" : " ") + textOf(config.configOptionsForScalarKey(key));
+    const ScalarOptions* const options = config.configOptionsForScalarKey(key);
+    std::string text = options == nullptr ? "left out" : "";
+    if (options != nullptr && options->bucketInterval) {
+      text += "buckets of " + std::to_string(*options->bucketInterval);
+    }
+    if (options != nullptr && options->significantDigits) {
+      text += std::to_string(*options->significantDigits) + " digits";
+    }
+    texts.push_back(text.empty() ? "as it is" : text);
   }
-  return text;
+  return texts;
 }
 
 TEST(TBConfig, PutsExactKeysBeforePrefixesInOrder) {
@@ -47,9 +45,10 @@ TEST(TBConfig, PutsExactKeysBeforePrefixesInOrder) {
       "Second": {"ScalarKeys": {"twice": {"sig_fig": 6}}, "ScalarKeyPrefixes": {"long": {"sig_fig": 7}},
                  "DistributionKeyPrefixes": {"d": {"intervals": [7]}}}})");
   const std::unique_ptr<TBConfig> config = TBConfig::init();
-  EXPECT_EQ(scalarOptions(*config, {"exact", "exactly", "twice", "long.er.key", "long.key", "Exact",
-                                    "dist", ""}),
-            "-/- -/2 -/6 -/4 -/7 none none none");
+  EXPECT_THAT(scalarOptions(*config, {"exact", "exactly", "twice", "long.er.key", "long.key",
+                                      "Exact", "dist", ""}),
+              ElementsAre("as it is", "2 digits", "6 digits", "4 digits", "7 digits", "left out",
+                          "left out", "left out"));
   EXPECT_EQ(config->configOptionsForDistributionKey("dist")->intervals, nullptr);
   EXPECT_EQ(textForm(*config->configOptionsForDistributionKey("dust")->intervals), "(7)");
   EXPECT_EQ(config->configOptionsForDistributionKey("exact"), nullptr);
@@ -72,13 +71,16 @@ TEST(TBConfig, TakesGroupsByDeviceAndTasking) {
     preferences.LGSPreferencesSetValue("Zero", 0, "com.quill.da");
     preferences.LGSPreferencesSetValue("InternalTesting", true, "com.quill.da");
     const std::unique_ptr<TBConfig> config = TBConfig::init();
-    EXPECT_EQ(scalarOptions(*config, {"absent", "on", "off", "zero", "testing", "other"}),
-              isInternal ? "-/- -/1 -/2 3/- -/4 -/-" : "-/- -/1 none none none none");
-    using Log = std::vector<std::string>;
-    EXPECT_EQ(device.log(), isInternal
-                                ? Log({"debug: passing @{} for other as device is Quill Internal"})
-                                : Log({"default: keyGroup Off is disabled by tasking",
-                                       "default: keyGroup Zero is disabled by tasking"}));
+    using Texts = std::vector<std::string>;
+    EXPECT_EQ(
+        scalarOptions(*config, {"absent", "on", "off", "zero", "testing", "other"}),
+        isInternal
+            ? Texts({"as it is", "1 digits", "2 digits", "buckets of 3", "4 digits", "as it is"})
+            : Texts({"as it is", "1 digits", "left out", "left out", "left out", "left out"}));
+    EXPECT_EQ(device.log(),
+              isInternal ? Texts({"debug: passing @{} for other as device is Quill Internal"})
+                         : Texts({"default: keyGroup Off is disabled by tasking",
+                                  "default: keyGroup Zero is disabled by tasking"}));
   }
 }
 
@@ -103,9 +105,10 @@ TEST(TBConfig, HoldsBackWhatItCannotRead) {
           whitelist + "ScalarKeys: options of 3 " + held + "p.true in group Group",
           whitelist + "DistributionKeys: options of 1 " + held + "e in group Later",
           whitelist + "ScalarKeyPrefixes: options of 1 " + held + "q. in group Group"));
-  EXPECT_EQ(scalarOptions(*config, {"p.true", "p.text", "p.spoiled", "p.mended", "p.good",
-                                    "p.other", "q.any"}),
-            "none none none -/4 -/3 -/- none");
+  EXPECT_THAT(scalarOptions(*config, {"p.true", "p.text", "p.spoiled", "p.mended", "p.good",
+                                      "p.other", "q.any"}),
+              ElementsAre("left out", "left out", "left out", "4 digits", "3 digits", "as it is",
+                          "left out"));
   EXPECT_NE(config->configOptionsForDistributionKey("d.any"), nullptr);
   EXPECT_EQ(config->configOptionsForDistributionKey("e"), nullptr);
 }

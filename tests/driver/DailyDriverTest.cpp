@@ -5,7 +5,6 @@
 #include <sys/socket.h>
 
 #include <algorithm>
-#include <array>
 #include <limits>
 
 #include "common/AppInfoList.h"
@@ -223,26 +222,6 @@ TEST_F(DailyDriverTest, AMessageThatFailsStopsNoOther) {
   loop.queueWork([] { handlePeerMessage(PropertyDict{{"operation", 2}, {"app_data", 0}}); });
   runListenerMode(kQuiet);
   EXPECT_THAT(device.log(), Contains("error: unexpected failure: std::bad_alloc"));
-  EXPECT_EQ(storedDay(device), PropertyValue(kYesterday));
-}
-
-TEST_F(DailyDriverTest, OneProcessDoesTheDaysWorkAndTheOthersFindItDone) {
-  DriverDevice device;
-  device.endProcess();
-  std::array<pid_t, 3> starts{};
-  for (pid_t& start : starts) {
-    start = startProcess([&device] {
-      device.platform();
-      runDayCheck(nullptr);
-      device.endProcess();
-    });
-  }
-  for (const pid_t start : starts) {
-    EXPECT_TRUE(hasSucceeded(start));
-  }
-  device.platform();
-  EXPECT_THAT(device.log(),
-              ::testing::UnorderedElementsAre(kYesterdaysTasks, kUnchanged, kUnchanged));
   EXPECT_EQ(storedDay(device), PropertyValue(kYesterday));
 }
 

@@ -7,6 +7,7 @@
 #include <filesystem>
 #include <fstream>
 #include <future>
+#include <set>
 #include <stdexcept>
 #include <thread>
 
@@ -172,23 +173,29 @@ TEST(Outbox, NumbersGoOnAfterWhateverHappenedToTheFolder) {
 
 TEST(Outbox, SubmissionsAtOnceNeverShareANumber) {
   TestDevice device;
-  Logsmith& logsmith = device.platform().logsmith();
-  const auto submit = [&] {
+  const auto submit = [](const char* type, const char* name, bool hasHeader) {
     for (int i = 0; i < 20; ++i) {
       const PropertyDict header{{"n", i}};
-      EXPECT_TRUE(logsmith.LGSWriteLogForSubmission(
-          "193", "log-aggregated", &header,
+      EXPECT_TRUE(platform().logsmith().LGSWriteLogForSubmission(
+          type, name, hasHeader ? &header : nullptr,
           [i](const LogFileHandle& write) { write(std::to_string(i)); }));
     }
   };
-  std::thread other(submit);
-  submit();
+  std::thread same([&] { submit("193", "log-aggregated", true); });
+  std::thread other([&] { submit("165", "S", false); });
+  submit("193", "log-aggregated", true);
+  same.join();
   other.join();
-  EXPECT_EQ(device.names("outbox/logs").size(), 80U);
+  std::set<std::string> numbers;
   for (const std::string& name : device.names("outbox/logs")) {
-    const std::string base = "outbox/logs/" + name.substr(0, name.find('.'));
-    EXPECT_EQ(device.read(base + ".header.json"), "{\"n\":" + device.read(base + ".ptree") + "}\n");
+    if (name.ends_with(".header.json")) {
+      const std::string log = "outbox/logs/" + name.substr(0, name.find('.')) + ".ptree";
+      EXPECT_EQ(device.read("outbox/logs/" + name), "{\"n\":" + device.read(log) + "}\n");
+    } else {
+      EXPECT_TRUE(numbers.insert(name.substr(0, 4)).second) << name;
+    }
   }
+  EXPECT_EQ(numbers.size(), 60U);
 }
 
 TEST(Outbox, AFailedSubmissionLeavesWhatWasThereAndNothingElse) {

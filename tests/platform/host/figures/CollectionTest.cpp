@@ -19,7 +19,7 @@ namespace {
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
-using Counted = std::map<std::string, std::string>;  ///< a scalar or "~" and samples, by key
+using Counted = std::map<std::string, std::string>;  ///< a scalar or "sampled:" and samples, by key
 
 constexpr const char* kBoot = "proc/sys/kernel/random/boot_id";
 constexpr const char* kStat = "sys/block/sda/stat";
@@ -47,7 +47,9 @@ class CollectionTest : public ::testing::Test {
         double value = 0;
         for (int second = 0; values.getNextValueSecondsInDayOffset(value, &second);) {
           EXPECT_EQ(second, 33302);
-          counted[std::string(key)] += '~' + std::to_string(static_cast<int>(value));
+          std::string& samples = counted[std::string(key)];
+          samples += samples.empty() ? "sampled:" : ",";
+          samples += std::to_string(static_cast<int>(value));
         }
       });
     };
@@ -116,13 +118,15 @@ sys/class/nvme/nvme0/device/aer_dev_correctable | RxErr 0;TOTAL_ERR_COR 2; | RxE
                    R"(
 cpu.userSeconds 2  cpu.niceSeconds 0  cpu.systemSeconds 0  cpu.idleSeconds 30
 cpu.interruptSeconds 0  cpu.softInterruptSeconds 2  cpu.stolenSeconds 0  cpu.contextSwitches 999
-cpu.forks 7  cpu.frequencyMHz ~2400  time.upSeconds 33  time.suspends 1  memory.availableMiB ~4096
-memory.anonymousMiB ~1  memory.cachedMiB ~0  memory.dirtyMiB ~1  memory.swapFreeMiB ~2
+cpu.forks 7  cpu.frequencyMHz sampled:2400  time.upSeconds 33  time.suspends 1
+memory.availableMiB sampled:4096
+memory.anonymousMiB sampled:1  memory.cachedMiB sampled:0  memory.dirtyMiB sampled:1
+memory.swapFreeMiB sampled:2
 pressure.cpuSomeMilliseconds 1  disk.reads.nvme0n1 5  disk.readKiB.nvme0n1 1
 disk.readMilliseconds.nvme0n1 1  disk.writes.nvme0n1 0  disk.writtenKiB.nvme0n1 4
 disk.writeMilliseconds.nvme0n1 0  disk.busyMilliseconds.nvme0n1 1  network.receivedKiB.wlp2s0 2
-network.sentKiB.enx 3  temperature.sensorCelsius.nvme ~45
-temperature.zoneCelsius.INT3400_Thermal ~-5  temperature.zoneCelsius.thermal_zone1 ~20
+network.sentKiB.enx 3  temperature.sensorCelsius.nvme sampled:45
+temperature.zoneCelsius.INT3400_Thermal sampled:-5  temperature.zoneCelsius.thermal_zone1 sampled:20
 nvme.correctedErrors 3)"},
                   {"a phone with UFS and eMMC", R"(
 sys/bus/platform/devices/1d84000.ufshc/health_descriptor/eol_info               | 0x01 | 0x02;
@@ -134,8 +138,10 @@ sys/class/net/wwan0/carrier_down_count  | 1         | 3
 proc/vmstat | pgmajfault 10;nr_free 1;oom_kill 1; | pgmajfault 1000;nr_free 1;oom_kill 3;
 )",
                    R"(
-ufs.endOfLifeLevel ~2  ufs.usedLifeATenths ~11  emmc.usedLifeATenths ~2  emmc.usedLifeBTenths ~10
-emmc.endOfLifeLevel ~3  network.linkLosses.wwan0 2  memory.majorFaults 990  memory.oomKills 2)"},
+ufs.endOfLifeLevel sampled:2  ufs.usedLifeATenths sampled:11  emmc.usedLifeATenths sampled:2
+emmc.usedLifeBTenths sampled:10
+emmc.endOfLifeLevel sampled:3  network.linkLosses.wwan0 2  memory.majorFaults 990
+memory.oomKills 2)"},
                   {"a server with EDAC", R"(
 sys/devices/system/edac/mc/mc0/ce_count     | 5  | 9
 sys/devices/system/edac/mc/mc1/ce_count     | 0  | 1
@@ -305,7 +311,7 @@ TEST_F(CollectionTest, TooManyDevicesAndOddNamesDoNotPileUp) {
   machine.write("sys/class/net/enp<&\xFFname/statistics/rx_packets", "6");
   collect();
   EXPECT_EQ(counted("linux.network.receivedPackets.enp___name"), "1");
-  EXPECT_EQ(counted("linux.temperature.sensorCelsius." + std::string(40, 'x')), "~50~50");
+  EXPECT_EQ(counted("linux.temperature.sensorCelsius." + std::string(40, 'x')), "sampled:50,50");
 }
 
 TEST_F(CollectionTest, GrowthIsCountedOnceWhateverHappensToTheProcess) {

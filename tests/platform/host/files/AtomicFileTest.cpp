@@ -54,21 +54,6 @@ TEST_F(AtomicFileTest, AddsOnlyUnderANameThatIsFree) {
   EXPECT_EQ(error, folder.path("none") + ": No such file or directory");
 }
 
-TEST_F(AtomicFileTest, KeepsTheEarlierDocumentUntilTheNewOneIsComplete) {
-  folder.write("document", "earlier");
-  {
-    const FileSizeLimit limit(100'000);
-    EXPECT_FALSE(replaceFile(folder.path("document"), std::string(150'000, 'x'), error));
-  }
-  EXPECT_THAT(error, HasSubstr(folder.path("document") + ": File too large"));
-  EXPECT_EQ(folder.read("document"), "earlier");
-  EXPECT_THAT(folder.names(), ElementsAre("document"));
-  folder.write(".unfinished-1", "left by a process that was killed");
-  EXPECT_TRUE(replaceFile(folder.path("document"), "new", error)) << error;
-  EXPECT_EQ(folder.read("document"), "new");
-  EXPECT_THAT(folder.names(), ElementsAre("document"));
-}
-
 TEST_F(AtomicFileTest, RemovesItsOwnLeftOversAloneAndWaitsForNone) {
   ASSERT_EQ(mkfifo(folder.path(".unfinished-pipe").c_str(), 0600), 0);
   ASSERT_EQ(symlink("document", folder.path(".unfinished-link").c_str()), 0);
@@ -176,20 +161,6 @@ TEST_F(JsonLinesTest, LoseNoLineWhileOthersAreRemoved) {
   const std::string path = folder.path("log.jsonl");
   const auto isOld = [](std::string_view line) { return line == "old"; };
   JsonLines lines(path);
-  EXPECT_TRUE(lines.append("old", error)) << error;
-  const FileDescriptor held(open(path.c_str(), O_RDONLY));
-  ASSERT_EQ(flock(held.get(), LOCK_EX), 0);
-  std::thread waiting([&lines] {
-    std::string why;
-    EXPECT_TRUE(lines.append("waited", why)) << why;
-  });
-  std::this_thread::sleep_for(std::chrono::milliseconds(50));
-  EXPECT_TRUE(replaceFile(path, "another file\n", error)) << error;
-  flock(held.get(), LOCK_UN);
-  waiting.join();
-  EXPECT_EQ(folder.read("log.jsonl"), "another file\nwaited\n");
-  folder.write("log.jsonl", "");
-
   constexpr int kLines = 300;
   std::atomic<bool> done = false;
   std::uint64_t removed = 0;
