@@ -48,7 +48,7 @@ class Device {
   Faults run(const std::vector<std::string>& steps) const;
 
   /// Reads everything, and finds the faults that need no knowledge of what happened: half documents
-  /// and lines, keys that no list names, counters that cannot be read. `numbered`: logs are told
+  /// and lines, keys that no list names, counters that cannot be read. `numbered`: logs are kept
   /// apart by their numbers, and exported with their revisions.
   Sight look(bool numbered) const;
 

@@ -235,7 +235,7 @@ Faults lostSteps(const Reference& reference, const Device& device, const Facts& 
 Faults silence(const Device& device, const Outcome& outcome, int error) {
   const std::string& place = outcome.place;
   const auto holds = [&place](const std::string& part) { return place.find(part) != place.npos; };
-  // Looking for left-overs beside a preference file is no reading of it.
+  // Looking for left-overs beside a preference file does not read it.
   const bool isTidying = place.ends_with("/Library/Logsmith");
   const bool isInput =
       holds(device.path()) && !isTidying &&
