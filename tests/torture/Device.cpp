@@ -8,6 +8,7 @@
 #include <fstream>
 #include <map>
 #include <nlohmann/json.hpp>
+#include <regex>
 #include <sstream>
 #include <stdexcept>
 #include <thread>
@@ -358,7 +359,8 @@ Sight Device::look(bool numbered) const {
         sight.faults.push_back(name + " has the number of another log");
       }
       name = "log " + (numbered || number == std::string::npos ? name : name.substr(number));
-      sight.facts.insert(name + ": " + content);
+      static const std::regex process("vesprun\\[[0-9]+\\]");
+      sight.facts.insert(name + ": " + std::regex_replace(content, process, "vesprun[PID]"));
       continue;
     }
     if (name == "outbox/log.jsonl") {

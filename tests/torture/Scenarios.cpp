@@ -484,22 +484,27 @@ std::vector<Case> others(const std::shared_ptr<Reference>& reference, const fs::
       }
       ends[otherFirst ? 1 : 0] = device.look(false);
     }
-    // What another does matters between a look and a change.
+    // What another does matters between a look and a change, and before a lock.
     std::vector<std::size_t> places;
     for (std::size_t call = firstOwnCall(reference->calls); call < reference->calls.size();
          ++call) {
       if (reference->calls[call].changes || reference->calls[call].number == SYS_flock) {
-        places.push_back(call + 1);
+        places.push_back(call);
       }
     }
     const std::size_t step = choice.full ? 1 : places.size() / 30 + 1;
-    for (std::size_t index = choice.seed % step; index < places.size(); index += step) {
+    for (std::size_t index = 0; index < places.size(); ++index) {
+      const bool isLock = reference->calls[places[index]].number == SYS_flock;
+      if (!isLock && index % step != choice.seed % step) {
+        continue;
+      }
       const std::string name = std::string(scenario.name) + " beside " + other + ':';
-      cases.push_back({name + std::to_string(places[index]),
+      const std::string number = std::to_string(places[index] + 1);
+      cases.push_back({name + number,
                        [=](const fs::path& work) {
-                         return runBeside(*reference, work, places[index], other, ends);
+                         return runBeside(*reference, work, places[index] + 1, other, ends);
                        },
-                       name});
+                       isLock && step < 3 ? name + number : name});
     }
   }
   return cases;

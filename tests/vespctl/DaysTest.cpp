@@ -115,10 +115,13 @@ TEST_F(DaysTest, CatchUpSubmitsWhatTheRunOfEachDayWouldHave) {
   std::filesystem::rename(folder.path("kept"), folder.path("device"));
   setTime("2024-03-07T04:00:00Z");
   const std::string events = folder.read("device/outbox/events.jsonl");
-  EXPECT_EQ(print("days --json --last 0; (flock \"$D\" sh -c 'sleep 0.5; touch released' & sleep "
-                  "0.1; '" VESPCTL_PROGRAM "' catch-up --json --last 3; test -e released)"),
-            "[19785,19786,19787]\n")
-      << "after the run that is at work";
+  const auto whileARunIsAtWork = [&](const std::string& command) {
+    return print(
+        "days --json --last 0; rm -f held released; (flock \"$D\" sh -c 'touch held; sleep 0.5; "
+        "touch released' & until test -e held; do sleep 0.01; done; '" VESPCTL_PROGRAM "' " +
+        command + "; test -e released)");
+  };
+  EXPECT_EQ(whileARunIsAtWork("catch-up --json --last 3"), "[19785,19786,19787]\n");
   EXPECT_EQ(documents(false), ofRuns);
   EXPECT_EQ(folder.read("device/outbox/events.jsonl"), events);
   EXPECT_EQ(print("prefs get --json com.quill.aggregated DatabaseCorruptionCount"), "3\n");
@@ -126,7 +129,8 @@ TEST_F(DaysTest, CatchUpSubmitsWhatTheRunOfEachDayWouldHave) {
                   "LastCrashLogSerializationDateInDaysSince1970"),
             "19784\n");
   EXPECT_EQ(print("catch-up --json"), "[]\n");
-  EXPECT_THAT(print("prune --json --outbox-size 0"), HasSubstr("0004-193-log-aggregated.ptree"));
+  EXPECT_THAT(whileARunIsAtWork("prune --json --outbox-size 0"),
+              HasSubstr("0004-193-log-aggregated.ptree"));
   EXPECT_EQ(print("catch-up --json --last 4294967295"), "[]\n") << "pruned is not missed";
 }
 
