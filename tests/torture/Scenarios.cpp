@@ -183,7 +183,7 @@ Faults judgeRun(const Outcome& outcome, const Fault& fault, bool started, int wo
   const bool killed = fault.kind == Fault::Kind::Kill;
   Faults faults;
   if (outcome.late) {
-    faults.push_back("took longer than " + std::to_string(kLongestRun) + " seconds");
+    faults.push_back("took longer than " + std::to_string(kMaxRunSeconds) + " seconds");
   } else if (!killed && started && outcome.signal != 0) {
     faults.push_back(std::string("ended by a signal: ") + strsignal(outcome.signal));
   } else if (!killed && started && outcome.status > worst) {
