@@ -122,13 +122,12 @@ Element firstDays(const PageDays& days) {
               dayText(days.newest() + static_cast<std::int32_t>(missing) + 1) + "."};
 }
 
-Element noDays() {
+Element noDays(const std::string& firstReport) {
   return {"p",
           {{"class", "first"}},
-          "Nothing has been reported yet. The first report is made by the first daily run after a "
-          "day with counters that the whitelist lets through; vespctl status says when that is, "
-          "and vespctl preview what it will hold. What is unusual stands here from the " +
-              numeral(kMinDaysBefore + 1) + "th report on."};
+          "Nothing has been reported yet. " + firstReport +
+              " What is unusual is shown here from the " + numeral(kMinDaysBefore + 1) +
+              "th report on."};
 }
 
 }  // namespace
@@ -158,7 +157,7 @@ void addOverview(Document& document, const PageAbout& about, const PageData& dat
   addFindings(items, about.findings);
   const std::size_t left = kMostChanges - std::min(kMostChanges, items.size());
   if (days.isEmpty()) {
-    document.add(noDays());
+    document.add(noDays(about.firstReport));
   } else {
     const std::int32_t yesterday = daysSince1970(about.now) - 1;
     if (days.newest() < yesterday) {

@@ -22,6 +22,7 @@ struct PageAbout {
   Date now;                        ///< the device's time
   std::vector<PageFinding> findings;
   std::vector<KeptBack> keptBack;  ///< not shown when the page is shared
+  std::string firstReport;         ///< when there will be one, where there is none yet
   bool isShared = false;           ///< without what is for the device's owner alone
 };
 

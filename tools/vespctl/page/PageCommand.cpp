@@ -6,10 +6,12 @@
 
 #include "Command.h"
 #include "ReadOnlyDevice.h"
+#include "outbox/FirstReport.h"
+#include "outbox/SubmittedLogs.h"
 #include "page/Page.h"
 #include "page/PageFile.h"
 #include "platform/host/device/LiveSystem.h"
-#include "platform/host/device/Pseudonym.h"
+#include "status/Findings.h"
 
 namespace vesprun {
 namespace {
@@ -33,8 +35,7 @@ PageAbout aboutOf(HostPlatform& device, const Wanted& wanted) {
   about.names = {describedOr(system.osVersion, live::osVersion),
                  "build " + describedOr(system.buildVersion, live::osBuild),
                  "model " + describedOr(system.hardwareModel, live::hardwareModel),
-                 "device " + pseudonymOf(system.systemID.value_or(live::machineIdentifier()),
-                                         "vesprun exported device")};
+                 "device " + exportedName(device)};
   return about;
 }
 
@@ -50,6 +51,14 @@ void makePage(const Wanted& wanted) {
   }
   opened.complaints.print();
   nameUnreadable(data.unreadable);
+  // A detail may name keys or tell of the system log.
+  for (Finding& finding : readStatus(*opened.device).findings) {
+    about.findings.push_back(
+        {std::string(finding.finding), wanted.isShared ? "" : std::move(finding.detail)});
+  }
+  if (data.days.empty()) {
+    about.firstReport = whenFirstReport(*opened.device);
+  }
   const std::string page = pageText(about, data);
   const RightsOfCaller rights;
   writePage(wanted.file, page);
