@@ -16,13 +16,13 @@
 namespace vesprun {
 namespace {
 
-struct Wanted {
+struct WantedPage {
   std::string file;
   std::string title;
   bool isShared = false;
 };
 
-PageAbout aboutOf(HostPlatform& device, const Wanted& wanted) {
+PageAbout aboutOf(HostPlatform& device, const WantedPage& wanted) {
   const auto& system = device.description().system;
   PageAbout about;
   about.now = device.clock().now();
@@ -39,7 +39,7 @@ PageAbout aboutOf(HostPlatform& device, const Wanted& wanted) {
   return about;
 }
 
-void makePage(const Wanted& wanted) {
+void makePage(const WantedPage& wanted) {
   using Days = std::numeric_limits<std::int32_t>;
   const ReadOnlyDevice opened(LogLevel::Error, OwnersRights::UntilFileIsWritten);
   const PageData data(opened.device->directory());
@@ -67,7 +67,7 @@ void makePage(const Wanted& wanted) {
 }  // namespace
 
 void addPageCommand(CLI::App& command) {
-  const auto wanted = std::make_shared<Wanted>();
+  const auto wanted = std::make_shared<WantedPage>();
   command.add_option("FILE", wanted->file, "Where to write it, instead of standard output");
   command.add_option("--title", wanted->title, "At the top, instead of the host's name")
       ->type_name("TEXT");
