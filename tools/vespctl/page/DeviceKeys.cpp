@@ -10,9 +10,9 @@ namespace vesprun {
 namespace {
 
 constexpr std::int32_t kMostDays = 400;  // that a picture shows
-constexpr std::size_t kWeek = 7;
+constexpr std::size_t kDaysOfWeek = 7;
 constexpr std::size_t kDaysToBeRegular = 5;
-constexpr std::size_t kRecentDays = 28;
+constexpr std::size_t kNewestDays = 28;
 
 std::string rangeText(const Unusual& unusual, Unit unit) {
   std::string text;
@@ -145,9 +145,9 @@ void KeyChanges::judge(std::string_view key, const std::vector<KeySeries>& all) 
     const std::vector<DayValue> judged =
         words.isRunningTotal ? growthOf(series.values) : series.values;
     const std::span<const DayValue> values(judged);
-    for (std::size_t back = 0; back < std::min(kWeek, values.size()); ++back) {
+    for (std::size_t back = 0; back < std::min(kDaysOfWeek, values.size()); ++back) {
       const auto unusual = unusualLast(values.first(values.size() - back));
-      if (!unusual || unusual->day + static_cast<std::int32_t>(kWeek) <= _days.newest()) {
+      if (!unusual || unusual->day + static_cast<std::int32_t>(kDaysOfWeek) <= _days.newest()) {
         break;
       }
       const bool isToday = unusual->day == _days.newest();
@@ -203,7 +203,7 @@ void KeyChanges::judgePresence(std::string_view key, const std::vector<DayValue>
   // Where the key's last day stands among the reported days, and how long it was there every day.
   const auto last = std::ranges::lower_bound(_days.reported, values.back().day);
   const auto since = static_cast<std::size_t>(_days.reported.end() - last) - 1;
-  if (since == 0 || since > kWeek) {
+  if (since == 0 || since > kDaysOfWeek) {
     return;
   }
   std::size_t run = 0;
@@ -211,7 +211,7 @@ void KeyChanges::judgePresence(std::string_view key, const std::vector<DayValue>
          values[values.size() - 1 - run].day == *(last - static_cast<std::ptrdiff_t>(run))) {
     ++run;
   }
-  const bool isRegular = run >= std::min(kRecentDays, values.size()) && run >= kDaysToBeRegular;
+  const bool isRegular = run >= std::min(kNewestDays, values.size()) && run >= kDaysToBeRegular;
   if (isRegular) {
     _gone.push_back(item(
         "last " + dayText(values.back().day) + ": " + quantity(values.back().value, words.unit),
