@@ -1,7 +1,7 @@
 #include "FleetStore.h"
 
-#include "ClickHouseStore.h"
-#include "SqliteStore.h"
+#include "clickhouse/ClickHouseStore.h"
+#include "sqlite/SqliteStore.h"
 
 namespace vesprun {
 
