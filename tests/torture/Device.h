@@ -32,7 +32,7 @@ class Device {
  public:
   /// Sets the device up in a new folder.
   explicit Device(const std::filesystem::path& folder);
-  /// A copy of it below another folder, in place of what is there.
+  /// Copies it into another folder, whose content is replaced.
   Device(const Device& original, const std::filesystem::path& folder);
 
   const std::string& path() const { return _path; }

@@ -28,7 +28,7 @@ struct Scenario {
   enum class Promise {
     Steps,   ///< a failing call costs one step at most, and nothing that was there
     Whole,   ///< what it changes is all there or not at all
-    Again,   ///< in the end there is no difference
+    Again,   ///< in the end nothing differs
     Figures  ///< none in the scalars; what others do at the same time is judged whole
   } promise;
   int worst;                          ///< the highest exit status

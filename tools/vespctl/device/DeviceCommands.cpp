@@ -113,7 +113,7 @@ void makeFolders(const std::filesystem::path& path) {
   }
 }
 
-/// `device.json` is written last: without it the folder is no device.
+/// `device.json` is written last: only a folder with it counts as a device.
 void initDevice(const std::string& path, bool sample) {
   makeFolders(path);
   std::error_code failure;

@@ -10,7 +10,7 @@ namespace vesprun {
 
 std::string whenFirstReport(HostPlatform& device) {
   if (!device.logsmith().DiagnosticLogSubmissionEnabled()) {
-    return "There is no report yet: submission is switched off on this device.";
+    return "No report yet: submission is switched off on this device.";
   }
   const std::int32_t today = device.tallybook().TBDaysSince1970();
   const std::int64_t stored =
