@@ -42,9 +42,13 @@ ECCEventQueue::Outcome ECCEventQueue::take(const HostPath& path, std::span<std::
                                                      : ": not a regular file");
     return Outcome::Unusable;
   }
-  const ssize_t count = pread(file.get(), buffer.data(), kEventLength, 0);
-  if (count != static_cast<ssize_t>(kEventLength)) {
-    return failed(Outcome::Failed);
+  for (std::size_t length = 0; length < kEventLength;) {
+    const ssize_t count = pread(file.get(), buffer.data() + length, kEventLength - length,
+                                static_cast<off_t>(length));
+    if (count <= 0) {
+      return failed(Outcome::Failed);
+    }
+    length += static_cast<std::size_t>(count);
   }
   _taken = std::move(file);
   _takenPath = path;

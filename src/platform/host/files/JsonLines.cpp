@@ -115,15 +115,21 @@ bool JsonLines::appendLocked(std::string line, std::string& error) {
     line.insert(0, 1, '\n');
   }
   line += '\n';
-  ssize_t written = 0;
-  do {
-    written = write(_file.get(), line.data(), line.size());
-  } while (written < 0 && errno == EINTR);
-  if (written == static_cast<ssize_t>(line.size())) {
+  std::string_view rest = line;
+  while (!rest.empty()) {
+    const ssize_t written = write(_file.get(), rest.data(), rest.size());
+    if (written > 0) {
+      rest.remove_prefix(static_cast<std::size_t>(written));
+    } else if (written == 0 || errno != EINTR) {
+      break;
+    }
+  }
+  if (rest.empty()) {
     return true;
   }
-  error = written < 0 ? systemError(_path) : _path.string() + ": no room for a line";
-  if (written > 0 && ftruncate(_file.get(), before.st_size) != 0) {
+  const bool isPart = rest.size() < line.size();
+  error = isPart ? _path.string() + ": no room for a line" : systemError(_path);
+  if (isPart && ftruncate(_file.get(), before.st_size) != 0) {
     error += ", and a part of it stays: ";
     error += std::strerror(errno);
   }
