@@ -313,6 +313,7 @@ Sight Device::look(bool numbered) const {
     sight.faults.push_back("the counters cannot be read: " + counters);
   }
   std::set<std::string> numbers;
+  int withoutHeader = 0;
   for (const fs::directory_entry& entry : fs::recursive_directory_iterator(_path)) {
     if (!entry.is_regular_file()) {
       continue;
@@ -341,7 +342,15 @@ Sight Device::look(bool numbered) const {
           sight.faults.push_back(name + " does not say why: " + *message);
         }
       }
-      if (!name.ends_with("/log.jsonl")) {
+      if (name.ends_with("/submitted.jsonl") && !numbered) {
+        // Without the numbers, the same line twice must still be seen.
+        static const std::regex number("(\"name\":\")[0-9]+");
+        std::map<std::string, int> counts;
+        std::istringstream notes(std::regex_replace(content, number, "$1"));
+        for (std::string note; std::getline(notes, note);) {
+          sight.facts.insert(name + " has " + note + " #" + std::to_string(++counts[note]));
+        }
+      } else if (!name.ends_with("/log.jsonl")) {
         addLines(name + " has ", content);
       }
       if (name.ends_with("/records.jsonl")) {
@@ -352,7 +361,8 @@ Sight Device::look(bool numbered) const {
       if (name.ends_with("-193-log-aggregated.ptree")) {
         ++sight.dailyLogs;
         if (!fs::exists(_path + '/' + name.substr(0, name.rfind('.')) + ".header.json")) {
-          sight.facts.insert("without header: " + name);
+          sight.facts.insert("without header: " + (numbered ? name : name.substr(number)) + " " +
+                             std::to_string(++withoutHeader));
         }
       }
       if (!name.ends_with(".header.json") && !numbers.insert(name.substr(0, number)).second) {
@@ -366,7 +376,13 @@ Sight Device::look(bool numbered) const {
     if (name == "outbox/log.jsonl") {
       continue;
     }
-    if (isDocument) {
+    if (isDocument && name.find("/Preferences/") != std::string::npos) {
+      // Their order is that in which they were set for the first time.
+      const std::optional<PropertyValue> root = readPtree(content, error);
+      for (const auto& [key, value] : root && root->dict() ? *root->dict() : PropertyDict()) {
+        sight.facts.insert("content of " + name + ": " + std::string(key) + ' ' + jsonText(value));
+      }
+    } else if (isDocument) {
       sight.facts.insert("content of " + name + ": " + content);
     }
     sight.facts.insert("file " + name);

@@ -277,7 +277,9 @@ Faults runWithFault(const Reference& reference, const fs::path& folder, const Fa
     faults.emplace_back("some of it is there and some is not");
   }
   if (killed) {
-    faults += missing(those(halfway.facts, beginsWith("without header: ")), reference.done, "odd");
+    Facts usual = reference.before;
+    usual.insert(reference.done.begin(), reference.done.end());
+    faults += missing(those(halfway.facts, beginsWith("without header: ")), usual, "odd");
   }
   faults += device.run(scenario.after);
   const Sight end = device.look(scenario.numbered);
@@ -317,6 +319,19 @@ Faults runWithFault(const Reference& reference, const fs::path& folder, const Fa
     };
     wanted = those(wanted, counts);
     there = those(there, counts);
+  }
+  if (killed && scenario.promise == Promise::Steps) {
+    // A log that was submitted just before the kill is submitted once more, one that was under way
+    // leaves its unfinished file, and a change of the system is then announced by no log.
+    std::erase_if(wanted, [&there](const std::string& fact) {
+      return !there.contains(fact) && fact.starts_with("log -193-log-aggregated.header.json: ");
+    });
+    std::erase_if(there, [&wanted](const std::string& fact) {
+      return !wanted.contains(fact) &&
+             ((fact.starts_with("outbox/submitted.jsonl has ") && fact.ends_with(" #2")) ||
+              (fact.starts_with("without header: ") && fact.ends_with(" 2")) ||
+              fact.starts_with("file outbox/logs/.unfinished-"));
+    });
   }
   faults += missing(wanted, there, "missing in the end");
   faults += missing(there, wanted, "too much in the end");
