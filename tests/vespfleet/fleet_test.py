@@ -4,18 +4,24 @@
 Each case runs on an SQLite file and, when VESPFLEET_TEST_SERVER has its address, in a ClickHouse database.
 """
 
+import base64
 import gzip
 import hashlib
+import http.server
 import json
 import math
 import os
 import random
 import signal
+import sqlite3
+import ssl
 import subprocess
 import sys
 import tempfile
+import threading
 import time
 import urllib.request
+import zlib
 from collections import defaultdict
 from fractions import Fraction
 from pathlib import Path
@@ -34,7 +40,29 @@ def run(*words, status=0, data=None):
 
 
 def ask(*words):
-    return [json.loads(line) for line in run(*words, "--json").splitlines()]
+    found = [json.loads(line) for line in run(*words, "--json").splitlines()]
+    for entry in found:
+        assert fits(entry, SCHEMAS[words[0]]), (words, entry)
+    return found
+
+
+SCHEMAS = json.loads((Path(__file__).parents[2] / "docs/schemas/vespfleet.json").read_text())["$defs"]
+TYPES = {"object": dict, "string": str, "integer": int, "number": (int, float), "null": type(None)}
+
+
+def fits(value, schema):
+    """The part of JSON Schema that these schemas use."""
+    types = schema.get("type", [])
+    types = [types] if isinstance(types, str) else types
+    if types and not any(isinstance(value, TYPES[name]) and not isinstance(value, bool) for name in types):
+        return False
+    if value != schema.get("const", value) or value not in schema.get("enum", [value]):
+        return False
+    if not isinstance(value, dict):
+        return value is None or value >= schema["minimum"] if "minimum" in schema else True
+    known, rest = schema.get("properties", {}), schema.get("additionalProperties", True)
+    return set(schema.get("required", [])) <= set(value) and all(
+        fits(value[name], known.get(name, rest)) if isinstance(known.get(name, rest), dict) else rest for name in value)
 
 
 def line(device, day=DAY, revision=1, created=0, build="A", scalars=None, distributions=None, histograms=None):
@@ -51,11 +79,15 @@ class Model:
     def __init__(self, lines, least=5):
         self.least = least
         self.current = {}
+        self.counts = dict.fromkeys(("new", "replaced", "repeated", "older"), 0)
         for text in lines:
             entry = json.loads(text)
             rank = (entry["revision"], entry["created"]["date"], hashlib.sha256(text.encode()).digest())
             at = (entry["day"], entry["device"])
-            if at not in self.current or self.current[at][0] < rank:
+            known = self.current.get(at, (rank,))[0]
+            self.counts["new" if at not in self.current else "replaced" if known < rank else
+                        "older" if known > rank else "repeated"] += 1
+            if at not in self.current or known < rank:
                 self.current[at] = (rank, entry)
 
     def values(self, key, kind, by, total):
@@ -213,6 +245,7 @@ def some_lines(chance, devices=40, days=3):
 def test_answers(store, folder, chance):
     lines = some_lines(chance)
     model = Model(lines)
+    history = []
     for attempt in range(2):
         chance.shuffle(lines)
         half = len(lines) // 2 + attempt
@@ -220,7 +253,10 @@ def test_answers(store, folder, chance):
         (folder / "in/1.jsonl").write_text("\n".join(lines[:half]) + "\n")
         packed = gzip.compress((lines[half] + "\n").encode()) + gzip.compress("\n".join(lines[half + 1:]).encode())
         (folder / "in/2.jsonl.gz").write_bytes(packed)
-        assert ask("load", store, folder / "in")[0]["lines"] == len(lines)
+        counts = ask("load", store, folder / "in")[0]
+        before, after = Model(history).counts, Model(history + lines).counts
+        assert_same({name: counts[name] for name in after}, {name: after[name] - before[name] for name in after}, "load")
+        history += lines
         assert_answers(store, model)
     rows = run("dump", store, "--key", "a", "--to", DAY).splitlines()
     expected = {f"{device},{day},2024-10-04,{entry['revision']},{entry['build'] or ''},,scalar,a,value,"
@@ -240,16 +276,19 @@ def test_answers(store, folder, chance):
                   ("keys", "ftp://x/y"), ("keys", "http://u:p@127.0.0.1:1/x")):
         run(*words, status=2)
 
-    run("forget", store, "D3", "D39")
+    assert ask("forget", store, "D3", "D39")[0]["devices"] == 2
     lines = [text for text in lines if json.loads(text)["device"] not in ("D3", "D39")]
     assert_answers(store, Model(lines))
     lines.append(line("D7", 84005))  # the newest day has a single device
     run("load", store, "-", data="\n".join(lines + [line("D3")]).encode())
-    run("prune", store, "--days", 1)
+    assert ask("prune", store, "--days", 1)[0]["firstDay"] == DAY + 1
     assert ask("load", store, "-")[0]["lines"] == 0
     run("load", store, "-", data=lines[0].encode())
     assert_answers(store, Model([text for text in lines if json.loads(text)["day"] > DAY]))
-    if "://" not in store:
+    if "://" in store:
+        rows = post(f"SELECT count() - uniqExact(day, device) FROM {store.split('/')[-1]}.vespfleet_report")
+        assert int(rows) == 0, "replaced lines stay after merging"
+    else:
         held = Path(store).read_bytes()
         assert b"D39" not in held and b"only.39" not in held, "what a device sent is still in the file"
 
@@ -361,16 +400,114 @@ def test_page(store, folder, chance):
     assert (folder / "page").stat().st_mode & 0o777 == 0o600 and run("page", store) == (folder / "page").read_text()
 
 
+EARLIER = {"vespfleet_scalar": "key String, day Int32, device String, line UInt64, value Int64",
+           "vespfleet_distribution":
+               "key String, day Int32, device String, line UInt64, minimum Float64, maximum Float64, mean Float64,"
+               " deviations Float64, count Int64, hasHistogram UInt8, labels Array(String), counts Array(UInt64)",
+           "vespfleet_line": "day Int32, device String, revision Int64, seconds Int64, nanoseconds UInt32, line UInt64,"
+                             " text String"}
+EARLIER_FILE = """PRAGMA application_id = 0x76666C74; PRAGMA user_version = 1;
+  CREATE TABLE device(number INTEGER PRIMARY KEY, name TEXT NOT NULL UNIQUE) STRICT;
+  CREATE TABLE key(number INTEGER PRIMARY KEY, kind INTEGER NOT NULL, name TEXT NOT NULL,
+                   UNIQUE(name, kind)) STRICT;
+  CREATE TABLE label(number INTEGER PRIMARY KEY, name TEXT NOT NULL UNIQUE) STRICT;
+  CREATE TABLE line(number INTEGER PRIMARY KEY AUTOINCREMENT, day INTEGER NOT NULL,
+                    device INTEGER NOT NULL, revision INTEGER NOT NULL, seconds INTEGER NOT NULL,
+                    nanoseconds INTEGER NOT NULL, size INTEGER NOT NULL, text BLOB NOT NULL,
+                    UNIQUE(day, device)) STRICT;
+  CREATE TABLE chunk(number INTEGER PRIMARY KEY, last INTEGER NOT NULL, entries BLOB NOT NULL)
+    STRICT;
+  CREATE TABLE replaced(lines INTEGER NOT NULL) STRICT;"""
+
+
+def test_earlier_version(store, folder, chance):
+    texts = []
+    for text in some_lines(chance, devices=9, days=1) + [line("long", scalars={"k" * 1025: 1})]:
+        entry = json.loads(text)
+        del entry["build"], entry["model"]
+        texts.append(json.dumps(dict(entry, version=1)))
+    if "://" in store:
+        at = store.split("/")[-1] + "."
+        for name, columns in EARLIER.items():
+            post(f"CREATE TABLE {at}{name} ({columns}) ENGINE = MergeTree PARTITION BY day ORDER BY day")
+        post(f"INSERT INTO {at}vespfleet_line FORMAT JSONEachRow " + json.dumps({"text": "one"})
+             + "".join(json.dumps({"text": text}) for text in texts))
+    else:
+        database = sqlite3.connect(store)
+        database.executescript(EARLIER_FILE)
+        for number, text in enumerate(texts + ["one"]):
+            database.execute("INSERT INTO line VALUES(?, ?, 0, 0, 0, 0, ?, ?)",
+                             (number + 1, number, len(text), zlib.compress(text.encode())))
+        database.commit()
+        database.close()
+    run("keys", store, status=1)
+    assert run.errors.count("\n") == 1, run.errors
+    load = subprocess.run([PROGRAM, "load", store, "-"], input=b"", capture_output=True, check=True)
+    assert load.stderr.count(b"earlier version is dropped") == 2, load.stderr
+    model = Model(json.dumps(dict(json.loads(text), build=None)) for text in texts[:-1])
+    for (day, device), (_, entry) in model.current.items():  # the digest is that of the earlier text
+        rivals = [text for text in texts[:-1] if json.loads(text)["device"] == device]
+        model.current[(day, device)] = (None, dict(json.loads(max(rivals, key=lambda text: (
+            json.loads(text)["revision"], json.loads(text)["created"]["date"],
+            hashlib.sha256(text.encode()).digest()))), build=None))
+    assert_same(ask("keys", store), list(model.keys()), "keys")
+    assert_same(ask("scalar", store, "a", "--by", "build"), list(model.scalar("a", "build")), "scalar")
+    assert_same(ask("distribution", store, "d"), list(model.distribution("d")), "distribution")
+
+
+def test_encrypted(store, folder, _):
+    if "://" not in store:
+        return
+    subprocess.run(["openssl", "req", "-x509", "-newkey", "rsa:2048", "-nodes", "-keyout", folder / "key", "-out",
+                    folder / "ca", "-days", "2", "-subj", "/CN=here", "-addext", "subjectAltName=IP:127.0.0.1"],
+                   check=True, capture_output=True)
+    seen = []
+
+    class Front(http.server.BaseHTTPRequestHandler):
+        def do_POST(self):
+            seen.append(self.headers["Authorization"])
+            body = self.rfile.read(int(self.headers["Content-Length"]))
+            answer = urllib.request.urlopen(SERVER + self.path, body).read()
+            self.send_response(200)
+            self.send_header("Content-Length", str(len(answer)))
+            self.end_headers()
+            self.wfile.write(answer)
+
+        def log_message(self, *_):
+            pass
+
+    front = http.server.ThreadingHTTPServer(("127.0.0.1", 0), Front)
+    context = ssl.SSLContext(ssl.PROTOCOL_TLS_SERVER)
+    context.load_cert_chain(folder / "ca", folder / "key")
+    front.socket = context.wrap_socket(front.socket, server_side=True)
+    threading.Thread(target=front.serve_forever, daemon=True).start()
+    address = f"https://127.0.0.1:{front.server_port}/{store.split('/')[-1]}"
+    (folder / "who").write_text("user:pass:word\n")
+    run("load", address, "/dev/null", status=1)  # nobody vouches for the certificate
+    os.environ.update(VESPFLEET_CA=str(folder / "ca"), VESPFLEET_CREDENTIALS=str(folder / "who"))
+    (folder / "who").chmod(0o640)
+    run("load", address, "/dev/null", status=1)  # others can read it
+    assert not seen
+    (folder / "who").chmod(0o600)
+    run("load", address, "-", data="\n".join(line(f"D{i}", scalars={"a": 1}) for i in range(5)).encode())
+    assert ask("keys", address)[0]["devices"] == 5
+    assert set(seen) == {"Basic " + base64.b64encode(b"user:pass:word").decode()}, seen
+    del os.environ["VESPFLEET_CA"], os.environ["VESPFLEET_CREDENTIALS"]
+    front.shutdown()
+
+
+def post(statement):
+    return urllib.request.urlopen(SERVER, statement.encode()).read().decode()
+
+
 def main():
     chance = random.Random(7)
     for name, test in sorted(globals().items()):
-        if not name.startswith("test_"):
+        if not name.startswith("test_") or sys.argv[2:] not in ([], [name]):
             continue
         with tempfile.TemporaryDirectory() as folder:
             test(f"{folder}/store", Path(folder), chance)
         if SERVER:
-            def post(statement):
-                urllib.request.urlopen(SERVER, statement.encode()).read()
             post(f"DROP DATABASE IF EXISTS {name}")
             post(f"CREATE DATABASE {name}")
             with tempfile.TemporaryDirectory() as folder:

@@ -25,4 +25,35 @@ std::unique_ptr<FleetStore> openFleetStore(const std::string& address, StoreUse 
   return std::make_unique<SqliteStore>(address, use, least);
 }
 
+void FleetStore::answerScalar(const Question& question, const VisitScalar& visit) {
+  bool isAnswered = false;
+  visitScalars(question, [&](const ScalarAnswer& answer) {
+    isAnswered = true;
+    visit(answer);
+  });
+  if (!isAnswered) {
+    requireKey(question.key, KeyKind::Scalar);
+  }
+}
+
+void FleetStore::answerDistribution(const Question& question, const VisitDistribution& visit) {
+  bool isAnswered = false;
+  visitDistributions(question, [&](const DistributionAnswer& answer) {
+    isAnswered = true;
+    visit(answer);
+  });
+  if (!isAnswered) {
+    requireKey(question.key, KeyKind::Distribution);
+  }
+}
+
+void FleetStore::requireKey(const std::string& key, KeyKind kind) {
+  const bool isScalar = kind == KeyKind::Scalar;
+  if (!hasKey(key, kind)) {
+    const bool isOther = hasKey(key, isScalar ? KeyKind::Distribution : KeyKind::Scalar);
+    throw StoreFailure(key + ": " + (isOther ? "is a " : "the store has no such ") +
+                       (isScalar == isOther ? "distribution" : "scalar"));
+  }
+}
+
 }  // namespace vesprun

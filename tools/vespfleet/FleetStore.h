@@ -35,13 +35,6 @@ enum class Member { None, Build, Model, Whitelist };
 
 using MemberText = std::optional<std::string>;  ///< null sorts first
 
-/// Where a value comes from. Devices and texts are numbers of this store; 0 means none.
-struct Origin {
-  std::int32_t day = 0;
-  std::int64_t device = 0;
-  std::int64_t member = 0;
-};
-
 /// A key, and on how many devices and days it was reported.
 struct ReportedKey {
   std::string key;
@@ -50,11 +43,40 @@ struct ReportedKey {
   std::uint64_t days = 0;
 };
 
-/// For each of two groups of devices, the mean of each device's values over the days.
-struct KeyMeans {
+/// A question about one key.
+struct Question {
+  std::string key;
+  DayRange days;
+  Member by = Member::None;
+  bool total = false;       ///< all days together
+  std::uint64_t least = 0;  ///< an answer over fewer devices only counts them
+};
+
+/// What devices an answer is about.
+struct AnsweredGroup {
+  std::int32_t from = 0;  ///< the first day, or the only one
+  std::int32_t to = 0;
+  std::uint64_t deviceDays = 0;
+  std::uint64_t devices = 0;
+  MemberText member;
+};
+
+struct ScalarAnswer {
+  AnsweredGroup group;
+  std::optional<Summary> summary;  ///< nothing of too few devices
+};
+
+struct DistributionAnswer {
+  AnsweredGroup group;
+  std::optional<Statistics> statistics;  ///< nothing of too few devices
+  std::optional<Histogram> histogram;
+};
+
+/// For each of two groups of devices, the means of each device's values over the days.
+struct KeySpreads {
   std::string key;
   KeyKind kind = KeyKind::Scalar;
-  std::array<std::vector<double>, 2> means;
+  std::array<Spread, 2> groups;
 };
 
 struct ComparedGroups {
@@ -69,6 +91,8 @@ using VisitLine = std::function<void(const ExportedLine& line)>;
 
 /// What became of a line that a store was given.
 enum class Outcome { New, Replaced, Repeated, Older, Refused };
+inline constexpr std::size_t kOutcomes = 5;
+using Outcomes = std::array<std::uint64_t, kOutcomes>;  ///< how many lines became what
 
 /// What was removed.
 struct Removal {
@@ -92,15 +116,17 @@ class FleetStore {
   virtual std::uint64_t least() = 0;
 
   /// Takes a line. It is stored whole or not at all, and durable once `finish` has returned.
-  virtual Outcome add(const ExportedLine& line) = 0;
+  virtual void add(const ExportedLine& line) = 0;
   virtual void finish() = 0;
+  /// Of the lines that were added, once `finish` has returned.
+  const Outcomes& outcomes() const { return _outcomes; }
 
   using VisitKey = std::function<void(const ReportedKey& key)>;
   using VisitDevices =
       std::function<void(std::int32_t day, const MemberText& member, std::uint64_t devices)>;
-  using VisitScalar = std::function<void(const Origin& origin, std::int64_t value)>;
-  using VisitDistribution = std::function<void(const Origin& origin, Distribution&& values)>;
-  using VisitMeans = std::function<void(KeyMeans&& means)>;
+  using VisitScalar = std::function<void(const ScalarAnswer& answer)>;
+  using VisitDistribution = std::function<void(const DistributionAnswer& answer)>;
+  using VisitSpreads = std::function<void(KeySpreads&& spreads)>;
 
   /// The keys of the current lines, by their bytes, a scalar before a distribution.
   virtual void visitKeys(const VisitKey& visit) = 0;
@@ -108,14 +134,12 @@ class FleetStore {
   virtual bool hasMember(Member by, const std::string& value) = 0;
   /// How many devices have a day as their last, by day and then by the last line's member.
   virtual void visitLastDays(Member by, const VisitDevices& visit) = 0;
-  /// What the devices reported under `key`, by day.
-  virtual void visitScalars(std::string_view key, const DayRange& days, Member by,
-                            const VisitScalar& visit) = 0;
-  virtual void visitDistributions(std::string_view key, const DayRange& days, Member by,
-                                  const VisitDistribution& visit) = 0;
-  /// The text of a member's number, of the values visited so far.
-  virtual MemberText textOf(std::int64_t member) = 0;
-  virtual void visitMeans(const ComparedGroups& groups, const VisitMeans& visit) = 0;
+  /// Answers by day and then by the text of the member. A key that the store does not have is a
+  /// failure.
+  void answerScalar(const Question& question, const VisitScalar& visit);
+  void answerDistribution(const Question& question, const VisitDistribution& visit);
+  /// The keys that begin so and that devices of both groups have.
+  virtual void visitSpreads(const ComparedGroups& groups, const VisitSpreads& visit) = 0;
   /// The current lines of those days with the keys that begin with `prefix`, by day.
   virtual void visitLines(const DayRange& days, const std::string& prefix,
                           const VisitLine& visit) = 0;
@@ -125,6 +149,17 @@ class FleetStore {
   /// Removes the lines of more than `days` days before the newest day that enough devices have and
   /// that is not after `latest`, and refuses such lines from then on.
   virtual Removal prune(std::int32_t days, std::int32_t latest) = 0;
+
+ protected:
+  virtual void visitScalars(const Question& question, const VisitScalar& visit) = 0;
+  virtual void visitDistributions(const Question& question, const VisitDistribution& visit) = 0;
+  void clearOutcomes() { _outcomes = {}; }
+  void count(Outcome outcome) { ++_outcomes[static_cast<std::size_t>(outcome)]; }
+
+ private:
+  void requireKey(const std::string& key, KeyKind kind);
+
+  Outcomes _outcomes{};
 };
 
 /// What is wrong with an address; empty when nothing is.

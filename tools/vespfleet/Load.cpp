@@ -5,13 +5,13 @@
 
 #include <algorithm>
 #include <cerrno>
-#include <chrono>
 #include <cstdio>
 #include <cstring>
 #include <filesystem>
 
 #include "FleetStore.h"
 #include "LineSource.h"
+#include "commandline/Progress.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/LineReader.h"
 
@@ -35,6 +35,7 @@ struct ReadFile {
 };
 
 void complainOf(const std::string& path, const std::string& why) {
+  Progress::hide();
   std::fprintf(stderr, "%s: %s\n", printableText(path).c_str(), why.c_str());
 }
 
@@ -121,12 +122,12 @@ class Loading {
       }
       ++_counts.lines;
       if (line) {
-        count(_store.add(*line));
+        _store.add(*line);
       } else {
         ++_counts.malformed;
         complainOf(name + ':' + std::to_string(lines.number()), why);
       }
-      showProgress();
+      _progress.advance();
     }
     const bool failed = result == LineReader::Result::Failed;
     if (failed) {
@@ -141,12 +142,6 @@ class Loading {
         finish();
       }
     }
-  }
-
-  void count(Outcome outcome) {
-    std::uint64_t* const counts[] = {&_counts.added, &_counts.replaced, &_counts.repeated,
-                                     &_counts.older, &_counts.refused};
-    ++*counts[static_cast<std::size_t>(outcome)];
   }
 
   /// Removes a file, or moves it aside, unless another has taken its place since.
@@ -183,21 +178,11 @@ class Loading {
     return false;
   }
 
-  void showProgress() {
-    using Clock = std::chrono::steady_clock;
-    if (!_isTerminal || Clock::now() - _shown < std::chrono::seconds(1)) {
-      return;
-    }
-    _shown = Clock::now();
-    std::fprintf(stderr, "\r%llu lines\r", static_cast<unsigned long long>(_counts.lines));
-  }
-
   FleetStore& _store;
   bool _spools;
   LoadCounts _counts;
   std::vector<ReadFile> _read;
-  bool _isTerminal = isatty(STDERR_FILENO) == 1;
-  std::chrono::steady_clock::time_point _shown = std::chrono::steady_clock::now();
+  Progress _progress{"load", "lines"};
 };
 
 }  // namespace
@@ -210,7 +195,9 @@ LoadCounts loadFiles(const std::string& address, std::optional<int> least,
     loading.load(path);
   }
   loading.finish();
-  return loading.counts();
+  LoadCounts counts = loading.counts();
+  counts.outcomes = store->outcomes();
+  return counts;
 }
 
 }  // namespace vesprun

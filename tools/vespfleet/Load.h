@@ -5,17 +5,15 @@
 #include <string>
 #include <vector>
 
+#include "FleetStore.h"
+
 namespace vesprun {
 
 struct LoadCounts {
   std::uint64_t lines = 0;  ///< all that were met
-  std::uint64_t added = 0;
-  std::uint64_t replaced = 0;
-  std::uint64_t repeated = 0;
-  std::uint64_t older = 0;
   std::uint64_t malformed = 0;
-  std::uint64_t refused = 0;  ///< of forgotten devices and pruned days
-  bool failed = false;        ///< a file could not be read to its end
+  Outcomes outcomes{};  ///< of the others
+  bool failed = false;  ///< a file could not be read to its end
 };
 
 /// Loads the lines of files into the store at `address`; "-" is standard input, a folder stands for

@@ -104,7 +104,7 @@ void printScalars(FleetStore& store, const Question& question, bool json) {
     titles.push_back(std::to_string(percent) + " %");
   }
   Results results(std::move(titles), json);
-  answerScalar(store, question, [&](const ScalarAnswer& answer) {
+  store.answerScalar(question, [&](const ScalarAnswer& answer) {
     if (json) {
       JsonLine line = beginLine(answer.group, question);
       if (answer.summary) {
@@ -137,7 +137,7 @@ void printDistributions(FleetStore& store, const Question& question, bool json) 
   std::vector<std::string> titles = titlesOf(question);
   titles.insert(titles.end(), {"values", "mean", "deviation", "histogram"});
   Results results(std::move(titles), json);
-  answerDistribution(store, question, [&](const DistributionAnswer& answer) {
+  store.answerDistribution(question, [&](const DistributionAnswer& answer) {
     bool overlap = false;
     std::vector<std::string> labels;
     if (answer.histogram) {

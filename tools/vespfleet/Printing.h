@@ -4,7 +4,6 @@
 #include <string>
 #include <vector>
 
-#include "Answers.h"
 #include "Comparison.h"
 
 namespace vesprun {

@@ -121,6 +121,33 @@ Summary summaryOf(std::vector<DeviceValue> values, std::uint64_t least) {
   return summary;
 }
 
+bool areEqual(double left, double right, bool areMerged) {
+  constexpr double kRounding = 1e-12;
+  return left == right || (areMerged && std::abs(left - right) <=
+                                            kRounding * std::max(std::abs(left), std::abs(right)));
+}
+
+Spread spreadOf(std::vector<double> values, bool areMerged) {
+  Spread spread{values.size(), 0, 0};
+  if (values.empty()) {
+    return spread;
+  }
+  std::sort(values.begin(), values.end());  // the order of arrival changes no bit
+  const auto count = static_cast<long double>(values.size());
+  Sum sum;
+  for (const double value : values) {
+    sum.add(value);
+  }
+  spread.mean = sum.value() / count;
+  if (!areEqual(values.front(), values.back(), areMerged)) {
+    for (const double value : values) {
+      spread.variance += (value - spread.mean) * (value - spread.mean);
+    }
+    spread.variance /= count - 1;
+  }
+  return spread;
+}
+
 std::vector<std::string> labelsInOrder(const Histogram& histogram, bool& overlap) {
   struct Labelled {
     Bucket bucket;

@@ -70,6 +70,18 @@ inline constexpr int kPercents[] = {5, 25, 50, 75, 95};
 /// smallest.
 Summary summaryOf(std::vector<DeviceValue> values, std::uint64_t least);
 
+/// The values of a group of devices, one of each.
+struct Spread {
+  std::uint64_t count = 0;
+  long double mean = 0;
+  long double variance = 0;  ///< of count - 1; 0 where all values are equal
+};
+
+/// Are two values equal? Those that were merged may differ by what rounding takes.
+bool areEqual(double left, double right, bool areMerged);
+
+Spread spreadOf(std::vector<double> values, bool areMerged);
+
 /// The labels of a histogram by their boundaries, from low to high; labels of another form last.
 /// `overlap` becomes true when two buckets overlap: devices counted between different boundaries.
 std::vector<std::string> labelsInOrder(const Histogram& histogram, bool& overlap);

@@ -2,7 +2,6 @@
 #include <iostream>
 #include <memory>
 
-#include "Answers.h"
 #include "Comparison.h"
 #include "FigureRow.h"
 #include "FleetStore.h"
@@ -125,19 +124,19 @@ void addLoad(CLI::App& command) {
       "Removes files once they are stored; what has malformed lines goes to rejected/");
   command.callback([given] {
     const LoadCounts counts = loadFiles(given->store, given->least, given->paths, given->spools);
+    const auto& [added, replaced, repeated, older, refused] = counts.outcomes;
     if (isJson()) {
       Results({}, true).print({{"lines", counts.lines},
-                               {"new", counts.added},
-                               {"replaced", counts.replaced},
-                               {"repeated", counts.repeated},
-                               {"older", counts.older},
+                               {"new", added},
+                               {"replaced", replaced},
+                               {"repeated", repeated},
+                               {"older", older},
                                {"malformed", counts.malformed},
-                               {"refused", counts.refused}});
+                               {"refused", refused}});
     } else {
-      std::cout << counts.lines << " lines: " << counts.added << " new, " << counts.replaced
-                << " in place of earlier ones, " << counts.repeated << " repeated, " << counts.older
-                << " older, " << counts.malformed << " malformed, " << counts.refused
-                << " refused\n";
+      std::cout << counts.lines << " lines: " << added << " new, " << replaced
+                << " in place of earlier ones, " << repeated << " repeated, " << older << " older, "
+                << counts.malformed << " malformed, " << refused << " refused\n";
     }
     invocation().status = counts.malformed != 0 || counts.failed ? 1 : 0;
   });

@@ -1,9 +1,12 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
 #include <map>
+#include <optional>
 #include <set>
 #include <string>
+#include <tuple>
 #include <vector>
 
 #include "FleetStore.h"
@@ -12,51 +15,77 @@
 namespace vesprun {
 
 /// A fleet in a ClickHouse database, one row a line: an insert that was cut in the middle leaves
-/// whole lines, and a later revision replaces all values of the earlier one. Which line of a device
-/// and day is current is decided when a question is asked: loads need not wait for one another, and
-/// what is loaded twice is the same row.
+/// whole lines, and a later revision replaces all values of the earlier one.
+///
+/// The engine keeps the row of the highest rank for each device and day. A rank has no room for
+/// nanoseconds and digest; a load looks up what is stored and sends only what comes after it, and
+/// of equal ranks the engine keeps the row that came last.
+///
+/// Keys are spread over a few columns by their bytes: a question about one reads a part of a line.
+/// A week that is merged into one part is read as it lies; else the engine merges while it reads.
 class ClickHouseStore : public FleetStore {
  public:
   ClickHouseStore(const std::string& address, StoreUse use, std::optional<int> least);
 
   std::uint64_t least() override { return _least; }
-  Outcome add(const ExportedLine& line) override;
+  void add(const ExportedLine& line) override;
   void finish() override;
   void visitKeys(const VisitKey& visit) override;
   bool hasKey(std::string_view key, KeyKind kind) override;
   bool hasMember(Member by, const std::string& value) override;
   void visitLastDays(Member by, const VisitDevices& visit) override;
-  void visitScalars(std::string_view key, const DayRange& days, Member by,
-                    const VisitScalar& visit) override;
-  void visitDistributions(std::string_view key, const DayRange& days, Member by,
-                          const VisitDistribution& visit) override;
-  MemberText textOf(std::int64_t member) override {
-    return _texts.at(static_cast<std::size_t>(member));
-  }
-  void visitMeans(const ComparedGroups& groups, const VisitMeans& visit) override;
+  void visitSpreads(const ComparedGroups& groups, const VisitSpreads& visit) override;
   void visitLines(const DayRange& days, const std::string& prefix, const VisitLine& visit) override;
   Removal forget(std::span<const std::string> devices) override;
   Removal prune(std::int32_t days, std::int32_t latest) override;
 
+ protected:
+  void visitScalars(const Question& question, const VisitScalar& visit) override;
+  void visitDistributions(const Question& question, const VisitDistribution& visit) override;
+
  private:
+  /// Revision, seconds, nanoseconds, digest.
+  using Rank = std::tuple<std::int64_t, std::int64_t, std::int64_t, LineDigest>;
+  using Place = std::pair<std::int32_t, std::string>;  ///< day and device
+  struct Arrived {
+    Place place;
+    Rank rank;
+    std::string row;
+  };
+  /// Of the table of lines.
+  struct Part {
+    std::int32_t partition = 0;
+    std::string name;
+    bool isMerged = false;
+    std::uint64_t rows = 0;
+    bool operator==(const Part&) const = default;
+  };
+  using GroupKey = std::pair<std::int32_t, MemberText>;  ///< the day is 0 for all together
+  using LabelCounts = std::map<GroupKey, Histogram>;
+
+  void open(StoreUse use, std::optional<int> least);
+  void bringUpToDate();
   void readRules();
+  void sendBatch();
+  std::map<Place, Rank> ranksOf(const std::vector<Arrived>& batch);
+  void mergeParts();
+  std::vector<Part> parts(const DayRange& days = {});
+  void whileUnchanged(const DayRange& days, const std::function<void()>& ask);
   void removeWhere(const std::string& condition);
-  std::uint64_t count(const std::string& condition);
-  std::int64_t numberOf(MemberText text);
-  std::int64_t numberOfDevice(const std::string& device);
-  template <typename Row>
-  void readRows(const std::string& query, const Row& row);
+  std::uint64_t countRows(const std::string& query);
+  std::map<GroupKey, std::pair<std::int64_t, std::int64_t>> edgesOf(const Question& question);
+  LabelCounts labelsOf(const Question& question);
 
   std::string _address;
   HttpClient _server;
   std::uint64_t _least = kUsualLeast;
   std::int32_t _firstDay = 0;        ///< earlier lines are refused
   std::set<std::string> _forgotten;  ///< digests of devices' names
-  std::string _rows;                 ///< not sent yet
-  std::set<std::int32_t> _partitions;
-  std::vector<MemberText> _texts{std::nullopt};
-  std::map<std::string, std::int64_t> _numbers;
-  std::map<std::string, std::int64_t> _devices;
+  std::vector<Arrived> _batch;       ///< not sent yet
+  std::size_t _batchSize = 0;
+  std::set<std::int32_t> _batchPartitions;
+  std::set<std::int32_t> _partitions;  ///< that were loaded
+  std::string _source;                 ///< of current lines, in a query
 };
 
 }  // namespace vesprun

@@ -155,28 +155,62 @@ HttpClient::HttpClient(const std::string& address)
   }
 }
 
-std::string HttpClient::post(const std::string& query, std::string_view data) {
-  std::string answer;
-  post(query, data, [&answer](std::string_view piece) { answer.append(piece); });
-  return answer;
-}
+void HttpClient::set(const std::string& setting) { _url.append("&").append(setting); }
 
-void HttpClient::post(const std::string& query, std::string_view data, const TakePiece& take) {
-  CURL* curl = _curl.get();
+std::string HttpClient::urlOf(
+    std::initializer_list<std::pair<std::string, std::string>> arguments) {
   std::string url = _url;
-  if (!data.empty()) {
-    char* escaped = curl_easy_escape(curl, query.c_str(), static_cast<int>(query.size()));
+  for (const auto& [name, value] : arguments) {
+    char* escaped = curl_easy_escape(_curl.get(), value.c_str(), static_cast<int>(value.size()));
     if (escaped == nullptr) {
       throw std::bad_alloc();
     }
-    url.append("&query=").append(escaped);
+    url.append("&").append(name).append("=").append(escaped);
     curl_free(escaped);
   }
-  const std::string_view body = data.empty() ? std::string_view(query) : data;
+  return url;
+}
+
+std::string HttpClient::post(const std::string& query, std::string_view data) {
+  std::string answer;
+  const TakePiece take = [&answer](std::string_view piece) { answer.append(piece); };
+  if (data.empty()) {
+    ask(query, nullptr, take);
+    return answer;
+  }
+  curl_easy_setopt(_curl.get(), CURLOPT_POSTFIELDS, data.data());
+  curl_easy_setopt(_curl.get(), CURLOPT_POSTFIELDSIZE_LARGE, static_cast<curl_off_t>(data.size()));
+  perform(urlOf({{"query", query}}), take);
+  return answer;
+}
+
+void HttpClient::ask(const std::string& question, const SentTable* sent, const TakePiece& take) {
+  CURL* curl = _curl.get();
+  if (sent == nullptr) {
+    curl_easy_setopt(curl, CURLOPT_POSTFIELDS, question.data());
+    curl_easy_setopt(curl, CURLOPT_POSTFIELDSIZE_LARGE, static_cast<curl_off_t>(question.size()));
+    perform(_url, take);
+    return;
+  }
+  const std::unique_ptr<curl_mime, void (*)(curl_mime*)> form(curl_mime_init(curl), curl_mime_free);
+  curl_mimepart* part = form ? curl_mime_addpart(form.get()) : nullptr;
+  if (part == nullptr || curl_mime_name(part, sent->name.c_str()) != CURLE_OK ||
+      curl_mime_filename(part, sent->name.c_str()) != CURLE_OK ||
+      curl_mime_data(part, sent->rows.data(), sent->rows.size()) != CURLE_OK) {
+    throw std::bad_alloc();
+  }
+  curl_easy_setopt(curl, CURLOPT_MIMEPOST, form.get());
+  perform(urlOf({{"query", question},
+                 {sent->name + "_structure", sent->structure},
+                 {sent->name + "_format", "RowBinary"}}),
+          take);
+}
+
+/// Sends what was set, and reads the answer.
+void HttpClient::perform(const std::string& url, const TakePiece& take) {
+  CURL* curl = _curl.get();
   Answer answer{curl, take, {}, {}};
   curl_easy_setopt(curl, CURLOPT_URL, url.c_str());
-  curl_easy_setopt(curl, CURLOPT_POSTFIELDS, body.data());
-  curl_easy_setopt(curl, CURLOPT_POSTFIELDSIZE_LARGE, static_cast<curl_off_t>(body.size()));
   curl_easy_setopt(curl, CURLOPT_WRITEDATA, &answer);
   const CURLcode result = curl_easy_perform(curl);
   if (answer.failure) {

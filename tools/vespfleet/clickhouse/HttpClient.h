@@ -1,11 +1,20 @@
 #pragma once
 
 #include <functional>
+#include <initializer_list>
 #include <memory>
 #include <string>
 #include <string_view>
+#include <utility>
 
 namespace vesprun {
+
+/// A table that is sent with a question, in RowBinary.
+struct SentTable {
+  std::string name;
+  std::string structure;  ///< its columns
+  std::string rows;
+};
 
 /// Posts to one ClickHouse server. User and password come from `VESPFLEET_USER` and
 /// `VESPFLEET_PASSWORD`, else from the line USER:PASSWORD of the file `VESPFLEET_CREDENTIALS`;
@@ -20,15 +29,23 @@ class HttpClient {
   /// `address` must have no fault.
   explicit HttpClient(const std::string& address);
 
+  const std::string& address() const { return _address; }
+
+  /// Adds a setting to all further queries.
+  void set(const std::string& setting);
+
   /// Runs `query`, which inserts `data` if there is any, and returns what the server answers.
   /// Throws `StoreFailure` with the server's reason.
   std::string post(const std::string& query, std::string_view data = {});
 
-  /// The same for a query with a long answer, whose pieces `take` gets as they come.
+  /// The same for a question with a long answer, whose pieces `take` gets as they come.
   using TakePiece = std::function<void(std::string_view piece)>;
-  void post(const std::string& query, std::string_view data, const TakePiece& take);
+  void ask(const std::string& question, const SentTable* sent, const TakePiece& take);
 
  private:
+  std::string urlOf(std::initializer_list<std::pair<std::string, std::string>> arguments);
+  void perform(const std::string& url, const TakePiece& take);
+
   std::string _address;
   std::string _url;
   std::unique_ptr<void, void (*)(void*)> _curl;

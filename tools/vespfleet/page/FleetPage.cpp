@@ -6,7 +6,6 @@
 #include <map>
 #include <set>
 
-#include "Answers.h"
 #include "Comparison.h"
 #include "commandline/Progress.h"
 #include "common/Calendar.h"
@@ -120,7 +119,7 @@ class FleetPage {
       if (key.reported.kind == KeyKind::Scalar) {
         takeScalar(key);
       } else {
-        answerDistribution(_store, questionOf(key.reported), [&key](const auto& answer) {
+        _store.answerDistribution(questionOf(key.reported), [&key](const auto& answer) {
           if (answer.statistics) {
             const double mean = answer.statistics->mean;
             const double deviation = std::sqrt(answer.statistics->deviations /
@@ -139,7 +138,7 @@ class FleetPage {
 
   void takeScalar(FleetKey& key) {
     std::vector<std::pair<std::int32_t, Summary>> days;
-    answerScalar(_store, questionOf(key.reported), [&days](const ScalarAnswer& answer) {
+    _store.answerScalar(questionOf(key.reported), [&days](const ScalarAnswer& answer) {
       if (answer.summary) {
         days.emplace_back(answer.group.from, *answer.summary);
       }
@@ -153,10 +152,9 @@ class FleetPage {
       key.areMedians = key.areMedians && summary.quantiles[kMedian];
     }
     for (const auto& [day, summary] : days) {
-      const auto quantile = [&quantiles =
-                                 summary.quantiles](std::size_t place) -> std::optional<double> {
+      const auto quantile = [&summary](std::size_t place) -> std::optional<double> {
         return place == kMedian ? std::nullopt
-                                : std::optional(static_cast<double>(*quantiles[place]));
+                                : std::optional(static_cast<double>(*summary.quantiles[place]));
       };
       key.days.push_back(
           {day, key.areMedians ? static_cast<double>(*summary.quantiles[kMedian]) : summary.mean,
@@ -179,9 +177,9 @@ class FleetPage {
       }
     };
     if (widest->reported.kind == KeyKind::Scalar) {
-      answerScalar(_store, question, take);
+      _store.answerScalar(question, take);
     } else {
-      answerDistribution(_store, question, take);
+      _store.answerDistribution(question, take);
     }
     for (const auto& [build, day] : _buildsBegin) {
       _newestBuilds.push_back(build);
@@ -324,7 +322,7 @@ class FleetPage {
       }
     };
     if (key.reported.kind == KeyKind::Scalar) {
-      answerScalar(_store, question, [&](const ScalarAnswer& answer) {
+      _store.answerScalar(question, [&](const ScalarAnswer& answer) {
         std::optional<double> middle;
         if (answer.summary) {
           const auto& median = answer.summary->quantiles[kMedian];
@@ -333,7 +331,7 @@ class FleetPage {
         add(answer.group, middle);
       });
     } else {
-      answerDistribution(_store, question, [&](const DistributionAnswer& answer) {
+      _store.answerDistribution(question, [&](const DistributionAnswer& answer) {
         add(answer.group,
             answer.statistics ? std::optional(answer.statistics->mean) : std::nullopt);
       });

@@ -185,58 +185,7 @@ void SqliteStore::visitLastDays(Member by, const VisitDevices& visit) {
   });
 }
 
-void SqliteStore::visitScalars(std::string_view key, const DayRange& days, Member by,
-                               const VisitScalar& visit) {
-  guarded([&] {
-    const auto number = findNumber("key", key, KeyKind::Scalar);
-    if (!number) {
-      return;
-    }
-    for (const auto& [onDay, lines] : linesOf(days, by)) {
-      visitEntries(onDay, *number, lines,
-                   [&, day = onDay](PackedReader& entries, const Line* line) {
-                     const std::int64_t value = entries.signedInteger();
-                     if (line != nullptr) {
-                       visit({day, line->device, line->member}, value);
-                     }
-                   });
-    }
-  });
-}
-
-void SqliteStore::visitDistributions(std::string_view key, const DayRange& days, Member by,
-                                     const VisitDistribution& visit) {
-  guarded([&] {
-    const auto number = findNumber("key", key, KeyKind::Distribution);
-    if (!number) {
-      return;
-    }
-    std::unordered_map<std::int64_t, std::string> labels;
-    for (const auto& [onDay, lines] : linesOf(days, by)) {
-      visitEntries(onDay, *number, lines,
-                   [&, day = onDay](PackedReader& entries, const Line* line) {
-                     const PackedDistribution packed = readDistribution(entries);
-                     if (line == nullptr) {
-                       return;
-                     }
-                     Distribution distribution{packed.statistics, std::nullopt};
-                     if (packed.hasHistogram) {
-                       distribution.histogram.emplace();
-                     }
-                     for (const auto& [label, count] : packed.counts) {
-                       const auto [name, isNew] = labels.try_emplace(label);
-                       if (isNew) {
-                         name->second = textOf(label).value_or("");
-                       }
-                       (*distribution.histogram)[name->second] = count;
-                     }
-                     visit({day, line->device, line->member}, std::move(distribution));
-                   });
-    }
-  });
-}
-
-void SqliteStore::visitMeans(const ComparedGroups& groups, const VisitMeans& visit) {
+void SqliteStore::visitSpreads(const ComparedGroups& groups, const VisitSpreads& visit) {
   guarded([&] {
     std::array<std::int64_t, 2> members{};
     for (std::size_t side = 0; side < 2; ++side) {
@@ -258,7 +207,8 @@ void SqliteStore::visitMeans(const ComparedGroups& groups, const VisitMeans& vis
     std::array<std::vector<DeviceMean>, 2> means;
     SqliteStatement keys(*_database, "SELECT number, name, kind FROM key ORDER BY name, kind");
     while (keys.step()) {
-      KeyMeans found{std::string(keys.text(1)), static_cast<KeyKind>(keys.integer(2)), {}};
+      KeySpreads found{std::string(keys.text(1)), static_cast<KeyKind>(keys.integer(2)), {}};
+      const bool isScalar = found.kind == KeyKind::Scalar;
       if (!found.key.starts_with(groups.prefix)) {
         continue;
       }
@@ -271,7 +221,7 @@ void SqliteStore::visitMeans(const ComparedGroups& groups, const VisitMeans& vis
           DeviceMean& mean = line != nullptr ? means[static_cast<std::size_t>(line->member)]
                                                     [static_cast<std::size_t>(line->device)]
                                              : unused;
-          if (found.kind == KeyKind::Scalar) {
+          if (isScalar) {
             mean.integers += entries.signedInteger();
             ++mean.count;
           } else {
@@ -283,14 +233,15 @@ void SqliteStore::visitMeans(const ComparedGroups& groups, const VisitMeans& vis
         });
       }
       for (std::size_t side = 0; side < 2; ++side) {
+        std::vector<double> values;
         for (const DeviceMean& mean : means[side]) {
           if (mean.count != 0) {
-            found.means[side].push_back(
-                found.kind == KeyKind::Scalar
-                    ? meanOf(mean.integers, mean.count)
-                    : static_cast<double>(mean.sum / static_cast<long double>(mean.count)));
+            values.push_back(
+                isScalar ? meanOf(mean.integers, mean.count)
+                         : static_cast<double>(mean.sum / static_cast<long double>(mean.count)));
           }
         }
+        found.groups[side] = spreadOf(std::move(values), !isScalar);
       }
       visit(std::move(found));
     }

@@ -132,17 +132,16 @@ std::int64_t SqliteStore::shapeOf(std::vector<std::int64_t> keys) {
   return _numbers.emplace(std::move(shape), number).first->second;
 }
 
-Outcome SqliteStore::add(const ExportedLine& line) {
-  return guarded([&] {
+void SqliteStore::add(const ExportedLine& line) {
+  guarded([&] {
     if (!_inBatch) {
       beginBatch();
     }
-    const Outcome outcome = place(line);
+    count(place(line));
     _batchSize += line.size;
     if (_batchSize >= kBatchBytes || _pending.size() >= kMaxPending) {
       commitBatch();
     }
-    return outcome;
   });
 }
 

@@ -35,21 +35,20 @@ class SqliteStore : public FleetStore {
   ~SqliteStore() override;
 
   std::uint64_t least() override { return _least; }
-  Outcome add(const ExportedLine& line) override;
+  void add(const ExportedLine& line) override;
   void finish() override;
   void visitKeys(const VisitKey& visit) override;
   bool hasKey(std::string_view key, KeyKind kind) override;
   bool hasMember(Member by, const std::string& value) override;
   void visitLastDays(Member by, const VisitDevices& visit) override;
-  void visitScalars(std::string_view key, const DayRange& days, Member by,
-                    const VisitScalar& visit) override;
-  void visitDistributions(std::string_view key, const DayRange& days, Member by,
-                          const VisitDistribution& visit) override;
-  MemberText textOf(std::int64_t member) override;
-  void visitMeans(const ComparedGroups& groups, const VisitMeans& visit) override;
+  void visitSpreads(const ComparedGroups& groups, const VisitSpreads& visit) override;
   void visitLines(const DayRange& days, const std::string& prefix, const VisitLine& visit) override;
   Removal forget(std::span<const std::string> devices) override;
   Removal prune(std::int32_t days, std::int32_t latest) override;
+
+ protected:
+  void visitScalars(const Question& question, const VisitScalar& visit) override;
+  void visitDistributions(const Question& question, const VisitDistribution& visit) override;
 
  private:
   static constexpr std::size_t kMaxPending = 50'000;
@@ -68,6 +67,14 @@ class SqliteStore : public FleetStore {
     std::int64_t last = 0;
     std::string entries;
   };
+  /// Where a value comes from.
+  struct Origin {
+    std::int32_t day = 0;
+    std::int64_t device = 0;
+    std::int64_t member = 0;
+  };
+  template <typename Parts>
+  class Gathering;
   struct Statements;
   class Cursor;
 
@@ -88,6 +95,7 @@ class SqliteStore : public FleetStore {
   void removeUnused();
   void giveBackRoom();
 
+  MemberText textOf(std::int64_t member);
   std::vector<Line> linesOf(std::int32_t day, Member by);
   LinesOfDays linesOf(const DayRange& days, Member by);
   std::set<std::int64_t> keysOfShape(std::int64_t shape);

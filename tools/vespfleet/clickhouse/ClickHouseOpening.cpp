@@ -1,0 +1,215 @@
+#include <algorithm>
+#include <cstdio>
+
+#include "ClickHouseSql.h"
+#include "ClickHouseStore.h"
+#include "platform/host/documents/NumberText.h"
+
+namespace vesprun {
+namespace {
+
+struct Table {
+  const char* name;
+  std::string columns;  ///< as a server lists them
+  const char* engine;
+};
+
+std::string lineColumns() {
+  std::string columns =
+      "day Int32, device String, rank UInt64, revision Int64, seconds Int64, nanoseconds UInt32, "
+      "digest FixedString(32), build Array(String), model Array(String), whitelist Array(String)";
+  constexpr std::pair<const char*, const char*> kShared[] = {
+      {"scalars", "String"},       {"values", "Int64"},         {"distributions", "String"},
+      {"figures", "Float64"},      {"counts", "Int64"},         {"histograms", "UInt8"},
+      {"labels", "Array(String)"}, {"buckets", "Array(UInt64)"}};
+  for (int share = 0; share < kShares; ++share) {
+    for (const auto& [name, type] : kShared) {
+      columns += ", " + column(name, share) + " Array(" + type + ")";
+    }
+  }
+  return columns;
+}
+
+// A rule is the least number of devices, the first day that is taken, or a forgotten device.
+const Table kTables[] = {
+    {kRuleTable, "name String, value String", "ReplacingMergeTree ORDER BY (name, value)"},
+    {kLineTable, lineColumns(),
+     "ReplacingMergeTree(rank) PARTITION BY intDiv(day, 7) ORDER BY (day, device)"}};
+
+// What version 0.9 made; only the lines' texts are taken from it.
+const Table kEarlierTables[] = {
+    {"vespfleet_scalar", "key String, day Int32, device String, line UInt64, value Int64", ""},
+    {"vespfleet_distribution",
+     "key String, day Int32, device String, line UInt64, minimum Float64, maximum Float64, "
+     "mean Float64, deviations Float64, count Int64, hasHistogram UInt8, labels Array(String), "
+     "counts Array(UInt64)",
+     ""},
+    {"vespfleet_line",
+     "day Int32, device String, revision Int64, seconds Int64, nanoseconds UInt32, line UInt64, "
+     "text String",
+     ""}};
+
+}  // namespace
+
+ClickHouseStore::ClickHouseStore(const std::string& address, StoreUse use, std::optional<int> least)
+    : _address(address), _server(address) {
+  open(use, least);
+}
+
+void ClickHouseStore::open(StoreUse use, std::optional<int> least) {
+  std::map<std::string, std::string> found;
+  bool mergesApart = false;
+  // A server refuses settings that it does not know.
+  readRows(_server,
+           "SELECT table, name, type FROM system.columns WHERE database = currentDatabase() AND "
+           "table LIKE 'vespfleet_%' UNION ALL SELECT '', name, '' FROM system.settings WHERE name "
+           "= 'do_not_merge_across_partitions_select_final'",
+           [&](PackedReader& row) {
+             const std::string table = row.text();
+             const std::string name = row.text();
+             const std::string type = row.text();
+             mergesApart = mergesApart || table.empty();
+             found[table] += (found[table].empty() ? "" : ", ") + name + ' ' + type;
+           });
+  // What does not fit into memory goes through files.
+  _server.set("max_bytes_before_external_group_by=2000000000");
+  _server.set("max_bytes_before_external_sort=2000000000");
+  if (mergesApart) {
+    _server.set("do_not_merge_across_partitions_select_final=1");
+  }
+  const auto isThere = [&](const Table& table) {
+    const auto columns = found.find(table.name);
+    if (columns != found.end() && columns->second != table.columns) {
+      throw StoreFailure(_address + ": no fleet store: the table " + table.name +
+                         " has other columns");
+    }
+    return columns != found.end();
+  };
+  bool isEarlier = false;
+  for (const Table& table : kEarlierTables) {
+    isEarlier = isThere(table) || isEarlier;
+  }
+  std::vector<const Table*> missing;
+  for (const Table& table : kTables) {
+    if (!isThere(table)) {
+      missing.push_back(&table);
+    }
+  }
+  if (isEarlier && use != StoreUse::Load) {
+    throw StoreFailure(_address +
+                       ": a store of an earlier version; \"vespfleet load\" brings it up to date");
+  }
+  if (!missing.empty() && use != StoreUse::Load) {
+    throw StoreFailure(_address + ": no fleet store");
+  }
+  for (const Table* table : missing) {
+    _server.post(std::string("CREATE TABLE IF NOT EXISTS ") + table->name + "(" + table->columns +
+                 ") ENGINE = " + table->engine);
+  }
+  const bool isNew = !missing.empty() && missing.front()->name == kRuleTable;
+  if (isNew) {
+    std::string row;
+    appendText(row, "least");
+    appendText(row, std::to_string(isEarlier ? kUsualLeast : least.value_or(kUsualLeast)));
+    _server.post(std::string("INSERT INTO ") + kRuleTable + " FORMAT RowBinary", row);
+  }
+  readRules();
+  if (isEarlier) {
+    bringUpToDate();
+  }
+  if (least && static_cast<std::uint64_t>(*least) != _least) {
+    throw StoreFailure(_address + ": the least number of devices of this store is " +
+                       std::to_string(_least));
+  }
+}
+
+/// Takes the lines of an earlier version, whose tables go when all are stored.
+void ClickHouseStore::bringUpToDate() {
+  const std::string table = kEarlierTables[std::size(kEarlierTables) - 1].name;
+  HttpClient reader(_address);
+  if (_server.post("EXISTS TABLE " + table).starts_with('1')) {
+    readRows(reader, "SELECT text FROM " + table, [&](PackedReader& row) {
+      const std::string text = row.text();
+      std::string why;
+      if (const auto line = parseExportedLine(text, why, 1)) {
+        add(*line);
+      } else {
+        std::fprintf(stderr, "vespfleet load: %s: a line of the earlier version is dropped: %s\n",
+                     _address.c_str(), why.c_str());
+      }
+    });
+  }
+  finish();
+  clearOutcomes();
+  for (const Table& earlier : kEarlierTables) {
+    _server.post(std::string("DROP TABLE IF EXISTS ") + earlier.name);
+  }
+}
+
+void ClickHouseStore::readRules() {
+  readRows(_server, std::string("SELECT name, value FROM ") + kRuleTable,
+           [this](PackedReader& row) {
+             const std::string name = row.text();
+             const std::string value = row.text();
+             if (name == "forgotten") {
+               _forgotten.insert(value);
+             } else if (std::int32_t number = 0; parseWholeText(value, number)) {
+               if (name == "least") {
+                 _least = static_cast<std::uint64_t>(std::max(number, kMinLeast));
+               } else if (name == "first day") {
+                 _firstDay = std::max(_firstDay, number);
+               }
+             }
+           });
+}
+
+/// The parts of the table that have lines of those days.
+std::vector<ClickHouseStore::Part> ClickHouseStore::parts(const DayRange& days) {
+  std::vector<Part> found;
+  readRows(_server,
+           "SELECT partition, name, toUInt64(level), toUInt64(rows) FROM system.parts WHERE active "
+           "AND database = currentDatabase() AND table = '" +
+               std::string(kLineTable) + "' ORDER BY partition, name",
+           [&](PackedReader& row) {
+             Part part;
+             const std::string partition = row.text();
+             part.name = row.text();
+             part.isMerged = row.raw<std::uint64_t>() != 0;
+             part.rows = row.raw<std::uint64_t>();
+             if (parseWholeText(partition, part.partition) &&
+                 part.partition >= days.from / kDaysOfPartition &&
+                 part.partition <= days.to / kDaysOfPartition) {
+               found.push_back(std::move(part));
+             }
+           });
+  return found;
+}
+
+/// Asks about the lines of those days, as they lie where each partition is one merged part, which
+/// has no line twice. When that changes meanwhile, `ask` is called again.
+void ClickHouseStore::whileUnchanged(const DayRange& days, const std::function<void()>& ask) {
+  const std::vector<Part> before = parts(days);
+  bool isMerged = true;
+  for (std::size_t i = 0; i < before.size(); ++i) {
+    isMerged = isMerged && before[i].isMerged &&
+               (i == 0 || before[i].partition != before[i - 1].partition);
+  }
+  if (isMerged) {
+    _source = kLineTable;
+    ask();
+    if (parts(days) == before) {
+      return;
+    }
+  }
+  _source = std::string(kLineTable) + " FINAL";
+  ask();
+}
+
+std::uint64_t ClickHouseStore::countRows(const std::string& query) {
+  std::uint64_t number = 0;
+  readRows(_server, "SELECT toUInt64(count()) FROM (" + query + ")",
+           [&](PackedReader& row) { number = row.raw<std::uint64_t>(); });
+  return number;
+}
+
+}  // namespace vesprun

@@ -1,0 +1,105 @@
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <stdexcept>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "FleetStore.h"
+#include "HttpClient.h"
+#include "Varint.h"
+
+namespace vesprun {
+
+// What the sources of `ClickHouseStore` have in common: the tables, and pieces of queries.
+
+inline constexpr std::int32_t kDaysOfPartition = 7;
+inline constexpr const char* kLineTable = "vespfleet_report";
+inline constexpr const char* kRuleTable = "vespfleet_rule";
+
+/// How many columns the keys are spread over.
+inline constexpr int kShares = 8;
+int shareOf(std::string_view key);
+
+/// A column of a share, such as "scalars3".
+inline std::string column(const char* name, int share) { return name + std::to_string(share); }
+
+std::string hexOf(std::string_view bytes);
+
+/// A text literal of any bytes.
+inline std::string literal(std::string_view text) { return "unhex('" + hexOf(text) + "')"; }
+
+/// All that is kept of the name of a forgotten device.
+std::string nameDigest(std::string_view device);
+
+inline std::string within(const DayRange& days) {
+  return "day BETWEEN " + std::to_string(days.from) + " AND " + std::to_string(days.to);
+}
+
+/// The column of a member: an array of one text, or of none.
+std::string columnOf(Member by);
+
+inline const char* keysOf(KeyKind kind) {
+  return kind == KeyKind::Scalar ? "scalars" : "distributions";
+}
+
+/// The sum of integers in two halves of 32 bits, which cannot overflow.
+inline constexpr const char* kHigherSum = "toInt64(sum(bitShiftRight(value, 32)))";
+inline constexpr const char* kLowerSum = "toInt64(sum(toInt64(bitAnd(value, 4294967295))))";
+
+MemberText readText(PackedReader& row);
+
+template <typename T>
+std::vector<T> readArray(PackedReader& row) {
+  std::vector<T> values;
+  for (std::uint64_t left = row.varint(); left > 0; --left) {
+    if constexpr (std::is_same_v<T, std::string>) {
+      values.push_back(row.text());
+    } else {
+      values.push_back(row.raw<T>());
+    }
+  }
+  return values;
+}
+
+/// Reads all rows of an answer in RowBinary by `row`, as they come. What `row` does before it has
+/// read its row to the end may be done again.
+template <typename Row>
+void readRows(HttpClient& server, const std::string& query, const Row& row,
+              const SentTable* sent = nullptr) {
+  constexpr std::size_t kMaxRow = std::size_t{1} << 30;
+  std::string rest;
+  std::size_t wanted = 0;
+  server.ask(query + " FORMAT RowBinary", sent, [&](std::string_view piece) {
+    rest.append(piece);
+    if (rest.size() < wanted) {
+      return;
+    }
+    std::size_t taken = 0;
+    try {
+      while (taken < rest.size()) {
+        PackedReader reader(std::string_view(rest).substr(taken));
+        row(reader);
+        taken = static_cast<std::size_t>(reader.position() - rest.data());
+      }
+    } catch (const std::out_of_range&) {
+      // The rest of the row is still to come.
+    }
+    rest.erase(0, taken);
+    wanted = 2 * rest.size();  // a long row is not read anew for each piece
+    if (rest.size() > kMaxRow) {
+      throw StoreFailure(server.address() + ": the server's answer is no answer to the question");
+    }
+  });
+  try {
+    for (PackedReader reader(rest); !reader.atEnd();) {
+      row(reader);
+    }
+  } catch (const std::out_of_range&) {
+    throw StoreFailure(server.address() + ": the server's answer is cut");
+  }
+}
+
+}  // namespace vesprun
