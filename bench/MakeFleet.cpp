@@ -1,5 +1,6 @@
 // Prints what a fleet of devices reported, day by day: as the lines that vespctl export writes, or
-// as tab-separated key, day, device and value of the scalars alone.
+// as tab-separated key, day, device and value of the scalars alone. "shifted" are lines of which
+// three scalars of one build are greater by a tenth of a standard deviation.
 
 #include <cstdarg>
 #include <cstdint>
@@ -48,7 +49,10 @@ std::uint64_t valueOf(std::mt19937_64& random) { return random() % 1'000'000; }
   text += piece;
 }
 
-void printLine(int day, const std::string& device, const char* build,
+constexpr int kShiftedKeys = 3;
+constexpr unsigned long long kShift = 28'868;  // values are even from 0 to 1,000,000
+
+void printLine(int day, const std::string& device, const char* build, bool isShifted,
                const std::vector<std::string>& keys, std::mt19937_64& random) {
   std::string scalars;
   std::string distributions;
@@ -57,7 +61,9 @@ void printLine(int day, const std::string& device, const char* build,
     const char* const name = keys[key].c_str();
     const unsigned long long value = valueOf(random);
     if (!isDistribution(static_cast<int>(key))) {
-      append(scalars, "%s\"%s\":%llu", scalars.empty() ? "" : ",", name, value);
+      const bool isGreater = isShifted && key <= kShiftedKeys;
+      append(scalars, "%s\"%s\":%llu", scalars.empty() ? "" : ",", name,
+             value + (isGreater ? kShift : 0));
       continue;
     }
     const double mean = static_cast<double>(value) / 1024;
@@ -76,7 +82,7 @@ void printLine(int day, const std::string& device, const char* build,
       device.c_str(), day, build, scalars.c_str(), distributions.c_str(), histograms.c_str());
 }
 
-void printRows(int day, const std::string& device, const char* /*build*/,
+void printRows(int day, const std::string& device, const char* /*build*/, bool /*isShifted*/,
                const std::vector<std::string>& keys, std::mt19937_64& random) {
   for (std::size_t key = 0; key < keys.size(); ++key) {
     const unsigned long long value = valueOf(random);
@@ -89,8 +95,10 @@ void printRows(int day, const std::string& device, const char* /*build*/,
 }  // namespace
 
 int main(int argc, char** argv) {
-  if (argc != 6 || (std::strcmp(argv[1], "lines") != 0 && std::strcmp(argv[1], "rows") != 0)) {
-    std::fprintf(stderr, "usage: MakeFleet lines|rows DEVICES KEYS DAYS SEED\n");
+  const bool printsRows = argc == 6 && std::strcmp(argv[1], "rows") == 0;
+  const bool shifts = argc == 6 && std::strcmp(argv[1], "shifted") == 0;
+  if (argc != 6 || (!printsRows && !shifts && std::strcmp(argv[1], "lines") != 0)) {
+    std::fprintf(stderr, "usage: MakeFleet lines|rows|shifted DEVICES KEYS DAYS SEED\n");
     return 2;
   }
   const Fleet fleet{std::atoi(argv[2]), std::atoi(argv[3]), std::atoi(argv[4]),
@@ -100,12 +108,14 @@ int main(int argc, char** argv) {
   for (int key = 0; key < fleet.keys; ++key) {
     keys.push_back(keyName(key));
   }
-  const auto print = std::strcmp(argv[1], "lines") == 0 ? printLine : printRows;
+  const auto print = printsRows ? printRows : printLine;
   for (int day = kFirstDay; day < kFirstDay + fleet.days; ++day) {
     for (int device = 0; device < fleet.devices; ++device) {
       std::mt19937_64 random(fleet.seed * 31 + static_cast<std::uint64_t>(day) * 1'000'003 +
                              static_cast<std::uint64_t>(device));
-      print(day, deviceName(fleet, device), device % 2 == 0 ? "24A1" : "24B2", keys, random);
+      const bool isLater = device % 2 != 0;
+      print(day, deviceName(fleet, device), isLater ? "24B2" : "24A1", shifts && isLater, keys,
+            random);
     }
   }
   return 0;
