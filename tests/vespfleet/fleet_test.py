@@ -467,7 +467,8 @@ def test_encrypted(store, folder, _):
         def do_POST(self):
             seen.append(self.headers["Authorization"])
             body = self.rfile.read(int(self.headers["Content-Length"]))
-            answer = urllib.request.urlopen(SERVER + self.path, body).read()
+            answer = urllib.request.urlopen(urllib.request.Request(
+                SERVER + self.path, body, {"Content-Type": self.headers["Content-Type"]})).read()
             self.send_response(200)
             self.send_header("Content-Length", str(len(answer)))
             self.end_headers()

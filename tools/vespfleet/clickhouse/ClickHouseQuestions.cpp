@@ -73,7 +73,8 @@ void ClickHouseStore::visitSpreads(const ComparedGroups& groups, const VisitSpre
     const std::string keys = column(keysOf(kind), share);
     const std::string values = column(isScalar ? "values" : "figures", share);
     const std::string numbers = column("counts", share);
-    // A device's mean; of equal values the value itself.
+    // A device's mean; of equal values the value itself. They are summed up in two halves, too, so
+    // that great ones do not take the place of small ones.
     const std::string sum = isScalar
                                 ? "(toFloat64(" + std::string(kHigherSum) +
                                       ") * 4294967296 + toFloat64(" + kLowerSum + ")) / count()"
@@ -83,7 +84,8 @@ void ClickHouseStore::visitSpreads(const ComparedGroups& groups, const VisitSpre
                                               values + ", arrayEnumerate(" + values +
                                               ")) AS value, " + numbers + " AS number";
     readRows(_server,
-             "SELECT key, side, count(), avg(mean), varSampStable(mean), min(mean), max(mean) FROM "
+             "SELECT key, side, count(), sum(floor(mean / 4294967296)), sum(mean - floor(mean / "
+             "4294967296) * 4294967296), varSampStable(mean), min(mean), max(mean) FROM "
              "(SELECT key, side, device, if(min(value) = max(value), toFloat64(any(value)), " +
                  sum + ") AS mean FROM (SELECT key, side, device, value" +
                  (isScalar ? "" : ", number") + " FROM (SELECT device, " + side +
@@ -97,7 +99,9 @@ void ClickHouseStore::visitSpreads(const ComparedGroups& groups, const VisitSpre
                const std::size_t of = row.raw<std::uint8_t>() != 0 ? 1 : 0;
                Spread spread;
                spread.count = row.raw<std::uint64_t>();
-               spread.mean = row.raw<double>();
+               const long double higher = row.raw<double>();
+               const long double lower = row.raw<double>();
+               spread.mean = (higher * 4294967296 + lower) / static_cast<long double>(spread.count);
                spread.variance = row.raw<double>();
                const auto lowest = row.raw<double>();
                const auto greatest = row.raw<double>();

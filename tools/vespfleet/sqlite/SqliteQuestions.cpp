@@ -8,7 +8,7 @@ namespace vesprun {
 namespace {
 
 /// The column of a member in `line`; 0 stands for no text.
-std::string columnOf(Member by) {
+std::string numberColumn(Member by) {
   switch (by) {
     case Member::Build:
       return "coalesce(build, 0)";
@@ -38,7 +38,7 @@ std::vector<SqliteStore::Line> SqliteStore::linesOf(std::int32_t day, Member by)
 
 SqliteStore::LinesOfDays SqliteStore::linesOf(const DayRange& range, Member by) {
   const std::string query =
-      "SELECT day, number, device, " + columnOf(by) + " FROM line WHERE day BETWEEN ? AND ?";
+      "SELECT day, number, device, " + numberColumn(by) + " FROM line WHERE day BETWEEN ? AND ?";
   SqliteStatement select(*_database, query.c_str());
   select.bind(1, range.from).bind(2, range.to);
   LinesOfDays days;
@@ -141,7 +141,7 @@ bool SqliteStore::hasMember(Member by, const std::string& value) {
     if (!number) {
       return false;
     }
-    const std::string query = "SELECT 1 FROM line WHERE " + columnOf(by) + " = ? LIMIT 1";
+    const std::string query = "SELECT 1 FROM line WHERE " + numberColumn(by) + " = ? LIMIT 1";
     SqliteStatement find(*_database, query.c_str());
     find.bind(1, *number);
     return find.step();
