@@ -205,8 +205,12 @@ void ClickHouseStore::mergeParts() {
   for (const std::int32_t partition : _partitions) {
     const Lines& lines = partitions[partition];
     if (!lines.isMerged && (lines.all - lines.mostOfPart) * kMaxRewritten >= lines.all) {
-      _server.post(std::string("OPTIMIZE TABLE ") + kLineTable + " PARTITION " +
-                   std::to_string(partition) + " FINAL");
+      try {
+        _server.post(std::string("OPTIMIZE TABLE ") + kLineTable + " PARTITION " +
+                     std::to_string(partition) + " FINAL");
+      } catch (const StoreFailure&) {
+        // The lines are stored; the server merges when it comes to it.
+      }
     }
   }
   _partitions.clear();
