@@ -20,7 +20,7 @@ inline constexpr const char* kLineTable = "vespfleet_report";
 inline constexpr const char* kRuleTable = "vespfleet_rule";
 
 /// How many columns the keys are spread over.
-inline constexpr int kShares = 8;
+inline constexpr int kShares = 4;
 int shareOf(std::string_view key);
 
 /// A column of a share, such as "scalars3".

@@ -162,6 +162,7 @@ void SqliteStore::bringUpToDate() {
   _database->commit();
   _turn.giveUp();
   _numbers.clear();
+  _lastKeys.clear();
 }
 
 }  // namespace vesprun

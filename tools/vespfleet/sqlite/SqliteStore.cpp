@@ -106,6 +106,18 @@ std::int64_t SqliteStore::numberOf(const char* table, std::string_view text,
   return _numbers.emplace(std::move(cached), *number).first->second;
 }
 
+/// The number of the key at a place of a line. Mostly the line before has the same one there.
+std::int64_t SqliteStore::numberOfKey(std::size_t place, const std::string& key, KeyKind kind) {
+  if (place >= _lastKeys.size()) {
+    _lastKeys.resize(place + 1);
+  }
+  LastKey& last = _lastKeys[place];
+  if (last.name != key || last.kind != kind) {
+    last = {key, kind, numberOf("key", key, kind)};
+  }
+  return last.number;
+}
+
 std::int64_t SqliteStore::shapeOf(std::vector<std::int64_t> keys) {
   std::sort(keys.begin(), keys.end());
   std::string shape;
@@ -179,10 +191,10 @@ Outcome SqliteStore::place(const ExportedLine& line) {
   std::vector<std::int64_t> keys;
   keys.reserve(line.scalars.size() + line.distributions.size());
   for (const ReportedScalar& scalar : line.scalars) {
-    keys.push_back(numberOf("key", scalar.key, KeyKind::Scalar));
+    keys.push_back(numberOfKey(keys.size(), scalar.key, KeyKind::Scalar));
   }
   for (const ReportedDistribution& reported : line.distributions) {
-    keys.push_back(numberOf("key", reported.key, KeyKind::Distribution));
+    keys.push_back(numberOfKey(keys.size(), reported.key, KeyKind::Distribution));
   }
   const auto text = [this](const std::string& found) { return numberOf("text", found); };
   _statements->insert.bind(1, line.day)
@@ -305,6 +317,7 @@ void SqliteStore::commitBatch() {
   _turn.giveUp();
   _inBatch = false;
   _numbers.clear();  // another load may go on from here
+  _lastKeys.clear();
   _batchSize = 0;
 }
 

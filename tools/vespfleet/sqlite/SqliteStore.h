@@ -75,6 +75,12 @@ class SqliteStore : public FleetStore {
   };
   template <typename Parts>
   class Gathering;
+  /// A key that has a number; an empty name is no key.
+  struct LastKey {
+    std::string name;
+    KeyKind kind = KeyKind::Scalar;
+    std::int64_t number = 0;
+  };
   struct Statements;
   class Cursor;
 
@@ -88,6 +94,7 @@ class SqliteStore : public FleetStore {
   std::optional<std::int64_t> findNumber(const char* table, std::string_view text,
                                          std::optional<KeyKind> kind = {});
   std::int64_t numberOf(const char* table, std::string_view text, std::optional<KeyKind> kind = {});
+  std::int64_t numberOfKey(std::size_t place, const std::string& key, KeyKind kind);
   void beginBatch();
   void writePending();
   void commitBatch();
@@ -115,6 +122,7 @@ class SqliteStore : public FleetStore {
   std::unique_ptr<Statements> _statements;                    ///< of a store that is changed
   bool _inBatch = false;                                      ///< and so in a transaction
   std::map<std::string, std::int64_t, std::less<>> _numbers;  ///< of names met in this batch
+  std::vector<LastKey> _lastKeys;                             ///< of the line before in this batch
   std::unordered_map<std::int64_t, Pending> _pending;
   std::map<std::int32_t, std::int64_t> _replaced;  ///< lines replaced in this batch, by day
   std::size_t _batchSize = 0;                      ///< bytes of text
