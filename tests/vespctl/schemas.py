@@ -1,6 +1,6 @@
 #!/usr/bin/env python3
 """Holds what every command of the vespctl in argv[1] prints with --json against its schema."""
-import json, os, pathlib, re, subprocess, sys, tempfile
+import json, os, pathlib, re, struct, subprocess, sys, tempfile
 import jsonschema
 
 vespctl = os.path.abspath(sys.argv[1])
@@ -56,6 +56,7 @@ checks = {
     "decode-fields": [f"decode {layout} {base}" for layout in ("base", "ftl", "ftl-keys", "msp")],
     "decode-words": ["decode counters-generic words"],
     "decode-snapshot": ["decode snapshot --thread worker device/kernel/snapshot.bin"],
+    "decode-differences": [f"decode base {base} words"],
     "property-value": [],
 }
 silent = {"init", "run", "collect", "listen", "counters set", "counters add", "counters sample",
@@ -80,5 +81,18 @@ for name, commands in checks.items():
         for line in printed:
             validator.validate(json.loads(line))
         seen.add(words)
+# Fields are compared by name and place: 7 twice, of which the second differs, and 9 in one alone.
+def records(*pairs):
+    return b"".join(struct.pack("<IIQ", key, 1, value) for key, value in pairs)
+
+
+pathlib.Path("before").write_bytes(records((7, 1), (7, 2), (8, 5)))
+pathlib.Path("after").write_bytes(records((7, 1), (9, 6), (7, 3)) + b"\xff\xff\0\0\1\0\0\0rest")
+assert json.loads(run("decode ftl-keys before after --json", (0,))) == [
+    {"field": "Stat_7", "before": 2, "after": 3}, {"field": "Stat_8", "before": 5, "after": None},
+    {"field": "Stat_9", "before": None, "after": 6}]
+assert run("decode ftl-keys after").endswith(
+    "Not decoded of 60 bytes: 12 bytes from offset 48 on: the records end there.\n")
+assert run("decode ftl-keys before").endswith("All of the 48 bytes were decoded.\n")
 for words in with_json - silent:
     assert any((known + " ").startswith(words + " ") for known in seen), words + " has no schema"

@@ -4,11 +4,15 @@
 #include <optional>
 
 #include "commandline/Arguments.h"
+#include "outbox/SubmittedLogs.h"
 #include "platform/host/counters/HostTallybook.h"
 
 namespace vesprun {
 
 std::string whenFirstReport(HostPlatform& device) {
+  if (std::ranges::any_of(namesOfLogs(device.directory()), isDailyLogName)) {
+    return "";
+  }
   if (!device.logsmith().DiagnosticLogSubmissionEnabled()) {
     return "No report yet: submission is switched off on this device.";
   }

@@ -16,6 +16,7 @@
 #include "common/Calendar.h"
 #include "common/TextForm.h"
 #include "outbox/DailyLogView.h"
+#include "outbox/FirstReport.h"
 #include "outbox/SubmittedLogs.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeReader.h"
@@ -273,12 +274,21 @@ void show(Wanted wanted) {
   if (wanted.sinceDay) {
     wanted.since = startOfDay(wanted.sinceDay->on(device->tallybook().TBDaysSince1970()));
   }
+  std::optional<WrappedOutput> wrapped;
+  if (!invocation().json) {
+    wrapped.emplace();
+  }
   for (const Kind& kind : kKinds) {
     if (wanted.kind.empty() && !invocation().json) {
       std::cout << emphasized(std::string("\n== ") + kind.title) << '\n';
     }
     if (wanted.kind.empty() || &kind == known) {
       kind.show(device->directory(), wanted);
+    }
+  }
+  if ((wanted.kind.empty() || wanted.kind == "logs") && !invocation().json) {
+    if (const std::string note = whenFirstReport(*device); !note.empty()) {
+      printText(note);
     }
   }
 }

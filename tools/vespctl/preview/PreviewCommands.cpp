@@ -6,8 +6,10 @@
 #include "Command.h"
 #include "ReadOnlyDevice.h"
 #include "commandline/Arguments.h"
+#include "commandline/Completion.h"
 #include "driver/DailyTasks.h"
 #include "outbox/DailyLogView.h"
+#include "outbox/FirstReport.h"
 #include "preview/Explanation.h"
 #include "preview/KeptBack.h"
 #include "report/LogSubmission.h"
@@ -51,11 +53,13 @@ void previewLog(const PreviewArguments& arguments) {
     platform().ptreeSerialization().serialize({*document},
                                               [](std::string_view piece) { std::cout << piece; });
   } else if (!arguments.document) {
-    printResult(jsonOrNull(document), [&document] {
+    printResult(jsonOrNull(document), [&] {
       if (document) {
+        const WrappedOutput wrapped;
         showDailyLog(std::cout, *document);
       } else {
-        printText("Nothing would be submitted.");
+        const std::string note = whenFirstReport(*opened.device);
+        printText("Nothing would be submitted." + (note.empty() ? note : ' ' + note));
       }
     });
   }
@@ -105,6 +109,9 @@ void printExplanations(const ExplainArguments& arguments) {
     for (const Json& explanation : explanations) {
       printExplanation(explanation);
     }
+    if (const std::string note = whenFirstReport(*opened.device); !note.empty()) {
+      printText(note);
+    }
   });
 }
 
@@ -131,7 +138,8 @@ void addPreviewCommand(CLI::App& command) {
 
 void addExplainCommand(CLI::App& command) {
   const auto arguments = std::make_shared<ExplainArguments>();
-  command.add_option("KEY", arguments->key, "The key of a counter")->required();
+  completeWith(command.add_option("KEY", arguments->key, "The key of a counter")->required(),
+               countedKeys);
   command.add_option("--kind", arguments->kind, "Explains it as this kind alone")
       ->type_name("scalar|distribution")
       ->check(CLI::IsMember({"scalar", "distribution"}).description(""));

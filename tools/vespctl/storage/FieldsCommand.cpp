@@ -1,5 +1,7 @@
 #include "storage/FieldsCommand.h"
 
+#include <unistd.h>
+
 #include <algorithm>
 #include <functional>
 #include <iostream>
@@ -21,7 +23,8 @@ namespace vesprun {
 namespace {
 
 struct List {
-  std::string name;  ///< the words that select it
+  std::string name;     ///< the words that select it
+  const char* columns;  ///< named on a terminal
   std::function<void()> print;
 };
 
@@ -82,21 +85,24 @@ void printLinuxDevices() {
 
 std::vector<List> lists() {
   std::vector<List> lists = {
-      {"stat-keys", printStatKeys},
-      {"msp-keys", printMSPKeys},
-      {"counter-record", printCounterFields},
-      {"legacy-key-map", printLegacyKeys},
-      {"ftl-digits", [] { printDigits(WhitelistedRawNANDFTLCounters_SigDigDict); }},
-      {"msp-digits", [] { printDigits(WhitelistedRawNANDMSPCounters_SigDigDict); }},
-      {"storage-stats-digits", [] { printDigits(WhitelistedStorageStats_SigDigDict); }},
-      {"ftl-stats-for-msp", [] { printNames(FTLStats4MSPStats); }},
-      {"magazine-accumulating", [] { printNames(PrivacyApprovedSMagNANDFTLCounters_Accum); }},
-      {"magazine-dynamic", [] { printNames(PrivacyApprovedSMagNANDFTLCounters_Dynamic); }},
-      {"linux-figures", printLinuxFigures},
-      {"linux-devices", printLinuxDevices}};
+      {"stat-keys", "id\tname\tcount", printStatKeys},
+      {"msp-keys", "key\tname\tcount\twidth", printMSPKeys},
+      {"counter-record", "first word\tname\tcount", printCounterFields},
+      {"legacy-key-map", "statistic\tkey", printLegacyKeys},
+      {"ftl-digits", "name\tdigits", [] { printDigits(WhitelistedRawNANDFTLCounters_SigDigDict); }},
+      {"msp-digits", "name\tdigits", [] { printDigits(WhitelistedRawNANDMSPCounters_SigDigDict); }},
+      {"storage-stats-digits", "name\tdigits",
+       [] { printDigits(WhitelistedStorageStats_SigDigDict); }},
+      {"ftl-stats-for-msp", "name", [] { printNames(FTLStats4MSPStats); }},
+      {"magazine-accumulating", "name",
+       [] { printNames(PrivacyApprovedSMagNANDFTLCounters_Accum); }},
+      {"magazine-dynamic", "name", [] { printNames(PrivacyApprovedSMagNANDFTLCounters_Dynamic); }},
+      {"linux-figures", "file\tfield\tkey\tunit\tnumber for one unit\tkind\tuse",
+       printLinuxFigures},
+      {"linux-devices", "name in a path\tpatterns\tnamed by\tidentity", printLinuxDevices}};
   for (const StorageEvent& event : EventHubConfigDetails) {
-    lists.push_back(
-        {"event " + std::string(event.event), [table = event.fields] { printNames(*table); }});
+    lists.push_back({"event " + std::string(event.event), "name",
+                     [table = event.fields] { printNames(*table); }});
   }
   return lists;
 }
@@ -112,7 +118,10 @@ void printList(const std::string& name) {
   const auto list = std::ranges::find(known, name, &List::name);
   if (list == known.end()) {
     throw CLI::ValidationError(
-        "LIST", "there is no list " + quotedText(name) + "; vespctl fields names them");
+        "LIST", "there is no list " + quotedText(name) + "; \"vespctl fields\" names them");
+  }
+  if (isatty(STDOUT_FILENO) != 0) {
+    std::cout << "# " << list->columns << '\n';
   }
   list->print();
 }
