@@ -8,7 +8,7 @@ namespace vesprun {
 std::string storeFault(const std::string& address) {
   const std::size_t scheme = address.find("://");
   if (address.starts_with("http://") || address.starts_with("https://")) {
-    return HttpClient::faultOf(address);
+    return ClickHouseServer::faultOf(address);
   }
   const bool isScheme =
       scheme != std::string::npos && scheme != 0 &&

@@ -1,9 +1,9 @@
+#include <array>
 #include <cstdio>
 #include <iostream>
 #include <memory>
 
 #include "Comparison.h"
-#include "FigureRow.h"
 #include "FleetStore.h"
 #include "Load.h"
 #include "Printing.h"
@@ -11,7 +11,7 @@
 #include "commandline/Completion.h"
 #include "commandline/Program.h"
 #include "common/Calendar.h"
-#include "common/TextForm.h"
+#include "exchange/FigureRows.h"
 #include "page/FleetPage.h"
 #include "page/PageFile.h"
 #include "platform/Clock.h"
@@ -250,42 +250,27 @@ void addDump(CLI::App& command) {
   addRange(command, *asked);
   command.callback([asked] {
     const auto store = openStore(asked->store);
-    std::cout << kFigureColumns << '\n';
+    std::cout << FigureRows::kColumns;
     store->visitLines(asked->range(), asked->groups.prefix, [](const ExportedLine& line) {
-      std::string about;
-      appendCsvField(about, line.device);
-      about += std::to_string(line.day) + ',' + dateOfDay(line.day) + ',' +
-               std::to_string(line.revision) + ',';
-      appendCsvField(about, line.build.value_or(""));
-      appendCsvField(about, line.model.value_or(""));
-      const auto print = [&about](const char* kind, std::string_view key, std::string_view field,
-                                  const std::string& value) {
-        std::string row = about + kind + ',';
-        appendCsvField(row, key);
-        appendCsvField(row, field);
-        std::cout << row << value << '\n';
-      };
+      FigureRows rows({line.device, line.day, line.revision, line.build, line.model});
       for (const ReportedScalar& scalar : line.scalars) {
-        print("scalar", scalar.key, "value", std::to_string(scalar.value));
+        rows.addScalar(scalar.key, scalar.value);
       }
       for (const ReportedDistribution& distribution : line.distributions) {
         const Statistics& values = distribution.values.statistics;
-        const std::pair<const char*, double> fields[] = {{"minimum", values.minimum},
-                                                         {"maximum", values.maximum},
-                                                         {"mean", values.mean},
-                                                         {"deviations", values.deviations}};
-        for (const auto& [field, value] : fields) {
-          print("distribution", distribution.key, field, textForm(Number(value)));
-        }
-        print("distribution", distribution.key, "count", std::to_string(values.count));
+        rows.addDistribution(
+            distribution.key,
+            std::array{values.minimum, values.maximum, values.mean, values.deviations},
+            values.count);
       }
       for (const ReportedDistribution& distribution : line.distributions) {
         if (distribution.values.histogram) {
           for (const auto& [label, count] : *distribution.values.histogram) {
-            print("histogram", distribution.key, label, std::to_string(count));
+            rows.addBucket(distribution.key, label, count);
           }
         }
       }
+      std::cout << rows.text();
     });
   });
 }

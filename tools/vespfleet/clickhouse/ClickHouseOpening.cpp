@@ -126,7 +126,7 @@ void ClickHouseStore::open(StoreUse use, std::optional<int> least) {
 /// Takes the lines of an earlier version, whose tables go when all are stored.
 void ClickHouseStore::bringUpToDate() {
   const std::string table = kEarlierTables[std::size(kEarlierTables) - 1].name;
-  HttpClient reader(_address);
+  ClickHouseServer reader(_address);
   if (_server.post("EXISTS TABLE " + table).starts_with('1')) {
     readRows(reader, "SELECT text FROM " + table, [&](PackedReader& row) {
       const std::string text = row.text();

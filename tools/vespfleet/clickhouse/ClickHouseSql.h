@@ -7,8 +7,8 @@
 #include <string_view>
 #include <vector>
 
+#include "ClickHouseServer.h"
 #include "FleetStore.h"
-#include "HttpClient.h"
 #include "Varint.h"
 
 namespace vesprun {
@@ -67,7 +67,7 @@ std::vector<T> readArray(PackedReader& row) {
 /// Reads all rows of an answer in RowBinary by `row`, as they come. What `row` does before it has
 /// read its row to the end may be done again.
 template <typename Row>
-void readRows(HttpClient& server, const std::string& query, const Row& row,
+void readRows(ClickHouseServer& server, const std::string& query, const Row& row,
               const SentTable* sent = nullptr) {
   constexpr std::size_t kMaxRow = std::size_t{1} << 30;
   std::string rest;

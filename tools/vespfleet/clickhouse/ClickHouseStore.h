@@ -9,8 +9,8 @@
 #include <tuple>
 #include <vector>
 
+#include "ClickHouseServer.h"
 #include "FleetStore.h"
-#include "HttpClient.h"
 
 namespace vesprun {
 
@@ -77,7 +77,7 @@ class ClickHouseStore : public FleetStore {
   LabelCounts labelsOf(const Question& question);
 
   std::string _address;
-  HttpClient _server;
+  ClickHouseServer _server;
   std::uint64_t _least = kUsualLeast;
   std::int32_t _firstDay = 0;        ///< earlier lines are refused
   std::set<std::string> _forgotten;  ///< digests of devices' names

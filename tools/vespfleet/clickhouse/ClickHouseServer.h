@@ -1,11 +1,9 @@
 #pragma once
 
-#include <functional>
-#include <initializer_list>
-#include <memory>
 #include <string>
 #include <string_view>
-#include <utility>
+
+#include "exchange/HttpClient.h"
 
 namespace vesprun {
 
@@ -20,14 +18,14 @@ struct SentTable {
 /// `VESPFLEET_PASSWORD`, else from the line USER:PASSWORD of the file `VESPFLEET_CREDENTIALS`;
 /// certificates are verified against `VESPFLEET_CA`, else the system's authorities. A server that
 /// does not answer is given up after 10 seconds, one that falls silent after five minutes.
-class HttpClient {
+class ClickHouseServer {
  public:
   /// What is wrong with an address, which is "http://HOST:PORT/DATABASE" or "https://..." and holds
   /// no user or password; empty when nothing is.
   static std::string faultOf(const std::string& address);
 
   /// `address` must have no fault.
-  explicit HttpClient(const std::string& address);
+  explicit ClickHouseServer(const std::string& address);
 
   const std::string& address() const { return _address; }
 
@@ -39,16 +37,15 @@ class HttpClient {
   std::string post(const std::string& query, std::string_view data = {});
 
   /// The same for a question with a long answer, whose pieces `take` gets as they come.
-  using TakePiece = std::function<void(std::string_view piece)>;
-  void ask(const std::string& question, const SentTable* sent, const TakePiece& take);
+  void ask(const std::string& question, const SentTable* sent, const HttpClient::TakePiece& take);
 
  private:
-  std::string urlOf(std::initializer_list<std::pair<std::string, std::string>> arguments);
-  void perform(const std::string& url, const TakePiece& take);
+  void perform(const std::string& arguments, std::string_view body,
+               const HttpClient::TakePiece& take, const std::string& contentType = "text/plain");
 
   std::string _address;
   std::string _url;
-  std::unique_ptr<void, void (*)(void*)> _curl;
+  HttpClient _client;
 };
 
 }  // namespace vesprun
