@@ -43,6 +43,7 @@ checks = {
     "days": ["days"],
     "catch-up": ["counters add a 1 --day 3", "catch-up --last 99999 --dry-run"],
     "prune": ["prune --counters 3 --outbox 0 --outbox-size 0 --dry-run"],
+    "upload": ["upload http://127.0.0.1:1/"],
     "preview": ["preview", "preview --day 0"],
     "preview-left-out": ["preview --left-out"],
     "explain": ["explain a", "explain d.x --kind distribution", "explain a --kind scalar"],

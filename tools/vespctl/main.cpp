@@ -10,8 +10,9 @@
 #include "device/DeviceCommands.h"
 #include "device/MessageCommands.h"
 #include "device/PreferenceCommands.h"
+#include "export/ExportCommand.h"
+#include "export/UploadCommand.h"
 #include "listen/ListenCommand.h"
-#include "outbox/ExportCommand.h"
 #include "outbox/PtreeCommand.h"
 #include "outbox/ShowCommand.h"
 #include "page/PageCommand.h"
@@ -49,8 +50,9 @@ constexpr Command kCommands[] = {
     {"listen", "Takes counters from other programs, as StatsD lines", addListenCommand},
     {"prefs", "Shows and changes preferences", addPreferenceCommands},
     {"send", "Sends messages to a running vesprun", addMessageCommands},
-    {"export", "Prints each submitted daily log as one line for vespfleet", addExportCommand,
+    {"export", "Prints the submitted daily logs for vespfleet and other programs", addExportCommand,
      Form::Own},
+    {"upload", "Sends the daily logs that a server has not acknowledged yet", addUploadCommand},
     {"page", "Writes one HTML page of all that the device reported", addPageCommand, Form::Own},
     {"nand", "Asks a device for its storage statistics", addNandCommands},
     {"decode", "Decodes one saved buffer of the device", addDecodeCommand},
