@@ -59,6 +59,12 @@ c++ -std=c++20 main.cpp $(pkg-config --cflags --libs vesprun) -o print-health
 # shellcheck disable=SC2046
 cc -std=c99 -Wall -Wextra -Wpedantic -Werror "$source/examples/count-lines/main.c" \
   $(pkg-config --cflags --libs vesprun) -o count-lines
+# shellcheck disable=SC2046
+cc -Wall -Wextra -Werror "$source/examples/time-command/main.c" \
+  $(pkg-config --cflags --libs vesprun) -o time-command
+# shellcheck disable=SC2046
+c++ -std=c++20 "$source/examples/measure-disk/main.cpp" \
+  $(pkg-config --cflags --libs vesprun) -o measure-disk
 
 "$prefix/bin/vespctl" init "$work/device" --sample
 "$prefix/bin/vespctl" -C "$work/device" nand lab --json >"$work/lab"
@@ -85,6 +91,28 @@ done
 for writer in "${writers[@]}"; do wait "$writer"; done
 if ./count-lines "$work/nowhere" example 2>"$work/message"; then exit 1; fi
 grep -q "nowhere" "$work/message"
+
+# Two measure through the socket.
+"$prefix/bin/vespctl" -C "$work/device" listen --socket "$work/socket" &
+listener=$!
+until [ -S "$work/socket" ]; do kill -0 $listener; sleep 0.1; done
+./time-command "$work/socket" measured true
+if ./time-command "$work/socket" measured false; then exit 1; fi
+./measure-disk "$work/socket" measured.sync "$work"
+kill $listener
+wait $listener
+if ./time-command "$work/socket" measured sh -c 'exit 3' 2>"$work/message"; then exit 1; fi
+grep -q "socket" "$work/message"
+"$prefix/bin/vespctl" -C "$work/device" counters dump | cut -f1,3,4 | grep -P '\tmeasured\.' |
+  sed 's/^sample\t\(.*\)\t[0-9.e-]*$/sample \1/' | sort | uniq -c >"$work/measured"
+sed 's/^ *//; s/\t/ /g' "$work/measured" | diff - <(cat <<'END'
+2 sample measured.memoryKiB
+2 sample measured.milliseconds
+100 sample measured.sync
+1 scalar measured.failures 1
+1 scalar measured.runs 2
+END
+)
 
 mkdir "$work/folder"
 head -c 3000 /dev/zero >"$work/folder/big"
