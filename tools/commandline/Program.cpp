@@ -88,7 +88,8 @@ Invocation& invocation() {
 
 void complain(std::string_view text) {
   Progress::hide();
-  std::fprintf(stderr, "%s: %s\n", invocation().command.c_str(), printableText(text).c_str());
+  std::fprintf(stderr, "%s%s: %s\n", journalLevel(LogLevel::Error), invocation().command.c_str(),
+               printableText(text).c_str());
 }
 
 void addCommands(CLI::App& above, std::span<const Command> commands) {

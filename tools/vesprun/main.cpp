@@ -29,13 +29,15 @@ bool takeRightsOfOwner() {
 
 void runOnDevice(std::span<const char* const> commandLine) {
   if (!takeRightsOfOwner()) {
-    std::fprintf(stderr, "vesprun: the rights of the device's owner cannot be taken\n");
+    std::fprintf(stderr, "%svesprun: the rights of the device's owner cannot be taken\n",
+                 journalLevel(LogLevel::Error));
     return;
   }
   std::string error;
   const std::unique_ptr<HostPlatform> device = HostPlatform::open(VESPRUN_DEVICE_DIRECTORY, error);
   if (!device) {
-    std::fprintf(stderr, "vesprun: %s\n", printableText(error).c_str());
+    std::fprintf(stderr, "%svesprun: %s\n", journalLevel(LogLevel::Error),
+                 printableText(error).c_str());
     return;
   }
   const InstalledPlatform installed(*device);
@@ -52,7 +54,8 @@ int main(int argc, char** argv) {
   try {
     vesprun::runOnDevice({argv, argc > 0 ? static_cast<std::size_t>(argc) : 0});
   } catch (const std::exception& failure) {
-    std::fprintf(stderr, "vesprun: %s\n", failure.what());
+    std::fprintf(stderr, "%svesprun: %s\n", vesprun::journalLevel(vesprun::LogLevel::Error),
+                 failure.what());
   }
   return 0;
 }

@@ -2,9 +2,11 @@
 
 #include <fcntl.h>
 #include <signal.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <cstdio>
+#include <cstdlib>
 #include <exception>
 #include <new>
 
@@ -38,6 +40,17 @@ void holdStandardStreams() {
       static_cast<void>(open("/dev/null", stream == STDIN_FILENO ? O_WRONLY : O_RDONLY));
     }
   }
+}
+
+const char* journalLevel(LogLevel level) {
+  static constexpr const char* kLevels[] = {"<3>", "<5>", "<5>", "<6>", "<7>"};
+  const char* const journal = std::getenv("JOURNAL_STREAM");  // DEVICE:INODE
+  struct stat status {};
+  char* end = nullptr;
+  const bool isJournal = journal != nullptr && fstat(STDERR_FILENO, &status) == 0 &&
+                         std::strtoull(journal, &end, 10) == status.st_dev && *end == ':' &&
+                         std::strtoull(end + 1, nullptr, 10) == status.st_ino;
+  return isJournal ? kLevels[static_cast<std::size_t>(level)] : "";
 }
 
 void exitWithoutMemory(const char* program, int status) {

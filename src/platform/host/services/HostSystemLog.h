@@ -12,6 +12,7 @@
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/JsonLines.h"
+#include "platform/host/files/StandardStreams.h"
 #include "platform/host/outbox/OutboxFiles.h"
 
 namespace vesprun {
@@ -48,7 +49,8 @@ class HostSystemLog final : public SystemLog {
       message.remove_suffix(1);
     }
     try {
-      std::fprintf(stderr, "vesprun: %s (not logged: %s)\n", printableText(message).c_str(),
+      std::fprintf(stderr, "%svesprun: %s (not logged: %s)\n", journalLevel(level),
+                   printableText(message).c_str(),
                    error.empty() ? "out of memory" : printableText(error).c_str());
     } catch (const std::exception&) {
       std::fputs("vesprun: out of memory\n", stderr);
