@@ -128,16 +128,7 @@ std::string importedRows() {
 }  // namespace
 
 Companion::Companion(const std::vector<std::string>& command, const std::string& folder) {
-  _child = fork();
-  if (_child == 0) {
-    dup2(_output.descriptor(), STDOUT_FILENO);
-    dup2(_output.descriptor(), STDERR_FILENO);
-    alarm(60);
-    if (chdir(folder.c_str()) == 0) {
-      runInstead(command);
-    }
-    _exit(126);
-  }
+  _child = start(command, folder, _output.descriptor(), _output.descriptor(), false);
 }
 
 void Companion::endsOrWaits() {

@@ -250,6 +250,11 @@ Faults silence(const Device& device, const Outcome& outcome, int error) {
              : Faults();
 }
 
+/// A daily log up to what it says of tasking, which stands last.
+std::string withoutTasking(const std::string& log) {
+  return log.substr(0, log.find("<key>TBTasking</key>"));
+}
+
 Faults runWithFault(const Reference& reference, const fs::path& folder, const Fault& fault,
                     bool started) {
   const Scenario& scenario = reference.scenario;
@@ -314,21 +319,27 @@ Faults runWithFault(const Reference& reference, const fs::path& folder, const Fa
     const auto counts = [](const std::string& fact) {
       return fact.find(".header.json: ") == std::string::npos &&
              !fact.starts_with("without header: ") &&
-             !fact.starts_with("outbox/submitted.jsonl has ") &&
+             fact.find("outbox/submitted.jsonl") == fact.npos &&
              !(fact.starts_with("file ") && fact.find("/.") != std::string::npos);
     };
     wanted = those(wanted, counts);
     there = those(there, counts);
   }
   if (killed && scenario.promise == Promise::Steps) {
-    // A log that was submitted just before the kill is submitted once more, one that was under way
-    // leaves its unfinished file, and a change of the system is then announced by no log.
+    // A log that was submitted just before the kill is submitted once more, then perhaps with the
+    // preferences that tasking has set meanwhile; one that was under way leaves its unfinished
+    // file. A change of the system is then announced by no log, and one of the preferences to
+    // nobody.
     std::erase_if(wanted, [&there](const std::string& fact) {
-      return !there.contains(fact) && fact.starts_with("log -193-log-aggregated.header.json: ");
+      return !there.contains(fact) && (fact.starts_with("log -193-log-aggregated.header.json: ") ||
+                                       fact.find("notifications.jsonl") != std::string::npos);
     });
-    std::erase_if(there, [&wanted](const std::string& fact) {
+    std::set<std::string> logs;
+    std::ranges::transform(wanted, std::inserter(logs, logs.end()), withoutTasking);
+    std::erase_if(there, [&](const std::string& fact) {
       return !wanted.contains(fact) &&
-             ((fact.starts_with("outbox/submitted.jsonl has ") && fact.ends_with(" #2")) ||
+             ((fact.starts_with("log -193-") && logs.contains(withoutTasking(fact))) ||
+              (fact.starts_with("outbox/submitted.jsonl has ") && fact.ends_with(" #2")) ||
               (fact.starts_with("without header: ") && fact.ends_with(" 2")) ||
               fact.starts_with("file outbox/logs/.unfinished-"));
     });

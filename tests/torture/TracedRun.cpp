@@ -484,47 +484,51 @@ std::string TextFile::text() const {
   return text;
 }
 
-void runInstead(const std::vector<std::string>& command) {
+pid_t start(const std::vector<std::string>& command, const std::string& folder, int output,
+            int errors, bool isTraced) {
   std::vector<char*> arguments;
   for (const std::string& argument : command) {
-    arguments.push_back(const_cast<char*>(argument.c_str()));  // NOLINT: execv changes nothing
+    arguments.push_back(const_cast<char*>(argument.c_str()));  // NOLINT: execve changes nothing
   }
   arguments.push_back(nullptr);
-  execv(arguments[0], arguments.data());
+  std::vector<char*> variables;
+  for (char** variable = environ; *variable != nullptr; ++variable) {
+    variables.push_back(*variable);
+  }
+  std::string pad = "MALLOC_TOP_PAD_=0";  // more often a call for memory that can fail
+  if (isTraced) {
+    variables.push_back(pad.data());
+  }
+  variables.push_back(nullptr);
+  // A fork would copy the tables of all the memory that this process has.
+  const pid_t child = vfork();
+  if (child == 0) {
+    // A group of its own: other children of this process are not the tracer's.
+    if (dup2(output, STDOUT_FILENO) >= 0 && dup2(errors, STDERR_FILENO) >= 0 &&
+        setpgid(0, 0) == 0 && chdir(folder.c_str()) == 0 &&
+        (!isTraced || ptrace(PTRACE_TRACEME, 0, nullptr, nullptr) == 0)) {
+      alarm(isTraced ? 0 : kMaxRunSeconds);
+      execve(arguments[0], arguments.data(), variables.data());
+    }
+    _exit(126);
+  }
+  if (child < 0) {
+    throw std::runtime_error("vfork: " + std::string(std::strerror(errno)));
+  }
+  return child;
 }
 
 Outcome runTraced(const std::vector<std::string>& command, const std::string& folder,
                   const Fault& fault) {
   const TextFile output;
   const TextFile errors;
-  const pid_t child = fork();
-  if (child < 0) {
-    throw std::runtime_error("fork: " + std::string(std::strerror(errno)));
-  }
-  if (child == 0) {
-    dup2(output.descriptor(), STDOUT_FILENO);
-    dup2(errors.descriptor(), STDERR_FILENO);
-    setenv("MALLOC_TOP_PAD_", "0", 1);  // more often a call for memory that can fail
-    // A group of its own: other children of this process are not the tracer's.
-    if (setpgid(0, 0) == 0 && chdir(folder.c_str()) == 0 &&
-        ptrace(PTRACE_TRACEME, 0, nullptr, nullptr) == 0) {
-      raise(SIGSTOP);
-      runInstead(command);
-    }
-    _exit(126);
-  }
+  const pid_t child = start(command, folder, output.descriptor(), errors.descriptor(), true);
   int status = 0;
-  waitpid(child, &status, 0);
-  if (!WIFSTOPPED(status) ||
-      ptrace(PTRACE_SETOPTIONS, child, nullptr,
-             PTRACE_O_TRACESYSGOOD | PTRACE_O_TRACECLONE | PTRACE_O_TRACEEXEC |
-                 PTRACE_O_EXITKILL) != 0 ||
-      ptrace(PTRACE_CONT, child, nullptr, nullptr) != 0) {
-    throw std::runtime_error("the system does not let this process trace another");
-  }
   waitpid(child, &status, 0);  // the program's start
-  if (!WIFSTOPPED(status)) {
-    throw std::runtime_error(command.front() + " cannot be started");
+  if (!WIFSTOPPED(status) || ptrace(PTRACE_SETOPTIONS, child, nullptr,
+                                    PTRACE_O_TRACESYSGOOD | PTRACE_O_TRACECLONE |
+                                        PTRACE_O_TRACEEXEC | PTRACE_O_EXITKILL) != 0) {
+    throw std::runtime_error(command.front() + " cannot be started and traced");
   }
   ptrace(PTRACE_SYSCALL, child, nullptr, 0);
   Outcome outcome = Tracer(child, folder, fault).run();

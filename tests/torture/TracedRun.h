@@ -23,8 +23,11 @@ class TextFile {
   int _file;
 };
 
-/// Replaces this process by a program; comes back when that fails.
-void runInstead(const std::vector<std::string>& command);
+/// Starts a program in `folder` whose output goes to two descriptors; one that is not traced ends
+/// after a minute at the latest, one that is stops before its first instruction. A program that
+/// cannot be started ends with status 126.
+pid_t start(const std::vector<std::string>& command, const std::string& folder, int output,
+            int errors, bool isTraced);
 
 /// The fault injected into one run.
 struct Fault {

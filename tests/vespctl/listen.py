@@ -162,6 +162,7 @@ def sockets(folder):
     """Whose the path is, and a socket that was handed over."""
     device = Listener(folder)
     device.start()
+    device.send("")  # what it has begun with is done
     check("mode", os.stat(device.path).st_mode & 0o777, 0o666)
     second = subprocess.run([VESPCTL, "-C", device.device, "listen", "--socket", device.path],
                             capture_output=True, text=True, check=False)
