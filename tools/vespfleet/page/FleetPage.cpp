@@ -152,9 +152,10 @@ class FleetPage {
       key.areMedians = key.areMedians && summary.quantiles[kMedian];
     }
     for (const auto& [day, summary] : days) {
-      const auto quantile = [&summary](std::size_t place) -> std::optional<double> {
+      const auto quantile = [&quantiles =
+                                 summary.quantiles](std::size_t place) -> std::optional<double> {
         return place == kMedian ? std::nullopt
-                                : std::optional(static_cast<double>(*summary.quantiles[place]));
+                                : std::optional(static_cast<double>(*quantiles[place]));
       };
       key.days.push_back(
           {day, key.areMedians ? static_cast<double>(*summary.quantiles[kMedian]) : summary.mean,
