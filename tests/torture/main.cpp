@@ -11,6 +11,7 @@
 #include <cstring>
 #include <filesystem>
 #include <map>
+#include <optional>
 #include <stdexcept>
 #include <thread>
 
@@ -23,19 +24,20 @@ namespace fs = std::filesystem;
 
 struct Options : Choice {
   std::size_t share = 1;
-  unsigned workers = std::max(1U, std::thread::hardware_concurrency());
+  unsigned workers = 2 * std::max(1U, std::thread::hardware_concurrency());  // they wait for disks
   std::string only;
   std::string scenario;
 };
 
 struct Counts {
+  std::atomic<std::size_t> next;  ///< case of the list
   std::atomic<std::size_t> tried;
   std::atomic<std::size_t> failed;
 };
 
 void runCases(const std::vector<Case>& cases, const Options& options, unsigned worker,
               const fs::path& folder, Counts& counts) {
-  for (std::size_t index = worker; index < cases.size(); index += options.workers) {
+  for (std::size_t index = 0; (index = counts.next++) < cases.size();) {
     const Case& one = cases[index];
     Faults faults;
     try {
@@ -93,6 +95,46 @@ std::vector<Case> chosen(std::vector<Case> cases, const Options& options) {
   return result;
 }
 
+/// The cases of a list, under way in processes of their own.
+class Running {
+ public:
+  Running(std::string title, const std::vector<Case>& cases, const Options& options,
+          const fs::path& folder, Counts& counts)
+      : _title(std::move(title)),
+        _cases(cases.size()),
+        _counts(counts),
+        _failedBefore(counts.failed) {
+    counts.next = 0;
+    for (unsigned worker = 0; worker < options.workers; ++worker) {
+      const pid_t child = fork();
+      if (child == 0) {
+        runCases(cases, options, worker, folder, counts);
+        _exit(0);
+      }
+      _children.push_back(child);
+    }
+  }
+
+  void finish() {
+    for (const pid_t child : _children) {
+      int status = 0;
+      if (waitpid(child, &status, 0) != child || !WIFEXITED(status)) {
+        throw std::runtime_error("a worker of \"" + _title + "\" did not come to its end");
+      }
+    }
+    std::printf("%-44s %6zu cases, %zu failed\n", _title.c_str(), _cases,
+                _counts.failed - _failedBefore);
+    std::fflush(stdout);
+  }
+
+ private:
+  std::string _title;
+  std::size_t _cases;
+  Counts& _counts;
+  std::size_t _failedBefore;
+  std::vector<pid_t> _children;
+};
+
 int torture(const Options& options) {
   std::string name = (fs::temp_directory_path() / "vesprun-torture-XXXXXX").string();
   if (mkdtemp(name.data()) == nullptr) {
@@ -105,37 +147,26 @@ int torture(const Options& options) {
     throw std::runtime_error(std::string("mmap: ") + std::strerror(errno));
   }
   Counts& total = *new (shared) Counts{};
+  std::optional<Running> running;
   for (const CaseList& list : caseLists()) {
-    if (!options.only.empty() && total.tried != 0) {
-      break;
-    }
     if (list.title.find(options.scenario) == std::string::npos) {
       continue;
     }
+    // What the next list begins with is made while the one before is under way.
     const std::vector<Case> cases = chosen(list.cases(folder, options), options);
-    const std::size_t failedBefore = total.failed;
-    std::vector<pid_t> children;
-    for (unsigned worker = 0; worker < options.workers; ++worker) {
-      const pid_t child = fork();
-      if (child == 0) {
-        runCases(cases, options, worker, folder, total);
-        _exit(0);
-      }
-      children.push_back(child);
+    if (cases.empty()) {
+      continue;
     }
-    bool ended = true;
-    for (const pid_t child : children) {
-      int status = 0;
-      ended = waitpid(child, &status, 0) == child && WIFEXITED(status) && ended;
+    if (running) {
+      running->finish();
     }
-    if (!ended) {
-      throw std::runtime_error("a worker of \"" + list.title + "\" did not come to its end");
+    running.emplace(list.title, cases, options, folder, total);
+    if (!options.only.empty()) {
+      break;
     }
-    if (options.only.empty() || !cases.empty()) {
-      std::printf("%-44s %6zu cases, %zu failed\n", list.title.c_str(), cases.size(),
-                  total.failed - failedBefore);
-      std::fflush(stdout);
-    }
+  }
+  if (running) {
+    running->finish();
   }
   if (options.only.empty()) {
     fs::remove_all(folder);
