@@ -12,7 +12,7 @@ Element changeList(std::vector<ChangeItem> items) {
     return left.rank > right.rank;
   });
   Element list("ol", {{"class", "changes"}});
-  const std::size_t shown = std::min(items.size(), kMostChanges);
+  const std::size_t shown = std::min(items.size(), kMaxChanges);
   for (std::size_t i = 0; i < shown; ++i) {
     ChangeItem& item = items[i];
     Element what("div", {{"class", "what"}}, Element("b", {}, item.what));

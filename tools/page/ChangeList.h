@@ -23,6 +23,6 @@ struct ChangeItem {
 /// At most ten of them, and how many there are besides.
 Element changeList(std::vector<ChangeItem> items);
 
-inline constexpr std::size_t kMostChanges = 10;
+inline constexpr std::size_t kMaxChanges = 10;
 
 }  // namespace vesprun

@@ -262,8 +262,8 @@ Element bar(double length, double mark) {
 }
 
 Element dayStrip(const std::vector<double>& days, Period period, const std::string& label) {
-  constexpr double kMostCells = 100;
-  const double cell = period.last - period.first < kMostCells ? 0.88 : 1.0;
+  constexpr double kMaxCells = 100;
+  const double cell = period.last - period.first < kMaxCells ? 0.88 : 1.0;
   const Scale across(period.first, period.last + cell, 0, kWidth * 10);
   std::string steps;
   std::int64_t end = -1;

@@ -32,17 +32,17 @@ KeyTable::KeyTable(Period period, std::size_t keys, std::size_t textBytes)
     return;
   }
   // What all keys together may take.
-  constexpr std::size_t kMostBytes = 7'000'000;
+  constexpr std::size_t kMaxBytes = 7'000'000;
   constexpr std::size_t kFigures = 16;
-  constexpr std::size_t kMostColumns = 60;
+  constexpr std::size_t kMaxColumns = 60;
   constexpr std::size_t kMinColumns = 12;
   constexpr std::size_t kMinKeyBytes = 16;
-  _hasPrefixes = textBytes <= kMostBytes / 2;
-  const std::size_t each = kMostBytes / keys;
+  _hasPrefixes = textBytes <= kMaxBytes / 2;
+  const std::size_t each = kMaxBytes / keys;
   _keyBytes = std::max(kMinKeyBytes, std::min<std::size_t>(120, each / 2));
   const std::size_t meanBytes = std::min(_keyBytes, textBytes / keys);
   const std::size_t rest = each - std::min(each, meanBytes + kFigures);
-  _columns = std::clamp(rest, kMinColumns, kMostColumns);
+  _columns = std::clamp(rest, kMinColumns, kMaxColumns);
 }
 
 std::string KeyTable::shownKey(std::string_view key, std::size_t prefix) const {
@@ -50,16 +50,15 @@ std::string KeyTable::shownKey(std::string_view key, std::size_t prefix) const {
 }
 
 Element KeyTable::row(const KeyCourse& course) const {
-  Element head("details", {}, Element("summary", {}, nameElement(course.key)));
+  Element title("summary", {}, nameElement(course.key));
+  if (!course.words.empty()) {
+    title.add(Element("small", {}, course.words));
+  }
+  Element head("details", {}, std::move(title));
   if (isLongName(course.key)) {
     head.add({"p", {{"class", "full"}}, Element("bdi", {}, course.key)});
   }
   head.add(course.details);
-  std::vector<Element> title;
-  title.push_back(std::move(head));
-  if (!course.words.empty()) {
-    title.push_back(Element("small", {}, course.words));
-  }
   std::vector<Element> newest{course.newest};
   if (!course.ended.empty()) {
     newest.push_back(Element("small", {}, " " + course.ended));
@@ -69,7 +68,7 @@ Element KeyTable::row(const KeyCourse& course) const {
   };
   return {"tr",
           course.isUnusual ? Attributes{{"class", "unusual"}} : Attributes{},
-          rowHead(std::move(title)),
+          rowHead(std::move(head)),
           Element("td", {}, sparkline(course.line, _period, 1, label())),
           Element("td", {}, std::move(newest)),
           cell(course.usual),

@@ -3,7 +3,7 @@
 (() => {
   const svg = "http://www.w3.org/2000/svg";
   const letters = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz";
-  const mostRows = 500;
+  const maxRows = 500;
 
   function make(tag, className, ...children) {
     const element = document.createElement(tag);
@@ -62,10 +62,10 @@
       cell.scope = "col";
       head.append(cell);
     }
-    const table = make("table", "keys", make("thead", "", head));
-    lines.slice(0, mostRows).forEach(line => table.append(rowOf(line)));
+    const rows = make("tbody", "", ...lines.slice(0, maxRows).map(rowOf));
+    const table = make("table", "keys", make("thead", "", head), rows);
     if (text.nextSibling) text.nextSibling.remove();
-    const rest = lines.length - mostRows;
+    const rest = lines.length - maxRows;
     text.after(make("div", "", table, rest > 0 ? make("p", "", rest + " more: use the filter") : ""));
     text.hidden = true;
   }
@@ -103,7 +103,7 @@
       } else {
         for (const row of group.querySelectorAll(
           ":scope > table.keys > tbody > tr, :scope > ul.names > li")) {
-          const name = row.querySelector("th") || row;
+          const name = row.querySelector("summary") || row.querySelector("th") || row;
           row.hidden = !has(name.textContent, words);
           hits += !row.hidden;
         }

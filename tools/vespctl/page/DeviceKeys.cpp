@@ -9,7 +9,7 @@
 namespace vesprun {
 namespace {
 
-constexpr std::int32_t kMostDays = 400;  // that a picture shows
+constexpr std::int32_t kMaxDays = 400;  // that a picture shows
 constexpr std::size_t kDaysOfWeek = 7;
 constexpr std::size_t kDaysToBeRegular = 5;
 constexpr std::size_t kNewestDays = 28;
@@ -44,7 +44,7 @@ PageDays::PageDays(const PageData& data, std::int32_t today) {
     std::swap(reported, toCome);
   }
   if (!reported.empty()) {
-    const std::int64_t first = std::int64_t{reported.back()} - kMostDays + 1;
+    const std::int64_t first = std::int64_t{reported.back()} - kMaxDays + 1;
     period = {static_cast<double>(*std::ranges::lower_bound(reported, first)),
               static_cast<double>(reported.back())};
   }
@@ -221,15 +221,15 @@ void KeyChanges::judgePresence(std::string_view key, const std::vector<DayValue>
 
 void KeyChanges::addPresences(std::vector<ChangeItem>& presences, const char* one,
                               const char* many) {
-  constexpr std::size_t kMostAlone = 3;
+  constexpr std::size_t kMaxAlone = 3;
   constexpr double kRankOfPresence = 5e8;
-  if (presences.size() > kMostAlone) {
+  if (presences.size() > kMaxAlone) {
     std::string names;
-    for (std::size_t i = 0; i < kMostAlone; ++i) {
+    for (std::size_t i = 0; i < kMaxAlone; ++i) {
       names += (i > 0 ? ", " : "") + cutInTheMiddle(presences[i].key, 80);
     }
     today.push_back({kRankOfPresence, ChangeItem::Level::Look, numeral(presences.size()) + many, "",
-                     one, names + " and " + numeral(presences.size() - kMostAlone) + " more"});
+                     one, names + " and " + numeral(presences.size() - kMaxAlone) + " more"});
     return;
   }
   for (ChangeItem& item : presences) {

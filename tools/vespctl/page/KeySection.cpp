@@ -9,7 +9,7 @@
 namespace vesprun {
 namespace {
 
-constexpr std::size_t kMostValues = 400;  // listed for one key
+constexpr std::size_t kMaxValues = 400;  // listed for one key
 
 Element tab() { return Element::constant("\t"); }
 Element lineEnd() { return Element::constant("\n"); }
@@ -44,13 +44,13 @@ std::string endedText(double day, const PageDays& days) {
 /// Each value of a scalar, exactly: a line for each week, or each value where days are missing.
 Element valueList(const PageData::Series& series) {
   Element list("pre", {});
-  const std::size_t first = series.size() - std::min(series.size(), kMostValues);
+  const std::size_t first = series.size() - std::min(series.size(), kMaxValues);
   for (std::size_t i = first; i < series.size(); ++i) {
     const bool goesOn = i > first && series[i].day == series[i - 1].day + 1 && (i - first) % 7 != 0;
     if (!goesOn) {
       list.add(i > first ? lineEnd() : Element()).add(momentText(series[i].day));
     }
-    list.add(tab()).add(textForm(series[i].value));
+    list.add(tab()).add(numeral(series[i].value));
   }
   return list;
 }
@@ -230,7 +230,8 @@ KeyCourse distributionCourse(std::string_view key,
     course.usual = usualText(all.front().values, words.unit);
     course.details = std::vector<Element>{
         Element("p", {},
-                dayText(newest.day) + ": " + numeral(newest.count) + " values from " +
+                dayText(newest.day) + ": " + numeral(newest.count) +
+                    (newest.count.asInt64() == 1 ? " value from " : " values from ") +
                     quantity(newest.minimum, words.unit) + " to " +
                     quantity(newest.maximum, words.unit) + ", standard deviation " +
                     quantity(deviation(newest), words.unit)),

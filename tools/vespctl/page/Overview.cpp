@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <optional>
 
 #include "common/Calendar.h"
 #include "page/Quantity.h"
@@ -24,10 +25,10 @@ constexpr std::int32_t kRecentDays = 28;
 constexpr std::int32_t kWeek = 7;
 
 void addFindings(std::vector<ChangeItem>& items, const std::vector<PageFinding>& findings) {
-  constexpr std::size_t kMostAlone = 4;
+  constexpr std::size_t kMaxAlone = 4;
   double rank = kRankOfFinding;
   for (std::size_t i = 0; i < findings.size(); ++i) {
-    if (i < kMostAlone) {
+    if (i < kMaxAlone) {
       items.push_back({rank--, Level::Act, findings[i].finding, "", "", findings[i].detail});
     } else {
       items.back().then += "; " + findings[i].finding;
@@ -59,12 +60,12 @@ void addClock(std::vector<ChangeItem>& items, const PageData& data, const PageDa
                      countedNoun(days.toCome.size(), "day") + " to come",
                      "left out of the comparison"});
   }
-  constexpr double kMostBack = 3600;
+  constexpr double kMaxBack = 3600;
   const Date* before = nullptr;
   for (const SubmittedLog& log : data.submitted) {
     const Date& created = *log.document.findDate("TBLogCreationDate");
     const bool isRecent = daysSince1970(created) > days.newest() - kRecentDays;
-    if (before != nullptr && isRecent && secondsBetween(*before, created) < -kMostBack) {
+    if (before != nullptr && isRecent && secondsBetween(*before, created) < -kMaxBack) {
       items.push_back({kRankOfClock - 1, Level::Look, "The clock went back", "",
                        minuteText(created), minuteText(*before) + " at the report before"});
     }
@@ -73,19 +74,28 @@ void addClock(std::vector<ChangeItem>& items, const PageData& data, const PageDa
 }
 
 void addBuilds(std::vector<ChangeItem>& items, const PageData& data, const PageDays& days) {
-  constexpr std::size_t kMostBytes = 60;
+  constexpr std::size_t kMaxBytes = 60;
   const PageData::SystemDay* before = nullptr;
+  std::optional<ChangeItem> newest;
+  std::size_t count = 0;
   for (const PageData::SystemDay& system : data.systems) {
     if (before != nullptr && system.day > days.newest() - kWeek && system.day <= days.newest()) {
       const std::string model =
-          before->model == system.model ? "" : cutInTheMiddle(system.model, kMostBytes) + ' ';
-      items.push_back({kRankOfBuild + system.day, Level::Look,
-                       model.empty() ? "Another build of the system" : "Another model or build", "",
-                       model + cutInTheMiddle(system.build, kMostBytes),
-                       cutInTheMiddle(before->build, kMostBytes) + " until " +
-                           dayText(before->lastDay) + "; since " + dayText(system.day)});
+          before->model == system.model ? "" : cutInTheMiddle(system.model, kMaxBytes) + ' ';
+      newest = ChangeItem{kRankOfBuild,
+                          Level::Look,
+                          model.empty() ? "Another build of the system" : "Another model or build",
+                          "",
+                          model + cutInTheMiddle(system.build, kMaxBytes),
+                          cutInTheMiddle(before->build, kMaxBytes) + " until " +
+                              dayText(before->lastDay) + "; since " + dayText(system.day)};
+      ++count;
     }
     before = &system;
+  }
+  if (newest) {
+    newest->then += count > 1 ? "; " + numeral(count) + " changes in seven days" : "";
+    items.push_back(std::move(*newest));
   }
 }
 
@@ -155,7 +165,7 @@ void addOverview(Document& document, const PageAbout& about, const PageData& dat
   // A device may need attention on a day that is quiet.
   const bool isQuiet = items.empty();
   addFindings(items, about.findings);
-  const std::size_t left = kMostChanges - std::min(kMostChanges, items.size());
+  const std::size_t left = kMaxChanges - std::min(kMaxChanges, items.size());
   if (days.isEmpty()) {
     document.add(noDays(about.firstReport));
   } else {

@@ -92,7 +92,7 @@ void PageData::takeSystems(const DeviceDirectory& directory) {
 }
 
 void PageData::takeError(const PropertyDict& line) {
-  constexpr std::size_t kMostKept = 20;
+  constexpr std::size_t kMaxKept = 20;
   const std::string* const level = line.findString("level");
   const std::string* const message = line.findString("message");
   const std::string* const time = line.findString("time");
@@ -101,7 +101,7 @@ void PageData::takeError(const PropertyDict& line) {
   }
   ++errors.count;
   errors.newest.push_back((time != nullptr ? *time + " " : "") + *message);
-  if (errors.newest.size() > kMostKept) {
+  if (errors.newest.size() > kMaxKept) {
     errors.newest.erase(errors.newest.begin());
   }
 }
@@ -145,7 +145,7 @@ void PageData::takeLines(const DeviceDirectory& directory, std::string_view file
 }
 
 void PageData::takeEvent(const PropertyDict& line) {
-  constexpr std::size_t kMostKept = 200;
+  constexpr std::size_t kMaxKept = 200;
   const std::string* const text = line.findString("event");
   const std::string* const time = line.findString("time");
   const std::optional<Date> date = parseDateText(time != nullptr ? *time : "");
@@ -158,8 +158,8 @@ void PageData::takeEvent(const PropertyDict& line) {
   auto& [count, newest] = events[name];
   ++count;
   newest.push_back(std::move(event));
-  if (newest.size() > 2 * kMostKept) {
-    newest.erase(newest.begin(), newest.begin() + kMostKept);
+  if (newest.size() > 2 * kMaxKept) {
+    newest.erase(newest.begin(), newest.begin() + kMaxKept);
   }
 }
 

@@ -17,7 +17,7 @@
 namespace vesprun {
 namespace {
 
-constexpr std::int32_t kMostDays = 400;
+constexpr std::int32_t kMaxDays = 400;
 constexpr std::int32_t kWeek = 7;
 constexpr std::size_t kMedian = 2;  // among the percents of a summary
 
@@ -93,7 +93,7 @@ class FleetPage {
   Question questionOf(const ReportedKey& key) const {
     Question question;
     question.key = key.key;
-    question.days = {_newest - kMostDays + 1, _newest};
+    question.days = {_newest - kMaxDays + 1, _newest};
     question.least = _store.least();
     return question;
   }
@@ -269,10 +269,10 @@ class FleetPage {
       document.add({"p", {}, "Fewer than two builds have enough devices to be compared."});
       return document.endSection();
     }
-    constexpr std::size_t kMostRows = 20;
+    constexpr std::size_t kMaxRows = 20;
     ComparedGroups groups;
     groups.values = {_newestBuilds[_newestBuilds.size() - 2], _newestBuilds.back()};
-    groups.days = {_newest - kMostDays + 1, _newest};
+    groups.days = {_newest - kMaxDays + 1, _newest};
     const std::vector<ComparedKey> keys = compareKeys(_store, groups, _store.least());
     const auto sure = static_cast<std::size_t>(
         std::ranges::count_if(keys, [](const ComparedKey& key) { return key.q <= 0.05; }));
@@ -285,7 +285,7 @@ class FleetPage {
                       " differ by more than chance (q at most 0.05)."});
     Element table("table", {{"class", "compared"}},
                   headRow({"Key", "Before", "Now", "Difference", "q"}));
-    for (std::size_t i = 0; i < std::min(keys.size(), kMostRows); ++i) {
+    for (std::size_t i = 0; i < std::min(keys.size(), kMaxRows); ++i) {
       const ComparedKey& key = keys[i];
       const Unit unit = wordsOf(key.key).unit;
       const double difference = key.meanB - key.meanA;
@@ -402,9 +402,9 @@ class FleetPage {
   void addDevices(Document& document) {
     document.beginSection("devices", "Devices by their last day");
     Element table("table", {{"class", "devices"}}, headRow({"Last day", "Build", "Devices"}));
-    constexpr std::size_t kMostRows = 60;
+    constexpr std::size_t kMaxRows = 60;
     std::size_t rows = 0;
-    for (auto last = _last.rbegin(); last != _last.rend() && rows < kMostRows; ++last, ++rows) {
+    for (auto last = _last.rbegin(); last != _last.rend() && rows < kMaxRows; ++last, ++rows) {
       table.add({"tr",
                  {},
                  rowHead(dayText(last->day)),
