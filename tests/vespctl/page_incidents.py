@@ -283,6 +283,7 @@ def check_size(program):
         page = device.page()
         assert 3_000_000 < len(page.encode()) < 8_000_000, len(page.encode())
         assert all(f"counter{i}\t" in page for i in range(0, 100_000, 997))
+        assert "counter1\t1\t0\t1\tAz\n" in page
 
 
 def check_file(program):

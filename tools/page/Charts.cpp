@@ -280,11 +280,14 @@ Element dayStrip(const std::vector<double>& days, Period period, const std::stri
   return picture("s", label, {Element("path", {{"d", steps}})}, "0 0 3000 99");
 }
 
-std::string letteredCourse(const std::vector<Point>& all, Period period, std::size_t columns) {
+std::string letteredCourse(const std::vector<Point>& all, Period period, std::size_t maxColumns) {
   static constexpr std::string_view kLetters =
       "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz";
   const std::vector<Point> points = finite(all, period);
   const auto [low, high] = scaleOf(points);
+  // A column between two days would look like a day without a value.
+  const std::size_t columns =
+      std::min(maxColumns, static_cast<std::size_t>(period.last - period.first) + 1);
   const Scale across(period.first, period.last, 0, static_cast<double>(columns - 1));
   const Scale up(low, high, 0, static_cast<double>(kLetters.size() - 1));
   std::string course(columns, '-');

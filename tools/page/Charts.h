@@ -62,8 +62,8 @@ Element bar(double length, double mark);
 Element dayStrip(const std::vector<double>& days, Period period, const std::string& label);
 
 /// The course of values in letters, from 'A', the least, to 'z', and '-' for days without, one for
-/// each of `columns` parts of the period; a number repeats what stands before it. The page's script
-/// draws it.
-std::string letteredCourse(const std::vector<Point>& points, Period period, std::size_t columns);
+/// each day, or where there are more of them for each of `maxColumns` parts of the period; a number
+/// repeats what stands before it. The page's script draws it.
+std::string letteredCourse(const std::vector<Point>& points, Period period, std::size_t maxColumns);
 
 }  // namespace vesprun
