@@ -165,7 +165,8 @@ std::optional<Drift> driftOf(std::span<const DayValue> all) {
     return std::nullopt;
   }
   double ordered = 0;
-  // What is left beside the middle of the days around, and how much a day has of the one before it.
+  // What is left beside the middle of the days around, as many on either side, and how much a day
+  // has of the one before it.
   std::vector<double> rest;
   double mean = 0;
   for (std::size_t i = 0; i < count; ++i) {
@@ -173,7 +174,8 @@ std::optional<Drift> driftOf(std::span<const DayValue> all) {
       ordered += days[j].value > days[i].value ? 1 : days[j].value < days[i].value ? -1 : 0;
     }
     std::vector<double> around;
-    for (std::size_t j = i - std::min(i, std::size_t{kWeek}); j < count && j <= i + kWeek; ++j) {
+    const std::size_t reach = std::min({std::size_t{kWeek}, i, count - 1 - i});
+    for (std::size_t j = i - reach; j <= i + reach; ++j) {
       around.push_back(days[j].value);
     }
     rest.push_back(days[i].value - medianOf(around));

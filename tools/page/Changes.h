@@ -26,7 +26,7 @@ struct Unusual {
 
 /// From this score on a figure counts as unusual: with values that scatter as most do, once in some
 /// thousand keys.
-inline constexpr double kMinUnusualScore = 5;
+inline constexpr double kMinUnusualScore = 4.5;
 
 /// Days that there must be before a day is judged.
 inline constexpr std::size_t kMinDaysBefore = 7;
