@@ -8,6 +8,7 @@
 #include <iostream>
 #include <limits>
 #include <numeric>
+#include <optional>
 #include <streambuf>
 #include <utility>
 
@@ -37,21 +38,22 @@ std::size_t bytesOf(std::string_view text, std::size_t width) {
   return at;
 }
 
-/// The text in lines of `width` columns at most, parted at spaces where there are any.
-std::vector<std::string> wrapped(std::string_view text, std::size_t width) {
-  width = std::max<std::size_t>(width, 1);
-  std::vector<std::string> lines;
-  while (widthOf(text) > width) {
-    std::size_t end = bytesOf(text, width);
-    const std::size_t space = text[end] == ' ' ? end : text.rfind(' ', end);
-    if (space != std::string_view::npos && text.find_first_not_of(' ') < space) {
-      end = space;
-    }
-    lines.emplace_back(text.substr(0, end));
-    text.remove_prefix(std::min(text.find_first_not_of(' ', end), text.size()));
+/// Takes the next line off the text: `width` columns at most, parted at spaces where there are any.
+/// Nothing is left after the last one.
+std::string_view takeLine(std::optional<std::string_view>& text, std::size_t width) {
+  const std::string_view rest = text.value_or(std::string_view());
+  std::size_t end =
+      rest.size() > width ? bytesOf(rest, std::max<std::size_t>(width, 1)) : rest.size();
+  if (end == rest.size()) {
+    text.reset();
+    return rest;
   }
-  lines.emplace_back(text);
-  return lines;
+  const std::size_t space = rest[end] == ' ' ? end : rest.rfind(' ', end);
+  if (space != std::string_view::npos && rest.find_first_not_of(' ') < space) {
+    end = space;
+  }
+  text = rest.substr(std::min(rest.find_first_not_of(' ', end), rest.size()));
+  return rest.substr(0, end);
 }
 
 std::string spaces(std::size_t count) { return std::string(count, ' '); }
@@ -62,8 +64,8 @@ std::string wrappedLine(std::string_view text, std::size_t indentation, std::siz
   const std::size_t inner = width == kNoEnd ? kNoEnd : width - std::min(width, own + indentation);
   std::string lines;
   std::size_t before = own;
-  for (const std::string& line : wrapped(text.substr(own), inner)) {
-    lines.append(before, ' ').append(line) += '\n';
+  for (std::optional rest = text.substr(own); rest;) {
+    lines.append(before, ' ').append(takeLine(rest, inner)) += '\n';
     before = own + indentation;
   }
   return lines;
@@ -203,30 +205,38 @@ void Table::print(std::size_t indentation) const {
     }
     return;
   }
+  std::vector<std::optional<std::string_view>> cells(_columns.size());
   const auto printRow = [&](const auto& cellOf, bool isTitle) {
-    std::vector<std::vector<std::string>> cells;
-    std::size_t height = 0;
-    for (std::size_t i = 0; i < _columns.size(); ++i) {
-      cells.push_back(wrapped(cellOf(i), widths[i]));
-      height = std::max(height, cells.back().size());
+    for (std::size_t i = 0; i < cells.size(); ++i) {
+      cells[i] = cellOf(i);
     }
-    for (std::size_t line = 0; line < height; ++line) {
+    const auto isLeft = [](const auto& cell) { return cell.has_value(); };
+    while (std::ranges::any_of(cells, isLeft)) {
       std::string text = spaces(indentation);
       for (std::size_t i = 0; i < cells.size(); ++i) {
-        const std::string cell = line < cells[i].size() ? cells[i][line] : "";
-        const std::string padding = spaces(widths[i] - widthOf(cell));
-        text += _columns[i].align == Align::Right ? padding + cell : cell + padding;
-        text += spaces(kGap);
+        const std::string_view cell = takeLine(cells[i], widths[i]);
+        const std::size_t padding = widths[i] - widthOf(cell);
+        const bool isRight = _columns[i].align == Align::Right;
+        text.append(isRight ? padding : 0, ' ').append(cell);
+        text.append((isRight ? 0 : padding) + kGap, ' ');
       }
       text.erase(text.find_last_not_of(' ') + 1);
       std::cout << (isTitle ? emphasized(text) : text) << '\n';
     }
   };
   if (hasTitles) {
-    printRow([this](std::size_t i) { return _columns[i].title; }, true);
+    printRow([this](std::size_t i) -> std::string_view { return _columns[i].title; }, true);
   }
   for (const auto& row : _rows) {
-    printRow([&row](std::size_t i) { return row[i]; }, false);
+    printRow([&row](std::size_t i) -> std::string_view { return row[i]; }, false);
+  }
+}
+
+void Table::printOr(std::string_view whenEmpty) const {
+  if (empty()) {
+    printText(whenEmpty);
+  } else {
+    print();
   }
 }
 

@@ -61,6 +61,8 @@ class Table {
 
   /// Titles are left out when all are empty.
   void print(std::size_t indentation = 0) const;
+  /// The rows, or what it means that there are none.
+  void printOr(std::string_view whenEmpty) const;
 
  private:
   std::vector<Column> _columns;

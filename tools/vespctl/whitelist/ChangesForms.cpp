@@ -2,60 +2,63 @@
 
 #include <algorithm>
 #include <iostream>
+#include <utility>
 
 #include "commandline/Results.h"
+#include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/QuotedText.h"
 
 namespace vesprun {
 namespace {
 
-/// What happens to an entry; what lets more out comes first.
-constexpr const char* kWhats[] = {"added", "finer", "different", "coarser", "removed"};
-constexpr std::size_t kWhatsThatReveal = 3;
+/// What happens to an entry, in the order of the table.
+constexpr std::string_view kWhats[] = {"added", "finer", "different", "coarser", "removed"};
+constexpr const char* kLetsOut[] = {"Lets more out: ", "Lets less out: ", "Lets the same out: "};
 
 struct Row {
   std::string_view what;
+  LetsOut letsOut;
   const char* kind;
   std::string key;
   std::string before;
   std::string after;
+
+  std::size_t place() const {
+    return static_cast<std::size_t>(std::ranges::find(kWhats, what) - std::begin(kWhats));
+  }
 };
 
-void addRows(const Changes& changes, const char* kind, const WhitelistChanges& all,
-             std::vector<Row>& rows) {
+void addRows(const Changes& changes, const char* kind, std::vector<Row>& rows) {
   const bool areOfDistributions = std::string_view(kind).starts_with("distribution");
-  const auto text = [&](const PropertyDict& options) {
+  const auto text = [&](const ReadOptions& options) {
     return shortened(optionsText(options, areOfDistributions));
   };
-  const auto without = [&all](const std::string& note) {
-    const char* const nothing = all.areOfDocuments ? "no entry" : "stays";
-    return note.empty() ? nothing : std::string(nothing) + ", " + note;
-  };
-  for (const auto& [key, options, note] : changes.added) {
-    rows.push_back({"added", kind, shortened(key), without(note), text(options)});
+  for (const auto& [key, options, instead, letsOut] : changes.added) {
+    rows.push_back({"added", letsOut, kind, shortened(key), instead, text(options)});
   }
-  for (const auto& [key, before, after, effect] : changes.changed) {
-    rows.push_back({nameOf(effect), kind, shortened(key), text(before), text(after)});
+  for (const auto& change : changes.changed) {
+    rows.push_back({nameOf(change.effect), change.letsOut(), kind, shortened(change.key),
+                    text(change.before), text(change.after)});
   }
-  for (const auto& [key, options, note] : changes.removed) {
-    rows.push_back({"removed", kind, shortened(key), text(options), without(note)});
+  for (const auto& [key, options, instead, letsOut] : changes.removed) {
+    rows.push_back({"removed", letsOut, kind, shortened(key), text(options), instead});
   }
 }
 
+/// What lets more out comes first.
 std::vector<Row> rowsOf(const WhitelistChanges& changes) {
   std::vector<Row> rows;
   if (changes.areOfDocuments) {
-    addRows(changes.scalars.keys, "scalar key", changes, rows);
-    addRows(changes.scalars.prefixes, "scalar prefix", changes, rows);
-    addRows(changes.distributions.keys, "distribution key", changes, rows);
-    addRows(changes.distributions.prefixes, "distribution prefix", changes, rows);
+    addRows(changes.scalars.keys, "scalar key", rows);
+    addRows(changes.scalars.prefixes, "scalar prefix", rows);
+    addRows(changes.distributions.keys, "distribution key", rows);
+    addRows(changes.distributions.prefixes, "distribution prefix", rows);
   } else {
-    addRows(changes.scalars.keys, "scalar", changes, rows);
-    addRows(changes.distributions.keys, "distribution", changes, rows);
+    addRows(changes.scalars.keys, "scalar", rows);
+    addRows(changes.distributions.keys, "distribution", rows);
   }
-  std::ranges::stable_sort(rows, {}, [](const Row& row) {
-    return std::ranges::find(kWhats, row.what) - std::begin(kWhats);
-  });
+  std::ranges::stable_sort(rows, {},
+                           [](const Row& row) { return std::pair(row.letsOut, row.place()); });
   return rows;
 }
 
@@ -73,41 +76,60 @@ std::vector<std::string> remarksOf(const WhitelistChanges& changes) {
 
 /// "Lets more out: 1 added, 2 finer. Lets less out: 1 removed."
 std::string summaryOf(const std::vector<Row>& rows) {
+  std::uint64_t counts[std::size(kLetsOut)][std::size(kWhats)] = {};
+  for (const Row& row : rows) {
+    ++counts[static_cast<std::size_t>(row.letsOut)][row.place()];
+  }
   std::string text;
-  std::string part;
-  for (std::size_t i = 0; i < std::size(kWhats); ++i) {
-    const auto count = std::ranges::count(rows, kWhats[i], &Row::what);
-    if (count > 0) {
-      part.append(part.empty() ? "" : ", ")
-          .append(groupedDigits(static_cast<std::uint64_t>(count)));
-      part.append(" ").append(kWhats[i]);
+  for (std::size_t letsOut = 0; letsOut < std::size(kLetsOut); ++letsOut) {
+    std::string part;
+    for (std::size_t what = 0; what < std::size(kWhats); ++what) {
+      if (const std::uint64_t count = counts[letsOut][what]; count > 0) {
+        part.append(part.empty() ? kLetsOut[letsOut] : ", ").append(groupedDigits(count));
+        part.append(" ").append(kWhats[what]);
+      }
     }
-    const bool isEnd = i + 1 == kWhatsThatReveal || i + 1 == std::size(kWhats);
-    if (isEnd && !part.empty()) {
-      text.append(text.empty() ? "" : " ");
-      text.append(i < kWhatsThatReveal ? "Lets more out: " : "Lets less out: ").append(part) += '.';
-      part.clear();
+    if (!part.empty()) {
+      text.append(text.empty() ? "" : " ").append(part) += '.';
     }
   }
   return text.empty() ? "No entry changes what leaves." : text;
 }
 
-Json jsonOf(const Changes& changes, bool withOptions) {
-  const auto entries = [withOptions](const std::vector<Changes::Entry>& list) {
-    Json array = Json::array();
-    for (const auto& [key, options, note] : list) {
-      array.push_back(withOptions ? Json{{"key", key}, {"options", options}} : Json(key));
-    }
-    return array;
+void appendOptions(const char* name, const ReadOptions& options, std::string& json) {
+  json.append(",\"").append(name).append("\":");
+  appendJsonText(options, json);
+}
+
+void appendJson(const Changes& changes, bool withOptions, std::string& json) {
+  const char* separator = "";
+  const auto beginItem = [&](const char* before, const std::string& key) {
+    json.append(std::exchange(separator, ",")).append(before);
+    appendJsonText(key, json);
   };
-  Json changed = Json::array();
+  const auto appendEntries = [&](const std::vector<Changes::Entry>& entries) {
+    separator = "";
+    for (const auto& [key, options, instead, letsOut] : entries) {
+      beginItem(withOptions ? "{\"key\":" : "", key);
+      if (withOptions) {
+        appendOptions("options", options, json);
+        json += '}';
+      }
+    }
+  };
+  json += "{\"added\":[";
+  appendEntries(changes.added);
+  json += "],\"removed\":[";
+  appendEntries(changes.removed);
+  json += "],\"changed\":[";
+  separator = "";
   for (const auto& [key, before, after, effect] : changes.changed) {
-    changed.push_back(
-        {{"key", key}, {"before", before}, {"after", after}, {"effect", nameOf(effect)}});
+    beginItem("{\"key\":", key);
+    appendOptions("before", before, json);
+    appendOptions("after", after, json);
+    json.append(",\"effect\":\"").append(nameOf(effect)).append("\"}");
   }
-  return {{"added", entries(changes.added)},
-          {"removed", entries(changes.removed)},
-          {"changed", std::move(changed)}};
+  json += "]}";
 }
 
 /// As code where it is plain, else with every character that Markdown could take for markup as a
@@ -120,7 +142,11 @@ std::string markdownOf(std::string_view text) {
   };
   std::string result;
   for (const char c : printableText(text)) {
-    result += isPlain(c) ? std::string(1, c) : "&#" + std::to_string(c) + ';';
+    if (isPlain(c)) {
+      result += c;
+    } else {
+      result.append("&#").append(std::to_string(c)) += ';';
+    }
   }
   return result;
 }
@@ -135,13 +161,23 @@ std::string codeOf(std::string_view text) {
 
 }  // namespace
 
-Json jsonOf(const WhitelistChanges& changes) {
-  const auto ofKind = [&changes](const KindChanges& kind) {
-    return changes.areOfDocuments
-               ? Json{{"keys", jsonOf(kind.keys, true)}, {"prefixes", jsonOf(kind.prefixes, true)}}
-               : jsonOf(kind.keys, false);
+std::string jsonText(const WhitelistChanges& changes) {
+  std::string json;
+  const auto appendKind = [&](const char* name, const KindChanges& kind) {
+    json.append(name);
+    if (!changes.areOfDocuments) {
+      appendJson(kind.keys, false, json);
+      return;
+    }
+    json += "{\"keys\":";
+    appendJson(kind.keys, true, json);
+    json += ",\"prefixes\":";
+    appendJson(kind.prefixes, true, json);
+    json += '}';
   };
-  return {{"scalars", ofKind(changes.scalars)}, {"distributions", ofKind(changes.distributions)}};
+  appendKind("{\"scalars\":", changes.scalars);
+  appendKind(",\"distributions\":", changes.distributions);
+  return json + '}';
 }
 
 void printChanges(const WhitelistChanges& changes) {
@@ -168,7 +204,7 @@ void printChangesAsMarkdown(const WhitelistChanges& changes) {
   if (!rows.empty()) {
     std::cout << "\n| Change | Kind | Key | Before | After |\n|---|---|---|---|---|\n";
   }
-  for (const auto& [what, kind, key, before, after] : rows) {
+  for (const auto& [what, letsOut, kind, key, before, after] : rows) {
     std::cout << "| " << what << " | " << kind << " | " << codeOf(key) << " | "
               << markdownOf(before) << " | " << markdownOf(after) << " |\n";
   }

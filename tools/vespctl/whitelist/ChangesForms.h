@@ -1,11 +1,13 @@
 #pragma once
 
-#include "platform/host/documents/JsonForm.h"
+#include <string>
+
 #include "whitelist/WhitelistChanges.h"
 
 namespace vesprun {
 
-Json jsonOf(const WhitelistChanges& changes);
+/// Written without a tree of JSON values, which would cost more than the comparison.
+std::string jsonText(const WhitelistChanges& changes);
 
 /// For people, what lets more out first.
 void printChanges(const WhitelistChanges& changes);

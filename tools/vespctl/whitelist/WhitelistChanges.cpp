@@ -47,7 +47,7 @@ std::vector<Canonical> boundarySet(const DistributionOptions& options) {
 }
 
 template <typename Options>
-PropertyDict readPartOf(const WhitelistEntry<Options>& entry) {
+ReadOptions readPartOf(const WhitelistEntry<Options>& entry) {
   return readPart<Options>(*entry.written->dict());
 }
 
@@ -56,14 +56,68 @@ std::string optionsTextOf(const WhitelistEntry<Options>& entry) {
   return optionsText(readPartOf(entry), std::is_same_v<Options, DistributionOptions>);
 }
 
-/// What decides on a key without an entry of its own, for people; empty when nothing lets it leave.
+/// An added or removed entry, which the other table lacks or cannot read.
 template <typename Options>
-std::string byPrefixNote(const WhitelistTable<Options>& table, std::string_view key,
-                         const char* text) {
-  const WhitelistDecision<Options> decision = table.decideByPrefix(key);
-  return decision.options() == nullptr
-             ? std::string()
-             : text + inQuotes(decision.prefix) + ": " + optionsTextOf(*decision.entry);
+Changes::Entry missingEntry(std::string_view key, const WhitelistEntry<Options>& entry,
+                            const WhitelistTable<Options>& other, bool isPrefix, bool isAdded) {
+  Changes::Entry told{std::string(key), readPartOf(entry), "no entry",
+                      isAdded ? LetsOut::More : LetsOut::Less};
+  const auto& entries = isPrefix ? other.prefixes() : other.keys();
+  if (entries.find(key) != entries.end()) {
+    told.instead = "held back, since its options cannot be read";
+    return told;
+  }
+  const WhitelistDecision<Options> decision = other.decideByPrefix(key);
+  const Options* const byPrefix = decision.options();
+  if (byPrefix == nullptr) {
+    return told;
+  }
+  told.instead.append(isAdded ? (isPrefix ? ", was covered by " : ", left by the prefix ")
+                              : (isPrefix ? ", covered by " : ", leaves by the prefix "));
+  told.instead.append(inQuotes(decision.prefix))
+      .append(": ")
+      .append(optionsTextOf(*decision.entry));
+  const Options& from = isAdded ? *byPrefix : *entry.options;
+  const Options& to = isAdded ? *entry.options : *byPrefix;
+  told.letsOut = from == to                                       ? LetsOut::Same
+                 : vesprun::effectOf(from, to) == Effect::Coarser ? LetsOut::Less
+                                                                  : LetsOut::More;
+  return told;
+}
+
+/// An entry before and after, each null when it is not there or cannot be read.
+template <typename Options>
+struct EntryPair {
+  std::string_view key;
+  const WhitelistEntry<Options>* from;
+  const WhitelistEntry<Options>* to;
+};
+
+/// The entries that differ, in ascending order of their keys.
+template <typename Options>
+std::vector<EntryPair<Options>> differingEntries(
+    const typename WhitelistTable<Options>::Entries& before,
+    const typename WhitelistTable<Options>::Entries& after) {
+  const auto readable = [](const WhitelistEntry<Options>& entry) {
+    return entry.options ? &entry : nullptr;
+  };
+  std::vector<EntryPair<Options>> pairs;
+  for (const auto& [key, entry] : before) {
+    const auto other = after.find(key);
+    const auto* from = readable(entry);
+    const auto* to = other != after.end() ? readable(other->second) : nullptr;
+    const bool areBoth = from != nullptr && to != nullptr;
+    if (areBoth ? !(*from->options == *to->options) : from != to) {
+      pairs.push_back({key, from, to});
+    }
+  }
+  for (const auto& [key, entry] : after) {
+    if (entry.options && before.find(key) == before.end()) {
+      pairs.push_back({key, nullptr, &entry});
+    }
+  }
+  std::ranges::sort(pairs, {}, &EntryPair<Options>::key);
+  return pairs;
 }
 
 template <typename Options>
@@ -71,34 +125,13 @@ Changes compareEntries(const WhitelistTable<Options>& before, const WhitelistTab
                        bool arePrefixes) {
   const auto& entriesBefore = arePrefixes ? before.prefixes() : before.keys();
   const auto& entriesAfter = arePrefixes ? after.prefixes() : after.keys();
-  std::vector<std::string_view> keys;
-  for (const auto* entries : {&entriesBefore, &entriesAfter}) {
-    for (const auto& [key, entry] : *entries) {
-      keys.push_back(key);
-    }
-  }
-  std::ranges::sort(keys);
-  keys.erase(std::unique(keys.begin(), keys.end()), keys.end());
-  const auto readable = [](const auto& entries, std::string_view key) {
-    const auto found = entries.find(key);
-    return found != entries.end() && found->second.options ? &found->second : nullptr;
-  };
   Changes changes;
-  for (const std::string_view key : keys) {
-    const WhitelistEntry<Options>* from = readable(entriesBefore, key);
-    const WhitelistEntry<Options>* to = readable(entriesAfter, key);
-    if (from == nullptr && to != nullptr) {
-      changes.added.push_back(
-          {std::string(key), readPartOf(*to),
-           byPrefixNote(before, key, arePrefixes ? "was covered by " : "left by the prefix ")});
-    } else if (from != nullptr && to == nullptr) {
-      const bool isHeldBack = entriesAfter.find(key) != entriesAfter.end();
-      changes.removed.push_back(
-          {std::string(key), readPartOf(*from),
-           isHeldBack
-               ? "its options cannot be read"
-               : byPrefixNote(after, key, arePrefixes ? "covered by " : "leaves by the prefix ")});
-    } else if (from != nullptr && !(*from->options == *to->options)) {
+  for (const auto& [key, from, to] : differingEntries<Options>(entriesBefore, entriesAfter)) {
+    if (from == nullptr) {
+      changes.added.push_back(missingEntry(key, *to, before, arePrefixes, true));
+    } else if (to == nullptr) {
+      changes.removed.push_back(missingEntry(key, *from, after, arePrefixes, false));
+    } else {
       changes.changed.push_back({std::string(key), readPartOf(*from), readPartOf(*to),
                                  vesprun::effectOf(*from->options, *to->options)});
     }
@@ -150,7 +183,7 @@ KindChanges compareKind(const WhitelistTables& before, const WhitelistTables& af
 template <typename Options>
 KindChanges compareKeys(const TBConfig* before, const TBConfig& after, const KeySet& keys) {
   const auto readPartOfDecision = [](const WhitelistDecision<Options>& decision) {
-    return decision.entry != nullptr ? readPartOf(*decision.entry) : PropertyDict();
+    return decision.entry != nullptr ? readPartOf(*decision.entry) : ReadOptions();
   };
   KindChanges changes;
   for (const std::string& key : keys) {
@@ -160,9 +193,9 @@ KindChanges compareKeys(const TBConfig* before, const TBConfig& after, const Key
     const Options* fromOptions = from.options();
     const Options* toOptions = to.options();
     if (fromOptions == nullptr && toOptions != nullptr) {
-      changes.keys.added.push_back({key, readPartOfDecision(to), {}});
+      changes.keys.added.push_back({key, readPartOfDecision(to), "stays", LetsOut::More});
     } else if (fromOptions != nullptr && toOptions == nullptr) {
-      changes.keys.removed.push_back({key, readPartOfDecision(from), {}});
+      changes.keys.removed.push_back({key, readPartOfDecision(from), "stays", LetsOut::Less});
     } else if (fromOptions != nullptr && !(*fromOptions == *toOptions)) {
       changes.keys.changed.push_back({key, readPartOfDecision(from), readPartOfDecision(to),
                                       vesprun::effectOf(*fromOptions, *toOptions)});

@@ -19,18 +19,25 @@ Effect effectOf(const DistributionOptions& before, const DistributionOptions& af
 
 const char* nameOf(Effect effect);
 
+/// What a change lets out in all. Where a prefix lets out the keys of an entry that is missing, an
+/// added one may let out less, and a removed one more.
+enum class LetsOut { More, Less, Same };
+
 /// What changes for keys, or for the entries of a list; each in ascending order.
 struct Changes {
   struct Entry {
     std::string key;
-    PropertyDict options;  ///< those that a report reads
-    std::string note;      ///< for people, or empty
+    ReadOptions options;
+    std::string instead;  ///< for people: what decides where the entry is missing
+    LetsOut letsOut;
   };
   struct Change {
     std::string key;
-    PropertyDict before;
-    PropertyDict after;
+    ReadOptions before;
+    ReadOptions after;
     Effect effect;
+
+    LetsOut letsOut() const { return effect == Effect::Coarser ? LetsOut::Less : LetsOut::More; }
   };
 
   std::vector<Entry> added;

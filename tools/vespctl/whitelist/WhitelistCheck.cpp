@@ -127,7 +127,7 @@ class WhitelistCheck {
         } else {
           if (rest.empty()) {
             constexpr bool kIsDistribution = std::is_same_v<Options, DistributionOptions>;
-            const PropertyDict read = readPart<Options>(*written);
+            const ReadOptions read = readPart<Options>(*written);
             rest = (read.empty() && !kIsDistribution ? "" : "with ") +
                    shortened(optionsText(read, kIsDistribution));
           }

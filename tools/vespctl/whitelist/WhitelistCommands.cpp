@@ -24,7 +24,7 @@ struct Input {
   std::int32_t today;  ///< of the device where the file is its own, else of the machine
 };
 
-WhitelistDocument parse(const std::string& name, const std::string& bytes) {
+WhitelistDocument parse(const std::string& name, std::string_view bytes) {
   std::string error;
   std::optional<WhitelistDocument> document = WhitelistDocument::read(bytes, error);
   if (!document) {
@@ -96,9 +96,6 @@ void printEntries(const std::string& file) {
                {"Owner"},
                {"Reason"},
                {"Expires"}});
-  const auto textOrNull = [](const std::string* text) {
-    return text != nullptr ? Json(*text) : Json();
-  };
   const auto textOrNothing = [](const std::string* text) {
     return text != nullptr ? shortened(*text) : std::string();
   };
@@ -106,20 +103,30 @@ void printEntries(const std::string& file) {
                                            const auto& entry) {
     const PropertyDict* written = entry.dict();
     const EntryMetadata metadata = EntryMetadata::read(written, aboutOf(*group.dict()));
-    std::optional<PropertyDict> read;
+    std::optional<ReadOptions> read;
     if (written != nullptr && Options::read(*written)) {
       read = readPart<Options>(*written);
     }
     if (invocation().json) {
-      printJson({{"group", group.name},
-                 {"list", list.name},
-                 {"key", entry.name},
-                 {"options", jsonOrNull(read)},
-                 {"owner", textOrNull(metadata.owner)},
-                 {"reason", textOrNull(metadata.reason)},
-                 {"expires",
-                  metadata.expires != nullptr ? Json(PropertyValue(*metadata.expires)) : Json()},
-                 {"line", entry.line}});
+      std::string json;
+      const auto append = [&json](const char* name, const auto* value) {
+        json.append(json.empty() ? "{\"" : ",\"").append(name).append("\":");
+        if (value == nullptr) {
+          json += "null";
+        } else if constexpr (std::is_convertible_v<decltype(*value), PropertyValue>) {
+          json += jsonText(PropertyValue(*value));
+        } else {
+          appendJsonText(*value, json);
+        }
+      };
+      append("group", &group.name);
+      append("list", &list.name);
+      append("key", &entry.name);
+      append("options", read ? &*read : nullptr);
+      append("owner", metadata.owner);
+      append("reason", metadata.reason);
+      append("expires", metadata.expires);
+      std::cout << json << ",\"line\":" << entry.line << "}\n";
       return;
     }
     constexpr bool kIsDistribution = std::is_same_v<Options, DistributionOptions>;
@@ -141,10 +148,8 @@ void printEntries(const std::string& file) {
       }
     }
   }
-  if (!table.empty()) {
-    table.print();
-  } else if (!invocation().json) {
-    printText("No entries.");
+  if (!invocation().json) {
+    table.printOr("No entries.");
   }
 }
 
@@ -153,6 +158,7 @@ WhitelistChanges changesOnDevice(const Complaints& complaints, const std::string
                                  std::string_view bytes) {
   const std::unique_ptr<TBConfig> after = TBConfig::fromBytes(bytes);
   if (!after) {
+    parse(name, bytes);  // tells the line
     complaints.fail(name + ": is not a whitelist");
   }
   const std::unique_ptr<TBConfig> before = TBConfig::init();
@@ -188,10 +194,12 @@ void printDifferences(const DiffArguments& arguments) {
     return changes;
   };
   const WhitelistChanges changes = differences();
-  if (arguments.markdown) {
+  if (invocation().json) {
+    std::cout << jsonText(changes) << '\n';
+  } else if (arguments.markdown) {
     printChangesAsMarkdown(changes);
   } else {
-    printResult(jsonOf(changes), [&changes] { printChanges(changes); });
+    printChanges(changes);
   }
   constexpr int kStatusOfMore = 3;
   invocation().status = arguments.exitCode && changes.revealMore() ? kStatusOfMore : 0;
@@ -218,12 +226,14 @@ void install(const std::string& file, bool force) {
   orFail([&](std::string& error) {
     return installWhitelist(directory, input.bytes, previous, error);
   });
-  printResult(jsonOf(changes), [&] {
-    printChanges(changes);
-    std::cout << '\n';
-    printText(previous.empty() ? "Installed."
-                               : "Installed. To go back: vespctl whitelist install " + previous);
-  });
+  if (invocation().json) {
+    std::cout << jsonText(changes) << '\n';
+    return;
+  }
+  printChanges(changes);
+  std::cout << '\n';
+  printText(previous.empty() ? "Installed."
+                             : "Installed. To go back: vespctl whitelist install " + previous);
 }
 
 void addCheck(CLI::App& command) {

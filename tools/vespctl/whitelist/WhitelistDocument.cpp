@@ -5,6 +5,7 @@
 #include <utility>
 
 #include "common/TextForm.h"
+#include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeReader.h"
 
 namespace vesprun {
@@ -12,13 +13,23 @@ namespace {
 
 /// Finds the values of the nodes, which are the entries of `dict`.
 void findValues(std::vector<WhitelistDocument::Node>& nodes, const PropertyDict& dict) {
+  const auto take = [](WhitelistDocument::Node& node, const PropertyValue& value) {
+    node.value = &value;
+    if (node.dict() != nullptr) {
+      findValues(node.below, *node.dict());
+    }
+  };
+  if (nodes.size() == dict.size()) {  // no name stands twice
+    auto entry = dict.begin();
+    for (WhitelistDocument::Node& node : nodes) {
+      take(node, entry++->second);
+    }
+    return;
+  }
   std::unordered_set<std::string_view> later;
   for (auto node = nodes.rbegin(); node != nodes.rend(); ++node) {
     if (later.insert(node->name).second) {
-      node->value = dict.find(node->name);
-      if (node->dict() != nullptr) {
-        findValues(node->below, *node->dict());
-      }
+      take(*node, *dict.find(node->name));
     }
   }
 }
@@ -60,7 +71,7 @@ WhitelistTables WhitelistDocument::tables(bool isInternalDevice) const {
   return tables;
 }
 
-std::string optionsText(const PropertyDict& read, bool areOfDistribution) {
+std::string optionsText(const ReadOptions& read, bool areOfDistribution) {
   std::string text;
   for (const auto& [name, value] : read) {
     text.append(text.empty() ? "" : ", ").append(name);
@@ -75,6 +86,16 @@ std::string optionsText(const PropertyDict& read, bool areOfDistribution) {
     text.append(array->empty() ? " none" : "");
   }
   return !text.empty() ? text : areOfDistribution ? "statistics alone" : "exactly as counted";
+}
+
+void appendJsonText(const ReadOptions& read, std::string& text) {
+  text += '{';
+  for (const auto& [name, value] : read) {
+    text.append(text.back() == '{' ? "" : ",");
+    appendJsonText(name, text);
+    text.append(":").append(jsonText(value));
+  }
+  text += '}';
 }
 
 std::string shortened(std::string_view text) {

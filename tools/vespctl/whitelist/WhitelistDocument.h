@@ -44,13 +44,17 @@ inline const PropertyDict* aboutOf(const PropertyDict& group) {
   return group.findDict(EntryMetadata::kAbout);
 }
 
+/// Options that a report reads, by name. A dictionary of each would cost more than reading the
+/// document.
+using ReadOptions = std::vector<std::pair<std::string, PropertyValue>>;
+
 /// What a report reads of the options as written.
 template <typename Options>
-PropertyDict readPart(const PropertyDict& written) {
-  PropertyDict read;
-  for (const auto& [name, value] : written) {
-    if (Options::isRead(name)) {
-      read.set(name, value);
+ReadOptions readPart(const PropertyDict& written) {
+  ReadOptions read;
+  for (const auto& option : written) {
+    if (Options::isRead(option.first)) {
+      read.push_back(option);
     }
   }
   return read;
@@ -70,7 +74,10 @@ bool withKindOfList(std::string_view list, const Take& take) {
 }
 
 /// The options for people: "bucket_interval 10, sig_fig 2".
-std::string optionsText(const PropertyDict& read, bool areOfDistribution);
+std::string optionsText(const ReadOptions& read, bool areOfDistribution);
+
+/// Appends their JSON form.
+void appendJsonText(const ReadOptions& read, std::string& text);
 
 /// A text cut in the middle when it is long, since untrusted texts may be of any length.
 std::string shortened(std::string_view text);

@@ -25,7 +25,14 @@ void appendJsonText(std::string_view string, std::string& text) {
   static constexpr std::string_view kEscapes = "bfnrt\"\\";
   const std::size_t begin = text.size();
   text += '"';
+  const auto isPlain = [](char c) { return c >= ' ' && c < 0x7F && c != '"' && c != '\\'; };
   for (std::size_t at = 0; at < string.size();) {
+    const auto* const from = string.begin() + static_cast<std::ptrdiff_t>(at);
+    if (const auto plain = std::find_if_not(from, string.end(), isPlain) - from; plain > 0) {
+      text.append(string, at, static_cast<std::size_t>(plain));
+      at += static_cast<std::size_t>(plain);
+      continue;
+    }
     if (const auto escape = kEscaped.find(string[at]); escape != std::string_view::npos) {
       text.append(1, '\\').append(1, kEscapes[escape]);
       ++at;

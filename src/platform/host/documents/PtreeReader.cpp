@@ -241,7 +241,7 @@ class PtreeParser {
   void takeEnd(const XML_Char* /*name*/) {
     if (std::exchange(_inText, false)) {
       if (_element == Element::Key) {
-        _open.back().key = _text;
+        _open.back().key.swap(_text);
         _open.back().keyLine = _elementLine;
       } else {
         add(textValue());
@@ -270,21 +270,21 @@ class PtreeParser {
       if (_visit) {
         visitEntry(value);
       }
-      _open.back().dict.set(_open.back().key, std::move(value));
+      _open.back().dict.set(std::move(_open.back().key), std::move(value));
     } else {
       _open.back().array.push_back(std::move(value));
     }
   }
 
-  void visitEntry(const PropertyValue& value) const {
-    std::vector<std::string_view> keys;
+  void visitEntry(const PropertyValue& value) {
+    _keys.clear();
     for (const Container& container : _open) {
       if (!container.isDict) {
         return;
       }
-      keys.push_back(container.key);
+      _keys.push_back(container.key);
     }
-    _visit(keys, _open.back().keyLine, value);
+    _visit(_keys, _open.back().keyLine, value);
   }
 
   PropertyValue textValue() {
@@ -446,6 +446,7 @@ class PtreeParser {
   Element _element{};    ///< the last that began
   std::size_t _elementLine = 0;
   std::string _text;
+  std::vector<std::string_view> _keys;  ///< for `_visit`
   std::vector<Container> _open;
   std::optional<PropertyValue> _value;
 };

@@ -1,5 +1,6 @@
 #include "platform/host/documents/QuotedText.h"
 
+#include <algorithm>
 #include <cstddef>
 #include <limits>
 
@@ -34,6 +35,10 @@ void appendPrintable(std::string_view text, std::size_t mostCharacters, std::str
 }  // namespace
 
 std::string printableText(std::string_view text) {
+  const auto isPlain = [](char c) { return c >= ' ' && c < 0x7F; };
+  if (std::ranges::all_of(text, isPlain)) {
+    return std::string(text);
+  }
   std::string printable;
   appendPrintable(text, std::numeric_limits<std::size_t>::max(), printable);
   return printable;
