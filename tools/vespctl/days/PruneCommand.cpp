@@ -13,6 +13,7 @@
 #include "Command.h"
 #include "Complaints.h"
 #include "commandline/Arguments.h"
+#include "commandline/Progress.h"
 #include "common/Calendar.h"
 #include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/QuotedText.h"
@@ -49,7 +50,12 @@ CounterStore::Rows removeCounters(HostPlatform& device, std::int64_t day, bool i
     }
   };
   const auto remove = [&](CounterStore& store) {
-    rows = store.removeBefore(day);
+    rows = store.rowsBefore(day);
+    Progress progress("Removing counters", "days", rows.days.size());
+    for (const std::int32_t old : rows.days) {
+      store.removeDay(old);
+      progress.advance();
+    }
     store.returnFreeSpace();
     return true;
   };
@@ -113,7 +119,8 @@ void prune(const Pruning& wanted) {
   const Date now = device->clock().now();
   const std::int64_t today = daysSince1970(now);
   std::vector<std::string> problems;
-  LogPruning logs(directory, now);
+  Progress progress("Pruning", "logs read or removed");
+  LogPruning logs(directory, now, [&progress] { progress.advance(); });
   CounterStore::Rows counters;
   const bool isWanted = wanted.counterDays || wanted.outboxDays || wanted.outboxMebibytes;
   PruneDays days = PruneDays::read(directory);
@@ -152,6 +159,7 @@ void prune(const Pruning& wanted) {
     lines.set(file, removed);
   }
   problems.insert(problems.begin(), logs.problems().begin(), logs.problems().end());
+  Progress::hide();
   printResult({{"days", counters.days},
                {"scalars", counters.scalars},
                {"distributions", counters.distributions},

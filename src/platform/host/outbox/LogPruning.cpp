@@ -216,7 +216,8 @@ std::optional<std::vector<const LogPruning::Log*>> LogPruning::noteDailyLogs(
   std::map<std::string, DailyLog> daily;
   const auto unreadable = forEachDailyLog(
       _directory,
-      [&daily](DailyLog&& log) {
+      [&](DailyLog&& log) {
+        _step();
         log.document = {};
         daily.emplace(log.name, std::move(log));
       },
@@ -252,6 +253,7 @@ std::optional<std::vector<const LogPruning::Log*>> LogPruning::noteDailyLogs(
 }
 
 void LogPruning::removeFiles(const Log& log) {
+  _step();
   if (_directory.isReadOnly()) {
     _gone.insert(log.files.begin(), log.files.end());
     _bytesGone += log.bytes;

@@ -1,11 +1,13 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
 #include <map>
 #include <optional>
 #include <set>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include "platform/host/device/DeviceDirectory.h"
@@ -21,9 +23,10 @@ namespace vesprun {
 class LogPruning {
  public:
   /// `now` is the time of the notes. The directory must outlive the object; when it is read-only,
-  /// everything is as if it had been removed.
-  LogPruning(const DeviceDirectory& directory, const Date& now)
-      : _directory(directory), _now(now) {}
+  /// everything is as if it had been removed. Calls `step` for each log that it reads or removes.
+  LogPruning(
+      const DeviceDirectory& directory, const Date& now, std::function<void()> step = [] {})
+      : _directory(directory), _now(now), _step(std::move(step)) {}
 
   /// Removes the logs and the lines that were written before `time`.
   void removeBefore(const Date& time);
@@ -58,6 +61,7 @@ class LogPruning {
 
   const DeviceDirectory& _directory;
   Date _now;
+  std::function<void()> _step;
   /// Of the folder: else a header without a log may be that of a coming log.
   std::optional<FileDescriptor> _lock;
   std::vector<std::string> _removed;
