@@ -26,6 +26,9 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
     const char* complaint;
   } cases[] = {
       {2, "frob", "unknown command \"frob\"; one of init, run,"},
+      {2, "shwo", "unknown command \"shwo\", perhaps \"show\"; one of init, run,"},
+      {2, "--json show", "\"--json\" stands before the command"},
+      {2, "init", "DIR is required: A folder"},
       {2, "", "a command is missing; one of init, run,"},
       {2, "counters frob 1",
        "unknown command \"frob\"; one of get, set, add, sample, import, dump"},
@@ -47,7 +50,7 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
       {2, "nand magazine 1 --mode=-1", noNumber},
       {2, "nand magazine 1 --mode 4294967296", noNumber},
       {2, "counters dump --json", "not expected"},
-      {2, "show -C device", "not expected"},
+      {2, "show -C device", "\"-C\" is not expected here: it stands before the command"},
       {1, "-C nowhere show", "nowhere: No such file"},
       {1, "-C file counters set k 1", "file: no device: it has no device.json; make one with"},
       {1, "init file", "file: is not empty"},
@@ -144,6 +147,13 @@ TEST_F(VespctlTest, TakesDaysAsNumbersDatesAndWords) {
       "Date          Day  Kind          Key    Value\n"
       "2024-03-04  19786  distribution  a.key  minimum 1, maximum 2, mean 1.5, deviations 0.5, "
       "count 2\n");
+  EXPECT_EQ(print("counters get a.kye"),
+            "\"a.kye\" was never counted; the nearest that was is \"a.key\".\n");
+  EXPECT_EQ(
+      print("counters get 'a.kye*'"),
+      "A key that begins with \"a.kye\" was never counted; the nearest that was is \"a.key\".\n");
+  EXPECT_EQ(print("counters get a.key --to 2024-01-01"),
+            "\"a.key\" was not counted in these days, but from 2024-03-04 to 2024-03-05.\n");
   for (const char* const day : {"2024-02-30", "tomorrow", "0x8", "99999999-01-01"}) {
     EXPECT_EQ(run(std::string("preview --day ") + day), 2);
     EXPECT_THAT(error, HasSubstr(std::string("\"") + day + "\" is not a day: "));

@@ -6,9 +6,11 @@
 #include <exception>
 #include <iostream>
 #include <new>
+#include <utility>
 
 #include "commandline/Completion.h"
 #include "commandline/Manual.h"
+#include "commandline/NearestName.h"
 #include "commandline/Progress.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/StandardStreams.h"
@@ -26,34 +28,54 @@ void needOneCommand(CLI::App& above) {
     if (extras.empty() && hasCommand) {
       return;
     }
-    if (hasCommand) {
-      throw CLI::ExtrasError(above.get_name(), extras);
+    if (hasCommand && extras.front().starts_with('-')) {
+      throw CLI::ValidationError(quotedText(extras.front()) +
+                                 " stands before the command, but options of a command stand "
+                                 "behind it");
     }
+    NearestName nearest(extras.empty() ? std::string_view() : extras.front());
     std::string known;
-    for (const CLI::App* command : above.get_subcommands({})) {
-      if (!command->get_group().empty()) {
-        known.append(known.empty() ? "" : ", ").append(command->get_name());
-      }
+    for (const CLI::App* command : above.get_subcommands(
+             [](const CLI::App* command) { return !command->get_group().empty(); })) {
+      known.append(known.empty() ? "" : ", ").append(command->get_name());
+      nearest.take(command->get_name());
     }
-    throw CLI::ValidationError((extras.empty() ? "a command is missing"
-                                               : "unknown command " + quotedText(extras.front())) +
-                               "; one of " + known);
+    throw CLI::ValidationError(
+        (extras.empty() ? "a command is missing"
+                        : "unknown command " + quotedText(extras.front()) +
+                              (nearest.isNear() ? ", perhaps \"" + nearest.found() + '"' : "")) +
+        "; one of " + known);
   });
 }
 
-/// Those of the command that the command line has come to.
-std::string knownOptions(const CLI::App& app) {
+/// What the command line lacks, or has too much, and what it may have.
+std::string explain(const CLI::App& app, const CLI::ParseError& error) {
   const CLI::App* command = &app;
   while (!command->get_subcommands().empty()) {
     command = command->get_subcommands().front();
   }
-  std::string names;
-  for (const CLI::Option* option : command->get_options()) {
-    if (!option->get_positional()) {
-      names.append(names.empty() ? "; its options are " : ", ").append(option->get_name());
+  std::string text = error.what();
+  const std::vector<const CLI::Option*> options = command->get_options();
+  const std::vector<std::string> extras = command->remaining();
+  if (dynamic_cast<const CLI::ExtrasError*>(&error) != nullptr && !extras.empty()) {
+    text = quotedText(extras.front()) + " is not expected here";
+    if (app.get_option_no_throw(extras.front()) != nullptr) {
+      return text + ": it stands before the command";
+    }
+    const char* separator = "; the options are ";
+    for (const CLI::Option* option : options) {
+      if (!option->get_positional()) {
+        text.append(std::exchange(separator, ", ")).append(option->get_name());
+      }
+    }
+  } else if (dynamic_cast<const CLI::RequiredError*>(&error) != nullptr) {
+    for (const CLI::Option* option : options) {
+      if (text.starts_with(option->get_name() + ' ') && !option->get_description().empty()) {
+        return text + ": " + option->get_description();
+      }
     }
   }
-  return names;
+  return text;
 }
 
 int parse(CLI::App& app, int argc, char** argv) {
@@ -62,8 +84,7 @@ int parse(CLI::App& app, int argc, char** argv) {
   } catch (const CLI::Success& help) {
     app.exit(help);
   } catch (const CLI::ParseError& error) {
-    const bool isUnknown = dynamic_cast<const CLI::ExtrasError*>(&error) != nullptr;
-    complain(error.what() + (isUnknown ? knownOptions(app) : std::string()));
+    complain(explain(app, error));
     std::fprintf(stderr, "Try \"%s --help\".\n", invocation().command.c_str());
     return 2;
   }

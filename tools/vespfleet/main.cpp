@@ -2,6 +2,7 @@
 #include <cstdio>
 #include <iostream>
 #include <memory>
+#include <set>
 
 #include "Comparison.h"
 #include "FleetStore.h"
@@ -83,18 +84,24 @@ CLI::Option* addBy(CLI::App& command, Member& by, bool withWhitelist) {
     names.emplace("whitelist", Member::Whitelist);
   }
   const std::string choice = withWhitelist ? "build, model or whitelist" : "build or model";
-  return command
-      .add_option_function<std::string>(
-          "--by",
-          [&by, names, choice](const std::string& name) {
-            const auto found = names.find(name);
-            if (found == names.end()) {
-              throw CLI::ValidationError("--by", "is one of " + choice);
-            }
-            by = found->second;
-          },
-          "Parts the devices by " + choice)
-      ->type_name("MEMBER");
+  CLI::Option* const option = command.add_option_function<std::string>(
+      "--by",
+      [&by, names, choice](const std::string& name) {
+        const auto found = names.find(name);
+        if (found == names.end()) {
+          throw CLI::ValidationError("--by", "is one of " + choice);
+        }
+        by = found->second;
+      },
+      "Parts the devices by " + choice);
+  completeWith(option, [names] {
+    std::vector<std::string> words;
+    for (const auto& [name, member] : names) {
+      words.push_back(name);
+    }
+    return words;
+  });
+  return option->type_name("MEMBER");
 }
 
 const char* kindName(KeyKind kind) { return kind == KeyKind::Scalar ? "scalar" : "distribution"; }
@@ -217,12 +224,20 @@ void addQuestionCommand(CLI::App& command) {
 
 void addCompare(CLI::App& command) {
   const auto asked = addAsked(command);
-  command.add_option("A", asked->groups.values[0], "The devices to compare with")
-      ->required()
-      ->type_name("");
-  command.add_option("B", asked->groups.values[1], "The devices that are compared")
-      ->required()
-      ->type_name("");
+  const auto addGroup = [&](const char* name, std::string& value, const char* help) {
+    completeWith(command.add_option(name, value, help)->required()->type_name(""), [asked] {
+      std::set<std::string> members;
+      openStore(asked->store)
+          ->visitLastDays(asked->groups.by,
+                          [&](std::int32_t, const MemberText& member, std::uint64_t) {
+                            members.insert(member.value_or(std::string()));
+                          });
+      members.erase(std::string());
+      return std::vector<std::string>(members.begin(), members.end());
+    });
+  };
+  addGroup("A", asked->groups.values[0], "The devices to compare with");
+  addGroup("B", asked->groups.values[1], "The devices that are compared");
   addBy(command, asked->groups.by, true)->required();
   addRange(command, *asked);
   command.add_option("--key", asked->groups.prefix, "Only keys that begin so")->type_name("PREFIX");

@@ -263,7 +263,8 @@ void dumpLines(const CounterArguments& arguments) {
 }
 
 void addKeyAndDay(CLI::App& command, CounterArguments& arguments) {
-  completeWith(command.add_option("KEY", arguments.key)->required(), countedKeys);
+  completeWith(command.add_option("KEY", arguments.key, "The key of a counter")->required(),
+               countedKeys);
   addDay(command, "--day", arguments.day, "The day, instead of today");
 }
 

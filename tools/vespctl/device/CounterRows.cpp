@@ -11,10 +11,12 @@
 #include "ReadOnlyDevice.h"
 #include "commandline/Arguments.h"
 #include "commandline/Completion.h"
+#include "commandline/NearestName.h"
 #include "common/TextForm.h"
 #include "platform/host/counters/HostTallybook.h"
 #include "platform/host/figures/FigureTable.h"
 #include "report/TBReport.h"
+#include "whitelist/WhitelistDocument.h"
 
 namespace vesprun {
 namespace {
@@ -70,6 +72,35 @@ void takeDay(CounterStore& store, std::int32_t day, const std::string& prefix, b
       });
 }
 
+/// Why no row was found, and where some are.
+std::string whyNoRows(CounterStore& store, const std::string& prefix, bool isWhole) {
+  NearestName nearest(prefix, !isWhole);
+  std::optional<std::int32_t> first;
+  std::int32_t last = 0;
+  const auto take = [&](std::string_view key, std::int32_t day) {
+    if (isWhole ? key == prefix : key.starts_with(prefix)) {
+      first = std::min(first.value_or(day), day);
+      last = std::max(last, day);
+    } else {
+      nearest.take(key);
+    }
+  };
+  store.readScalars({}, DayLimits::min(), DayLimits::max(),
+                    [&](std::string_view key, std::int32_t day, auto&&...) { take(key, day); });
+  store.readDistributions(
+      {}, DayLimits::min(), DayLimits::max(),
+      [&](std::string_view key, std::int32_t day, auto&&...) { take(key, day); });
+  const std::string what =
+      isWhole ? inQuotes(prefix) : "A key that begins with " + inQuotes(prefix);
+  if (first) {
+    return what + " was not counted in these days, but from " + dateOfDay(*first) + " to " +
+           dateOfDay(last) + '.';
+  }
+  return what + " was never counted" +
+         (nearest.found().empty() ? ", nor was any other key."
+                                  : "; the nearest that was is " + inQuotes(nearest.found()) + '.');
+}
+
 void printRows(const WantedRows& wanted) {
   Complaints complaints;
   const auto device = openDeviceReadOnly(complaints);
@@ -91,17 +122,19 @@ void printRows(const WantedRows& wanted) {
     table.addRow({dateOfDay(day), std::to_string(day), row["kind"].get<std::string>(), key,
                   unit.empty() ? figures : (figures + before).append(unit)});
   };
+  std::string note;
   const auto read = [&](CounterStore& store) {
     std::optional<std::int32_t> day = store.nextDay(std::int64_t{from} - 1);
     for (; day && *day <= to; day = store.nextDay(*day)) {
       takeDay(store, *day, prefix, !isPrefix, take);
     }
+    if (table.empty() && !invocation().json) {
+      note = whyNoRows(store, prefix, !isPrefix);
+    }
   };
   orFail([&](std::string& error) { return device->counters().read(read, error); });
-  if (!table.empty()) {
-    table.print();
-  } else if (!invocation().json) {
-    printText("Nothing was counted there in these days.");
+  if (!invocation().json) {
+    table.printOr(note.empty() ? "Nothing was ever counted on this device." : note);
   }
 }
 

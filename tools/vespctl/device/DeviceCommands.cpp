@@ -73,8 +73,9 @@ bool beginInit(const DeviceDirectory& directory) {
     }
   } else if (!std::filesystem::is_empty(directory.path(), failure) || failure) {
     if (failure || !isCutShortWithoutMark(directory)) {
-      throw CommandFailure(directory.path() +
-                           (failure ? ": " + failure.message() : ": is not empty"));
+      throw CommandFailure(
+          directory.path() +
+          (failure ? ": " + failure.message() : ": is not empty; name a new or an empty folder"));
     }
   }
   std::filesystem::permissions(directory.path(), std::filesystem::perms::owner_all, failure);
@@ -118,7 +119,7 @@ void initDevice(const std::string& path, bool sample) {
   makeFolders(path);
   std::error_code failure;
   if (!std::filesystem::is_directory(path, failure)) {
-    throw CommandFailure(path + ": is not empty");
+    throw CommandFailure(path + ": is not empty; name a new or an empty folder");
   }
   struct stat status {};
   if (stat(path.c_str(), &status) != 0) {

@@ -31,7 +31,7 @@ void printPreferences(const PreferenceArguments& arguments, bool wholeDomain) {
       for (const auto& [key, value] : values) {
         table.addRow({std::string(key), jsonText(value)});
       }
-      table.print();
+      table.printOr("No preferences.");
     });
     return;
   }
@@ -77,39 +77,42 @@ PreferenceArguments& addUser(CLI::App& command) {
 
 PreferenceArguments& addDomain(CLI::App& command) {
   PreferenceArguments& arguments = addUser(command);
-  completeWith(command.add_option("DOMAIN", arguments.domain)->required(), [&arguments] {
-    const DeviceDirectory directory = openDirectory(Access::Reading);
-    const HostPath folder = directory.hostPath("var/" + arguments.user + "/Library/Preferences");
-    std::vector<std::string> domains;
-    std::string error;
-    for (const std::string& name :
-         namesInFolder(folder, error).value_or(std::vector<std::string>())) {
-      constexpr std::string_view kEnd = ".ptree";
-      if (name.ends_with(kEnd) && !name.starts_with('.')) {
-        domains.push_back(name.substr(0, name.size() - kEnd.size()));
-      }
-    }
-    return domains;
-  });
+  completeWith(
+      command.add_option("DOMAIN", arguments.domain, "The name of their document")->required(),
+      [&arguments] {
+        const DeviceDirectory directory = openDirectory(Access::Reading);
+        const HostPath folder =
+            directory.hostPath("var/" + arguments.user + "/Library/Preferences");
+        std::vector<std::string> domains;
+        std::string error;
+        for (const std::string& name :
+             namesInFolder(folder, error).value_or(std::vector<std::string>())) {
+          constexpr std::string_view kEnd = ".ptree";
+          if (name.ends_with(kEnd) && !name.starts_with('.')) {
+            domains.push_back(name.substr(0, name.size() - kEnd.size()));
+          }
+        }
+        return domains;
+      });
   return arguments;
 }
 
 void addGet(CLI::App& command) {
   PreferenceArguments& arguments = addDomain(command);
-  const CLI::Option* key = command.add_option("KEY", arguments.key);
+  const CLI::Option* key = command.add_option("KEY", arguments.key, "The name of a preference");
   command.callback([&arguments, key] { printPreferences(arguments, key->count() == 0); });
 }
 
 void addSet(CLI::App& command) {
   PreferenceArguments& arguments = addDomain(command);
-  command.add_option("KEY", arguments.key)->required();
+  command.add_option("KEY", arguments.key, "The name of a preference")->required();
   command.add_option("JSON", arguments.json, "The value in its JSON form")->required();
   command.callback([&arguments] { setPreference(arguments); });
 }
 
 void addRemove(CLI::App& command) {
   PreferenceArguments& arguments = addDomain(command);
-  command.add_option("KEY", arguments.key)->required();
+  command.add_option("KEY", arguments.key, "The name of a preference")->required();
   command.callback([&arguments] { changePreference(arguments, std::nullopt); });
 }
 

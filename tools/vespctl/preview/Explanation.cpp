@@ -2,12 +2,11 @@
 
 #include <algorithm>
 #include <limits>
-#include <numeric>
-#include <unordered_set>
 #include <vector>
 
 #include "ReadOnlyDevice.h"
 #include "commandline/Arguments.h"
+#include "commandline/NearestName.h"
 #include "commandline/Results.h"
 #include "driver/DailyTasks.h"
 #include "report/ReportSources.h"
@@ -140,26 +139,6 @@ std::string valueTextOf(const Json& explanation) {
   return text + '.';
 }
 
-/// The number of characters to change, insert or remove, or `enough` when it is not less.
-std::size_t editDistance(std::string_view left, std::string_view right, std::size_t enough) {
-  std::vector<std::size_t> row(right.size() + 1);
-  std::iota(row.begin(), row.end(), std::size_t{0});
-  for (std::size_t i = 0; i < left.size(); ++i) {
-    std::size_t diagonal = std::exchange(row[0], i + 1);
-    std::size_t least = row[0];
-    for (std::size_t j = 0; j < right.size(); ++j) {
-      const std::size_t changed = diagonal + (left[i] == right[j] ? 0 : 1);
-      diagonal = row[j + 1];
-      row[j + 1] = std::min({changed, row[j] + 1, diagonal + 1});
-      least = std::min(least, row[j + 1]);
-    }
-    if (least >= enough) {
-      return enough;
-    }
-  }
-  return std::min(row.back(), enough);
-}
-
 }  // namespace
 
 template <typename Options>
@@ -209,14 +188,14 @@ std::optional<Json> explainKey(const TBConfig* config, std::string_view key) {
 template std::optional<Json> explainKey<ScalarOptions>(const TBConfig*, std::string_view);
 template std::optional<Json> explainKey<DistributionOptions>(const TBConfig*, std::string_view);
 
-void printExplanation(const Json& explanation) {
+void printExplanation(const Json& explanation, bool hasWhitelist) {
   const bool leaves = explanation["leaves"] == true;
   std::string text =
       "As a " + textOf(explanation["kind"]) + (leaves ? " it leaves, " : " it stays: ");
   if (leaves) {
     text += optionsOf(explanation) + ": " + reasonOf(explanation) + '.';
   } else {
-    text += reasonOf(explanation) +
+    text += (hasWhitelist ? reasonOf(explanation) : "without a whitelist nothing leaves") +
             (explanation["by"].is_null() ? "." : ", but its options cannot be read.");
   }
   for (const Json& passed : explanation["passedOver"]) {
@@ -232,30 +211,19 @@ void printExplanation(const Json& explanation) {
 }
 
 std::string whetherCounted(std::string_view key) {
-  constexpr std::size_t kMaxCompared = 256;
-  const std::string_view start = key.substr(0, kMaxCompared);
-  std::unordered_set<std::string> compared;
-  std::string nearest;
-  std::size_t least = std::numeric_limits<std::size_t>::max();
+  NearestName nearest(key);
   bool isCounted = false;
   using Days = std::numeric_limits<std::int32_t>;
   forEachRow(Days::min(), Days::max(), [&](bool, std::string_view counted) {
     isCounted = isCounted || counted == key;
-    const std::string_view other = counted.substr(0, kMaxCompared);
-    const std::size_t longer = std::max(start.size(), other.size());
-    if (isCounted || longer - std::min(start.size(), other.size()) >= least ||
-        !compared.emplace(counted).second) {
-      return;
-    }
-    if (const std::size_t distance = editDistance(start, other, least); distance < least) {
-      least = distance;
-      nearest = counted;
+    if (!isCounted) {
+      nearest.take(counted);
     }
   });
   return isCounted ? ":"
-         : nearest.empty()
+         : nearest.found().empty()
              ? " was never counted, nor was any other key:"
-             : " was never counted; the nearest key that was is " + inQuotes(nearest) + ':';
+             : " was never counted; the nearest key that was is " + inQuotes(nearest.found()) + ':';
 }
 
 }  // namespace vesprun

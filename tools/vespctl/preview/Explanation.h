@@ -15,7 +15,7 @@ template <typename Options>
 std::optional<Json> explainKey(const TBConfig* config, std::string_view key);
 
 /// The same for people.
-void printExplanation(const Json& explanation);
+void printExplanation(const Json& explanation, bool hasWhitelist);
 
 /// For people: whether a key was ever counted, as any kind, and else the nearest one that was.
 std::string whetherCounted(std::string_view key);

@@ -80,7 +80,7 @@ void printLeftOut(const PreviewArguments& arguments) {
     table.addRow({kind, key});
   }
   opened.complaints.print();
-  printResult(keptBack, [&table] { table.print(); });
+  printResult(keptBack, [&table] { table.printOr("No key of these two days is kept back."); });
 }
 
 struct ExplainArguments {
@@ -107,7 +107,7 @@ void printExplanations(const ExplainArguments& arguments) {
   printResult(arguments.kind.empty() ? explanations : explanations[0], [&] {
     printText(inQuotes(arguments.key) + whetherCounted(arguments.key));
     for (const Json& explanation : explanations) {
-      printExplanation(explanation);
+      printExplanation(explanation, config != nullptr);
     }
     if (const std::string note = whenFirstReport(*opened.device); !note.empty()) {
       printText(note);

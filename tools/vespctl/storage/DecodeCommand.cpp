@@ -278,11 +278,7 @@ void compareFields(const Layout& layout, const std::vector<std::string>& files) 
     for (const Json& line : differences) {
       table.addRow({line["field"].get<std::string>(), text(line["before"]), text(line["after"])});
     }
-    if (table.empty()) {
-      printText("The fields of both are the same.");
-    } else {
-      table.print();
-    }
+    table.printOr("The fields of both are the same.");
   });
 }
 
