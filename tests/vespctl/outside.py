@@ -142,9 +142,10 @@ class Server(http.server.BaseHTTPRequestHandler):
         if how == "slow":
             time.sleep(3)
             how = 204
-        if how == "cut body":
-            self.kept[self.path] = body
-            self.wfile.write(b"HTTP/1.1 200 OK\r\nContent-Length: 100\r\n\r\nshort")
+        if how in ("cut headers", "cut body"):
+            if how == "cut body":
+                self.kept[self.path] = body
+            self.wfile.write(b"HTTP/1.1 200 OK\r\nContent-Length: 100\r\n" + b"\r\nshort" * (how == "cut body"))
             self.connection.shutdown(socket.SHUT_RDWR)
             return
         if 200 <= how < 300:
@@ -187,6 +188,7 @@ def lying_server(folder):
         upload(302, status=1, sent=0, waiting=3, more=("--headers", headers))
         upload(404, status=1, sent=0, waiting=3)
         upload("cut", "cut", status=1, sent=0, waiting=3)
+        upload("cut headers", status=1, sent=0, waiting=3)
         upload("cut body", 403, status=1, sent=1, waiting=2)
         upload("slow", 201, status=0, sent=2, waiting=0)
         upload(status=0, sent=0, waiting=0)

@@ -266,8 +266,9 @@ HttpClient::Answer HttpClient::post(const std::string& url, std::string_view bod
 HttpClient::Answer HttpClient::put(const std::string& url, std::string_view body) {
   Transfer transfer;
   std::string failure;
-  if (!perform(url, "PUT", body, transfer, failure) && transfer.answer.status == 0) {
-    throw HttpFailure(failure);
+  const bool isWhole = perform(url, "PUT", body, transfer, failure);
+  if (transfer.answer.status == 0) {
+    throw HttpFailure(isWhole ? "the answer breaks off in its headers" : failure);
   }
   return std::move(transfer.answer);
 }
