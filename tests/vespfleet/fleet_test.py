@@ -222,6 +222,7 @@ def assert_answers(store, model):
                 assert_same(ask(kind, store, key, *options), list(getattr(model, kind)(key, by, total)),
                             f"{kind} {key} {options}")
     assert_same(ask("compare", store, "A", "B", "--by", "build"), model.compare("A", "B"), "compare")
+    assert run("complete", "--", "compare", store, "--by", "build", "").split()[:2] == ["A", "B"]
 
 
 def some_lines(chance, devices=40, days=3):
