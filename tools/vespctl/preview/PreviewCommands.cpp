@@ -52,16 +52,14 @@ void previewLog(const PreviewArguments& arguments) {
   if (document && arguments.document) {
     platform().ptreeSerialization().serialize({*document},
                                               [](std::string_view piece) { std::cout << piece; });
+  } else if (invocation().json) {
+    std::cout << (document ? jsonText(*document) : "null") << '\n';
+  } else if (document) {
+    const WrappedOutput wrapped;
+    showDailyLog(std::cout, *document);
   } else if (!arguments.document) {
-    printResult(jsonOrNull(document), [&] {
-      if (document) {
-        const WrappedOutput wrapped;
-        showDailyLog(std::cout, *document);
-      } else {
-        const std::string note = whenFirstReport(*opened.device);
-        printText("Nothing would be submitted." + (note.empty() ? note : ' ' + note));
-      }
-    });
+    const std::string note = whenFirstReport(*opened.device);
+    printText("Nothing would be submitted." + (note.empty() ? note : ' ' + note));
   }
 }
 

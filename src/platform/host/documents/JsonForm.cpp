@@ -131,8 +131,26 @@ std::string jsonText(const PropertyDict& dict) {
   return text;
 }
 
-void to_json(Json& json, const PropertyValue& value) { json = Json::parse(jsonText(value)); }
-void to_json(Json& json, const PropertyDict& dict) { json = Json::parse(jsonText(dict)); }
+void to_json(Json& json, const PropertyValue& value) {
+  if (const PropertyDict* dict = value.dict()) {
+    to_json(json, *dict);
+  } else if (const PropertyArray* array = value.array()) {
+    json = Json::array();
+    for (const PropertyValue& element : *array) {
+      json.push_back(element);
+    }
+  } else {
+    json = Json::parse(jsonText(value));
+  }
+}
+void to_json(Json& json, const PropertyDict& dict) {
+  json = Json::object();
+  // The library would look for each key among all before it.
+  Json::object_t::Container& entries = json.get_ref<Json::object_t&>();
+  for (const auto& [key, value] : dict) {
+    entries.emplace_back(Json(PropertyValue(key)).get_ref<std::string&>(), value);
+  }
+}
 void to_json(Json& json, const Number& number) { to_json(json, PropertyValue(number)); }
 
 std::string jsonText(const Json& json) {

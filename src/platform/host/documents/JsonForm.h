@@ -30,7 +30,7 @@ std::string jsonText(const PropertyDict& dict);
 void appendJsonText(std::string_view string, std::string& text);
 
 /// What the library calls for a value that becomes JSON; so an initializer of `Json` may hold
-/// values. They are read from the text above, the only form that is written.
+/// values. What holds no others is read from the text above, the only form that is written.
 void to_json(Json& json, const PropertyValue& value);
 void to_json(Json& json, const PropertyDict& dict);
 void to_json(Json& json, const Number& number);
