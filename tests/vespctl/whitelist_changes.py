@@ -244,7 +244,8 @@ class WhitelistChanges(unittest.TestCase):
             "scalars": {"added": ["app.net"], "removed": [], "changed": [
                 {"key": "a", "before": {}, "after": {"sig_fig": 1}, "effect": "coarser"}]},
             "distributions": {"added": ["d"], "removed": [], "changed": []}})
-        self.assertIn("To go back: vespctl whitelist install ", vespctl("whitelist", "install", "good")[1])
+        self.assertIn(f'To go back: vespctl -C "device" whitelist install "{own}.previous"',
+                      vespctl("whitelist", "install", "good")[1])
         self.assertEqual((read(own + ".previous"), read(own)), (read("bad"), read("good")))
         told = vespctl("explain", "app.net")[1]
         self.assertIn('As a scalar it leaves, bucket_interval 10: it begins with the prefix "app."', told)

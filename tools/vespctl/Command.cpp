@@ -52,7 +52,7 @@ DeviceDirectory openDirectory(Access access, OwnersRights rights) {
       *orFail([&](std::string& error) { return DeviceDirectory::open(path, error); });
   const std::string description = directory.hostPath("device.json").string();
   const bool isOwner = geteuid() == status.st_uid;
-  if (faccessat(AT_FDCWD, description.c_str(), F_OK, AT_EACCESS) != 0) {
+  if (faccessat(AT_FDCWD, description.c_str(), R_OK, AT_EACCESS) != 0) {
     if (errno == ENOENT) {
       throw CommandFailure(path + ": no device: it has no device.json" + makeOne(path));
     }

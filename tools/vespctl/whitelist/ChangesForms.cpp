@@ -12,20 +12,19 @@ namespace vesprun {
 namespace {
 
 /// What happens to an entry, in the order of the table.
-constexpr std::string_view kWhats[] = {"added", "finer", "different", "coarser", "removed"};
+constexpr const char* kWhats[] = {"added", "finer", "different", "coarser", "removed"};
+constexpr std::size_t kAdded = 0;
+constexpr std::size_t kFirstEffect = 1;  ///< in the order of `Effect`
+constexpr std::size_t kRemoved = 4;
 constexpr const char* kLetsOut[] = {"Lets more out: ", "Lets less out: ", "Lets the same out: "};
 
 struct Row {
-  std::string_view what;
+  std::size_t what;  ///< a place in `kWhats`
   LetsOut letsOut;
   const char* kind;
   std::string key;
   std::string before;
   std::string after;
-
-  std::size_t place() const {
-    return static_cast<std::size_t>(std::ranges::find(kWhats, what) - std::begin(kWhats));
-  }
 };
 
 void addRows(const Changes& changes, const char* kind, std::vector<Row>& rows) {
@@ -34,14 +33,14 @@ void addRows(const Changes& changes, const char* kind, std::vector<Row>& rows) {
     return shortened(optionsText(options, areOfDistributions));
   };
   for (const auto& [key, options, instead, letsOut] : changes.added) {
-    rows.push_back({"added", letsOut, kind, shortened(key), instead, text(options)});
+    rows.push_back({kAdded, letsOut, kind, shortened(key), instead, text(options)});
   }
   for (const auto& change : changes.changed) {
-    rows.push_back({nameOf(change.effect), change.letsOut(), kind, shortened(change.key),
-                    text(change.before), text(change.after)});
+    rows.push_back({kFirstEffect + static_cast<std::size_t>(change.effect), change.letsOut(), kind,
+                    shortened(change.key), text(change.before), text(change.after)});
   }
   for (const auto& [key, options, instead, letsOut] : changes.removed) {
-    rows.push_back({"removed", letsOut, kind, shortened(key), text(options), instead});
+    rows.push_back({kRemoved, letsOut, kind, shortened(key), text(options), instead});
   }
 }
 
@@ -58,7 +57,7 @@ std::vector<Row> rowsOf(const WhitelistChanges& changes) {
     addRows(changes.distributions.keys, "distribution", rows);
   }
   std::ranges::stable_sort(rows, {},
-                           [](const Row& row) { return std::pair(row.letsOut, row.place()); });
+                           [](const Row& row) { return std::pair(row.letsOut, row.what); });
   return rows;
 }
 
@@ -78,7 +77,7 @@ std::vector<std::string> remarksOf(const WhitelistChanges& changes) {
 std::string summaryOf(const std::vector<Row>& rows) {
   std::uint64_t counts[std::size(kLetsOut)][std::size(kWhats)] = {};
   for (const Row& row : rows) {
-    ++counts[static_cast<std::size_t>(row.letsOut)][row.place()];
+    ++counts[static_cast<std::size_t>(row.letsOut)][row.what];
   }
   std::string text;
   for (std::size_t letsOut = 0; letsOut < std::size(kLetsOut); ++letsOut) {
@@ -185,7 +184,7 @@ void printChanges(const WhitelistChanges& changes) {
   printText(summaryOf(rows));
   Table table({{"Change"}, {"Kind"}, {"Key"}, {"Before"}, {"After"}});
   for (const Row& row : rows) {
-    table.addRow({std::string(row.what), row.kind, row.key, row.before, row.after});
+    table.addRow({kWhats[row.what], row.kind, row.key, row.before, row.after});
   }
   if (!table.empty()) {
     std::cout << '\n';
@@ -205,7 +204,7 @@ void printChangesAsMarkdown(const WhitelistChanges& changes) {
     std::cout << "\n| Change | Kind | Key | Before | After |\n|---|---|---|---|---|\n";
   }
   for (const auto& [what, letsOut, kind, key, before, after] : rows) {
-    std::cout << "| " << what << " | " << kind << " | " << codeOf(key) << " | "
+    std::cout << "| " << kWhats[what] << " | " << kind << " | " << codeOf(key) << " | "
               << markdownOf(before) << " | " << markdownOf(after) << " |\n";
   }
   const std::vector<std::string> remarks = remarksOf(changes);

@@ -11,7 +11,7 @@
 namespace vesprun {
 
 /// How much other options tell, as they are written: not whether a value would change.
-enum class Effect { Coarser, Finer, Different };
+enum class Effect { Finer, Different, Coarser };
 
 /// Of options that are not equal.
 Effect effectOf(const ScalarOptions& before, const ScalarOptions& after);

@@ -211,11 +211,12 @@ void install(const std::string& file, bool force) {
   const auto isGrave = [](const WhitelistFinding& finding) { return finding.isGrave(); };
   const auto first = std::ranges::find_if(findings, isGrave);
   if (first != findings.end() && !force) {
+    const auto others = std::ranges::count_if(findings, isGrave) - 1;
     throw CommandFailure(
         "not installed, since keys would leave otherwise than their entries say: " +
-        placeOf(*first, input.name) + ", and " +
-        std::to_string(std::ranges::count_if(findings, isGrave) - 1) +
-        " more that \"vespctl whitelist check\" tells; --force installs it nevertheless");
+        placeOf(*first, input.name) +
+        (others == 0 ? "" : ", and " + std::to_string(others) + " more") +
+        "; \"vespctl whitelist check\" tells what to do, --force installs it nevertheless");
   }
   const DeviceDirectory directory = openDirectory(Access::Changing);
   const WhitelistChanges changes = [&input] {
@@ -233,7 +234,8 @@ void install(const std::string& file, bool force) {
   printChanges(changes);
   std::cout << '\n';
   printText(previous.empty() ? "Installed."
-                             : "Installed. To go back: vespctl whitelist install " + previous);
+                             : "Installed. To go back: vespctl -C \"" + directory.path() +
+                                   "\" whitelist install \"" + previous + '"');
 }
 
 void addCheck(CLI::App& command) {

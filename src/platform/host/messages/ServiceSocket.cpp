@@ -117,9 +117,10 @@ FileDescriptor connectToService(const DeviceDirectory& directory, std::string_vi
   if (address && connect(socket.get(), generic(*address), sizeof *address) == 0) {
     return socket;
   }
-  error = errno == ENOENT || errno == ECONNREFUSED ? path + ": nobody offers the service"
-          : errno == EAGAIN                        ? path + ": the service is too busy"
-                                                   : systemError(path);
+  error = errno == ENOENT || errno == ECONNREFUSED
+              ? path + ": nobody offers the service: start vesprun first"
+          : errno == EAGAIN ? path + ": the service is too busy"
+                            : systemError(path);
   return {};
 }
 

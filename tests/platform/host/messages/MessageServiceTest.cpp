@@ -209,7 +209,7 @@ TEST_F(MessageServiceTest, TheSocketFileIsItsOwnersAndGoesWithTheListener) {
   EXPECT_THAT(received, IsEmpty());
   EXPECT_THAT(folder.names("run"), IsEmpty());
   EXPECT_FALSE(connectToService(device, kName, 1, error).isOpen());
-  EXPECT_EQ(error, folder.path(kSocket) + ": nobody offers the service");
+  EXPECT_EQ(error, folder.path(kSocket) + ": nobody offers the service: start vesprun first");
   // What took its name meanwhile is left alone, and a file that is no socket stands in the way.
   listener = listen();
   unlink(folder.path(kSocket).c_str());
