@@ -127,7 +127,7 @@ const std::vector<Scenario>& scenarios() {
        Promise::Again,
        1,
        true,
-       {"run -- -f"}},
+       {"page @/page.html", "run -- -f"}},
       {"prune",
        ages,
        prune,

@@ -325,6 +325,17 @@ TEST_F(DaysTest, PruneKeepsADailyLogThatItCannotNote) {
               HasSubstr("\"0003-193-log-aggregated.ptree\"]"));
 }
 
+TEST_F(DaysTest, PruneWaitsForTheDailyWorkAndForALogThatIsWritten) {
+  addLog(1, 4, "2024-03-01");
+  for (const char* const locked : {"device", "device/outbox/logs"}) {
+    EXPECT_EQ(run("fields >/dev/null; flock " + std::string(locked) +
+                  " timeout 0.3 '" VESPCTL_PROGRAM "' prune --outbox-size 0"),
+              124)
+        << locked;
+    EXPECT_EQ(folder.names(logs).size(), 1U);
+  }
+}
+
 TEST_F(DaysTest, StatusTellsEachFindingOnceAndChangesNothing) {
   const auto findings = [this] {
     const int status = run("status --json");

@@ -1,3 +1,5 @@
+#include <sys/file.h>
+
 #include <algorithm>
 #include <filesystem>
 #include <limits>
@@ -488,6 +490,23 @@ TEST_F(TallybookTest, NeverTakesALockForDamage) {
   tallybook.TBClientAddValueForScalarKey("k", 1);
   tallybook.TBClientCheckpoint();
   EXPECT_EQ(dump(), scalar(3));
+}
+
+TEST_F(TallybookTest, ReplacesOnlyTheFileThatWasDamagedAndNobodyUses) {
+  folder.write(kFile, "damaged");
+  CounterFile file(device, clock, kShortWait);
+  std::optional<CounterFile::Damage> damage;
+  EXPECT_FALSE(file.write([](CounterStore&) { return true; }, error, damage));
+  ASSERT_TRUE(damage) << error;
+  {
+    const auto used = lockFolder(folder.path(kFolder), error, LOCK_SH);
+    EXPECT_FALSE(file.replace(*damage, error));
+    EXPECT_THAT(error, HasSubstr("another process keeps it locked"));
+    EXPECT_EQ(folder.read(kFile), "damaged");
+  }
+  add("k", 1);
+  EXPECT_EQ(file.replace(*damage, error), "");
+  EXPECT_EQ(dump(), scalar(1));
 }
 
 TEST_F(TallybookTest, NeverTakesPermissionsOrAFullDiskForDamage) {
