@@ -462,7 +462,7 @@ def test_encrypted(store, folder, _):
     subprocess.run(["openssl", "req", "-x509", "-newkey", "rsa:2048", "-nodes", "-keyout", folder / "key", "-out",
                     folder / "ca", "-days", "2", "-subj", "/CN=here", "-addext", "subjectAltName=IP:127.0.0.1"],
                    check=True, capture_output=True)
-    seen = []
+    seen, lie = [], lambda answer: (200, answer)
 
     class Front(http.server.BaseHTTPRequestHandler):
         def do_POST(self):
@@ -470,7 +470,8 @@ def test_encrypted(store, folder, _):
             body = self.rfile.read(int(self.headers["Content-Length"]))
             answer = urllib.request.urlopen(urllib.request.Request(
                 SERVER + self.path, body, {"Content-Type": self.headers["Content-Type"]})).read()
-            self.send_response(200)
+            status, answer = lie(answer)
+            self.send_response(status)
             self.send_header("Content-Length", str(len(answer)))
             self.end_headers()
             self.wfile.write(answer)
@@ -494,6 +495,10 @@ def test_encrypted(store, folder, _):
     run("load", address, "-", data="\n".join(line(f"D{i}", scalars={"a": 1}) for i in range(5)).encode())
     assert ask("keys", address)[0]["devices"] == 5
     assert set(seen) == {"Basic " + base64.b64encode(b"user:pass:word").decode()}, seen
+    for lie, why in ((lambda answer: (200, answer[:-1]), "the server's answer is cut"),
+                     (lambda answer: (302, b""), "status 302")):
+        run("keys", address, status=1)
+        assert run.errors == f"vespfleet keys: {address}: {why}\n", run.errors
     del os.environ["VESPFLEET_CA"], os.environ["VESPFLEET_CREDENTIALS"]
     front.shutdown()
 

@@ -128,16 +128,20 @@ void ClickHouseStore::bringUpToDate() {
   const std::string table = kEarlierTables[std::size(kEarlierTables) - 1].name;
   ClickHouseServer reader(_address);
   if (_server.post("EXISTS TABLE " + table).starts_with('1')) {
-    readRows(reader, "SELECT text FROM " + table, [&](PackedReader& row) {
-      const std::string text = row.text();
-      std::string why;
-      if (const auto line = parseExportedLine(text, why, 1)) {
-        add(*line);
-      } else {
-        std::fprintf(stderr, "vespfleet load: %s: a line of the earlier version is dropped: %s\n",
-                     _address.c_str(), why.c_str());
-      }
-    });
+    readRows(
+        reader, "SELECT text FROM " + table,
+        [&](PackedReader& row) {
+          const std::string text = row.text();
+          std::string why;
+          if (const auto line = parseExportedLine(text, why, 1)) {
+            add(*line);
+          } else {
+            std::fprintf(stderr,
+                         "vespfleet load: %s: a line of the earlier version is dropped: %s\n",
+                         _address.c_str(), why.c_str());
+          }
+        },
+        nullptr, UINT64_MAX);
   }
   finish();
   clearOutcomes();

@@ -185,19 +185,22 @@ void ClickHouseStore::visitLines(const DayRange& days, const std::string& prefix
     std::sort(line.distributions.begin(), line.distributions.end(), byKey);
     visit(line);
   };
-  std::set<std::int32_t> partitions;
+  std::map<std::int32_t, std::uint64_t> lines;
   for (const Part& part : parts(days)) {
-    partitions.insert(part.partition);
+    lines[part.partition] += part.rows;
   }
-  for (const std::int32_t partition : partitions) {
-    for (std::int32_t day = partition * kDaysOfPartition; day < (partition + 1) * kDaysOfPartition;
-         ++day) {
-      if (day >= days.from && day <= days.to) {
-        readRows(_server,
-                 columns + " FROM " + kLineTable + " FINAL WHERE " + within({day, day}) +
-                     " ORDER BY device",
-                 readLine);
-      }
+  // The server holds an answer until it is whole: a few lines are asked for by the week, which it
+  // reads as a whole anyway, and many by the day.
+  constexpr std::uint64_t kMaxLines = 100'000;
+  for (const auto& [partition, number] : lines) {
+    const std::int32_t first = std::max(days.from, partition * kDaysOfPartition);
+    const std::int32_t last = std::min(days.to, (partition + 1) * kDaysOfPartition - 1);
+    const std::int32_t step = number <= kMaxLines ? kDaysOfPartition : 1;
+    for (std::int32_t day = first; day <= last; day += step) {
+      readRows(_server,
+               columns + " FROM " + kLineTable + " FINAL WHERE " +
+                   within({day, std::min(day + step - 1, last)}) + " ORDER BY day, device",
+               readLine, nullptr, UINT64_MAX);
     }
   }
 }

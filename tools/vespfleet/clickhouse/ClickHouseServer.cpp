@@ -110,7 +110,9 @@ void ClickHouseServer::perform(const std::string& arguments, std::string_view bo
     throw StoreFailure(_address + ": " + failure.what());
   }
   if (answer.status != 200) {
-    throw StoreFailure(_address + ": " + answer.reason);
+    throw StoreFailure(
+        _address + ": " +
+        (answer.reason.empty() ? "status " + std::to_string(answer.status) : answer.reason));
   }
 }
 

@@ -64,16 +64,21 @@ std::vector<T> readArray(PackedReader& row) {
   return values;
 }
 
+/// What a summary may come to; all lines may come to more.
+inline constexpr std::uint64_t kMaxAnswer = std::uint64_t{1} << 30;
+
 /// Reads all rows of an answer in RowBinary by `row`, as they come. What `row` does before it has
 /// read its row to the end may be done again.
 template <typename Row>
 void readRows(ClickHouseServer& server, const std::string& query, const Row& row,
-              const SentTable* sent = nullptr) {
-  constexpr std::size_t kMaxRow = std::size_t{1} << 30;
+              const SentTable* sent = nullptr, std::uint64_t maxAnswer = kMaxAnswer) {
+  constexpr std::size_t kMaxRow = std::size_t{128} << 20;  // a line has at most 16 MiB of text
   std::string rest;
   std::size_t wanted = 0;
+  std::uint64_t length = 0;
   server.ask(query + " FORMAT RowBinary", sent, [&](std::string_view piece) {
     rest.append(piece);
+    length += piece.size();
     if (rest.size() < wanted) {
       return;
     }
@@ -89,7 +94,7 @@ void readRows(ClickHouseServer& server, const std::string& query, const Row& row
     }
     rest.erase(0, taken);
     wanted = 2 * rest.size();  // a long row is not read anew for each piece
-    if (rest.size() > kMaxRow) {
+    if (rest.size() > kMaxRow || length > maxAnswer) {
       throw StoreFailure(server.address() + ": the server's answer is no answer to the question");
     }
   });
