@@ -89,15 +89,15 @@ def forms(folder):
         "a:1|c\na:2:3|c\n\na:-1|c", "r:1|c|@0.4\nr2:-1:1|c|@.4\nr3:9007199254740993|c|@1.0\n"
         "wrap:9223372036854775807|c\nwrap:1|c", "g:5|g\ng:-5|g\nplus:+7|g", "t:1.5:2|ms\nt:-3e2|h\nt:4|d",
         b"x:1|c" + b" " * 8200, "two:1|c\ntwo:bad|c", "k:1|s\nk:1|c|#tag:a\nk:1|c|@0.5|#tag",
-        "bad:1:x|c\nbad:|c\nbad:1|c|\n:1|c\nb|d:1|c\nnothing\nbad:1|q\nbad:1|g|@0.5\nbad:1|c|@0\n"
+        "bad:1:x|c\nbad:|c\nbad:1|c|\n:1|c\nb|d:1|c\nnothing\nbad:1|q\nbad:1|g|@0.5\nbad:1|ms|@0.5\nbad:1|c|@0\n"
         "bad:1|c|@1.5\nbad:nan|ms\nbad:inf|h\nbad:1.5|c\nbad:9223372036854775808|c\nbad:1:|c\n"
         "bad:9223372036854775807|c|@0.1\nbad:1|c|@0.5|@0.5\nbad:x|s|\nbad:x|c|#t",
-        b"\xff:1|c\n\x01:1|c")
+        b"\xff:1|c\n\x01:1|c\n\x01:1|s")
     check("status", device.stop(), 0)
     scalars, samples = device.counters()
     check("scalars", scalars, {
         "a": 5, "r": 3, "r2": 0, "r3": 9007199254740993, "wrap": -2**63, "g": -5, "plus": 7, "two": 1,
-        "vesprun.listen.dropped.form": 22 + 1, "vesprun.listen.dropped.kind": 3})
+        "vesprun.listen.dropped.form": 24 + 1, "vesprun.listen.dropped.kind": 3})
     check("samples", samples, {"t": [1.5, 2, -300, 4]})
     log = (pathlib.Path(device.device) / "outbox" / "log.jsonl").read_text()
     check("lines of the log on dropped lines", log.count("is dropped"), 2)
@@ -127,7 +127,7 @@ def rights_and_bounds(folder):
     os.chmod(folder, 0o755)
     device = Listener(folder, json.dumps({"senders": {"*": ["app."], str(OTHER_USER): ["mine.", "m"]}}))
     device.start()
-    device.send(*[f"mine.{i}:1|c" for i in range(600)], "app.x:1|c", "x:bad|c", "linux.x:1|c",
+    device.send(*[f"mine.{i}:1|{'ms' if i % 2 == 0 else 'c'}" for i in range(600)], "app.x:1|c", "x:bad|c", "linux.x:1|c",
                 user=OTHER_USER)
     device.send("app.y:1|c\nmine.x:1|c", user=OTHER_USER + 1)
     check("killed", device.stop(), 0)
@@ -138,8 +138,8 @@ def rights_and_bounds(folder):
     dropped = {reason: scalars.pop("vesprun.listen.dropped." + reason, 0)
                for reason in ("form", "kind", "rights", "bounds")}
     check("dropped", dropped, {"form": 1, "kind": 0, "rights": 3, "bounds": 200})
-    check("keys", len(scalars), 1001)
-    check("counted twice", (scalars["mine.1"], samples), (2, {"mine.1": [1]}))
+    check("keys", (len(scalars), len(samples)), (701, 301))
+    check("counted twice", (scalars["mine.1"], samples["mine.1"]), (2, [1]))
 
 
 def values_of_a_day(folder):

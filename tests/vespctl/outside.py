@@ -72,6 +72,9 @@ def formats(folder):
         family = "vesprun_distribution" if key in lines[-1]["histograms"] else "vesprun_distribution_plain"
         check("a count", f'{family}_count{{key="{key}"}} {count}\n' in metrics, count != 0)
         total = [line for line in metrics.splitlines() if line.startswith(f'{family}_sum{{key="{key}"}}')]
+        buckets = lines[-1]["histograms"].get(key)
+        whole = f'vesprun_distribution_bucket{{key="{key}",le="+Inf"}} {sum(buckets.values()) if buckets else 0}\n'
+        check("all buckets", whole in metrics, buckets is not None)
         check("a sum", [float(line.split()[-1]) for line in total], [mean * count] if count else [])
     if shutil.which("promtool"):
         lint = subprocess.run(["promtool", "check", "metrics"], input=metrics, capture_output=True, text=True, check=False)

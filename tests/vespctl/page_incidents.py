@@ -73,7 +73,7 @@ def figures(random_state, day):
     scalars = {"linux." + key: int(level * weekend * math.exp(random_state.gauss(0, 0.05 + 0.15 * (i % 3))))
                for i, (key, level) in enumerate(COUNTERS.items())}
     scalars["linux.time.upSeconds"] = scalars["linux.time.awakeSeconds"] = 86400
-    scalars |= {"linux." + key: 0 for key in RARE}
+    scalars |= {"linux." + key: 0 for key in RARE} | ({"app.now-and-then": 3} if day % 5 == 0 else {})
     scalars |= {"app.requests": random_state.randint(90_000, 110_000), "app.failedRequests": random_state.randint(0, 4),
                 "app.logins": int(random_state.expovariate(1 / 40)), "app.version": 7}
     means = {"linux." + key: level * random_state.gauss(1, 0.03) for key, level in GAUGES.items()}
@@ -90,7 +90,7 @@ def leak(back, scalars, means):
 def failing_disk(back, scalars, means):
     if back < 3:
         scalars["linux.disk.readMilliseconds.sda"] *= 12
-        scalars["linux.nvme.nonfatalErrors"] = 9 - back
+        scalars["linux.nvme.nonfatalErrors"] = 9
 
 
 def burst(back, scalars, means):
