@@ -79,6 +79,9 @@ void readRows(ClickHouseServer& server, const std::string& query, const Row& row
   server.ask(query + " FORMAT RowBinary", sent, [&](std::string_view piece) {
     rest.append(piece);
     length += piece.size();
+    if (rest.size() > kMaxRow || length > maxAnswer) {
+      throw StoreFailure(server.address() + ": the server's answer is no answer to the question");
+    }
     if (rest.size() < wanted) {
       return;
     }
@@ -94,9 +97,6 @@ void readRows(ClickHouseServer& server, const std::string& query, const Row& row
     }
     rest.erase(0, taken);
     wanted = 2 * rest.size();  // a long row is not read anew for each piece
-    if (rest.size() > kMaxRow || length > maxAnswer) {
-      throw StoreFailure(server.address() + ": the server's answer is no answer to the question");
-    }
   });
   try {
     for (PackedReader reader(rest); !reader.atEnd();) {
