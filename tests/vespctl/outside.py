@@ -259,6 +259,10 @@ def nginx(folder):
         while server.poll() is None and socket.socket().connect_ex(("127.0.0.1", port)):
             time.sleep(0.02)
         check("unknown authority", upload("one", 1, authorities=False), {"sent": 0, "waiting": 3})
+        wrong = subprocess.run(
+            [VESPCTL, "-C", devices["one"], "upload", url.replace("127.0.0.1", "localhost"), "--ca", f"{folder}/certificate.pem"],
+            capture_output=True, text=True, check=False)
+        check("wrong name", (wrong.returncode, "host name 'localhost'" in wrong.stderr), (1, True))
         check("as another device", upload("one", 1, device="two"), {"sent": 0, "waiting": 3})
         for name in devices:
             check("sent to nginx", upload(name, 0), {"sent": 3, "waiting": 0})

@@ -4,6 +4,7 @@
 #include <dlfcn.h>
 
 #include <algorithm>
+#include <array>
 #include <exception>
 #include <new>
 
@@ -237,13 +238,19 @@ bool HttpClient::perform(const std::string& url, const char* method, std::string
   set(CURLOPT_XFERINFODATA, &transfer);
   set(CURLOPT_HEADERDATA, &transfer);
   set(CURLOPT_WRITEDATA, &transfer);
+  std::array<char, CURL_ERROR_SIZE> detail{};
+  set(CURLOPT_ERRORBUFFER, detail.data());
   const CURLcode result = Curl::get().perform(_curl.get());
+  set(CURLOPT_ERRORBUFFER, static_cast<char*>(nullptr));
   if (transfer.thrown) {
     std::rethrow_exception(transfer.thrown);
   }
   transfer.answer.reason = firstLine(transfer.answer.reason);
+  // Of a certificate only the detail says what is wrong: its name, its time, who vouches for it.
   failure = result == CURLE_ABORTED_BY_CALLBACK ? "it does not come to an end with its answer"
-                                                : Curl::get().errorText(result);
+            : result == CURLE_PEER_FAILED_VERIFICATION && detail[0] != 0
+                ? detail.data()
+                : Curl::get().errorText(result);
   return result == CURLE_OK;
 }
 

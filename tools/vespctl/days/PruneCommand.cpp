@@ -15,6 +15,7 @@
 #include "commandline/Arguments.h"
 #include "commandline/Progress.h"
 #include "common/Calendar.h"
+#include "export/UploadCommand.h"
 #include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/outbox/DailyLogs.h"
@@ -73,11 +74,11 @@ CounterStore::Rows removeCounters(HostPlatform& device, std::int64_t day, bool i
   return rows;
 }
 
-/// How many of the removed daily logs no upload has acknowledged; nothing where none ever did.
+/// How many of the removed daily logs no upload has acknowledged; nothing where none was tried.
 std::optional<std::size_t> neverUploaded(const DeviceDirectory& directory,
                                          const std::vector<std::string>& removed) {
   std::string ignored;
-  if (!directory.hostPath(kUploadedFile).status()) {
+  if (!directory.hostPath(kUploadLock).status() && !directory.hostPath(kUploadedFile).status()) {
     return std::nullopt;
   }
   std::set<std::string> uploaded;

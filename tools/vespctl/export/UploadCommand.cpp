@@ -111,11 +111,10 @@ std::string gzip(const std::string& text) {
 /// Keeps another upload from the same logs as long as the result lives.
 FileDescriptor takeUpload(const DeviceDirectory& directory) {
   return *orFail([&](std::string& error) -> std::optional<FileDescriptor> {
-    const auto folder = directory.makeFolder("run", error);
-    if (!folder) {
+    if (!directory.makeFolder("run", error)) {
       return std::nullopt;
     }
-    const HostPath path = folder->below("upload.lock");
+    const HostPath path = directory.hostPath(kUploadLock);
     FileDescriptor file = openToChange(path, O_RDWR | O_CREAT, error);
     bool isBusy = false;
     if (!file.isOpen() ||
