@@ -221,6 +221,7 @@ def assert_answers(store, model):
             for kind, key in (("scalar", "a"), ("scalar", "b"), ("distribution", "d")):
                 assert_same(ask(kind, store, key, *options), list(getattr(model, kind)(key, by, total)),
                             f"{kind} {key} {options}")
+    assert ask("scalar", store, "b", "--least", 1) == ask("scalar", store, "b")
     assert_same(ask("compare", store, "A", "B", "--by", "build"), model.compare("A", "B"), "compare")
     assert run("complete", "--", "compare", store, "--by", "build", "").split()[:2] == ["A", "B"]
 
@@ -234,8 +235,10 @@ def some_lines(chance, devices=40, days=3):
                     scalars = {"a": chance.choice((-2**63, 2**63 - 1, chance.randrange(9))), "b": device // 4}
                     if chance.random() < 0.1:
                         scalars = {"only." + str(device): 1}
-                    lines.append(line(f"D{device}", day, revision, chance.randrange(2), chance.choice("AAAABBBBBC") if
-                                      device else None, scalars,
+                    build = {0: None, 39: "only.39"}.get(device, chance.choice("AAAABBBBBC"))
+                    if build == "A" or device < 4:
+                        scalars["few of B"] = device
+                    lines.append(line(f"D{device}", day, revision, chance.randrange(2), build, scalars,
                                       {"d": [0, 9, chance.randrange(90) / 7, chance.random(), chance.randrange(1, 99)],
                                        "e": [0, 0, 1.5, 0, 7]},
                                       {"d": {chance.choice(("(-inf, 1]", "(0, 2]", "(1, inf)")): chance.randrange(2**40)}}
@@ -245,11 +248,15 @@ def some_lines(chance, devices=40, days=3):
 
 def test_answers(store, folder, chance):
     lines = some_lines(chance)
-    model = Model(lines)
     history = []
-    for attempt in range(2):
+    every = lines
+    chance.shuffle(every)
+    for attempt in range(3):
+        lines = every[:len(every) * (attempt + 1) // 3]
         chance.shuffle(lines)
         half = len(lines) // 2 + attempt
+        if "://" in store and attempt:  # the second time, replaced lines stay beside those that replace them
+            post(f"SYSTEM {'STOP' if attempt == 1 else 'START'} MERGES {store.split('/')[-1]}.vespfleet_report")
         (folder / "in").mkdir(exist_ok=True)
         (folder / "in/1.jsonl").write_text("\n".join(lines[:half]) + "\n")
         packed = gzip.compress((lines[half] + "\n").encode()) + gzip.compress("\n".join(lines[half + 1:]).encode())
@@ -258,6 +265,7 @@ def test_answers(store, folder, chance):
         before, after = Model(history).counts, Model(history + lines).counts
         assert_same({name: counts[name] for name in after}, {name: after[name] - before[name] for name in after}, "load")
         history += lines
+        model = Model(lines)
         assert_answers(store, model)
     rows = run("dump", store, "--key", "a", "--to", DAY).splitlines()
     expected = {f"{device},{day},2024-10-04,{entry['revision']},{entry['build'] or ''},,scalar,a,value,"
@@ -280,11 +288,12 @@ def test_answers(store, folder, chance):
     assert ask("forget", store, "D3", "D39")[0]["devices"] == 2
     lines = [text for text in lines if json.loads(text)["device"] not in ("D3", "D39")]
     assert_answers(store, Model(lines))
-    lines.append(line("D7", 84005))  # the newest day has a single device
-    run("load", store, "-", data="\n".join(lines + [line("D3")]).encode())
+    # The newest days have a single device, or a wrong clock.
+    lines += [line("D7", DAY + 3)] + [line(f"D{device}", 84005) for device in range(10, 16)]
+    run("load", store, "-", data="\n".join(lines).encode())
     assert ask("prune", store, "--days", 1)[0]["firstDay"] == DAY + 1
-    assert ask("load", store, "-")[0]["lines"] == 0
-    run("load", store, "-", data=lines[0].encode())
+    for again in (line("D3", DAY + 2, scalars={"a": 1}), line("D8", DAY, scalars={"a": 1})):
+        assert "0 malformed, 1 refused" in run("load", store, "-", data=again.encode())
     assert_answers(store, Model([text for text in lines if json.loads(text)["day"] > DAY]))
     if "://" in store:
         rows = post(f"SELECT count() - uniqExact(day, device) FROM {store.split('/')[-1]}.vespfleet_report")
@@ -321,6 +330,14 @@ def test_malformed(store, folder, _):
     left = sorted(str(path.relative_to(spool)) for path in spool.rglob("*") if not path.is_dir())
     assert left == ["D/rejected/other.jsonl", "fifo.jsonl", "rejected/bad.jsonl", "rejected/cut.jsonl.gz"], left
     assert ask("scalar", store, "a")[0]["devices"] in (2, 3)
+    (spool / "D/good.jsonl").write_text(json.dumps(good))
+    (spool / "last.jsonl").write_text("x")
+    load = subprocess.Popen([PROGRAM, "load", store, "--spool", spool, "-"], stdin=subprocess.PIPE,
+                            stdout=subprocess.DEVNULL, stderr=subprocess.PIPE, bufsize=0)
+    assert b"last.jsonl:1" in load.stderr.readline()  # the folder is read
+    (spool / "D/good.jsonl").write_text(json.dumps(good) * 2)
+    load.communicate()
+    assert (spool / "D/good.jsonl").exists(), "what came since is lost"
     run("distribution", store, "d", status=1)
 
 
