@@ -42,7 +42,7 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
       {2, "counters sample k 1 infinity", "\"infinity\" is not a double"},
       {2, "counters dump --from a", "\"a\" is not a day: "},
       {2, "prefs set d k '{'", "JSON: \"{\""},
-      {2, "fields frob", "there is no list \"frob\""},
+      {2, "fields frob", "unknown list \"frob\""},
       {2, "nand magazine -- -1", noNumber},
       {2, "nand magazine 18446744073709551616", noNumber},
       {2, "nand magazine 0x8", noNumber},

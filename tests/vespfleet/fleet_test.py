@@ -513,7 +513,7 @@ def test_encrypted(store, folder, _):
     assert ask("keys", address)[0]["devices"] == 5
     assert set(seen) == {"Basic " + base64.b64encode(b"user:pass:word").decode()}, seen
     for lie, why in ((lambda answer: (200, answer[:-1]), "the server's answer is cut"),
-                     (lambda answer: (200, b"\xff" * (129 << 20)), "the server's answer is no answer to the question"),
+                     (lambda answer: (200, b"\xff" * (129 << 20)), "the server's answer does not fit the question"),
                      (lambda answer: (302, b""), "status 302")):
         run("keys", address, status=1)
         assert run.errors == f"vespfleet keys: {address}: {why}\n", run.errors

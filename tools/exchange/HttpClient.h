@@ -11,7 +11,7 @@
 
 namespace vesprun {
 
-/// Why there is no answer.
+/// A request without an answer, and why.
 class HttpFailure : public std::runtime_error {
  public:
   using std::runtime_error::runtime_error;

@@ -4,6 +4,18 @@
 #include "sqlite/SqliteStore.h"
 
 namespace vesprun {
+namespace {
+
+/// Passes answers on to `visit`, and notes that there was one.
+template <typename Visit>
+auto noting(bool& isAnswered, const Visit& visit) {
+  return [&](const auto& answer) {
+    isAnswered = true;
+    visit(answer);
+  };
+}
+
+}  // namespace
 
 std::string storeFault(const std::string& address) {
   const std::size_t scheme = address.find("://");
@@ -27,10 +39,7 @@ std::unique_ptr<FleetStore> openFleetStore(const std::string& address, StoreUse 
 
 void FleetStore::answerScalar(const Question& question, const VisitScalar& visit) {
   bool isAnswered = false;
-  visitScalars(question, [&](const ScalarAnswer& answer) {
-    isAnswered = true;
-    visit(answer);
-  });
+  visitScalars(question, noting(isAnswered, visit));
   if (!isAnswered) {
     requireKey(question.key, KeyKind::Scalar);
   }
@@ -38,10 +47,7 @@ void FleetStore::answerScalar(const Question& question, const VisitScalar& visit
 
 void FleetStore::answerDistribution(const Question& question, const VisitDistribution& visit) {
   bool isAnswered = false;
-  visitDistributions(question, [&](const DistributionAnswer& answer) {
-    isAnswered = true;
-    visit(answer);
-  });
+  visitDistributions(question, noting(isAnswered, visit));
   if (!isAnswered) {
     requireKey(question.key, KeyKind::Distribution);
   }

@@ -287,7 +287,7 @@ void decode(const DecodeArguments& arguments) {
   const auto* layout = std::ranges::find(kLayouts, arguments.layout, &Layout::name);
   if (layout == std::end(kLayouts) && !isSnapshot) {
     throw CLI::ValidationError(
-        "LAYOUT", "there is no layout " + quotedText(arguments.layout) + "; one of " + layouts());
+        "LAYOUT", "unknown layout " + quotedText(arguments.layout) + "; one of " + layouts());
   }
   if (isSnapshot != arguments.thread.has_value()) {
     throw CLI::ValidationError("--thread", "goes with the layout snapshot, which needs it");

@@ -118,7 +118,7 @@ void printList(const std::string& name) {
   const auto list = std::ranges::find(known, name, &List::name);
   if (list == known.end()) {
     throw CLI::ValidationError(
-        "LIST", "there is no list " + quotedText(name) + "; \"vespctl fields\" names them");
+        "LIST", "unknown list " + quotedText(name) + "; \"vespctl fields\" names them");
   }
   if (isatty(STDOUT_FILENO) != 0) {
     std::cout << "# " << list->columns << '\n';

@@ -80,7 +80,7 @@ void readRows(ClickHouseServer& server, const std::string& query, const Row& row
     rest.append(piece);
     length += piece.size();
     if (rest.size() > kMaxRow || length > maxAnswer) {
-      throw StoreFailure(server.address() + ": the server's answer is no answer to the question");
+      throw StoreFailure(server.address() + ": the server's answer does not fit the question");
     }
     if (rest.size() < wanted) {
       return;

@@ -113,14 +113,7 @@ void SqliteStore::visitDistributions(const Question& question, const VisitDistri
     if (!number) {
       return;
     }
-    std::unordered_map<std::int64_t, std::string> labels;
-    const auto textOfLabel = [&](std::int64_t label) -> const std::string& {
-      const auto [name, isNew] = labels.try_emplace(label);
-      if (isNew) {
-        name->second = textOf(label).value_or("");
-      }
-      return name->second;
-    };
+    Texts textOfLabel(*this);
     Gathering<Distributions> gathering(
         *this, question, [&](const AnsweredGroup& group, Distributions&& parts) {
           DistributionAnswer answered{group, std::nullopt, std::nullopt};

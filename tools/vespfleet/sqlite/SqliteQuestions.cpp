@@ -148,6 +148,14 @@ bool SqliteStore::hasMember(Member by, const std::string& value) {
   });
 }
 
+const std::string& SqliteStore::Texts::operator()(std::int64_t number) {
+  const auto [text, isNew] = _known.try_emplace(number);
+  if (isNew) {
+    text->second = _store.textOf(number).value_or("");
+  }
+  return text->second;
+}
+
 MemberText SqliteStore::textOf(std::int64_t member) {
   return guarded([&]() -> MemberText {
     if (member == 0) {
@@ -263,14 +271,7 @@ void SqliteStore::visitLines(const DayRange& range, const std::string& prefix,
                                    static_cast<KeyKind>(select.integer(2))};
       }
     }
-    std::map<std::int64_t, std::string> texts;
-    const auto text = [&](std::int64_t number) -> const std::string& {
-      const auto [found, isNew] = texts.try_emplace(number);
-      if (isNew) {
-        found->second = textOf(number).value_or("");
-      }
-      return found->second;
-    };
+    Texts text(*this);
     std::map<std::int64_t, std::set<std::int64_t>> shapes;
     SqliteStatement line(*_database,
                          "SELECT revision, coalesce(build, 0), coalesce(model, 0), shape, name FROM"

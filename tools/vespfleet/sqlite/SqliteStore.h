@@ -75,7 +75,7 @@ class SqliteStore : public FleetStore {
   };
   template <typename Parts>
   class Gathering;
-  /// A key that has a number; an empty name is no key.
+  /// A key and its number; without a name before the first one.
   struct LastKey {
     std::string name;
     KeyKind kind = KeyKind::Scalar;
@@ -83,6 +83,16 @@ class SqliteStore : public FleetStore {
   };
   struct Statements;
   class Cursor;
+  /// Texts by their numbers, each read once; empty for a number without one.
+  class Texts {
+   public:
+    explicit Texts(SqliteStore& store) : _store(store) {}
+    const std::string& operator()(std::int64_t number);
+
+   private:
+    SqliteStore& _store;
+    std::unordered_map<std::int64_t, std::string> _known;
+  };
 
   void open(StoreUse use, std::optional<int> least);
   void prepareChanges();
