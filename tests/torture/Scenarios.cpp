@@ -520,7 +520,10 @@ std::vector<Case> others(const std::shared_ptr<Reference>& reference, const fs::
     }
     const std::size_t step = choice.full ? 1 : places.size() / 30 + 1;
     for (std::size_t index = 0; index < places.size(); ++index) {
-      const bool isLock = reference->calls[places[index]].number == SYS_flock;
+      const Call& call = reference->calls[places[index]];
+      const bool isLock = call.number == SYS_flock;
+      // A moment before, the new file looks like one that was left.
+      const bool isUnfinished = call.path.find(".unfinished-") != std::string::npos;
       if (!isLock && index % step != choice.seed % step) {
         continue;
       }
@@ -530,7 +533,10 @@ std::vector<Case> others(const std::shared_ptr<Reference>& reference, const fs::
                        [=](const fs::path& work) {
                          return runBeside(*reference, work, places[index] + 1, other, ends);
                        },
-                       isLock && step < 3 ? name + number : name});
+                       !isLock        ? name
+                       : step < 3     ? name + number
+                       : isUnfinished ? name + "unfinished"
+                                      : name});
     }
   }
   return cases;

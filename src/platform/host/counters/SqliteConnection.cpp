@@ -152,7 +152,7 @@ SqliteConnection::SqliteConnection(const std::string& path, std::chrono::millise
   _workLeft = std::make_unique<std::int64_t>(kMaxOpeningWork);
   sqlite3_progress_handler(database, kStepsCounted, countWork, _workLeft.get());
   // EXTRA: the end of a transaction is the removal of its journal, which must be durable too.
-  execute("PRAGMA cell_size_check = ON; PRAGMA synchronous = EXTRA; PRAGMA mmap_size = 0");
+  execute("PRAGMA cell_size_check = ON; PRAGMA synchronous = EXTRA");
   sqlite3_file* file = nullptr;
   sqlite3_int64 size = 0;
   if (sqlite3_file_control(database, "main", SQLITE_FCNTL_FILE_POINTER, &file) == SQLITE_OK &&

@@ -1,13 +1,11 @@
 #include "platform/host/device/ECCEventQueue.h"
 
 #include <fcntl.h>
-#include <sys/file.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
 #include <cerrno>
 #include <cstdio>
-#include <optional>
 #include <utility>
 #include <vector>
 
@@ -20,20 +18,14 @@ ECCEventQueue::Outcome ECCEventQueue::take(const HostPath& path, std::span<std::
     return outcome;
   };
   // A pipe must not block the reader.
-  FileDescriptor file = path.open(O_RDONLY | O_NONBLOCK);
+  const FileDescriptor file = path.open(O_RDONLY | O_NONBLOCK);
   if (!file.isOpen()) {
     const bool lasts = errno == EACCES || errno == EPERM || errno == ELOOP || errno == ENXIO;
     return errno == ENOENT ? Outcome::Skipped : failed(lasts ? Outcome::Unusable : Outcome::Failed);
   }
-  if (flock(file.get(), LOCK_EX | LOCK_NB) != 0) {
-    return errno == EWOULDBLOCK ? Outcome::Skipped : failed(Outcome::Failed);
-  }
   struct stat status {};
   if (fstat(file.get(), &status) != 0) {
     return failed(Outcome::Failed);
-  }
-  if (status.st_nlink == 0) {
-    return Outcome::Skipped;  // removed by the earlier holder of the lock
   }
   if (!S_ISREG(status.st_mode) || status.st_size != kEventLength) {
     error = path.string() + (S_ISREG(status.st_mode) ? ": " + std::to_string(status.st_size) +
@@ -50,13 +42,12 @@ ECCEventQueue::Outcome ECCEventQueue::take(const HostPath& path, std::span<std::
     }
     length += static_cast<std::size_t>(count);
   }
-  _taken = std::move(file);
-  _takenPath = path;
+  _taken = path;
   return Outcome::Taken;
 }
 
 int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length) {
-  _taken = FileDescriptor();
+  _taken.reset();
   if (_directory.isReadOnly()) {
     return EROFS;
   }
@@ -92,8 +83,8 @@ int ECCEventQueue::takeNext(std::span<std::uint8_t> buffer, std::size_t& length)
 }
 
 bool ECCEventQueue::removeTaken() {
-  const FileDescriptor taken = std::exchange(_taken, FileDescriptor());
-  return !taken.isOpen() || isGone(_takenPath, removeFile(_takenPath));
+  const std::optional<HostPath> taken = std::exchange(_taken, std::nullopt);
+  return !taken || isGone(*taken, removeFile(*taken));
 }
 
 bool ECCEventQueue::isGone(const HostPath& path, bool isDone) {

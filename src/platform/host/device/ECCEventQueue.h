@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstdint>
+#include <optional>
 #include <span>
 #include <string>
 
@@ -10,8 +11,8 @@
 
 namespace vesprun {
 
-/// The kernel's queue of ECC events: the files kernel/ecc/*.bin in byte order. Several processes
-/// may read it; each event goes to one of them.
+/// The kernel's queue of ECC events: the files kernel/ecc/*.bin in byte order. For the process that
+/// has the lock of the day's work.
 class ECCEventQueue {
  public:
   static constexpr std::size_t kEventLength = 72;
@@ -20,8 +21,7 @@ class ECCEventQueue {
   ECCEventQueue(const DeviceDirectory& directory, SystemLog& log)
       : _directory(directory), _log(log) {}
 
-  /// Takes the oldest event that no other process has; its file stays, locked, until `removeTaken`.
-  /// An earlier event that was not removed is back in the queue. 0, and the bytes in `buffer`; or
+  /// Takes the oldest event; its file stays until `removeTaken`. 0, and the bytes in `buffer`; or
   /// ENOENT when the queue is empty, EINVAL when the buffer is not of an event's length, EROFS on a
   /// read-only device, EIO, with an error in the system log, for what may be mended.
   ///
@@ -42,8 +42,7 @@ class ECCEventQueue {
 
   const DeviceDirectory& _directory;
   SystemLog& _log;
-  HostPath _takenPath{""};
-  FileDescriptor _taken;  ///< holds the lock of its file
+  std::optional<HostPath> _taken;
 };
 
 }  // namespace vesprun

@@ -247,8 +247,11 @@ TEST_F(TallybookTest, MovesForeignFilesAsideWithTheirJournals) {
     EXPECT_EQ(folder.read(std::string(kFolder) + '/' + name + "-shm"), "left");
     EXPECT_EQ(dump(), scalar(1));
   }
-  EXPECT_EQ(SqliteConnection(folder.path(kFile), kShortWait).queryInteger("PRAGMA cell_size_check"),
-            1);
+  SqliteConnection ours(folder.path(kFile), kShortWait);
+  EXPECT_EQ(ours.queryInteger("PRAGMA cell_size_check"), 1);
+  EXPECT_EQ(ours.queryInteger("PRAGMA trusted_schema"), 0);
+  EXPECT_THROW(ours.execute("PRAGMA writable_schema = ON; DELETE FROM sqlite_schema"),
+               SqliteFailure);
   // The journal of a file that is gone must not reach the new one.
   unlink(folder.path(kFile).c_str());
   folder.write(std::string(kFile) + "-journal", "left");
@@ -390,6 +393,21 @@ TEST_F(TallybookTest, NeverTakesAnErrorOfReadingForDamage) {
   EXPECT_EQ(corruptions(), 0);
 }
 
+TEST_F(TallybookTest, TakesACommitWhoseJournalIsGoneForDone) {
+  sqlite3_vfs* const fileSystem = sqlite3_vfs_find("unix");
+  const auto openWhatCannotBeFlushed = [](const char* /*folder*/, int* descriptor) {
+    *descriptor = open("/dev/null", O_RDONLY);
+    return SQLITE_OK;
+  };
+  add("k", 1);
+  fileSystem->xSetSystemCall(fileSystem, "openDirectory",
+                             reinterpret_cast<sqlite3_syscall_ptr>(+openWhatCannotBeFlushed));
+  add("k", 1);
+  fileSystem->xSetSystemCall(fileSystem, "openDirectory", nullptr);
+  EXPECT_EQ(dump(), scalar(2));
+  EXPECT_THAT(log.messages, IsEmpty());
+}
+
 TEST_F(TallybookTest, NoticesAChunkThatIsCutShort) {
   std::string text;
   for (int i = 0; i < 10'000; ++i) {
@@ -505,7 +523,9 @@ TEST_F(TallybookTest, ReplacesOnlyTheFileThatWasDamagedAndNobodyUses) {
     EXPECT_EQ(folder.read(kFile), "damaged");
   }
   add("k", 1);
+  folder.write(std::string(kFile) + "-journal", "");
   EXPECT_EQ(file.replace(*damage, error), "");
+  EXPECT_THAT(folder.names(kFolder), Contains("TBDataStore.sqlitedb-journal"));
   EXPECT_EQ(dump(), scalar(1));
 }
 
