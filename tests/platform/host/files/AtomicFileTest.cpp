@@ -2,6 +2,7 @@
 
 #include <fcntl.h>
 #include <sys/file.h>
+#include <sys/syscall.h>
 
 #include <atomic>
 #include <sstream>
@@ -9,6 +10,21 @@
 
 #include "platform/host/files/JsonLines.h"
 #include "support/HostServiceTest.h"
+
+namespace {
+
+bool isRandomKnown = false;
+
+}  // namespace
+
+// In place of the C library's.
+extern "C" ssize_t getrandom(void* bytes, std::size_t size, unsigned flags) {
+  if (!isRandomKnown) {
+    return syscall(SYS_getrandom, bytes, size, flags);
+  }
+  memset(bytes, 1, size);
+  return static_cast<ssize_t>(size);
+}
 
 namespace vesprun {
 namespace {
@@ -74,6 +90,14 @@ TEST_F(AtomicFileTest, RemovesItsOwnLeftOversAloneAndWaitsForNone) {
   EXPECT_EQ(folder.names(), names);
 }
 
+TEST_F(AtomicFileTest, OpensNothingThatWasThereBefore) {
+  folder.write(".unfinished-0101010101010101", "by another user");
+  isRandomKnown = true;
+  EXPECT_FALSE(replaceFile(folder.path("document"), "new", error));
+  isRandomKnown = false;
+  EXPECT_EQ(folder.read(".unfinished-0101010101010101"), "by another user");
+}
+
 TEST_F(AtomicFileTest, FollowsLinksOnlyInWhatTheUserNamed) {
   folder.write("inside/file", "inside");
   ASSERT_EQ(symlink("inside", folder.path("link").c_str()), 0);
@@ -115,10 +139,15 @@ TEST_F(JsonLinesTest, KeepTheNewestOfTooMany) {
   EXPECT_EQ(bytes, 10U);
   EXPECT_EQ(lines.remove(isOld, error, 16), 2U);
   EXPECT_EQ(folder.read("log.jsonl"), "second\nlast\n");
-  // All hole but its end.
-  ASSERT_EQ(truncate(path.c_str(), off_t{1} << 40), 0);
+  // A hole between its ends; the last bytes begin within a line.
+  folder.write("log.jsonl", "first line\n");
+  ASSERT_EQ(truncate(path.c_str(), kMaxLinesFile), 0);
   EXPECT_TRUE(lines.append("{}", error)) << error;
-  EXPECT_TRUE(lines.remove(isOld, error)) << error;
+  std::vector<std::string> read;
+  EXPECT_TRUE(forEachLineOf(
+      path, [&](std::string_view line) { read.emplace_back(line); }, error));
+  EXPECT_THAT(read, ElementsAre("t line", "", "{}"));
+  EXPECT_TRUE(lines.remove(isOld, error, 2 * kMaxLinesFile)) << error;
   EXPECT_EQ(folder.read("log.jsonl"), "{}\n");
 }
 
@@ -152,8 +181,15 @@ TEST_F(JsonLinesTest, EndsATornLineAndMakesADeletedFileAnew) {
   EXPECT_TRUE(lines.append("{}", error)) << error;
   EXPECT_EQ(folder.read("log.jsonl"), "{\"whole\":1}\n{\"to\n{}\n");
   EXPECT_FALSE(lines.append("two\nlines", error));
-  unlink(folder.path("log.jsonl").c_str());
-  EXPECT_TRUE(lines.append("{}", error)) << error;
+  std::thread waiting;
+  {
+    const FileDescriptor locked(open(folder.path("log.jsonl").c_str(), O_RDONLY));
+    flock(locked.get(), LOCK_EX);
+    waiting = std::thread([&] { EXPECT_TRUE(lines.append("{}", error)) << error; });
+    std::this_thread::sleep_for(std::chrono::milliseconds(50));
+    unlink(folder.path("log.jsonl").c_str());
+  }
+  waiting.join();
   EXPECT_EQ(folder.read("log.jsonl"), "{}\n");
 }
 
