@@ -91,7 +91,7 @@ PropertyDict CreateDictFromCxt(const GenericParserCxt& ctx, const FieldTable* fi
   PropertyDict dict;
   dict.reserve(filter != nullptr ? std::min(ctx.size(), filter->size()) : ctx.size());
   ctx.forEach([&](const GenericParserCxt::Field& field) {
-    if (filter == nullptr || filter->find(field.name, field.hash()) != nullptr) {
+    if (filter == nullptr || field.in(*filter) != nullptr) {
       dict.set(field.name, field.value);
     }
   });

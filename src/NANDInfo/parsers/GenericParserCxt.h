@@ -23,9 +23,12 @@ class GenericParserCxt {
   struct Field {
     std::string_view name;  ///< valid until the context is changed
     std::uint64_t value;
-    std::optional<std::uint32_t> knownHash;  ///< of a known name
+    std::optional<std::uint16_t> row;  ///< `rowOfField` of a known name
 
-    std::uint32_t hash() const { return knownHash ? *knownHash : hashOfFieldName(name); }
+    /// Its range in a table, or null.
+    const FieldRange* in(const FieldTable& table) const {
+      return row && table.isMadeOfRows() ? table.findRow(*row) : table.find(name);
+    }
   };
 
   std::size_t size() const { return _values.size(); }
@@ -41,8 +44,7 @@ class GenericParserCxt {
         continue;
       }
       for (std::size_t i = 0; i < run.size; ++i) {
-        const KnownName name = run.names[i];
-        visit(Field{name.text, *value++, name.hash});
+        visit(Field{run.names.text(i), *value++, run.names.row(i)});
       }
     }
   }

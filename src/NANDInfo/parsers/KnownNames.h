@@ -6,32 +6,28 @@
 #include <string_view>
 
 #include "NANDInfo/tables/FieldName.h"
+#include "NANDInfo/tables/FieldRows.h"
 
 namespace vesprun {
 
-/// The name of a known field. It lives as long as the program.
-struct KnownName {
-  std::string_view text;
-  std::uint32_t hash;  ///< `hashOfFieldName` of it
-};
-
-/// The names of one statistic's elements.
+/// The names of one statistic's elements. They live as long as the program.
 class KnownNames {
  public:
   // Offsets and not pointers, which the loader would have to relocate at each start.
   struct Place {
     std::uint32_t begin = 0;
-    std::uint32_t size = 0;
-    std::uint32_t hash = 0;
+    std::uint16_t size = 0;
+    std::uint16_t row = 0;
   };
 
   constexpr KnownNames() = default;
   constexpr KnownNames(const char* text, const Place* places) : _text(text), _places(places) {}
   bool isKnown() const { return _text != nullptr; }
-  KnownName operator[](std::size_t element) const {
-    const Place& place = _places[element];
-    return {{_text + place.begin, place.size}, place.hash};
+  std::string_view text(std::size_t element) const {
+    return {_text + _places[element].begin, _places[element].size};
   }
+  /// `rowOfField` of the name.
+  std::uint16_t row(std::size_t element) const { return _places[element].row; }
 
  private:
   const char* _text = nullptr;
@@ -96,8 +92,7 @@ class KnownNamesOf {
         layout.firstOfRow[row] = names;
         lastRow = row;
       }
-      layout.places[names++] = {begin, static_cast<std::uint32_t>(name.size()),
-                                hashOfFieldName(name)};
+      layout.places[names++] = {begin, static_cast<std::uint16_t>(name.size()), rowOfField(name)};
       for (const char character : name) {
         layout.text[begin++] = character;
       }

@@ -87,7 +87,7 @@ PropertyDict CreateFilteredDict_SigDig(const GenericParserCxt& source, const Fie
   PropertyDict filtered;
   filtered.reserve(std::min(source.size(), digits->size()));
   source.forEach([&](const GenericParserCxt::Field& field) {
-    if (const FieldRange* range = digits->find(field.name, field.hash())) {
+    if (const FieldRange* range = field.in(*digits)) {
       filtered.set(field.name, roundSig(field.value, range->digits));
     }
   });

@@ -5,6 +5,7 @@
 #include <compare>
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <limits>
 #include <string_view>
 #include <utility>
@@ -90,17 +91,22 @@ inline constexpr auto kFieldRows = std::to_array<FieldRow>({
 #include "NANDInfo/tables/MSPFields.inc"
 });
 
+inline constexpr auto kRanges = []<std::size_t... kRow>(std::index_sequence<kRow...>) {
+  return std::array<FieldRange, sizeof...(kRow)>{kFieldRows[kRow].fields...};
+}
+(std::make_index_sequence<kFieldRows.size()>());
+
 }  // namespace fieldRows
 
-/// The fields of a list, in its order.
+/// The rows of a list, in its order.
 template <FieldList kList>
-inline constexpr auto kFieldsOf = [] {
+inline constexpr auto kRowsOf = [] {
   struct Sorted {
     std::uint16_t place;
     std::uint8_t digits;
     std::string_view stem;
     std::uint32_t number;
-    std::size_t row;
+    std::uint16_t row;
 
     constexpr auto operator<=>(const Sorted&) const = default;
   };
@@ -123,20 +129,46 @@ inline constexpr auto kFieldsOf = [] {
     if (const FieldListEntry* entry = kRows[i].in(kList)) {
       sorted[count++] = {entry->place, kSortedByDigits ? fields.digits : std::uint8_t{0},
                          kSortedByName ? fields.stem : std::string_view(),
-                         kSortedByName ? fields.first : 0, i};
+                         kSortedByName ? fields.first : 0, static_cast<std::uint16_t>(i)};
     }
   }
   std::sort(sorted.begin(), sorted.end());
-  return [&]<std::size_t... kAt>(std::index_sequence<kAt...>) {
-    return std::array<FieldRange, kCount>{kRows[sorted[kAt].row].fields...};
-  }
-  (std::make_index_sequence<kCount>());
+  std::array<std::uint16_t, kCount> rows{};
+  std::transform(sorted.begin(), sorted.end(), rows.begin(), std::mem_fn(&Sorted::row));
+  return rows;
 }();
 
-/// The same as a table, to be searched.
+/// Their fields.
+template <FieldList kList>
+inline constexpr auto kFieldsOf = []<std::size_t... kPlace>(std::index_sequence<kPlace...>) {
+  return std::array<FieldRange, sizeof...(kPlace)>{
+      fieldRows::kFieldRows[kRowsOf<kList>[kPlace]].fields...};
+}
+(std::make_index_sequence<kRowsOf<kList>.size()>());
+
+/// The place of each row in a list; both are counted from 1, and 0 is none.
+template <FieldList kList>
+inline constexpr auto kRangeOfRow = [] {
+  std::array<std::uint16_t, fieldRows::kFieldRows.size() + 1> ranges{};
+  std::uint16_t range = 0;
+  for (const std::uint16_t row : kRowsOf<kList>) {
+    ranges[row + 1U] = ++range;
+  }
+  return ranges;
+}();
+
+/// The list as a table, to be searched.
 template <FieldList kList>
 constexpr FieldTable fieldTableOf() {
-  return fieldTable<kFieldsOf<kList>>();
+  return FieldTable(kFieldIndexOf<kFieldsOf<kList>>, kRangeOfRow<kList>);
+}
+
+/// The row of a field, counted from 1; 0 when it has none. A field in two rows does not compile.
+constexpr std::uint16_t rowOfField(std::string_view name) {
+  constexpr FieldTable kAll = fieldTable<fieldRows::kRanges>();
+  const FieldRange* const fields = kAll.find(name);
+  return fields != nullptr ? static_cast<std::uint16_t>(fields - fieldRows::kRanges.data() + 1)
+                           : std::uint16_t{0};
 }
 
 }  // namespace vesprun

@@ -94,16 +94,21 @@ struct FieldIndex {
 /// An ordered set of field names with their digits. Ranges and index are compile-time constants.
 class FieldTable {
  public:
+  /// `rangeOfRow`: for each row of `kFieldRows`, counted from 1, the row's place in `kRanges`,
+  /// counted from 1; 0 for none. Empty for a table that is not made of such rows.
   template <const auto& kRanges>
-  constexpr explicit FieldTable(const FieldIndex<kRanges>& index)
-      : _ranges(kRanges), _slots(index.slots), _size(countNames(kRanges)) {}
+  constexpr explicit FieldTable(const FieldIndex<kRanges>& index,
+                                std::span<const std::uint16_t> rangeOfRow = {})
+      : _ranges(kRanges),
+        _slots(index.slots),
+        _rangeOfRow(rangeOfRow),
+        _size(countNames(kRanges)) {}
 
   constexpr std::size_t size() const { return _size; }
 
   /// The range of `name`, or null. Takes constant time and allocates nothing.
-  const FieldRange* find(std::string_view name) const { return find(name, hashOfFieldName(name)); }
-  /// The same, with the name's hash.
-  const FieldRange* find(std::string_view name, std::uint32_t hash) const {
+  constexpr const FieldRange* find(std::string_view name) const {
+    const std::uint32_t hash = hashOfFieldName(name);
     const std::size_t mask = _slots.size() - 1;
     for (std::size_t slot = hash & mask; _slots[slot].range != 0; slot = (slot + 1) & mask) {
       if (_slots[slot].hash == hash >> 16 && _ranges[_slots[slot].range - 1U].contains(name)) {
@@ -113,6 +118,13 @@ class FieldTable {
     return nullptr;
   }
   bool contains(std::string_view name) const { return find(name) != nullptr; }
+
+  bool isMadeOfRows() const { return !_rangeOfRow.empty(); }
+  /// The range of a name whose row is known; null also for row 0. The table is made of rows.
+  const FieldRange* findRow(std::uint16_t row) const {
+    const std::uint16_t range = _rangeOfRow[row];
+    return range != 0 ? &_ranges[range - 1U] : nullptr;
+  }
 
   std::span<const FieldRange> ranges() const { return _ranges; }
 
@@ -127,6 +139,7 @@ class FieldTable {
  private:
   std::span<const FieldRange> _ranges;
   std::span<const FieldSlot> _slots;
+  std::span<const std::uint16_t> _rangeOfRow;
   std::size_t _size;
 };
 
