@@ -6,6 +6,7 @@ A small model of its own says what each line counts as.
 import json
 import os
 import pathlib
+import pwd
 import random
 import shutil
 import signal
@@ -142,6 +143,25 @@ def rights_and_bounds(folder):
     check("counted twice", (scalars["mine.1"], samples["mine.1"]), (2, [1]))
 
 
+def rights_of_the_owner(folder):
+    """Root on another user's directory goes on as that user, with that user's groups."""
+    os.chmod(folder, 0o755)
+    nobody = pwd.getpwnam("nobody")
+    for user, group, own_group, groups in ((OTHER_USER, 54321, 54321, []), (OTHER_USER, 0, nobody.pw_gid, []),
+                                           (nobody.pw_uid, 0, nobody.pw_gid, [nobody.pw_gid])):
+        device = Listener(folder)
+        subprocess.run(["chown", "-R", f"{user}:{group}", device.device], check=True)
+        device.path = device.device + "/run/counters"
+        device.process = subprocess.Popen([VESPCTL, "-C", device.device, "listen"],
+                                          preexec_fn=lambda: os.setgroups([0, 7]))
+        while not device.answers() and device.process.poll() is None:
+            time.sleep(0.01)
+        status = dict(line.split(":", 1) for line in open(f"/proc/{device.process.pid}/status", encoding="utf-8"))
+        check(f"rights for {user}:{group}", [list(map(int, status[name].split())) for name in ("Uid", "Gid", "Groups")],
+              [[user] * 4, [own_group] * 4, groups])
+        device.stop()
+
+
 def values_of_a_day(folder):
     device = Listener(folder)
     with open(device.folder / "lines", "w", encoding="ascii") as lines:
@@ -239,8 +259,9 @@ def has_foreign_client():
         stderr=subprocess.DEVNULL).returncode == 0
 
 
-for case in (forms, random_rates, rights_and_bounds, values_of_a_day, sockets, flood, foreign_client):
-    if case is rights_and_bounds and os.geteuid() != 0:
+for case in (forms, random_rates, rights_and_bounds, rights_of_the_owner, values_of_a_day, sockets, flood,
+             foreign_client):
+    if case in (rights_and_bounds, rights_of_the_owner) and os.geteuid() != 0:
         continue
     if case is foreign_client and not has_foreign_client():
         continue
