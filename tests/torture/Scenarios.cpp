@@ -466,9 +466,16 @@ Faults runBeside(const Reference& reference, const fs::path& folder, std::size_t
     companion = std::make_unique<Companion>(device.commandLine(other), device.path());
     companion->endsOrWaits();
   };
-  const Outcome outcome =
-      runTraced(device.commandLine(scenario.command), device.path(),
-                {.kind = Fault::Kind::Pause, .call = call, .whilePaused = start});
+  // How often memory is asked for differs with the length of a path.
+  const auto behind = reference.calls.begin() + static_cast<std::ptrdiff_t>(call);
+  const int number = std::prev(behind)->number;
+  const auto ordinal = std::ranges::count(reference.calls.begin(), behind, number, &Call::number);
+  const Outcome outcome = runTraced(device.commandLine(scenario.command), device.path(),
+                                    {.kind = Fault::Kind::Pause,
+                                     .call = static_cast<std::size_t>(ordinal),
+                                     .number = number,
+                                     .ofItsKind = true,
+                                     .whilePaused = start});
   Faults faults = judgeRun(outcome, {}, true, 0);
   if (!companion) {
     return faults;

@@ -329,7 +329,7 @@ class Tracer {
     user_regs_struct registers = registersOf(thread);
     Pending& pending = _pending[thread];
     pending = {static_cast<int>(registers.orig_rax), 0, {}, {}, false};
-    ++_count;
+    _count += !_fault.ofItsKind || pending.number == _fault.number ? 1 : 0;
     if (_fault.kind == Fault::Kind::None) {
       record(thread, registers, pending);
       return;

@@ -44,6 +44,7 @@ struct Fault {
   /// When there is one: the first call of this kind from there on. Threads do not always take turns
   /// alike.
   int number = -1;
+  bool ofItsKind = false;  ///< `call` counts those of `number` alone
   int error = 0;
   bool lasts = false;  ///< the error, for all calls of its kind that follow
   std::uint64_t room = 0;
