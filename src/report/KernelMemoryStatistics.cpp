@@ -2,7 +2,6 @@
 
 #include <array>
 #include <cstring>
-#include <iterator>
 #include <limits>
 
 #include "platform/Platform.h"
@@ -129,7 +128,6 @@ constexpr Row kRows[] = {
     {"com.quill.memorystatus_freezer_refreeze_average", refreezes, Quotient,
      "kern.memorystatus_freezer_bytes_refrozen"},
 };
-static_assert(std::size(kRows) == 28);
 
 std::int64_t valueOf(const Row& row, std::uint64_t gateNumber) {
   static_assert(std::numeric_limits<double>::is_iec559, "a division by 0 yields inf or NaN");

@@ -7,6 +7,7 @@
 #include "NANDInfo/parsers/ORUFTLParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUMSPParseBufferToCxt.h"
 #include "NANDInfo/parsers/ORUParseBufferToCxt.h"
+#include "NANDInfo/parsers/ORUStatKeyTable.h"
 #include "buffers/DeviceBuffers.h"
 #include "common/ProcessState.h"
 
@@ -74,7 +75,12 @@ TEST(BaseParser, WalksRecords) {
   const std::pair<Statistics, std::string> cases[] = {
       {Statistics(), "0"},
       {Statistics().add(900, {}), "1"},
-      {Statistics().add(0, {1}).add(21, {1, 2}).add(829, {}).add(0x30000000, {9}), "1"},
+      {Statistics()
+           .add(0, {1})
+           .add(21, {1, 2})
+           .add(ORUStatKeyTable.back().id + 1U, {})
+           .add(0x30000000, {9}),
+       "1"},
       {Statistics().add(4, {5}).add(0x30000001, {}).add(7, {1}), "0 hostWrites=5"},
       {Statistics().add(7, {6}).addHeader(4, 2).addWord(1), "0 hostReads=6"},
       {Statistics().add(90, countingUp(200)).add(4, {1, 2, 3}),

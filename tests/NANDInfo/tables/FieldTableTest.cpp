@@ -3,6 +3,8 @@
 #include <gtest/gtest.h>
 #include <set>
 
+#include "NANDInfo/parsers/ORUMSPKeyTable.h"
+#include "NANDInfo/parsers/ORUStatKeyTable.h"
 #include "NANDInfo/tables/EventFields.h"
 #include "NANDInfo/tables/FieldSets.h"
 #include "NANDInfo/tables/LegacyKeyMap.h"
@@ -51,6 +53,34 @@ TEST(FieldTable, FindsEveryNameOfEveryTableInItsOwnRange) {
       names.emplace(name);
     });
     EXPECT_EQ(names.size(), table->size());
+  }
+}
+
+/// A misspelt name would be in a set and never be sent.
+TEST(FieldTable, NamesWhatAStatisticGives) {
+  std::set<std::string_view> base, ftl, msp;
+  const auto add = [](auto& names, const auto& row, KnownNames known) {
+    for (std::size_t i = 0; i < row.count; ++i) {
+      names.insert(known[i].text);
+    }
+  };
+  for (const ORUStatKey& row : ORUStatKeyTable) {
+    add(base, row, baseNamesOf(row));
+    add(ftl, row, FTLNamesOf(row));
+  }
+  for (const ORUMSPKey& row : ORUMSPKeyTable) {
+    add(msp, row, MSPNamesOf(row));
+  }
+  const std::pair<const FieldTable*, const std::set<std::string_view>*> cases[] = {
+      {&WhitelistedRawNANDFTLCounters_SigDigDict, &ftl},
+      {&WhitelistedRawNANDMSPCounters_SigDigDict, &msp},
+      {&PrivacyApprovedSMagNANDFTLCounters_Accum, &ftl},
+      {&PrivacyApprovedSMagNANDFTLCounters_Dynamic, &ftl},
+      {&keyMap, &base}};
+  for (const auto& [table, names] : cases) {
+    table->forEach([names = names](std::string_view name, const FieldRange&) {
+      EXPECT_TRUE(name.starts_with("HLT_") || names->contains(name)) << name;
+    });
   }
 }
 

@@ -4,6 +4,7 @@
 #include <array>
 #include <cstdint>
 #include <iostream>
+#include <iterator>
 #include <limits>
 
 #include "Command.h"
@@ -16,6 +17,8 @@
 
 namespace vesprun {
 namespace {
+
+constexpr const char* kFormats[] = {"lines", "csv", "openmetrics"};
 
 struct Export {
   std::string format = "lines";
@@ -90,16 +93,14 @@ void exportLogs(const Export& wanted) {
 
 void addExportCommand(CLI::App& command) {
   const auto wanted = std::make_shared<Export>();
-  completeWith(
-      command
-          .add_option("--format", wanted->format,
-                      "lines for vespfleet, csv with a row for each figure, or openmetrics "
-                      "of the newest log")
-          ->type_name("FORMAT")
-          ->check(CLI::IsMember({"lines", "csv", "openmetrics"})),
-      [] {
-        return std::vector<std::string>{"lines", "csv", "openmetrics"};
-      });
+  const std::vector<std::string> formats(std::begin(kFormats), std::end(kFormats));
+  completeWith(command
+                   .add_option("--format", wanted->format,
+                               "lines for vespfleet, csv with a row for each figure, or "
+                               "openmetrics of the newest log")
+                   ->type_name("FORMAT")
+                   ->check(CLI::IsMember(formats)),
+               [formats] { return formats; });
   addDeviceName(command, wanted->device);
   addDay(command, "--from", wanted->from, "The first day");
   addDay(command, "--to", wanted->to, "The last day");
