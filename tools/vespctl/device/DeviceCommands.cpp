@@ -11,9 +11,12 @@
 
 #include "Command.h"
 #include "collect/StarterWhitelist.h"
+#include "config/TBConfig.h"
 #include "driver/DailyDriver.h"
+#include "platform/host/counters/CounterFile.h"
 #include "platform/host/files/AtomicFile.h"
 #include "platform/host/files/Files.h"
+#include "platform/host/outbox/OutboxFiles.h"
 #include "sample/SampleDevice.h"
 
 namespace vesprun {
@@ -22,13 +25,9 @@ namespace {
 /// Lies in the folder while `init` is at work, so that one that was cut short can be repeated.
 constexpr const char* kInitMark = ".init-unfinished";
 
-constexpr const char* kFolders[] = {"Library/Application Support/Tallybook",
-                                    "Library/Logsmith",
-                                    "var/mobile/Library/Tallybook",
-                                    "var/mobile/Library/Preferences",
-                                    "run",
-                                    "kernel/ecc",
-                                    "outbox/logs"};
+constexpr std::string_view kFolders[] = {
+    TBConfig::kFolder, "Library/Logsmith", kCounterFolder, "var/mobile/Library/Preferences", "run",
+    "kernel/ecc",      kLogFolder};
 
 constexpr std::string_view kEmptyDescription = "{\n}\n";
 
@@ -36,7 +35,7 @@ constexpr std::string_view kEmptyDescription = "{\n}\n";
 /// whitelist: all folders are there, and no file but the empty description.
 bool isCutShortWithoutMark(const DeviceDirectory& directory) {
   std::error_code failure;
-  for (const char* folder : kFolders) {
+  for (const std::string_view folder : kFolders) {
     if (!std::filesystem::is_directory(directory.hostPath(folder).string(), failure)) {
       return false;
     }
@@ -91,8 +90,7 @@ bool beginInit(const DeviceDirectory& directory) {
   orFail([&](std::string& error) { return flushFolder(directory.path(), error); });
   removeFile(description);
   // The sample's counters are added to those that are there.
-  const std::string database =
-      directory.hostPath("var/mobile/Library/Tallybook/TBDataStore.sqlitedb").string();
+  const std::string database = directory.hostPath(kCounterFolder).below(kCounterDatabase).string();
   removeFile(database);
   removeFile(database + "-journal");
   return true;
@@ -129,7 +127,7 @@ void initDevice(const std::string& path, bool sample) {
   const DeviceDirectory directory =
       *orFail([&](std::string& error) { return DeviceDirectory::open(path, error); });
   if (beginInit(directory)) {
-    for (const char* folder : kFolders) {
+    for (const std::string_view folder : kFolders) {
       orFail([&](std::string& error) { return directory.makeFolder(folder, error); });
     }
     if (sample) {

@@ -27,9 +27,6 @@
 namespace vesprun {
 namespace {
 
-constexpr std::string_view kCounterFolder = "var/mobile/Library/Tallybook";
-constexpr std::string_view kDamagedDatabase = "TBDataStore.sqlitedb.corrupt-";
-
 using Keys = std::set<std::string, std::less<>>;
 
 /// What the counter database tells.
@@ -155,8 +152,8 @@ class Findings {
   }
 
   void judgeSpace() {
-    constexpr std::uint64_t kLeastBytes = 16 * 1024 * 1024;
-    constexpr std::uint64_t kLeastFiles = 100;
+    constexpr std::uint64_t kMinBytes = 16 * 1024 * 1024;
+    constexpr std::uint64_t kMinFiles = 100;
     struct statvfs volume {};
     struct stat owner {};
     if (statvfs(_directory.path().c_str(), &volume) != 0 ||
@@ -168,7 +165,7 @@ class Findings {
         std::uint64_t{isRoot ? volume.f_bfree : volume.f_bavail} * volume.f_frsize;
     const std::uint64_t files = isRoot ? volume.f_ffree : volume.f_favail;
     // A file system without a table of inodes has 0 of them.
-    if (bytes < kLeastBytes || (volume.f_files != 0 && files < kLeastFiles)) {
+    if (bytes < kMinBytes || (volume.f_files != 0 && files < kMinFiles)) {
       tell("no space", _directory.path() + ": " + groupedDigits(bytes / 1024) + " KiB and " +
                            groupedDigits(files) +
                            " inodes are free on its file system: make room there, or \"vespctl "

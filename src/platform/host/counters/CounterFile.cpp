@@ -16,9 +16,6 @@
 namespace vesprun {
 namespace {
 
-constexpr std::string_view kFolder = "var/mobile/Library/Tallybook";
-constexpr const char* kName = "TBDataStore.sqlitedb";
-
 // SQLite's companion files. We use only the first; other tools may enable the rest.
 constexpr std::array kCompanions{"-journal", "-wal", "-shm"};
 
@@ -59,12 +56,12 @@ bool CounterFile::read(const std::function<void(CounterStore&)>& work, std::stri
 bool CounterFile::use(CounterStore::Access access, const std::function<bool(CounterStore&)>& work,
                       std::string& error, std::optional<Damage>& damage, CounterTrouble& trouble) {
   const bool writes = access == CounterStore::Access::Writing;
-  const HostPath folder = _directory.hostPath(kFolder);
+  const HostPath folder = _directory.hostPath(kCounterFolder);
   if (writes && _directory.isReadOnly()) {
-    _directory.makeFolder(kFolder, error);  // which says why not
+    _directory.makeFolder(kCounterFolder, error);  // which says why not
     return false;
   }
-  const HostPath path = folder.below(kName);
+  const HostPath path = folder.below(kCounterDatabase);
   std::optional<struct stat> status;
   std::optional<FileDescriptor> shared;
   // Between making and locking, another process may move the new file away.
@@ -115,7 +112,7 @@ bool CounterFile::use(CounterStore::Access access, const std::function<bool(Coun
 }
 
 bool CounterFile::make(std::string& error, CounterTrouble& trouble) {
-  const std::optional<HostPath> folder = _directory.makeFolder(kFolder, error);
+  const std::optional<HostPath> folder = _directory.makeFolder(kCounterFolder, error);
   if (!folder) {
     return false;
   }
@@ -133,8 +130,8 @@ bool CounterFile::make(std::string& error, CounterTrouble& trouble) {
 
 // The file is named only when it is complete, so an empty one is never ours.
 bool CounterFile::makeLocked(std::string& error) {
-  const HostPath folder = _directory.hostPath(kFolder);
-  const HostPath path = folder.below(kName);
+  const HostPath folder = _directory.hostPath(kCounterFolder);
+  const HostPath path = folder.below(kCounterDatabase);
   if (exists(path)) {
     return true;
   }
@@ -142,7 +139,7 @@ bool CounterFile::makeLocked(std::string& error) {
   removeLeftOvers(folder);
   const std::string aside = unusedNameAside();
   for (const char* companion : kCompanions) {
-    const HostPath left = folder.below(std::string(kName) + companion);
+    const HostPath left = folder.below(std::string(kCounterDatabase) + companion);
     if (!renameFile(left, aside + companion) && errno != ENOENT) {
       error = systemError(left);
       return false;
@@ -160,12 +157,12 @@ bool CounterFile::makeLocked(std::string& error) {
     return false;
   }
   file->append(content);
-  return file->addNew(kName, error) != AtomicFile::Added::Failed;
+  return file->addNew(kCounterDatabase, error) != AtomicFile::Added::Failed;
 }
 
 std::optional<std::string> CounterFile::replace(const Damage& damage, std::string& error) {
-  const HostPath folder = _directory.hostPath(kFolder);
-  const HostPath path = folder.below(kName);
+  const HostPath folder = _directory.hostPath(kCounterFolder);
+  const HostPath path = folder.below(kCounterDatabase);
   const auto exclusive = lockFolder(folder, error, LOCK_EX, _longestWait);
   if (!exclusive) {
     return std::nullopt;
@@ -180,7 +177,7 @@ std::optional<std::string> CounterFile::replace(const Damage& damage, std::strin
       return std::nullopt;
     }
     for (const char* companion : kCompanions) {
-      renameFile(folder.below(std::string(kName) + companion), aside + companion);
+      renameFile(folder.below(std::string(kCounterDatabase) + companion), aside + companion);
     }
     aside = folder.below(aside);
   }
@@ -191,8 +188,8 @@ std::optional<std::string> CounterFile::replace(const Damage& damage, std::strin
 }
 
 std::string CounterFile::unusedNameAside() const {
-  const HostPath folder = _directory.hostPath(kFolder);
-  const std::string aside = nameAside(kName, kWhyAside, _clock);
+  const HostPath folder = _directory.hostPath(kCounterFolder);
+  const std::string aside = nameAside(kCounterDatabase, kWhyAside, _clock);
   std::string name = aside;
   const auto isTaken = [&] {
     return exists(folder.below(name)) ||
@@ -206,8 +203,7 @@ std::string CounterFile::unusedNameAside() const {
 }
 
 bool removeOldDamaged(const DeviceDirectory& directory, const Date& time, std::string& error) {
-  const std::string begin = std::string(kName) + '.' + kWhyAside + '-';
-  const HostPath folder = directory.hostPath(kFolder);
+  const HostPath folder = directory.hostPath(kCounterFolder);
   const auto names = namesInFolder(folder, error);
   if (!names) {
     return false;
@@ -217,10 +213,10 @@ bool removeOldDamaged(const DeviceDirectory& directory, const Date& time, std::s
   std::map<std::string, Place> places;
   Place newest;
   for (const std::string& name : *names) {
-    if (!name.starts_with(begin)) {
+    if (!name.starts_with(kDamagedDatabase)) {
       continue;
     }
-    std::string_view rest = std::string_view(name).substr(begin.size());
+    std::string_view rest = std::string_view(name).substr(kDamagedDatabase.size());
     const bool isCompanion = std::ranges::any_of(kCompanions, [&](std::string_view end) {
       const bool ends = rest.ends_with(end);
       rest.remove_suffix(ends ? end.size() : 0);

@@ -6,12 +6,19 @@
 #include <functional>
 #include <optional>
 #include <string>
+#include <string_view>
 
 #include "platform/Clock.h"
 #include "platform/host/counters/CounterStore.h"
 #include "platform/host/device/DeviceDirectory.h"
 
 namespace vesprun {
+
+/// Where the database lies on a device.
+inline constexpr std::string_view kCounterFolder = "var/mobile/Library/Tallybook";
+inline constexpr const char* kCounterDatabase = "TBDataStore.sqlitedb";
+/// The beginning of the names under which damaged databases are kept.
+inline constexpr std::string_view kDamagedDatabase = "TBDataStore.sqlitedb.corrupt-";
 
 /// What keeps the counters from being written, as far as a program can do something about it.
 enum class CounterTrouble { Other, Busy, Full, NewerFile };
