@@ -1,5 +1,6 @@
-// The functions that other programs call: what they do, with errors recorded instead of thrown. The
-// project's own code calls what they do, except for the table of entry points.
+// The functions that other programs call. Each calls the function that does the work, and records
+// an error where that throws. The project's own code calls the latter, except in the table of entry
+// points.
 
 #include <exception>
 #include <type_traits>

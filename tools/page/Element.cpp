@@ -11,7 +11,7 @@
 namespace vesprun {
 namespace {
 
-constexpr std::size_t kLongestName = 120;  // bytes
+constexpr std::size_t kMaxName = 120;  // bytes
 constexpr std::size_t kShownHead = 80;
 constexpr std::size_t kShownTail = 30;
 
@@ -114,8 +114,8 @@ bool isShape(std::string_view tag) {
 
 /// Moves a place in the text to the beginning of the character that it lies in.
 std::size_t characterStart(std::string_view text, std::size_t place) {
-  constexpr std::size_t kLongestCharacter = 4;
-  for (std::size_t back = 0; back < kLongestCharacter && back <= place; ++back) {
+  constexpr std::size_t kMaxCharacter = 4;
+  for (std::size_t back = 0; back < kMaxCharacter && back <= place; ++back) {
     const std::size_t length = xmlCharacterLength(text.substr(place - back));
     if (length > back) {
       return place - back;
@@ -162,7 +162,7 @@ void Element::writeTo(std::string& html) const {
   }
 }
 
-bool isLongName(std::string_view name) { return name.size() > kLongestName; }
+bool isLongName(std::string_view name) { return name.size() > kMaxName; }
 
 Element nameElement(std::string_view name) {
   if (name.empty()) {

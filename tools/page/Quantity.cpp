@@ -151,11 +151,11 @@ std::string numeral(const Number& number) {
 }
 
 std::string numeral(double value) {
-  constexpr double kLeastWithoutFraction = 1e5;
-  constexpr double kLeastWithExponent = 1e15;
+  constexpr double kMinWithoutFraction = 1e5;
+  constexpr double kMinWithExponent = 1e15;
   const double size = std::abs(value);
   char digits[64];
-  const bool isWhole = size >= kLeastWithoutFraction && size < kLeastWithExponent;
+  const bool isWhole = size >= kMinWithoutFraction && size < kMinWithExponent;
   std::snprintf(digits, sizeof digits, isWhole ? "%.0f" : "%.6g", value);
   return grouped(digits);
 }

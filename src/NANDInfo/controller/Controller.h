@@ -32,7 +32,7 @@ class Controller {
   RegistryHandle _connection = 0;
 };
 
-/// What `openORUConnection` does, but that a failure leaves `connection` as far as it came.
+/// The work of `openORUConnection`. A failure leaves `connection` as far as it came.
 bool openConnection(ORUConnection& connection);
 
 }  // namespace vesprun

@@ -7,7 +7,7 @@
 
 namespace vesprun {
 
-/// What the entry point of "vesprun/EventExtraction.h" does.
+/// The work of the entry point of "vesprun/EventExtraction.h", which describes it. This throws.
 std::optional<PropertyDict> runExtractionSteps(bool allowMonthly, bool collectResults,
                                                std::uint32_t firstStep);
 

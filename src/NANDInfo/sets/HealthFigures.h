@@ -7,7 +7,7 @@ namespace vesprun {
 /// All health figures; empty, with the error recorded, without the FTL fields.
 PropertyDict gatherNANDHealthInfo();
 
-// What the entry points of "vesprun/HealthSets.h" do.
+// The work of the entry points of "vesprun/HealthSets.h", which describes it. These throw.
 
 PropertyDict gatherTendmarkInfo();
 PropertyDict gatherOTAInfo();

@@ -6,7 +6,7 @@
 
 namespace vesprun {
 
-// What the entry points of "vesprun/CopyNANDInfo.h" do.
+// The work of the entry points of "vesprun/CopyNANDInfo.h", which describes it. These throw.
 
 PropertyDict gatherNANDInfo();
 std::optional<PropertyDict> gatherNANDInfoForDailyLog();

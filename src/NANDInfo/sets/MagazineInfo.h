@@ -6,7 +6,7 @@
 
 namespace vesprun {
 
-// What the entry points of "vesprun/Magazine.h" do.
+// The work of the entry points of "vesprun/Magazine.h", which describes it. These throw.
 
 PropertyDict gatherMagazineInfo(std::uint64_t hours, bool deltaWanted, std::uint32_t mode);
 PropertyDict gatherMagazineHistory(bool skipHistory);

@@ -4,7 +4,7 @@
 
 namespace vesprun {
 
-/// What the entry point of "vesprun/VMFreezer.h" does.
+/// The work of the entry point of "vesprun/VMFreezer.h", which describes it. This throws.
 PropertyDict gatherVMFreezerInfo();
 
 }  // namespace vesprun

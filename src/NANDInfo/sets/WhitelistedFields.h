@@ -6,7 +6,8 @@
 
 namespace vesprun {
 
-// What the entry points of "vesprun/WhitelistedFieldSets.h" do.
+// The work of the entry points of "vesprun/WhitelistedFieldSets.h", which describes it. These
+// throw.
 
 std::optional<PropertyDict> gatherFTLInfo(bool useStatKeyParser);
 PropertyDict gatherWhitelistedFTLInfo(bool round);
