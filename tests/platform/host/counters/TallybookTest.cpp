@@ -93,6 +93,7 @@ TEST_F(TallybookTest, CollectsUntilTheCheckpointAndMakesNothingWithoutNeed) {
   EXPECT_EQ(dump(), scalars(-kMax - 1, -1));
   EXPECT_THAT(folder.names(kFolder), ElementsAre("TBDataStore.sqlitedb"));
   EXPECT_EQ(modeOf(kFile), mode_t{S_IFREG | 0600});
+  EXPECT_EQ(modeOf(kFolder), mode_t{S_IFDIR | 0700});
   EXPECT_THAT(log.messages, IsEmpty());
 }
 

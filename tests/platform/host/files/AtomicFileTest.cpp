@@ -10,6 +10,7 @@
 
 #include "platform/host/files/JsonLines.h"
 #include "support/HostServiceTest.h"
+#include "support/ScarceMemory.h"
 
 namespace {
 
@@ -39,6 +40,7 @@ TEST_F(AtomicFileTest, ShowsTheDocumentOnlyWhenItIsComplete) {
   std::string before = "earlier";
   folder.write("document", before);
   chmod(folder.path("document").c_str(), 0644);
+  const mode_t mask = umask(0277);
   for (const std::string& content : {large, std::string("second")}) {
     std::optional<AtomicFile> file = AtomicFile::create(folder.path(), error);
     ASSERT_TRUE(file) << error;
@@ -51,6 +53,7 @@ TEST_F(AtomicFileTest, ShowsTheDocumentOnlyWhenItIsComplete) {
     EXPECT_EQ(folder.read("document"), content + "!");
     EXPECT_EQ(modeOf("document"), mode_t{S_IFREG | 0600});
   }
+  umask(mask);
 }
 
 TEST_F(AtomicFileTest, AddsOnlyUnderANameThatIsFree) {
@@ -127,6 +130,9 @@ TEST_F(AtomicFileTest, ReadsNoMoreThanADocumentHas) {
   ASSERT_EQ(truncate(folder.path("document").c_str(), off_t{1} << 40), 0);
   EXPECT_FALSE(readWholeFile(folder.path("document"), error));
   EXPECT_EQ(error, folder.path("document") + ": larger than 268435456 bytes");
+  ASSERT_EQ(mkfifo(folder.path("pipe").c_str(), 0600), 0);
+  EXPECT_FALSE(readWholeFile(folder.path("pipe"), error));
+  EXPECT_EQ(error, folder.path("pipe") + ": not a regular file");
 }
 
 TEST_F(JsonLinesTest, KeepTheNewestOfTooMany) {
@@ -143,11 +149,13 @@ TEST_F(JsonLinesTest, KeepTheNewestOfTooMany) {
   folder.write("log.jsonl", "first line\n");
   ASSERT_EQ(truncate(path.c_str(), kMaxLinesFile), 0);
   EXPECT_TRUE(lines.append("{}", error)) << error;
+  largestAllocation = 64 << 20;
   std::vector<std::string> read;
   EXPECT_TRUE(forEachLineOf(
       path, [&](std::string_view line) { read.emplace_back(line); }, error));
   EXPECT_THAT(read, ElementsAre("t line", "", "{}"));
   EXPECT_TRUE(lines.remove(isOld, error, 2 * kMaxLinesFile)) << error;
+  largestAllocation = SIZE_MAX;
   EXPECT_EQ(folder.read("log.jsonl"), "{}\n");
 }
 
@@ -258,6 +266,7 @@ TEST_F(JsonLinesTest, TakesBackALineThatDidNotFit) {
 
 TEST_F(JsonLinesTest, WaitOnceForALockThatNobodyReleases) {
   folder.write("log.jsonl", "");
+  const auto began = std::chrono::steady_clock::now();
   JsonLines lines(folder.path("log.jsonl"), std::chrono::milliseconds(50));
   {
     const FileDescriptor stopped(open(folder.path("log.jsonl").c_str(), O_RDONLY));
@@ -268,6 +277,7 @@ TEST_F(JsonLinesTest, WaitOnceForALockThatNobodyReleases) {
     EXPECT_EQ(error, folder.path("log.jsonl") + ": another process keeps it locked");
   }
   EXPECT_TRUE(lines.append("{}", error)) << error;
+  EXPECT_LT(std::chrono::steady_clock::now() - began, std::chrono::seconds(20));
   EXPECT_FALSE(takeLock(-1, LOCK_EX, std::chrono::milliseconds(0), "name", error));
   EXPECT_EQ(error, "name: Bad file descriptor");
 }
