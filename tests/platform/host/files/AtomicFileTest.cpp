@@ -1,7 +1,10 @@
 #include "platform/host/files/AtomicFile.h"
 
 #include <fcntl.h>
+#include <linux/filter.h>
+#include <linux/seccomp.h>
 #include <sys/file.h>
+#include <sys/prctl.h>
 #include <sys/syscall.h>
 
 #include <atomic>
@@ -15,10 +18,19 @@
 namespace {
 
 bool isRandomKnown = false;
+bool foldersCannotBeFlushed = false;
 
 }  // namespace
 
 // In place of the C library's.
+extern "C" int fsync(int file) {
+  struct stat status {};
+  if (foldersCannotBeFlushed && fstat(file, &status) == 0 && S_ISDIR(status.st_mode)) {
+    errno = EIO;
+    return -1;
+  }
+  return static_cast<int>(syscall(SYS_fsync, file));
+}
 extern "C" ssize_t getrandom(void* bytes, std::size_t size, unsigned flags) {
   if (!isRandomKnown) {
     return syscall(SYS_getrandom, bytes, size, flags);
@@ -101,6 +113,17 @@ TEST_F(AtomicFileTest, OpensNothingThatWasThereBefore) {
   EXPECT_EQ(folder.read(".unfinished-0101010101010101"), "by another user");
 }
 
+TEST_F(AtomicFileTest, FailsWhereANameIsNotDurable) {
+  std::optional<AtomicFile> file = AtomicFile::create(folder.path(), error);
+  foldersCannotBeFlushed = true;
+  EXPECT_EQ(file->addNew("0001", error), AtomicFile::Added::Failed);
+  EXPECT_FALSE(replaceFile(folder.path("document"), "new", error));
+  EXPECT_FALSE(device.makeFolder("new", error));
+  foldersCannotBeFlushed = false;
+  EXPECT_EQ(error, folder.path("new") + ": Input/output error");
+  EXPECT_THAT(folder.names(), ElementsAre("document", "new"));
+}
+
 TEST_F(AtomicFileTest, FollowsLinksOnlyInWhatTheUserNamed) {
   folder.write("inside/file", "inside");
   ASSERT_EQ(symlink("inside", folder.path("link").c_str()), 0);
@@ -123,6 +146,18 @@ TEST_F(AtomicFileTest, FollowsLinksOnlyInWhatTheUserNamed) {
   EXPECT_FALSE(removeFile(device.hostPath("link/file")));
   EXPECT_TRUE(replaceFile(device.hostPath("inside/link"), "replaced", error)) << error;
   EXPECT_EQ(folder.read("inside/file"), "inside");
+  EXPECT_TRUE(hasSucceeded(startProcess([this] {
+    // A sandbox that does not know the call.
+    sock_filter steps[] = {BPF_STMT(BPF_LD | BPF_W | BPF_ABS, offsetof(seccomp_data, nr)),
+                           BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, SYS_openat2, 0, 1),
+                           BPF_STMT(BPF_RET | BPF_K, SECCOMP_RET_ERRNO | EPERM),
+                           BPF_STMT(BPF_RET | BPF_K, SECCOMP_RET_ALLOW)};
+    const sock_fprog program{std::size(steps), steps};
+    prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0);
+    EXPECT_EQ(prctl(PR_SET_SECCOMP, SECCOMP_MODE_FILTER, &program), 0);
+    EXPECT_EQ(readWholeFile(device.hostPath("inside/file"), error), "inside");
+    EXPECT_FALSE(readWholeFile(device.hostPath("link/file"), error));
+  })));
 }
 
 TEST_F(AtomicFileTest, ReadsNoMoreThanADocumentHas) {
