@@ -124,6 +124,22 @@ TEST_F(AtomicFileTest, FailsWhereANameIsNotDurable) {
   EXPECT_THAT(folder.names(), ElementsAre("document", "new"));
 }
 
+TEST_F(AtomicFileTest, IsNotForAGroupThatItCannotBeGiven) {
+  chmod(folder.path().c_str(), 0777);
+  struct stat shared {};
+  shared.st_mode = 0775;
+  shared.st_uid = shared.st_gid = 12345;
+  for (const bool isRoot : {geteuid() == 0, false}) {
+    EXPECT_TRUE(hasSucceeded(startProcess([&] {
+      EXPECT_TRUE(isRoot || geteuid() != 0 || setuid(65534) == 0);
+      std::optional<AtomicFile> file = AtomicFile::create(folder.path(), error);
+      file->takeAccessOf(shared);
+      EXPECT_TRUE(file->replace("shared", error)) << error;
+      EXPECT_EQ(modeOf("shared"), S_IFREG | (isRoot ? 0664U : 0604U));
+    })));
+  }
+}
+
 TEST_F(AtomicFileTest, FollowsLinksOnlyInWhatTheUserNamed) {
   folder.write("inside/file", "inside");
   ASSERT_EQ(symlink("inside", folder.path("link").c_str()), 0);
@@ -142,6 +158,7 @@ TEST_F(AtomicFileTest, FollowsLinksOnlyInWhatTheUserNamed) {
       openStepByStep(openFolder(folder.path()).get(), "inside//file", O_RDONLY, 0).isOpen());
   EXPECT_FALSE(device.makeFolder("link/new", error));
   EXPECT_EQ(error, folder.path("link") + ": a symbolic link");
+  EXPECT_FALSE(device.readOnly().makeFolder("new", error));
   EXPECT_FALSE(replaceFile(device.hostPath("link/new"), "", error));
   EXPECT_FALSE(removeFile(device.hostPath("link/file")));
   EXPECT_TRUE(replaceFile(device.hostPath("inside/link"), "replaced", error)) << error;
