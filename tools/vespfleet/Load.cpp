@@ -8,6 +8,8 @@
 #include <cstdio>
 #include <cstring>
 #include <filesystem>
+#include <future>
+#include <thread>
 
 #include "FleetStore.h"
 #include "LineSource.h"
@@ -25,6 +27,30 @@ struct InputFile {
   std::string path;
   std::optional<std::string> device;  ///< the only one whose lines the file may have
   bool found = false;                 ///< in a folder: a regular file, no link
+};
+
+/// Lines that are parsed together, and what became of each.
+struct ParsedLines {
+  struct Parsed {
+    std::size_t length = 0;  ///< of its text
+    bool isTooLong = false;
+    std::optional<ExportedLine> line;
+    std::string why;  ///< there is none
+  };
+
+  void parse(std::size_t from, std::size_t to, const char* text) {
+    for (; from < to; text += lines[from++].length) {
+      Parsed& parsed = lines[from];
+      parsed.why = "longer than 16 MiB";
+      if (!parsed.isTooLong) {
+        parsed.line = parseExportedLine({text, parsed.length}, parsed.why);
+      }
+    }
+  }
+
+  std::string texts;
+  std::vector<Parsed> lines;
+  std::uint64_t first = 1;  ///< number of the first in its file
 };
 
 /// A file of a spool whose lines are on their way into the store.
@@ -93,6 +119,65 @@ class Loading {
     return files;
   }
 
+  static ParsedLines readSome(LineReader& lines, LineReader::Result& result) {
+    constexpr std::size_t kMaxTexts = std::size_t{1} << 20;
+    constexpr std::size_t kMaxLines = 4096;
+    ParsedLines some;
+    some.first = lines.number() + 1;
+    std::string_view text;
+    while (some.texts.size() < kMaxTexts && some.lines.size() < kMaxLines) {
+      result = lines.next(text);
+      const bool isTooLong = result == LineReader::Result::TooLong;
+      if (result != LineReader::Result::Line && !isTooLong) {
+        break;
+      }
+      text = isTooLong ? std::string_view() : text;
+      some.texts.append(text);
+      some.lines.push_back({text.size(), isTooLong, std::nullopt, {}});
+    }
+    return some;
+  }
+
+  /// Parses by several threads what takes longer than to start them.
+  static std::vector<std::future<void>> startParsing(ParsedLines& some) {
+    constexpr std::size_t kMaxOfOne = std::size_t{64} << 10;
+    const std::size_t threads =
+        some.texts.size() <= kMaxOfOne
+            ? 1
+            : std::clamp<std::size_t>(std::thread::hardware_concurrency(), 2, 4);
+    std::vector<std::future<void>> parsing;
+    std::size_t from = 0;
+    const char* text = some.texts.data();
+    for (std::size_t thread = 1; thread <= threads; ++thread) {
+      const std::size_t to = some.lines.size() * thread / threads;
+      parsing.push_back(std::async(threads == 1 ? std::launch::deferred : std::launch::async,
+                                   [&some, from, to, text] { some.parse(from, to, text); }));
+      for (; from < to; ++from) {
+        text += some.lines[from].length;
+      }
+    }
+    return parsing;
+  }
+
+  /// Stores what was parsed, and names what is malformed.
+  void add(const InputFile& file, const std::string& name, ParsedLines& parsed) {
+    for (auto& [length, isTooLong, line, why] : parsed.lines) {
+      if (line && file.device && line->device != *file.device) {
+        line.reset();
+        why = "the device is not that of the folder";
+      }
+      ++_counts.lines;
+      if (line) {
+        _store.add(*line);
+      } else {
+        ++_counts.malformed;
+        complainOf(name + ':' + std::to_string(parsed.first), why);
+      }
+      ++parsed.first;
+      _progress.advance();
+    }
+  }
+
   void read(const InputFile& file) {
     const bool isStandardInput = file.path == "-";
     const std::string name = isStandardInput ? "standard input" : file.path;
@@ -107,28 +192,19 @@ class Loading {
     LineSource source(descriptor);
     LineReader lines(source, kMaxLine);
     const std::uint64_t malformed = _counts.malformed;
-    std::string_view text;
-    auto result = lines.next(text);
-    for (; result == LineReader::Result::Line || result == LineReader::Result::TooLong;
-         result = lines.next(text)) {
-      std::string why = "longer than 16 MiB";
-      std::optional<ExportedLine> line;
-      if (result == LineReader::Result::Line) {
-        line = parseExportedLine(text, why);
+    auto result = LineReader::Result::Line;
+    ParsedLines parsed;
+    while (result == LineReader::Result::Line || result == LineReader::Result::TooLong) {
+      // These are parsed while those before are stored.
+      ParsedLines next = readSome(lines, result);
+      const auto parsing = startParsing(next);
+      add(file, name, parsed);
+      for (const auto& part : parsing) {
+        part.wait();
       }
-      if (line && file.device && line->device != *file.device) {
-        line.reset();
-        why = "the device is not that of the folder";
-      }
-      ++_counts.lines;
-      if (line) {
-        _store.add(*line);
-      } else {
-        ++_counts.malformed;
-        complainOf(name + ':' + std::to_string(lines.number()), why);
-      }
-      _progress.advance();
+      parsed = std::move(next);
     }
+    add(file, name, parsed);
     const bool failed = result == LineReader::Result::Failed;
     if (failed) {
       _counts.failed = true;
