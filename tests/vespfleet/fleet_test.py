@@ -511,8 +511,10 @@ def test_encrypted(store, folder, _):
     (folder / "who").chmod(0o600)
     run("load", address, "-", data="\n".join(line(f"D{i}", scalars={"a": 1}) for i in range(5)).encode())
     assert ask("keys", address)[0]["devices"] == 5
+    assert post(f"SELECT lines FROM {store.split('/')[-1]}.vespfleet_unique") == "5\n", "a new week is merged in vain"
     assert set(seen) == {"Basic " + base64.b64encode(b"user:pass:word").decode()}, seen
     for lie, why in ((lambda answer: (200, answer[:-1]), "the server's answer is cut"),
+                     (lambda answer: (200, b""), "the server's answer is empty"),
                      (lambda answer: (200, b"\xff" * (129 << 20)), "the server's answer does not fit the question"),
                      (lambda answer: (302, b""), "status 302")):
         run("keys", address, status=1)

@@ -192,19 +192,16 @@ void ClickHouseStore::visitDistributions(const Question& question, const VisitDi
   LabelCounts labels;
   whileUnchanged(question.days, [&] {
     merged.clear();
-    std::set<std::int32_t> partitions;
-    for (const Part& part : parts(question.days)) {
-      partitions.insert(part.partition);
-    }
     // 18.16 finds what a function takes from around it only where that is selected, too.
     const std::string carried =
         "at_day, first, last, about, found, total, means, numbers, deviations, tallied";
     // A week after another, which the server has in memory: what is merged twice goes to a mean
     // that is known.
-    for (const std::int32_t partition : partitions) {
+    for (const WeekState& state : weeks(question.days)) {
+      const std::int32_t begin = state.week.number * kDaysOfPartition;
       Question ofWeek = question;
-      ofWeek.days.from = std::max(question.days.from, partition * kDaysOfPartition);
-      ofWeek.days.to = std::min(question.days.to, (partition + 1) * kDaysOfPartition - 1);
+      ofWeek.days.from = std::max(question.days.from, begin);
+      ofWeek.days.to = std::min(question.days.to, begin + kDaysOfPartition - 1);
       readRows(
           _server,
           "SELECT at_day, first, last, about, found, total, near, middle, deviations + "

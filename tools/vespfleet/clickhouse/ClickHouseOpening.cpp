@@ -30,9 +30,12 @@ std::string lineColumns() {
   return columns;
 }
 
-// A rule is the least number of devices, the first day that is taken, or a forgotten device.
+// A rule is the least number of devices, the first day that is taken, or a forgotten device. What
+// is unique is a week up to that block, as long as it has so many rows.
 const Table kTables[] = {
     {kRuleTable, "name String, value String", "ReplacingMergeTree ORDER BY (name, value)"},
+    {kUniqueTable, "week Int32, block UInt64, lines UInt64",
+     "ReplacingMergeTree(block) ORDER BY week"},
     {kLineTable, lineColumns(),
      "ReplacingMergeTree(rank) PARTITION BY intDiv(day, 7) ORDER BY (day, device)"}};
 
@@ -95,12 +98,13 @@ void ClickHouseStore::open(StoreUse use, std::optional<int> least) {
       missing.push_back(&table);
     }
   }
-  if (isEarlier && use != StoreUse::Load) {
+  if (!missing.empty() && use != StoreUse::Load && !isEarlier &&
+      missing.size() == std::size(kTables)) {
+    throw StoreFailure(_address + ": no fleet store");
+  }
+  if ((isEarlier || !missing.empty()) && use != StoreUse::Load) {
     throw StoreFailure(_address +
                        ": a store of an earlier version; \"vespfleet load\" brings it up to date");
-  }
-  if (!missing.empty() && use != StoreUse::Load) {
-    throw StoreFailure(_address + ": no fleet store");
   }
   for (const Table* table : missing) {
     _server.post(std::string("CREATE TABLE IF NOT EXISTS ") + table->name + "(" + table->columns +
@@ -167,41 +171,44 @@ void ClickHouseStore::readRules() {
            });
 }
 
-/// The parts of the table that have lines of those days.
-std::vector<ClickHouseStore::Part> ClickHouseStore::parts(const DayRange& days) {
-  std::vector<Part> found;
+/// The weeks that have lines of those days.
+std::vector<ClickHouseStore::WeekState> ClickHouseStore::weeks(const DayRange& days) {
+  std::vector<WeekState> found;
   readRows(_server,
-           "SELECT partition, name, toUInt64(level), toUInt64(rows) FROM system.parts WHERE active "
-           "AND database = currentDatabase() AND table = '" +
-               std::string(kLineTable) + "' ORDER BY partition, name",
+           "SELECT number, block, lines, size, most, isMerged OR (number, block, lines) IN (SELECT "
+           "week, block, lines FROM " +
+               std::string(kUniqueTable) +
+               ") FROM (SELECT toInt32(partition) AS number, toUInt64(max(max_block_number)) AS "
+               "block, toUInt64(sum(rows)) AS lines, toUInt64(sum(bytes_on_disk)) AS size, "
+               "toUInt64(max(rows)) AS most, count() = 1 AND max(level) > 0 AS isMerged FROM "
+               "system.parts WHERE active AND database = currentDatabase() AND table = '" +
+               kLineTable + "' GROUP BY partition) ORDER BY number",
            [&](PackedReader& row) {
-             Part part;
-             const std::string partition = row.text();
-             part.name = row.text();
-             part.isMerged = row.raw<std::uint64_t>() != 0;
-             part.rows = row.raw<std::uint64_t>();
-             if (parseWholeText(partition, part.partition) &&
-                 part.partition >= days.from / kDaysOfPartition &&
-                 part.partition <= days.to / kDaysOfPartition) {
-               found.push_back(std::move(part));
+             WeekState state;
+             state.week.number = row.raw<std::int32_t>();
+             state.week.lastBlock = row.raw<std::uint64_t>();
+             state.week.rows = row.raw<std::uint64_t>();
+             state.bytes = row.raw<std::uint64_t>();
+             state.mostOfPart = row.raw<std::uint64_t>();
+             state.isUnique = row.raw<std::uint8_t>() != 0;
+             if (state.week.number >= days.from / kDaysOfPartition &&
+                 state.week.number <= days.to / kDaysOfPartition) {
+               found.push_back(state);
              }
            });
   return found;
 }
 
-/// Asks about the lines of those days, as they lie where each partition is one merged part, which
-/// has no line twice. When that changes meanwhile, `ask` is called again.
+/// Asks about the lines of those days, as they lie where no week has a line twice. When lines come
+/// or go meanwhile, `ask` is called again.
 void ClickHouseStore::whileUnchanged(const DayRange& days, const std::function<void()>& ask) {
-  const std::vector<Part> before = parts(days);
-  bool isMerged = true;
-  for (std::size_t i = 0; i < before.size(); ++i) {
-    isMerged = isMerged && before[i].isMerged &&
-               (i == 0 || before[i].partition != before[i - 1].partition);
-  }
-  if (isMerged) {
+  const std::vector<WeekState> before = weeks(days);
+  if (std::all_of(before.begin(), before.end(), [](const auto& state) { return state.isUnique; })) {
     _source = kLineTable;
     ask();
-    if (parts(days) == before) {
+    const std::vector<WeekState> after = weeks(days);
+    if (std::equal(before.begin(), before.end(), after.begin(), after.end(),
+                   [](const auto& left, const auto& right) { return left.week == right.week; })) {
       return;
     }
   }

@@ -31,13 +31,20 @@ void ClickHouseStore::visitKeys(const VisitKey& visit) {
 
 bool ClickHouseStore::hasKey(std::string_view key, KeyKind kind) {
   const std::string names = column(keysOf(kind), shareOf(key));
-  return countRows("SELECT 1 FROM (SELECT " + names + " FROM " + kLineTable + " FINAL) WHERE has(" +
-                   names + ", " + literal(key) + ") LIMIT 1") != 0;
+  return isAnywhere(names, "has(" + names + ", " + literal(key) + ")");
 }
 
 bool ClickHouseStore::hasMember(Member by, const std::string& value) {
-  return countRows("SELECT 1 FROM (SELECT " + columnOf(by) + " AS member FROM " + kLineTable +
-                   " FINAL) WHERE has(member, " + literal(value) + ") LIMIT 1") != 0;
+  return isAnywhere(columnOf(by) + " AS member", "has(member, " + literal(value) + ")");
+}
+
+bool ClickHouseStore::isAnywhere(const std::string& columns, const std::string& condition) {
+  bool found = false;
+  whileUnchanged({}, [&] {
+    found = countRows("SELECT 1 FROM (SELECT " + columns + " FROM " + _source + ") WHERE " +
+                      condition + " LIMIT 1") != 0;
+  });
+  return found;
 }
 
 void ClickHouseStore::visitLastDays(Member by, const VisitDevices& visit) {
@@ -185,17 +192,14 @@ void ClickHouseStore::visitLines(const DayRange& days, const std::string& prefix
     std::sort(line.distributions.begin(), line.distributions.end(), byKey);
     visit(line);
   };
-  std::map<std::int32_t, std::uint64_t> lines;
-  for (const Part& part : parts(days)) {
-    lines[part.partition] += part.rows;
-  }
   // The server holds an answer until it is whole: a few lines are asked for by the week, which it
   // reads as a whole anyway, and many by the day.
   constexpr std::uint64_t kMaxLines = 100'000;
-  for (const auto& [partition, number] : lines) {
-    const std::int32_t first = std::max(days.from, partition * kDaysOfPartition);
-    const std::int32_t last = std::min(days.to, (partition + 1) * kDaysOfPartition - 1);
-    const std::int32_t step = number <= kMaxLines ? kDaysOfPartition : 1;
+  for (const WeekState& state : weeks(days)) {
+    const std::int32_t begin = state.week.number * kDaysOfPartition;
+    const std::int32_t first = std::max(days.from, begin);
+    const std::int32_t last = std::min(days.to, begin + kDaysOfPartition - 1);
+    const std::int32_t step = state.week.rows <= kMaxLines ? kDaysOfPartition : 1;
     for (std::int32_t day = first; day <= last; day += step) {
       readRows(_server,
                columns + " FROM " + kLineTable + " FINAL WHERE " +

@@ -32,6 +32,13 @@ std::string columnOf(Member by) {
                                    : "emptyArrayString()";
 }
 
+void requireNoRows(ClickHouseServer& server, const std::string& query) {
+  if (server.post("SELECT count() FROM (SELECT 1 FROM (" + query + ") LIMIT 1) FORMAT RowBinary") !=
+      std::string(sizeof(std::uint64_t), '\0')) {
+    throw StoreFailure(server.address() + ": the server's answer is empty");
+  }
+}
+
 MemberText readText(PackedReader& row) {
   MemberText text;
   for (std::uint64_t left = row.varint(); left > 0; --left) {

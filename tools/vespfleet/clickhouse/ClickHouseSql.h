@@ -18,6 +18,7 @@ namespace vesprun {
 inline constexpr std::int32_t kDaysOfPartition = 7;
 inline constexpr const char* kLineTable = "vespfleet_report";
 inline constexpr const char* kRuleTable = "vespfleet_rule";
+inline constexpr const char* kUniqueTable = "vespfleet_unique";
 
 /// How many columns the keys are spread over.
 inline constexpr int kShares = 4;
@@ -67,6 +68,9 @@ std::vector<T> readArray(PackedReader& row) {
 /// What a summary may come to; all lines may come to more.
 inline constexpr std::uint64_t kMaxAnswer = std::uint64_t{1} << 30;
 
+/// Throws `StoreFailure` where a question whose answer came without rows has some.
+void requireNoRows(ClickHouseServer& server, const std::string& query);
+
 /// Reads all rows of an answer in RowBinary by `row`, as they come. What `row` does before it has
 /// read its row to the end may be done again.
 template <typename Row>
@@ -98,6 +102,9 @@ void readRows(ClickHouseServer& server, const std::string& query, const Row& row
     rest.erase(0, taken);
     wanted = 2 * rest.size();  // a long row is not read anew for each piece
   });
+  if (length == 0) {
+    requireNoRows(server, query);
+  }
   try {
     for (PackedReader reader(rest); !reader.atEnd();) {
       row(reader);

@@ -9,8 +9,8 @@
 namespace vesprun {
 namespace {
 
-constexpr std::size_t kBatchSize = 32U * 1024 * 1024;
-constexpr std::size_t kPartitionsOfInsert = 90;  // servers refuse more than 100
+constexpr std::size_t kBatchSize = 24U * 1024 * 1024;  // one is sent while the next is filled
+constexpr std::size_t kPartitionsOfInsert = 90;        // servers refuse more than 100
 
 void appendTexts(std::string& row, const MemberText& text) {
   appendVarint(row, text ? 1 : 0);
@@ -27,10 +27,11 @@ std::uint64_t engineRank(const ExportedLine& line) {
 }
 
 /// A row of the table of lines.
-std::string rowOf(const ExportedLine& line) {
+std::string rowOf(const ExportedLine& line, std::size_t& placeSize) {
   std::string row;
   appendRaw(row, line.day);
   appendText(row, line.device);
+  placeSize = row.size();
   appendRaw(row, engineRank(line));
   appendRaw(row, line.revision);
   appendRaw(row, line.created.seconds);
@@ -96,72 +97,102 @@ void ClickHouseStore::add(const ExportedLine& line) {
     sendBatch();
   }
   _batchPartitions.insert(partition);
-  _batch.push_back({{line.day, line.device},
-                    {line.revision, line.created.seconds, line.created.nanoseconds, line.digest},
-                    rowOf(line)});
-  _batchSize += _batch.back().row.size() + line.device.size() + sizeof(Arrived);
+  Arrived& arrived = _batch.emplace_back();
+  arrived.day = line.day;
+  arrived.rank = {line.revision, line.created.seconds, line.created.nanoseconds, line.digest};
+  arrived.row = rowOf(line, arrived.placeSize);
+  _batchSize += arrived.row.size() + sizeof(Arrived);
 }
 
-/// Sends the lines of a batch that come after what is stored, one for each device and day.
+/// Sends a batch while the next one is filled.
 void ClickHouseStore::sendBatch() {
-  readRules();
-  std::erase_if(_batch, [this](const Arrived& line) {
-    const bool isRefused =
-        line.place.first < _firstDay ||
-        (!_forgotten.empty() && _forgotten.contains(nameDigest(line.place.second)));
-    if (isRefused) {
-      count(Outcome::Refused);
-    }
-    return isRefused;
-  });
-  std::map<Place, Rank> ranks = ranksOf(_batch);
-  std::map<Place, const Arrived*> sent;
-  for (const Arrived& line : _batch) {
-    const auto [stored, isNew] = ranks.try_emplace(line.place, line.rank);
-    if (isNew || stored->second < line.rank) {
-      count(isNew ? Outcome::New : Outcome::Replaced);
-      stored->second = line.rank;
-      sent[line.place] = &line;
-    } else {
-      count(stored->second == line.rank ? Outcome::Repeated : Outcome::Older);
-    }
-  }
-  std::string rows;
-  for (const auto& [place, line] : sent) {
-    rows += line->row;
-    _partitions.insert(place.first / kDaysOfPartition);
-  }
-  if (!rows.empty()) {
-    _server.post(std::string("INSERT INTO ") + kLineTable + " FORMAT RowBinary", rows);
-  }
+  waitForBatch();
+  _sent = std::async(std::launch::async,
+                     [this, batch = std::move(_batch)]() mutable { send(std::move(batch)); });
   _batch.clear();
   _batchSize = 0;
   _batchPartitions.clear();
 }
 
+void ClickHouseStore::waitForBatch() {
+  if (_sent.valid()) {
+    _sent.get();
+  }
+}
+
+/// Sends the lines of a batch that come after what is stored, one for each device and day.
+void ClickHouseStore::send(std::vector<Arrived> batch) {
+  readRules();
+  std::erase_if(batch, [this](const Arrived& line) {
+    PackedReader place(line.place());
+    const bool isRefused = place.raw<std::int32_t>() < _firstDay ||
+                           (!_forgotten.empty() && _forgotten.contains(nameDigest(place.text())));
+    if (isRefused) {
+      count(Outcome::Refused);
+    }
+    return isRefused;
+  });
+  struct Current {
+    const Rank* rank = nullptr;
+    Arrived* sent = nullptr;
+  };
+  const Ranks stored = ranksOf(batch);
+  std::unordered_map<std::string_view, Current, KeyHash> places;
+  places.reserve(batch.size());
+  for (Arrived& line : batch) {
+    const auto [place, isFirst] = places.try_emplace(line.place());
+    auto& [rank, sent] = place->second;
+    if (const auto known = isFirst ? stored.find(line.place()) : stored.end();
+        known != stored.end()) {
+      rank = &known->second;
+    }
+    if (rank != nullptr && !(*rank < line.rank)) {
+      count(*rank == line.rank ? Outcome::Repeated : Outcome::Older);
+      continue;
+    }
+    count(rank == nullptr ? Outcome::New : Outcome::Replaced);
+    if (sent != nullptr) {
+      sent->isSent = false;
+    }
+    line.isSent = true;
+    place->second = {&line.rank, &line};
+  }
+  std::string rows;
+  for (const Arrived& line : batch) {
+    if (line.isSent) {
+      rows += line.row;
+      _weeks.insert(line.day / kDaysOfPartition);
+    }
+  }
+  if (!rows.empty()) {
+    _server.post(std::string("INSERT INTO ") + kLineTable + " FORMAT RowBinary", rows);
+  }
+}
+
 /// What the store has of the batch's devices and days.
-std::map<ClickHouseStore::Place, ClickHouseStore::Rank> ClickHouseStore::ranksOf(
-    const std::vector<Arrived>& batch) {
-  std::map<Place, Rank> ranks;
+ClickHouseStore::Ranks ClickHouseStore::ranksOf(const std::vector<Arrived>& batch) {
+  Ranks ranks;
   if (batch.empty()) {
     return ranks;
   }
   SentTable sent{"batch", "day Int32, device String", {}};
-  DayRange days{batch.front().place.first, batch.front().place.first};
+  DayRange days{batch.front().day, batch.front().day};
   for (const Arrived& line : batch) {
-    days.from = std::min(days.from, line.place.first);
-    days.to = std::max(days.to, line.place.first);
-    appendRaw(sent.rows, line.place.first);
-    appendText(sent.rows, line.place.second);
+    days.from = std::min(days.from, line.day);
+    days.to = std::max(days.to, line.day);
+    sent.rows += line.place();
   }
   readRows(
       _server,
       std::string("SELECT day, device, revision, seconds, toInt64(nanoseconds), digest FROM ") +
-          kLineTable + " WHERE " + within(days) + " AND (day, device) IN batch",
+          kLineTable + " WHERE " + within(days) +
+          " AND (day, device) IN batch UNION ALL SELECT toInt32(-1), '', toInt64(0), toInt64(0), "
+          "toInt64(0), toFixedString('', 32)",  // so that the answer is never empty
       [&](PackedReader& row) {
-        Place place;
-        place.first = row.raw<std::int32_t>();
-        place.second = row.text();
+        const char* const begin = row.position();
+        row.raw<std::int32_t>();
+        row.text();
+        const std::string_view place(begin, row.position());
         const auto revision = row.raw<std::int64_t>();
         const auto seconds = row.raw<std::int64_t>();
         const auto nanoseconds = row.raw<std::int64_t>();
@@ -170,7 +201,7 @@ std::map<ClickHouseStore::Place, ClickHouseStore::Rank> ClickHouseStore::ranksOf
           byte = row.raw<std::uint8_t>();
         }
         const Rank rank{revision, seconds, nanoseconds, digest};
-        const auto [stored, isNew] = ranks.try_emplace(std::move(place), rank);
+        const auto [stored, isNew] = ranks.try_emplace(std::string(place), rank);
         stored->second = std::max(stored->second, rank);
       },
       &sent);
@@ -181,39 +212,46 @@ void ClickHouseStore::finish() {
   if (!_batch.empty()) {
     sendBatch();
   }
-  mergeParts();
+  waitForBatch();
+  try {
+    settleWeeks();
+  } catch (const StoreFailure&) {
+    // The lines are stored; the server merges when it comes to it, and as long when it is asked.
+  }
+  _weeks.clear();
 }
 
-/// Merges what was loaded, so that questions read it as it lies; but not where much would be
-/// rewritten for little.
-void ClickHouseStore::mergeParts() {
-  constexpr std::uint64_t kMaxRewritten = 8;  // times what is new
-  struct Lines {
-    std::uint64_t all = 0;
-    std::uint64_t mostOfPart = 0;
-    bool isMerged = true;
-  };
-  std::map<std::int32_t, Lines> partitions;
-  if (!_partitions.empty()) {
-    for (const Part& part : parts()) {
-      Lines& lines = partitions[part.partition];
-      lines.all += part.rows;
-      lines.isMerged = lines.all == part.rows && part.isMerged;
-      lines.mostOfPart = std::max(lines.mostOfPart, part.isMerged ? part.rows : 0);
+/// Sees to it that questions read what was loaded as it lies. A week that has no line twice is
+/// noted; another is merged, but not where much would be rewritten for little.
+void ClickHouseStore::settleWeeks() {
+  constexpr std::uint64_t kMaxRewritten = 8;                         // times what is new
+  constexpr std::uint64_t kAlwaysMerged = std::uint64_t{512} << 20;  // bytes
+  std::string unique;
+  for (const auto& [week, bytes, mostOfPart, isUnique] : weeks()) {
+    if (isUnique || !_weeks.contains(week.number)) {
+      continue;
+    }
+    if (hasNoneTwice(week)) {
+      appendRaw(unique, week.number);
+      appendRaw(unique, week.lastBlock);
+      appendRaw(unique, week.rows);
+    } else if (bytes <= kAlwaysMerged || (week.rows - mostOfPart) * kMaxRewritten >= week.rows) {
+      _server.post(std::string("OPTIMIZE TABLE ") + kLineTable + " PARTITION " +
+                   std::to_string(week.number) + " FINAL");
     }
   }
-  for (const std::int32_t partition : _partitions) {
-    const Lines& lines = partitions[partition];
-    if (!lines.isMerged && (lines.all - lines.mostOfPart) * kMaxRewritten >= lines.all) {
-      try {
-        _server.post(std::string("OPTIMIZE TABLE ") + kLineTable + " PARTITION " +
-                     std::to_string(partition) + " FINAL");
-      } catch (const StoreFailure&) {
-        // The lines are stored; the server merges when it comes to it.
-      }
-    }
+  if (!unique.empty()) {
+    _server.post(std::string("INSERT INTO ") + kUniqueTable + " FORMAT RowBinary", unique);
   }
-  _partitions.clear();
+}
+
+bool ClickHouseStore::hasNoneTwice(const Week& week) {
+  const std::int32_t first = week.number * kDaysOfPartition;
+  const DayRange days{first, first + kDaysOfPartition - 1};
+  const std::uint64_t lines =
+      countRows(std::string("SELECT day FROM ") + kLineTable + " FINAL WHERE " + within(days));
+  const std::vector<WeekState> now = weeks(days);
+  return lines == week.rows && now.size() == 1 && now.front().week == week;
 }
 
 void ClickHouseStore::removeWhere(const std::string& condition) {
@@ -263,14 +301,10 @@ Removal ClickHouseStore::prune(std::int32_t days, std::int32_t latest) {
   const std::string condition = "day < " + std::to_string(first);
   removal.lines =
       countRows(std::string("SELECT day FROM ") + kLineTable + " FINAL WHERE " + condition);
-  std::set<std::int32_t> partitions;
-  for (const Part& part : parts({0, first - 1})) {
-    partitions.insert(part.partition);
-  }
-  for (const std::int32_t partition : partitions) {
-    if ((partition + 1) * kDaysOfPartition <= first) {
+  for (const WeekState& state : weeks({0, first - 1})) {
+    if ((state.week.number + 1) * kDaysOfPartition <= first) {
       _server.post(std::string("ALTER TABLE ") + kLineTable + " DROP PARTITION " +
-                   std::to_string(partition));
+                   std::to_string(state.week.number));
     } else if (countRows(std::string("SELECT day FROM ") + kLineTable + " WHERE " + condition) !=
                0) {
       removeWhere(condition);

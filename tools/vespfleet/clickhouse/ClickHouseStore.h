@@ -2,15 +2,19 @@
 
 #include <cstdint>
 #include <functional>
+#include <future>
 #include <map>
 #include <optional>
 #include <set>
 #include <string>
+#include <string_view>
 #include <tuple>
+#include <unordered_map>
 #include <vector>
 
 #include "ClickHouseServer.h"
 #include "FleetStore.h"
+#include "common/KeyHash.h"
 
 namespace vesprun {
 
@@ -22,7 +26,8 @@ namespace vesprun {
 /// of equal ranks the engine keeps the row that came last.
 ///
 /// Keys are spread over a few columns by their bytes: a question about one reads a part of a line.
-/// A week that is merged into one part is read as it lies; else the engine merges while it reads.
+/// A week that has no line twice is read as it lies, which is known of one merged part, and of what
+/// a load has counted; else the engine merges while it reads.
 class ClickHouseStore : public FleetStore {
  public:
   ClickHouseStore(const std::string& address, StoreUse use, std::optional<int> least);
@@ -46,19 +51,30 @@ class ClickHouseStore : public FleetStore {
  private:
   /// Revision, seconds, nanoseconds, digest.
   using Rank = std::tuple<std::int64_t, std::int64_t, std::int64_t, LineDigest>;
-  using Place = std::pair<std::int32_t, std::string>;  ///< day and device
   struct Arrived {
-    Place place;
+    /// Day and device, as the row begins with them.
+    std::string_view place() const { return std::string_view(row).substr(0, placeSize); }
+
+    std::int32_t day = 0;
+    std::size_t placeSize = 0;
     Rank rank;
     std::string row;
+    bool isSent = false;
   };
-  /// Of the table of lines.
-  struct Part {
-    std::int32_t partition = 0;
-    std::string name;
-    bool isMerged = false;
+  using Ranks = std::unordered_map<std::string, Rank, KeyHash, std::equal_to<>>;  ///< by place
+  /// A partition of the table of lines. While the last block and the number of rows stay the same,
+  /// the rows are the same, too, however the engine merges them.
+  struct Week {
+    std::int32_t number = 0;  ///< since 1970
+    std::uint64_t lastBlock = 0;
     std::uint64_t rows = 0;
-    bool operator==(const Part&) const = default;
+    bool operator==(const Week&) const = default;
+  };
+  struct WeekState {
+    Week week;
+    std::uint64_t bytes = 0;
+    std::uint64_t mostOfPart = 0;  ///< rows of the largest part
+    bool isUnique = false;         ///< has no line twice
   };
   using GroupKey = std::pair<std::int32_t, MemberText>;  ///< the day is 0 for all together
   using LabelCounts = std::map<GroupKey, Histogram>;
@@ -67,10 +83,14 @@ class ClickHouseStore : public FleetStore {
   void bringUpToDate();
   void readRules();
   void sendBatch();
-  std::map<Place, Rank> ranksOf(const std::vector<Arrived>& batch);
-  void mergeParts();
-  std::vector<Part> parts(const DayRange& days = {});
+  void waitForBatch();
+  void send(std::vector<Arrived> batch);
+  Ranks ranksOf(const std::vector<Arrived>& batch);
+  void settleWeeks();
+  bool hasNoneTwice(const Week& week);
+  std::vector<WeekState> weeks(const DayRange& days = {});
   void whileUnchanged(const DayRange& days, const std::function<void()>& ask);
+  bool isAnywhere(const std::string& columns, const std::string& condition);
   void removeWhere(const std::string& condition);
   std::uint64_t countRows(const std::string& query);
   std::map<GroupKey, std::pair<std::int64_t, std::int64_t>> edgesOf(const Question& question);
@@ -84,8 +104,9 @@ class ClickHouseStore : public FleetStore {
   std::vector<Arrived> _batch;       ///< not sent yet
   std::size_t _batchSize = 0;
   std::set<std::int32_t> _batchPartitions;
-  std::set<std::int32_t> _partitions;  ///< that were loaded
-  std::string _source;                 ///< of current lines, in a query
+  std::set<std::int32_t> _weeks;  ///< that were loaded
+  std::string _source;            ///< of current lines, in a query
+  std::future<void> _sent;        ///< the batch under way
 };
 
 }  // namespace vesprun
