@@ -31,6 +31,7 @@ struct ScalarOptions {
   static std::optional<ScalarOptions> read(const PropertyDict& options);
 
   bool operator==(const ScalarOptions&) const = default;
+  bool isSameAs(const ScalarOptions& other) const { return *this == other; }
 };
 
 struct DistributionOptions {
@@ -47,6 +48,8 @@ struct DistributionOptions {
 
   /// Boundaries compare by value, in their order; NaN equals NaN.
   bool operator==(const DistributionOptions& other) const;
+  /// Equal boundaries can be written in two ways, 1 and 1.0.
+  bool isSameAs(const DistributionOptions& other) const { return intervals == other.intervals; }
 };
 
 /// Who wants an entry, why and until when. The report does not read it.

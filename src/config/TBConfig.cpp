@@ -39,7 +39,7 @@ void reportHeldBack(std::string_view list, const Entries& entries) {
   std::string first;
   for (const auto& [key, entry] : entries) {
     if (!entry.options && count++ == 0) {
-      first.append(key).append(" in group ").append(entry.group);
+      first.append(key).append(" in group ").append(*entry.group);
     }
   }
   if (count > 0) {
@@ -73,7 +73,7 @@ void reportUnread(std::string_view list, const typename WhitelistTable<Options>:
     logMessage(LogLevel::Error,
                "Whitelist: %s: %zu keys have options that nothing reads, so they leave as if these "
                "were not there; the first is %s in group %s with %s",
-               list.data(), count, std::string(firstKey).c_str(), std::string(first->group).c_str(),
+               list.data(), count, std::string(firstKey).c_str(), first->group->c_str(),
                option->c_str());
   }
 }
@@ -148,12 +148,12 @@ TBConfig::TBConfig(PropertyValue document)
 void TBConfig::takeGroup(const WhitelistKeyGroup& group) {
   if (group.lists.dict() == nullptr) {
     logMessage(LogLevel::Error, "Whitelist group %s is not a dictionary and is skipped",
-               group.name.data());
+               group.name.c_str());
     return;
   }
   for (const std::string_view list : _tables.take(group)) {
     logMessage(LogLevel::Error, "Whitelist group %s: %s is not a dictionary and is skipped",
-               group.name.data(), list.data());
+               group.name.c_str(), list.data());
   }
 }
 

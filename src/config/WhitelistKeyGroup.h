@@ -1,5 +1,6 @@
 #pragma once
 
+#include <string>
 #include <string_view>
 
 #include "vesprun/PropertyDict.h"
@@ -17,7 +18,7 @@ struct WhitelistKeyGroup {
   /// True for the name of the group that applies to internal devices only.
   static bool isForInternalDevices(std::string_view name) { return name == "InternalTesting"; }
 
-  std::string_view name;       ///< a key of the document, with its zero byte behind it
+  const std::string& name;
   const PropertyValue& lists;  ///< skipped unless it is a dictionary
 };
 

@@ -3,17 +3,25 @@
 namespace vesprun {
 
 template <typename Options>
-void WhitelistTable<Options>::take(std::string_view group, std::string_view list,
+void WhitelistTable<Options>::take(const std::string& group, std::string_view list,
                                    const PropertyDict& entries) {
   _prefixTable.reset();
   Entries& table = list == Options::kKeyList ? _keys : _prefixes;
   for (const auto& [key, written] : entries) {
-    const PropertyDict* options = written.dict();
+    const auto options =
+        written.dict() != nullptr ? Options::read(*written.dict()) : std::optional<Options>();
     table.insert_or_assign(
-        key, WhitelistEntry<Options>{group, &written,
-                                     options != nullptr ? Options::read(*options) : std::nullopt,
-                                     _taken++});
+        key,
+        WhitelistEntry<Options>{&group, &written, options ? keep(*options) : nullptr, _taken++});
   }
+}
+
+template <typename Options>
+const Options* WhitelistTable<Options>::keep(const Options& options) {
+  if (_options.empty() || !_options.back().isSameAs(options)) {
+    _options.push_back(options);
+  }
+  return &_options.back();
 }
 
 template <typename Options>

@@ -3,7 +3,9 @@
 #include <tsl/ordered_map.h>
 
 #include <cstddef>
+#include <deque>
 #include <optional>
+#include <string>
 #include <string_view>
 #include <tuple>
 #include <vector>
@@ -19,10 +21,10 @@ namespace vesprun {
 /// What the whitelist says of a key or prefix; refers to the document.
 template <typename Options>
 struct WhitelistEntry {
-  std::string_view group;          ///< the last one that names it
-  const PropertyValue* written;    ///< its options as they stand there
-  std::optional<Options> options;  ///< nothing when they cannot be read: held back
-  std::size_t place;               ///< among the taken entries of all groups
+  const std::string* group;      ///< the last one that names it
+  const PropertyValue* written;  ///< its options as they stand there
+  const Options* options;        ///< null when they cannot be read: held back
+  std::size_t place;             ///< among the taken entries of all groups
 };
 
 enum class DecidedBy { Nothing, Key, Prefix, InternalDevice };
@@ -40,12 +42,12 @@ struct WhitelistDecision {
     if (by == DecidedBy::InternalDevice) {
       return &kNoOptions;
     }
-    return entry != nullptr && entry->options ? &*entry->options : nullptr;
+    return entry != nullptr ? entry->options : nullptr;
   }
 
   /// The last enabled group that names the key or its prefix.
   std::optional<PropertyValue> group() const {
-    return entry != nullptr ? std::optional<PropertyValue>(entry->group) : std::nullopt;
+    return entry != nullptr ? std::optional<PropertyValue>(*entry->group) : std::nullopt;
   }
 
   /// The options as written in the whitelist; empty if they are not a dictionary.
@@ -65,10 +67,13 @@ class WhitelistTable {
   /// In the order in which they were first named.
   using Entries = tsl::ordered_map<std::string_view, WhitelistEntry<Options>, KeyHash>;
 
+  WhitelistTable() = default;
+  WhitelistTable(WhitelistTable&&) = default;  // a copy's entries would refer to the original
+
   /// Takes the entries of a group's list, `Options::kKeyList` or `Options::kPrefixList`. A key or
   /// prefix that is there takes the later options in its earlier place. Texts and options must
   /// outlive the table.
-  void take(std::string_view group, std::string_view list, const PropertyDict& entries);
+  void take(const std::string& group, std::string_view list, const PropertyDict& entries);
 
   const Entries& keys() const { return _keys; }
   const Entries& prefixes() const { return _prefixes; }
@@ -79,7 +84,10 @@ class WhitelistTable {
   WhitelistDecision<Options> decideByPrefix(std::string_view key) const;
 
  private:
+  const Options* keep(const Options& options);
+
   std::size_t _taken = 0;
+  std::deque<Options> _options;  ///< of the entries; those in a row mostly have the same
   Entries _keys;
   Entries _prefixes;
   mutable std::optional<PrefixTable> _prefixTable;  ///< of `_prefixes`, once a look-up needs it

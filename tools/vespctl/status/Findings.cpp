@@ -237,7 +237,7 @@ class Findings {
         return;
       }
       const EntryMetadata metadata =
-          EntryMetadata::read(entry.written->dict(), aboutOfGroup(entry.group));
+          EntryMetadata::read(entry.written->dict(), aboutOfGroup(*entry.group));
       if (metadata.expires != nullptr && *metadata.expires < today) {
         found.push_back(inQuotes(key) + " (" + dateText(*metadata.expires).substr(0, 10) + ')');
       }

@@ -163,7 +163,7 @@ class WhitelistCheck {
   void judgeWhatDecides(const Node& entry, bool isPrefix, const std::optional<Options>& options) {
     const WhitelistTable<Options>& table = tables().template of<Options>();
     const auto& entries = isPrefix ? table.prefixes() : table.keys();
-    if (const std::string_view last = entries.at(entry.name).group; last != _place.group) {
+    if (const std::string& last = *entries.at(entry.name).group; last != _place.group) {
       tell("replaced by a later group",
            "the group " + inQuotes(last) + " names it again, and its options count: remove one");
       return;
@@ -174,12 +174,13 @@ class WhitelistCheck {
     }
     const auto prefixText = [&byPrefix] {
       return "the prefix " + inQuotes(byPrefix.prefix) + " of group " +
-             inQuotes(byPrefix.entry->group);
+             inQuotes(*byPrefix.entry->group);
     };
     if (isPrefix && byPrefix.prefix != entry.name) {
       tell("prefix never reached",
            prefixText() + " covers it: put it before that one, or remove it");
-    } else if (!isPrefix && options && options == byPrefix.entry->options) {
+    } else if (!isPrefix && options && byPrefix.options() != nullptr &&
+               *options == *byPrefix.options()) {
       tell("same as its prefix", prefixText() + " lets it in with the same options: remove it");
     }
   }
