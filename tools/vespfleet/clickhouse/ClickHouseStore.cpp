@@ -159,9 +159,10 @@ void ClickHouseStore::send(std::vector<Arrived> batch) {
   }
   std::string rows;
   for (const Arrived& line : batch) {
+    // Of known lines, too: they may be from a killed load.
+    _weeks.insert(line.day / kDaysOfPartition);
     if (line.isSent) {
       rows += line.row;
-      _weeks.insert(line.day / kDaysOfPartition);
     }
   }
   if (!rows.empty()) {
