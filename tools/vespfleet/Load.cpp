@@ -35,7 +35,7 @@ struct ParsedLines {
     std::size_t length = 0;  ///< of its text
     bool isTooLong = false;
     std::optional<ExportedLine> line;
-    std::string why;  ///< there is none
+    std::string why;  ///< it is malformed
   };
 
   void parse(std::size_t from, std::size_t to, const char* text) {

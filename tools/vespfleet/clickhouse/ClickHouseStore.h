@@ -26,8 +26,8 @@ namespace vesprun {
 /// of equal ranks the engine keeps the row that came last.
 ///
 /// Keys are spread over a few columns by their bytes: a question about one reads a part of a line.
-/// A week that has no line twice is read as it lies, which is known of one merged part, and of what
-/// a load has counted; else the engine merges while it reads.
+/// A week that has no line twice is read as it lies: one that is merged into one part, or whose
+/// lines a load has counted. Else the engine merges while it reads.
 class ClickHouseStore : public FleetStore {
  public:
   ClickHouseStore(const std::string& address, StoreUse use, std::optional<int> least);
