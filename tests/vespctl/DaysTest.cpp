@@ -331,6 +331,13 @@ TEST_F(DaysTest, PruneKeepsADailyLogThatItCannotNote) {
   std::filesystem::remove(folder.path("second"));
   EXPECT_THAT(print("prune --json --outbox-size 0"),
               HasSubstr("[\"0001-193-log-aggregated.ptree\"]"));
+  // What cannot be listed has not gone.
+  const std::string note = "{\"name\":\"0001-193-log-aggregated.ptree\"}\n";
+  folder.write("device/outbox/submitted.jsonl", note);
+  std::filesystem::remove(folder.path(logs));
+  folder.write(logs, "");
+  EXPECT_EQ(run("prune --counters 9"), 1);
+  EXPECT_EQ(folder.read("device/outbox/submitted.jsonl"), note);
 }
 
 TEST_F(DaysTest, PruneWaitsForTheDailyWorkAndForALogThatIsWritten) {
