@@ -1,6 +1,6 @@
 #include <new>
 
-#include "Command.h"
+#include "access/CommandDevice.h"
 #include "collect/CollectCommand.h"
 #include "commandline/Completion.h"
 #include "days/CatchUpCommand.h"

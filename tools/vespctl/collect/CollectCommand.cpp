@@ -1,7 +1,7 @@
 #include "collect/CollectCommand.h"
 
-#include "Command.h"
-#include "Complaints.h"
+#include "access/CommandDevice.h"
+#include "access/Complaints.h"
 #include "platform/host/counters/HostTallybook.h"
 #include "platform/host/figures/Collection.h"
 

@@ -2,7 +2,7 @@
 
 #include <set>
 
-#include "Command.h"
+#include "access/CommandDevice.h"
 #include "config/TBConfig.h"
 #include "platform/host/figures/FigureTable.h"
 #include "platform/host/files/AtomicFile.h"

@@ -4,8 +4,8 @@
 #include <optional>
 #include <string>
 
-#include "Command.h"
-#include "Complaints.h"
+#include "access/CommandDevice.h"
+#include "access/Complaints.h"
 #include "commandline/Arguments.h"
 #include "days/MissingReports.h"
 #include "outbox/SubmittedLogs.h"

@@ -8,8 +8,8 @@
 #include <string>
 #include <vector>
 
-#include "Command.h"
-#include "Complaints.h"
+#include "access/CommandDevice.h"
+#include "access/Complaints.h"
 #include "commandline/Arguments.h"
 #include "common/Calendar.h"
 #include "outbox/SubmittedLogs.h"

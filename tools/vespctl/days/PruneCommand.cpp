@@ -10,8 +10,8 @@
 #include <string>
 #include <vector>
 
-#include "Command.h"
-#include "Complaints.h"
+#include "access/CommandDevice.h"
+#include "access/Complaints.h"
 #include "commandline/Arguments.h"
 #include "commandline/Progress.h"
 #include "common/Calendar.h"

@@ -13,9 +13,9 @@
 #include <set>
 #include <vector>
 
-#include "Command.h"
-#include "Complaints.h"
-#include "ReadOnlyDevice.h"
+#include "access/CommandDevice.h"
+#include "access/Complaints.h"
+#include "access/ReadOnlyDevice.h"
 #include "commandline/Arguments.h"
 #include "commandline/Completion.h"
 #include "commandline/Progress.h"

@@ -6,9 +6,9 @@
 #include <optional>
 #include <string_view>
 
-#include "Command.h"
-#include "Complaints.h"
-#include "ReadOnlyDevice.h"
+#include "access/CommandDevice.h"
+#include "access/Complaints.h"
+#include "access/ReadOnlyDevice.h"
 #include "commandline/Arguments.h"
 #include "commandline/Completion.h"
 #include "commandline/NearestName.h"

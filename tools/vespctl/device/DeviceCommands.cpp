@@ -9,7 +9,7 @@
 #include <string_view>
 #include <vector>
 
-#include "Command.h"
+#include "access/CommandDevice.h"
 #include "collect/StarterWhitelist.h"
 #include "config/TBConfig.h"
 #include "driver/DailyDriver.h"

@@ -10,8 +10,8 @@
 #include <cstring>
 #include <thread>
 
-#include "Command.h"
-#include "Complaints.h"
+#include "access/CommandDevice.h"
+#include "access/Complaints.h"
 #include "commandline/Arguments.h"
 #include "common/Calendar.h"
 #include "platform/host/documents/JsonForm.h"

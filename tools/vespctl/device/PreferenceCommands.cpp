@@ -1,7 +1,7 @@
 #include "device/PreferenceCommands.h"
 
-#include "Command.h"
-#include "Complaints.h"
+#include "access/CommandDevice.h"
+#include "access/Complaints.h"
 #include "commandline/Completion.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/QuotedText.h"

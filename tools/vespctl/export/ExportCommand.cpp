@@ -7,8 +7,8 @@
 #include <iterator>
 #include <limits>
 
-#include "Command.h"
-#include "Complaints.h"
+#include "access/CommandDevice.h"
+#include "access/Complaints.h"
 #include "commandline/Arguments.h"
 #include "commandline/Completion.h"
 #include "export/LogExport.h"

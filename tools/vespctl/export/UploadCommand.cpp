@@ -13,7 +13,7 @@
 #include <memory>
 #include <set>
 
-#include "Command.h"
+#include "access/CommandDevice.h"
 #include "commandline/Progress.h"
 #include "exchange/HttpClient.h"
 #include "export/LogExport.h"

@@ -11,7 +11,7 @@
 #include <mutex>
 #include <thread>
 
-#include "Command.h"
+#include "access/CommandDevice.h"
 #include "listen/DatagramSocket.h"
 #include "listen/Senders.h"
 #include "listen/StatsdLine.h"

@@ -5,7 +5,7 @@
 
 #include <algorithm>
 
-#include "Command.h"
+#include "access/CommandDevice.h"
 #include "platform/host/counters/HostTallybook.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/NumberText.h"

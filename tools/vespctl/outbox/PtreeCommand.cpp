@@ -2,7 +2,7 @@
 
 #include <iostream>
 
-#include "Command.h"
+#include "access/CommandDevice.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/PtreeReader.h"
 

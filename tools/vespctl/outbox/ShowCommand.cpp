@@ -9,8 +9,8 @@
 #include <sstream>
 #include <utility>
 
-#include "Command.h"
-#include "Complaints.h"
+#include "access/CommandDevice.h"
+#include "access/Complaints.h"
 #include "commandline/Arguments.h"
 #include "commandline/Completion.h"
 #include "common/Calendar.h"

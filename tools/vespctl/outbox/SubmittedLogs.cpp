@@ -2,7 +2,7 @@
 
 #include <cstdio>
 
-#include "Command.h"
+#include "access/CommandDevice.h"
 #include "platform/host/device/LiveSystem.h"
 #include "platform/host/device/Pseudonym.h"
 #include "platform/host/documents/QuotedText.h"

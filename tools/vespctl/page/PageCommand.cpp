@@ -4,8 +4,8 @@
 
 #include <limits>
 
-#include "Command.h"
-#include "ReadOnlyDevice.h"
+#include "access/CommandDevice.h"
+#include "access/ReadOnlyDevice.h"
 #include "outbox/FirstReport.h"
 #include "outbox/SubmittedLogs.h"
 #include "page/Page.h"

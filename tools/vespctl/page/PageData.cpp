@@ -4,7 +4,7 @@
 #include <sstream>
 #include <utility>
 
-#include "Command.h"
+#include "access/CommandDevice.h"
 #include "common/Calendar.h"
 #include "common/TextForm.h"
 #include "page/Quantity.h"

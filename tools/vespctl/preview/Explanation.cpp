@@ -4,7 +4,7 @@
 #include <limits>
 #include <vector>
 
-#include "ReadOnlyDevice.h"
+#include "access/ReadOnlyDevice.h"
 #include "commandline/Arguments.h"
 #include "commandline/NearestName.h"
 #include "commandline/Results.h"

@@ -4,7 +4,7 @@
 #include <set>
 #include <utility>
 
-#include "ReadOnlyDevice.h"
+#include "access/ReadOnlyDevice.h"
 #include "config/TBConfig.h"
 
 namespace vesprun {

@@ -3,8 +3,8 @@
 #include <iostream>
 #include <optional>
 
-#include "Command.h"
-#include "ReadOnlyDevice.h"
+#include "access/CommandDevice.h"
+#include "access/ReadOnlyDevice.h"
 #include "commandline/Arguments.h"
 #include "commandline/Completion.h"
 #include "driver/DailyTasks.h"

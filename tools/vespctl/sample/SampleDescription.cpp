@@ -4,7 +4,7 @@
 #include <string_view>
 #include <vector>
 
-#include "Command.h"
+#include "access/CommandDevice.h"
 #include "buffers/DeviceBuffers.h"
 #include "common/LittleEndian.h"
 #include "platform/host/files/AtomicFile.h"

@@ -4,7 +4,7 @@
 #include <map>
 #include <vector>
 
-#include "Command.h"
+#include "access/CommandDevice.h"
 #include "collect/StarterWhitelist.h"
 #include "common/Calendar.h"
 #include "platform/host/counters/CounterLines.h"

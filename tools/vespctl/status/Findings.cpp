@@ -9,7 +9,7 @@
 #include <memory>
 #include <set>
 
-#include "Command.h"
+#include "access/CommandDevice.h"
 #include "commandline/Arguments.h"
 #include "common/Calendar.h"
 #include "config/TBConfig.h"

@@ -4,8 +4,8 @@
 #include <limits>
 #include <string>
 
-#include "Command.h"
-#include "ReadOnlyDevice.h"
+#include "access/CommandDevice.h"
+#include "access/ReadOnlyDevice.h"
 #include "commandline/Arguments.h"
 #include "outbox/FirstReport.h"
 #include "status/Findings.h"

@@ -7,7 +7,6 @@
 #include <optional>
 #include <vector>
 
-#include "Command.h"
 #include "NANDInfo/parsers/ErrorMessages.h"
 #include "NANDInfo/parsers/KernelSnapshot.h"
 #include "NANDInfo/parsers/MSPRecord.h"
@@ -18,6 +17,7 @@
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
 #include "NANDInfo/parsers/StatisticsRecord.h"
 #include "NANDInfo/parsers/VendorCounterParsers.h"
+#include "access/CommandDevice.h"
 #include "commandline/Completion.h"
 #include "common/LittleEndian.h"
 #include "platform/host/documents/QuotedText.h"

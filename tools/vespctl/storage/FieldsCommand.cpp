@@ -7,7 +7,6 @@
 #include <iostream>
 #include <vector>
 
-#include "Command.h"
 #include "NANDInfo/parsers/NandChannelCounters.h"
 #include "NANDInfo/parsers/ORUMSPKeyTable.h"
 #include "NANDInfo/parsers/ORUStatKeyTable.h"
@@ -15,6 +14,7 @@
 #include "NANDInfo/tables/FieldSets.h"
 #include "NANDInfo/tables/LegacyKeyMap.h"
 #include "NANDInfo/tables/MagazineFields.h"
+#include "access/CommandDevice.h"
 #include "commandline/Completion.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/figures/FigureTable.h"

@@ -8,7 +8,7 @@
 #include <iostream>
 #include <vector>
 
-#include "Command.h"
+#include "access/CommandDevice.h"
 #include "commandline/Arguments.h"
 #include "interface/EntryPoints.h"
 #include "platform/host/files/Files.h"

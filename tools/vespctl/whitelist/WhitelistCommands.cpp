@@ -4,8 +4,8 @@
 #include <iostream>
 #include <limits>
 
-#include "Command.h"
-#include "ReadOnlyDevice.h"
+#include "access/CommandDevice.h"
+#include "access/ReadOnlyDevice.h"
 #include "commandline/Arguments.h"
 #include "commandline/Results.h"
 #include "report/ReportSources.h"

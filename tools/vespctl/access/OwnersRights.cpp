@@ -1,4 +1,4 @@
-#include "OwnersRights.h"
+#include "access/OwnersRights.h"
 
 #include <grp.h>
 #include <pwd.h>
@@ -8,7 +8,7 @@
 #include <exception>
 #include <vector>
 
-#include "Command.h"
+#include "access/CommandDevice.h"
 
 namespace vesprun {
 namespace {

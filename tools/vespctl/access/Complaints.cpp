@@ -1,6 +1,6 @@
-#include "Complaints.h"
+#include "access/Complaints.h"
 
-#include "Command.h"
+#include "access/CommandDevice.h"
 
 namespace vesprun {
 

@@ -1,4 +1,4 @@
-#include "Command.h"
+#include "access/CommandDevice.h"
 
 #include <fcntl.h>
 #include <unistd.h>

@@ -4,7 +4,7 @@
 #include <memory>
 #include <string>
 
-#include "OwnersRights.h"
+#include "access/OwnersRights.h"
 #include "commandline/Program.h"
 #include "commandline/Results.h"
 #include "platform/host/HostPlatform.h"

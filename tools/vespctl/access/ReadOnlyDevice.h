@@ -7,8 +7,8 @@
 #include <string_view>
 #include <vector>
 
-#include "Command.h"
-#include "Complaints.h"
+#include "access/CommandDevice.h"
+#include "access/Complaints.h"
 
 namespace vesprun {
 

@@ -1,4 +1,4 @@
-#include "ReadOnlyDevice.h"
+#include "access/ReadOnlyDevice.h"
 
 #include <limits>
 #include <set>
