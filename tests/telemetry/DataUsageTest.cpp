@@ -175,9 +175,9 @@ void collectAndDie(TestDevice& device) {
 const Scalars kGrowth{{"datausage.wifiInKB.app", 4}};
 
 TEST(DataUsage, GrowthIsCountedOnceWhateverIsKilledInBetween) {
-  TestDevice device(usage(record(kApp, kToday, counters(5096, 0, 0, 0))));
-  const std::string before = R"({"app":[{"date":"2024-03-05T00:00:00.5Z"},1000,0,0,0]})";
-  const std::string after = R"({"app":[{"date":"2024-03-05T00:00:00.5Z"},5096,0,0,0]})";
+  TestDevice device(usage(record(kApp, kToday, counters(7096, 0, 0, 0))));
+  const std::string before = R"({"app":[{"date":"2024-03-05T00:00:00.5Z"},3000,0,0,0]})";
+  const std::string after = R"({"app":[{"date":"2024-03-05T00:00:00.5Z"},7096,0,0,0]})";
   setBaseline(device, before);
   device.platform().preferences().LGSPreferencesSynchronize(kDomain);
   std::string error;

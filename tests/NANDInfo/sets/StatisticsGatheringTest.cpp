@@ -48,6 +48,7 @@ TEST_F(StatisticsGatheringTest, AnOpenServiceWithoutAConnectionIsAFailure) {
   for (const bool ftl : {true, false}) {
     const Unconnected registry(start(controller(kQNS3, kStatisticsAnswer)));
     EXPECT_EQ(ftl ? gatherORUFTLData(false, true, 0) : gatherORUMSPData(), std::nullopt);
+    EXPECT_FALSE(ftl && gatherFTLFields(false, true, 0, [](const FTLFields&) {}));
     EXPECT_EQ(GetAPIErrorMessage(), std::string(ftl ? "gatherORUFTLData" : "gatherORUMSPData") +
                                         ": No io_connection exist");
   }

@@ -1,6 +1,7 @@
 #include <sys/file.h>
 
 #include <algorithm>
+#include <array>
 #include <filesystem>
 #include <limits>
 #include <sstream>
@@ -38,8 +39,13 @@ class TallybookTest : public HostServiceTest {
     history->distributionsForKeyPrefixMinDaysSince1970MaxDaysSince1970RowHandler(
         "", 0, kToday,
         [&](std::string_view, std::int32_t, TBHistoryDistributionEnumerator& values, bool&) {
-          for (double value = 0; values.getNextValueSecondsInDayOffset(value, nullptr);) {
+          double value = 0;
+          if (values.getNextValueSecondsInDayOffset(value, nullptr)) {
             ++samples;
+          }
+          std::array<double, 1000> block;
+          while (const std::size_t count = values.getNextValues(block)) {
+            samples += static_cast<int>(count);
           }
         });
     return samples;
@@ -288,6 +294,7 @@ TEST_F(TallybookTest, MovesAsideWhatHasOtherTablesOrRowsThanOurs) {
       {"CREATE TRIGGER t AFTER INSERT ON scalar BEGIN DELETE FROM scalar; END", kOther},
       {"ALTER TABLE scalar ADD COLUMN other INTEGER", kOther},
       {"CREATE TABLE mark (place)", kOther},
+      {"PRAGMA user_version = 0", "not a counter database of this version"},
       {manyTables, "takes more work than its size explains"},
       {otherRows, "a cell is not of its column's type"},
   };

@@ -63,7 +63,7 @@ TEST(JsonForm, NamesWhatItRefuses) {
       {"[18446744073709551616]", "[0]: the integer 18446744073709551616 does not fit 64 bits"},
       {"-9223372036854775809", "does not fit"},
       {"{\"a\":[1e999]}", "\"a\" > [0]: number overflow"},
-      {R"([{"a":1,"b":2,"a":3}])", "[0] > \"a\": there twice"},
+      {R"([{"a":1,"a":2,"b":3}])", "[0] > \"a\": there twice"},
       {R"({"a":{"real":"Inf"}})",
        "\"a\": a \"real\" of \"Inf\" instead of \"inf\", \"-inf\" or \"nan\""},
       {R"([{"data":"A"}])", "[0]: \"A\" is not base64"},
