@@ -46,8 +46,7 @@ bool parseRate(std::string_view text, Rate& rate) {
   } else if (fraction.size() <= kMaxFractionDigits &&
              text.find_first_of("eE") == std::string_view::npos &&
              parseWholeText(fraction, rate.numerator)) {
-    for (rate.denominator = 1; const char digit : fraction) {
-      static_cast<void>(digit);
+    for (std::size_t digits = 0; digits < fraction.size(); ++digits) {
       rate.denominator *= 10;
     }
   } else {

@@ -329,13 +329,12 @@ CounterStore::Rows CounterStore::removeBefore(std::int64_t day) {
 void CounterStore::removeDay(std::int32_t day) { removeRows("day = ?", day); }
 
 void CounterStore::removeRows(const std::string& condition, std::int64_t day) {
-  for (const char* const sql :
-       {"DELETE FROM chunk WHERE distribution IN (SELECT id FROM distribution WHERE ",
-        "DELETE FROM distribution WHERE ", "DELETE FROM scalar WHERE "}) {
-    const bool isNested = std::string_view(sql).find('(') != std::string_view::npos;
-    SqliteStatement(_connection, (sql + condition + (isNested ? ")" : "")).c_str())
-        .bind(1, day)
-        .run();
+  const std::string statements[] = {
+      "DELETE FROM chunk WHERE distribution IN (SELECT id FROM distribution WHERE " + condition +
+          ")",
+      "DELETE FROM distribution WHERE " + condition, "DELETE FROM scalar WHERE " + condition};
+  for (const std::string& sql : statements) {
+    SqliteStatement(_connection, sql.c_str()).bind(1, day).run();
   }
 }
 
