@@ -61,7 +61,7 @@ TEST(FieldTable, NamesWhatAStatisticGives) {
   std::set<std::string_view> base, ftl, msp;
   const auto add = [](auto& names, const auto& row, KnownNames known) {
     for (std::size_t i = 0; i < row.count; ++i) {
-      names.insert(known[i].text);
+      names.insert(known.text(i));
     }
   };
   for (const ORUStatKey& row : ORUStatKeyTable) {
