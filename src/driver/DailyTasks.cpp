@@ -9,7 +9,7 @@
 namespace vesprun {
 namespace {
 
-/// Seconds: more than a day's work takes, but a stopped process must not block the others for ever.
+/// Seconds: more than a day's work takes, but a stopped process must not block the others forever.
 constexpr double kMaxWaitForOthers = 300;
 
 bool lockDailyWork() { return platform().fileSystem().lockDailyWork(kMaxWaitForOthers); }

@@ -71,7 +71,7 @@ struct Place {
   CLI::App* command;
   CLI::Option* wanted = nullptr;  ///< the option whose value is next
   std::size_t given = 0;          ///< positional arguments
-  bool isBare = false;            ///< behind "--"
+  bool isBare = false;            ///< after "--"
 
   std::vector<CLI::Option*> positionals() const {
     return command->get_options([](const CLI::Option* option) { return option->get_positional(); });

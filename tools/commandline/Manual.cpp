@@ -10,7 +10,7 @@
 namespace vesprun {
 namespace {
 
-/// The file: what stands before and behind the commands, and the text of each.
+/// The file: what stands before and after the commands, and the text of each.
 struct Prose {
   std::string before;
   std::string after;
@@ -62,7 +62,7 @@ std::string termOf(const CLI::Option& option) {
     return option.get_name(true) + (option.get_items_expected_max() > 1 ? "…" : "");
   }
   const std::string name = option.get_name(false, true);
-  const std::string value = option.get_type_name();  // with what it must be, behind a colon
+  const std::string value = option.get_type_name();  // with what it must be, after a colon
   return option.get_items_expected_max() > 0 ? name + ' ' + value.substr(0, value.find(':')) : name;
 }
 

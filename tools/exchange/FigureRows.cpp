@@ -8,7 +8,7 @@
 namespace vesprun {
 namespace {
 
-/// A comma stands behind the field.
+/// A comma follows the field.
 void appendField(std::string& text, std::string_view field) {
   if (field.find_first_of(",\"\r\n") == std::string_view::npos) {
     text.append(field).append(1, ',');

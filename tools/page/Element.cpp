@@ -145,7 +145,7 @@ void Element::writeTo(std::string& html) const {
     for (const Attribute& attribute : _attributes) {
       appendAttribute(attribute, html);
     }
-    // Right behind an unquoted value the slash would belong to it.
+    // Right after an unquoted value the slash would belong to it.
     html += isShape(_tag) ? " />" : ">";
   }
   if (_embedded != nullptr) {

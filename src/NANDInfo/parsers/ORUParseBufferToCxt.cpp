@@ -12,7 +12,7 @@ namespace {
 constexpr std::uint32_t kReadCountHisto = 265;
 
 // A full record gives fewer fields than it has words. But an array that is cut short takes the
-// words behind it, which are read again: a buffer of headers alone could give 256 fields a word. Up
+// words after it, which are read again: a buffer of headers alone could give 256 fields a word. Up
 // to 1,024 words may.
 constexpr std::size_t kMaxSharedFields = 1024 * 256;
 

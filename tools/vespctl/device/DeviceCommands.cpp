@@ -60,7 +60,7 @@ void removeFile(const std::string& path) {
 }
 
 /// Marks the folder as one in which `init` is at work. False if a device is there already, whose
-/// `init` was cut short behind its last file.
+/// `init` was cut short after its last file.
 bool beginInit(const DeviceDirectory& directory) {
   const std::string mark = directory.hostPath(kInitMark);
   const std::string description = directory.hostPath("device.json");

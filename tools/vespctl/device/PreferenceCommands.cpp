@@ -67,7 +67,7 @@ void setPreference(const PreferenceArguments& arguments) {
   changePreference(arguments, std::move(value));
 }
 
-/// Of all these commands: --user stands before or behind their names.
+/// Of all these commands: --user stands before or after their names.
 PreferenceArguments& addUser(CLI::App& command) {
   static PreferenceArguments arguments;
   command.add_option("--user", arguments.user, "Whose preferences, instead of mobile's")

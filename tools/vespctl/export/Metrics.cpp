@@ -44,7 +44,7 @@ void addSample(std::string& text, std::string_view name, std::string_view labels
   text.append(" ").append(value) += '\n';
 }
 
-/// The number behind the comma of "(10, 100]".
+/// The number after the comma of "(10, 100]".
 std::optional<double> upperBound(std::string_view label) {
   const std::size_t comma = label.rfind(", ");
   double bound = 0;

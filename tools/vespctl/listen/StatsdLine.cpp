@@ -32,7 +32,7 @@ struct Rate {
 
 constexpr int kMaxFractionDigits = 17;
 
-/// A decimal number above 0, at most 1; digits behind the 17th are below what a sender can mean.
+/// A decimal number above 0, at most 1; digits after the 17th are below what a sender can mean.
 bool parseRate(std::string_view text, Rate& rate) {
   double value = 0;
   if (!parseWholeText(text, value) || !(value > 0 && value <= 1)) {

@@ -77,7 +77,7 @@ std::string processLocale(const char* category) {
   return "";
 }
 
-/// The part of a locale's name behind the language.
+/// The part of a locale's name after the language.
 std::string countryOf(const std::string& name) {
   const auto separator = name.find('_');
   return separator == std::string::npos ? "" : name.substr(separator + 1);
