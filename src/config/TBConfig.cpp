@@ -53,18 +53,14 @@ void reportHeldBack(std::string_view list, const Entries& entries) {
 template <typename Options>
 void reportUnread(std::string_view list, const typename WhitelistTable<Options>::Entries& entries) {
   std::size_t count = 0;
-  const std::string* option = nullptr;
   const WhitelistEntry<Options>* first = nullptr;
   std::string_view firstKey;
   for (const auto& [key, entry] : entries) {
-    const PropertyDict* written = entry.written->dict();
-    const std::string* unread = written != nullptr ? unreadOption<Options>(*written) : nullptr;
-    if (unread == nullptr) {
+    if (!entry.hasUnread) {
       continue;
     }
     ++count;
     if (first == nullptr || entry.place < first->place) {
-      option = unread;
       first = &entry;
       firstKey = key;
     }
@@ -74,7 +70,7 @@ void reportUnread(std::string_view list, const typename WhitelistTable<Options>:
                "Whitelist: %s: %zu keys have options that nothing reads, so they leave as if these "
                "were not there; the first is %s in group %s with %s",
                list.data(), count, std::string(firstKey).c_str(), first->group->c_str(),
-               option->c_str());
+               unreadOption<Options>(*first->written->dict())->c_str());
   }
 }
 

@@ -8,11 +8,11 @@ void WhitelistTable<Options>::take(const std::string& group, std::string_view li
   _prefixTable.reset();
   Entries& table = list == Options::kKeyList ? _keys : _prefixes;
   for (const auto& [key, written] : entries) {
-    const auto options =
-        written.dict() != nullptr ? Options::read(*written.dict()) : std::optional<Options>();
+    const PropertyDict* const dict = written.dict();
+    const auto options = dict != nullptr ? Options::read(*dict) : std::optional<Options>();
     table.insert_or_assign(
-        key,
-        WhitelistEntry<Options>{&group, &written, options ? keep(*options) : nullptr, _taken++});
+        key, WhitelistEntry<Options>{&group, &written, options ? keep(*options) : nullptr, _taken++,
+                                     dict != nullptr && unreadOption<Options>(*dict) != nullptr});
   }
 }
 

@@ -3,6 +3,7 @@
 #include <tsl/ordered_map.h>
 
 #include <cstddef>
+#include <cstdint>
 #include <deque>
 #include <optional>
 #include <string>
@@ -24,7 +25,8 @@ struct WhitelistEntry {
   const std::string* group;      ///< the last one that names it
   const PropertyValue* written;  ///< its options as they stand there
   const Options* options;        ///< null when they cannot be read: held back
-  std::size_t place;             ///< among the taken entries of all groups
+  std::uint32_t place;           ///< among the taken entries of all groups
+  bool hasUnread;                ///< an option that nothing reads
 };
 
 enum class DecidedBy { Nothing, Key, Prefix, InternalDevice };
@@ -86,7 +88,7 @@ class WhitelistTable {
  private:
   const Options* keep(const Options& options);
 
-  std::size_t _taken = 0;
+  std::uint32_t _taken = 0;
   std::deque<Options> _options;  ///< of the entries; those in a row mostly have the same
   Entries _keys;
   Entries _prefixes;
