@@ -1,8 +1,8 @@
 #include <cmath>
 #include <string_view>
 
-#include "ExportedLine.h"
 #include "Require.h"
+#include "store/ExportedLine.h"
 
 using namespace vesprun;
 

@@ -11,11 +11,11 @@
 #include <future>
 #include <thread>
 
-#include "FleetStore.h"
 #include "LineSource.h"
 #include "commandline/Progress.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/LineReader.h"
+#include "store/FleetStore.h"
 
 namespace vesprun {
 namespace {

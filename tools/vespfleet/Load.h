@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "FleetStore.h"
+#include "store/FleetStore.h"
 
 namespace vesprun {
 

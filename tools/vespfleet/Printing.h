@@ -4,7 +4,7 @@
 #include <string>
 #include <vector>
 
-#include "Comparison.h"
+#include "store/Comparison.h"
 
 namespace vesprun {
 

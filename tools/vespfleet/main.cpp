@@ -4,8 +4,6 @@
 #include <memory>
 #include <set>
 
-#include "Comparison.h"
-#include "FleetStore.h"
 #include "Load.h"
 #include "Printing.h"
 #include "commandline/Arguments.h"
@@ -17,6 +15,8 @@
 #include "page/PageFile.h"
 #include "platform/Clock.h"
 #include "platform/host/files/StandardStreams.h"
+#include "store/Comparison.h"
+#include "store/FleetStore.h"
 
 namespace vesprun {
 namespace {

@@ -4,7 +4,7 @@
 #include "outbox/SubmittedLogs.h"
 #include "platform/host/documents/JsonForm.h"
 #include "platform/host/documents/XmlText.h"
-#include "vespfleet/ExportedLine.h"
+#include "vespfleet/store/ExportedLine.h"
 
 namespace vesprun {
 

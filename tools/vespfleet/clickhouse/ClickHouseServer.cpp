@@ -6,8 +6,8 @@
 #include <algorithm>
 #include <cstdlib>
 
-#include "FleetStore.h"
 #include "platform/host/files/Files.h"
+#include "store/FleetStore.h"
 
 namespace vesprun {
 namespace {

@@ -8,8 +8,8 @@
 #include <vector>
 
 #include "ClickHouseServer.h"
-#include "FleetStore.h"
-#include "Varint.h"
+#include "store/FleetStore.h"
+#include "store/Varint.h"
 
 namespace vesprun {
 

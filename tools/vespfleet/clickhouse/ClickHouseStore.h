@@ -13,8 +13,8 @@
 #include <vector>
 
 #include "ClickHouseServer.h"
-#include "FleetStore.h"
 #include "common/KeyHash.h"
+#include "store/FleetStore.h"
 
 namespace vesprun {
 

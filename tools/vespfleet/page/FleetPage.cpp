@@ -6,13 +6,13 @@
 #include <map>
 #include <set>
 
-#include "Comparison.h"
 #include "commandline/Progress.h"
 #include "common/Calendar.h"
 #include "page/ChangeList.h"
 #include "page/Changes.h"
 #include "page/KeyTable.h"
 #include "page/KeyWords.h"
+#include "store/Comparison.h"
 
 namespace vesprun {
 namespace {

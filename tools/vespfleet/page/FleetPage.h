@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "FleetStore.h"
+#include "store/FleetStore.h"
 
 namespace vesprun {
 

@@ -12,8 +12,8 @@
 #include <utility>
 #include <vector>
 
-#include "FleetStore.h"
-#include "Varint.h"
+#include "store/FleetStore.h"
+#include "store/Varint.h"
 
 namespace vesprun {
 

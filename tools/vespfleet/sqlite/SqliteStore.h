@@ -9,10 +9,10 @@
 #include <unordered_map>
 #include <vector>
 
-#include "FleetStore.h"
 #include "Turn.h"
-#include "Varint.h"
 #include "platform/host/counters/SqliteConnection.h"
+#include "store/FleetStore.h"
+#include "store/Varint.h"
 
 namespace vesprun {
 

@@ -5,7 +5,7 @@
 #include <cerrno>
 #include <cstring>
 
-#include "FleetStore.h"
+#include "store/FleetStore.h"
 
 namespace vesprun {
 namespace {
