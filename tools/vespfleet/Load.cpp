@@ -12,6 +12,7 @@
 #include <thread>
 
 #include "LineSource.h"
+#include "StoreAddress.h"
 #include "commandline/Progress.h"
 #include "platform/host/documents/QuotedText.h"
 #include "platform/host/files/LineReader.h"

@@ -6,6 +6,7 @@
 
 #include "Load.h"
 #include "Printing.h"
+#include "StoreAddress.h"
 #include "commandline/Arguments.h"
 #include "commandline/Completion.h"
 #include "commandline/Program.h"

@@ -4,7 +4,6 @@
 #include <cstdint>
 #include <functional>
 #include <limits>
-#include <memory>
 #include <optional>
 #include <span>
 #include <stdexcept>
@@ -162,16 +161,6 @@ class FleetStore {
   Outcomes _outcomes{};
 };
 
-/// What is wrong with an address; empty when nothing is.
-std::string storeFault(const std::string& address);
-
 enum class StoreUse { Ask, Change, Load };
-
-/// Opens the store at an address: a ClickHouse database when it begins with "http://" or
-/// "https://", else an SQLite file. To be loaded, what is missing is made: the file, readable for
-/// its owner alone, or the tables, and a store of an earlier version is brought up to date. `least`
-/// is the least number of devices of a store that is made. Throws `StoreFailure`.
-std::unique_ptr<FleetStore> openFleetStore(const std::string& address, StoreUse use,
-                                           std::optional<int> least = {});
 
 }  // namespace vesprun
