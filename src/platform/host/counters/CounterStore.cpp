@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cstring>
 #include <limits>
+#include <mutex>
 #include <utility>
 
 #include "platform/host/counters/ChunkEnumerator.h"
@@ -119,6 +120,10 @@ CounterStore::CounterStore(std::string path, std::chrono::milliseconds longestWa
 }
 
 void CounterStore::open() {
+  // One thread at a time: SQLite takes a thread that is about to take a cut-off commit back for a
+  // writer at work, and reads the file as that commit left it.
+  static std::mutex opening;
+  const std::scoped_lock guard(opening);
   ++_opening;
   _connection = SqliteConnection(_path, _longestWait, _access == Access::Looking);
   const std::int64_t version = _connection.queryInteger("PRAGMA user_version");
