@@ -146,7 +146,7 @@ inline constexpr auto kFieldsOf = []<std::size_t... kPlace>(std::index_sequence<
 }
 (std::make_index_sequence<kRowsOf<kList>.size()>());
 
-/// The place of each row in a list; both are counted from 1, and 0 is none.
+/// The place of each row in a list, both counted from 1; 0 for a row outside.
 template <FieldList kList>
 inline constexpr auto kRangeOfRow = [] {
   std::array<std::uint16_t, fieldRows::kFieldRows.size() + 1> ranges{};
