@@ -147,20 +147,24 @@ inline constexpr auto kFieldsOf = []<std::size_t... kPlace>(std::index_sequence<
 (std::make_index_sequence<kRowsOf<kList>.size()>());
 
 /// The place of each row in a list, both counted from 1; 0 for a row outside.
+struct PlacesOfRows {
+  std::array<std::uint16_t, fieldRows::kFieldRows.size() + 1> places{};
+};
+
 template <FieldList kList>
-inline constexpr auto kRangeOfRow = [] {
-  std::array<std::uint16_t, fieldRows::kFieldRows.size() + 1> ranges{};
-  std::uint16_t range = 0;
+inline constexpr PlacesOfRows kPlacesOfRows = [] {
+  PlacesOfRows rows;
+  std::uint16_t place = 0;
   for (const std::uint16_t row : kRowsOf<kList>) {
-    ranges[row + 1U] = ++range;
+    rows.places[row + 1U] = ++place;
   }
-  return ranges;
+  return rows;
 }();
 
 /// The list as a table, to be searched.
 template <FieldList kList>
 constexpr FieldTable fieldTableOf() {
-  return FieldTable(kFieldIndexOf<kFieldsOf<kList>>, kRangeOfRow<kList>);
+  return FieldTable(kFieldIndexOf<kFieldsOf<kList>>, kPlacesOfRows<kList>.places);
 }
 
 /// The row of a field, counted from 1; 0 when it has none. A field in two rows does not compile.
