@@ -338,6 +338,7 @@ def test_malformed(store, folder, _):
     left = sorted(str(path.relative_to(spool)) for path in spool.rglob("*") if not path.is_dir())
     assert left == ["D/rejected/other.jsonl", "fifo.jsonl", "rejected/bad.jsonl", "rejected/cut.jsonl.gz"], left
     assert ask("scalar", store, "a")[0]["devices"] in (2, 3)
+    assert run("keys", store) == "No key comes from 5 devices or more.\n"
     (spool / "D/good.jsonl").write_text(json.dumps(good))
     (spool / "bad.jsonl").write_text("x")
     load = subprocess.Popen([PROGRAM, "load", store, "--spool", spool, "-"], stdin=subprocess.PIPE,

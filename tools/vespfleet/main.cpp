@@ -155,10 +155,12 @@ void addKeys(CLI::App& command) {
   command.callback([asked] {
     const auto store = openStore(asked->store);
     Results results({"key", "kind", "devices", "days"}, isJson());
+    bool isAny = false;
     store->visitKeys([&](const ReportedKey& key) {
       if (key.devices < store->least()) {
         return;
       }
+      isAny = true;
       if (results.isJson()) {
         results.print({{"key", key.key},
                        {"kind", kindName(key.kind)},
@@ -169,6 +171,9 @@ void addKeys(CLI::App& command) {
             {key.key, kindName(key.kind), std::to_string(key.devices), std::to_string(key.days)});
       }
     });
+    if (!isAny && !results.isJson()) {
+      std::cout << "No key comes from " << store->least() << " devices or more.\n";
+    }
   });
 }
 
