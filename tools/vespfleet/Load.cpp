@@ -198,10 +198,10 @@ class Loading {
     while (result == LineReader::Result::Line || result == LineReader::Result::TooLong) {
       // These are parsed while those before are stored.
       ParsedLines next = readSome(lines, result);
-      const auto parsing = startParsing(next);
+      auto parsing = startParsing(next);
       add(file, name, parsed);
-      for (const auto& part : parsing) {
-        part.wait();
+      for (std::future<void>& part : parsing) {
+        part.get();
       }
       parsed = std::move(next);
     }

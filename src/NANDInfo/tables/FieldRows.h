@@ -146,7 +146,8 @@ inline constexpr auto kFieldsOf = []<std::size_t... kPlace>(std::index_sequence<
 }
 (std::make_index_sequence<kRowsOf<kList>.size()>());
 
-/// The place of each row in a list, both counted from 1; 0 for a row outside.
+/// The place of each row in a list, both counted from 1; 0 for a row outside. A class, as the
+/// library would show the symbol of a plain array.
 struct PlacesOfRows {
   std::array<std::uint16_t, fieldRows::kFieldRows.size() + 1> places{};
 };

@@ -94,14 +94,14 @@ struct FieldIndex {
 /// An ordered set of field names with their digits. Ranges and index are compile-time constants.
 class FieldTable {
  public:
-  /// `rangeOfRow`: for each row of `kFieldRows`, counted from 1, the row's place in `kRanges`,
+  /// `placesOfRows`: for each row of `kFieldRows`, counted from 1, the row's place in `kRanges`,
   /// counted from 1; 0 for none. Empty for a table that is not made of such rows.
   template <const auto& kRanges>
   constexpr explicit FieldTable(const FieldIndex<kRanges>& index,
-                                std::span<const std::uint16_t> rangeOfRow = {})
+                                std::span<const std::uint16_t> placesOfRows = {})
       : _ranges(kRanges),
         _slots(index.slots),
-        _rangeOfRow(rangeOfRow),
+        _placesOfRows(placesOfRows),
         _size(countNames(kRanges)) {}
 
   constexpr std::size_t size() const { return _size; }
@@ -119,10 +119,10 @@ class FieldTable {
   }
   bool contains(std::string_view name) const { return find(name) != nullptr; }
 
-  bool isMadeOfRows() const { return !_rangeOfRow.empty(); }
+  bool isMadeOfRows() const { return !_placesOfRows.empty(); }
   /// The range of a name whose row is known; null also for row 0. The table is made of rows.
   const FieldRange* findRow(std::uint16_t row) const {
-    const std::uint16_t range = _rangeOfRow[row];
+    const std::uint16_t range = _placesOfRows[row];
     return range != 0 ? &_ranges[range - 1U] : nullptr;
   }
 
@@ -139,7 +139,7 @@ class FieldTable {
  private:
   std::span<const FieldRange> _ranges;
   std::span<const FieldSlot> _slots;
-  std::span<const std::uint16_t> _rangeOfRow;
+  std::span<const std::uint16_t> _placesOfRows;
   std::size_t _size;
 };
 

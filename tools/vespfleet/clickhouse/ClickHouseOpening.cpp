@@ -98,13 +98,11 @@ void ClickHouseStore::open(StoreUse use, std::optional<int> least) {
       missing.push_back(&table);
     }
   }
-  if (!missing.empty() && use != StoreUse::Load && !isEarlier &&
-      missing.size() == std::size(kTables)) {
-    throw StoreFailure(_address + ": no fleet store");
-  }
   if ((isEarlier || !missing.empty()) && use != StoreUse::Load) {
-    throw StoreFailure(_address +
-                       ": a store of an earlier version; \"vespfleet load\" brings it up to date");
+    const bool isNone = !isEarlier && missing.size() == std::size(kTables);
+    throw StoreFailure(_address + (isNone ? ": no fleet store"
+                                          : ": a store of an earlier version; \"vespfleet load\" "
+                                            "brings it up to date"));
   }
   for (const Table* table : missing) {
     _server.post(std::string("CREATE TABLE IF NOT EXISTS ") + table->name + "(" + table->columns +
