@@ -76,6 +76,12 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
   }
   EXPECT_EQ(run("fields >/dev/null; ulimit -f 1; '" VESPCTL_PROGRAM "' page full"), 1);
   EXPECT_THAT(error, HasSubstr("full: File too large")) << "no signal";
+  // Just above what the loader needs, not even an exception finds memory.
+  EXPECT_EQ(shell("limited() { (ulimit -v $1; '" VESPCTL_PROGRAM "' fields) >/dev/null 2>&1; }; "
+                  "for ((m = 40000; m > 0; m -= 1000)); do limited $m || break; done; "
+                  "for ((i = m + 1000; m < 39000 && i > m; i -= 40)); do limited $i; s=$?; "
+                  "test $s -lt 2 -o $s = 127 || echo $i: $s; done"),
+            "");
   EXPECT_EQ(print("counters dump"), "") << "nothing was changed";
 }
 

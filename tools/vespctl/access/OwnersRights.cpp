@@ -5,7 +5,7 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <exception>
+#include <cstdlib>
 #include <vector>
 
 #include "access/CommandDevice.h"
@@ -67,7 +67,7 @@ RightsOfCaller::RightsOfCaller() {
 
 RightsOfCaller::~RightsOfCaller() {
   if (setegid(_group) != 0 || seteuid(_user) != 0) {
-    std::terminate();
+    std::abort();
   }
 }
 

@@ -18,14 +18,19 @@ int statusToExitWith;
 std::terminate_handler otherTermination;
 
 void terminate() {
+  // Without an exception: it found no memory either.
+  bool isOutOfMemory = std::current_exception() == nullptr;
   try {
-    if (std::current_exception() != nullptr) {
+    if (!isOutOfMemory) {
       throw;
     }
   } catch (const std::bad_alloc&) {
+    isOutOfMemory = true;
+  } catch (...) {
+  }
+  if (isOutOfMemory) {
     std::fprintf(stderr, "%s: out of memory\n", programToExit);
     _exit(statusToExitWith);
-  } catch (...) {
   }
   otherTermination();
 }

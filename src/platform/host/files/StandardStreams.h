@@ -13,8 +13,8 @@ void holdStandardStreams();
 /// line's level: "<3>" for an error. Empty elsewhere.
 const char* journalLevel(LogLevel level);
 
-/// When memory runs out where no exception may leave, such as in a destructor, the process ends
-/// with `status` and a line on standard error. `program` must live on.
+/// When memory runs out where no exception may leave, such as in a destructor, or for the exception
+/// itself, the process ends with `status` and a line on standard error. `program` must live on.
 void exitWithoutMemory(const char* program, int status);
 
 }  // namespace vesprun
