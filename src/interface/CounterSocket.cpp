@@ -93,7 +93,7 @@ bool CounterSocket::connect(CallFailure& failure) {
 
 bool CounterSocket::sendCollected(CallFailure& failure) {
   const auto send = [this] {
-    return _lines.empty() || ::send(_socket.get(), _lines.data(), _lines.size(), MSG_NOSIGNAL) >= 0;
+    return _lines.empty() || ::send(_socket.get(), _lines.data(), _lines.size(), 0) >= 0;
   };
   if (!send()) {
     // A listener that was started anew has another socket.

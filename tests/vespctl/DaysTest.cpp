@@ -214,6 +214,7 @@ TEST_F(DaysTest, PruneRemovesTheOldestLogsUntilTheOutboxIsSmallEnough) {
   folder.write(logs + "/10000-165-S.log", large);
   folder.write(logs + "/10000-165-S.header.json", "{}");
   folder.write(logs + "/0010-165-S.header.json", "of a log that is gone");
+  folder.write(logs + "/.unfinished-0", "of a run that was killed");
   folder.write("device/outbox/log.jsonl", large);
   EXPECT_EQ(
       print("prune --json --outbox-size 1"),

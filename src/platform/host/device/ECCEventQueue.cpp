@@ -27,11 +27,13 @@ ECCEventQueue::Outcome ECCEventQueue::take(const HostPath& path, std::span<std::
   if (fstat(file.get(), &status) != 0) {
     return failed(Outcome::Failed);
   }
-  if (!S_ISREG(status.st_mode) || status.st_size != kEventLength) {
-    error = path.string() + (S_ISREG(status.st_mode) ? ": " + std::to_string(status.st_size) +
-                                                           " bytes are not an ECC event of " +
-                                                           std::to_string(kEventLength)
-                                                     : ": not a regular file");
+  if (!S_ISREG(status.st_mode)) {
+    error = path.string() + ": not a regular file";
+    return Outcome::Unusable;
+  }
+  if (status.st_size != kEventLength) {
+    error = path.string() + ": " + std::to_string(status.st_size) +
+            " bytes are not an ECC event of " + std::to_string(kEventLength);
     return Outcome::Unusable;
   }
   for (std::size_t length = 0; length < kEventLength;) {

@@ -169,7 +169,6 @@ void LogPruning::tidy() {
   if (_directory.isReadOnly()) {
     return;
   }
-  removeLeftOvers(_directory.hostPath(kOutbox));
   removeLeftOvers(_directory.hostPath(kLogFolder));
   readFolder();  // for its lock
   if (!removeStaleNotes(_directory, error)) {
