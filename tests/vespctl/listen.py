@@ -3,6 +3,7 @@
 
 A small model of its own says what each line counts as.
 """
+import fcntl
 import json
 import os
 import pathlib
@@ -14,6 +15,7 @@ import socket
 import subprocess
 import sys
 import tempfile
+import threading
 import time
 from fractions import Fraction
 
@@ -190,7 +192,12 @@ def sockets(folder):
     device.send("a:1|c")
     device.stop(signal.SIGKILL)
     check("socket after a kill", os.path.exists(device.path), True)
+    held = os.open(folder, os.O_RDONLY)
+    fcntl.flock(held, fcntl.LOCK_EX)  # as one that is about to take the place
+    threading.Timer(0.5, os.close, [held]).start()
+    began = time.monotonic()
     device.start()
+    check("waits its turn", time.monotonic() - began > 0.4, True)
     device.send("a:1|c")
     device.stop()
     check("socket after an end", os.path.exists(device.path), False)

@@ -182,6 +182,9 @@ TEST_F(AtomicFileTest, ReadsNoMoreThanADocumentHas) {
   ASSERT_EQ(truncate(folder.path("document").c_str(), off_t{1} << 40), 0);
   EXPECT_FALSE(readWholeFile(folder.path("document"), error));
   EXPECT_EQ(error, folder.path("document") + ": larger than 268435456 bytes");
+  largestAllocation = 8'192;
+  EXPECT_FALSE(readWholeFile(std::string("/proc/self/smaps"), error, nullptr, 100));  // says 0
+  largestAllocation = SIZE_MAX;
   ASSERT_EQ(mkfifo(folder.path("pipe").c_str(), 0600), 0);
   EXPECT_FALSE(readWholeFile(folder.path("pipe"), error));
   EXPECT_EQ(error, folder.path("pipe") + ": not a regular file");

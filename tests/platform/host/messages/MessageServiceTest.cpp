@@ -221,13 +221,16 @@ TEST_F(MessageServiceTest, TheSocketFileIsItsOwnersAndGoesWithTheListener) {
   EXPECT_THAT(log.messages, ElementsAre(folder.path(kSocket) + ": Address already in use"));
 }
 
-TEST_F(MessageServiceTest, SaysThatItsFolderCannotBeOpened) {
-  folder.write("run/other", "");
+TEST_F(MessageServiceTest, SaysOnceThatItHasNoDescriptorLeft) {
   ASSERT_TRUE(hasSucceeded(startProcess([&] {
-    const rlimit none{0, 0};
-    setrlimit(RLIMIT_NOFILE, &none);
+    const std::unique_ptr<ServiceListener> listener = listen();
+    const FileDescriptor client = peer();
+    const rlimit standardStreams{3, 3};
+    setrlimit(RLIMIT_NOFILE, &standardStreams);
+    EXPECT_EQ(eventsUntilQuiet(), 0);
     EXPECT_EQ(listen(), nullptr);
-    EXPECT_THAT(log.messages, ElementsAre(folder.path("run") + ": Too many open files"));
+    EXPECT_THAT(log.messages, ElementsAre(HasSubstr("no peer can be accepted: Too many open files"),
+                                          folder.path("run") + ": Too many open files"));
   })));
 }
 
