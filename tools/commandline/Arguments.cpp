@@ -45,6 +45,11 @@ CLI::Option* addDay(CLI::App& command, const std::string& name, std::optional<Gi
       ->type_name("DAY");
 }
 
+void addDays(CLI::App& command, GivenDays& days) {
+  addDay(command, "--from", days.from, "The first day");
+  addDay(command, "--to", days.to, "The last day");
+}
+
 std::string dateOfDay(std::int32_t day) {
   const std::string date = dateText(startOfDay(day));
   return date.substr(0, date.find('T'));

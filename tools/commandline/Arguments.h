@@ -52,6 +52,22 @@ inline constexpr const char* kNoDay =
 CLI::Option* addDay(CLI::App& command, const std::string& name, std::optional<GivenDay>& day,
                     const std::string& help);
 
+/// The days from one to another, both included; without these, from the first or to the last.
+struct GivenDays {
+  std::optional<GivenDay> from;
+  std::optional<GivenDay> to;
+
+  std::int32_t first(std::int32_t today) const {
+    return from ? from->on(today) : std::numeric_limits<std::int32_t>::min();
+  }
+  std::int32_t last(std::int32_t today) const {
+    return to ? to->on(today) : std::numeric_limits<std::int32_t>::max();
+  }
+};
+
+/// Adds --from and --to.
+void addDays(CLI::App& command, GivenDays& days);
+
 /// "2024-03-05"
 std::string dateOfDay(std::int32_t day);
 

@@ -1,5 +1,3 @@
-#include <new>
-
 #include "access/CommandDevice.h"
 #include "collect/CollectCommand.h"
 #include "commandline/Completion.h"

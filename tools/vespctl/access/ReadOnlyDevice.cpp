@@ -22,11 +22,15 @@ bool forEachRow(std::int32_t first, std::int32_t last, const RowHandler& take,
              });
 }
 
+bool forEachRow(const RowHandler& take, std::string_view keyPrefix) {
+  using Days = std::numeric_limits<std::int32_t>;
+  return forEachRow(Days::min(), Days::max(), take, keyPrefix);
+}
+
 std::vector<std::string> countedKeys() {
   const ReadOnlyDevice opened;
   std::set<std::string, std::less<>> keys;
-  using Days = std::numeric_limits<std::int32_t>;
-  forEachRow(Days::min(), Days::max(), [&keys](bool, std::string_view key) { keys.emplace(key); });
+  forEachRow([&keys](bool, std::string_view key) { keys.emplace(key); });
   return {keys.begin(), keys.end()};
 }
 

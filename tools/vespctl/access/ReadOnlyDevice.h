@@ -35,6 +35,8 @@ using RowHandler = std::function<void(bool isDistribution, std::string_view key)
 /// counters cannot be read to their end; the system log has the reason.
 bool forEachRow(std::int32_t first, std::int32_t last, const RowHandler& take,
                 std::string_view keyPrefix = {});
+/// The same of all days.
+bool forEachRow(const RowHandler& take, std::string_view keyPrefix = {});
 
 /// The keys that were counted, as completion offers them.
 std::vector<std::string> countedKeys();

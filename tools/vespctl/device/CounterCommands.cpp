@@ -9,7 +9,6 @@
 #include <filesystem>
 #include <fstream>
 #include <iostream>
-#include <limits>
 #include <set>
 #include <vector>
 
@@ -33,8 +32,7 @@ struct CounterArguments {
   std::string key;
   std::vector<std::string> values;
   std::optional<GivenDay> day;
-  std::optional<GivenDay> from;
-  std::optional<GivenDay> to;
+  GivenDays days;  ///< of a dump
   std::string file;
   bool replaces = false;
 };
@@ -47,12 +45,6 @@ T parseArgument(const char* argument, const std::string& text, const char* what)
     throw CLI::ValidationError(argument, quotedText(text) + " is not " + what);
   }
   return value;
-}
-
-using Days = std::numeric_limits<std::int32_t>;
-
-std::int32_t dayOr(const std::optional<GivenDay>& day, std::int32_t today, std::int32_t otherwise) {
-  return day ? day->on(today) : otherwise;
 }
 
 /// Damage to the database goes to standard error and to the device's system log.
@@ -92,7 +84,7 @@ void changeCounter(
   DeviceCounters counters;
   const Date now = counters.now();
   const std::int32_t today = daysSince1970(now);
-  const std::int32_t day = dayOr(arguments.day, today, today);
+  const std::int32_t day = arguments.day ? arguments.day->on(today) : today;
   std::string error;
   if (!isCounterKey(arguments.key, error)) {
     throw CommandFailure(error);
@@ -241,8 +233,6 @@ void importLines(const CounterArguments& arguments) {
 void dumpLines(const CounterArguments& arguments) {
   DeviceCounters counters;
   const std::int32_t today = daysSince1970(counters.now());
-  const std::int32_t from = dayOr(arguments.from, today, Days::min());
-  const std::int32_t to = dayOr(arguments.to, today, Days::max());
   std::string outputFailure;
   const auto print = [&](std::string_view text) {
     if (std::fwrite(text.data(), 1, text.size(), stdout) != text.size() ||
@@ -254,7 +244,8 @@ void dumpLines(const CounterArguments& arguments) {
   std::string error;
   bool complete = true;
   const auto work = [&](CounterStore& store) {
-    complete = exportCounterLines(store, from, to, print, error);
+    complete = exportCounterLines(store, arguments.days.first(today), arguments.days.last(today),
+                                  print, error);
   };
   counters.read(work);
   if (!outputFailure.empty() || !complete) {
@@ -299,8 +290,7 @@ void addImport(CLI::App& command) {
 
 void addDump(CLI::App& command) {
   const auto arguments = std::make_shared<CounterArguments>();
-  addDay(command, "--from", arguments->from, "The first day");
-  addDay(command, "--to", arguments->to, "The last day");
+  addDays(command, arguments->days);
   command.callback([arguments] { dumpLines(*arguments); });
 }
 

@@ -26,8 +26,7 @@ using DayLimits = std::numeric_limits<std::int32_t>;
 struct WantedRows {
   std::string key;
   bool isExact = false;
-  std::optional<GivenDay> from;
-  std::optional<GivenDay> to;
+  GivenDays days;
 };
 
 /// Takes a row as JSON, with its figures as text for people.
@@ -107,8 +106,6 @@ void printRows(const WantedRows& wanted) {
   const bool isPrefix = !wanted.isExact && wanted.key.ends_with('*');
   const std::string prefix = wanted.key.substr(0, wanted.key.size() - (isPrefix ? 1 : 0));
   const std::int32_t today = device->tallybook().TBDaysSince1970();
-  const std::int32_t from = wanted.from ? wanted.from->on(today) : DayLimits::min();
-  const std::int32_t to = wanted.to ? wanted.to->on(today) : DayLimits::max();
   Table table({{"Date"}, {"Day", Table::Align::Right}, {"Kind"}, {"Key"}, {"Value"}});
   const TakeRow take = [&table](Json&& row, const std::string& figures) {
     if (invocation().json) {
@@ -124,8 +121,8 @@ void printRows(const WantedRows& wanted) {
   };
   std::string note;
   const auto read = [&](CounterStore& store) {
-    std::optional<std::int32_t> day = store.nextDay(std::int64_t{from} - 1);
-    for (; day && *day <= to; day = store.nextDay(*day)) {
+    std::optional<std::int32_t> day = store.nextDay(std::int64_t{wanted.days.first(today)} - 1);
+    for (; day && *day <= wanted.days.last(today); day = store.nextDay(*day)) {
       takeDay(store, *day, prefix, !isPrefix, take);
     }
     if (table.empty() && !invocation().json) {
@@ -148,8 +145,7 @@ void addGetCounters(CLI::App& command) {
           ->required(),
       countedKeys);
   command.add_flag("--exact", wanted->isExact, "A * at the end belongs to the key");
-  addDay(command, "--from", wanted->from, "The first day");
-  addDay(command, "--to", wanted->to, "The last day");
+  addDays(command, wanted->days);
   command.callback([wanted] { printRows(*wanted); });
 }
 

@@ -5,7 +5,6 @@
 #include <cstdint>
 #include <iostream>
 #include <iterator>
-#include <limits>
 
 #include "access/CommandDevice.h"
 #include "access/Complaints.h"
@@ -23,8 +22,7 @@ constexpr const char* kFormats[] = {"lines", "csv", "openmetrics"};
 struct Export {
   std::string format = "lines";
   std::string device;
-  std::optional<GivenDay> from;
-  std::optional<GivenDay> to;
+  GivenDays days;
 };
 
 std::string figureRows(const LogExport& source, const SubmittedLog& log) {
@@ -51,10 +49,6 @@ void exportLogs(const Export& wanted) {
   Complaints complaints;
   const auto platform = openDeviceReadOnly(complaints);
   const std::int32_t today = platform->tallybook().TBDaysSince1970();
-  const std::int32_t from =
-      wanted.from ? wanted.from->on(today) : std::numeric_limits<std::int32_t>::min();
-  const std::int32_t to =
-      wanted.to ? wanted.to->on(today) : std::numeric_limits<std::int32_t>::max();
   const LogExport source(*platform, wanted.device);
   const bool isCsv = wanted.format == "csv";
   if (isCsv) {
@@ -63,7 +57,7 @@ void exportLogs(const Export& wanted) {
   std::optional<SubmittedLog> newest;
   std::vector<UnreadableLog> refused;
   const auto print = [&](SubmittedLog&& log) {
-    if (log.day < from || log.day > to) {
+    if (log.day < wanted.days.first(today) || log.day > wanted.days.last(today)) {
       return;
     }
     std::string why;
@@ -83,10 +77,7 @@ void exportLogs(const Export& wanted) {
     std::cout << metricsText(newest->day, newest->document);
   }
   unreadable.insert(unreadable.end(), refused.begin(), refused.end());
-  if (!unreadable.empty()) {
-    nameUnreadable(std::span(unreadable).first(unreadable.size() - 1));
-    throw CommandFailure(unreadable.back().name + ": " + unreadable.back().why);
-  }
+  failIfUnreadable(unreadable);
 }
 
 }  // namespace
@@ -102,8 +93,7 @@ void addExportCommand(CLI::App& command) {
                    ->check(CLI::IsMember(formats)),
                [formats] { return formats; });
   addDeviceName(command, wanted->device);
-  addDay(command, "--from", wanted->from, "The first day");
-  addDay(command, "--to", wanted->to, "The last day");
+  addDays(command, wanted->days);
   command.callback([wanted] { exportLogs(*wanted); });
 }
 

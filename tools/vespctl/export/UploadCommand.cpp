@@ -154,10 +154,7 @@ class Uploading {
       nameUnreadable(_unreadable);
       throw CommandFailure(_failure);
     }
-    if (!_unreadable.empty()) {
-      nameUnreadable(std::span(_unreadable).first(_unreadable.size() - 1));
-      throw CommandFailure(_unreadable.back().name + ": " + _unreadable.back().why);
-    }
+    failIfUnreadable(_unreadable);
   }
 
  private:

@@ -9,7 +9,6 @@
 #include <optional>
 #include <set>
 #include <string>
-#include <string_view>
 #include <vector>
 
 #include "listen/StatsdLine.h"

@@ -1,7 +1,5 @@
 #include "outbox/SubmittedLogs.h"
 
-#include <cstdio>
-
 #include "access/CommandDevice.h"
 #include "platform/host/device/LiveSystem.h"
 #include "platform/host/device/Pseudonym.h"
@@ -29,6 +27,13 @@ std::string exportedName(const HostPlatform& device) {
 void nameUnreadable(std::span<const UnreadableLog> logs) {
   for (const auto& [name, why, wasRead] : logs) {
     complain(name + ": " + why);
+  }
+}
+
+void failIfUnreadable(std::span<const UnreadableLog> logs) {
+  if (!logs.empty()) {
+    nameUnreadable(logs.first(logs.size() - 1));
+    throw CommandFailure(logs.back().name + ": " + logs.back().why);
   }
 }
 

@@ -25,5 +25,7 @@ std::string exportedName(const HostPlatform& device);
 
 /// Names unreadable logs on standard error.
 void nameUnreadable(std::span<const UnreadableLog> logs);
+/// The same; throws `CommandFailure` with the last one.
+void failIfUnreadable(std::span<const UnreadableLog> logs);
 
 }  // namespace vesprun

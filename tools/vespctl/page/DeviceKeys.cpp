@@ -25,6 +25,11 @@ std::string rangeText(const Unusual& unusual, Unit unit) {
                                                  quantity(unusual.highest, unit) + ")";
 }
 
+/// The line of an item in the list of changes.
+Element changeLine(const std::vector<DayValue>& values, Period period) {
+  return sparkline(pointsOf(values), period, 1, "its days");
+}
+
 std::string wordsOrKey(const KeyWords& words, std::string_view key) {
   if (!words.words.empty()) {
     return words.words;
@@ -94,12 +99,13 @@ std::vector<KeySeries> seriesOf(const std::vector<PageData::DistributionDay>& di
   return all;
 }
 
-Element changeLine(const std::vector<DayValue>& values, Period period) {
+std::vector<Point> pointsOf(const std::vector<DayValue>& values) {
   std::vector<Point> points;
+  points.reserve(values.size());
   for (const DayValue& value : values) {
     points.push_back({static_cast<double>(value.day), value.value});
   }
-  return sparkline(points, period, 1, "its days");
+  return points;
 }
 
 KeyChanges::KeyChanges(const PageData& data, const PageDays& days) : _days(days) {

@@ -2,8 +2,6 @@
 
 #include <cstdint>
 #include <map>
-#include <optional>
-#include <string>
 #include <string_view>
 #include <vector>
 
@@ -55,8 +53,6 @@ struct KeyChanges {
   std::vector<ChangeItem> earlier;  ///< in the week before
 
  private:
-  struct Appearance;
-
   void judge(std::string_view key, const std::vector<KeySeries>& all);
   void judgePresence(std::string_view key, const std::vector<DayValue>& values);
   void addPresences(std::vector<ChangeItem>& presences, const char* one, const char* many);
@@ -68,7 +64,6 @@ struct KeyChanges {
   std::vector<ChangeItem> _gone;
 };
 
-/// The line of some values, for the list of changes.
-Element changeLine(const std::vector<DayValue>& values, Period period);
+std::vector<Point> pointsOf(const std::vector<DayValue>& values);
 
 }  // namespace vesprun

@@ -14,15 +14,6 @@ constexpr std::size_t kMaxValues = 400;  // listed for one key
 Element tab() { return Element::constant("\t"); }
 Element lineEnd() { return Element::constant("\n"); }
 
-std::vector<Point> pointsOf(const std::vector<DayValue>& values) {
-  std::vector<Point> points;
-  points.reserve(values.size());
-  for (const DayValue& value : values) {
-    points.push_back({static_cast<double>(value.day), value.value});
-  }
-  return points;
-}
-
 /// The median of the 28 days before the newest.
 std::string usualText(const std::vector<DayValue>& values, Unit unit) {
   constexpr std::size_t kDays = 28;
@@ -54,10 +45,6 @@ Element valueList(const PageData::Series& series) {
   }
   return list;
 }
-
-struct Ends {
-  std::string lowest, highest;
-};
 
 KeyCourse scalarCourse(std::string_view key, const PageData::Series& series, const PageDays& days,
                        bool isDetailed) {

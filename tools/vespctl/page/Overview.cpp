@@ -24,14 +24,15 @@ constexpr double kRankOfOldGap = 1;
 constexpr std::int32_t kRecentDays = 28;
 constexpr std::int32_t kWeek = 7;
 
-void addFindings(std::vector<ChangeItem>& items, const std::vector<PageFinding>& findings) {
+void addFindings(std::vector<ChangeItem>& items, const std::vector<Finding>& findings) {
   constexpr std::size_t kMaxAlone = 4;
   double rank = kRankOfFinding;
   for (std::size_t i = 0; i < findings.size(); ++i) {
     if (i < kMaxAlone) {
-      items.push_back({rank--, Level::Act, findings[i].finding, "", "", findings[i].detail});
+      items.push_back(
+          {rank--, Level::Act, std::string(findings[i].finding), "", "", findings[i].detail});
     } else {
-      items.back().then += "; " + findings[i].finding;
+      items.back().then.append("; ").append(findings[i].finding);
     }
   }
 }

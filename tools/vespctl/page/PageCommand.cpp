@@ -11,7 +11,6 @@
 #include "page/Page.h"
 #include "page/PageFile.h"
 #include "platform/host/device/LiveSystem.h"
-#include "status/Findings.h"
 
 namespace vesprun {
 namespace {
@@ -51,10 +50,11 @@ void makePage(const WantedPage& wanted) {
   }
   opened.complaints.print();
   nameUnreadable(data.unreadable);
-  // A detail may name keys or tell of the system log.
-  for (Finding& finding : readStatus(*opened.device).findings) {
-    about.findings.push_back(
-        {std::string(finding.finding), wanted.isShared ? "" : std::move(finding.detail)});
+  about.findings = readStatus(*opened.device).findings;
+  for (Finding& finding : about.findings) {
+    if (wanted.isShared) {
+      finding.detail.clear();  // it may name keys or tell of the system log
+    }
   }
   if (data.days.empty()) {
     about.firstReport = whenFirstReport(*opened.device);

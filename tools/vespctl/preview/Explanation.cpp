@@ -1,7 +1,6 @@
 #include "preview/Explanation.h"
 
 #include <algorithm>
-#include <limits>
 #include <vector>
 
 #include "access/ReadOnlyDevice.h"
@@ -158,10 +157,8 @@ std::optional<Json> explainKey(const TBConfig* config, std::string_view key) {
     }
   }
   bool seen = false;
-  using Days = std::numeric_limits<std::int32_t>;
   Json values = Json::array();
   const bool isRead = forEachRow(
-                          Days::min(), Days::max(),
                           [&](bool isDistribution, std::string_view rowKey) {
                             seen = seen || (isDistribution != kIsScalar && rowKey == key);
                           },
@@ -213,8 +210,7 @@ void printExplanation(const Json& explanation, bool hasWhitelist) {
 std::string whetherCounted(std::string_view key) {
   NearestName nearest(key);
   bool isCounted = false;
-  using Days = std::numeric_limits<std::int32_t>;
-  forEachRow(Days::min(), Days::max(), [&](bool, std::string_view counted) {
+  forEachRow([&](bool, std::string_view counted) {
     isCounted = isCounted || counted == key;
     if (!isCounted) {
       nearest.take(counted);

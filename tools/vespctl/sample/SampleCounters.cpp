@@ -2,7 +2,6 @@
 
 #include <chrono>
 #include <fstream>
-#include <functional>
 #include <sstream>
 #include <thread>
 
@@ -19,17 +18,6 @@ void forEachLine(const char* file, const Take& take) {
     std::istringstream words(line);
     take(words);
   }
-}
-
-/// The figures that `wanted` takes, as they stand now.
-std::map<std::string, std::int64_t> figures(const std::function<bool(const LinuxFigure&)>& wanted) {
-  std::map<std::string, std::int64_t> merged;
-  for (const FigureReading& reading : readFigures({}, wanted).figures) {
-    if (reading.value != kUnread) {
-      mergeFigure(merged, *reading.figure, reading.key, reading.value);
-    }
-  }
-  return merged;
 }
 
 }  // namespace
@@ -68,7 +56,8 @@ std::optional<std::int64_t> startOfSystem() {
 }
 
 std::map<std::string, std::int64_t> readKernelCounters() {
-  return figures([](const LinuxFigure& figure) { return figure.kind == FigureKind::Counter; });
+  return mergedFigures(
+      [](const LinuxFigure& figure) { return figure.kind == FigureKind::Counter; });
 }
 
 std::map<std::string, std::vector<double>> takeReadingBurst() {
@@ -82,7 +71,7 @@ std::map<std::string, std::vector<double>> takeReadingBurst() {
     const std::chrono::duration<double, std::micro> late = SteadyClock::now() - start - kPause;
     readings["linux.latency.wakeUpMicroseconds"].push_back(late.count());
     for (const auto& [key, value] :
-         figures([](const LinuxFigure& figure) { return figure.file == "/proc/meminfo"; })) {
+         mergedFigures([](const LinuxFigure& figure) { return figure.file == "/proc/meminfo"; })) {
       readings[key].push_back(static_cast<double>(value));
     }
   }

@@ -14,8 +14,6 @@
 namespace vesprun {
 namespace {
 
-using Json = nlohmann::ordered_json;
-
 constexpr std::uint64_t kHoursInUse = 10'000;  // with power
 constexpr std::uint64_t kHoursSinceFormat = 12'000;
 constexpr std::uint64_t kSecondsPerHour = 3600;

@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <bit>
 #include <cmath>
-#include <compare>
 #include <limits>
 #include <tuple>
 #include <unordered_map>

@@ -2,7 +2,6 @@
 
 #include <set>
 #include <string>
-#include <string_view>
 #include <vector>
 
 #include "config/TBConfig.h"

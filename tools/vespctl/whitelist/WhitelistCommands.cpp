@@ -2,7 +2,6 @@
 
 #include <chrono>
 #include <iostream>
-#include <limits>
 
 #include "access/CommandDevice.h"
 #include "access/ReadOnlyDevice.h"
@@ -162,11 +161,10 @@ WhitelistChanges changesOnDevice(const Complaints& complaints, const std::string
     complaints.fail(name + ": is not a whitelist");
   }
   const std::unique_ptr<TBConfig> before = TBConfig::init();
-  using Days = std::numeric_limits<std::int32_t>;
   const std::vector<std::string_view> sources = ownScalarKeys();
   KeySet scalars(sources.begin(), sources.end());
   KeySet distributions;
-  if (!forEachRow(Days::min(), Days::max(), [&](bool isDistribution, std::string_view key) {
+  if (!forEachRow([&](bool isDistribution, std::string_view key) {
         (isDistribution ? distributions : scalars).emplace(key);
       })) {
     complaints.fail(kUnreadableCounters);

@@ -325,21 +325,11 @@ CounterStore::Rows CounterStore::rowsBefore(std::int64_t day) {
   return rows;
 }
 
-CounterStore::Rows CounterStore::removeBefore(std::int64_t day) {
-  Rows rows = rowsBefore(day);
-  removeRows("day < ?", day);
-  return rows;
-}
-
-void CounterStore::removeDay(std::int32_t day) { removeRows("day = ?", day); }
-
-void CounterStore::removeRows(const std::string& condition, std::int64_t day) {
-  const std::string statements[] = {
-      "DELETE FROM chunk WHERE distribution IN (SELECT id FROM distribution WHERE " + condition +
-          ")",
-      "DELETE FROM distribution WHERE " + condition, "DELETE FROM scalar WHERE " + condition};
-  for (const std::string& sql : statements) {
-    SqliteStatement(_connection, sql.c_str()).bind(1, day).run();
+void CounterStore::removeDay(std::int32_t day) {
+  for (const char* const sql :
+       {"DELETE FROM chunk WHERE distribution IN (SELECT id FROM distribution WHERE day = ?)",
+        "DELETE FROM distribution WHERE day = ?", "DELETE FROM scalar WHERE day = ?"}) {
+    SqliteStatement(_connection, sql).bind(1, day).run();
   }
 }
 

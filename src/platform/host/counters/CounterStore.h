@@ -2,7 +2,6 @@
 
 #include <chrono>
 #include <cstdint>
-#include <functional>
 #include <memory>
 #include <optional>
 #include <span>
@@ -81,9 +80,6 @@ class CounterStore {
   /// How many rows there are of days before `day`.
   Rows rowsBefore(std::int64_t day);
 
-  /// Removes these rows.
-  Rows removeBefore(std::int64_t day);
-
   /// Removes all rows of a day.
   void removeDay(std::int32_t day);
 
@@ -119,7 +115,6 @@ class CounterStore {
   struct Writer;
 
   void open();
-  void removeRows(const std::string& condition, std::int64_t day);
   template <typename Deliver>
   void forEachRow(const char* what, const char* select, std::string_view keyPrefix,
                   std::int32_t minDay, std::int32_t maxDay, const Deliver& deliver);

@@ -328,6 +328,17 @@ FigureReadings readFigures(const std::string& root,
   return readings;
 }
 
+std::map<std::string, std::int64_t> mergedFigures(
+    const std::function<bool(const LinuxFigure&)>& wanted) {
+  std::map<std::string, std::int64_t> merged;
+  for (const FigureReading& reading : readFigures("", wanted).figures) {
+    if (reading.value != kUnread) {
+      mergeFigure(merged, *reading.figure, reading.key, reading.value);
+    }
+  }
+  return merged;
+}
+
 void mergeFigure(std::map<std::string, std::int64_t>& figures, const LinuxFigure& figure,
                  const std::string& key, std::int64_t value) {
   const auto [entry, isNew] = figures.try_emplace(key, value);

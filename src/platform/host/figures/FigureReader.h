@@ -37,6 +37,10 @@ struct FigureReadings {
 FigureReadings readFigures(const std::string& root,
                            const std::function<bool(const LinuxFigure&)>& wanted);
 
+/// Those of the running system by key, merged, without what could not be read.
+std::map<std::string, std::int64_t> mergedFigures(
+    const std::function<bool(const LinuxFigure&)>& wanted);
+
 /// Adds a figure to those by key: the sum of those with one key counts, of gauges the highest.
 void mergeFigure(std::map<std::string, std::int64_t>& figures, const LinuxFigure& figure,
                  const std::string& key, std::int64_t value);

@@ -1,7 +1,5 @@
 #pragma once
 
-#include <map>
-
 #include "platform/Tapline.h"
 #include "platform/host/device/DeviceDescription.h"
 #include "platform/host/figures/FigureReader.h"
@@ -41,13 +39,8 @@ class HostTapline final : public Tapline {
       return figure.key.starts_with("linux.temperature.") ||
              figure.key.starts_with("linux.pressure.");
     };
-    std::map<std::string, std::int64_t> values;
-    for (const FigureReading& reading : readFigures("", isChannel).figures) {
-      mergeFigure(values, *reading.figure, reading.key, reading.value);
-    }
     std::vector<ChannelDescription> channels;
-    channels.reserve(values.size());
-    for (const auto& [name, value] : values) {
+    for (const auto& [name, value] : mergedFigures(isChannel)) {
       channels.push_back({name, value});
     }
     return channels;

@@ -178,25 +178,32 @@ TEST_F(TallybookTest, GivesTheRoomOfRemovedDaysBack) {
     lines += "sample\t" + std::to_string(i % 20) + "\td\t0.5\t" + std::to_string(i) + '\n';
   }
   lines += "scalar\t20\tk\t1\nsample\t21\td\t1\t1\n";
+  const auto removeBefore = [](CounterStore& store, std::int32_t day) {
+    CounterStore::Rows rows = store.rowsBefore(day);
+    std::ranges::for_each(rows.days, [&](std::int32_t old) { store.removeDay(old); });
+    return rows;
+  };
   for (const char* const form : {"", "PRAGMA auto_vacuum = NONE; VACUUM"}) {
     EXPECT_TRUE(import(lines)) << error;
     SqliteConnection(folder.path(kFile), kShortWait).execute(form);
     const auto before = std::filesystem::file_size(folder.path(kFile));
     HostTallybook tallybook(device, clock, preferences, log);
-    const auto remove = [](CounterStore& store) {
+    const auto remove = [&](CounterStore& store) {
       store.appendSamples(0, "added and removed at once", {});
-      const CounterStore::Rows removed = store.removeBefore(20);
+      const CounterStore::Rows removed = removeBefore(store, 20);
       EXPECT_THAT(removed.days, SizeIs(20));
       EXPECT_EQ(removed.distributions, 21);
       store.returnFreeSpace();
       store.setScalar(19, "later", 2);
-      EXPECT_EQ(store.removeBefore(20).scalars, 1);
+      EXPECT_EQ(removeBefore(store, 20).scalars, 1);
       return true;
     };
     EXPECT_TRUE(tallybook.write(remove, error)) << error;
     EXPECT_EQ(dump(), "scalar\t20\tk\t1\nsample\t21\td\t1\t1\n");
     EXPECT_LT(std::filesystem::file_size(folder.path(kFile)), before / 3) << form;
-    const auto removeAll = [](CounterStore& store) { return store.removeBefore(30).scalars == 1; };
+    const auto removeAll = [&](CounterStore& store) {
+      return removeBefore(store, 30).scalars == 1;
+    };
     EXPECT_TRUE(tallybook.write(removeAll, error)) << error;
   }
 }
