@@ -4,6 +4,7 @@
 #include <regex>
 #include <vector>
 
+#include "platform/host/outbox/LogPruning.h"
 #include "vespctl/VespctlTest.h"
 
 namespace vesprun {
@@ -227,6 +228,10 @@ TEST_F(DaysTest, PruneRemovesTheOldestLogsUntilTheOutboxIsSmallEnough) {
   print("run -- -f");
   EXPECT_THAT(folder.names(logs), ElementsAre("10001-193-log-aggregated.header.json",
                                               "10001-193-log-aggregated.ptree"));
+  const auto device = DeviceDirectory::open(folder.path("device"), error)->readOnly();
+  int steps = 0;
+  LogPruning(device, {}, [&steps] { ++steps; }).removeUntilBelow(0);
+  EXPECT_EQ(steps, 2) << "one log is read and removed";
   EXPECT_THAT(print("prune --json --outbox-size 0"),
               HasSubstr("[\"10001-193-log-aggregated.ptree\"]"));
 }

@@ -235,7 +235,8 @@ def check_hostile(program):
         for unseen in "\u202e\u2066\u200b\U000e0041\x1b\x00":
             assert unseen not in page, repr(unseen)
         for shown in ["s.&lt;script&gt;", "\\u{202E}cod.exe", "&amp;lt;b&amp;gt;", "d.שלום", "\\u{0}\\u{1B}", "s." +
-                      HOSTILE[-1].replace("<i>", "&lt;i&gt;"), "0009-193-log-aggregated.ptree", "1 line cannot be read"]:
+                      HOSTILE[-1].replace("<i>", "&lt;i&gt;"), "0009-193-log-aggregated.ptree", "1 line cannot be read",
+                      "javascript:alert(1) javascript:alert(1)"]:  # time and text of an error
             assert shown in page, shown
         shared = device.page("--share")
         for kept in ["kept.alone", "id=left-out", "Errors in the system log"]:

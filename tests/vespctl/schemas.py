@@ -96,5 +96,7 @@ assert json.loads(run("decode ftl-keys before after --json", (0,))) == [
 assert run("decode ftl-keys after").endswith(
     "Not decoded of 60 bytes: 12 bytes from offset 48 on: the records end there.\n")
 assert run("decode ftl-keys before").endswith("All of the 48 bytes were decoded.\n")
+pathlib.Path("msp").write_bytes(struct.pack("<HHQ", 4096, 8, 1))  # a record of one value
+assert "Not decoded of 12 bytes: 4 bytes in 1 records" in run("decode msp msp")
 for words in with_json - silent:
     assert any((known + " ").startswith(words + " ") for known in seen), words + " has no schema"

@@ -558,7 +558,7 @@ TEST_F(TallybookTest, NeverTakesPermissionsOrAFullDiskForDamage) {
     chmod(path.c_str(), 0755);
     path.resize(path.rfind('/'));
   }
-  const std::pair<mode_t, mode_t> modes[] = {{0444, 0555}, {0666, 0555}, {0, 0755}};
+  const std::pair<mode_t, mode_t> modes[] = {{0444, 0555}, {0666, 0555}, {0, 0755}, {0, 0444}};
   for (const auto& [fileMode, folderMode] : modes) {
     chmod(folder.path(kFile).c_str(), fileMode);
     chmod(folder.path(kFolder).c_str(), folderMode);

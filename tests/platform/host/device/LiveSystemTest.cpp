@@ -4,10 +4,13 @@
 #include <sys/sysinfo.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cstdlib>
+#include <filesystem>
 
 #include "common/LittleEndian.h"
 #include "platform/host/device/Pseudonym.h"
+#include "support/TemporaryFolder.h"
 #include "support/TestDevice.h"
 
 namespace vesprun {
@@ -44,6 +47,23 @@ TEST(LiveSystem, ADigestStandsForTheMachine) {
             "5bdcc146bf60754e6a042426089575c7");
   const std::string machine = live::machineIdentifier();
   EXPECT_EQ(identifierOf(""), machine.empty() ? "" : pseudonymOf(machine, "vesprun system"));
+}
+
+TEST(LiveSystem, AppsAreTheDesktopEntriesOfTheSystemAndTheUser) {
+  const TemporaryFolder home;
+  home.write(".local/share/applications/own.desktop", "");
+  setenv("HOME", home.path().c_str(), 1);
+  std::size_t ofSystem = 0;
+  for (const char* const folder : {"/usr/share/applications", "/usr/local/share/applications"}) {
+    std::error_code missing;
+    for (const auto& entry : std::filesystem::directory_iterator(folder, missing)) {
+      ofSystem += entry.path().extension() == ".desktop" ? 1U : 0U;
+    }
+  }
+  const std::vector<ApplicationDescription> apps = live::applications();
+  ASSERT_EQ(apps.size(), ofSystem + 1);
+  EXPECT_TRUE(apps.back().bundle == "own" && apps.back().user);
+  EXPECT_EQ(std::ranges::count(apps, true, &ApplicationDescription::user), 1);
 }
 
 TEST(LiveSystem, PrefersTheLanguagesOfTheProcess) {

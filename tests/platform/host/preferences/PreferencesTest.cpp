@@ -136,6 +136,13 @@ TEST_F(PreferencesTest, NeverWriteOverWhatCannotBeRead) {
   unlink(folder.path(kFile).c_str());
   EXPECT_TRUE(preferences.LGSPreferencesSynchronize("a"));  // the change has waited
   EXPECT_EQ(found(), (PropertyDict{{"first", 1}}));
+  const std::string longest(245, 'b');  // no longer name can be given to what is kept aside
+  const std::string malformed = std::string(kFolder) + '/' + longest + ".ptree";
+  folder.write(malformed, "no document");
+  preferences.LGSPreferencesSetValue("first", 1, longest);
+  EXPECT_FALSE(preferences.LGSPreferencesSynchronize(longest));
+  EXPECT_THAT(log.messages.back(), EndsWith("-20240305T091502Z: File name too long"));
+  EXPECT_EQ(folder.read(malformed), "no document");
 }
 
 TEST_F(PreferencesTest, AreNotWrittenWhileAnotherProcessKeepsTheFolder) {
