@@ -64,6 +64,7 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
       {1, "counters import bad", "bad: line 1: \"nan(x)\" is not a double"},
       {1, "send apps apps", "apps: app 2: \"uuid\": not a UUID text"},
       {1, "send apps - <<<'[7]'", "standard input: app 1: not a dictionary"},
+      {1, "send apps - <<<'[{\"x\": 1}]'", "app 1: \"x\": unknown entry"},
       {1, "send apps - <<<'[{\"arch\": true}]'", "app 1: \"arch\": not a signed 64-bit"},
       {1, "nand disk >&-", "standard output cannot be written"},
   };
