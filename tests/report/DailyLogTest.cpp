@@ -1,6 +1,7 @@
 #include "common/TextForm.h"
 #include "platform/host/counters/CounterStore.h"
 #include "platform/host/counters/HostTallybook.h"
+#include "report/LogSubmission.h"
 #include "report/TBReport.h"
 #include "support/TestDevice.h"
 
@@ -70,6 +71,7 @@ TEST_F(DailyLogTest, SurvivesARefusedSubmissionAndDocument) {
   const PropertyValue data(PropertyArray{PropertyDict{{"bundle_id", "\x01"}}});
   const AppInfoList unwritable(&data);
   write(&unwritable);
+  EXPECT_FALSE(submitDailyLog({}, &unwritable));
   EXPECT_THAT(device->log().back(),
               ::testing::StartsWith("error: Could not create aggregated ptree: "));
   EXPECT_EQ(lastOSVersion(), std::nullopt);

@@ -80,13 +80,17 @@ TEST(DatabaseStatistics, TakeTheCorruptionCountOnce) {
       return device.platform().preferences().LGSPreferencesGetIntegerValue(
           "DatabaseCorruptionCount", "com.quill.aggregated");
     };
-    device.platform().preferences().LGSPreferencesSetValue("DatabaseCorruptionCount", 3,
-                                                           "com.quill.aggregated");
+    const auto setCount = [&](int corruptions) {
+      device.platform().preferences().LGSPreferencesSetValue("DatabaseCorruptionCount", corruptions,
+                                                             "com.quill.aggregated");
+    };
+    setCount(3);
     EXPECT_EQ(scalarsOf(takeDatabaseSize), expected(-1, log.empty() ? 3 : 0));
     EXPECT_EQ(count(), log.empty() ? 0 : 3);
     EXPECT_EQ(device.log(), log);
     device.write("var/mobile/Library/Tallybook/TBDataStore.sqlitedb", std::string(3 << 20, 'x'));
-    EXPECT_EQ(scalarsOf(takeDatabaseSize), expected(3, 0));
+    setCount(4);
+    EXPECT_EQ(scalarsOf(takeDatabaseSize), expected(3, log.empty() ? 4 : 0));
     EXPECT_EQ(device.log().size(), 2 * log.size());
   }
 }
