@@ -198,6 +198,22 @@ TEST(DataUsage, GrowthIsCountedOnceWhateverIsKilledInBetween) {
   const std::string preferences = "var/mobile/Library/Preferences/" + std::string(kDomain);
   const std::string marked = device.read(preferences + ".ptree");
 
+  // As long as the counters have no room, or cannot be read, the mark stays.
+  {
+    const FileSizeLimit limit(4096);
+    device.platform();
+    CollectDataUsage();
+    device.endProcess();
+  }
+  const std::string database = "var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
+  std::filesystem::rename(device.path(database), device.path("aside"));
+  device.write(database + "/folder", "");
+  device.platform();
+  CollectDataUsage();
+  device.endProcess();
+  std::filesystem::remove_all(device.path(database));
+  std::filesystem::rename(device.path("aside"), device.path(database));
+
   device.platform();
   CollectDataUsage();
   EXPECT_EQ(todaysScalars(device), kGrowth);

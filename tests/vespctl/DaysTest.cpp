@@ -322,19 +322,24 @@ TEST_F(DaysTest, PruneKeepsADailyLogThatItCannotNote) {
   addLog(1, 4, "2024-03-01");
   folder.write(logs + "/0002-165-S.log", "");
   folder.write(logs + "/0003-193-log-aggregated.ptree", "no daily log");
+  const std::string tooLarge = logs + "/0004-193-log-aggregated.ptree";
+  shell("truncate -s 257M " + tooLarge);
   std::filesystem::create_symlink("/dev/full", folder.path("device/outbox/pruned.jsonl"));
   EXPECT_EQ(run("prune --json --outbox-size 0"), 1);
   EXPECT_THAT(error, HasSubstr("pruned.jsonl: "));
   EXPECT_THAT(output, HasSubstr("[\"0002-165-S.log\"]"));
   EXPECT_THAT(folder.names(logs),
-              ElementsAre("0001-193-log-aggregated.ptree", "0003-193-log-aggregated.ptree"));
+              ElementsAre("0001-193-log-aggregated.ptree", "0003-193-log-aggregated.ptree",
+                          "0004-193-log-aggregated.ptree"));
   std::filesystem::remove(folder.path("device/outbox/pruned.jsonl"));
   folder.write("device/outbox/pruned.jsonl", "");
   std::filesystem::create_hard_link(folder.path("device/outbox/pruned.jsonl"),
                                     folder.path("second"));
   EXPECT_EQ(run("prune --json --outbox-size 0"), 1);
-  EXPECT_THAT(folder.names(logs), ElementsAre("0001-193-log-aggregated.ptree"));
+  EXPECT_THAT(folder.names(logs),
+              ElementsAre("0001-193-log-aggregated.ptree", "0004-193-log-aggregated.ptree"));
   std::filesystem::remove(folder.path("second"));
+  std::filesystem::remove(folder.path(tooLarge));
   EXPECT_THAT(print("prune --json --outbox-size 0"),
               HasSubstr("[\"0001-193-log-aggregated.ptree\"]"));
   // What cannot be listed has not gone.

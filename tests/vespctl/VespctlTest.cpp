@@ -61,6 +61,7 @@ TEST_F(VespctlTest, SaysWhatIsWrong) {
       {1, "ptree <(echo '<dict>')", "line 1: "},
       {1, "decode base nowhere", "nowhere: No such file"},
       {1, "prefs get d k", "no key \"k\" in domain \"d\""},
+      {1, "counters import - </tmp", "line 1: Is a directory"},
       {1, "counters import bad", "bad: line 1: \"nan(x)\" is not a double"},
       {1, "send apps apps", "apps: app 2: \"uuid\": not a UUID text"},
       {1, "send apps - <<<'[7]'", "standard input: app 1: not a dictionary"},

@@ -44,6 +44,9 @@ TEST(HostPlatform, SaysWhyADeviceCannotBeOpened) {
   folder.write("device.json", R"({"usage": 1})");
   EXPECT_EQ(HostPlatform::open(folder.path(), error), nullptr);
   EXPECT_THAT(error, testing::EndsWith("device.json: usage: not a dictionary"));
+  folder.write("device.json", "{}" + std::string(4 << 20, ' '));
+  EXPECT_EQ(HostPlatform::open(folder.path(), error), nullptr);
+  EXPECT_THAT(error, testing::EndsWith("device.json: larger than 4194304 bytes"));
 }
 
 TEST(HostPlatform, LeavesTheTimeZoneOfTheProcess) {

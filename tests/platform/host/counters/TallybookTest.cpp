@@ -19,6 +19,8 @@ using ::testing::Contains, ::testing::ElementsAre, ::testing::HasSubstr, ::testi
 
 constexpr const char* kFolder = "var/mobile/Library/Tallybook";
 constexpr const char* kFile = "var/mobile/Library/Tallybook/TBDataStore.sqlitedb";
+constexpr const char* kAggregated = "com.quill.aggregated";
+constexpr const char* kCorruptionCount = "DatabaseCorruptionCount";
 constexpr std::int32_t kToday = 19787;
 constexpr std::int64_t kMax = std::numeric_limits<std::int64_t>::max();
 constexpr std::chrono::milliseconds kShortWait{50};
@@ -64,7 +66,7 @@ class TallybookTest : public HostServiceTest {
 
   std::int64_t corruptions() {
     return HostPreferences(device, clock, log)
-        .LGSPreferencesGetIntegerValue("DatabaseCorruptionCount", "com.quill.aggregated");
+        .LGSPreferencesGetIntegerValue(kCorruptionCount, kAggregated);
   }
 
   HostClock clock{Date{1709630102, 500}};  // 2024-03-05 09:15:02
@@ -221,6 +223,8 @@ TEST_F(TallybookTest, KeepsNothingOfAnImportWithABadLine) {
     EXPECT_THAT(error, StartsWith("line 3: ")) << bad;
     EXPECT_EQ(dump(), good);
   }
+  EXPECT_FALSE(import(std::string(3 << 20, 'x')));
+  EXPECT_EQ(error, "line 1: longer than 2 MiB");
 }
 
 TEST_F(TallybookTest, RefusesKeysThatNoDocumentCarries) {
@@ -323,7 +327,12 @@ TEST_F(TallybookTest, MovesAsideWhatHasOtherTablesOrRowsThanOurs) {
   }
   add("k", 1);
   SqliteConnection(folder.path(kFile), kShortWait).execute(endless.c_str());
+  preferences.LGSPreferencesGetIntegerValue(kCorruptionCount, kAggregated);  // and remembers it
+  HostPreferences others(device, clock, log);
+  others.LGSPreferencesSetValue(kCorruptionCount, 70, kAggregated);
+  others.LGSPreferencesSynchronize(kAggregated);
   add("k", 2);
+  EXPECT_EQ(corruptions(), 71) << "others count, too";
   EXPECT_EQ(dump(), scalar(2)) << "what cannot be added to";
   ASSERT_TRUE(import("sample\t19787\tk\t1\t1\n"));
   SqliteConnection(folder.path(kFile), kShortWait).execute("UPDATE chunk SET samples = x'00'");
@@ -542,6 +551,7 @@ TEST_F(TallybookTest, ReplacesOnlyTheFileThatWasDamagedAndNobodyUses) {
   EXPECT_TRUE(file.read(replace, error, damage)) << error;
   folder.write(std::string(kFile) + "-journal", "");
   EXPECT_EQ(file.replace(*damage, error), "");
+  EXPECT_EQ(file.replace({status.st_dev + 1, status.st_ino, ""}, error), "") << "on another disk";
   EXPECT_THAT(folder.names(kFolder), Contains("TBDataStore.sqlitedb-journal"));
   EXPECT_EQ(dump(), scalar(1));
 }
