@@ -203,8 +203,12 @@ TEST(ServiceOrder, ADayIsServedOnceWhateverFails) {
   EXPECT_NO_THROW(runDayCheck(nullptr));
 }
 
-TEST(ServiceOrder, ListenerModeNeedsNoListener) {
+TEST(ServiceOrder, ListenerModeNeedsNeitherListenerNorLoop) {
+  struct FailingLoop : MainLoop {
+    SliceResult runMainLoopSlice(double /*seconds*/) override { throw std::bad_alloc(); }
+  } loop;
   NotedDevice device;
+  device.platform().mainLoop = loop;
   device.failing = "listener";
   aaiRequested = true;
   runListenerMode(0.01);
