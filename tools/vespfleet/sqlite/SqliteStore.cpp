@@ -67,17 +67,24 @@ std::int64_t SqliteStore::insertedNumber() const {
   return sqlite3_last_insert_rowid(_database->handle());
 }
 
+/// A statement that is used often, prepared once.
+SqliteStatement& SqliteStore::prepared(const std::string& sql) {
+  return _prepared.try_emplace(sql, *_database, sql.c_str()).first->second;
+}
+
 /// The number of a text in the tables `device`, `key` and `text`; only keys have a kind.
 std::optional<std::int64_t> SqliteStore::findNumber(const char* table, std::string_view text,
                                                     std::optional<KeyKind> kind) {
   const std::string query = std::string("SELECT number FROM ") + table + " WHERE name = ?" +
                             (kind ? " AND kind = ?" : "");
-  SqliteStatement find(*_database, query.c_str());
+  SqliteStatement& find = prepared(query);
   find.bind(1, text);
   if (kind) {
     find.bind(2, static_cast<std::int64_t>(*kind));
   }
-  return find.step() ? std::optional(find.integer(0)) : std::nullopt;
+  const auto number = find.step() ? std::optional(find.integer(0)) : std::nullopt;
+  find.reset();
+  return number;
 }
 
 /// The same, where a text that is not there gets a number.
@@ -92,7 +99,7 @@ std::int64_t SqliteStore::numberOf(const char* table, std::string_view text,
   if (!number) {
     const std::string query = std::string("INSERT INTO ") + table +
                               (kind ? "(name, kind) VALUES(?, ?)" : "(name) VALUES(?)");
-    SqliteStatement insert(*_database, query.c_str());
+    SqliteStatement& insert = prepared(query);
     insert.bind(1, text);
     if (kind) {
       insert.bind(2, static_cast<std::int64_t>(*kind));

@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "Turn.h"
+#include "common/KeyHash.h"
 #include "platform/host/counters/SqliteConnection.h"
 #include "store/FleetStore.h"
 #include "store/Varint.h"
@@ -101,6 +102,7 @@ class SqliteStore : public FleetStore {
   void append(std::int32_t day, std::int64_t key, std::int64_t line, std::string_view value);
   std::int64_t shapeOf(std::vector<std::int64_t> keys);
   std::int64_t insertedNumber() const;
+  SqliteStatement& prepared(const std::string& sql);
   std::optional<std::int64_t> findNumber(const char* table, std::string_view text,
                                          std::optional<KeyKind> kind = {});
   std::int64_t numberOf(const char* table, std::string_view text, std::optional<KeyKind> kind = {});
@@ -127,12 +129,13 @@ class SqliteStore : public FleetStore {
   Turn _turn;
   std::unique_ptr<SqliteConnection> _database;
   std::uint64_t _least = kUsualLeast;
-  std::int32_t _firstDay = 0;                                 ///< earlier lines are refused
-  std::set<std::string> _forgotten;                           ///< digests of devices' names
-  std::unique_ptr<Statements> _statements;                    ///< of a store that is changed
-  bool _inBatch = false;                                      ///< and so in a transaction
-  std::map<std::string, std::int64_t, std::less<>> _numbers;  ///< of names met in this batch
-  std::vector<LastKey> _lastKeys;                             ///< of the line before in this batch
+  std::int32_t _firstDay = 0;                                       ///< earlier lines are refused
+  std::set<std::string> _forgotten;                                 ///< digests of devices' names
+  std::unique_ptr<Statements> _statements;                          ///< of a store that is changed
+  bool _inBatch = false;                                            ///< and so in a transaction
+  std::unordered_map<std::string, SqliteStatement> _prepared;       ///< by their text
+  std::unordered_map<std::string, std::int64_t, KeyHash> _numbers;  ///< of names met in this batch
+  std::vector<LastKey> _lastKeys;  ///< of the line before in this batch
   std::unordered_map<std::int64_t, Pending> _pending;
   std::map<std::int32_t, std::int64_t> _replaced;  ///< lines replaced in this batch, by day
   std::size_t _batchSize = 0;                      ///< bytes of text
