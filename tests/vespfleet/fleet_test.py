@@ -241,7 +241,7 @@ def some_lines(chance, devices=40, days=3):
                         scalars["few of B"] = device
                     lines.append(line(f"D{device}", day, revision, chance.randrange(2), build, scalars,
                                       {"d": [0, 9, chance.randrange(90) / 7, chance.random(), chance.randrange(1, 99)],
-                                       "e": [0, 0, 1.5, 0, 7]},
+                                       "e": [{"float": 0.25}, 0, 1.5, 0, 7]},
                                       {"d": {chance.choice(("(-inf, 1]", "(0, 2]", "(1, inf)")): chance.randrange(2**40)}}
                                       if chance.random() < 0.6 else {}))
     return lines
@@ -312,7 +312,7 @@ def test_answers(store, folder, chance):
 
 
 def test_malformed(store, folder, _):
-    good = json.loads(line("D", scalars={"a": 1}, distributions={"d": [0, 1, 1, 0, 0]}))
+    good = json.loads(line("D", scalars={"a": 1}, distributions={"d": [0, 1, 1, 0, 0], "i": [{"real": "inf"}, 1, 1, 0, 1]}))
     bad = [b"", b"[]", b"{", json.dumps(dict(good, more=1)).encode(), json.dumps(good)[:-1].encode() + b',"day":1}',
            b" " * (16 << 20) + json.dumps(good).encode()]
     for name, value in (("version", 1), ("device", ""), ("device", "x" * 256), ("device", "\x01"), ("day", -1),
@@ -323,9 +323,19 @@ def test_malformed(store, folder, _):
                         ("distributions", {"d": [0, 0, 0, 0, 2**31]}), ("distributions", {"d": [0, 0, 0, None, 1]}),
                         ("histograms", {"d": {"x": 2**63}}), ("histograms", {"d": {"x": -1}})):
         bad.append(json.dumps(dict(good, **{name: value})).encode())
+    reasons = {}
+    for name, value, why in (("more", "[" * 200 + "]" * 200, "not JSON"), ("more", "[" * 199 + "]" * 199, "an entry that"),
+                             ("more", '[{"a":1,"b":{},"a":1}]', "not JSON"), ("day", "1e999", "not JSON"),
+                             ("device", '"\\ud800"', "not JSON"), ("created", '{"date":null}', "a null"),
+                             ("created", '{"data":""}', "a creation"), ("distributions", '{"d":[1,1,1,1,true]}', "a count"),
+                             ("distributions", '{"d":[1,1,1,"x",1]}', "a distribution that"),
+                             ("distributions", '{"d":[1,1,1,{"float":1},{"float":1}]}', "a count")):
+        bad.append(json.dumps(dict(good, **{name: "@"})).replace('"@"', value).encode())
+        reasons[len(bad)] = why
+    bad.append(json.dumps(good).encode() + b"\0")
     spool = folder / "spool"
     (spool / "D").mkdir(parents=True)
-    (spool / "D/good.jsonl").write_text(json.dumps(good))
+    (spool / "D/good.jsonl").write_text("\ufeff" + json.dumps(good))
     (spool / "D/other.jsonl").write_text(line("E", scalars={"a": 2}))
     (spool / "cut.jsonl.gz").write_bytes(gzip.compress(("\n".join([line("F", scalars={"a": 3})] * 99)).encode())[:-9])
     (spool / "bad.jsonl").write_bytes(b"\n".join(bad) + b"\n" + line("G", scalars={"a": 4}).encode())
@@ -335,6 +345,8 @@ def test_malformed(store, folder, _):
     assert len(errors) == len(bad) + 2 and "D" * 9 not in run.errors, run.errors
     assert [f"{spool}/bad.jsonl:{i + 1}" for i in range(len(bad))] == [
         error.split(": ")[0] for error in errors if "bad.jsonl" in error]
+    for number, why in reasons.items():
+        assert f"bad.jsonl:{number}: {why}" in run.errors, (number, why)
     left = sorted(str(path.relative_to(spool)) for path in spool.rglob("*") if not path.is_dir())
     assert left == ["D/rejected/other.jsonl", "fifo.jsonl", "rejected/bad.jsonl", "rejected/cut.jsonl.gz"], left
     assert ask("scalar", store, "a")[0]["devices"] in (2, 3)
@@ -348,6 +360,7 @@ def test_malformed(store, folder, _):
     load.communicate()
     assert (spool / "D/good.jsonl").exists() and (spool / "rejected/bad.jsonl.1").exists(), "what came since is lost"
     run("distribution", store, "d", status=1)
+    run("distribution", store, "i", status=1)
 
 
 def test_kills(store, folder, chance):
