@@ -247,8 +247,15 @@ TEST_F(TallybookTest, MovesForeignFilesAsideWithTheirJournals) {
     SqliteConnection(path, kShortWait).execute(sql);
     return folder.read("other");
   };
+  add("k", 1);
+  std::string future = folder.read(kFile);
+  future[18] = 3;  // a format that SQLite would read and never write
   const std::string foreign[] = {
-      "", "text, not a database", std::string(5000, '\0'), database("CREATE TABLE scalar (day)"),
+      future,
+      "",
+      "text, not a database",
+      std::string(5000, '\0'),
+      database("CREATE TABLE scalar (day)"),
       database("PRAGMA application_id = 0x56455350; PRAGMA user_version = 1; CREATE TABLE t (x)")};
   std::int64_t count = 0;
   for (const std::string& content : foreign) {
