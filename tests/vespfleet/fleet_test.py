@@ -327,6 +327,7 @@ def test_malformed(store, folder, _):
     for name, value, why in (("more", "[" * 200 + "]" * 200, "not JSON"), ("more", "[" * 199 + "]" * 199, "an entry that"),
                              ("more", '[{"a":1,"b":{},"a":1}]', "not JSON"), ("day", "1e999", "not JSON"),
                              ("device", '"\\ud800"', "not JSON"), ("created", '{"date":null}', "a null"),
+                             ("created", '{"date":"2026-01-01T00:00:00Z","x":1}', "a creation"),
                              ("created", '{"data":""}', "a creation"), ("distributions", '{"d":[1,1,1,1,true]}', "a count"),
                              ("distributions", '{"d":[1,1,1,"x",1]}', "a distribution that"),
                              ("distributions", '{"d":[1,1,1,{"float":1},{"float":1}]}', "a count")):
