@@ -75,9 +75,11 @@ class VESPRUN_EXPORT PropertyDict {
 
   void insertOrAssign(std::string&& key, PropertyValue&& value);
   const Entries& entries() const;
-  Map& map();
+  void makeMap(std::size_t count);
 
-  std::unique_ptr<Map> _map;  // null as long as nothing was set: many dictionaries stay empty
+  // A list of 100,000 keys is as many dictionaries of one entry: those have no hash table.
+  Entries _few;
+  std::unique_ptr<Map> _many;  // in place of `_few` from the ninth entry
 };
 
 }  // namespace vesprun

@@ -10,6 +10,8 @@
 namespace vesprun {
 namespace {
 
+constexpr std::size_t kMaxFew = 8;
+
 template <typename T>
 const T* typed(const PropertyValue* value, const T* (PropertyValue::*read)() const) {
   return value != nullptr ? (value->*read)() : nullptr;
@@ -32,18 +34,19 @@ PropertyDict::PropertyDict(std::initializer_list<std::pair<std::string, Property
 }
 
 PropertyDict::PropertyDict(const PropertyDict& other)
-    : _map(other._map ? std::make_unique<Map>(*other._map) : nullptr) {}
+    : _few(other._few), _many(other._many ? std::make_unique<Map>(*other._many) : nullptr) {}
 
 PropertyDict& PropertyDict::operator=(const PropertyDict& other) {
   return *this = PropertyDict(other);
 }
 
 const PropertyValue* PropertyDict::find(std::string_view key) const {
-  if (!_map) {
-    return nullptr;
+  if (_many) {
+    const auto entry = _many->find(key);
+    return entry != _many->end() ? &entry->second : nullptr;
   }
-  const auto entry = _map->find(key);
-  return entry != _map->end() ? &entry->second : nullptr;
+  const auto entry = std::ranges::find(_few, key, &Entries::value_type::first);
+  return entry != _few.end() ? &entry->second : nullptr;
 }
 
 const PropertyDict* PropertyDict::findDict(std::string_view key) const {
@@ -70,14 +73,31 @@ std::int64_t PropertyDict::integerOr(std::string_view key, std::int64_t otherwis
 }
 
 void PropertyDict::insertOrAssign(std::string&& key, PropertyValue&& value) {
+  if (!_many) {
+    const auto entry = std::ranges::find(_few, key, &Entries::value_type::first);
+    if (entry != _few.end()) {
+      entry->second = std::move(value);
+      return;
+    }
+    if (_few.size() < kMaxFew) {
+      _few.emplace_back(std::move(key), std::move(value));
+      return;
+    }
+    makeMap(_few.size() + 1);
+  }
   // Most keys are new: one search finds that out and where they go.
-  auto [entry, isNew] = map().try_emplace(std::move(key), std::move(value));
+  auto [entry, isNew] = _many->try_emplace(std::move(key), std::move(value));
   if (!isNew) {
     entry.value() = std::move(value);  // which was not taken
   }
 }
 
-bool PropertyDict::remove(std::string_view key) { return _map && _map->erase(key) != 0; }
+bool PropertyDict::remove(std::string_view key) {
+  if (_many) {
+    return _many->erase(key) != 0;
+  }
+  return std::erase_if(_few, [key](const auto& entry) { return entry.first == key; }) != 0;
+}
 
 void PropertyDict::merge(PropertyDict&& other) {
   if (empty()) {
@@ -93,24 +113,34 @@ void PropertyDict::merge(const PropertyDict& other) {
   }
 }
 
-void PropertyDict::clear() { _map.reset(); }
+void PropertyDict::clear() { *this = PropertyDict(); }
 
-void PropertyDict::reserve(std::size_t count) { map().reserve(count); }
+void PropertyDict::reserve(std::size_t count) {
+  if (_many) {
+    _many->reserve(count);
+  } else if (count > kMaxFew) {
+    makeMap(count);
+  } else {
+    _few.reserve(count);
+  }
+}
 
 std::size_t PropertyDict::size() const { return entries().size(); }
 PropertyDict::const_iterator PropertyDict::begin() const { return entries().begin(); }
 PropertyDict::const_iterator PropertyDict::end() const { return entries().end(); }
 
 const PropertyDict::Entries& PropertyDict::entries() const {
-  static const Entries kNone;
-  return _map ? _map->values_container() : kNone;
+  return _many ? _many->values_container() : _few;
 }
 
-PropertyDict::Map& PropertyDict::map() {
-  if (!_map) {
-    _map = std::make_unique<Map>();
+void PropertyDict::makeMap(std::size_t count) {
+  auto map = std::make_unique<Map>();
+  map->reserve(count);
+  for (auto& [key, value] : _few) {
+    map->try_emplace(std::move(key), std::move(value));
   }
-  return *_map;
+  _few = {};
+  _many = std::move(map);
 }
 
 bool operator==(const PropertyDict& left, const PropertyDict& right) {
