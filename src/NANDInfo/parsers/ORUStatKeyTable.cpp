@@ -4,6 +4,8 @@
 #include <array>
 #include <functional>
 
+#include "NANDInfo/parsers/KnownNamesOf.h"
+
 namespace vesprun {
 
 namespace {
