@@ -191,7 +191,7 @@ class Loading {
       fstat(descriptor, &done.status);
     }
     LineSource source(descriptor);
-    LineReader lines(source, kMaxLine);
+    LineReader lines(source, kMaxExportedLine);
     const std::uint64_t malformed = _counts.malformed;
     auto result = LineReader::Result::Line;
     ParsedLines parsed;

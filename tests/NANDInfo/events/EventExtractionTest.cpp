@@ -8,7 +8,7 @@
 namespace vesprun {
 namespace {
 
-const std::string kPrefix = "com.quill.massStorage.NANDInfo.";
+const std::string kEventPrefix = "com.quill.massStorage.NANDInfo.";
 const char* const kErrorMessage = "com.quill.NANDInfo.ErrorMessage";
 
 const std::string kOtherServices = R"(, {"class": "QuillNVMeEAN", "userClient": {"scalarMethods":
@@ -41,7 +41,7 @@ class EventExtractionTest : public ControllerTest {
   std::vector<std::string> events() {
     std::vector<std::string> names;
     for (const PropertyDict& line : device().lines("events.jsonl")) {
-      names.push_back(line.find("event")->string()->substr(kPrefix.size()));
+      names.push_back(line.find("event")->string()->substr(kEventPrefix.size()));
     }
     return names;
   }
@@ -57,18 +57,19 @@ class EventExtractionTest : public ControllerTest {
 };
 
 TEST_F(EventExtractionTest, LogsEveryStepWhateverIsTaken) {
-  startWithMagazine(R"(, "events": {"used": [")" + kPrefix + R"(MSPCounters_1"], "fails": [")" +
-                    kPrefix + R"(FTLHistograms_1", ")" + kPrefix + R"(SM.Daily.FTLCounters_1"]})");
+  startWithMagazine(R"(, "events": {"used": [")" + kEventPrefix +
+                    R"(MSPCounters_1"], "fails": [")" + kEventPrefix + R"(FTLHistograms_1", ")" +
+                    kEventPrefix + R"(SM.Daily.FTLCounters_1"]})");
   const std::optional<PropertyDict> results = NandInfoExtractToEH_runAllSteps(0, false, 1, 0);
   const std::string step = "NANDInfo: createAndLogFTLStatFieldsToEventHubForEvent: ";
   EXPECT_THAT(log(),
               testing::AllOf(
-                  testing::HasSubstr(step + kPrefix + "FTLHistograms_1 enabled=0\n" + step +
+                  testing::HasSubstr(step + kEventPrefix + "FTLHistograms_1 enabled=0\n" + step +
                                      "FAILED to log massStorage_NANDInfo_FTLHistograms_1 using "
                                      "EventHubSendEventLazy\n" +
-                                     step + kPrefix + "FTLHistograms_2 enabled=0\nNANDInfo: "),
+                                     step + kEventPrefix + "FTLHistograms_2 enabled=0\nNANDInfo: "),
                   testing::HasSubstr("FAILED to log massStorage_NANDInfo_SM_Daily_FTLCounters_1"),
-                  testing::HasSubstr(kPrefix + "MSPCounters_1 enabled=1\n"),
+                  testing::HasSubstr(kEventPrefix + "MSPCounters_1 enabled=1\n"),
                   testing::EndsWith("\nSkipping Stats Mag Monthly Delta")));
   EXPECT_EQ(events().size(), 3u);
   EXPECT_FALSE(results->contains("gracefulBootTimeLogMs_0"));
@@ -106,7 +107,7 @@ TEST_F(EventExtractionTest, FailedMSPEventIsRecorded) {
   }
   answer(13, 0, StatisticsBufferBuilder().add(680, {1, 2, 3}).bytes());
   startController("QuillQNS3NVMeController",
-                  R"(, "events": {"fails": [")" + kPrefix + R"(MSPCounters_1"]})");
+                  R"(, "events": {"fails": [")" + kEventPrefix + R"(MSPCounters_1"]})");
   EXPECT_FALSE(NandInfoExtractToEH_runAllSteps(0, false, 1, 1)->contains("msp_index"));
   EXPECT_EQ(GetAPIErrorMessage(),
             "createAndLogMSPFieldsToEventHubForEvent: EventHubSendEventLazy failed to log to EH");

@@ -44,9 +44,9 @@ Outcome outcomeOf(std::span<const std::uint8_t> buffer) {
   const std::uint32_t result = parse(ctx, buffer);
   return {result, fieldsOf(ctx), GetAPIErrorMessage()};
 }
-constexpr auto ftl = outcomeOf<ORUFTLParseBufferToCxt>;
+constexpr auto ftlOutcome = outcomeOf<ORUFTLParseBufferToCxt>;
 constexpr auto ftlStatKey = outcomeOf<ORUFTLParseStatKeyBufferToCxt>;
-constexpr auto msp = outcomeOf<ORUMSPParseBufferToCxt>;
+constexpr auto mspOutcome = outcomeOf<ORUMSPParseBufferToCxt>;
 
 Outcome base(std::span<const std::uint8_t> buffer) {
   ProcessState::startAfresh();
@@ -186,7 +186,7 @@ TEST(FTLParser, WalksRecords) {
       {Statistics().add(4, {1}).addHeader(74, 2).addWord(1), "1 hostWrites=1"},
       {large, "1 uncleanBoots=1" + tooMany}};
   for (const auto& [buffer, expected] : cases) {
-    EXPECT_EQ(textOf(ftl, buffer), expected);
+    EXPECT_EQ(textOf(ftlOutcome, buffer), expected);
   }
   EXPECT_EQ(textOf(ftlStatKey, Statistics().add(11, {7}).add(14, countingUp(10))),
             "11 Stat_11=7" + numbered("Stat_14_", 10));
@@ -230,7 +230,7 @@ TEST(MSPParser, WalksRecords) {
        "1 passWithTmodeHard=7"},
       {MSP().add(4096, {7}).addHeader(8194, 4).addBytes(3), "1 passWithTmodeHard=7"}};
   for (const auto& [buffer, expected] : cases) {
-    EXPECT_EQ(textOf(msp, buffer), expected);
+    EXPECT_EQ(textOf(mspOutcome, buffer), expected);
   }
 }
 

@@ -10,8 +10,6 @@
 namespace vesprun {
 namespace {
 
-using Level = HealthStatement::Level;
-
 // Percentages: of the rated erase cycles, of the spare blocks, of the capacity.
 constexpr double kWearToLookAt = 80;
 constexpr double kWearToActOn = 100;
@@ -92,17 +90,17 @@ struct Statements : Facts {
   using Facts::Facts;
 
   template <typename... Days>
-  void add(Level level, const std::string& text, Days... days) {
+  void add(HealthStatement::Level level, const std::string& text, Days... days) {
     list.push_back({level, text, std::max({days...})});
   }
 
   /// A counter that should be 0.
-  void addFailures(Names names, Level ifAny, const std::string& none, const char* noun,
-                   const std::string& some) {
+  void addFailures(Names names, HealthStatement::Level ifAny, const std::string& none,
+                   const char* noun, const std::string& some) {
     if (const auto fact = find(names)) {
       const auto count = static_cast<std::size_t>(std::min(fact->value, 1e18));
-      add(count == 0 ? Level::Good : ifAny, count == 0 ? none : countedNoun(count, noun) + some,
-          fact->day);
+      add(count == 0 ? HealthStatement::Level::Good : ifAny,
+          count == 0 ? none : countedNoun(count, noun) + some, fact->day);
     }
   }
 
@@ -114,9 +112,9 @@ std::string percentText(double value) { return numeral(value) + "\u202F%"; }
 void addWear(Statements& statements) {
   const auto addUsed = [&statements](Names names, const char* where) {
     if (const auto used = statements.find(names)) {
-      statements.add(used->value >= kWearToActOn    ? Level::Act
-                     : used->value >= kWearToLookAt ? Level::Look
-                                                    : Level::Good,
+      statements.add(used->value >= kWearToActOn    ? HealthStatement::Level::Act
+                     : used->value >= kWearToLookAt ? HealthStatement::Level::Look
+                                                    : HealthStatement::Level::Good,
                      percentText(used->value) + " of the rated erase cycles of the " + where +
                          " partition are used.",
                      used->day);
@@ -127,16 +125,16 @@ void addWear(Statements& statements) {
   const auto user = statements.find({"HLT_averageTLCPECycles"});
   const auto intermediate = statements.find({"HLT_averageSLCPECycles"});
   if (user && intermediate) {
-    statements.add(Level::Plain,
+    statements.add(HealthStatement::Level::Plain,
                    "A TLC block has been erased " + numeral(user->value) +
                        " times on average, an SLC block " + numeral(intermediate->value) +
                        " times.",
                    user->day, intermediate->day);
   }
   if (const auto spare = statements.find({"spareAvailablePercent"})) {
-    statements.add(spare->value <= kSpareToActOn    ? Level::Act
-                   : spare->value <= kSpareToLookAt ? Level::Look
-                                                    : Level::Good,
+    statements.add(spare->value <= kSpareToActOn    ? HealthStatement::Level::Act
+                   : spare->value <= kSpareToLookAt ? HealthStatement::Level::Look
+                                                    : HealthStatement::Level::Good,
                    percentText(spare->value) + " of the spare blocks are available.", spare->day);
   }
 }
@@ -145,21 +143,24 @@ void addFaults(Statements& statements) {
   const auto factory = statements.find({"numFactoryBad", "numFactoryBadBlocks"});
   const std::string since =
       factory ? "; " + numeral(factory->value) + " were bad from the factory." : ".";
-  statements.addFailures({"numGrownBad"}, Level::Look, "No block has gone bad in use" + since,
-                         "block", " went bad in use" + since);
-  statements.addFailures({"numPfail"}, Level::Look, "No program operation has failed.",
-                         "program operation", " failed.");
-  statements.addFailures({"numEfail"}, Level::Look, "No erase operation has failed.",
-                         "erase operation", " failed.");
-  statements.addFailures({"numDieFailures"}, Level::Act, "No die has failed.", "die failure",
-                         " counted.");
-  statements.addFailures({"raidFailedReconstructionHost", "FailedReconstructionNonGC"}, Level::Act,
+  statements.addFailures({"numGrownBad"}, HealthStatement::Level::Look,
+                         "No block has gone bad in use" + since, "block",
+                         " went bad in use" + since);
+  statements.addFailures({"numPfail"}, HealthStatement::Level::Look,
+                         "No program operation has failed.", "program operation", " failed.");
+  statements.addFailures({"numEfail"}, HealthStatement::Level::Look,
+                         "No erase operation has failed.", "erase operation", " failed.");
+  statements.addFailures({"numDieFailures"}, HealthStatement::Level::Act, "No die has failed.",
+                         "die failure", " counted.");
+  statements.addFailures({"raidFailedReconstructionHost", "FailedReconstructionNonGC"},
+                         HealthStatement::Level::Act,
                          "Data that the system read has always been reconstructed.",
                          "reconstruction", " of data that the system read failed.");
-  statements.addFailures({"raidFailedReconstructionInternal", "FailedReconstructionGC"}, Level::Act,
+  statements.addFailures({"raidFailedReconstructionInternal", "FailedReconstructionGC"},
+                         HealthStatement::Level::Act,
                          "Data that was moved internally has always been reconstructed.",
                          "reconstruction", " of data that was moved internally failed.");
-  statements.addFailures({"UncleanBoots", "uncleanBoots"}, Level::Plain,
+  statements.addFailures({"UncleanBoots", "uncleanBoots"}, HealthStatement::Level::Plain,
                          "No start followed an unclean shutdown.", "start",
                          " followed an unclean shutdown.");
 }
@@ -169,15 +170,15 @@ void addUse(Statements& statements) {
     constexpr double kBasisPoints = 100;
     const double share = full->value / kBasisPoints;
     const auto capacity = statements.find({"HLT_OR_Capacity_GB"});
-    statements.add(share >= kFullnessToLookAt ? Level::Look : Level::Plain,
-                   "The storage" +
-                       (capacity ? " of " + numeral(capacity->value) + "\u202FGB" : "") + " is " +
-                       percentText(std::round(share)) + " full.",
-                   full->day);
+    statements.add(
+        share >= kFullnessToLookAt ? HealthStatement::Level::Look : HealthStatement::Level::Plain,
+        "The storage" + (capacity ? " of " + numeral(capacity->value) + "\u202FGB" : "") + " is " +
+            percentText(std::round(share)) + " full.",
+        full->day);
   }
   if (const auto amplification = statements.find({"UserWamp"})) {
     statements.add(
-        Level::Plain,
+        HealthStatement::Level::Plain,
         "The write amplification of the user partition is " + numeral(amplification->value) + ".",
         amplification->day);
   }
@@ -185,7 +186,7 @@ void addUse(Statements& statements) {
   const auto addGrowth = [&](Names names, const char* period) {
     const auto growth = statements.find(names);
     if (growth && written && written->value > 0) {
-      statements.add(Level::Plain,
+      statements.add(HealthStatement::Level::Plain,
                      "Writing of the last " + std::string(period) + " is " +
                          percentText(std::round(growth->value / written->value * 1e4) / 1e2) +
                          " of all that the system has ever written.",
@@ -196,7 +197,7 @@ void addUse(Statements& statements) {
   addGrowth({"SM.WeeklyMA.hostWrites"}, "seven days");
   addGrowth({"SM.Monthly.hostWrites"}, "thirty days");
   if (const auto hours = statements.find({"powerOnHours", "PowerOnHours"})) {
-    statements.add(Level::Plain,
+    statements.add(HealthStatement::Level::Plain,
                    "The storage has been powered for " + numeral(hours->value) + " hours.",
                    hours->day);
   }

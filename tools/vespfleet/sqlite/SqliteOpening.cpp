@@ -13,7 +13,7 @@ namespace {
 
 // A line's number is never reused, or stale entries of chunks would become valid again. The index
 // has all that questions need of a line.
-constexpr const char* kTables = R"(
+constexpr const char* kSchema = R"(
   PRAGMA application_id = 0x76666C74;
   PRAGMA user_version = 2;
   CREATE TABLE rule(least INTEGER NOT NULL, first_day INTEGER NOT NULL) STRICT;
@@ -34,7 +34,7 @@ constexpr const char* kTables = R"(
   CREATE TABLE replaced(day INTEGER PRIMARY KEY, lines INTEGER NOT NULL) STRICT;)";
 
 // What version 0.9 made; only the lines' texts are taken from it.
-constexpr const char* kEarlierTables = R"(
+constexpr const char* kEarlierSchema = R"(
   CREATE TABLE device(number INTEGER PRIMARY KEY, name TEXT NOT NULL UNIQUE) STRICT;
   CREATE TABLE key(number INTEGER PRIMARY KEY, kind INTEGER NOT NULL, name TEXT NOT NULL,
                    UNIQUE(name, kind)) STRICT;
@@ -66,7 +66,7 @@ bool makeStore(const std::string& path, int least) {
   auto added = AtomicFile::Added::Failed;
   if (auto document = AtomicFile::create(folder, error)) {
     document->append(newSqliteFile("PRAGMA page_size = " + std::to_string(kPageSize) +
-                                   "; PRAGMA auto_vacuum = INCREMENTAL;" + kTables +
+                                   "; PRAGMA auto_vacuum = INCREMENTAL;" + kSchema +
                                    "INSERT INTO rule VALUES(" + std::to_string(least) + ", 0)"));
     added = document->addNew(file.filename().string(), error);
   }
@@ -93,9 +93,9 @@ void SqliteStore::open(StoreUse use, std::optional<int> least) {
     sqlite3_limit(_database->handle(), SQLITE_LIMIT_LENGTH, kMaxCell);
     const std::string schema = _database->schema();
     const std::int64_t version = _database->queryInteger("PRAGMA user_version");
-    isEarlier = version == 1 && schema == schemaOf(kEarlierTables);
+    isEarlier = version == 1 && schema == schemaOf(kEarlierSchema);
     if (_database->queryInteger("PRAGMA application_id") != kApplication ||
-        !(isEarlier || (version == 2 && schema == schemaOf(kTables)))) {
+        !(isEarlier || (version == 2 && schema == schemaOf(kSchema)))) {
       throw StoreFailure(_path + ": no fleet store");
     }
   } catch (const SqliteFailure& failure) {
@@ -136,7 +136,7 @@ void SqliteStore::bringUpToDate() {
   _database->execute(
       "ALTER TABLE line RENAME TO earlier_line; DROP TABLE device; DROP TABLE key;"
       "DROP TABLE label; DROP TABLE chunk; DROP TABLE replaced");
-  _database->execute(kTables);
+  _database->execute(kSchema);
   SqliteStatement rule(*_database, "INSERT INTO rule VALUES(?, 0)");
   rule.bind(1, kUsualLeast).run();
   prepareChanges();

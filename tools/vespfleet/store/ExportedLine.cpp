@@ -252,7 +252,7 @@ std::optional<ExportedLine> parseExportedLine(std::string_view text, std::string
     why = "a blank line";
     return std::nullopt;
   }
-  if (text.size() > kMaxLine) {
+  if (text.size() > kMaxExportedLine) {
     why = "longer than 16 MiB";
     return std::nullopt;
   }

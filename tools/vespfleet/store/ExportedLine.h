@@ -29,7 +29,7 @@ using LineDigest = std::array<std::uint8_t, 32>;
 /// SHA-256.
 LineDigest digestOf(std::string_view text);
 
-inline constexpr std::size_t kMaxLine = std::size_t{16} * 1024 * 1024;
+inline constexpr std::size_t kMaxExportedLine = std::size_t{16} * 1024 * 1024;
 
 /// What one device reported for one day in one revision, as `vespctl export` writes it.
 struct ExportedLine {

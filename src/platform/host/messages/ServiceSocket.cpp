@@ -17,7 +17,7 @@ namespace {
 
 constexpr const char* kFolder = "run";
 constexpr int kWaitingPeers = 16;
-constexpr mode_t kOwnerOnly = 0600;
+constexpr mode_t kSocketMode = 0600;
 
 /// A path too long for an address goes through the open folder.
 std::optional<sockaddr_un> addressOf(const std::string& path, int folder, const std::string& name) {
@@ -79,7 +79,7 @@ std::optional<ServiceSocket> ServiceSocket::listen(const DeviceDirectory& direct
   // Nobody can connect before the socket listens; by then only its owner may.
   service._isBound = address && removeSocket(folder, service._name) &&
                      bind(socket, generic(*address), sizeof *address) == 0;
-  if (!service._isBound || fchmodat(folder, service._name.c_str(), kOwnerOnly, 0) != 0 ||
+  if (!service._isBound || fchmodat(folder, service._name.c_str(), kSocketMode, 0) != 0 ||
       ::listen(socket, kWaitingPeers) != 0) {
     error = systemError(path);
     return std::nullopt;

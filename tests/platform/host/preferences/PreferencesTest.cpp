@@ -11,8 +11,8 @@ using namespace std::string_literals;
 using ::testing::ElementsAre, ::testing::EndsWith, ::testing::HasSubstr, ::testing::IsEmpty,
     ::testing::StartsWith;
 
-constexpr const char* kFolder = "var/mobile/Library/Preferences";
-constexpr const char* kFile = "var/mobile/Library/Preferences/a.ptree";
+constexpr const char* kPreferencesFolder = "var/mobile/Library/Preferences";
+constexpr const char* kPreferencesFile = "var/mobile/Library/Preferences/a.ptree";
 constexpr const char* kOneKey =
     "<ptree version=\"1.0\"><dict><key>first</key><integer>1</integer></dict></ptree>";
 
@@ -32,14 +32,14 @@ TEST_F(PreferencesTest, AreThereForTheNextProcess) {
     here.LGSPreferencesSetValue("gone", std::nullopt, "a");
     EXPECT_EQ(here.LGSPreferencesGetValue("first", "a"), PropertyValue(1));
     EXPECT_EQ(here.LGSPreferencesGetValue("gone", "a"), std::nullopt);
-    EXPECT_THAT(folder.names(kFolder), IsEmpty());
+    EXPECT_THAT(folder.names(kPreferencesFolder), IsEmpty());
     EXPECT_TRUE(here.LGSPreferencesSynchronize("a"));
-    EXPECT_THAT(folder.names(kFolder), ElementsAre("a.ptree"));
+    EXPECT_THAT(folder.names(kPreferencesFolder), ElementsAre("a.ptree"));
     here.LGSPreferencesSetValue("second", "text", "a");
     here.LGSPreferencesSetValue("other", true, "b");
   }
   EXPECT_EQ(found(), (PropertyDict{{"first", 1}, {"second", "text"}}));
-  EXPECT_THAT(folder.names(kFolder), ElementsAre("a.ptree", "b.ptree"));
+  EXPECT_THAT(folder.names(kPreferencesFolder), ElementsAre("a.ptree", "b.ptree"));
   HostPreferences(device, clock, log, "root").LGSPreferencesSetValue("k", 1, "a");
   EXPECT_THAT(folder.names("var/root/Library/Preferences"), ElementsAre("a.ptree"));
   HostPreferences(device, clock, log, PreferenceFolder{"Library/Logsmith"})
@@ -51,15 +51,15 @@ TEST_F(PreferencesTest, AreThereForTheNextProcess) {
 TEST_F(PreferencesTest, AreNotWrittenWithoutADifference) {
   preferences.LGSPreferencesSetValue("absent", std::nullopt, "a");
   EXPECT_TRUE(preferences.LGSPreferencesSynchronize("a"));
-  EXPECT_THAT(folder.names(kFolder), IsEmpty());
-  folder.write(kFile, kOneKey);
+  EXPECT_THAT(folder.names(kPreferencesFolder), IsEmpty());
+  folder.write(kPreferencesFile, kOneKey);
   preferences.LGSPreferencesSetValue("first", 1, "a");
   EXPECT_TRUE(preferences.LGSPreferencesSynchronize("a"));
   EXPECT_EQ(preferences.LGSPreferencesGetValue("first", "a"), PropertyValue(1));
-  EXPECT_EQ(folder.read(kFile), kOneKey);
+  EXPECT_EQ(folder.read(kPreferencesFile), kOneKey);
   preferences.LGSPreferencesSetValue("first", 1.0, "a");  // another kind of number
   EXPECT_TRUE(preferences.LGSPreferencesSynchronize("a"));
-  EXPECT_THAT(folder.read(kFile), HasSubstr("<real>1</real>"));
+  EXPECT_THAT(folder.read(kPreferencesFile), HasSubstr("<real>1</real>"));
 }
 
 TEST_F(PreferencesTest, KeepWhatOtherProcessesChanged) {
@@ -102,38 +102,38 @@ TEST_F(PreferencesTest, KeepADocumentThatIsNoneBesideTheNewOne) {
   for (const std::string malformed :
        {"<ptree version=\"1.0\">\n<dict>\n<key>first", "<ptree version=\"1.0\"><true/></ptree>"}) {
     log.messages.clear();
-    folder.write(kFile, malformed);
+    folder.write(kPreferencesFile, malformed);
     HostPreferences here(device, clock, log);
     EXPECT_EQ(here.LGSPreferencesGetValue("first", "a"), std::nullopt);
     EXPECT_EQ(here.LGSPreferencesGetValue("other", "a"), std::nullopt);
-    EXPECT_THAT(log.messages, ElementsAre(StartsWith(folder.path(kFile) + ": line ")));
+    EXPECT_THAT(log.messages, ElementsAre(StartsWith(folder.path(kPreferencesFile) + ": line ")));
     EXPECT_TRUE(here.LGSPreferencesSynchronize("a"));
-    EXPECT_EQ(folder.read(kFile), malformed);
+    EXPECT_EQ(folder.read(kPreferencesFile), malformed);
     here.LGSPreferencesSetValue("first", 2, "a");
     EXPECT_TRUE(here.LGSPreferencesSynchronize("a"));
     EXPECT_EQ(found(), (PropertyDict{{"first", 2}}));
     EXPECT_THAT(log.messages.back(), HasSubstr(": kept as "));
   }
-  const std::vector<std::string> names = folder.names(kFolder);
+  const std::vector<std::string> names = folder.names(kPreferencesFolder);
   ASSERT_EQ(names.size(), 3U);
   EXPECT_THAT(names[1], StartsWith("a.ptree.unreadable-20240305T091502Z"));
-  EXPECT_THAT(folder.read(std::string(kFolder) + '/' + names[1]), StartsWith("<ptree"));
+  EXPECT_THAT(folder.read(std::string(kPreferencesFolder) + '/' + names[1]), StartsWith("<ptree"));
 }
 
 TEST_F(PreferencesTest, NeverWriteOverWhatCannotBeRead) {
-  folder.write(std::string(kFile) + "/inside", "a folder in place of the document");
+  folder.write(std::string(kPreferencesFile) + "/inside", "a folder in place of the document");
   EXPECT_EQ(preferences.LGSPreferencesGetValue("first", "a"), std::nullopt);
   preferences.LGSPreferencesSetValue("first", 1, "a");
   EXPECT_FALSE(preferences.LGSPreferencesSynchronize("a"));
   EXPECT_THAT(log.messages.back(), HasSubstr("a.ptree: Is a directory"));
-  EXPECT_THAT(folder.names(kFile), ElementsAre("inside"));
-  unlink(folder.path(std::string(kFile) + "/inside").c_str());
-  rmdir(folder.path(kFile).c_str());
-  ASSERT_EQ(symlink("a.ptree", folder.path(kFile).c_str()), 0);
+  EXPECT_THAT(folder.names(kPreferencesFile), ElementsAre("inside"));
+  unlink(folder.path(std::string(kPreferencesFile) + "/inside").c_str());
+  rmdir(folder.path(kPreferencesFile).c_str());
+  ASSERT_EQ(symlink("a.ptree", folder.path(kPreferencesFile).c_str()), 0);
   EXPECT_FALSE(preferences.LGSPreferencesSynchronize("a"));
   EXPECT_THAT(log.messages.back(), HasSubstr("a.ptree: a symbolic link"));
-  EXPECT_EQ(modeOf(kFile) & S_IFMT, mode_t{S_IFLNK});
-  unlink(folder.path(kFile).c_str());
+  EXPECT_EQ(modeOf(kPreferencesFile) & S_IFMT, mode_t{S_IFLNK});
+  unlink(folder.path(kPreferencesFile).c_str());
   EXPECT_TRUE(preferences.LGSPreferencesSynchronize("a"));  // the change has waited
   EXPECT_EQ(found(), (PropertyDict{{"first", 1}}));
   const std::string longest(245, 'b');  // no longer name can be given to what is kept aside
@@ -147,14 +147,14 @@ TEST_F(PreferencesTest, NeverWriteOverWhatCannotBeRead) {
 
 TEST_F(PreferencesTest, AreNotWrittenWhileAnotherProcessKeepsTheFolder) {
   HostPreferences here(device, clock, log, "mobile", std::chrono::milliseconds(20));
-  folder.write(kFile, kOneKey);
+  folder.write(kPreferencesFile, kOneKey);
   here.LGSPreferencesSetValue("first", 2, "a");
   {
-    const auto kept = lockFolder(folder.path(kFolder), error);
+    const auto kept = lockFolder(folder.path(kPreferencesFolder), error);
     EXPECT_FALSE(here.LGSPreferencesSynchronize("a"));
     EXPECT_THAT(log.messages,
-                ElementsAre(folder.path(kFolder) + ": another process keeps it locked"));
-    EXPECT_EQ(folder.read(kFile), kOneKey);
+                ElementsAre(folder.path(kPreferencesFolder) + ": another process keeps it locked"));
+    EXPECT_EQ(folder.read(kPreferencesFile), kOneKey);
   }
   EXPECT_TRUE(here.LGSPreferencesSynchronize("a"));
   EXPECT_EQ(found(), (PropertyDict{{"first", 2}}));
@@ -167,13 +167,13 @@ TEST_F(PreferencesTest, EndWithoutAWordWhenNotEvenTheLogCanBeWritten) {
       throw std::bad_alloc();
     }
   } full;
-  folder.write(std::string(kFile) + "/inside", "a folder in place of the document");
+  folder.write(std::string(kPreferencesFile) + "/inside", "a folder in place of the document");
   {
     HostPreferences here(device, clock, full);
     here.LGSPreferencesSetValue("first", 1, "a");
     here.LGSPreferencesSetValue("first", 1, "b");
   }
-  EXPECT_THAT(folder.names(kFolder), ElementsAre("a.ptree", "b.ptree"));
+  EXPECT_THAT(folder.names(kPreferencesFolder), ElementsAre("a.ptree", "b.ptree"));
 }
 
 TEST_F(PreferencesTest, RefuseNamesThatLeadElsewhereAndValuesThatNoDocumentCarries) {
