@@ -27,10 +27,12 @@ if(VESPRUN_SANITIZERS)
   target_link_options(vesprun_options INTERFACE -fsanitize=${VESPRUN_SANITIZERS})
 endif()
 
-# The fuzzer sees which branches an input reaches.
+# What is fuzzed: the fuzzer sees which branches an input reaches.
+add_library(vesprun_fuzzed_options INTERFACE)
+target_link_libraries(vesprun_fuzzed_options INTERFACE vesprun_options)
 if(VESPRUN_FUZZERS)
   if(NOT CMAKE_CXX_COMPILER_ID MATCHES Clang)
     message(FATAL_ERROR "The fuzz targets need clang++: configure with --preset fuzz")
   endif()
-  target_compile_options(vesprun_options INTERFACE -fsanitize=fuzzer-no-link)
+  target_compile_options(vesprun_fuzzed_options INTERFACE -fsanitize=fuzzer-no-link)
 endif()

@@ -2,7 +2,7 @@
 #include <string_view>
 
 #include "Require.h"
-#include "store/ExportedLine.h"
+#include "vespfleet/store/ExportedLine.h"
 
 using namespace vesprun;
 
