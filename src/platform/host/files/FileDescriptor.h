@@ -2,6 +2,7 @@
 
 #include <unistd.h>
 
+#include <cerrno>
 #include <utility>
 
 namespace vesprun {
@@ -19,7 +20,9 @@ class FileDescriptor {
   }
   ~FileDescriptor() {
     if (_descriptor >= 0) {
+      const int cause = errno;  // of what the caller is about to report
       close(_descriptor);
+      errno = cause;
     }
   }
 

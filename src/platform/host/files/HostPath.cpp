@@ -76,19 +76,12 @@ FileDescriptor HostPath::open(int flags, mode_t mode) const {
     return FileDescriptor(::open(_text.c_str(), flags, mode));
   }
   const std::string named = _named == 0 ? "/" : _text.substr(0, _named);
-  const std::size_t begin = _text.find_first_not_of('/', _named);
-  const std::string rest = begin == std::string::npos ? "." : _text.substr(begin);
-  FileDescriptor opened;
-  int cause = 0;
-  {
-    const FileDescriptor folder(::open(named.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC));
-    if (folder.isOpen()) {
-      opened = openWithoutLinks(folder.get(), rest, flags, mode);
-    }
-    cause = errno;
-  }
-  errno = cause;  // which closing the folder may have changed
-  return opened;
+  const FileDescriptor folder(::open(named.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC));
+  const std::size_t rest = _text.find_first_not_of('/', _named);
+  return folder.isOpen()
+             ? openWithoutLinks(folder.get(), rest == std::string::npos ? "." : _text.substr(rest),
+                                flags, mode)
+             : FileDescriptor();
 }
 
 std::optional<struct stat> HostPath::status() const {

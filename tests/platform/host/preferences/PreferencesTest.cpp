@@ -137,7 +137,7 @@ TEST_F(PreferencesTest, NeverWriteOverWhatCannotBeRead) {
   EXPECT_TRUE(preferences.LGSPreferencesSynchronize("a"));  // the change has waited
   EXPECT_EQ(found(), (PropertyDict{{"first", 1}}));
   const std::string longest(245, 'b');  // no longer name can be given to what is kept aside
-  const std::string malformed = std::string(kFolder) + '/' + longest + ".ptree";
+  const std::string malformed = std::string(kPreferencesFolder) + "/" + longest + ".ptree";
   folder.write(malformed, "no document");
   preferences.LGSPreferencesSetValue("first", 1, longest);
   EXPECT_FALSE(preferences.LGSPreferencesSynchronize(longest));
