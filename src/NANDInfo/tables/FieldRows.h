@@ -168,10 +168,12 @@ constexpr FieldTable fieldTableOf() {
   return FieldTable(kFieldIndexOf<kFieldsOf<kList>>, kPlacesOfRows<kList>.places);
 }
 
-/// The row of a field, counted from 1; 0 when it has none. A field in two rows does not compile.
+/// All of them. A field in two rows does not compile.
+inline constexpr FieldTable kAllFields = fieldTable<fieldRows::kRanges>();
+
+/// The row of a field, counted from 1; 0 when it has none.
 constexpr std::uint16_t rowOfField(std::string_view name) {
-  constexpr FieldTable kAll = fieldTable<fieldRows::kRanges>();
-  const FieldRange* const fields = kAll.find(name);
+  const FieldRange* const fields = kAllFields.find(name);
   return fields != nullptr ? static_cast<std::uint16_t>(fields - fieldRows::kRanges.data() + 1)
                            : std::uint16_t{0};
 }
