@@ -293,6 +293,10 @@ def test_answers(store, folder, chance):
 
     assert ask("forget", store, "D3", "D39")[0]["devices"] == 2
     lines = [text for text in lines if json.loads(text)["device"] not in ("D3", "D39")]
+    if "://" not in store:
+        run("load", store, "-", data=line("a device to be forgotten").encode())
+        ask("forget", store, "a device to be forgotten")
+        assert b"to be forgotten" not in Path(store).read_bytes()
     assert_answers(store, Model(lines))
     # The newest days have a single device, or a wrong clock.
     lines += [line("D7", DAY + 3)] + [line(f"D{device}", 84005) for device in range(10, 16)]
