@@ -7,8 +7,8 @@
 #include <string_view>
 #include <vector>
 
-#include "NANDInfo/parsers/KnownNames.h"
 #include "NANDInfo/tables/FieldTable.h"
+#include "NANDInfo/tables/KnownNames.h"
 #include "vesprun/PropertyDict.h"
 
 namespace vesprun {

@@ -4,7 +4,7 @@
 #include <array>
 #include <functional>
 
-#include "NANDInfo/parsers/KnownNamesOf.h"
+#include "NANDInfo/tables/KnownNamesOf.h"
 
 namespace vesprun {
 

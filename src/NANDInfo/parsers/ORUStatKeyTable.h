@@ -5,7 +5,7 @@
 #include <span>
 #include <string_view>
 
-#include "NANDInfo/parsers/KnownNames.h"
+#include "NANDInfo/tables/KnownNames.h"
 
 namespace vesprun {
 

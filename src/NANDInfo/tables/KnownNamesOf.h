@@ -6,9 +6,9 @@
 #include <string_view>
 #include <type_traits>
 
-#include "NANDInfo/parsers/KnownNames.h"
 #include "NANDInfo/tables/FieldName.h"
 #include "NANDInfo/tables/FieldRows.h"
+#include "NANDInfo/tables/KnownNames.h"
 
 namespace vesprun {
 
