@@ -33,22 +33,12 @@ std::int32_t today() { return static_cast<std::int32_t>(std::time(nullptr) / kSe
 struct Asked {
   std::string store;
   Question question;
-  std::optional<GivenDay> from;
-  std::optional<GivenDay> to;
+  GivenDays days;
   ComparedGroups groups;
   std::vector<std::string> devices;
-  std::int32_t days = 0;
+  std::int32_t keptDays = 0;
 
-  DayRange range() const {
-    DayRange range;
-    if (from) {
-      range.from = from->on(today());
-    }
-    if (to) {
-      range.to = to->on(today());
-    }
-    return range;
-  }
+  DayRange range() const { return {days.first(today()), days.last(today())}; }
 };
 
 std::unique_ptr<FleetStore> openStore(const std::string& address, StoreUse use = StoreUse::Ask) {
@@ -66,11 +56,6 @@ std::shared_ptr<Asked> addAsked(CLI::App& command) {
   const auto asked = std::make_shared<Asked>();
   addStore(command, asked->store);
   return asked;
-}
-
-void addRange(CLI::App& command, Asked& asked) {
-  addDay(command, "--from", asked.from, "The first day");
-  addDay(command, "--to", asked.to, "The last day");
 }
 
 void addLeast(CLI::App& command, std::uint64_t& least) {
@@ -210,7 +195,7 @@ void addDevices(CLI::App& command) {
 std::shared_ptr<Asked> addQuestion(CLI::App& command) {
   const auto asked = addAsked(command);
   command.add_option("KEY", asked->question.key, "The key")->required()->type_name("");
-  addRange(command, *asked);
+  addDays(command, asked->days);
   addBy(command, asked->question.by, true);
   command.add_flag("--total", asked->question.total, "All days together");
   addLeast(command, asked->question.least);
@@ -245,7 +230,7 @@ void addCompare(CLI::App& command) {
   addGroup("A", asked->groups.values[0], "The devices to compare with");
   addGroup("B", asked->groups.values[1], "The devices that are compared");
   addBy(command, asked->groups.by, true)->required();
-  addRange(command, *asked);
+  addDays(command, asked->days);
   command.add_option("--key", asked->groups.prefix, "Only keys that begin so")->type_name("PREFIX");
   addLeast(command, asked->question.least);
   command.callback([asked] {
@@ -268,7 +253,7 @@ void addCompare(CLI::App& command) {
 void addDump(CLI::App& command) {
   const auto asked = addAsked(command);
   command.add_option("--key", asked->groups.prefix, "Only keys that begin so")->type_name("PREFIX");
-  addRange(command, *asked);
+  addDays(command, asked->days);
   command.callback([asked] {
     const auto store = openStore(asked->store);
     std::cout << FigureRows::kColumns;
@@ -313,14 +298,14 @@ void addForget(CLI::App& command) {
 
 void addPrune(CLI::App& command) {
   const auto asked = addAsked(command);
-  command.add_option("--days", asked->days, "Days to keep before the newest")
+  command.add_option("--days", asked->keptDays, "Days to keep before the newest")
       ->required()
       ->type_name("N")
       ->transform(decimal<std::int32_t>())
       ->check(CLI::Range(0, 100'000));
   command.callback([asked] {
     const Removal removal =
-        openStore(asked->store, StoreUse::Change)->prune(asked->days, today() + 1);
+        openStore(asked->store, StoreUse::Change)->prune(asked->keptDays, today() + 1);
     if (isJson()) {
       Results({}, true).print(
           {{"lines", removal.lines}, {"firstDay", removal.firstDay.value_or(0)}});

@@ -10,6 +10,8 @@
 namespace vesprun {
 namespace {
 
+using HealthLevel = HealthStatement::Level;
+
 // Percentages: of the rated erase cycles, of the spare blocks, of the capacity.
 constexpr double kWearToLookAt = 80;
 constexpr double kWearToActOn = 100;
@@ -90,16 +92,16 @@ struct Statements : Facts {
   using Facts::Facts;
 
   template <typename... Days>
-  void add(HealthStatement::Level level, const std::string& text, Days... days) {
+  void add(HealthLevel level, const std::string& text, Days... days) {
     list.push_back({level, text, std::max({days...})});
   }
 
   /// A counter that should be 0.
-  void addFailures(Names names, HealthStatement::Level ifAny, const std::string& none,
-                   const char* noun, const std::string& some) {
+  void addFailures(Names names, HealthLevel ifAny, const std::string& none, const char* noun,
+                   const std::string& some) {
     if (const auto fact = find(names)) {
       const auto count = static_cast<std::size_t>(std::min(fact->value, 1e18));
-      add(count == 0 ? HealthStatement::Level::Good : ifAny,
+      add(count == 0 ? HealthLevel::Good : ifAny,
           count == 0 ? none : countedNoun(count, noun) + some, fact->day);
     }
   }
@@ -112,9 +114,9 @@ std::string percentText(double value) { return numeral(value) + "\u202F%"; }
 void addWear(Statements& statements) {
   const auto addUsed = [&statements](Names names, const char* where) {
     if (const auto used = statements.find(names)) {
-      statements.add(used->value >= kWearToActOn    ? HealthStatement::Level::Act
-                     : used->value >= kWearToLookAt ? HealthStatement::Level::Look
-                                                    : HealthStatement::Level::Good,
+      statements.add(used->value >= kWearToActOn    ? HealthLevel::Act
+                     : used->value >= kWearToLookAt ? HealthLevel::Look
+                                                    : HealthLevel::Good,
                      percentText(used->value) + " of the rated erase cycles of the " + where +
                          " partition are used.",
                      used->day);
@@ -125,16 +127,16 @@ void addWear(Statements& statements) {
   const auto user = statements.find({"HLT_averageTLCPECycles"});
   const auto intermediate = statements.find({"HLT_averageSLCPECycles"});
   if (user && intermediate) {
-    statements.add(HealthStatement::Level::Plain,
+    statements.add(HealthLevel::Plain,
                    "A TLC block has been erased " + numeral(user->value) +
                        " times on average, an SLC block " + numeral(intermediate->value) +
                        " times.",
                    user->day, intermediate->day);
   }
   if (const auto spare = statements.find({"spareAvailablePercent"})) {
-    statements.add(spare->value <= kSpareToActOn    ? HealthStatement::Level::Act
-                   : spare->value <= kSpareToLookAt ? HealthStatement::Level::Look
-                                                    : HealthStatement::Level::Good,
+    statements.add(spare->value <= kSpareToActOn    ? HealthLevel::Act
+                   : spare->value <= kSpareToLookAt ? HealthLevel::Look
+                                                    : HealthLevel::Good,
                    percentText(spare->value) + " of the spare blocks are available.", spare->day);
   }
 }
@@ -143,24 +145,23 @@ void addFaults(Statements& statements) {
   const auto factory = statements.find({"numFactoryBad", "numFactoryBadBlocks"});
   const std::string since =
       factory ? "; " + numeral(factory->value) + " were bad from the factory." : ".";
-  statements.addFailures({"numGrownBad"}, HealthStatement::Level::Look,
-                         "No block has gone bad in use" + since, "block",
-                         " went bad in use" + since);
-  statements.addFailures({"numPfail"}, HealthStatement::Level::Look,
-                         "No program operation has failed.", "program operation", " failed.");
-  statements.addFailures({"numEfail"}, HealthStatement::Level::Look,
-                         "No erase operation has failed.", "erase operation", " failed.");
-  statements.addFailures({"numDieFailures"}, HealthStatement::Level::Act, "No die has failed.",
-                         "die failure", " counted.");
+  statements.addFailures({"numGrownBad"}, HealthLevel::Look, "No block has gone bad in use" + since,
+                         "block", " went bad in use" + since);
+  statements.addFailures({"numPfail"}, HealthLevel::Look, "No program operation has failed.",
+                         "program operation", " failed.");
+  statements.addFailures({"numEfail"}, HealthLevel::Look, "No erase operation has failed.",
+                         "erase operation", " failed.");
+  statements.addFailures({"numDieFailures"}, HealthLevel::Act, "No die has failed.", "die failure",
+                         " counted.");
   statements.addFailures({"raidFailedReconstructionHost", "FailedReconstructionNonGC"},
-                         HealthStatement::Level::Act,
+                         HealthLevel::Act,
                          "Data that the system read has always been reconstructed.",
                          "reconstruction", " of data that the system read failed.");
   statements.addFailures({"raidFailedReconstructionInternal", "FailedReconstructionGC"},
-                         HealthStatement::Level::Act,
+                         HealthLevel::Act,
                          "Data that was moved internally has always been reconstructed.",
                          "reconstruction", " of data that was moved internally failed.");
-  statements.addFailures({"UncleanBoots", "uncleanBoots"}, HealthStatement::Level::Plain,
+  statements.addFailures({"UncleanBoots", "uncleanBoots"}, HealthLevel::Plain,
                          "No start followed an unclean shutdown.", "start",
                          " followed an unclean shutdown.");
 }
@@ -170,15 +171,15 @@ void addUse(Statements& statements) {
     constexpr double kBasisPoints = 100;
     const double share = full->value / kBasisPoints;
     const auto capacity = statements.find({"HLT_OR_Capacity_GB"});
-    statements.add(
-        share >= kFullnessToLookAt ? HealthStatement::Level::Look : HealthStatement::Level::Plain,
-        "The storage" + (capacity ? " of " + numeral(capacity->value) + "\u202FGB" : "") + " is " +
-            percentText(std::round(share)) + " full.",
-        full->day);
+    statements.add(share >= kFullnessToLookAt ? HealthLevel::Look : HealthLevel::Plain,
+                   "The storage" +
+                       (capacity ? " of " + numeral(capacity->value) + "\u202FGB" : "") + " is " +
+                       percentText(std::round(share)) + " full.",
+                   full->day);
   }
   if (const auto amplification = statements.find({"UserWamp"})) {
     statements.add(
-        HealthStatement::Level::Plain,
+        HealthLevel::Plain,
         "The write amplification of the user partition is " + numeral(amplification->value) + ".",
         amplification->day);
   }
@@ -186,7 +187,7 @@ void addUse(Statements& statements) {
   const auto addGrowth = [&](Names names, const char* period) {
     const auto growth = statements.find(names);
     if (growth && written && written->value > 0) {
-      statements.add(HealthStatement::Level::Plain,
+      statements.add(HealthLevel::Plain,
                      "Writing of the last " + std::string(period) + " is " +
                          percentText(std::round(growth->value / written->value * 1e4) / 1e2) +
                          " of all that the system has ever written.",
@@ -197,7 +198,7 @@ void addUse(Statements& statements) {
   addGrowth({"SM.WeeklyMA.hostWrites"}, "seven days");
   addGrowth({"SM.Monthly.hostWrites"}, "thirty days");
   if (const auto hours = statements.find({"powerOnHours", "PowerOnHours"})) {
-    statements.add(HealthStatement::Level::Plain,
+    statements.add(HealthLevel::Plain,
                    "The storage has been powered for " + numeral(hours->value) + " hours.",
                    hours->day);
   }

@@ -90,7 +90,7 @@ Date date(Element value) {
     }
   }
   const PropertyValue meaning = withMeaning(value);
-  require(meaning.date() != nullptr, "a creation date that is none");
+  require(meaning.date() != nullptr, "a creation date that is not a date");
   return *meaning.date();
 }
 
@@ -145,11 +145,11 @@ std::optional<std::string> textOrNull(Element value, const char* why) {
 
 ExportedLine readLine(Object line, int version) {
   const std::size_t entries = version == 1 ? 9 : 11;
-  require(integer(entry(line, "version"), INT64_MIN, INT64_MAX, "a version that is no integer") ==
-              version,
+  require(integer(entry(line, "version"), INT64_MIN, INT64_MAX,
+                  "a version that is not an integer") == version,
           "another version");
   ExportedLine read;
-  read.device = text(entry(line, "device"), "a device that is no text");
+  read.device = text(entry(line, "device"), "a device that is not text");
   require(!read.device.empty(), "an empty device");
   require(read.device.size() <= kMaxDevice, "a device of more than 255 bytes");
   read.day = static_cast<std::int32_t>(
@@ -157,25 +157,27 @@ ExportedLine readLine(Object line, int version) {
   read.revision =
       integer(entry(line, "revision"), 1, kMaxInt32, "a revision that is not from 1 to 2^31 - 1");
   if (version != 1) {
-    read.build = textOrNull(entry(line, "build"), "a build that is no text");
-    read.model = textOrNull(entry(line, "model"), "a model that is no text");
+    read.build = textOrNull(entry(line, "build"), "a build that is not text");
+    read.model = textOrNull(entry(line, "model"), "a model that is not text");
   }
   read.created = date(entry(line, "created"));
-  read.whitelist = text(entry(line, "whitelist"), "a whitelist digest that is no text");
+  read.whitelist = text(entry(line, "whitelist"), "a whitelist digest that is not text");
 
-  const auto scalars = as<Object>(entry(line, "scalars"), "scalars that are no object");
+  const auto scalars = as<Object>(entry(line, "scalars"), "scalars that are not an object");
   read.scalars.reserve(scalars.size());
   for (const auto [name, value] : scalars) {
-    read.scalars.push_back({std::string(key(name)), integer(value, INT64_MIN, INT64_MAX,
-                                                            "a scalar that is no 64-bit integer")});
+    read.scalars.push_back(
+        {std::string(key(name)),
+         integer(value, INT64_MIN, INT64_MAX, "a scalar that is not a 64-bit integer")});
   }
   const auto distributions =
-      as<Object>(entry(line, "distributions"), "distributions that are no object");
+      as<Object>(entry(line, "distributions"), "distributions that are not an object");
   require(scalars.size() + distributions.size() <= kMaxKeys, "more than 20,000 keys");
-  const auto histograms = as<Object>(entry(line, "histograms"), "histograms that are no object");
+  const auto histograms =
+      as<Object>(entry(line, "histograms"), "histograms that are not an object");
   std::map<std::string_view, Histogram> histogramOf;
   for (const auto [name, value] : histograms) {
-    histogramOf[key(name)] = readHistogram(as<Object>(value, "a histogram that is no object"));
+    histogramOf[key(name)] = readHistogram(as<Object>(value, "a histogram that is not an object"));
   }
   read.distributions.reserve(distributions.size());
   for (const auto [name, value] : distributions) {

@@ -20,7 +20,7 @@ class FileDescriptor {
   }
   ~FileDescriptor() {
     if (_descriptor >= 0) {
-      const int cause = errno;  // of what the caller is about to report
+      const int cause = errno;  // which the caller is about to report
       close(_descriptor);
       errno = cause;
     }
