@@ -41,7 +41,7 @@ struct Grouping {
 /// The values of a question's key, from a table.
 std::string valuesOf(const Question& question, KeyKind kind, const std::string& source,
                      const std::string& columns) {
-  const std::string share = std::to_string(shareOf(question.key));
+  const std::string share = std::to_string(shareOf(question.key, kind));
   const std::string at =
       "indexOf(" + std::string(keysOf(kind)) + share + ", " + literal(question.key) + ") AS at";
   return "(SELECT * FROM (SELECT day" + (question.total ? std::string(", device") : std::string()) +
@@ -50,21 +50,22 @@ std::string valuesOf(const Question& question, KeyKind kind, const std::string& 
          ") WHERE at != 0)";
 }
 
-std::string shared(const Question& question, const char* name) {
-  return column(name, shareOf(question.key));
+std::string shared(const Question& question, KeyKind kind, const char* name) {
+  return column(name, shareOf(question.key, kind));
 }
 
 std::string scalarsOf(const Question& question, const std::string& source) {
-  return valuesOf(question, KeyKind::Scalar, source, shared(question, "values") + "[at] AS value");
+  return valuesOf(question, KeyKind::Scalar, source,
+                  shared(question, KeyKind::Scalar, "values") + "[at] AS value");
 }
 
 /// With means, deviations and counts.
 std::string distributionsOf(const Question& question, const std::string& source) {
-  const std::string figures = shared(question, "figures");
+  const std::string figures = shared(question, KeyKind::Distribution, "figures");
   return valuesOf(question, KeyKind::Distribution, source,
                   figures + "[4 * at - 1] AS mean, " + figures + "[4 * at] AS deviation, " +
-                      shared(question, "counts") + "[at] AS number, " +
-                      shared(question, "histograms") + "[at] AS counted");
+                      shared(question, KeyKind::Distribution, "counts") + "[at] AS number, " +
+                      shared(question, KeyKind::Distribution, "histograms") + "[at] AS counted");
 }
 
 }  // namespace
@@ -161,23 +162,23 @@ void ClickHouseStore::visitScalars(const Question& question, const VisitScalar& 
 ClickHouseStore::LabelCounts ClickHouseStore::labelsOf(const Question& question) {
   const Grouping grouping(question);
   LabelCounts labels;
-  readRows(_server,
-           "SELECT " + grouping.day + ", " + grouping.member +
-               ", label, toUInt64(sum(bucket)) FROM " +
-               valuesOf(question, KeyKind::Distribution, _source,
-                        shared(question, "labels") + "[at] AS labels, " +
-                            shared(question, "buckets") + "[at] AS buckets") +
-               " ARRAY JOIN labels AS label, buckets AS bucket GROUP BY " +
-               (grouping.columns.empty() ? "" : grouping.columns + ", ") + "label HAVING " +
-               (question.total ? "uniqExact(device)" : "count()") +
-               " >= " + std::to_string(question.least),
-           [&](PackedReader& row) {
-             const auto day = row.raw<std::int32_t>();
-             MemberText member = readText(row);
-             std::string label = row.text();
-             const auto counted = row.raw<std::uint64_t>();
-             labels[{day, std::move(member)}][std::move(label)] = counted;
-           });
+  readRows(
+      _server,
+      "SELECT " + grouping.day + ", " + grouping.member + ", label, toUInt64(sum(bucket)) FROM " +
+          valuesOf(question, KeyKind::Distribution, _source,
+                   shared(question, KeyKind::Distribution, "labels") + "[at] AS labels, " +
+                       shared(question, KeyKind::Distribution, "buckets") + "[at] AS buckets") +
+          " ARRAY JOIN labels AS label, buckets AS bucket GROUP BY " +
+          (grouping.columns.empty() ? "" : grouping.columns + ", ") + "label HAVING " +
+          (question.total ? "uniqExact(device)" : "count()") +
+          " >= " + std::to_string(question.least),
+      [&](PackedReader& row) {
+        const auto day = row.raw<std::int32_t>();
+        MemberText member = readText(row);
+        std::string label = row.text();
+        const auto counted = row.raw<std::uint64_t>();
+        labels[{day, std::move(member)}][std::move(label)] = counted;
+      });
   return labels;
 }
 

@@ -18,15 +18,9 @@ std::string lineColumns() {
   std::string columns =
       "day Int32, device String, rank UInt64, revision Int64, seconds Int64, nanoseconds UInt32, "
       "digest FixedString(32), build Array(String), model Array(String), whitelist Array(String)";
-  constexpr std::pair<const char*, const char*> kShared[] = {
-      {"scalars", "String"},       {"values", "Int64"},         {"distributions", "String"},
-      {"figures", "Float64"},      {"counts", "Int64"},         {"histograms", "UInt8"},
-      {"labels", "Array(String)"}, {"buckets", "Array(UInt64)"}};
-  for (int share = 0; share < kShares; ++share) {
-    for (const auto& [name, type] : kShared) {
-      columns += ", " + column(name, share) + " Array(" + type + ")";
-    }
-  }
+  visitShared([&](const std::string& name, const char* type) {
+    columns += ", " + name + " Array(" + type + ")";
+  });
   return columns;
 }
 

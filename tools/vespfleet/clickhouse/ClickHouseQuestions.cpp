@@ -9,8 +9,8 @@ void ClickHouseStore::visitKeys(const VisitKey& visit) {
   std::map<std::pair<std::string, KeyKind>, ReportedKey> keys;
   whileUnchanged({}, [&] {
     keys.clear();
-    for (int share = 0; share < kShares; ++share) {
-      for (const KeyKind kind : {KeyKind::Scalar, KeyKind::Distribution}) {
+    for (const KeyKind kind : {KeyKind::Scalar, KeyKind::Distribution}) {
+      for (std::size_t share = 0; share < sharesOf(kind); ++share) {
         const std::string names = column(keysOf(kind), share);
         readRows(_server,
                  "SELECT key, uniqExact(device), uniqExact(day) FROM (SELECT day, device, " +
@@ -30,7 +30,7 @@ void ClickHouseStore::visitKeys(const VisitKey& visit) {
 }
 
 bool ClickHouseStore::hasKey(std::string_view key, KeyKind kind) {
-  const std::string names = column(keysOf(kind), shareOf(key));
+  const std::string names = column(keysOf(kind), shareOf(key, kind));
   return isAnywhere(names, "has(" + names + ", " + literal(key) + ")");
 }
 
@@ -75,7 +75,7 @@ void ClickHouseStore::visitSpreads(const ComparedGroups& groups, const VisitSpre
                                                          std::to_string(groups.prefix.size()) +
                                                          ") = " + literal(groups.prefix);
   std::map<std::pair<std::string, KeyKind>, KeySpreads> spreads;
-  const auto ask = [&](int share, KeyKind kind) {
+  const auto ask = [&](std::size_t share, KeyKind kind) {
     const bool isScalar = kind == KeyKind::Scalar;
     const std::string keys = column(keysOf(kind), share);
     const std::string values = column(isScalar ? "values" : "figures", share);
@@ -124,9 +124,10 @@ void ClickHouseStore::visitSpreads(const ComparedGroups& groups, const VisitSpre
   };
   whileUnchanged(groups.days, [&] {
     spreads.clear();
-    for (int share = 0; share < kShares; ++share) {
-      ask(share, KeyKind::Scalar);
-      ask(share, KeyKind::Distribution);
+    for (const KeyKind kind : {KeyKind::Scalar, KeyKind::Distribution}) {
+      for (std::size_t share = 0; share < sharesOf(kind); ++share) {
+        ask(share, kind);
+      }
     }
   });
   for (auto& [key, found] : spreads) {
@@ -137,12 +138,7 @@ void ClickHouseStore::visitSpreads(const ComparedGroups& groups, const VisitSpre
 void ClickHouseStore::visitLines(const DayRange& days, const std::string& prefix,
                                  const VisitLine& visit) {
   std::string columns = "SELECT day, device, revision, build, model";
-  for (int share = 0; share < kShares; ++share) {
-    for (const char* const name : {"scalars", "values", "distributions", "figures", "counts",
-                                   "histograms", "labels", "buckets"}) {
-      columns += ", " + column(name, share);
-    }
-  }
+  visitShared([&](const std::string& name, const char*) { columns += ", " + name; });
   const auto readLine = [&](PackedReader& row) {
     ExportedLine line;
     line.day = row.raw<std::int32_t>();
@@ -150,7 +146,7 @@ void ClickHouseStore::visitLines(const DayRange& days, const std::string& prefix
     line.revision = row.raw<std::int64_t>();
     line.build = readText(row);
     line.model = readText(row);
-    for (int share = 0; share < kShares; ++share) {
+    for (std::size_t share = 0; share < sharesOf(KeyKind::Scalar); ++share) {
       auto scalars = readArray<std::string>(row);
       const auto values = readArray<std::int64_t>(row);
       for (std::size_t i = 0; i < scalars.size(); ++i) {
@@ -158,6 +154,8 @@ void ClickHouseStore::visitLines(const DayRange& days, const std::string& prefix
           line.scalars.push_back({std::move(scalars[i]), values.at(i)});
         }
       }
+    }
+    for (std::size_t share = 0; share < sharesOf(KeyKind::Distribution); ++share) {
       auto distributions = readArray<std::string>(row);
       const auto figures = readArray<double>(row);
       const auto counts = readArray<std::int64_t>(row);

@@ -1,15 +1,37 @@
 #include "ClickHouseSql.h"
 
+#include <span>
+
 #include "common/HexText.h"
 
 namespace vesprun {
 
-int shareOf(std::string_view key) {
+std::size_t shareOf(std::string_view key, KeyKind kind) {
   std::uint32_t mixed = 2166136261;  // FNV-1a
   for (const char byte : key) {
     mixed = (mixed ^ static_cast<std::uint8_t>(byte)) * 16777619;
   }
-  return static_cast<int>((mixed ^ mixed >> 16) % kShares);
+  return (mixed ^ mixed >> 16) % sharesOf(kind);
+}
+
+void visitShared(const std::function<void(const std::string& name, const char* type)>& visit) {
+  struct Column {
+    const char* name;
+    const char* type;
+  };
+  constexpr Column kScalars[] = {{"scalars", "String"}, {"values", "Int64"}};
+  constexpr Column kDistributions[] = {{"distributions", "String"}, {"figures", "Float64"},
+                                       {"counts", "Int64"},         {"histograms", "UInt8"},
+                                       {"labels", "Array(String)"}, {"buckets", "Array(UInt64)"}};
+  const auto visitAll = [&](std::span<const Column> columns, std::size_t shares) {
+    for (std::size_t share = 0; share < shares; ++share) {
+      for (const auto& [name, type] : columns) {
+        visit(column(name, share), type);
+      }
+    }
+  };
+  visitAll(kScalars, sharesOf(KeyKind::Scalar));
+  visitAll(kDistributions, sharesOf(KeyKind::Distribution));
 }
 
 std::string hexOf(std::string_view bytes) {

@@ -2,6 +2,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <stdexcept>
 #include <string>
 #include <string_view>
@@ -20,12 +21,18 @@ inline constexpr const char* kLineTable = "vespfleet_report";
 inline constexpr const char* kRuleTable = "vespfleet_rule";
 inline constexpr const char* kUniqueTable = "vespfleet_unique";
 
-/// How many columns the keys are spread over.
-inline constexpr int kShares = 4;
-int shareOf(std::string_view key);
+/// How many shares the keys of a kind are spread over. Each costs a load its columns, also where
+/// they are empty, and a distribution has six.
+constexpr std::size_t sharesOf(KeyKind kind) { return kind == KeyKind::Scalar ? 4 : 2; }
+std::size_t shareOf(std::string_view key, KeyKind kind);
 
 /// A column of a share, such as "scalars3".
-inline std::string column(const char* name, int share) { return name + std::to_string(share); }
+inline std::string column(const char* name, std::size_t share) {
+  return name + std::to_string(share);
+}
+
+/// The columns of all shares in their order, with the type of an entry.
+void visitShared(const std::function<void(const std::string& name, const char* type)>& visit);
 
 std::string hexOf(std::string_view bytes);
 

@@ -1,7 +1,10 @@
 #include "ClickHouseStore.h"
 
+#include <endian.h>
+
 #include <algorithm>
 #include <chrono>
+#include <cstring>
 #include <thread>
 
 #include "ClickHouseSql.h"
@@ -9,7 +12,7 @@
 namespace vesprun {
 namespace {
 
-constexpr std::size_t kBatchSize = 24U * 1024 * 1024;  // one is sent while the next is filled
+constexpr std::size_t kBatchSize = 48U * 1024 * 1024;  // one is sent while the next is filled
 constexpr std::size_t kPartitionsOfInsert = 90;        // servers refuse more than 100
 
 void appendTexts(std::string& row, const MemberText& text) {
@@ -26,12 +29,17 @@ std::uint64_t engineRank(const ExportedLine& line) {
   return static_cast<std::uint64_t>(line.revision) << 32 | seconds;
 }
 
-/// A row of the table of lines.
-std::string rowOf(const ExportedLine& line, std::size_t& placeSize) {
-  std::string row;
-  appendRaw(row, line.day);
-  appendText(row, line.device);
-  placeSize = row.size();
+template <KeyKind kKind, typename Reported>
+auto inShares(const std::vector<Reported>& all) {
+  std::array<std::vector<const Reported*>, sharesOf(kKind)> shares;
+  for (const Reported& one : all) {
+    shares[shareOf(one.key, kKind)].push_back(&one);
+  }
+  return shares;
+}
+
+/// Appends what is behind day and device in a row of the table of lines.
+void appendReport(std::string& row, const ExportedLine& line) {
   appendRaw(row, engineRank(line));
   appendRaw(row, line.revision);
   appendRaw(row, line.created.seconds);
@@ -40,20 +48,16 @@ std::string rowOf(const ExportedLine& line, std::size_t& placeSize) {
   appendTexts(row, line.build);
   appendTexts(row, line.model);
   appendTexts(row, line.whitelist);
-  std::array<std::vector<const ReportedScalar*>, kShares> scalars;
-  for (const ReportedScalar& scalar : line.scalars) {
-    scalars[static_cast<std::size_t>(shareOf(scalar.key))].push_back(&scalar);
-  }
-  std::array<std::vector<const ReportedDistribution*>, kShares> distributions;
-  for (const ReportedDistribution& distribution : line.distributions) {
-    distributions[static_cast<std::size_t>(shareOf(distribution.key))].push_back(&distribution);
-  }
   const auto each = [&row](const auto& entries, std::size_t figures, const auto& append) {
     appendVarint(row, entries.size() * figures);
     for (const auto* entry : entries) {
       append(*entry);
     }
   };
+  for (const auto& of : inShares<KeyKind::Scalar>(line.scalars)) {
+    each(of, 1, [&](const ReportedScalar& one) { appendText(row, one.key); });
+    each(of, 1, [&](const ReportedScalar& one) { appendRaw(row, one.value); });
+  }
   const Histogram none;
   const auto eachLabel = [&](const ReportedDistribution& one, const auto& append) {
     const Histogram& counts = one.values.histogram ? *one.values.histogram : none;
@@ -62,10 +66,7 @@ std::string rowOf(const ExportedLine& line, std::size_t& placeSize) {
       append(label, count);
     }
   };
-  for (std::size_t share = 0; share < kShares; ++share) {
-    each(scalars[share], 1, [&](const ReportedScalar& one) { appendText(row, one.key); });
-    each(scalars[share], 1, [&](const ReportedScalar& one) { appendRaw(row, one.value); });
-    const auto& of = distributions[share];
+  for (const auto& of : inShares<KeyKind::Distribution>(line.distributions)) {
     each(of, 1, [&](const ReportedDistribution& one) { appendText(row, one.key); });
     each(of, 4, [&](const ReportedDistribution& one) {
       const Statistics& values = one.values.statistics;
@@ -85,23 +86,27 @@ std::string rowOf(const ExportedLine& line, std::size_t& placeSize) {
       eachLabel(one, [&](const std::string&, std::uint64_t count) { appendRaw(row, count); });
     });
   }
-  return row;
 }
 
 }  // namespace
 
 void ClickHouseStore::add(const ExportedLine& line) {
   const std::int32_t partition = line.day / kDaysOfPartition;
-  if (_batchSize >= kBatchSize ||
+  if (_batch.rows.size() + _batch.lines.size() * sizeof(Batch::Line) >= kBatchSize ||
       (_batchPartitions.size() >= kPartitionsOfInsert && !_batchPartitions.contains(partition))) {
     sendBatch();
   }
   _batchPartitions.insert(partition);
-  Arrived& arrived = _batch.emplace_back();
-  arrived.day = line.day;
-  arrived.rank = {line.revision, line.created.seconds, line.created.nanoseconds, line.digest};
-  arrived.row = rowOf(line, arrived.placeSize);
-  _batchSize += arrived.row.size() + sizeof(Arrived);
+  std::string& rows = _batch.rows;
+  rows.reserve(kBatchSize);
+  Batch::Line added{rows.size(), 0, line.device.size(), 0, line.day, {}};
+  added.rank = {line.revision, line.created.seconds, line.created.nanoseconds, line.digest};
+  appendRaw(rows, line.day);
+  appendText(rows, line.device);
+  added.placeSize = rows.size() - added.begin;
+  appendReport(rows, line);
+  added.size = rows.size() - added.begin;
+  _batch.lines.push_back(added);
 }
 
 /// Sends a batch while the next one is filled.
@@ -109,8 +114,7 @@ void ClickHouseStore::sendBatch() {
   waitForBatch();
   _sent = std::async(std::launch::async,
                      [this, batch = std::move(_batch)]() mutable { send(std::move(batch)); });
-  _batch.clear();
-  _batchSize = 0;
+  _batch = {};
   _batchPartitions.clear();
 }
 
@@ -120,50 +124,84 @@ void ClickHouseStore::waitForBatch() {
   }
 }
 
-/// Sends the lines of a batch that come after what is stored, one for each device and day.
-void ClickHouseStore::send(std::vector<Arrived> batch) {
+/// Sorts lines by day and device, as the table does, and those of one place as they came.
+void ClickHouseStore::sort(Batch& batch) {
+  struct Place {
+    std::int32_t day;
+    std::uint64_t head;  ///< eight bytes of the device, behind those that all have in common
+    std::size_t line;
+  };
+  const std::vector<Batch::Line>& lines = batch.lines;
+  std::string_view common = lines.empty() ? "" : batch.device(lines.front());
+  for (const Batch::Line& line : lines) {
+    const std::string_view device = batch.device(line).substr(0, common.size());
+    common = {common.data(), static_cast<std::size_t>(
+                                 std::mismatch(device.begin(), device.end(), common.begin()).first -
+                                 device.begin())};
+  }
+  std::vector<Place> places;
+  places.reserve(lines.size());
+  for (const Batch::Line& line : lines) {
+    const std::string_view rest = batch.device(line).substr(common.size());
+    std::uint64_t head = 0;
+    std::memcpy(&head, rest.data(), std::min(rest.size(), sizeof head));
+    places.push_back({line.day, be64toh(head), places.size()});
+  }
+  std::sort(places.begin(), places.end(), [&](const Place& left, const Place& right) {
+    if (left.day != right.day || left.head != right.head) {
+      return std::tie(left.day, left.head) < std::tie(right.day, right.head);
+    }
+    const int order = batch.device(lines[left.line]).compare(batch.device(lines[right.line]));
+    return order != 0 ? order < 0 : left.line < right.line;
+  });
+  std::vector<Batch::Line> sorted;
+  sorted.reserve(lines.size());
+  for (const Place& place : places) {
+    sorted.push_back(lines[place.line]);
+  }
+  batch.lines = std::move(sorted);
+}
+
+/// Sends the lines of a batch that come after what is stored, one for each device and day, in the
+/// order of the table: the server then need not sort them.
+void ClickHouseStore::send(Batch batch) {
   readRules();
-  std::erase_if(batch, [this](const Arrived& line) {
-    PackedReader place(line.place());
-    const bool isRefused = place.raw<std::int32_t>() < _firstDay ||
-                           (!_forgotten.empty() && _forgotten.contains(nameDigest(place.text())));
+  std::vector<Batch::Line>& lines = batch.lines;
+  std::erase_if(lines, [&](const Batch::Line& line) {
+    const bool isRefused =
+        line.day < _firstDay ||
+        (!_forgotten.empty() && _forgotten.contains(nameDigest(batch.device(line))));
     if (isRefused) {
       count(Outcome::Refused);
     }
     return isRefused;
   });
-  struct Current {
-    const Rank* rank = nullptr;
-    Arrived* sent = nullptr;
-  };
+  sort(batch);
   const Ranks stored = ranksOf(batch);
-  std::unordered_map<std::string_view, Current, KeyHash> places;
-  places.reserve(batch.size());
-  for (Arrived& line : batch) {
-    const auto [place, isFirst] = places.try_emplace(line.place());
-    auto& [rank, sent] = place->second;
-    if (const auto known = isFirst ? stored.find(line.place()) : stored.end();
-        known != stored.end()) {
-      rank = &known->second;
-    }
-    if (rank != nullptr && !(*rank < line.rank)) {
-      count(*rank == line.rank ? Outcome::Repeated : Outcome::Older);
-      continue;
-    }
-    count(rank == nullptr ? Outcome::New : Outcome::Replaced);
-    if (sent != nullptr) {
-      sent->isSent = false;
-    }
-    line.isSent = true;
-    place->second = {&line.rank, &line};
-  }
   std::string rows;
-  for (const Arrived& line : batch) {
+  rows.reserve(batch.rows.size());
+  for (auto line = lines.begin(); line != lines.end();) {
+    const std::string_view place = batch.place(*line);
+    const auto known = stored.find(place);
+    const Rank* rank = known != stored.end() ? &known->second : nullptr;
+    const Batch::Line* sent = nullptr;
+    for (; line != lines.end() && batch.place(*line) == place; ++line) {
+      if (rank != nullptr && !(*rank < line->rank)) {
+        count(*rank == line->rank ? Outcome::Repeated : Outcome::Older);
+      } else {
+        count(rank == nullptr ? Outcome::New : Outcome::Replaced);
+        rank = &line->rank;
+        sent = &*line;
+      }
+    }
+    if (sent != nullptr) {
+      rows += batch.row(*sent);
+    }
+  }
+  batch.rows = {};
+  for (const Batch::Line& line : lines) {
     // Of known lines, too: they may be from a killed load.
     _weeks.insert(line.day / kDaysOfPartition);
-    if (line.isSent) {
-      rows += line.row;
-    }
   }
   if (!rows.empty()) {
     _server.post(std::string("INSERT INTO ") + kLineTable + " FORMAT RowBinary", rows);
@@ -171,24 +209,24 @@ void ClickHouseStore::send(std::vector<Arrived> batch) {
 }
 
 /// What the store has of the batch's devices and days.
-ClickHouseStore::Ranks ClickHouseStore::ranksOf(const std::vector<Arrived>& batch) {
+ClickHouseStore::Ranks ClickHouseStore::ranksOf(const Batch& batch) {
   Ranks ranks;
-  if (batch.empty()) {
+  if (batch.lines.empty()) {
     return ranks;
   }
   SentTable sent{"batch", "day Int32, device String", {}};
-  DayRange days{batch.front().day, batch.front().day};
-  for (const Arrived& line : batch) {
-    days.from = std::min(days.from, line.day);
-    days.to = std::max(days.to, line.day);
-    sent.rows += line.place();
+  for (const Batch::Line& line : batch.lines) {
+    sent.rows += batch.place(line);
   }
+  const DayRange days{batch.lines.front().day, batch.lines.back().day};
+  // The server seeks by a hash in less than half the time that it takes by day and device.
+  const std::string hash = "bitXor(sipHash64(device), toUInt64(day))";
   readRows(
       _server,
       std::string("SELECT day, device, revision, seconds, toInt64(nanoseconds), digest FROM ") +
-          kLineTable + " WHERE " + within(days) +
-          " AND (day, device) IN batch UNION ALL SELECT toInt32(-1), '', toInt64(0), toInt64(0), "
-          "toInt64(0), toFixedString('', 32)",  // so that the answer is never empty
+          kLineTable + " WHERE " + within(days) + " AND " + hash + " IN (SELECT " + hash +
+          " FROM batch) UNION ALL SELECT toInt32(-1), '', toInt64(0), toInt64(0), toInt64(0), "
+          "toFixedString('', 32)",  // so that the answer is never empty
       [&](PackedReader& row) {
         const char* const begin = row.position();
         row.raw<std::int32_t>();
@@ -210,7 +248,7 @@ ClickHouseStore::Ranks ClickHouseStore::ranksOf(const std::vector<Arrived>& batc
 }
 
 void ClickHouseStore::finish() {
-  if (!_batch.empty()) {
+  if (!_batch.lines.empty()) {
     sendBatch();
   }
   waitForBatch();
