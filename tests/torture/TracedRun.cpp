@@ -309,7 +309,7 @@ class Tracer {
       } else if (status >> 16 != 0 || signal == SIGSTOP || signal == SIGTRAP) {
         signal = 0;  // a new thread, or the program's start
       }
-      ptrace(PTRACE_SYSCALL, thread, nullptr, signal);
+      ptrace(isOver(thread) ? PTRACE_CONT : PTRACE_SYSCALL, thread, nullptr, signal);
     }
     _outcome.notDurable = _durability.atTheEnd();
     return std::move(_outcome);
@@ -324,6 +324,12 @@ class Tracer {
     std::string to;
     bool makes;  ///< a name that was not there
   };
+
+  /// The fault has happened, and the thread's further calls are as they were.
+  bool isOver(pid_t thread) {
+    return _outcome.happened && !_fault.lasts && _fault.kind != Fault::Kind::DiskFull &&
+           _pending[thread].error == 0;
+  }
 
   void atEntry(pid_t thread) {
     user_regs_struct registers = registersOf(thread);
@@ -362,12 +368,13 @@ class Tracer {
 
   void atExit(pid_t thread) {
     user_regs_struct registers = registersOf(thread);
-    const Pending& pending = _pending[thread];
+    Pending& pending = _pending[thread];
     if (pending.error != 0) {
       // A program break that cannot grow is answered by the one that was.
       registers.rax =
           pending.number == SYS_brk ? _break : static_cast<unsigned long long>(-pending.error);
       setRegisters(thread, registers);
+      pending.error = 0;
     } else if (pending.number == SYS_brk) {
       _break = registers.rax;
     } else if (_fault.kind == Fault::Kind::None && static_cast<long long>(registers.rax) >= 0) {

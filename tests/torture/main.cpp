@@ -11,7 +11,7 @@
 #include <cstring>
 #include <filesystem>
 #include <map>
-#include <optional>
+#include <span>
 #include <stdexcept>
 #include <thread>
 
@@ -35,13 +35,13 @@ struct Counts {
   std::atomic<std::size_t> failed;
 };
 
-void runCases(const std::vector<Case>& cases, const Options& options, unsigned worker,
-              const fs::path& folder, Counts& counts) {
+void runCases(const std::vector<Case>& cases, const Options& options, const fs::path& folder,
+              Counts& counts) {
   for (std::size_t index = 0; (index = counts.next++) < cases.size();) {
     const Case& one = cases[index];
     Faults faults;
     try {
-      faults = one.run(folder / ("device-" + std::to_string(worker)));
+      faults = one.run(folder / ("device-" + std::to_string(getpid())));
     } catch (const std::exception& failure) {
       faults = {failure.what()};
     }
@@ -100,20 +100,18 @@ class Running {
  public:
   Running(std::string title, const std::vector<Case>& cases, const Options& options,
           const fs::path& folder, Counts& counts)
-      : _title(std::move(title)),
-        _cases(cases.size()),
-        _counts(counts),
-        _failedBefore(counts.failed) {
-    counts.next = 0;
-    for (unsigned worker = 0; worker < options.workers; ++worker) {
+      : _title(std::move(title)), _cases(cases.size()), _counts(counts) {
+    for (unsigned worker = 0; worker < std::min<std::size_t>(options.workers, _cases); ++worker) {
       const pid_t child = fork();
       if (child == 0) {
-        runCases(cases, options, worker, folder, counts);
+        runCases(cases, options, folder, counts);
         _exit(0);
       }
       _children.push_back(child);
     }
   }
+
+  bool isLong() const { return _cases == 1; }
 
   void finish() {
     for (const pid_t child : _children) {
@@ -122,8 +120,7 @@ class Running {
         throw std::runtime_error("a worker of \"" + _title + "\" did not come to its end");
       }
     }
-    std::printf("%-44s %6zu cases, %zu failed\n", _title.c_str(), _cases,
-                _counts.failed - _failedBefore);
+    std::printf("%-44s %6zu cases, %zu failed\n", _title.c_str(), _cases, _counts.failed.load());
     std::fflush(stdout);
   }
 
@@ -131,7 +128,6 @@ class Running {
   std::string _title;
   std::size_t _cases;
   Counts& _counts;
-  std::size_t _failedBefore;
   std::vector<pid_t> _children;
 };
 
@@ -141,44 +137,52 @@ int torture(const Options& options) {
     throw std::runtime_error(name + ": " + std::strerror(errno));
   }
   const fs::path folder = name;
-  void* shared =
-      mmap(nullptr, sizeof(Counts), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
+  const std::vector<CaseList> lists = caseLists();
+  void* shared = mmap(nullptr, lists.size() * sizeof(Counts), PROT_READ | PROT_WRITE,
+                      MAP_SHARED | MAP_ANONYMOUS, -1, 0);
   if (shared == MAP_FAILED) {
     throw std::runtime_error(std::string("mmap: ") + std::strerror(errno));
   }
-  Counts& total = *new (shared) Counts{};
-  std::optional<Running> running;
-  for (const CaseList& list : caseLists()) {
-    if (list.title.find(options.scenario) == std::string::npos) {
+  const std::span<Counts> counts(new (shared) Counts[lists.size()]{}, lists.size());
+  std::vector<Running> running;
+  for (std::size_t i = 0; i < lists.size(); ++i) {
+    const auto& [title, casesOf] = lists[i];
+    if (title.find(options.scenario) == std::string::npos) {
       continue;
     }
     // What the next list begins with is made while the one before is under way.
-    const std::vector<Case> cases = chosen(list.cases(folder, options), options);
+    const std::vector<Case> cases = chosen(casesOf(folder, options), options);
     if (cases.empty()) {
       continue;
     }
-    if (running) {
-      running->finish();
+    if (!running.empty() && !running.back().isLong()) {
+      running.back().finish();
+      running.pop_back();
     }
-    running.emplace(list.title, cases, options, folder, total);
+    running.emplace_back(title, cases, options, folder, counts[i]);
     if (!options.only.empty()) {
       break;
     }
   }
-  if (running) {
-    running->finish();
+  std::size_t tried = 0;
+  std::size_t failed = 0;
+  for (; !running.empty(); running.pop_back()) {
+    running.back().finish();
+  }
+  for (const Counts& ofList : counts) {
+    tried += ofList.tried;
+    failed += ofList.failed;
   }
   if (options.only.empty()) {
     fs::remove_all(folder);
   } else {
     std::printf("its devices are in %s\n", folder.c_str());
   }
-  std::printf("torture: seed %u, %zu cases, %zu failed\n", options.seed, total.tried.load(),
-              total.failed.load());
-  if (total.tried == 0) {
+  std::printf("torture: seed %u, %zu cases, %zu failed\n", options.seed, tried, failed);
+  if (tried == 0) {
     throw std::runtime_error("there is no such case");
   }
-  return total.failed == 0 ? 0 : 1;
+  return failed == 0 ? 0 : 1;
 }
 
 int run(int argc, char** argv) {

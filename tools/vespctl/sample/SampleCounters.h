@@ -24,7 +24,7 @@ std::optional<std::int64_t> startOfSystem();
 std::map<std::string, std::int64_t> readKernelCounters();
 
 /// A burst of readings: how late the kernel wakes a sleeping process, and what `vespctl collect`
-/// reads of the memory. Takes about a quarter of a second.
+/// reads of the memory. Takes some 30 milliseconds.
 std::map<std::string, std::vector<double>> takeReadingBurst();
 
 }  // namespace vesprun
