@@ -100,10 +100,13 @@ std::unique_ptr<DatagramSocket> DatagramSocket::bind(const HostPath& path, std::
     }
     unlinkat(folder.get(), name.c_str(), 0);
   }
+  // Some may send as soon as it is there; a default access control list ignores the umask.
+  const mode_t mask = umask(ACCESSPERMS & ~kAnyoneSends);
   const bool done =
       askForSenders(socket.get()) &&
       ::bind(socket.get(), reinterpret_cast<const sockaddr*>(&address), sizeof address) == 0 &&
       fchmodat(folder.get(), name.c_str(), kAnyoneSends, 0) == 0;
+  umask(mask);
   if (!done) {
     error = systemError(path);
     return nullptr;
