@@ -39,8 +39,8 @@ def run(*words, status=0, data=None):
     return done.stdout.decode()
 
 
-def ask(*words):
-    found = [json.loads(line) for line in run(*words, "--json").splitlines()]
+def ask(*words, data=None):
+    found = [json.loads(line) for line in run(*words, "--json", data=data).splitlines()]
     for entry in found:
         assert fits(entry, SCHEMAS[words[0]]), (words, entry)
     return found
@@ -384,8 +384,18 @@ def test_kills(store, folder, chance):
         child.wait()
         for answer in ask("scalar", store, "a", "--total") if delay else []:
             assert answer["deviceDays"] == answer["devices"]
-    loads = [subprocess.Popen([PROGRAM, "load", store, folder / "all.jsonl"], stdout=subprocess.DEVNULL) for _ in "12"]
+    loads = []
+    for more in range(2):  # of one rank but for the digest
+        rivals = [line(f"D{device}", DAY, 30, 0, "AB"[device % 2], {"a": 2 * device + more},
+                       {"d": [1, 2, 1.5, 0.5, device + 1]}) for device in range(20)]
+        (folder / f"{more}.jsonl").write_text("\n".join(lines[:580] + rivals))
+        lines += rivals
+        loads.append(subprocess.Popen([PROGRAM, "load", store, folder / f"{more}.jsonl"], stdout=subprocess.DEVNULL))
     assert [load.wait() for load in loads] == [0, 0]
+    mixed = [line(device, day, revision) for revision in (1, 2) for day in (DAY, DAY + 1)
+             for device in ("F", "a long name", "a long name 2")]
+    counts = ask("load", store, "-", data="\n".join(mixed).encode())[0]
+    assert counts["new"] == counts["replaced"] == 6, counts
     for some in (range(600), range(600, 900)):  # more than a chunk holds
         lines += [line(f"E{device}", DAY + 1, distributions={"d": [1, 2, 1.5, 0.5, device + 1]}) for device in some]
         run("load", store, "-", data="\n".join(lines[-len(some):]).encode())

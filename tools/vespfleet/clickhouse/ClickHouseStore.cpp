@@ -177,9 +177,12 @@ void ClickHouseStore::send(Batch batch) {
     return isRefused;
   });
   sort(batch);
-  const Ranks stored = ranksOf(batch);
+  const SentTable places = placesOf(batch);
+  const std::uint64_t lastBlock = blocks();
+  const Ranks stored = ranksOf(batch, places);
   std::string rows;
   rows.reserve(batch.rows.size());
+  std::set<std::int32_t> partitions;  // of the rows
   for (auto line = lines.begin(); line != lines.end();) {
     const std::string_view place = batch.place(*line);
     const auto known = stored.find(place);
@@ -196,6 +199,7 @@ void ClickHouseStore::send(Batch batch) {
     }
     if (sent != nullptr) {
       rows += batch.row(*sent);
+      partitions.insert(sent->day / kDaysOfPartition);
     }
   }
   batch.rows = std::string();  // "= {}" would keep its memory
@@ -205,31 +209,61 @@ void ClickHouseStore::send(Batch batch) {
   }
   if (!rows.empty()) {
     _server.post(std::string("INSERT INTO ") + kLineTable + " FORMAT RowBinary", rows);
+    if (blocks() != lastBlock + partitions.size()) {
+      settleRivals(batch, places);
+    }
   }
 }
 
+/// Another load sent lines since the look-up. Where one has a rank of this batch to the second, the
+/// line that comes after the others is sent once more, so that it is the last.
+void ClickHouseStore::settleRivals(const Batch& batch, const SentTable& places) {
+  const std::string stored = std::string(" FROM ") + kLineTable + " WHERE " + isAmong(batch);
+  _server.ask(std::string("INSERT INTO ") + kLineTable + " SELECT *" + stored +
+                  " AND (day, device, digest) IN (SELECT day, device, argMax(digest, (seconds, "
+                  "nanoseconds, digest))" +
+                  stored + " GROUP BY day, device, rank HAVING min(digest) != max(digest))",
+              &places, [](std::string_view) {});
+}
+
+/// How many blocks of rows were ever sent.
+std::uint64_t ClickHouseStore::blocks() {
+  std::uint64_t last = 0;
+  for (const WeekState& state : weeks()) {
+    last = std::max(last, state.week.lastBlock);
+  }
+  return last;
+}
+
+SentTable ClickHouseStore::placesOf(const Batch& batch) {
+  SentTable places{"batch", "day Int32, device String", {}};
+  for (const Batch::Line& line : batch.lines) {
+    places.rows += batch.place(line);
+  }
+  return places;
+}
+
+/// Has a stored line a place of the sorted batch? By day and device the server reads only where the
+/// lines may be. By a hash it reads all lines of those days, which takes less time where many are
+/// sought; another place can have the same.
+std::string ClickHouseStore::isAmong(const Batch& batch) {
+  constexpr std::size_t kMany = 100;
+  const std::string hash = "bitXor(sipHash64(device), toUInt64(day))";
+  return within({batch.lines.front().day, batch.lines.back().day}) + " AND " +
+         (batch.lines.size() < kMany ? "(day, device) IN batch"
+                                     : hash + " IN (SELECT " + hash + " FROM batch)");
+}
+
 /// What the store has of the batch's devices and days.
-ClickHouseStore::Ranks ClickHouseStore::ranksOf(const Batch& batch) {
+ClickHouseStore::Ranks ClickHouseStore::ranksOf(const Batch& batch, const SentTable& places) {
   Ranks ranks;
   if (batch.lines.empty()) {
     return ranks;
   }
-  SentTable sent{"batch", "day Int32, device String", {}};
-  for (const Batch::Line& line : batch.lines) {
-    sent.rows += batch.place(line);
-  }
-  const DayRange days{batch.lines.front().day, batch.lines.back().day};
-  // By day and device the server reads only where the lines may be. By a hash it reads all lines of
-  // those days, which takes less time where many are sought.
-  constexpr std::size_t kMany = 100;
-  const std::string hash = "bitXor(sipHash64(device), toUInt64(day))";
-  const std::string sought = batch.lines.size() < kMany
-                                 ? "(day, device) IN batch"
-                                 : hash + " IN (SELECT " + hash + " FROM batch)";
   readRows(
       _server,
       std::string("SELECT day, device, revision, seconds, toInt64(nanoseconds), digest FROM ") +
-          kLineTable + " WHERE " + within(days) + " AND " + sought +
+          kLineTable + " WHERE " + isAmong(batch) +
           " UNION ALL SELECT toInt32(-1), '', toInt64(0), toInt64(0), toInt64(0), "
           "toFixedString('', 32)",  // so that the answer is never empty
       [&](PackedReader& row) {
@@ -248,7 +282,7 @@ ClickHouseStore::Ranks ClickHouseStore::ranksOf(const Batch& batch) {
         const auto [stored, isNew] = ranks.try_emplace(std::string(place), rank);
         stored->second = std::max(stored->second, rank);
       },
-      &sent);
+      &places);
   return ranks;
 }
 

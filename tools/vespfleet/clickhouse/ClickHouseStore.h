@@ -23,7 +23,8 @@ namespace vesprun {
 ///
 /// The engine keeps the row of the highest rank for each device and day. A rank has no room for
 /// nanoseconds and digest; a load looks up what is stored and sends only what comes after it, and
-/// of equal ranks the engine keeps the row that came last.
+/// of equal ranks the engine keeps the row that came last. A load that another one came between
+/// looks again.
 ///
 /// Keys are spread over a few columns by their bytes: a question about one reads a part of a line.
 /// Rows are sent sorted, and many at once, which costs the server least.
@@ -98,7 +99,11 @@ class ClickHouseStore : public FleetStore {
   void waitForBatch();
   static void sort(Batch& batch);
   void send(Batch batch);
-  Ranks ranksOf(const Batch& batch);
+  static SentTable placesOf(const Batch& batch);
+  static std::string isAmong(const Batch& batch);
+  Ranks ranksOf(const Batch& batch, const SentTable& places);
+  std::uint64_t blocks();
+  void settleRivals(const Batch& batch, const SentTable& places);
   void settleWeeks();
   bool hasNoneTwice(const Week& week);
   std::vector<WeekState> weeks(const DayRange& days = {});
