@@ -682,7 +682,7 @@ std::vector<Case> years(const fs::path& folder, const Choice& choice) {
 }  // namespace
 
 std::vector<CaseList> caseLists() {
-  std::vector<CaseList> lists{{"the clock jumps through ten years", years}};  // beside all others
+  std::vector<CaseList> lists{{"the clock jumps through ten years", years}};  // they take longest
   for (const Scenario& scenario : scenarios()) {
     lists.push_back({scenario.name, [&scenario](const fs::path& folder, const Choice& choice) {
                        return casesOf(scenario, folder, choice);

@@ -325,7 +325,7 @@ class Tracer {
     bool makes;  ///< a name that was not there
   };
 
-  /// The fault has happened, and the thread's further calls are as they were.
+  /// The fault has happened, and no further call of the thread is changed.
   bool isOver(pid_t thread) {
     return _outcome.happened && !_fault.lasts && _fault.kind != Fault::Kind::DiskFull &&
            _pending[thread].error == 0;

@@ -41,7 +41,7 @@ void runCases(const std::vector<Case>& cases, const Options& options, const fs::
     const Case& one = cases[index];
     Faults faults;
     try {
-      faults = one.run(folder / ("device-" + std::to_string(getpid())));
+      faults = one.run(folder);
     } catch (const std::exception& failure) {
       faults = {failure.what()};
     }
@@ -57,6 +57,10 @@ void runCases(const std::vector<Case>& cases, const Options& options, const fs::
       std::fputs(text.c_str(), stdout);
       std::fflush(stdout);
     }
+  }
+  if (options.only.empty()) {
+    std::error_code ignored;
+    fs::remove_all(folder, ignored);
   }
 }
 
@@ -95,7 +99,8 @@ std::vector<Case> chosen(std::vector<Case> cases, const Options& options) {
   return result;
 }
 
-/// The cases of a list, under way in processes of their own.
+/// The cases of a list, under way in processes of their own; one case alone goes on beside the
+/// lists that follow.
 class Running {
  public:
   Running(std::string title, const std::vector<Case>& cases, const Options& options,
@@ -104,14 +109,14 @@ class Running {
     for (unsigned worker = 0; worker < std::min<std::size_t>(options.workers, _cases); ++worker) {
       const pid_t child = fork();
       if (child == 0) {
-        runCases(cases, options, folder, counts);
+        runCases(cases, options, folder / ("device-" + std::to_string(worker)), counts);
         _exit(0);
       }
       _children.push_back(child);
     }
   }
 
-  bool isLong() const { return _cases == 1; }
+  bool isAlone() const { return _cases == 1; }
 
   void finish() {
     for (const pid_t child : _children) {
@@ -155,11 +160,11 @@ int torture(const Options& options) {
     if (cases.empty()) {
       continue;
     }
-    if (!running.empty() && !running.back().isLong()) {
+    if (!running.empty() && !running.back().isAlone()) {
       running.back().finish();
       running.pop_back();
     }
-    running.emplace_back(title, cases, options, folder, counts[i]);
+    running.emplace_back(title, cases, options, folder / std::to_string(i), counts[i]);
     if (!options.only.empty()) {
       break;
     }
