@@ -558,6 +558,14 @@ def test_encrypted(store, folder, _):
     run("load", address, "-", data=line("D0", scalars={"a": 1}).encode())
     assert post(f"SELECT lines FROM {unique}") == "5\n", "a week without a line twice is merged in vain"
     assert set(seen) == {"Basic " + base64.b64encode(b"user:pass:word").decode()}, seen
+    arriving = iter([line(f"E{i}", scalars=dict.fromkeys("bcde", 1)).encode() for i in range(16)])
+
+    def lie(answer):  # a line more after each answer
+        if data := next(arriving, None):
+            subprocess.run([PROGRAM, "load", store, "-"], input=data, env={}, stdout=subprocess.DEVNULL, check=True)
+        return 200, answer
+
+    assert {key["devices"] for key in ask("keys", address) if key["key"] != "a"} == {16}, "parts of lines"
     for lie, why in ((lambda answer: (200, answer[:-1]), "the server's answer is cut"),
                      (lambda answer: (200, b""), "the server's answer is empty"),
                      (lambda answer: (200, b"\xff" * (129 << 20)), "the server's answer does not fit the question"),
