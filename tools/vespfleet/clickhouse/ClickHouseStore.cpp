@@ -302,14 +302,50 @@ void ClickHouseStore::finish() {
 /// Sees to it that questions read what was loaded as it lies. A week that has no line twice is
 /// noted; another is merged, but not where much would be rewritten for little.
 void ClickHouseStore::settleWeeks() {
+  constexpr std::size_t kWeeksAtOnce = 100;
+  constexpr std::uint64_t kRowsAtOnce = 1'000'000;  // an answer does not take long
+  std::vector<WeekState> loaded = weeks();
+  std::erase_if(loaded, [this](const WeekState& state) {
+    return state.isUnique || !_weeks.contains(state.week.number);
+  });
+  for (std::span<const WeekState> rest = loaded; !rest.empty();) {
+    std::size_t count = 0;
+    std::uint64_t rows = 0;
+    do {
+      rows += rest[count++].week.rows;
+    } while (count < std::min(rest.size(), kWeeksAtOnce) &&
+             rows + rest[count].week.rows <= kRowsAtOnce);
+    settle(rest.first(count));
+    rest = rest.subspan(count);
+  }
+}
+
+void ClickHouseStore::settle(std::span<const WeekState> states) {
   constexpr std::uint64_t kMaxRewritten = 8;                         // times what is new
   constexpr std::uint64_t kAlwaysMerged = std::uint64_t{512} << 20;  // bytes
+  std::string condition;
+  for (const WeekState& state : states) {
+    const std::int32_t first = state.week.number * kDaysOfPartition;
+    condition += condition.empty() ? "" : " OR ";
+    condition += within({first, first + kDaysOfPartition - 1});
+  }
+  std::vector<std::pair<std::int32_t, std::uint64_t>> lines;  // by week
+  readRows(_server,
+           "SELECT toInt32(intDiv(day, " + std::to_string(kDaysOfPartition) +
+               ")) AS week, toUInt64(count()) FROM (SELECT day FROM " + kLineTable +
+               " FINAL WHERE " + condition + ") GROUP BY week ORDER BY week",
+           [&](PackedReader& row) {
+             const auto week = row.raw<std::int32_t>();
+             lines.emplace_back(week, row.raw<std::uint64_t>());
+           });
+  const std::vector<WeekState> now = weeks();
   std::string unique;
-  for (const auto& [week, bytes, mostOfPart, isUnique] : weeks()) {
-    if (isUnique || !_weeks.contains(week.number)) {
-      continue;
-    }
-    if (hasNoneTwice(week)) {
+  for (const auto& [week, bytes, mostOfPart, isUnique] : states) {
+    const bool isCounted =
+        std::find(lines.begin(), lines.end(), std::pair(week.number, week.rows)) != lines.end();
+    if (isCounted && std::any_of(now.begin(), now.end(), [&week = week](const WeekState& state) {
+          return state.week == week;
+        })) {
       appendRaw(unique, week.number);
       appendRaw(unique, week.lastBlock);
       appendRaw(unique, week.rows);
@@ -321,15 +357,6 @@ void ClickHouseStore::settleWeeks() {
   if (!unique.empty()) {
     _server.post(std::string("INSERT INTO ") + kUniqueTable + " FORMAT RowBinary", unique);
   }
-}
-
-bool ClickHouseStore::hasNoneTwice(const Week& week) {
-  const std::int32_t first = week.number * kDaysOfPartition;
-  const DayRange days{first, first + kDaysOfPartition - 1};
-  const std::uint64_t lines =
-      countRows(std::string("SELECT day FROM ") + kLineTable + " FINAL WHERE " + within(days));
-  const std::vector<WeekState> now = weeks(days);
-  return lines == week.rows && now.size() == 1 && now.front().week == week;
 }
 
 void ClickHouseStore::removeWhere(const std::string& condition) {

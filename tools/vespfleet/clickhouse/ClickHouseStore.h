@@ -105,7 +105,7 @@ class ClickHouseStore : public FleetStore {
   std::uint64_t blocks();
   void settleRivals(const Batch& batch, const SentTable& places);
   void settleWeeks();
-  bool hasNoneTwice(const Week& week);
+  void settle(std::span<const WeekState> states);
   std::vector<WeekState> weeks(const DayRange& days = {});
   void whileUnchanged(const DayRange& days, const std::function<void()>& ask);
   bool isAnywhere(const std::string& columns, const std::string& condition);
