@@ -176,14 +176,19 @@ void ClickHouseStore::send(Batch batch) {
     }
     return isRefused;
   });
+  if (lines.empty()) {
+    return;
+  }
   sort(batch);
   const SentTable places = placesOf(batch);
   const std::uint64_t lastBlock = blocks();
   const Ranks stored = ranksOf(batch, places);
   std::string rows;
   rows.reserve(batch.rows.size());
-  std::set<std::int32_t> partitions;  // of the rows
+  std::set<std::int32_t> sentWeeks;
   for (auto line = lines.begin(); line != lines.end();) {
+    const std::int32_t week = line->day / kDaysOfPartition;
+    _weeks.insert(week);  // of known lines, too: they may be from a killed load
     const std::string_view place = batch.place(*line);
     const auto known = stored.find(place);
     const Rank* rank = known != stored.end() ? &known->second : nullptr;
@@ -199,17 +204,13 @@ void ClickHouseStore::send(Batch batch) {
     }
     if (sent != nullptr) {
       rows += batch.row(*sent);
-      partitions.insert(sent->day / kDaysOfPartition);
+      sentWeeks.insert(week);
     }
   }
   batch.rows = std::string();  // "= {}" would keep its memory
-  for (const Batch::Line& line : lines) {
-    // Of known lines, too: they may be from a killed load.
-    _weeks.insert(line.day / kDaysOfPartition);
-  }
   if (!rows.empty()) {
     _server.post(std::string("INSERT INTO ") + kLineTable + " FORMAT RowBinary", rows);
-    if (blocks() != lastBlock + partitions.size()) {
+    if (blocks() != lastBlock + sentWeeks.size()) {
       settleRivals(batch, places);
     }
   }
@@ -257,9 +258,6 @@ std::string ClickHouseStore::isAmong(const Batch& batch) {
 /// What the store has of the batch's devices and days.
 ClickHouseStore::Ranks ClickHouseStore::ranksOf(const Batch& batch, const SentTable& places) {
   Ranks ranks;
-  if (batch.lines.empty()) {
-    return ranks;
-  }
   readRows(
       _server,
       std::string("SELECT day, device, revision, seconds, toInt64(nanoseconds), digest FROM ") +
@@ -320,6 +318,7 @@ void ClickHouseStore::settleWeeks() {
   }
 }
 
+/// Some of the loaded weeks, which the server counts at once.
 void ClickHouseStore::settle(std::span<const WeekState> states) {
   constexpr std::uint64_t kMaxRewritten = 8;                         // times what is new
   constexpr std::uint64_t kAlwaysMerged = std::uint64_t{512} << 20;  // bytes
@@ -333,7 +332,7 @@ void ClickHouseStore::settle(std::span<const WeekState> states) {
   readRows(_server,
            "SELECT toInt32(intDiv(day, " + std::to_string(kDaysOfPartition) +
                ")) AS week, toUInt64(count()) FROM (SELECT day FROM " + kLineTable +
-               " FINAL WHERE " + condition + ") GROUP BY week ORDER BY week",
+               " FINAL WHERE " + condition + ") GROUP BY week",
            [&](PackedReader& row) {
              const auto week = row.raw<std::int32_t>();
              lines.emplace_back(week, row.raw<std::uint64_t>());
